@@ -1,0 +1,28 @@
+# Everything from outside comes from Debian's packages; scripts/setup.sh installs them.
+
+find_package(PkgConfig REQUIRED)
+find_package(Threads REQUIRED)
+
+# wxWidgets, base library alone: what `wx-config` names for the default build would pull in GTK.
+find_program(WX_CONFIG NAMES wx-config REQUIRED)
+execute_process(COMMAND ${WX_CONFIG} --cxxflags base
+  OUTPUT_VARIABLE _wx_cxxflags OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
+execute_process(COMMAND ${WX_CONFIG} --libs base
+  OUTPUT_VARIABLE _wx_libs OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
+separate_arguments(_wx_cxxflags UNIX_COMMAND "${_wx_cxxflags}")
+separate_arguments(_wx_libs UNIX_COMMAND "${_wx_libs}")
+list(TRANSFORM _wx_cxxflags REPLACE "^-I" "-isystem")
+add_library(wx INTERFACE)
+target_compile_options(wx INTERFACE ${_wx_cxxflags})
+target_link_libraries(wx INTERFACE ${_wx_libs})
+
+pkg_check_modules(lcms2 REQUIRED IMPORTED_TARGET lcms2)
+find_package(pugixml REQUIRED)
+find_package(nlohmann_json REQUIRED)
+
+if(TINTGATE_TESTS)
+  find_package(GTest REQUIRED)
+endif()
+if(TINTGATE_BENCH)
+  find_package(benchmark REQUIRED)
+endif()

@@ -1,0 +1,39 @@
+// Reading CGATS.17 / IT8 text as it is met in the wild, and writing it as the standard has it.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "colour/DataSet.h"
+#include "colour/Failure.h"
+
+namespace colour {
+
+/// Beyond these a text is refused with TooLarge. They bound time and memory under hostile input.
+inline constexpr std::size_t maxCgatsBytes = std::size_t{4} << 30;
+inline constexpr std::size_t maxCgatsColumns = 4096;
+inline constexpr std::size_t maxCgatsPatches = 10'000'000;
+
+/// What a caller needs of a text; the reader skips the rest.
+struct CgatsWants {
+    bool spectra = true; ///< False: spectra are kept only if they are the sole colour values.
+};
+
+/// True if the bytes could be CGATS text: no NUL, and a known first line, a keyword, or a format.
+bool looksLikeCgats(std::string_view bytes);
+
+/// Reads all tables of a text and joins them into one data set (columns of tables with the same
+/// rows are joined by id; a table that adds nothing is skipped).
+///
+/// Gives a data set with colour values, device values, or both; which of them a caller needs is the
+/// caller's affair. On failure `set` is left as it was.
+Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set);
+
+/// Text of a data set: CGATS.17, LF, ids, device values, XYZ, Lab and spectra where there are any,
+/// written so that readCgats gives the same numbers again.
+std::string writeCgats(const DataSet& set);
+
+} // namespace colour

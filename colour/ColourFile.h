@@ -1,0 +1,27 @@
+// A file that names colour: CGATS text or ICC profile, told apart by its bytes, never by its name.
+#pragma once
+
+#include <optional>
+#include <string>
+
+#include "colour/CgatsText.h"
+#include "colour/DataSet.h"
+#include "colour/Failure.h"
+#include "colour/Profile.h"
+
+namespace colour {
+
+/// Exactly one of the two is set after a successful load.
+struct ColourFile {
+    std::optional<DataSet> set;
+    std::optional<Profile> profile;
+};
+
+/// Loads the file at `path` (bytes as the file system has them). On failure `file` is untouched.
+Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file);
+
+/// Whole contents of a file; Missing, Unreadable, TooLarge (above `limit`) or OutOfMemory. Devices
+/// and pipes are read to their end or to the limit, never for ever.
+Failure readWholeFile(const std::string& path, std::size_t limit, std::string& bytes);
+
+} // namespace colour

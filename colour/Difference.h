@@ -1,0 +1,40 @@
+// Colour differences, under the names and in the notation of the literature.
+#pragma once
+
+#include "colour/DataSet.h"
+
+namespace colour {
+
+/// In the numbering of measurementDataRecord::deltaEType; every other number means Cie76.
+enum class Formula {
+    Cie76 = 0,
+    Cmc11 = 2,
+    Cie94 = 3,
+    Ciede2000 = 4,
+    Cmc21 = 5,
+};
+
+/// The formula of a deltaEType or deltaEMode.
+Formula formulaFromNumber(int number);
+
+/// "CIE76", "CIECMC", "CIE94", "CIE2000", "CIECMC_2_1".
+const char* formulaName(Formula formula);
+
+/// Difference of measured from target. CIE94 and CMC are not symmetric: the target is the reference.
+double difference(Formula formula, const Lab& target, const Lab& measured);
+
+double deltaE76(const Lab& target, const Lab& measured);
+double deltaE94(const Lab& target, const Lab& measured);
+double deltaE2000(const Lab& target, const Lab& measured);
+double deltaECmc(const Lab& target, const Lab& measured, double lightness, double chroma);
+
+/// CIELAB hue difference delta H*ab, as a magnitude: sqrt(dE^2 - dL^2 - dC^2).
+double deltaH(const Lab& target, const Lab& measured);
+
+/// Chromaticness difference delta Ch of greys: sqrt(da^2 + db^2).
+double deltaCh(const Lab& target, const Lab& measured);
+
+Lab labFromXyz(const Xyz& xyz);
+Xyz xyzFromLab(const Lab& lab);
+
+} // namespace colour

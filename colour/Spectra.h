@@ -1,0 +1,24 @@
+// From reflectances to XYZ.
+#pragma once
+
+#include "colour/DataSet.h"
+
+namespace colour {
+
+/// True if spectra on this axis can be turned into XYZ.
+bool spectraUsable(const SpectralAxis& axis);
+
+/// Weights of one axis, made once and used for every patch (D50, CIE 1931 2 degree observer).
+class SpectralWeights {
+  public:
+    /// REQUIRES: spectraUsable(axis).
+    explicit SpectralWeights(const SpectralAxis& axis);
+
+    /// XYZ, 0 to 100, of axis.length reflectances of 0 to 1.
+    Xyz xyz(const double* reflectances) const;
+
+  private:
+    std::vector<Xyz> m_weights; ///< One for each wavelength of the axis.
+};
+
+} // namespace colour
