@@ -1,0 +1,175 @@
+// The records of functions through which a plug-in gives out its tickets. Each is an array of
+// 64-bit words whose numbers are a contract; words that are not named here belong to the plug-in.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+
+#include "ticket/ParameterRecords.h"
+
+/// One ticket, owned by the plug-in. The plug-in's own record may be longer.
+struct STICKET_ACCESS {
+    std::uint64_t words[30];
+};
+
+/// The container of a session: tickets by type and id, owned by the plug-in. The plug-in's own
+/// record may be longer.
+struct MTICKET_ACCESS {
+    std::uint64_t words[58];
+};
+
+/// Shown one value of a ticket. The pointers stay good until the ticket changes. True to go on.
+using SCollect = bool (*)(void* context, const char* key, PARAM_TYPE type, const void* value,
+                          int position);
+
+/// Shown one ticket of a container. True to go on.
+using TicketWalk = bool (*)(void* context, int type, int id, const STICKET_ACCESS* ticket);
+
+/// Operations on one ticket.
+enum STICKET_OP : std::int32_t {
+    STICKET_OP_PARTIAL = 3, ///< Argument: a table of keys, ended by null.
+};
+
+/// Operations of a container.
+enum MTICKET_OP : std::int32_t {
+    MTICKET_OP_EXISTS = 101,      ///< Argument: null.
+    MTICKET_OP_OPEN = 102,        ///< Argument: const STICKET_ACCESS**, receives the ticket.
+    MTICKET_OP_CREATE_NEXT = 104, ///< Id TICKET_ID_NEW or TICKET_ID_NEW_PLAIN. Argument: int*,
+                                  ///< receives the new id.
+    MTICKET_OP_DELETE = 106,      ///< Argument: bool*, a flag of the plug-in's own, or null.
+};
+
+/// An operation of either kind, as its number.
+class TICKET_OP {
+  public:
+    TICKET_OP(STICKET_OP op) : code(op) {}
+    TICKET_OP(MTICKET_OP op) : code(op) {}
+
+    std::int32_t code;
+};
+
+/// Codes of a ticket's Option.
+enum STICKET_OPTION_CODE : std::int32_t {
+    STICKET_OPTION_CODE_WHOAMI = 11, ///< Fills a STICKET_OPTION_WHOAMI.
+};
+
+/// Filled by the plug-in with what it likes; null, -1, -1 where it refuses.
+struct STICKET_OPTION_WHOAMI {
+    void* pointer = nullptr;
+    std::int32_t number1 = -1;
+    std::int32_t number2 = -1;
+};
+
+/// Ids that the plug-in takes in place of a ticket's own.
+inline constexpr int TICKET_ID_ALL = -3;       ///< All tickets of the type.
+inline constexpr int TICKET_ID_NEW = -4;       ///< The next new ticket.
+inline constexpr int TICKET_ID_NEW_PLAIN = -5; ///< The next new ticket, the plain way.
+
+/// Types run from 0 to 49.
+constexpr bool TICKET_TYPE_Valid(int type) {
+    return type >= 0 && type <= 49;
+}
+
+/// Ids of tickets run from 0 to 16,777,215.
+constexpr bool TICKET_ID_Valid(int id) {
+    return id >= 0 && id < 0x1000000;
+}
+
+constexpr bool TICKET_Valid(int type, int id) {
+    return TICKET_TYPE_Valid(type) && TICKET_ID_Valid(id);
+}
+
+namespace ticket {
+
+/// The maker of tickets that belong to no container.
+struct Factory {
+    std::uint64_t words[4];
+};
+
+/// The word behind which every record but the factory keeps what it passes to its functions.
+inline constexpr int handleWord = 2;
+
+/// A bool that comes from a slot is defined in bit 0 only, so slots have integer results, and this
+/// makes a bool of them. A C++ bool would let the compiler assume the other bits.
+constexpr bool bit0(int result) {
+    return (result & 1) != 0;
+}
+
+/// A word that holds a function: its number and its type in one place, for both sides.
+template<int Number, class Signature>
+struct Slot {
+    static constexpr int number = Number;
+
+    /// The function that the record has there, or null.
+    template<class Record>
+    static Signature* of(const Record& record) {
+        static_assert(Number < sizeof(Record::words) / sizeof(std::uint64_t));
+        return reinterpret_cast<Signature*>(record.words[Number]);
+    }
+
+    /// Puts a function there.
+    template<class Record>
+    static void put(Record& record, Signature* function) {
+        static_assert(Number < sizeof(Record::words) / sizeof(std::uint64_t));
+        record.words[Number] = reinterpret_cast<std::uint64_t>(function);
+    }
+
+    /// Calls the record's function with the record's handle in front of the arguments.
+    template<class Record, class... Arguments>
+    static auto call(const Record& record, Arguments... arguments) {
+        return of(record)(reinterpret_cast<void*>(record.words[handleWord]), arguments...);
+    }
+};
+
+/// Slots of STICKET_ACCESS.
+namespace single {
+using GetParameter =
+    Slot<3, int(void* handle, const char* key, PARAM_TYPE type, void* out, int position)>;
+/// The result is ignored; that of each record counts.
+using GetMultiParameter = Slot<4, int(void* handle, GETMULTIPAR* table)>;
+/// Shows each value once: keys in ascending strcmp order, positions ascending within a key. The
+/// result is ignored.
+using Walk =
+    Slot<5, int(void* handle, SCollect callback, void* context, const char* text, int number)>;
+using SetParameter =
+    Slot<26, int(void* handle, const char* key, PARAM_TYPE type, const void* value, int position)>;
+using SetMultiParameter = Slot<27, int(void* handle, SETMULTIPAR* table)>;
+/// Keys is a table ended by null, where a trailing * makes a prefix; null is all keys. With replace
+/// 1 the ticket's content is replaced, with 0 the source's values overlay it.
+using Transfer =
+    Slot<28, int(void* handle, const STICKET_ACCESS* source, const char* const* keys, int replace)>;
+using Option = Slot<29, int(void* handle, int code, void* record)>;
+} // namespace single
+
+/// Slots of MTICKET_ACCESS.
+namespace container {
+using GetParameter = Slot<4, int(void* handle, int type, int id, const char* key, PARAM_TYPE ptype,
+                                 void* out, int position)>;
+/// The result is ignored; that of each record counts.
+using GetMultiParameter = Slot<5, int(void* handle, int type, int id, GETMULTIPAR* table)>;
+using WalkTickets = Slot<7, int(void* handle, TicketWalk callback, void* context, int type)>;
+using SetParameter = Slot<28, int(void* handle, int type, int id, const char* key, PARAM_TYPE ptype,
+                                  const void* value, int position)>;
+using SetMultiParameter = Slot<29, int(void* handle, int type, int id, SETMULTIPAR* table)>;
+using TicketOperation = Slot<31, int(void* handle, int type, int id, TICKET_OP op, void* argument)>;
+using Notification = Slot<54, int(void* handle, int type, int id, int notificationId, int enable,
+                                  const char* const* keys)>;
+/// May be null.
+using CreateWithKeys =
+    Slot<57, const STICKET_ACCESS*(void* handle, int type, int id, const char* const* keys)>;
+} // namespace container
+
+/// Slots of Factory, which pass no handle.
+namespace factory {
+using Create = Slot<2, const STICKET_ACCESS*(const char* name)>;
+using Destroy = Slot<3, void(const STICKET_ACCESS** ticket)>;
+} // namespace factory
+
+} // namespace ticket
+
+static_assert(sizeof(TICKET_OP) == 4);
+static_assert(sizeof(STICKET_OPTION_WHOAMI) == 16);
+static_assert(offsetof(STICKET_OPTION_WHOAMI, number1) == 8);
+static_assert(offsetof(STICKET_OPTION_WHOAMI, number2) == 12);
+static_assert(sizeof(STICKET_ACCESS) == 30 * 8 && sizeof(MTICKET_ACCESS) == 58 * 8);
+static_assert(sizeof(void*) == 8);
