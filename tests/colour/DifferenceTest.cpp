@@ -1,0 +1,191 @@
+#include "colour/Difference.h"
+
+#include <cmath>
+#include <cstdio>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <random>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include <gtest/gtest.h>
+#include <lcms2.h>
+#include <unistd.h>
+
+using namespace colour;
+
+namespace {
+
+struct Pair {
+    Lab first;
+    Lab second;
+};
+
+cmsCIELab peer(const Lab& lab) {
+    return {lab.L, lab.a, lab.b};
+}
+
+/// Near and far pairs over all hues, greys among them; the same ones in every run.
+std::vector<Pair> somePairs(std::size_t count) {
+    std::mt19937 engine(20); // NOLINT: the same pairs each time
+    std::uniform_real_distribution<double> lightness(0, 100);
+    std::uniform_real_distribution<double> wide(-110, 110);
+    std::normal_distribution<double> near(0, 2);
+    std::vector<Pair> pairs;
+    for (std::size_t i = 0; i < count; ++i) {
+        const double spread = i % 4 == 0 ? 0.01 : 1; // a quarter of them nearly grey
+        const Lab first{lightness(engine), spread * wide(engine), spread * wide(engine)};
+        Lab second{lightness(engine), wide(engine), wide(engine)};
+        if (i % 2 == 0)
+            second = {first.L + near(engine), first.a + near(engine), first.b + near(engine)};
+        pairs.push_back({first, second});
+    }
+    return pairs;
+}
+
+} // namespace
+
+TEST(Difference, Ciede2000GivesThePublishedPairsBothWays) {
+    std::ifstream file(TINTGATE_SOURCE_DIR "/tests/data/colour/ciede2000-pairs.csv");
+    int pairs = 0;
+    for (std::string line; std::getline(file, line);) {
+        Lab first, second;
+        double expected = 0;
+        if (std::sscanf(line.c_str(), "%lf,%lf,%lf,%lf,%lf,%lf,%lf", &first.L, &first.a, &first.b,
+                        &second.L, &second.a, &second.b, &expected) != 7)
+            continue;
+        ++pairs;
+        EXPECT_NEAR(deltaE2000(first, second), expected, 0.00005) << line;
+        EXPECT_NEAR(deltaE2000(second, first), expected, 0.00005) << line;
+    }
+    EXPECT_EQ(pairs, 34);
+}
+
+TEST(Difference, OtherFormulasGiveThePublishedFigures) {
+    const Pair a{{0.9, 16.3, -2.22}, {0.7, 14.2, -1.80}};
+    const Pair b{{69.417, -12.612, -11.271}, {83.386, 39.426, -17.525}};
+    const struct {
+        int number;
+        const char* name;
+        Pair pair;
+        double expected;
+    } cases[] = {
+        {0, "CIE76", a, 2.151},      {1, "CIE76", a, 2.151},       {6, "CIE76", a, 2.151},
+        {-1, "CIE76", a, 2.151},     {3, "CIE94", a, 1.249},       {2, "CIECMC", a, 1.482},
+        {5, "CIECMC_2_1", a, 1.443}, {5, "CIECMC_2_1", b, 44.346},
+    };
+    for (const auto& c : cases) {
+        const Formula formula = formulaFromNumber(c.number);
+        EXPECT_STREQ(formulaName(formula), c.name);
+        EXPECT_NEAR(difference(formula, c.pair.first, c.pair.second), c.expected, 0.0005)
+            << c.number;
+    }
+    EXPECT_STREQ(formulaName(formulaFromNumber(4)), "CIE2000");
+}
+
+TEST(Difference, AgreesWithLittleCms) {
+    double worst2000 = 0, worst76 = 0, worstCmc = 0, worstHue = 0;
+    for (const Pair& pair : somePairs(20000)) {
+        cmsCIELab first = peer(pair.first);
+        cmsCIELab second = peer(pair.second);
+        const auto gap = [&](Formula formula, double other) {
+            return std::abs(difference(formula, pair.first, pair.second) - other);
+        };
+        worst2000 = std::max(worst2000,
+                             gap(Formula::Ciede2000, cmsCIE2000DeltaE(&first, &second, 1, 1, 1)));
+        worst76 = std::max(worst76, gap(Formula::Cie76, cmsDeltaE(&first, &second)));
+        worstCmc = std::max({worstCmc, gap(Formula::Cmc11, cmsCMCdeltaE(&first, &second, 1, 1)),
+                             gap(Formula::Cmc21, cmsCMCdeltaE(&first, &second, 2, 1))});
+
+        const double dC = std::hypot(second.a, second.b) - std::hypot(first.a, first.b);
+        const double dL = second.L - first.L;
+        const double dE = cmsDeltaE(&first, &second);
+        worstHue = std::max(worstHue, std::abs(std::pow(deltaH(pair.first, pair.second), 2) -
+                                               (dE * dE - dL * dL - dC * dC)));
+    }
+    EXPECT_LT(worst2000, 1e-9);
+    EXPECT_LT(worst76, 1e-9);
+    EXPECT_LT(worstCmc, 1e-9);
+    EXPECT_LT(worstHue, 1e-9);
+}
+
+// Pair by pair, to the six decimals that colverify prints.
+TEST(Difference, AgreesWithColverify) {
+    const auto folder =
+        std::filesystem::temp_directory_path() / ("tintgate-colverify-" + std::to_string(getpid()));
+    std::filesystem::create_directories(folder);
+    std::vector<Pair> pairs = somePairs(400);
+    for (const bool target : {true, false}) {
+        std::ofstream file(folder / (target ? "target.ti3" : "measured.ti3"));
+        file << "CTI3\n\nKEYWORD \"COLOR_REP\"\nCOLOR_REP \"LAB\"\nNUMBER_OF_FIELDS 4\n"
+                "BEGIN_DATA_FORMAT\nSAMPLE_ID LAB_L LAB_A LAB_B\nEND_DATA_FORMAT\n"
+             << "NUMBER_OF_SETS " << pairs.size() << "\nBEGIN_DATA\n";
+        file.precision(17);
+        for (std::size_t i = 0; i < pairs.size(); ++i) {
+            const Lab& lab = target ? pairs[i].first : pairs[i].second;
+            file << i + 1 << ' ' << lab.L << ' ' << lab.a << ' ' << lab.b << '\n';
+        }
+        file << "END_DATA\n";
+    }
+    const struct {
+        const char* option;
+        Formula formula;
+    } cases[] = {{"", Formula::Cie76}, {"-k", Formula::Ciede2000}};
+    for (const auto& c : cases) {
+        const std::string command = "colverify -v2 " + std::string(c.option) + " '" +
+                                    (folder / "target.ti3").string() + "' '" +
+                                    (folder / "measured.ti3").string() + "' 2>&1";
+        FILE* pipe = popen(command.c_str(), "r");
+        ASSERT_NE(pipe, nullptr);
+        std::string output;
+        char line[1024];
+        std::size_t found = 0;
+        while (std::fgets(line, sizeof line, pipe)) {
+            std::size_t id = 0;
+            double value = 0;
+            output += line;
+            if (std::sscanf(line, "%zu:%*[^<]<=>%*[^d]de %lf", &id, &value) != 2)
+                continue;
+            ASSERT_LE(id, pairs.size());
+            EXPECT_NEAR(difference(c.formula, pairs[id - 1].first, pairs[id - 1].second), value,
+                        0.0000006)
+                << line;
+            ++found;
+        }
+        EXPECT_EQ(pclose(pipe), 0);
+        EXPECT_EQ(found, pairs.size()) << output.substr(0, 500);
+    }
+    std::filesystem::remove_all(folder);
+}
+
+// Opposite hues leave the mean hue to a convention: from the first hue to the second without
+// passing 0. The difference must be the same either way round, and jump just beyond.
+TEST(Difference, OppositeHuesAndGreysStayFinite) {
+    const Lab grey{50, 0, 0};
+    for (const Lab& lab : {Lab{50, 30, 0}, Lab{50, 0, -30}, Lab{50, -3, 4}, Lab{50, 1e-100, 0}}) {
+        const Lab opposite{50, -lab.a, -lab.b};
+        EXPECT_DOUBLE_EQ(deltaE2000(lab, opposite), deltaE2000(opposite, lab));
+        EXPECT_DOUBLE_EQ(deltaH(lab, opposite), 2 * std::hypot(lab.a, lab.b));
+        EXPECT_EQ(deltaE2000(lab, lab), 0);
+        EXPECT_EQ(deltaH(lab, grey), 0);
+        for (const int number : {0, 2, 3, 4, 5})
+            EXPECT_TRUE(std::isfinite(difference(formulaFromNumber(number), grey, lab)));
+    }
+}
+
+TEST(Difference, LabAndXyzAgreeWithLittleCms) {
+    for (const Pair& pair : somePairs(1000)) {
+        const cmsCIELab lab = peer(pair.first);
+        cmsCIEXYZ other;
+        cmsLab2XYZ(nullptr, &other, &lab);
+        const Xyz xyz = xyzFromLab(pair.first);
+        EXPECT_NEAR(xyz.X, other.X * 100, 1e-3);
+        EXPECT_NEAR(xyz.Y, other.Y * 100, 1e-3);
+        EXPECT_NEAR(xyz.Z, other.Z * 100, 1e-3);
+        const Lab back = labFromXyz(xyz);
+        EXPECT_NEAR(deltaE76(back, pair.first), 0, 1e-9);
+    }
+    EXPECT_NEAR(deltaE76(labFromXyz({96.42, 100, 82.49}), {100, 0, 0}), 0, 1e-12);
+}
