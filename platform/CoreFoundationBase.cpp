@@ -1,5 +1,0 @@
-#include "platform/CoreFoundationBase.h"
-
-void CFRelease(CFTypeRef object) {
-    delete static_cast<const platform::CFObject*>(object);
-}
