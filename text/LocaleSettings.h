@@ -1,0 +1,29 @@
+// The language of the machine's user, in three numberings.
+#pragma once
+
+#include <wx/string.h>
+
+namespace LocaleSettings {
+
+/// Language number of the system's own, after the user's preferred languages: the first that is
+/// known. 59, English, when none is.
+int MacGetUserLocale();
+
+/// The same.
+int GetSystemLanguagewX();
+
+/// Windows language identifier (and no code page, in spite of the name) of the user's language.
+int GetSystemCodePage();
+
+/// The same for a language number; a negative one means the user's language. 1033, English, for
+/// unknown numbers.
+int GetSystemCodePage(int language);
+
+/// The identifier of the user's language as decimal text.
+wxString GetSystemLanguageString();
+
+/// Text encoding of the user's language, a CFStringEncoding: 0, MacRoman, for most. Not all of them
+/// have a conversion here, see platform/CoreFoundationStrings.h.
+int GetMacSystemEncoding();
+
+} // namespace LocaleSettings
