@@ -10,8 +10,8 @@
 /// Type of a value. In a record, the value pointer is what the comment says; reading, it is the
 /// place that receives it.
 enum PARAM_TYPE : std::int32_t {
-    PARAM_DELETE = 0, ///< Setting: null, deletes. Reading: asks whether the key exists; a
-                      ///< PARAM_TYPE place, or null, receives the type that is stored.
+    PARAM_DELETE = 0,  ///< Setting: null, deletes. Reading: asks whether the key exists; a
+                       ///< PARAM_TYPE place, or null, receives the type that is stored.
     PARAM_POINTER = 1, ///< The void* itself, never what it points to.
     PARAM_INT = 2,     ///< int. Booleans travel as 0 and 1 of this type.
     PARAM_DOUBLE = 3,  ///< double
