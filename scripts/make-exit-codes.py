@@ -3,6 +3,7 @@
 
 make-exit-codes.py header docs/exit-codes.csv ExitCodes.h
 make-exit-codes.py man    docs/exit-codes.csv page.1.in page.1
+make-exit-codes.py table  docs/exit-codes.csv exit-codes.md
 """
 
 import csv
@@ -17,7 +18,8 @@ enum ExitCode : int {{
 {enumerators}
 }};
 
-/// What a code means to the person who meets it. All texts are UTF-8 and never null.
+/// What a code means to the person who meets it. All texts are ASCII, without a full stop at their
+/// end, and neither empty nor null.
 struct ExitCodeText {{
     int code;
     const char* name;
@@ -37,8 +39,13 @@ def rows_of(path):
     with open(path, newline="", encoding="utf-8") as source:
         rows = list(csv.DictReader(source))
     codes = [int(row["code"]) for row in rows]
-    if codes != sorted(set(codes)):
-        sys.exit(f"{path}: codes repeat or do not rise")
+    if codes != sorted(set(codes)) or codes[-1] > 255:
+        sys.exit(f"{path}: codes repeat, do not rise or are no exit codes")
+    for row in rows:
+        for part in ("name", "from", "meaning", "cause", "remedy"):
+            text = row[part]
+            if not text or not text.isascii() or text.endswith("."):
+                sys.exit(f"{path}: {row['code']}: '{part}' is empty, not ASCII or ends with a stop")
     return rows
 
 
@@ -68,14 +75,27 @@ def man(rows, template):
     lines = []
     for row in rows:
         lines += [".TP", f".B {row['code']}", roff(row["meaning"] + ".")]
-        lines += [roff(row[part] + ".") for part in ("cause", "remedy") if row[part]]
+        lines += [roff(row[part] + ".") for part in ("cause", "remedy")]
     with open(template, encoding="utf-8") as source:
         return source.read().replace("@EXIT_CODES@", "\n".join(lines))
 
 
+def table(rows):
+    parts = ("code", "from", "meaning", "cause", "remedy")
+    lines = [parts, ("---",) * len(parts), *([row[part] for part in parts] for row in rows)]
+    return (
+        "# Exit codes\n\n"
+        "Of the tool itself, of a job on the print server, and of the analysis library.\n\n"
+        + "".join("| " + " | ".join(cells) + " |\n" for cells in lines)
+    )
+
+
 def main(arguments):
     kind, source = arguments[0], rows_of(arguments[1])
-    text = header(source) if kind == "header" else man(source, arguments[2])
+    if kind == "man":
+        text = man(source, arguments[2])
+    else:
+        text = {"header": header, "table": table}[kind](source)
     with open(arguments[-1], "w", encoding="utf-8") as target:
         target.write(text)
 
