@@ -65,15 +65,16 @@ TEST(Spectra, WeightsAreThoseOfAstmE308) {
 }
 
 // Whatever the axis, the perfect diffuser is the white point of ASTM E308, and a smooth spectrum
-// gives the colour that it gives at 1 nm.
+// gives nearly the colour that it gives at 1 nm: the edges here are 18 nm wide, so that sampling
+// every 20 nm must cost something.
 TEST(Spectra, AllAxesAgree) {
     const struct {
         SpectralAxis axis;
         double tolerance; ///< In CIE76 against the spectrum at 1 nm.
-    } cases[] = {{{360, 1, 471}, 0},     {{360, 5, 95}, 0.001},  {{360, 10, 48}, 0.005},
-                 {{340, 10, 40}, 0.005}, {{300, 5, 131}, 0.001}, {{380, 10, 36}, 0.01},
-                 {{375, 10, 38}, 0.01},  {{360, 20, 24}, 0.12},  {{400, 10, 31}, 0.1},
-                 {{400, 20, 16}, 0.25},  {{380, 3, 120}, 0.01}};
+    } cases[] = {{{360, 1, 471}, 0},    {{360, 5, 95}, 0.001}, {{300, 5, 131}, 0.001},
+                 {{360, 10, 48}, 0.02}, {{340, 10, 40}, 0.02}, {{380, 10, 36}, 0.02},
+                 {{375, 10, 38}, 0.02}, {{360, 20, 24}, 0.25}, {{400, 20, 16}, 0.25},
+                 {{400, 10, 31}, 0.1}};
     const SpectralAxis fine{360, 1, 471};
     const SpectralWeights fineWeights(fine);
     for (const auto& c : cases) {
