@@ -105,7 +105,7 @@ TEST_F(CLoggerTest, StaysClosedWhereTheNameIsNotOurs) {
 // Only root can make another user's file, and only root could write into it.
 TEST_F(CLoggerTest, LeavesAnotherUsersFileAlone) {
     const std::string path = m_folder.write("log", "untouched");
-    support::giveToOrdinaryUser(path);
+    support::giveTo(support::ordinaryUser, path);
     CLogger::InitLogger(path);
     CLogger::DeleteLogger();
     EXPECT_EQ(contentsOf(path), geteuid() == 0 ? "untouched" : "");

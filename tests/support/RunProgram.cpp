@@ -16,8 +16,6 @@ namespace support {
 
 namespace {
 
-constexpr uid_t nobody = 65534;
-
 using Clock = std::chrono::steady_clock;
 
 struct Pipe {
@@ -77,8 +75,8 @@ std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     const int nothing = open("/dev/null", O_RDONLY);
     dup2(nothing, STDIN_FILENO);
     dup2(error, STDERR_FILENO);
-    if (options.ordinaryUser && !dropToOrdinaryUser()) {
-        refuse("drop to an ordinary user");
+    if (options.user != 0 && !becomeUser(options.user)) {
+        refuse("become another user");
     }
     if (!options.outputPath.empty()) {
         output = open(options.outputPath.c_str(), O_WRONLY | O_CREAT, 0644);
@@ -166,13 +164,12 @@ Outcome run(const std::vector<std::string>& command, const RunOptions& options) 
     return outcome;
 }
 
-bool dropToOrdinaryUser() {
-    return geteuid() != 0 ||
-           (setgroups(0, nullptr) == 0 && setgid(nobody) == 0 && setuid(nobody) == 0);
+bool becomeUser(unsigned user) {
+    return geteuid() != 0 || (setgroups(0, nullptr) == 0 && setgid(user) == 0 && setuid(user) == 0);
 }
 
-void giveToOrdinaryUser(const std::string& path) {
-    if (geteuid() == 0 && lchown(path.c_str(), nobody, nobody) != 0) {
+void giveTo(unsigned user, const std::string& path) {
+    if (geteuid() == 0 && lchown(path.c_str(), user, user) != 0) {
         throw std::runtime_error("can't give away " + path);
     }
 }

@@ -9,12 +9,15 @@
 
 namespace support {
 
+/// A user whom permissions bind.
+inline constexpr unsigned ordinaryUser = 65534;
+
 struct RunOptions {
     /// Changes to this process's environment; an empty optional takes the variable out.
     std::map<std::string, std::optional<std::string>> environment;
-    std::string folder;        ///< Working folder; empty: this process's own.
-    std::string outputPath;    ///< Standard output goes there instead of into Outcome::output.
-    bool ordinaryUser = false; ///< Without the rights of root; see dropToOrdinaryUser.
+    std::string folder;     ///< Working folder; empty: this process's own.
+    std::string outputPath; ///< Standard output goes there instead of into Outcome::output.
+    unsigned user = 0;      ///< Root becomes this user first; anybody else stays who he is.
     std::chrono::milliseconds limit{60'000}; ///< Then the program and its children are killed.
 };
 
@@ -30,12 +33,11 @@ struct Outcome {
 /// code 127 where it can't be started. Standard input is empty.
 Outcome run(const std::vector<std::string>& command, const RunOptions& options = {});
 
-/// For root, makes this process one of the user "nobody", whom permissions bind; there is no way
-/// back. For anybody else does nothing. False if that fails.
-bool dropToOrdinaryUser();
+/// Makes root's process one of this user; there is no way back. For anybody but root does nothing.
+/// False if that fails.
+bool becomeUser(unsigned user);
 
-/// Gives a file or folder to the user that dropToOrdinaryUser makes. For anybody but root does
-/// nothing.
-void giveToOrdinaryUser(const std::string& path);
+/// Gives a file or folder to a user. For anybody but root does nothing.
+void giveTo(unsigned user, const std::string& path);
 
 } // namespace support
