@@ -15,7 +15,9 @@ from pathlib import Path
 
 # What stands behind each target's arrows. A new target, or a new arrow, is stated here first.
 ARROWS = {
-    "platform": "",
+    "propertylist": "",
+    "plist-reader": "propertylist",
+    "platform": "propertylist",
     "text": "platform",
     "ticketrecords": "",
     "ticket": "ticketrecords text",
