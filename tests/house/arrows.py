@@ -17,7 +17,8 @@ from pathlib import Path
 ARROWS = {
     "propertylist": "",
     "plist-reader": "propertylist",
-    "platform": "propertylist",
+    "platformrecords": "",
+    "platform": "platformrecords propertylist",
     "text": "platform",
     "ticketrecords": "",
     "ticket": "ticketrecords text",
@@ -37,6 +38,7 @@ ARROWS = {
 
 # Arrows that go on through a target, because a header that it publishes needs them itself.
 EXPOSES = {
+    "platform": "platformrecords",
     "analysis": "records",
     "ticket": "ticketrecords",
 }
