@@ -33,7 +33,8 @@ ARROWS = {
     "report": "",
     "analysis": "colour records",  # libTintgate without its ten functions' names
     "libTintgate": "analysis colour records",
-    "ComGUI": "ticketrecords StoreEngine",
+    "ticketengine": "ticketrecords",
+    "ComGUI": "ticketrecords ticketengine StoreEngine",
 }
 
 # Arrows that go on through a target, because a header that it publishes needs them itself.
@@ -41,6 +42,7 @@ EXPOSES = {
     "platform": "platformrecords",
     "analysis": "records",
     "ticket": "ticketrecords",
+    "ticketengine": "ticketrecords",
 }
 
 # Made by the build for everybody who returns or explains an exit code.

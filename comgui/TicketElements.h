@@ -1,0 +1,90 @@
+// The elements of one key.
+#pragma once
+
+#include <cstddef>
+#include <map>
+#include <memory>
+#include <vector>
+
+#include "comgui/TicketValue.h"
+
+namespace store {
+
+inline constexpr int highestPosition = 0xFFFFFF; ///< 16,777,215; positions beyond are refused.
+
+/// Values by position, with holes. Each element has a type of its own.
+///
+/// The count is the highest filled position plus one: the last position is never a hole.
+class Elements {
+  public:
+    bool empty() const { return m_filled == 0; }
+    /// At most highestPosition + 1.
+    int count() const;
+
+    /// Null for a hole and beyond the end.
+    const Value* at(int position) const;
+    /// The element of the lowest position; null when there is none.
+    const Value* first() const;
+
+    /// Sets the element at a position from 0 to highestPosition. Positions that are passed over
+    /// become holes.
+    void put(int position, Value value);
+
+    /// Takes out what stands at the position, be it a hole; what stands behind it moves up, and
+    /// holes that then end the key go. False beyond the end.
+    bool remove(int position);
+
+    /// Calls visit(position, value) for each element in ascending order as long as it gives true.
+    template<class Visit>
+    void visit(Visit visit) const {
+        for (std::size_t i = 0; i < m_near.size(); ++i) {
+            if (typeOf(m_near[i]) != PARAM_DELETE && !visit(static_cast<int>(i), m_near[i])) {
+                return;
+            }
+        }
+        for (const auto& [position, value] : m_far) {
+            if (!visit(position, value)) {
+                return;
+            }
+        }
+    }
+
+  private:
+    std::size_t nearLimit() const;
+    void settle();
+
+    // A lone element far out must not cost the memory of all the holes in front of it, whereas an
+    // array that is filled in any order is to end up as an array. So elements stand in m_near up to
+    // a size that follows from their number, and what lies beyond in m_far.
+    std::vector<Value> m_near;
+    std::map<int, Value> m_far;
+    std::size_t m_filled = 0; ///< Elements in both, holes not counted.
+};
+
+/// The object itself where nobody else holds it, else a copy that takes its place.
+template<class T>
+T& own(std::shared_ptr<T>& shared) {
+    if (!shared) {
+        shared = std::make_shared<T>();
+    } else if (shared.use_count() > 1) {
+        shared = std::make_shared<T>(*shared);
+    }
+    return *shared;
+}
+
+/// Changes a key as one record of a table asks; a null pointer is a key that isn't there.
+///
+/// Position -1 set replaces the key by one element, -2 appends. Deleting with -1 succeeds in any
+/// case, an element only if it does not lie beyond the end, and with the last element the key goes.
+/// False, and the key is untouched, for a value that can't be kept and for any other position.
+bool setElement(std::shared_ptr<Elements>& key, PARAM_TYPE type, const void* value, int position);
+
+/// Reads from a key; null is a key that isn't there.
+///
+/// A value is found only under its own type; position -1 means the first element. PARAM_DELETE asks
+/// for the type, to a place that may be null, and PARAM_COUNT, at position -1 only, for the count.
+/// False, and the place is untouched, when there is nothing or no place for a value.
+bool readElement(const Elements* key, PARAM_TYPE type, void* out, int position,
+                 HandedOut& handedOut);
+
+} // namespace store

@@ -1,0 +1,214 @@
+// Parameters as short lines of text, so that a table of test cases shows them side by side.
+//
+// Records are parted by blanks and read key[position]=value:
+//
+//   a[-1]=5      int               b[0]=2.5     double; also nan, inf, -inf
+//   c[1]='text   string            d[-1]=#00ff  binary, in hexadecimal
+//   e[0]=u5      unsigned int      f[0]=l-5     long long
+//   g[0]=U5      unsigned 64-bit   h[0]=p16     pointer
+//   i[-1]=-      deletion
+//
+// Without a position a list of values is a whole vector as it is sent: a=1,2,3 stands for
+// a[-1]=1 a[1]=2 a[2]=3.
+#pragma once
+
+#include <cmath>
+#include <cstdint>
+#include <cstdio>
+#include <cstring>
+#include <deque>
+#include <memory>
+#include <sstream>
+#include <stdexcept>
+#include <string>
+#include <variant>
+#include <vector>
+
+#include "ticket/TicketRecords.h"
+
+namespace support {
+
+inline std::string valueText(PARAM_TYPE type, const void* value) {
+    if (type == PARAM_DELETE) {
+        return "-";
+    }
+    if (type == PARAM_POINTER) {
+        return "p" + std::to_string(reinterpret_cast<std::uintptr_t>(value));
+    }
+    if (value == nullptr) {
+        return "null";
+    }
+    switch (type) {
+    case PARAM_INT:
+        return std::to_string(*static_cast<const int*>(value));
+    case PARAM_UINT:
+        return "u" + std::to_string(*static_cast<const unsigned*>(value));
+    case PARAM_INT64:
+        return "l" + std::to_string(*static_cast<const long long*>(value));
+    case PARAM_UINT64:
+        return "U" + std::to_string(*static_cast<const unsigned long long*>(value));
+    case PARAM_STRING:
+        return std::string("'") + static_cast<const char*>(value);
+    case PARAM_DOUBLE: {
+        const double number = *static_cast<const double*>(value);
+        if (std::isnan(number)) {
+            return "nan";
+        }
+        char text[40];
+        std::snprintf(text, sizeof text, "%.17g", number);
+        return std::strpbrk(text, ".en") != nullptr ? text : std::string(text) + ".0";
+    }
+    case PARAM_BINARY: {
+        std::string text = "#";
+        for (const unsigned char byte : *static_cast<const BIN_STRING*>(value)) {
+            char digits[3];
+            std::snprintf(digits, sizeof digits, "%02x", byte);
+            text += digits;
+        }
+        return text;
+    }
+    default:
+        return "?" + std::to_string(type);
+    }
+}
+
+inline std::string recordText(const char* key, PARAM_TYPE type, const void* value, int position) {
+    return std::string(key) + "[" + std::to_string(position) + "]=" + valueText(type, value);
+}
+
+inline std::string tableText(const SETMULTIPAR* table) {
+    std::string text;
+    for (; table != nullptr && table->key != nullptr; ++table) {
+        text += (text.empty() ? "" : " ") +
+                recordText(table->key, table->type, table->value, table->position);
+    }
+    return text;
+}
+
+/// The results of a table's records, as ones and zeros.
+inline std::string resultText(const SETMULTIPAR* table) {
+    std::string text;
+    for (; table->key != nullptr; ++table) {
+        text += table->ok() ? '1' : '0';
+    }
+    return text;
+}
+
+/// All that a walk shows of a ticket; "null" for none.
+inline std::string ticketText(const STICKET_ACCESS* access) {
+    if (access == nullptr) {
+        return "null";
+    }
+    std::string text;
+    const SCollect collect = [](void* context, const char* key, PARAM_TYPE type, const void* value,
+                                int position) {
+        auto& out = *static_cast<std::string*>(context);
+        out += (out.empty() ? "" : " ") + recordText(key, type, value, position);
+        return true;
+    };
+    ticket::single::Walk::call(*access, collect, static_cast<void*>(&text), "", 8000);
+    return text;
+}
+
+/// A table made of text, with all that it points to.
+class RecordTable {
+  public:
+    explicit RecordTable(const std::string& text) {
+        std::istringstream words(text);
+        for (std::string word; words >> word;) {
+            addWord(word);
+        }
+        m_records.emplace_back();
+    }
+    RecordTable(const RecordTable&) = delete;
+
+    SETMULTIPAR* records() { return m_records.data(); }
+
+  private:
+    using Owned = std::variant<int, unsigned, long long, unsigned long long, double>;
+
+    void addWord(const std::string& word) {
+        const auto equals = word.find('=');
+        if (equals == std::string::npos) {
+            throw std::invalid_argument("no value in " + word);
+        }
+        std::string key = word.substr(0, equals);
+        const std::string values = word.substr(equals + 1);
+        const auto bracket = key.rfind('[');
+        if (bracket != std::string::npos) {
+            const int position = std::stoi(key.substr(bracket + 1));
+            add(key.substr(0, bracket), values, position);
+            return;
+        }
+        std::istringstream list(values);
+        int position = POSITION_WHOLE;
+        for (std::string value; std::getline(list, value, ',');) {
+            add(key, value, position);
+            position = position == POSITION_WHOLE ? 1 : position + 1;
+        }
+    }
+
+    void add(const std::string& key, const std::string& value, int position) {
+        SETMULTIPAR record;
+        record.key = own(key);
+        record.position = position;
+        const std::string rest = value.substr(value.empty() ? 0 : 1);
+        switch (value.empty() ? '\0' : value.front()) {
+        case '\'':
+            set(record, PARAM_STRING, own(rest));
+            break;
+        case '#':
+            set(record, PARAM_BINARY, ownBinary(rest));
+            break;
+        case 'p':
+            set(record, PARAM_POINTER, reinterpret_cast<const void*>(std::stoull(rest)));
+            break;
+        case 'u':
+            set(record, PARAM_UINT, own(static_cast<unsigned>(std::stoul(rest))));
+            break;
+        case 'l':
+            set(record, PARAM_INT64, own(std::stoll(rest)));
+            break;
+        case 'U':
+            set(record, PARAM_UINT64, own(std::stoull(rest)));
+            break;
+        default:
+            if (value == "-") {
+                break;
+            }
+            if (value.find_first_of(".en") != std::string::npos) {
+                set(record, PARAM_DOUBLE, own(std::stod(value)));
+            } else {
+                set(record, PARAM_INT, own(std::stoi(value)));
+            }
+        }
+        m_records.push_back(record);
+    }
+
+    static void set(SETMULTIPAR& record, PARAM_TYPE type, const void* value) {
+        record.type = type;
+        record.value = value;
+    }
+
+    const char* own(const std::string& text) { return m_texts.emplace_back(text).c_str(); }
+
+    template<class T>
+    const T* own(T value) {
+        return &std::get<T>(m_numbers.emplace_back(value));
+    }
+
+    const BIN_STRING* ownBinary(const std::string& digits) {
+        std::string bytes;
+        for (std::size_t i = 0; i + 1 < digits.size(); i += 2) {
+            bytes += static_cast<char>(std::stoi(digits.substr(i, 2), nullptr, 16));
+        }
+        return &m_binaries.emplace_back(m_texts.emplace_back(bytes));
+    }
+
+    std::vector<SETMULTIPAR> m_records;
+    std::deque<std::string> m_texts;
+    std::deque<Owned> m_numbers;
+    std::deque<BIN_STRING> m_binaries;
+};
+
+} // namespace support
