@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "platform/CodePage.h"
+#include "platform/Utf8.h"
 
 namespace {
 
@@ -16,50 +17,11 @@ bool isLowSurrogate(char16_t unit) {
     return (unit & 0xFC00) == 0xDC00;
 }
 
-bool isCharacter(char32_t c) {
-    return c <= 0x10FFFF && (c & 0xFFFFF800) != 0xD800;
-}
-
-/// Lead bytes of UTF-8 by the number of bytes that follow, and the smallest character that needs
-/// as many.
-constexpr struct {
-    unsigned char mask;
-    unsigned char lead;
-    char32_t smallest;
-} sequences[] = {{0x80, 0x00, 0x0}, {0xE0, 0xC0, 0x80}, {0xF0, 0xE0, 0x800}, {0xF8, 0xF0, 0x10000}};
-
-/// Takes one character off the front of a text that is not empty.
-std::optional<char32_t> takeUtf8(std::string_view& text) {
-    const auto lead = static_cast<unsigned char>(text.front());
-    for (std::size_t following = 0; following < std::size(sequences); ++following) {
-        const auto& form = sequences[following];
-        if ((lead & form.mask) != form.lead) {
-            continue;
-        }
-        if (text.size() <= following) {
-            return std::nullopt;
-        }
-        char32_t c = lead & static_cast<unsigned char>(~form.mask);
-        for (const char next : text.substr(1, following)) {
-            if ((next & 0xC0) != 0x80) {
-                return std::nullopt;
-            }
-            c = c << 6 | (next & 0x3F);
-        }
-        if (c < form.smallest || !isCharacter(c)) {
-            return std::nullopt;
-        }
-        text.remove_prefix(following + 1);
-        return c;
-    }
-    return std::nullopt;
-}
-
 std::optional<std::u16string> decodeUtf8(std::string_view text) {
     std::u16string units;
     units.reserve(text.size());
     while (!text.empty()) {
-        const auto c = takeUtf8(text);
+        const auto c = platform::takeUtf8(text);
         if (!c) {
             return std::nullopt;
         }
@@ -73,17 +35,6 @@ std::optional<std::u16string> decodeUtf8(std::string_view text) {
     return units;
 }
 
-void appendUtf8(std::string& text, char32_t c) {
-    std::size_t following = std::size(sequences) - 1;
-    while (c < sequences[following].smallest) {
-        --following;
-    }
-    text += static_cast<char>(sequences[following].lead | c >> 6 * following);
-    while (following-- > 0) {
-        text += static_cast<char>(0x80 | (c >> 6 * following & 0x3F));
-    }
-}
-
 std::optional<std::string> encodeUtf8(std::u16string_view units) {
     std::string text;
     text.reserve(units.size());
@@ -92,10 +43,10 @@ std::optional<std::string> encodeUtf8(std::u16string_view units) {
         if (isHighSurrogate(units[i]) && i + 1 < units.size() && isLowSurrogate(units[i + 1])) {
             c = 0x10000 + ((c & 0x3FF) << 10 | (units[++i] & 0x3FF));
         }
-        if (!isCharacter(c)) {
+        if (!platform::isCharacter(c)) {
             return std::nullopt;
         }
-        appendUtf8(text, c);
+        platform::appendUtf8(text, c);
     }
     return text;
 }

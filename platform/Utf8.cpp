@@ -1,0 +1,55 @@
+#include "platform/Utf8.h"
+
+#include <iterator>
+
+namespace platform {
+namespace {
+
+/// Lead bytes of UTF-8 by the number of bytes that follow, and the smallest character that needs
+/// as many.
+constexpr struct {
+    unsigned char mask;
+    unsigned char lead;
+    char32_t smallest;
+} sequences[] = {{0x80, 0x00, 0x0}, {0xE0, 0xC0, 0x80}, {0xF0, 0xE0, 0x800}, {0xF8, 0xF0, 0x10000}};
+
+} // namespace
+
+std::optional<char32_t> takeUtf8(std::string_view& text) {
+    const auto lead = static_cast<unsigned char>(text.front());
+    for (std::size_t following = 0; following < std::size(sequences); ++following) {
+        const auto& form = sequences[following];
+        if ((lead & form.mask) != form.lead) {
+            continue;
+        }
+        if (text.size() <= following) {
+            return std::nullopt;
+        }
+        char32_t c = lead & static_cast<unsigned char>(~form.mask);
+        for (const char next : text.substr(1, following)) {
+            if ((next & 0xC0) != 0x80) {
+                return std::nullopt;
+            }
+            c = c << 6 | (next & 0x3F);
+        }
+        if (c < form.smallest || !isCharacter(c)) {
+            return std::nullopt;
+        }
+        text.remove_prefix(following + 1);
+        return c;
+    }
+    return std::nullopt;
+}
+
+void appendUtf8(std::string& text, char32_t c) {
+    std::size_t following = std::size(sequences) - 1;
+    while (c < sequences[following].smallest) {
+        --following;
+    }
+    text += static_cast<char>(sequences[following].lead | c >> 6 * following);
+    while (following-- > 0) {
+        text += static_cast<char>(0x80 | (c >> 6 * following & 0x3F));
+    }
+}
+
+} // namespace platform
