@@ -1,15 +1,14 @@
 #include "colour/Spectra.h"
 
 #include <cmath>
-#include <cstdlib>
-#include <filesystem>
-#include <fstream>
+#include <sstream>
 #include <string>
 #include <vector>
 
 #include <gtest/gtest.h>
-#include <unistd.h>
 
+#include "RunProgram.h"
+#include "ScratchFolder.h"
 #include "colour/Difference.h"
 
 using namespace colour;
@@ -96,14 +95,12 @@ TEST(Spectra, AllAxesAgree) {
 // spec2cie integrates with D50 drawn in straight lines between the entries of its table, which
 // accounts for the hundredth.
 TEST(Spectra, AgreesWithSpec2cie) {
-    const auto folder =
-        std::filesystem::temp_directory_path() / ("tintgate-spectra-" + number(getpid()));
-    std::filesystem::create_directories(folder);
+    const support::ScratchFolder folder;
     const int patches = 30;
     for (const SpectralAxis axis : {SpectralAxis{360, 1, 471}, SpectralAxis{360, 10, 48},
                                     SpectralAxis{380, 10, 36}, SpectralAxis{400, 10, 31}}) {
         SCOPED_TRACE(number(axis.base) + " by " + number(axis.step));
-        std::ofstream input(folder / "in.ti3");
+        std::ostringstream input;
         const int end = axis.base + axis.step * (axis.length - 1);
         input << "CTI3\n\nKEYWORD \"DEVICE_CLASS\"\nDEVICE_CLASS \"OUTPUT\"\n"
               << "KEYWORD \"COLOR_REP\"\nCOLOR_REP \"RGB_XYZ\"\n"
@@ -126,11 +123,11 @@ TEST(Spectra, AgreesWithSpec2cie) {
             input << '\n';
         }
         input << "END_DATA\n";
-        input.close();
-        const std::string command = "cd '" + folder.string() + "' && spec2cie -n in.ti3 out.ti3";
-        ASSERT_EQ(std::system(command.c_str()), 0);
+        const auto outcome = support::run(
+            {"spec2cie", "-n", folder.write("in.ti3", input.str()), folder.path("out.ti3")});
+        ASSERT_EQ(outcome.exitCode, 0) << outcome.error;
 
-        std::ifstream output(folder / "out.ti3");
+        std::istringstream output(support::contentsOf(folder.path("out.ti3")));
         std::string line;
         while (std::getline(output, line) && line != "BEGIN_DATA") {
         }
@@ -145,7 +142,6 @@ TEST(Spectra, AgreesWithSpec2cie) {
             EXPECT_LE(deltaE76(ours, lab), 0.03) << patch;
         }
     }
-    std::filesystem::remove_all(folder);
 }
 
 TEST(Spectra, AxesThatCannotServe) {

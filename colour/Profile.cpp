@@ -1,0 +1,193 @@
+#include "colour/Profile.h"
+
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstdint>
+
+#include <lcms2.h>
+
+namespace colour {
+namespace {
+
+// ICC.1, 7.2: a header of 128 bytes, of which these are looked at before the profile is opened.
+constexpr std::size_t headerBytes = 128;
+constexpr std::size_t classOffset = 12;
+constexpr std::size_t spaceOffset = 16;
+constexpr std::size_t signatureOffset = 36;
+
+constexpr std::size_t batch = 512; ///< Patches handed to LittleCMS at a time.
+
+std::uint32_t wordAt(std::string_view bytes, std::size_t offset) {
+    std::uint32_t word = 0;
+    for (std::size_t i = 0; i < 4; ++i)
+        word = word << 8 | static_cast<unsigned char>(bytes[offset + i]);
+    return word;
+}
+
+/// What the header alone rules out. A profile shorter than its header says is cut off: LittleCMS
+/// would pass over the tags that are gone and might evaluate another one in their place.
+Failure checkHeader(std::string_view bytes) {
+    if (!looksLikeProfile(bytes) || bytes.size() < headerBytes || wordAt(bytes, 0) > bytes.size())
+        return Failure::ProfileDamaged;
+    switch (wordAt(bytes, classOffset)) {
+    case cmsSigOutputClass:
+    case cmsSigInputClass:
+    case cmsSigDisplayClass:
+    case cmsSigColorSpaceClass:
+        break;
+    default:
+        return Failure::ProfileClass;
+    }
+    return wordAt(bytes, spaceOffset) == cmsSigCmykData ? Failure::None
+                                                        : Failure::ProfileColourSpace;
+}
+
+/// Absolute colorimetry rests on the media white; LittleCMS would take D50 where there is none.
+bool hasMediaWhite(cmsHPROFILE profile) {
+    const auto* white =
+        static_cast<const cmsCIEXYZ*>(cmsReadTag(profile, cmsSigMediaWhitePointTag));
+    return white && white->X > 0 && white->Y > 0 && white->Z > 0;
+}
+
+/// False for what only a damaged table of floats can give.
+bool isColour(const cmsCIELab& lab) {
+    constexpr double farOut = 10'000;
+    return std::abs(lab.L) < farOut && std::abs(lab.a) < farOut && std::abs(lab.b) < farOut;
+}
+
+void appendUtf8(std::string& text, std::uint32_t point) {
+    if (point < 0x80) {
+        text += static_cast<char>(point);
+    } else if (point < 0x800) {
+        text += static_cast<char>(0xC0 | point >> 6);
+        text += static_cast<char>(0x80 | (point & 0x3F));
+    } else if (point < 0x10000) {
+        text += static_cast<char>(0xE0 | point >> 12);
+        text += static_cast<char>(0x80 | (point >> 6 & 0x3F));
+        text += static_cast<char>(0x80 | (point & 0x3F));
+    } else {
+        text += static_cast<char>(0xF0 | point >> 18);
+        text += static_cast<char>(0x80 | (point >> 12 & 0x3F));
+        text += static_cast<char>(0x80 | (point >> 6 & 0x3F));
+        text += static_cast<char>(0x80 | (point & 0x3F));
+    }
+}
+
+/// The description in English, else in the profile's first language. LittleCMS hands out UTF-16
+/// units, one in each wide character, and the bytes of an older profile's text with their sign
+/// extended: those are read as Latin-1.
+std::string descriptionOf(cmsHPROFILE profile) {
+    std::array<wchar_t, 1024> units{};
+    cmsGetProfileInfo(profile, cmsInfoDescription, "en", "US", units.data(),
+                      sizeof units - sizeof units[0]);
+    std::string text;
+    for (std::size_t i = 0; units[i]; ++i) {
+        auto point = static_cast<std::uint32_t>(units[i]);
+        const auto next = static_cast<std::uint32_t>(units[i + 1]);
+        if (point >= 0xD800 && point < 0xDC00 && next >= 0xDC00 && next < 0xE000) {
+            point = 0x10000 + ((point - 0xD800) << 10) + (next - 0xDC00);
+            ++i;
+        } else if (point >= 0xFFFFFF80) {
+            point &= 0xFF;
+        } else if ((point >= 0xD800 && point < 0xE000) || point > 0x10FFFF) {
+            point = 0xFFFD;
+        }
+        appendUtf8(text, point);
+    }
+    return text;
+}
+
+struct ContextDeleter {
+    void operator()(cmsContext context) const { cmsDeleteContext(context); }
+};
+struct ProfileCloser {
+    void operator()(cmsHPROFILE profile) const { cmsCloseProfile(profile); }
+};
+struct TransformDeleter {
+    void operator()(cmsHTRANSFORM transform) const { cmsDeleteTransform(transform); }
+};
+template<class Handle, class Deleter>
+using Owned = std::unique_ptr<std::remove_pointer_t<Handle>, Deleter>;
+
+} // namespace
+
+struct Profile::State {
+    // A context of its own: nothing that other code sets in the process (error handler, adaptation
+    // state, plug-ins) reaches the transform. It goes last.
+    Owned<cmsContext, ContextDeleter> context;
+    Owned<cmsHTRANSFORM, TransformDeleter> transform;
+    std::string description;
+};
+
+Profile::Profile() : m_state(std::make_unique<State>()) {}
+Profile::~Profile() = default;
+Profile::Profile(Profile&&) noexcept = default;
+Profile& Profile::operator=(Profile&&) noexcept = default;
+
+bool looksLikeProfile(std::string_view bytes) {
+    return bytes.size() >= signatureOffset + 4 && bytes.substr(signatureOffset, 4) == "acsp";
+}
+
+Failure Profile::open(std::string_view bytes) {
+    if (const Failure failure = checkHeader(bytes); failure != Failure::None)
+        return failure;
+
+    auto state = std::make_unique<State>();
+    state->context.reset(cmsCreateContext(nullptr, nullptr));
+    if (!state->context)
+        return Failure::OutOfMemory;
+    cmsContext context = state->context.get();
+
+    const Owned<cmsHPROFILE, ProfileCloser> profile{cmsOpenProfileFromMemTHR(
+        context, bytes.data(), static_cast<cmsUInt32Number>(bytes.size()))};
+    if (!profile)
+        return Failure::ProfileDamaged;
+    const Owned<cmsHPROFILE, ProfileCloser> lab{cmsCreateLab4ProfileTHR(context, nullptr)};
+    if (!lab)
+        return Failure::OutOfMemory;
+    if (!hasMediaWhite(profile.get()))
+        return Failure::ProfileUnusable;
+
+    // The observer counts as fully adapted, which is the absolute colorimetry of ICC.1; formats of
+    // doubles keep LittleCMS on its floating-point road.
+    std::array<cmsHPROFILE, 2> chain{profile.get(), lab.get()};
+    std::array<cmsBool, 2> blackPoint{FALSE, FALSE};
+    std::array<cmsUInt32Number, 2> intents{INTENT_ABSOLUTE_COLORIMETRIC,
+                                           INTENT_ABSOLUTE_COLORIMETRIC};
+    std::array<cmsFloat64Number, 2> adapted{1.0, 1.0};
+    state->transform.reset(cmsCreateExtendedTransform(
+        context, chain.size(), chain.data(), blackPoint.data(), intents.data(), adapted.data(),
+        nullptr, 0, TYPE_CMYK_DBL, TYPE_Lab_DBL, cmsFLAGS_NOOPTIMIZE | cmsFLAGS_NOCACHE));
+    if (!state->transform)
+        return Failure::ProfileUnusable;
+    state->description = descriptionOf(profile.get());
+    m_state = std::move(state);
+    return Failure::None;
+}
+
+Failure Profile::evaluate(const double* cmyk, std::size_t count, std::size_t stride,
+                          Lab* lab) const {
+    std::array<double, 4 * batch> inks;
+    std::array<cmsCIELab, batch> colours;
+    for (std::size_t done = 0; done < count;) {
+        const std::size_t now = std::min(batch, count - done);
+        for (std::size_t i = 0; i < now; ++i)
+            for (std::size_t ink = 0; ink < 4; ++ink)
+                inks[4 * i + ink] = std::clamp(cmyk[(done + i) * stride + ink], 0.0, 100.0);
+        cmsDoTransform(m_state->transform.get(), inks.data(), colours.data(),
+                       static_cast<cmsUInt32Number>(now));
+        for (std::size_t i = 0; i < now; ++i)
+            lab[done + i] = {colours[i].L, colours[i].a, colours[i].b};
+        if (!std::all_of(colours.begin(), colours.begin() + now, isColour))
+            return Failure::ProfileUnusable;
+        done += now;
+    }
+    return Failure::None;
+}
+
+const std::string& Profile::description() const {
+    return m_state->description;
+}
+
+} // namespace colour
