@@ -1,0 +1,261 @@
+#include "analysis/JsonWriter.h"
+
+#include <charconv>
+#include <cmath>
+#include <cstdlib>
+#include <cstring>
+#include <new>
+
+#include "analysis/Text.h"
+
+namespace analysis {
+namespace {
+
+constexpr std::size_t longestNumber = 32;
+
+char* writeDigits(char* at, std::uint64_t value) {
+    return std::to_chars(at, at + 20, value).ptr;
+}
+
+/// Six decimals without the zeros at their end; `millionths` is below a million.
+char* writeFraction(char* at, std::uint32_t millionths) {
+    if (millionths == 0)
+        return at;
+    *at++ = '.';
+    for (std::uint32_t unit = 100000; millionths > 0; unit /= 10) {
+        *at++ = static_cast<char>('0' + millionths / unit);
+        millionths %= unit;
+    }
+    return at;
+}
+
+/// The shortest form of a value rounded to six decimals, halves to even as printf has it. A product
+/// with a million carries a rounding of its own, so what lies near a half is left to the exact
+/// conversion, as is all that would not fit.
+char* writeNumber(char* at, double value) {
+    const double size = std::abs(value);
+    if (size >= 1e9)
+        return std::to_chars(at, at + longestNumber, value).ptr;
+    const double scaled = size * 1e6;
+    auto millionths = static_cast<std::uint64_t>(scaled);
+    const double rest = scaled - static_cast<double>(millionths);
+    if (std::abs(rest - 0.5) <= scaled * 2.3e-16) {
+        char digits[longestNumber];
+        const char* const end =
+            std::to_chars(digits, digits + longestNumber, size, std::chars_format::fixed, 6).ptr;
+        std::uint64_t whole = 0;
+        std::uint32_t fraction = 0;
+        std::from_chars(digits, end - 7, whole);
+        std::from_chars(end - 6, end, fraction);
+        millionths = whole * 1000000 + fraction;
+    } else {
+        millionths += rest > 0.5;
+    }
+    if (value < 0 && millionths > 0)
+        *at++ = '-';
+    at = writeDigits(at, millionths / 1000000);
+    return writeFraction(at, static_cast<std::uint32_t>(millionths % 1000000));
+}
+
+} // namespace
+
+JsonWriter::JsonWriter(std::size_t expected) {
+    room(expected);
+}
+
+JsonWriter::~JsonWriter() {
+    std::free(m_begin);
+}
+
+/// malloc and realloc: a large buffer grows by moving pages, not bytes, and none is zeroed first.
+void JsonWriter::room(std::size_t bytes) {
+    if (static_cast<std::size_t>(m_end - m_at) >= bytes)
+        return;
+    const auto used = static_cast<std::size_t>(m_at - m_begin);
+    const std::size_t size = used + bytes + used / 2;
+    auto* const grown = static_cast<char*>(std::realloc(m_begin, size));
+    if (!grown)
+        throw std::bad_alloc();
+    m_begin = grown;
+    m_at = grown + used;
+    m_end = grown + size;
+}
+
+void JsonWriter::raw(std::string_view ascii) {
+    room(ascii.size());
+    std::memcpy(m_at, ascii.data(), ascii.size());
+    m_at += ascii.size();
+}
+
+void JsonWriter::lineBreak() {
+    if (m_compactFrom > 0)
+        return;
+    const auto indent = static_cast<std::size_t>(m_depth) * 2;
+    room(1 + indent);
+    *m_at++ = '\n';
+    std::memset(m_at, ' ', indent);
+    m_at += indent;
+}
+
+/// Before every value and every key.
+void JsonWriter::separate() {
+    if (m_afterKey) {
+        m_afterKey = false;
+        return;
+    }
+    if (!m_first) {
+        room(1);
+        *m_at++ = ',';
+    }
+    if (m_depth > 0)
+        lineBreak();
+    m_first = false;
+}
+
+void JsonWriter::open(char bracket) {
+    separate();
+    room(1);
+    *m_at++ = bracket;
+    ++m_depth;
+    m_first = true;
+}
+
+void JsonWriter::close(char bracket) {
+    --m_depth;
+    if (!m_first)
+        lineBreak();
+    room(1);
+    *m_at++ = bracket;
+    m_first = false;
+    if (m_depth < m_compactFrom)
+        m_compactFrom = 0;
+}
+
+void JsonWriter::beginCompactObject() {
+    beginObject();
+    if (m_compactFrom == 0)
+        m_compactFrom = m_depth;
+}
+
+void JsonWriter::beginCompactArray() {
+    beginArray();
+    if (m_compactFrom == 0)
+        m_compactFrom = m_depth;
+}
+
+void JsonWriter::key(std::string_view name) {
+    separate();
+    room(name.size() + 4);
+    *m_at++ = '"';
+    std::memcpy(m_at, name.data(), name.size());
+    m_at += name.size();
+    *m_at++ = '"';
+    *m_at++ = ':';
+    if (m_compactFrom == 0)
+        *m_at++ = ' ';
+    m_afterKey = true;
+}
+
+void JsonWriter::escaped(int character) {
+    constexpr char hex[] = "0123456789abcdef";
+    const auto unit = [&](unsigned u) {
+        const char text[] = {'\\',       'u', hex[u >> 12], hex[u >> 8 & 15], hex[u >> 4 & 15],
+                             hex[u & 15]};
+        raw({text, sizeof text});
+    };
+    switch (character) {
+    case '"':
+        return raw("\\\"");
+    case '\\':
+        return raw("\\\\");
+    case '\n':
+        return raw("\\n");
+    case '\r':
+        return raw("\\r");
+    case '\t':
+        return raw("\\t");
+    default:
+        break;
+    }
+    if (character < 0x10000)
+        return unit(static_cast<unsigned>(character));
+    const auto beyond = static_cast<unsigned>(character) - 0x10000;
+    unit(0xD800 | beyond >> 10);
+    unit(0xDC00 | (beyond & 0x3FF));
+}
+
+void JsonWriter::text(std::string_view utf8) {
+    separate();
+    room(utf8.size() + 2);
+    *m_at++ = '"';
+    const char* from = utf8.data();
+    const char* const end = from + utf8.size();
+    while (from != end) {
+        const int character = decodeUtf8(from, end);
+        if (character >= 0x20 && character < 0x7F && character != '"' && character != '\\') {
+            room(1);
+            *m_at++ = static_cast<char>(character);
+        } else {
+            escaped(character < 0 ? 0xFFFD : character);
+        }
+    }
+    raw("\"");
+}
+
+void JsonWriter::number(double value) {
+    if (!std::isfinite(value))
+        return null();
+    separate();
+    room(longestNumber);
+    m_at = writeNumber(m_at, value);
+}
+
+void JsonWriter::integer(std::int64_t value) {
+    separate();
+    room(longestNumber);
+    m_at = std::to_chars(m_at, m_end, value).ptr;
+}
+
+void JsonWriter::boolean(bool value) {
+    separate();
+    raw(value ? "true" : "false");
+}
+
+void JsonWriter::null() {
+    separate();
+    raw("null");
+}
+
+void JsonWriter::member(std::string_view name, std::string_view utf8) {
+    key(name);
+    text(utf8);
+}
+
+void JsonWriter::member(std::string_view name, const char* utf8) {
+    member(name, std::string_view(utf8));
+}
+
+void JsonWriter::member(std::string_view name, double value) {
+    key(name);
+    number(value);
+}
+
+void JsonWriter::member(std::string_view name, std::int64_t value) {
+    key(name);
+    integer(value);
+}
+
+void JsonWriter::member(std::string_view name, bool value) {
+    key(name);
+    boolean(value);
+}
+
+std::string_view JsonWriter::written() const {
+    return {m_begin, static_cast<std::size_t>(m_at - m_begin)};
+}
+
+std::wstring JsonWriter::wide() const {
+    return std::wstring(m_begin, m_at);
+}
+
+} // namespace analysis

@@ -1,0 +1,64 @@
+// A comparison judged by the criteria of a preset.
+#pragma once
+
+#include <cstddef>
+#include <vector>
+
+#include "analysis/Comparison.h"
+#include "analysis/Criteria.h"
+
+namespace analysis {
+
+/// What one criterion says.
+struct Finding {
+    const Criterion* criterion = nullptr;
+    bool answered = false; ///< False where the data have no such patch.
+    double value = -1.0;   ///< As calculated; -1.0 without an answer.
+    double rounded = -1.0; ///< To the decimals of the preset; this is held against the tolerance.
+    int decimals = 0;
+    double tolerance = 0;
+    bool used = false;       ///< Takes part in the verdict.
+    bool passed = false;     ///< Answered, and not above the tolerance.
+    std::size_t patches = 0; ///< Patches that the value was made of.
+    std::size_t worst = 0;   ///< Of these, the patch with the largest figure. Only if answered.
+};
+
+enum class Verdict {
+    Passed,
+    Failed,
+    Incomplete, ///< A criterion that takes part has no answer, or none takes part.
+};
+
+/// "passed", "failed", "incomplete".
+const char* verdictName(Verdict verdict);
+
+/// Of the colour differences of all patches.
+struct Statistics {
+    std::size_t count = 0;
+    double mean = 0;
+    double median = 0;       ///< Of an even count the mean of the two in the middle.
+    double percentile95 = 0; ///< Nearest rank.
+    double maximum = 0;
+    double standardDeviation = 0; ///< Of the patches as the whole population (divisor n).
+};
+
+struct Judgement {
+    std::vector<Finding> findings; ///< One a criterion, in the order of `criteria`.
+    Statistics statistics;
+    Verdict verdict = Verdict::Incomplete;
+    std::vector<Warning> warnings; ///< Of what the preset asks.
+};
+
+/// Judges by presetValues and usedForResult, or where fograPSDPreset is above 0 by psdPresetValues
+/// and usedForPSDResult. REQUIRES: a comparison with patches.
+Judgement judge(const Comparison& comparison, const tolerancePresetParameterRecord& preset);
+
+/// The judgement as the record that tickets are written from: values of criteria at their entries,
+/// -1.0 at all others.
+void fillResults(const Judgement& judgement, const tolerancePresetParameterRecord& preset,
+                 analyseResultsRecord& results);
+
+/// Half up at so many decimals; as it is where there are more than 15.
+double roundedTo(double value, int decimals);
+
+} // namespace analysis

@@ -1,0 +1,55 @@
+#include "analysis/LabWriter.h"
+
+#include <utility>
+
+#include "ExitCodes.h"
+#include "analysis/OutputFile.h"
+#include "analysis/Status.h"
+#include "colour/CgatsText.h"
+#include "colour/ColourFile.h"
+
+namespace analysis {
+namespace {
+
+/// Of a set only what the new file takes from it: ids, names and device values.
+colour::DataSet chartOf(colour::DataSet set) {
+    colour::DataSet chart;
+    chart.patchCount = set.patchCount;
+    chart.ids = std::move(set.ids);
+    chart.names = std::move(set.names);
+    chart.deviceSpace = set.deviceSpace;
+    chart.channels = std::move(set.channels);
+    chart.device = std::move(set.device);
+    chart.originator = "Tintgate";
+    chart.conditions = {.illuminant = "D50", .observer = "2", .measurement = {}};
+    return chart;
+}
+
+} // namespace
+
+int writeLab(const std::string& reference, const std::string& profile, const std::string& output) {
+    colour::ColourFile file;
+    const colour::CgatsWants wants{.spectra = false};
+    if (const int status = statusOf(colour::loadColourFile(reference, wants, file)))
+        return status;
+    if (!file.set)
+        return exitPatchSetNotText;
+    if (!file.set->hasCmyk())
+        return exitNoDeviceValues;
+    colour::DataSet chart = chartOf(std::move(*file.set));
+
+    colour::ColourFile profileFile;
+    if (const int status = statusOf(colour::loadColourFile(profile, wants, profileFile)))
+        return status;
+    if (!profileFile.profile)
+        return exitProfileDamaged;
+
+    chart.descriptor = profileFile.profile->description();
+    chart.lab.resize(chart.patchCount);
+    if (const int status = statusOf(profileFile.profile->evaluate(
+            chart.device.data(), chart.patchCount, chart.channels.size(), chart.lab.data())))
+        return status;
+    return writeOutputFile(output, colour::writeCgats(chart));
+}
+
+} // namespace analysis

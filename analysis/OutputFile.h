@@ -1,0 +1,17 @@
+// Writing a file so that what stood there before is lost only to something whole.
+#pragma once
+
+#include <string>
+#include <string_view>
+
+namespace analysis {
+
+/// Makes `bytes` the contents of the file at `path` (bytes as the file system has them).
+///
+/// A file is written under another name in the same folder and renamed, keeping the old one's mode.
+/// A link, device or pipe, or a file in a folder that takes no other name, is written in place;
+/// room for a regular file is reserved first, so that a full disk leaves it as it was. Gives 0, 50
+/// (can't be created or written to) or 51 (could not be written to its end).
+int writeOutputFile(const std::string& path, std::string_view bytes);
+
+} // namespace analysis

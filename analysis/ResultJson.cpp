@@ -1,0 +1,258 @@
+#include "analysis/ResultJson.h"
+
+#include "analysis/JsonWriter.h"
+#include "analysis/Text.h"
+#include "analysis/Version.h"
+
+namespace analysis {
+namespace {
+
+using colour::DataSet;
+using colour::Lab;
+
+std::string utf8(const wxString& text) {
+    return documentText(text.ToStdWstring());
+}
+
+/// Texts that may be absent are null then, so that an empty text always means a stated one.
+void optionalMember(JsonWriter& json, std::string_view name, const std::string& text) {
+    json.key(name);
+    if (text.empty())
+        json.null();
+    else
+        json.text(text);
+}
+
+void writeProgram(JsonWriter& json, const char* key, const char* name, const char* version) {
+    json.key(key);
+    json.beginCompactObject();
+    json.member("name", name);
+    json.member("version", version);
+    json.endObject();
+}
+
+void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset) {
+    json.key("preset");
+    json.beginObject();
+    json.member("id", std::int64_t{preset.presetID});
+    json.member("name", utf8(preset.name));
+    json.member("file", utf8(preset.filePath));
+    json.member("psd", preset.fograPSDPreset > 0);
+    json.member("illuminationCondition", std::int64_t{preset.illuminationCondition});
+    json.endObject();
+}
+
+void writeInput(JsonWriter& json, const char* key, const Input& input) {
+    json.key(key);
+    if (!input.file.set && !input.file.profile)
+        return json.null();
+    json.beginObject();
+    json.member("path", documentText(input.path));
+    json.member("kind", input.file.profile ? "profile" : "text");
+    json.key("patches");
+    if (!input.file.set) {
+        json.null();
+        optionalMember(json, "description", input.file.profile->description());
+        json.endObject();
+        return;
+    }
+    const DataSet& set = *input.file.set;
+    json.integer(static_cast<std::int64_t>(set.patchCount));
+    optionalMember(json, "description", set.descriptor);
+    optionalMember(json, "originator", set.originator);
+    optionalMember(json, "created", set.created);
+    optionalMember(json, "instrumentation", set.instrumentation);
+    optionalMember(json, "illuminant", set.conditions.illuminant);
+    optionalMember(json, "observer", set.conditions.observer);
+    optionalMember(json, "measurementCondition", set.conditions.measurement);
+    json.endObject();
+}
+
+void writePairing(JsonWriter& json, const Comparison& c) {
+    const auto count = [](const auto& rows) { return static_cast<std::int64_t>(rows.size()); };
+    json.key("pairing");
+    json.beginObject();
+    json.member("selection", c.selection == &c.patchSet ? "patchSet"
+                             : c.selection == &c.target ? "target"
+                                                        : "measurement");
+    json.member("target", pairedByName(c.target.pairing.by));
+    json.member("measurement", pairedByName(c.measurement.pairing.by));
+    json.member("paired", static_cast<std::int64_t>(c.patchCount()));
+    json.member("unpairedTarget", count(c.target.unpaired));
+    json.member("unpairedMeasurement", count(c.measurement.unpaired));
+    json.member("unpairedPatchSet", count(c.patchSet.unpaired));
+    json.endObject();
+}
+
+void writeStatistics(JsonWriter& json, const Statistics& s) {
+    json.key("statistics");
+    json.beginObject();
+    json.member("count", static_cast<std::int64_t>(s.count));
+    json.member("mean", s.mean);
+    json.member("median", s.median);
+    json.member("percentile95", s.percentile95);
+    json.member("maximum", s.maximum);
+    json.member("standardDeviation", s.standardDeviation);
+    json.endObject();
+}
+
+void writeFinding(JsonWriter& json, const Finding& finding) {
+    const Criterion& criterion = *finding.criterion;
+    json.beginCompactObject();
+    json.member("index", std::int64_t{criterion.index});
+    json.member("name", criterion.name);
+    json.member("title", criterion.title);
+    json.member("unit", unit(criterion.quantity));
+    json.member("used", finding.used);
+    json.member("outcome", !finding.answered ? "unanswered" : finding.passed ? "pass" : "fail");
+    json.member("tolerance", finding.tolerance);
+    json.member("decimals", std::int64_t{finding.decimals});
+    if (finding.answered) {
+        json.member("value", finding.value);
+        json.member("rounded", finding.rounded);
+    } else {
+        json.key("value");
+        json.null();
+        json.key("rounded");
+        json.null();
+    }
+    json.member("patches", static_cast<std::int64_t>(finding.patches));
+    json.key("worstPatch");
+    if (finding.answered)
+        json.integer(static_cast<std::int64_t>(finding.worst));
+    else
+        json.null();
+    json.endObject();
+}
+
+void writeFindings(JsonWriter& json, const std::vector<Finding>& findings) {
+    json.key("criteria");
+    json.beginArray();
+    for (const Finding& finding : findings)
+        writeFinding(json, finding);
+    json.endArray();
+}
+
+void writeWarnings(JsonWriter& json, const std::vector<Warning>& ofComparison,
+                   const std::vector<Warning>& ofPreset) {
+    json.key("warnings");
+    json.beginArray();
+    for (const auto* warnings : {&ofComparison, &ofPreset})
+        for (const Warning& warning : *warnings) {
+            json.beginCompactObject();
+            json.member("code", warning.code);
+            json.member("text", warning.text);
+            json.endObject();
+        }
+    json.endArray();
+}
+
+void writeLab(JsonWriter& json, const Lab& lab) {
+    json.beginArray();
+    json.number(lab.L);
+    json.number(lab.a);
+    json.number(lab.b);
+    json.endArray();
+}
+
+void writeDevice(JsonWriter& json, const double* device, std::size_t channels) {
+    json.beginArray();
+    for (std::size_t i = 0; i < channels; ++i)
+        json.number(device[i]);
+    json.endArray();
+}
+
+void writeIdAndName(JsonWriter& json, const DataSet& set, std::size_t row) {
+    json.text(set.ids.empty() ? std::string_view() : set.ids[row]);
+    json.text(set.names.empty() ? std::string_view() : set.names[row]);
+}
+
+/// Rows of one file that nothing was compared with.
+void writeUnpaired(JsonWriter& json, const char* key, const Input& input) {
+    json.key(key);
+    json.beginArray();
+    for (const std::uint32_t row : input.unpaired) {
+        const DataSet& set = *input.file.set;
+        const std::size_t channels = set.channels.size();
+        json.beginCompactArray();
+        writeIdAndName(json, set, row);
+        writeDevice(json, channels ? &set.device[row * channels] : nullptr, channels);
+        json.endArray();
+    }
+    json.endArray();
+}
+
+void writeColumns(JsonWriter& json, const Comparison& c) {
+    json.key("patchColumns");
+    json.beginCompactArray();
+    for (const char* column : {"id", "name", "device", "target", "measured", "difference"})
+        json.text(column);
+    json.endArray();
+    json.key("deviceChannels");
+    json.beginCompactArray();
+    if (c.devices)
+        for (const std::string& channel : c.devices->file.set->channels)
+            json.text(channel);
+    json.endArray();
+}
+
+void writePatches(JsonWriter& json, const Comparison& c) {
+    const DataSet& labels = *c.selection->file.set;
+    const std::size_t channels = c.devices ? c.devices->file.set->channels.size() : 0;
+    json.key("patches");
+    json.beginArray();
+    for (std::size_t patch = 0; patch < c.patchCount(); ++patch) {
+        json.beginCompactArray();
+        writeIdAndName(json, labels, c.selectedRow[patch]);
+        writeDevice(json, c.devices ? c.deviceOf(patch) : nullptr, channels);
+        writeLab(json, c.targetLab[patch]);
+        writeLab(json, c.measuredLab[patch]);
+        json.number(c.difference[patch]);
+        json.endArray();
+    }
+    json.endArray();
+}
+
+} // namespace
+
+std::wstring resultJson(const Comparison& c, const Judgement& judgement,
+                        const tolerancePresetParameterRecord& preset) {
+    constexpr std::size_t bytesOfHead = 8192;
+    constexpr std::size_t bytesOfPatch = 96;
+    JsonWriter json(bytesOfHead + c.patchCount() * bytesOfPatch);
+    json.beginObject();
+    json.member("format", "tintgate-result");
+    json.member("formatVersion", std::int64_t{1});
+    writeProgram(json, "tool", "Tintgate", toolVersion);
+    writeProgram(json, "library", "libTintgate", libraryVersion);
+    json.member("verdict", verdictName(judgement.verdict));
+    json.member("passed", judgement.verdict == Verdict::Passed);
+    json.key("formula");
+    json.beginCompactObject();
+    json.member("name", colour::formulaName(c.formula));
+    json.member("number", static_cast<std::int64_t>(c.formula));
+    json.endObject();
+    writePreset(json, preset);
+    json.key("inputs");
+    json.beginObject();
+    writeInput(json, "target", c.target);
+    writeInput(json, "measurement", c.measurement);
+    writeInput(json, "patchSet", c.patchSet);
+    json.endObject();
+    writePairing(json, c);
+    writeStatistics(json, judgement.statistics);
+    writeFindings(json, judgement.findings);
+    writeWarnings(json, c.warnings, judgement.warnings);
+    json.key("unpaired");
+    json.beginObject();
+    writeUnpaired(json, "target", c.target);
+    writeUnpaired(json, "measurement", c.measurement);
+    writeUnpaired(json, "patchSet", c.patchSet);
+    json.endObject();
+    writeColumns(json, c);
+    writePatches(json, c);
+    json.endObject();
+    return json.wide() + L'\n';
+}
+
+} // namespace analysis

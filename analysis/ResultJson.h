@@ -1,0 +1,16 @@
+// The result of a comparison as JSON text; docs/result.md and docs/result.schema.json describe it.
+#pragma once
+
+#include <string>
+
+#include "analysis/Comparison.h"
+#include "analysis/Judgement.h"
+#include "job/AnalysisLibrary.h"
+
+namespace analysis {
+
+/// ASCII JSON with a line end. The same inputs give the same text.
+std::wstring resultJson(const Comparison& comparison, const Judgement& judgement,
+                        const tolerancePresetParameterRecord& preset);
+
+} // namespace analysis
