@@ -1,0 +1,277 @@
+#include "measure/Helper.h"
+
+#include <array>
+#include <cerrno>
+#include <chrono>
+#include <cstdio>
+#include <filesystem>
+#include <string>
+#include <system_error>
+#include <thread>
+#include <vector>
+
+#include <signal.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <wx/cmdline.h>
+#include <wx/filefn.h>
+#include <wx/utils.h>
+
+#include "platform/CoreFoundationStrings.h"
+#include "platform/Processes.h"
+#include "platform/SystemRoot.h"
+#include "platform/WideBytes.h"
+
+namespace {
+
+constexpr const char* suitePlist = "//Library/Preferences/Qen/com.qen.packageversion.plist";
+constexpr const char* measurePlists[] = {
+    "//Library/Preferences/ApplicationsUsingNerovaMeasure_x64.plist",
+    "//Library/Preferences/ApplicationsUsingNerovaMeasure.plist",
+};
+constexpr const char* familyFolder = "/Applications/Nerova";
+constexpr const char* measureBundle = "/NerovaMeasure.app";
+
+// The suite's applications on this installation are our companions; the rows behind them are free.
+constexpr std::array<const char*, 28> siblingApplications = {
+    "NerovaMeasure",
+    "Nerova Verify",
+    "Plistbuddy",
+    "tintgate-store",
+};
+
+wxString textFromBytes(const std::string& bytes) {
+    return platform::wideFromBytes(bytes);
+}
+
+std::string bytesFromText(const wxString& text) {
+    return platform::bytesFromWide(text.ToStdWstring());
+}
+
+wxString underRoot(const char* literal) {
+    return textFromBytes(platform::underRoot(literal));
+}
+
+// With a root the command word stands in quotes, since a root may hold blanks.
+wxString plistCommandWord() {
+    const wxString word = underRoot("/usr/libexec/Plistbuddy");
+    return platform::systemRoot().empty() ? word : "\"" + word + "\"";
+}
+
+// The first line that a command prints, up to 255 bytes; empty if it prints none.
+std::string firstLineOf(const std::string& command) {
+    FILE* const pipe = popen(command.c_str(), "r");
+    if (pipe == nullptr) {
+        return {};
+    }
+    char line[256] = "";
+    // The end of another child may interrupt the read.
+    while (std::fgets(line, sizeof line, pipe) == nullptr) {
+        line[0] = '\0';
+        if (std::ferror(pipe) == 0 || errno != EINTR) {
+            break;
+        }
+        std::clearerr(pipe);
+    }
+    pclose(pipe);
+    return line;
+}
+
+bool isFolder(const wxString& path) {
+    return !path.empty() && wxFileName::DirExists(path);
+}
+
+// A folder, if something of this name lies in it. By requirement the test is the one for regular
+// files, although the names are those of bundles: it is the property lists that count.
+bool holds(const wxString& folder, const char* name) {
+    return wxFileExists(folder + name);
+}
+
+std::string nameOfProcess(const ProcessSerialNumber& process) {
+    CFStringRef name = nullptr;
+    CopyProcessName(&process, &name);
+    char text[8192] = "";
+    if (name != nullptr && !CFStringGetCString(name, text, sizeof text, kCFStringEncodingUTF8)) {
+        text[0] = '\0';
+    }
+    CFRelease(name);
+    return text;
+}
+
+int siblingsOfName(const std::string& name) {
+    int count = 0;
+    for (const char* sibling : siblingApplications) {
+        count += sibling != nullptr && name == sibling ? 1 : 0;
+    }
+    return count;
+}
+
+// One look at the running applications: how many matches it found. A name ends the look at its
+// first match.
+int countApplications(const wxString& wanted, bool kill) {
+    const wxCharBuffer narrow = wanted.mb_str(wxConvLibc);
+    const std::string wantedBytes = narrow.data() == nullptr ? "" : narrow.data();
+    int count = 0;
+    ProcessSerialNumber process;
+    while (GetNextProcess(&process) == noErr) {
+        const std::string name = nameOfProcess(process);
+        if (name.empty()) {
+            continue;
+        }
+        if (wanted.empty()) {
+            count += siblingsOfName(name);
+        } else if (name == wantedBytes) {
+            if (kill) {
+                KillProcess(&process);
+            }
+            return 1;
+        }
+    }
+    return count;
+}
+
+bool canBeExecuted(const std::string& path) {
+    struct stat status;
+    return stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode) &&
+           access(path.c_str(), X_OK) == 0;
+}
+
+// wxExecute leaves a handler behind that is called when a child ends: it would interrupt waits, and
+// touch what is gone when the program itself is about to end.
+class ChildSignalKept {
+  public:
+    ChildSignalKept() { sigaction(SIGCHLD, nullptr, &m_before); }
+    ~ChildSignalKept() { sigaction(SIGCHLD, &m_before, nullptr); }
+    ChildSignalKept(const ChildSignalKept&) = delete;
+    ChildSignalKept& operator=(const ChildSignalKept&) = delete;
+
+  private:
+    struct sigaction m_before;
+};
+
+// The ended program's code, or the started program's number; -1 and 0 if there is nothing that can
+// be executed, which a started child would only say on standard error.
+long execute(const wxString& program, const wxString& arguments, bool wait) {
+    if (!canBeExecuted(bytesFromText(program))) {
+        return wait ? -1 : 0;
+    }
+    const wxArrayString words = wxCmdLineParser::ConvertStringToArgs(
+        "\"" + program + "\"" + arguments, wxCMD_LINE_SPLIT_UNIX);
+    std::vector<std::string> bytes;
+    for (const wxString& word : words) {
+        bytes.push_back(bytesFromText(word));
+    }
+    std::vector<const char*> pointers;
+    for (const std::string& word : bytes) {
+        pointers.push_back(word.c_str());
+    }
+    pointers.push_back(nullptr);
+    const ChildSignalKept kept;
+    return wxExecute(pointers.data(), wait ? wxEXEC_SYNC : wxEXEC_ASYNC);
+}
+
+} // namespace
+
+wxString Helper::GetAttributeValueFromPlist(wxString path, wxString key) {
+    wxFileName name(path);
+    name.Normalize(wxPATH_NORM_TILDE);
+    if (!name.Exists(wxFILE_EXISTS_ANY)) {
+        return {};
+    }
+    const wxString command =
+        plistCommandWord() + " -c \"Print :" + key + "\" \"" + name.GetFullPath() + "\"";
+    return wxString::FromUTF8(firstLineOf(bytesFromText(command)).c_str()).Trim();
+}
+
+wxString Helper::GetHWBInstallationPath() {
+    for (const char* key :
+         {"'Nerova Hue Workbench':library_path", "'Nerova Hue Workbench':installed_path"}) {
+        const wxString path = GetAttributeValueFromPlist(underRoot(suitePlist), key);
+        if (isFolder(path)) {
+            return path;
+        }
+    }
+    const wxString family = underRoot(familyFolder);
+    if (holds(family, "/Nerova Hue Workbench.app")) {
+        return family;
+    }
+    const wxString workbench = underRoot("/Applications/Nerova/Hue Workbench 4");
+    return holds(workbench, measureBundle) ? workbench : wxString();
+}
+
+wxString Helper::GetNerovaMeasurePath(bool withExecutable) {
+    const auto folder = []() -> wxString {
+        for (const char* plist : measurePlists) {
+            const wxString path = GetAttributeValueFromPlist(underRoot(plist), "installed_path");
+            if (isFolder(path)) {
+                return path;
+            }
+        }
+        for (const char* literal : {familyFolder, "/Applications/Nerova/NerovaMeasure"}) {
+            const wxString path = underRoot(literal);
+            if (holds(path, measureBundle)) {
+                return path;
+            }
+        }
+        return {};
+    }();
+    if (!withExecutable || folder.empty()) {
+        return folder;
+    }
+    return folder + "/NerovaMeasure.app/Contents/MacOS/NerovaMeasure";
+}
+
+bool Helper::CheckFileValidity(wxString path) {
+    return !path.empty() && wxFileName::Exists(path, wxFILE_EXISTS_ANY);
+}
+
+bool Helper::IsNMRunning() {
+    return IsHWBAppsRunning("NerovaMeasure", false);
+}
+
+bool Helper::IsHWBAppsRunning(wxString processName, bool kill) {
+    bool found = false;
+    for (int passes = 3; countApplications(processName, kill) > 0;) {
+        found = true;
+        if (--passes == 0) {
+            break;
+        }
+        std::this_thread::sleep_for(std::chrono::seconds(1));
+    }
+    return found;
+}
+
+bool Helper::IsNerovaVerifyRunning(bool) {
+    return IsHWBAppsRunning("Nerova Verify", true);
+}
+
+bool Helper::LaunchNerovaVerify(int& exitCode, bool wait, wxString arguments, bool unused) {
+    exitCode = 0;
+    IsNerovaVerifyRunning(unused);
+    std::error_code ignored;
+    const std::filesystem::path workingFolder = std::filesystem::current_path(ignored);
+    std::filesystem::current_path(platform::underRoot(familyFolder), ignored);
+    const wxFileName viewer = GetNerovaVerifyPath();
+    if (!viewer.Exists(wxFILE_EXISTS_ANY)) {
+        exitCode = -1;
+        return false;
+    }
+    const wxString path = viewer.GetFullPath();
+    long code = CheckFileValidity(path) ? execute(path, arguments, wait) : -1;
+    if (code == 255) {
+        code = -1;
+    }
+    std::filesystem::current_path(workingFolder, ignored);
+    return wait ? code != -1 && code < 1000 : code != 0;
+}
+
+wxFileName Helper::GetNerovaVerifyPath() {
+    const wxFileName application(
+        underRoot("/Applications/Nerova/Nerova Verify.app/Contents/MacOS/nwjs"));
+    if (application.Exists(wxFILE_EXISTS_ANY)) {
+        return application;
+    }
+    return wxFileName(
+        underRoot("/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify"));
+}

@@ -1,0 +1,48 @@
+// The companion applications around the tool: the measuring tool "NerovaMeasure", the viewer
+// "Nerova Verify" and the Hue Workbench suite, in whose folder the comm plug-in lives.
+#pragma once
+
+#include <wx/filename.h>
+#include <wx/string.h>
+
+/// Each call looks afresh at the machine, below the system root (platform/SystemRoot.h).
+class Helper {
+  public:
+    /// The value of a key such as "installed_path" or "'Nerova Hue Workbench':library_path" in a
+    /// property list; empty if there is no such file or value. Of the value, the first line counts,
+    /// and of that 255 bytes, without blanks at its end.
+    static wxString GetAttributeValueFromPlist(wxString path, wxString key);
+
+    /// Folder of the suite, or empty.
+    static wxString GetHWBInstallationPath();
+
+    /// Folder of the measuring tool or, withExecutable, the tool itself; empty if not installed.
+    static wxString GetNerovaMeasurePath(bool withExecutable);
+
+    /// True if anything exists at the path.
+    static bool CheckFileValidity(wxString path);
+
+    /// Whether the measuring tool runs. Takes about 2 seconds while it does.
+    static bool IsNMRunning();
+
+    /// Whether an application of this name was seen running; with kill, it is asked to end.
+    ///
+    /// It looks up to three times, a second apart, and stops looking when there is nothing to see.
+    /// With an empty name it looks for the applications of the suite, and ends none.
+    static bool IsHWBAppsRunning(wxString processName, bool kill);
+
+    /// Whether the viewer was running. By requirement it ends a viewer that is, whatever the
+    /// argument says, so that the viewer to be started takes its place.
+    static bool IsNerovaVerifyRunning(bool);
+
+    /// Starts the viewer, in place of one that runs. The arguments go behind its path as they are:
+    /// they start with a blank, are split at blanks, and quotes and backslashes in them are eaten.
+    ///
+    /// Without wait, true if it was started; with wait, true if it ended with a code below 255.
+    /// exitCode becomes 0, or -1 if there is no viewer, in which case the working folder stays that
+    /// of the applications. The last argument is not used.
+    static bool LaunchNerovaVerify(int& exitCode, bool wait, wxString arguments, bool);
+
+    /// The viewer's executable: of its two forms the first that exists, else the second.
+    static wxFileName GetNerovaVerifyPath();
+};
