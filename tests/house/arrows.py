@@ -24,7 +24,8 @@ ARROWS = {
     "ticket": "ticketrecords text",
     "log": "",
     "helper": "platform",
-    "comm": "ticket text helper",
+    "commrecords": "platformrecords ticketrecords",
+    "comm": "commrecords ticket text helper platform",
     "records": "",
     "jdf": "records",
     "job": "comm jdf records log helper text libTintgate",
@@ -34,11 +35,13 @@ ARROWS = {
     "analysis": "colour records",  # libTintgate without its ten functions' names
     "libTintgate": "analysis colour records",
     "ticketengine": "ticketrecords",
-    "ComGUI": "ticketrecords ticketengine StoreEngine",
+    "ComGUI": "commrecords ticketrecords ticketengine StoreEngine",
 }
 
 # Arrows that go on through a target, because a header that it publishes needs them itself.
 EXPOSES = {
+    "commrecords": "platformrecords ticketrecords",
+    "comm": "commrecords ticket",
     "platform": "platformrecords",
     "analysis": "records",
     "ticket": "ticketrecords",
