@@ -50,6 +50,11 @@ bool hasMediaWhite(cmsHPROFILE profile) {
     return white && white->X > 0 && white->Y > 0 && white->Z > 0;
 }
 
+/// 0 to 100; what is no number counts as no ink.
+double inkAmount(double percent) {
+    return percent > 0 ? std::min(percent, 100.0) : 0;
+}
+
 /// False for what only a damaged table of floats can give.
 bool isColour(const cmsCIELab& lab) {
     constexpr double farOut = 10'000;
@@ -139,8 +144,8 @@ Failure Profile::open(std::string_view bytes) {
         return Failure::OutOfMemory;
     cmsContext context = state->context.get();
 
-    const Owned<cmsHPROFILE, ProfileCloser> profile{cmsOpenProfileFromMemTHR(
-        context, bytes.data(), static_cast<cmsUInt32Number>(bytes.size()))};
+    const Owned<cmsHPROFILE, ProfileCloser> profile{
+        cmsOpenProfileFromMemTHR(context, bytes.data(), wordAt(bytes, 0))};
     if (!profile)
         return Failure::ProfileDamaged;
     const Owned<cmsHPROFILE, ProfileCloser> lab{cmsCreateLab4ProfileTHR(context, nullptr)};
@@ -149,8 +154,10 @@ Failure Profile::open(std::string_view bytes) {
     if (!hasMediaWhite(profile.get()))
         return Failure::ProfileUnusable;
 
-    // The observer counts as fully adapted, which is the absolute colorimetry of ICC.1; formats of
-    // doubles keep LittleCMS on its floating-point road.
+    // The observer counts as fully adapted, which is the absolute colorimetry of ICC.1: the media
+    // white scales XYZ. (Profiles of ArgyllCMS bring a matrix of their own for that in a private
+    // tag, which its tools alone obey; they differ by up to one unit.) Formats of doubles keep
+    // LittleCMS on its floating-point road.
     std::array<cmsHPROFILE, 2> chain{profile.get(), lab.get()};
     std::array<cmsBool, 2> blackPoint{FALSE, FALSE};
     std::array<cmsUInt32Number, 2> intents{INTENT_ABSOLUTE_COLORIMETRIC,
@@ -174,7 +181,7 @@ Failure Profile::evaluate(const double* cmyk, std::size_t count, std::size_t str
         const std::size_t now = std::min(batch, count - done);
         for (std::size_t i = 0; i < now; ++i)
             for (std::size_t ink = 0; ink < 4; ++ink)
-                inks[4 * i + ink] = std::clamp(cmyk[(done + i) * stride + ink], 0.0, 100.0);
+                inks[4 * i + ink] = inkAmount(cmyk[(done + i) * stride + ink]);
         cmsDoTransform(m_state->transform.get(), inks.data(), colours.data(),
                        static_cast<cmsUInt32Number>(now));
         for (std::size_t i = 0; i < now; ++i)

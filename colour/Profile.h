@@ -23,10 +23,13 @@ class Profile {
     Profile(Profile&&) noexcept;
     Profile& operator=(Profile&&) noexcept;
 
-    /// Opens a v2 or v4 profile from memory; the bytes may go afterwards.
+    /// Opens a v2 or v4 profile from memory; the bytes may go afterwards. On failure the profile
+    /// that was open stays.
     Failure open(std::string_view bytes);
 
-    /// Lab of `count` patches of C, M, Y, K in percent, `stride` values apart.
+    /// Lab of `count` patches of C, M, Y, K in percent, `stride` values apart. Amounts beyond 0 to
+    /// 100 are cut. ProfileUnusable, with `lab` in part written, where a damaged profile gives no
+    /// colours.
     /// REQUIRES: open gave None.
     Failure evaluate(const double* cmyk, std::size_t count, std::size_t stride, Lab* lab) const;
 

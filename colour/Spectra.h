@@ -1,14 +1,18 @@
 // From reflectances to XYZ.
 #pragma once
 
+#include <vector>
+
 #include "colour/DataSet.h"
 
 namespace colour {
 
-/// True if spectra on this axis can be turned into XYZ.
+/// True if spectra on this axis can be turned into XYZ: steps of 1 to 20 nm, and at least 400 to
+/// 700 nm, the limits of ASTM E308.
 bool spectraUsable(const SpectralAxis& axis);
 
-/// Weights of one axis, made once and used for every patch (D50, CIE 1931 2 degree observer).
+/// Weights of one axis, made once and used for every patch (D50, CIE 1931 2 degree observer; ASTM
+/// E308). The perfect diffuser gives 96.422, 100, 82.521.
 class SpectralWeights {
   public:
     /// REQUIRES: spectraUsable(axis).
