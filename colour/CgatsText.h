@@ -2,10 +2,9 @@
 #pragma once
 
 #include <cstddef>
-#include <cstdint>
+#include <optional>
 #include <string>
 #include <string_view>
-#include <vector>
 
 #include "colour/DataSet.h"
 #include "colour/Failure.h"
@@ -31,6 +30,14 @@ bool looksLikeCgats(std::string_view bytes);
 /// Gives a data set with colour values, device values, or both; which of them a caller needs is the
 /// caller's affair. On failure `set` is left as it was.
 Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set);
+
+/// Value of a header keyword (in either case), UTF-8: the quoted text, else the rest of the line.
+/// The first line that begins with the keyword counts, KEYWORD lines don't; empty where it has no
+/// value.
+///
+/// The text may be incomplete, as definitions for measuring tools are: the keyword not declared or
+/// behind the format, counts that lie or are missing, no END_DATA.
+std::optional<std::string> cgatsKeyword(std::string_view bytes, std::string_view keyword);
 
 /// Text of a data set: CGATS.17, LF, ids, device values, XYZ, Lab and spectra where there are any,
 /// written so that readCgats gives the same numbers again.

@@ -1,0 +1,212 @@
+// Statements as they are met:
+//
+//     ILLUMINANT "D50"                              OBSERVER "CIE 2 degree"
+//     WEIGHTING_FUNCTION "ILLUMINANT, D50"          WEIGHTING_FUNCTION "OBSERVER, 2 degree"
+//     MEASUREMENT_CONDITION "M1"                    ILLUMINATION_CONDITION 1
+//     INSTRUMENTATION "D50, 2 degree, geometry 45/0, no polarisation filter, white backing"
+//     MEASUREMENT_SOURCE "Illumination=D50  ObserverAngle=2  WhiteBase=Abs  Filter=UVcut"
+//     FILTER "POL"
+#include "colour/CgatsConditions.h"
+
+#include <algorithm>
+#include <optional>
+#include <vector>
+
+#include "colour/CgatsLines.h"
+
+namespace colour::cgats {
+
+namespace {
+
+bool isWordSign(char c) {
+    return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z');
+}
+
+bool isDigit(char c) {
+    return c >= '0' && c <= '9';
+}
+
+/// Runs of ASCII letters and digits, in capitals.
+std::vector<std::string> wordsOf(std::string_view text) {
+    std::vector<std::string> words;
+    for (std::size_t i = 0; i < text.size();) {
+        std::size_t end = i;
+        while (end < text.size() && isWordSign(text[end]))
+            ++end;
+        if (end > i)
+            words.push_back(upperCase(text.substr(i, end - i)));
+        i = std::max(end, i + 1);
+    }
+    return words;
+}
+
+bool isMeasurementCondition(std::string_view word) {
+    return word.size() == 2 && word[0] == 'M' && word[1] >= '0' && word[1] <= '3';
+}
+
+/// D50 and its like, F1 to F12, and, where the keyword asks for nothing else, A, C and E.
+bool isIlluminant(std::string_view word, bool ownKeyword) {
+    for (const char* daylight : {"D50", "D55", "D65", "D75"}) {
+        if (word == daylight)
+            return true;
+    }
+    if (!ownKeyword)
+        return false;
+    const bool fluorescent = word.size() >= 2 && word.size() <= 3 && word[0] == 'F' &&
+                             std::all_of(word.begin() + 1, word.end(), isDigit);
+    return fluorescent || word == "A" || word == "C" || word == "E";
+}
+
+/// "2" or "10" where a number of degrees stands: "2 degree", "10°", "2-deg".
+std::optional<std::string> observerIn(std::string_view text) {
+    const std::string upper = upperCase(text);
+    std::optional<std::string> found;
+    for (std::size_t i = 0; i < upper.size(); ++i) {
+        if (!isDigit(upper[i]))
+            continue;
+        std::size_t end = i;
+        while (end < upper.size() && isDigit(upper[end]))
+            ++end;
+        const std::string number = upper.substr(i, end - i);
+        const bool alone = i == 0 || (!isWordSign(upper[i - 1]) && upper[i - 1] != '.' &&
+                                      upper[i - 1] != '/' && upper[i - 1] != ':');
+        std::size_t unit = end;
+        while (unit < upper.size() && (upper[unit] == ' ' || upper[unit] == '-'))
+            ++unit;
+        const bool degrees = upper.compare(unit, 3, "DEG") == 0 || upper.compare(unit, 2, "°") == 0;
+        if (alone && degrees && (number == "2" || number == "10")) {
+            if (found && *found != number)
+                return std::nullopt;
+            found = number;
+        }
+        i = end;
+    }
+    return found;
+}
+
+/// As observerIn, for a text that is about the observer alone: "2", "CIE 1931".
+std::optional<std::string> observerAlone(std::string_view text) {
+    if (const auto observer = observerIn(text))
+        return observer;
+    std::optional<std::string> found;
+    for (const std::string& word : wordsOf(text)) {
+        std::string number;
+        if (word == "2" || word == "2DEG" || word == "1931")
+            number = "2";
+        else if (word == "10" || word == "10DEG" || word == "1964")
+            number = "10";
+        if (number.empty() || number == found)
+            continue;
+        if (found)
+            return std::nullopt;
+        found = number;
+    }
+    return found;
+}
+
+} // namespace
+
+void ConditionFinder::Statement::add(Rank newRank, const std::string& newValue) {
+    if (newRank < rank) {
+        rank = newRank;
+        value = newValue;
+        contradicted = false;
+    } else if (newRank == rank && value != newValue) {
+        contradicted = true;
+    }
+}
+
+void ConditionFinder::see(std::string_view keyword, std::string_view value) {
+    const auto is = [&](std::initializer_list<std::string_view> names) {
+        return std::find(names.begin(), names.end(), keyword) != names.end();
+    };
+    const bool weighting = keyword == "WEIGHTING_FUNCTION";
+    const std::string upper = upperCase(value);
+    if (is({"ILLUMINANT", "ILLUMINATION", "ILLUMINATION_NAME"}) ||
+        (weighting && upper.find("ILLUMINANT") != std::string::npos)) {
+        for (const std::string& word : wordsOf(value)) {
+            if (isIlluminant(word, true))
+                m_illuminant.add(Keyword, word);
+            else if (isMeasurementCondition(word))
+                m_measurement.add(Keyword, word);
+        }
+    }
+    if (is({"OBSERVER", "OBSERVER_ANGLE", "STANDARD_OBSERVER"})) {
+        if (const auto observer = observerAlone(value))
+            m_observer.add(Keyword, *observer);
+    }
+    if (weighting) {
+        const std::size_t at = upper.find("OBSERVER");
+        if (at != std::string::npos) {
+            if (const auto observer = observerAlone(value.substr(at)))
+                m_observer.add(Keyword, *observer);
+        }
+    }
+    if (keyword == "ILLUMINATION_CONDITION" && value.size() == 1 && value[0] >= '0' &&
+        value[0] <= '3') {
+        // The mode of the measuring tool, numbered as ISO 13655 numbers its conditions.
+        m_measurement.add(Keyword, "M" + std::string(value));
+    } else if (is({"ILLUMINATION_CONDITION", "MEASUREMENT_CONDITION", "MEASUREMENT_CONDITIONS",
+                   "MEASUREMENT_MODE", "MEASUREMENT_STANDARD"})) {
+        for (const std::string& word : wordsOf(value)) {
+            if (isMeasurementCondition(word))
+                m_measurement.add(Keyword, word);
+        }
+    }
+    if (is({"INSTRUMENTATION", "MEASUREMENT_SOURCE", "MEASUREMENT_GEOMETRY",
+            "MEASUREMENT_CONDITION", "MEASUREMENT_CONDITIONS", "COMPUTATIONAL_PARAMETER"}))
+        seeProse(Prose, value);
+    if (is({"FILTER", "FILTER_STATUS"}))
+        seeFilter(value);
+    if (is({"POLARIZATION", "POLARISATION"}) && (upper == "YES" || upper == "TRUE" || upper == "1"))
+        m_measurement.add(Filter, "M3");
+}
+
+/// Looks for all three in a text, and for parts of the form Filter=UVcut.
+void ConditionFinder::seeProse(Rank rank, std::string_view text) {
+    for (const std::string& word : wordsOf(text)) {
+        if (isIlluminant(word, false))
+            m_illuminant.add(rank, word);
+        else if (isMeasurementCondition(word))
+            m_measurement.add(rank, word);
+    }
+    if (const auto observer = observerIn(text))
+        m_observer.add(rank, *observer);
+
+    for (std::size_t at = 0; (at = text.find('=', at)) != std::string_view::npos; ++at) {
+        std::size_t start = at;
+        while (start > 0 && isWordSign(text[start - 1]))
+            --start;
+        const std::string name = upperCase(text.substr(start, at - start));
+        const std::string_view value =
+            text.substr(at + 1, text.find_first_of(" \t,;", at + 1) - at - 1);
+        if (name == "OBSERVERANGLE" || name == "OBSERVER") {
+            if (const auto observer = observerAlone(value))
+                m_observer.add(rank, *observer);
+        } else if (name == "FILTER") {
+            seeFilter(value);
+        }
+    }
+}
+
+/// ISO 13655: M2 is without ultraviolet, M3 polarised besides. No filter at all may be M0 or M1.
+void ConditionFinder::seeFilter(std::string_view text) {
+    const std::vector<std::string> words = wordsOf(text);
+    const auto holds = [&](std::initializer_list<std::string_view> names) {
+        return std::any_of(words.begin(), words.end(), [&](const std::string& word) {
+            return std::find(names.begin(), names.end(), word) != names.end();
+        });
+    };
+    if (holds({"NO", "NONE", "INCLUDED", "UVIN", "UVINC"}))
+        return;
+    if (holds({"POL", "POLARIZED", "POLARISED", "POLARIZATION", "POLARISATION", "POLARIZER"}))
+        m_measurement.add(Filter, "M3");
+    else if (holds({"UV", "UVCUT", "UVEX", "UVEXCLUDED", "UVFILTER"}))
+        m_measurement.add(Filter, "M2");
+}
+
+Conditions ConditionFinder::result() const {
+    return {m_illuminant.result(), m_observer.result(), m_measurement.result()};
+}
+
+} // namespace colour::cgats

@@ -1,0 +1,477 @@
+// CGATS text, as it should be:
+//
+//     CGATS.17
+//     ORIGINATOR "Printing house"          standard keywords need no declaration
+//     KEYWORD "MEASUREMENT_CONDITION"      others do
+//     MEASUREMENT_CONDITION "M1"
+//     NUMBER_OF_FIELDS 8
+//     BEGIN_DATA_FORMAT
+//     SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B
+//     END_DATA_FORMAT
+//     NUMBER_OF_SETS 1
+//     BEGIN_DATA
+//     1 0 0 0 0 95.0 0.0 -2.0
+//     END_DATA
+//
+// and all of it may be missing, doubled, wrong or quoted but the names of the columns and the rows.
+// This file reads the header and finds the tables; CgatsRows.cpp reads a table, CgatsTables.cpp
+// makes one data set of them.
+#include "colour/CgatsText.h"
+
+#include <algorithm>
+#include <charconv>
+#include <cmath>
+#include <cstring>
+#include <new>
+#include <stdexcept>
+
+#include "colour/CgatsConditions.h"
+#include "colour/CgatsTables.h"
+
+namespace colour {
+
+namespace {
+
+using namespace cgats;
+
+constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
+
+/// So much of a header, in bytes, is searched for keywords and for a line of names that no
+/// BEGIN_DATA_FORMAT announces.
+constexpr std::size_t searchedHeader = std::size_t{1} << 20;
+
+constexpr std::string_view firstWords[] = {"CGATS", "IT8.", "ISO28178", "CTI1",
+                                           "CTI2",  "CTI3", "ECI2002"};
+
+constexpr std::string_view knownKeywords[] = {
+    "BEGIN_DATA",
+    "BEGIN_DATA_FORMAT",
+    "NUMBER_OF_FIELDS",
+    "NUMBER_OF_SETS",
+    "KEYWORD",
+    "ORIGINATOR",
+    "DESCRIPTOR",
+    "FILE_DESCRIPTOR",
+    "CREATED",
+    "INSTRUMENTATION",
+    "DEVICE",
+    "LGOROWLENGTH",
+    "MEASUREMENT_SOURCE",
+    "PRINT_CONDITIONS",
+    "WEIGHTING_FUNCTION",
+};
+
+std::string_view withoutMark(std::string_view bytes) {
+    return bytes.starts_with(byteOrderMark) ? bytes.substr(byteOrderMark.size()) : bytes;
+}
+
+/// Goes through the lines of a header: neither blank nor comment, without blanks in front.
+class Lines {
+  public:
+    explicit Lines(std::string_view text) : m_at(text.data()), m_end(m_at + text.size()) {}
+
+    bool next(std::string_view& line) {
+        while (true) {
+            while (m_at != m_end && !blanksSeparate.isPlain(*m_at))
+                ++m_at;
+            if (m_at == m_end)
+                return false;
+            const char* const start = m_at;
+            m_at = lineEndOf(start, m_end);
+            if (*start == '#')
+                continue;
+            line = {start, static_cast<std::size_t>(m_at - start)};
+            return true;
+        }
+    }
+
+    const char* at() const { return m_at; }
+    const char* end() const { return m_end; }
+    void moveTo(const char* at) { m_at = at; }
+
+  private:
+    const char* m_at;
+    const char* m_end;
+};
+
+/// First word of a line, without quotes and the signs that a spreadsheet leaves of empty cells.
+std::string_view firstWordOf(std::string_view line) {
+    const char* at = line.data();
+    std::string_view word = takeWord(at, line.data() + line.size(), blanksSeparate).text;
+    while (!word.empty() && (word.back() == ',' || word.back() == ';'))
+        word.remove_suffix(1);
+    return word;
+}
+
+bool isStructure(std::string_view word) {
+    for (const char* name : {"BEGIN_DATA", "END_DATA", "BEGIN_DATA_FORMAT", "END_DATA_FORMAT"}) {
+        if (sameWord(word, name))
+            return true;
+    }
+    return false;
+}
+
+/// The names of columns that some lines hold, and what separates them.
+struct NameList {
+    std::vector<std::string> names;
+    const CharTable* chars = &blanksSeparate;
+};
+
+std::size_t knownNames(const std::vector<std::string>& names) {
+    const std::vector<ColumnMeaning> meanings = meaningsOf(names);
+    return static_cast<std::size_t>(
+        std::count_if(meanings.begin(), meanings.end(), [](const ColumnMeaning& meaning) {
+            return meaning.quantity != Quantity::Unknown;
+        }));
+}
+
+void addNames(const std::vector<Word>& words, std::vector<std::string>& names) {
+    for (const Word& word : words)
+        names.push_back(toUtf8(wordText(word)));
+}
+
+/// Adds the names of one line. False if there are more than may be.
+bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount, NameList& list) {
+    std::string inner;
+    if (unwrapLine(line, inner))
+        line = inner;
+    std::vector<Word> words;
+    const std::size_t room = maxCgatsColumns - list.names.size();
+    if (!splitWords(line, blanksSeparate, room, words))
+        return false;
+    for (const CharTable* chars : {&semicolonsSeparate, &commasSeparate}) {
+        const bool separates = std::any_of(words.begin(), words.end(), [&](const Word& word) {
+            return !word.quoted && word.text.find(chars->cellSeparator()) != std::string_view::npos;
+        });
+        if (separates && list.chars == &blanksSeparate)
+            list.chars = chars;
+    }
+    if (list.chars != &blanksSeparate && !splitWords(line, *list.chars, room, words))
+        return false;
+
+    // Tabs alone separate where that gives the count stated, or names that make more sense.
+    std::vector<Word> cells;
+    std::vector<std::string> byWords;
+    std::vector<std::string> byCells;
+    addNames(words, byWords);
+    const bool hasCells = line.find(list.chars->cellSeparator()) != std::string_view::npos &&
+                          splitCells(line, *list.chars, room, cells);
+    while (!cells.empty() && cells.back().text.empty())
+        cells.pop_back();
+    if (hasCells && list.names.empty() && cells.size() != words.size() &&
+        fieldCount != words.size()) {
+        addNames(cells, byCells);
+        if (fieldCount == cells.size() || knownNames(byCells) > knownNames(byWords))
+            byWords = std::move(byCells);
+    }
+    std::move(byWords.begin(), byWords.end(), std::back_inserter(list.names));
+    return true;
+}
+
+/// The names in a line that nothing announces, or none if they are not surely names.
+NameList unannouncedNames(std::string_view line) {
+    NameList list;
+    if (!addLine(line, std::nullopt, list) || list.names.size() < 3 ||
+        !holdWholeGroup(meaningsOf(list.names)))
+        list.names.clear();
+    return list;
+}
+
+/// True if a line looks like a row: numbers for the most part.
+bool isRow(std::string_view line, const CharTable& chars) {
+    std::vector<Word> words;
+    splitWords(line, chars, maxCgatsColumns, words);
+    const auto numbers = std::count_if(words.begin(), words.end(), [&](const Word& word) {
+        return !std::isnan(numberIn(word.text, chars.decimalComma()));
+    });
+    return numbers >= 3 && 2 * static_cast<std::size_t>(numbers) >= words.size();
+}
+
+/// A count as it stands behind its keyword.
+std::optional<unsigned long long> countIn(const std::string& value) {
+    unsigned long long count = 0;
+    const auto [stop, error] = std::from_chars(value.data(), value.data() + value.size(), count);
+    if (error != std::errc() || stop == value.data())
+        return std::nullopt;
+    return count;
+}
+
+/// Reads one text from its first line to its last.
+class TextReader {
+  public:
+    TextReader(std::string_view text, const CgatsWants& wants)
+        : m_text(text), m_lines(text), m_wants(wants), m_ascii(isAscii(text)) {}
+
+    /// On success `set` is whole; on failure it may hold anything.
+    Failure read(DataSet& set);
+
+  private:
+    Failure readLine(std::string_view line);
+    Failure readFormat(std::string_view line);
+    Failure readRows(const char* at, bool hasBegin);
+    Failure findNames(Lines& rows);
+    void seeHeader(const KeywordLine& line);
+    Failure seeUnannounced(std::string_view line);
+
+    std::string_view m_text;
+    Lines m_lines;
+    const CgatsWants& m_wants;
+    bool m_ascii;
+    Notes m_notes;
+
+    NameList m_names;       ///< Of the format at hand, else of the table before.
+    NameList m_unannounced; ///< Of a line that looks like names, until BEGIN_DATA tells.
+    bool m_hasFormat = false;
+    std::optional<unsigned long long> m_fieldCount;
+    std::optional<unsigned long long> m_setCount;
+
+    std::size_t m_tables = 0;
+    Table m_table;
+    DataSet m_texts; ///< Header texts alone.
+    bool m_hasDescriptor = false;
+    StatedScales m_scales;
+    ConditionFinder m_conditions;
+};
+
+Failure TextReader::read(DataSet& set) {
+    std::string_view line;
+    while (m_lines.next(line)) {
+        if (const Failure failure = readLine(line); failure != Failure::None)
+            return failure;
+    }
+    if (m_tables == 0)
+        return Failure::Damaged; // breaks off before its rows
+    const bool hadColour = !m_table.set.lab.empty() || !m_table.set.xyz.empty();
+    if (const Failure failure = complete(m_table, m_scales, m_wants, m_notes);
+        failure != Failure::None)
+        return failure;
+
+    set = std::move(m_table.set);
+    set.originator = std::move(m_texts.originator);
+    set.descriptor = std::move(m_texts.descriptor);
+    set.created = std::move(m_texts.created);
+    set.instrumentation = std::move(m_texts.instrumentation);
+    set.conditions = m_conditions.result();
+    const Conditions& stated = set.conditions;
+    const bool otherLight = !stated.illuminant.empty() && stated.illuminant != "D50";
+    const bool otherObserver = !stated.observer.empty() && stated.observer != "2";
+    if (hadColour && (otherLight || otherObserver))
+        m_notes.add("The colour values are stated for other conditions than D50 and 2 degrees.");
+    set.notes = m_notes.take();
+    return Failure::None;
+}
+
+Failure TextReader::readLine(std::string_view line) {
+    const std::string_view word = firstWordOf(line);
+    const char* const behind = word.data() + word.size() + (*line.data() == '"' ? 1 : 0);
+    if (sameWord(word, "BEGIN_DATA_FORMAT")) {
+        m_lines.moveTo(std::min(behind, line.data() + line.size()));
+        return readFormat(line);
+    }
+    if (sameWord(word, "BEGIN_DATA"))
+        return readRows(std::min(behind, line.data() + line.size()), true);
+    if (isStructure(word))
+        return Failure::None;
+
+    const KeywordLine keyword = keywordLine(line);
+    if (keyword.keyword == "NUMBER_OF_FIELDS") {
+        m_fieldCount = countIn(keyword.value);
+    } else if (keyword.keyword == "NUMBER_OF_SETS") {
+        m_setCount = countIn(keyword.value);
+    } else if (keyword.keyword != "KEYWORD") {
+        seeHeader(keyword);
+        return seeUnannounced(line);
+    }
+    return Failure::None;
+}
+
+/// Reads the names from behind BEGIN_DATA_FORMAT on, in as many lines as there are.
+Failure TextReader::readFormat(std::string_view line) {
+    m_names = {};
+    m_hasFormat = true;
+    while (true) {
+        const char* const start = m_lines.at();
+        if (!m_lines.next(line))
+            return Failure::Damaged;
+        if (sameWord(firstWordOf(line), "BEGIN_DATA")) {
+            m_notes.add("END_DATA_FORMAT is missing.");
+            m_lines.moveTo(start);
+            return Failure::None;
+        }
+        // The end may stand behind the last name.
+        const std::string upper = upperCase(line.substr(0, searchedHeader));
+        const std::size_t end = upper.find("END_DATA_FORMAT");
+        if (!addLine(line.substr(0, end), m_fieldCount, m_names))
+            return Failure::TooLarge;
+        if (end != std::string::npos)
+            return Failure::None;
+    }
+}
+
+/// Notices a line of names without BEGIN_DATA_FORMAT. Where rows follow at once, the text has no
+/// BEGIN_DATA either and the rows are read.
+Failure TextReader::seeUnannounced(std::string_view line) {
+    const auto searched = static_cast<std::size_t>(line.data() - m_text.data()) + line.size();
+    if (m_hasFormat || searched > searchedHeader)
+        return Failure::None;
+    NameList names = unannouncedNames(line);
+    if (names.names.empty())
+        return Failure::None;
+    m_unannounced = std::move(names);
+    Lines ahead = m_lines;
+    std::string_view next;
+    if (!ahead.next(next) || isStructure(firstWordOf(next)) || !isRow(next, *m_unannounced.chars))
+        return Failure::None;
+    m_notes.add("There is no BEGIN_DATA: the rows are taken to follow the names of the columns.");
+    return readRows(line.data() + line.size(), false);
+}
+
+/// Settles the names of the columns for the rows behind BEGIN_DATA.
+Failure TextReader::findNames(Lines& rows) {
+    if (m_hasFormat)
+        return m_names.names.empty() ? Failure::Damaged : Failure::None;
+    if (!m_unannounced.names.empty()) {
+        m_names = std::move(m_unannounced);
+    } else {
+        Lines ahead = rows;
+        std::string_view line;
+        NameList names;
+        if (ahead.next(line) && !isStructure(firstWordOf(line)))
+            names = unannouncedNames(line);
+        if (!names.names.empty()) {
+            m_names = std::move(names);
+            rows = ahead;
+        } else if (m_names.names.empty()) {
+            return Failure::Damaged; // nothing says what the columns are
+        } else {
+            return Failure::None; // as in the table before
+        }
+    }
+    m_notes.add("There is no BEGIN_DATA_FORMAT: a line of names serves as one.");
+    return Failure::None;
+}
+
+Failure TextReader::readRows(const char* at, bool hasBegin) {
+    Lines rows = m_lines;
+    rows.moveTo(at);
+    if (const Failure failure = findNames(rows); failure != Failure::None)
+        return failure;
+
+    TableHeader header{m_names.names, m_names.chars, m_fieldCount, m_setCount, hasBegin};
+    RowReader reader(m_text, m_ascii, m_wants, m_notes);
+    Table table;
+    at = rows.at();
+    if (const Failure failure = reader.read(at, std::move(header), table); failure != Failure::None)
+        return failure;
+    m_lines.moveTo(at);
+    if (++m_tables == 1)
+        m_table = std::move(table);
+    else
+        joinTable(m_table, std::move(table), m_notes);
+    m_hasFormat = false;
+    m_unannounced = {};
+    m_fieldCount.reset();
+    m_setCount.reset();
+    return m_table.set.patchCount > maxCgatsPatches ? Failure::TooLarge : Failure::None;
+}
+
+/// Keeps what a data set has of its header. Of repeated keywords the first counts.
+void TextReader::seeHeader(const KeywordLine& line) {
+    const auto keep = [&](std::string& text) {
+        if (text.empty())
+            text = line.value;
+    };
+    if (line.keyword == "ORIGINATOR")
+        keep(m_texts.originator);
+    else if (line.keyword == "CREATED")
+        keep(m_texts.created);
+    else if (line.keyword == "INSTRUMENTATION")
+        keep(m_texts.instrumentation);
+    else if (line.keyword == "DESCRIPTOR" || line.keyword == "FILE_DESCRIPTOR")
+        keep(m_texts.descriptor);
+    else if (line.keyword == "TINTGATE_SCALES" && line.value == "device 100, XYZ 100, spectra 1")
+        m_scales.known = true;
+    m_conditions.see(line.keyword, line.value);
+}
+
+bool isBlack(const DataSet& set) {
+    return std::all_of(set.lab.begin(), set.lab.end(), [](const Lab& lab) { return lab.L == 0; });
+}
+
+} // namespace
+
+bool looksLikeCgats(std::string_view bytes) {
+    bytes = withoutMark(bytes);
+    if (bytes.empty() || std::memchr(bytes.data(), 0, bytes.size()) != nullptr)
+        return false;
+    Lines lines(bytes.substr(0, searchedHeader));
+    std::string_view line;
+    bool isFirst = true;
+    while (lines.next(line)) {
+        const std::string_view word = firstWordOf(line);
+        if (isFirst) {
+            const std::string upper = upperCase(word.substr(0, 16));
+            for (const std::string_view known : firstWords) {
+                if (upper.starts_with(known))
+                    return true;
+            }
+        }
+        isFirst = false;
+        const std::string keyword = keywordLine(line).keyword;
+        if (std::find(std::begin(knownKeywords), std::end(knownKeywords), keyword) !=
+                std::end(knownKeywords) &&
+            (isStructure(word) ||
+             std::none_of(word.begin(), word.end(), [](char c) { return c >= 'a' && c <= 'z'; })))
+            return true;
+        if (!unannouncedNames(line).names.empty())
+            return true;
+    }
+    return false;
+}
+
+Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set) {
+    if (bytes.size() > maxCgatsBytes)
+        return Failure::TooLarge;
+    try {
+        if (!looksLikeCgats(bytes))
+            return Failure::NotRecognised;
+        bytes = withoutMark(bytes);
+        DataSet result;
+        const Failure failure = TextReader(bytes, wants).read(result);
+        if (failure != Failure::None)
+            return failure;
+        if (!wants.spectra && result.hasColour() && isBlack(result)) {
+            // Where a store had neither Lab nor XYZ these are zeros, and the spectra tell.
+            DataSet withSpectra;
+            if (TextReader(bytes, {}).read(withSpectra) == Failure::None && !isBlack(withSpectra))
+                result = std::move(withSpectra);
+        }
+        set = std::move(result);
+        return Failure::None;
+    } catch (const std::bad_alloc&) {
+        return Failure::OutOfMemory;
+    } catch (const std::length_error&) {
+        return Failure::OutOfMemory;
+    }
+}
+
+std::optional<std::string> cgatsKeyword(std::string_view bytes, std::string_view keyword) {
+    Lines lines(withoutMark(bytes));
+    std::string_view line;
+    bool inRows = false;
+    while (lines.next(line)) {
+        const std::string_view word = firstWordOf(line);
+        if (inRows) {
+            inRows = !sameWord(word, "END_DATA");
+        } else if (sameWord(word, "BEGIN_DATA")) {
+            inRows = true;
+        } else if (line.front() == '"' || sameWord(word, keyword)) {
+            KeywordLine found = keywordLine(line);
+            if (sameWord(found.keyword, keyword))
+                return std::move(found.value);
+        }
+    }
+    return std::nullopt;
+}
+
+} // namespace colour

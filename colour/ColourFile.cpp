@@ -1,0 +1,155 @@
+#include "colour/ColourFile.h"
+
+#include <cerrno>
+#include <cstring>
+#include <new>
+#include <stdexcept>
+#include <string_view>
+
+#include <fcntl.h>
+#include <poll.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace colour {
+
+namespace {
+
+/// Of a pipe or device, which don't say how long they are.
+constexpr std::size_t maxStreamBytes = std::size_t{512} << 20;
+
+/// How long a pipe may stay silent.
+constexpr int patience = 30'000; // ms
+
+/// Enough to tell whether the rest is worth reading.
+constexpr std::size_t headBytes = std::size_t{64} << 10;
+
+class Descriptor {
+  public:
+    explicit Descriptor(int number) : m_number(number) {}
+    ~Descriptor() {
+        if (m_number >= 0)
+            close(m_number);
+    }
+    Descriptor(const Descriptor&) = delete;
+    Descriptor& operator=(const Descriptor&) = delete;
+    int number() const { return m_number; }
+
+  private:
+    int m_number;
+};
+
+/// One read that waits for data but not for ever. Bytes read, 0 at the end, -1 for a failure.
+ssize_t readSome(int descriptor, bool isStream, char* target, std::size_t room) {
+    while (true) {
+        if (isStream) {
+            pollfd wait{descriptor, POLLIN, 0};
+            const int ready = poll(&wait, 1, patience);
+            if (ready < 0 && errno == EINTR)
+                continue;
+            if (ready <= 0)
+                return -1;
+        }
+        const ssize_t count = read(descriptor, target, room);
+        if (count >= 0 || (errno != EINTR && errno != EAGAIN))
+            return count;
+    }
+}
+
+using WorthReading = bool (*)(std::string_view head);
+
+bool anything(std::string_view) {
+    return true;
+}
+
+/// Text without NULs or a profile: all else need not be read to its end.
+bool textOrProfile(std::string_view head) {
+    return looksLikeProfile(head) || std::memchr(head.data(), 0, head.size()) == nullptr;
+}
+
+/// NotRecognised where the first bytes are not worth the rest.
+Failure readBytes(const std::string& path, std::size_t limit, WorthReading worthReading,
+                  std::string& bytes) {
+    if (path.find('\0') != std::string::npos)
+        return Failure::Missing;
+    // Without O_NONBLOCK the opening of a pipe waits for its other end.
+    const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+    if (file.number() < 0) {
+        const bool missing = errno == ENOENT || errno == ENOTDIR || errno == ENAMETOOLONG;
+        return missing ? Failure::Missing : Failure::Unreadable;
+    }
+    struct stat status {};
+    if (fstat(file.number(), &status) != 0 || S_ISDIR(status.st_mode))
+        return Failure::Unreadable;
+    const bool isStream = !S_ISREG(status.st_mode);
+    if (isStream)
+        limit = std::min(limit, maxStreamBytes);
+    else if (static_cast<unsigned long long>(status.st_size) > limit)
+        return Failure::TooLarge;
+
+    std::string contents;
+    std::size_t used = 0;
+    bool isHeadSeen = false;
+    contents.resize(headBytes);
+    while (true) {
+        const ssize_t count =
+            readSome(file.number(), isStream, contents.data() + used, contents.size() - used);
+        if (count < 0)
+            return Failure::Unreadable;
+        used += static_cast<std::size_t>(count);
+        if (used > limit)
+            return Failure::TooLarge;
+        if (!isHeadSeen && (count == 0 || used == contents.size())) {
+            isHeadSeen = true;
+            if (!worthReading({contents.data(), used}))
+                return Failure::NotRecognised;
+        }
+        if (count == 0)
+            break;
+        if (used == contents.size()) {
+            // One byte more than a file says, so that its end is seen without another growth.
+            const auto stated =
+                isStream ? std::size_t{0} : static_cast<std::size_t>(status.st_size);
+            contents.resize(stated >= used ? stated + 1 : 2 * used);
+        }
+    }
+    contents.resize(used);
+    bytes = std::move(contents);
+    return Failure::None;
+}
+
+} // namespace
+
+Failure readWholeFile(const std::string& path, std::size_t limit, std::string& bytes) {
+    try {
+        return readBytes(path, limit, anything, bytes);
+    } catch (const std::bad_alloc&) {
+        return Failure::OutOfMemory;
+    } catch (const std::length_error&) {
+        return Failure::OutOfMemory;
+    }
+}
+
+Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file) {
+    try {
+        std::string bytes;
+        if (const Failure failure = readBytes(path, maxCgatsBytes, textOrProfile, bytes);
+            failure != Failure::None)
+            return failure;
+        ColourFile loaded;
+        Failure failure = Failure::None;
+        if (looksLikeProfile(bytes))
+            failure = loaded.profile.emplace().open(bytes);
+        else
+            failure = readCgats(bytes, wants, loaded.set.emplace());
+        if (failure == Failure::None)
+            file = std::move(loaded);
+        return failure;
+    } catch (const std::bad_alloc&) {
+        return Failure::OutOfMemory;
+    } catch (const std::length_error&) {
+        return Failure::OutOfMemory;
+    }
+}
+
+} // namespace colour

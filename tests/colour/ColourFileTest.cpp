@@ -1,0 +1,100 @@
+#include "colour/ColourFile.h"
+
+#include <cstdlib>
+#include <fstream>
+#include <string>
+#include <thread>
+
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <gtest/gtest.h>
+
+#include "RunProgram.h"
+#include "ScratchFolder.h"
+
+using namespace colour;
+
+namespace {
+
+const std::string text = "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID LAB_L LAB_A LAB_B\n"
+                         "END_DATA_FORMAT\nNUMBER_OF_SETS 1\nBEGIN_DATA\n1 50 0 0\nEND_DATA\n";
+
+Failure load(const std::string& path) {
+    ColourFile file;
+    return loadColourFile(path, {}, file);
+}
+
+} // namespace
+
+TEST(ColourFile, TellsFilesByTheirBytes) {
+    const support::ScratchFolder folder;
+    const std::string profile =
+        support::contentsOf("/usr/share/color/icc/ghostscript/default_cmyk.icc");
+    ColourFile file;
+    ASSERT_EQ(loadColourFile(folder.write("a.icc", text), {}, file), Failure::None);
+    EXPECT_TRUE(file.set && !file.profile);
+    EXPECT_EQ(file.set->patchCount, 1U);
+    ASSERT_EQ(loadColourFile(folder.write("b.txt", profile), {}, file), Failure::None);
+    EXPECT_TRUE(file.profile && !file.set);
+
+    const std::string& p = profile;
+    EXPECT_EQ(load(folder.write("cut.icc", p.substr(0, p.size() / 2))), Failure::ProfileDamaged);
+    EXPECT_EQ(load(folder.write("other", std::string(100, '\0'))), Failure::NotRecognised);
+    EXPECT_EQ(load(folder.write("empty", "")), Failure::NotRecognised);
+    EXPECT_EQ(load("/dev/zero"), Failure::NotRecognised);
+    EXPECT_TRUE(file.profile); // as it was
+}
+
+TEST(ColourFile, TellsWhyAFileCannotBeRead) {
+    const support::ScratchFolder folder;
+    EXPECT_EQ(load(folder.path("missing")), Failure::Missing);
+    EXPECT_EQ(load(""), Failure::Missing);
+    EXPECT_EQ(load(folder.write("file", text) + "/below"), Failure::Missing);
+    EXPECT_EQ(load(folder.path("file") + std::string("\0x", 2)), Failure::Missing);
+    EXPECT_EQ(load(folder.path()), Failure::Unreadable);
+    ASSERT_EQ(symlink("loop", folder.path("loop").c_str()), 0);
+    EXPECT_EQ(load(folder.path("loop")), Failure::Unreadable);
+
+    std::string bytes = "as it was";
+    EXPECT_EQ(readWholeFile(folder.path("file"), text.size() - 1, bytes), Failure::TooLarge);
+    EXPECT_EQ(readWholeFile("/dev/zero", 1'000'000, bytes), Failure::TooLarge);
+    EXPECT_EQ(bytes, "as it was");
+    EXPECT_EQ(readWholeFile(folder.path("file"), text.size(), bytes), Failure::None);
+    EXPECT_EQ(bytes, text);
+    EXPECT_EQ(readWholeFile("/proc/self/status", 1'000'000, bytes), Failure::None);
+    EXPECT_EQ(bytes.substr(0, 5), "Name:"); // a file that says it has no bytes
+}
+
+// Permissions bind nobody who is root: the question is asked by an ordinary user.
+TEST(ColourFile, NoticesMissingPermission) {
+    const support::ScratchFolder folder;
+    const std::string path = folder.write("secret", text);
+    ASSERT_EQ(chmod(folder.path().c_str(), 0755), 0);
+    ASSERT_EQ(chmod(path.c_str(), 0), 0);
+    support::giveTo(support::ordinaryUser, path);
+    const pid_t child = fork();
+    if (child == 0) {
+        const bool dropped = support::becomeUser(support::ordinaryUser);
+        _exit(dropped && load(path) == Failure::Unreadable ? 0 : 1);
+    }
+    int status = 0;
+    ASSERT_EQ(waitpid(child, &status, 0), child);
+    EXPECT_EQ(status, 0);
+}
+
+TEST(ColourFile, WaitsForPipes) {
+    const support::ScratchFolder folder;
+    const std::string path = folder.path("pipe");
+    ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
+    std::thread writer([&] {
+        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+        std::ofstream pipe(path);
+        pipe << text.substr(0, 20) << std::flush;
+        std::this_thread::sleep_for(std::chrono::milliseconds(50));
+        pipe << text.substr(20);
+    });
+    EXPECT_EQ(load(path), Failure::None);
+    writer.join();
+}
