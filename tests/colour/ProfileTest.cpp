@@ -197,23 +197,3 @@ TEST(Profile, OneFailureForOneCause) {
     EXPECT_EQ(profile.open(noSignature), Failure::ProfileDamaged);
     EXPECT_FALSE(profile.description().empty());
 }
-
-// Whatever became of the bytes, opening gives an answer, and what it opened gives colours.
-TEST(Profile, DamageIsHarmless) {
-    std::mt19937 engine(7); // NOLINT: the same damage each time
-    const double inks[] = {0, 0, 0, 0, 30, 60, 90, 20};
-    for (const Made& made : {Made{2.1}, Made{4.3}, Made{4.4, true}}) {
-        const std::string good = makeProfile(made);
-        for (int round = 0; round < 500; ++round) {
-            std::string bytes = good;
-            for (int hit = 0; hit < 1 + round % 4; ++hit)
-                bytes[40 + engine() % (bytes.size() - 40)] = static_cast<char>(engine());
-            Profile profile;
-            Lab labs[2];
-            if (profile.open(bytes) != Failure::None ||
-                profile.evaluate(inks, 2, 4, labs) != Failure::None)
-                continue;
-            EXPECT_LT(std::hypot(labs[1].L, labs[1].a, labs[1].b), 20000);
-        }
-    }
-}

@@ -1,0 +1,214 @@
+#include "analysis/Presets.h"
+
+#include <algorithm>
+#include <sstream>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "ExitCodes.h"
+#include "ScratchFolder.h"
+#include "analysis/Criteria.h"
+#include "analysis/Text.h"
+
+using namespace analysis;
+using Record = tolerancePresetParameterRecord;
+
+namespace {
+
+const char* const goodText = R"(<?xml version="1.0" encoding="UTF-8"?>
+<!-- a comment -->
+<tolerancePreset version="1">
+  <id>12</id>
+  <name> Haus &amp; Hof ü </name>
+  <formula>CIECMC_2_1</formula>
+  <editable>yes</editable>
+  <showInClient>no</showInClient>
+  <usedForDynamicWedge>yes</usedForDynamicWedge>
+  <illuminationCondition>-1</illuminationCondition>
+  <psd>no</psd>
+  <criteria>
+    <average tolerance="2.5" used="yes" decimals="2"/>
+    <greyHueAverage tolerance="1000" used="no" decimals="10" psdTolerance="0" psdUsed="yes"/>
+    <spotMaximum tolerance="1e1" used="yes" decimals="0" psdTolerance=" 4 " psdUsed="no"></spotMaximum>
+  </criteria>
+</tolerancePreset>
+)";
+
+/// A record full of what must survive or go.
+Record filled() {
+    Record record;
+    record.filePath = "kept.xml";
+    record.presetID = 77;
+    record.name = "old";
+    record.deltaEMode = 3;
+    record.editable = 9;
+    record.fograPSDPreset = 1;
+    std::fill(std::begin(record.presetValues), std::end(record.presetValues), 9.0);
+    std::fill(std::begin(record.usedForResult), std::end(record.usedForResult), 1);
+    std::fill(std::begin(record.decimalPlaces), std::end(record.decimalPlaces), 9);
+    return record;
+}
+
+} // namespace
+
+TEST(Presets, EverythingOfTheRecordComesFromTheFile) {
+    for (const bool keepJobChoice : {false, true}) {
+        Record record = filled();
+        ASSERT_EQ(parsePreset(goodText, keepJobChoice, record), exitDone);
+        EXPECT_EQ(record.presetID, keepJobChoice ? 77 : 12);
+        EXPECT_EQ(record.deltaEMode, keepJobChoice ? 3 : 5);
+        EXPECT_EQ(record.name, wxString(L"Haus & Hof ü"));
+        EXPECT_EQ(record.filePath, "kept.xml");
+        EXPECT_EQ(record.editable, 1);
+        EXPECT_EQ(record.showInClient, 0);
+        EXPECT_EQ(record.usedForDynamicWedge, 1);
+        EXPECT_EQ(record.illuminationCondition, -1);
+        EXPECT_EQ(record.fograPSDPreset, 0);
+        for (int i = 0; i < presetValueCount; ++i) {
+            EXPECT_EQ(record.presetValues[i], i == 0 ? 2.5 : i == 19 ? 10 : i == 22 ? 1000 : 0);
+            EXPECT_EQ(record.usedForResult[i], i == 0 || i == 19 ? 1 : 0);
+            EXPECT_EQ(record.decimalPlaces[i], i == 0 ? 2 : i == 22 ? 10 : 0);
+        }
+        for (int i = 0; i < psdPresetValueCount; ++i) {
+            EXPECT_EQ(record.psdPresetValues[i], i == 21 ? 4 : 0);
+            EXPECT_EQ(record.usedForPSDResult[i], i == 22 ? 1 : 0);
+        }
+    }
+}
+
+// What becomes of the text above with a word of it replaced.
+TEST(Presets, OneCodeForOneCause) {
+    const struct {
+        std::string from;
+        std::string to;
+        int code;
+    } edits[] = {
+        {"</tolerancePreset>", "", exitPresetNotXml},
+        {"<psd>no", "<psd no", exitPresetNotXml},
+        {"<tolerancePreset v", "<t:tolerancePreset v", exitPresetNotXml},
+        {"</tolerancePreset>", "</tolerancePreset>more", exitPresetNotXml},
+        {"</tolerancePreset>", "</tolerancePreset><a/>", exitPresetNotXml},
+        {"<psd>", std::string("\0<psd>", 6), exitPresetNotXml},
+        {"ü", "\xFC", exitPresetNotXml},
+
+        {"<tolerancePreset", "<!DOCTYPE a [<!ENTITY b \"c\">]><tolerancePreset",
+         exitPresetWrongKind},
+
+        {" version=\"1\"", "", exitPresetValueMissing},
+        {"<id>12</id>", "", exitPresetValueMissing},
+        {"Haus &amp; Hof ü", "", exitPresetValueMissing},
+        {"\"2.5\"", "\"\"", exitPresetValueMissing},
+        {"tolerance=\"2.5\"", "", exitPresetValueMissing},
+        {"used=\"yes\"", "", exitPresetValueMissing},
+        {"decimals=\"2\"", "", exitPresetValueMissing},
+        {" psdUsed=\"yes\"", "", exitPresetValueMissing},
+        {"<psd>no", "<psd>yes", exitPresetValueMissing},
+
+        {"<id>12</id>", "<id>12</id><id>12</id>", exitPresetValueRepeated},
+        {"<criteria>", "<criteria/><criteria>", exitPresetValueRepeated},
+        {"greyHueAverage", "average", exitPresetValueRepeated},
+        {"used=\"yes\"", "used=\"yes\" used=\"yes\"", exitPresetValueRepeated},
+
+        {"2.5", "high", exitPresetNotNumeric},
+        {"2.5", "2,5", exitPresetNotNumeric},
+        {"2.5", "2.5 dE", exitPresetNotNumeric},
+        {"2.5", "nan", exitPresetNotNumeric},
+        {"2.5", "-inf", exitPresetNotNumeric},
+        {"2.5", "0x10", exitPresetNotNumeric},
+        {"\"2\"", "\"1.5\"", exitPresetNotNumeric},
+        {">12<", ">CVP<", exitPresetNotNumeric},
+
+        {"2.5", "-2.5", exitPresetOutOfRange},
+        {"2.5", "1e999", exitPresetOutOfRange},
+        {"2.5", "nan(0)", exitPresetOutOfRange},
+        {"\"1000\"", "\"1000.0001\"", exitPresetOutOfRange},
+        {"\"10\"", "\"11\"", exitPresetOutOfRange},
+        {">12<", ">2147483648<", exitPresetOutOfRange},
+        {">12<", ">-1<", exitPresetOutOfRange},
+        {"version=\"1\"", "version=\"2\"", exitPresetOutOfRange},
+        {"CIECMC_2_1", "CIE2001", exitPresetOutOfRange},
+        {"used=\"yes\"", "used=\"true\"", exitPresetOutOfRange},
+
+        {"<psd>", "<colour/><psd>", exitPresetUnknownEntry},
+        {"<average", "<avarage", exitPresetUnknownEntry},
+        {"decimals", "unit=\"dE\" decimals", exitPresetUnknownEntry},
+        {"<id>", "<id type=\"int\">", exitPresetUnknownEntry},
+        {"<psd>", "true <psd>", exitPresetUnknownEntry},
+        {">12<", "><b>12</b><", exitPresetUnknownEntry},
+        {"></spotMaximum", ">4</spotMaximum", exitPresetUnknownEntry},
+    };
+    const auto expect = [](const std::string& text, int code) {
+        Record record = filled();
+        EXPECT_EQ(parsePreset(text, false, record), code);
+        EXPECT_TRUE(record.name == "old" && record.presetID == 77 && record.deltaEMode == 3 &&
+                    record.presetValues[0] == 9.0 && record.fograPSDPreset == 1);
+    };
+    for (const auto& edit : edits) {
+        SCOPED_TRACE(edit.from + " -> " + edit.to);
+        std::string text = goodText;
+        expect(text.replace(text.find(edit.from), edit.from.size(), edit.to), edit.code);
+    }
+    std::string deep;
+    for (const char* tag : {"<a>", "</a>"})
+        for (int i = 0; i < 100000; ++i)
+            deep += tag;
+    expect(deep, exitPresetWrongKind);
+    expect(goodText + std::string(maxPresetBytes, ' '), exitPresetWrongKind);
+    expect("<tolerancePreset version=\"1\"></tolerancePreset>", exitPresetValueMissing);
+    for (const char* noXml : {"", " \n", "CGATS.17\n"})
+        expect(noXml, exitPresetNotXml);
+}
+
+TEST(Presets, Files) {
+    const support::ScratchFolder folder;
+    Record record;
+    EXPECT_EQ(readPreset(folder.path("none.xml"), false, record), exitPresetMissing);
+    EXPECT_EQ(readPreset(folder.path(), false, record), exitPresetUnreadable);
+    EXPECT_EQ(readPreset("/dev/zero", false, record), exitPresetWrongKind);
+    for (const char* name : {"p\xFF.xml", "q.xml"}) { // the first path stays
+        ASSERT_EQ(readPreset(folder.write(name, goodText), false, record), exitDone);
+        EXPECT_EQ(narrowed(record.filePath.ToStdWstring()), folder.path("p\xFF.xml"));
+    }
+}
+
+// What each shipped file judges by, against the figures of the documents that it is called after.
+TEST(Presets, ShippedFiles) {
+    const struct {
+        const char* endOfName;
+        int formula;
+        const char* judgesBy;
+    } cases[] = {
+        {"values after ISO 12647-7:2016", 4,
+         "average 2.5 maximum 5 paperWhite 3 solidMaximum 3 solidCyan 3 solidMagenta 3 "
+         "solidYellow 3 solidBlack 3 solidHueMaximum 2.5 greyMaximum 3.5 greyAverage 2 "},
+        {"values after ISO 12647-7:2016", 4, "average 2.5 percentile95 5 outerGamutAverage 2.5 "},
+        {"values after ISO 12647-7 in delta E*ab", 0,
+         "average 3 maximum 6 paperWhite 3 solidMaximum 5 solidCyan 5 solidMagenta 5 "
+         "solidYellow 5 solidBlack 5 solidHueMaximum 2.5 greyHueAverage 1.5 "},
+        {"values after ISO 12647-8:2021", 4,
+         "average 2.5 percentile95 5 paperWhite 3 greyMaximum 4 greyAverage 2.5 "},
+        {"values after ISO 12647-8:2021", 4, "average 2.5 percentile95 5 outerGamutAverage 3 "},
+        {"values after G7 v35 (2019)", 4, "average 1.5 maximum 5.5 percentile95 3 paperWhite 3 "},
+        {"invented values, not for use", 4, "average 5 maximum 5 "},
+    };
+    const std::string folder = TINTGATE_SOURCE_DIR "/presets/";
+    int id = 0;
+    for (const auto& c : cases) {
+        Record record;
+        const std::string file = "CVP_000" + std::to_string(++id) + ".xml";
+        SCOPED_TRACE(file);
+        ASSERT_EQ(readPreset(folder + file, false, record), exitDone);
+        EXPECT_EQ(record.presetID, id);
+        EXPECT_TRUE(record.name.EndsWith(c.endOfName)) << record.name;
+        EXPECT_EQ(record.deltaEMode, c.formula);
+        EXPECT_EQ(record.fograPSDPreset, id == 7 ? 1 : 0);
+        std::ostringstream judgesBy;
+        for (const Criterion& criterion : criteria)
+            if (record.usedForResult[criterion.index])
+                judgesBy << criterion.name << ' ' << record.presetValues[criterion.index] << ' ';
+        EXPECT_EQ(judgesBy.str(), c.judgesBy);
+        EXPECT_GT(record.presetValues[criterionOfName("secondaryMaximum")->index], 0);
+    }
+    EXPECT_FALSE(support::exists(folder + "CVP_0008.xml"));
+}
