@@ -1,5 +1,6 @@
 #include "analysis/OutputFile.h"
 
+#include <algorithm>
 #include <cerrno>
 #include <utility>
 
@@ -8,9 +9,13 @@
 #include <unistd.h>
 
 #include "ExitCodes.h"
+#include "colour/ColourFile.h"
 
 namespace analysis {
 namespace {
+
+/// Beyond this an old file is not held in memory to put it back.
+constexpr std::size_t largestKept = std::size_t{1} << 30;
 
 class Descriptor {
   public:
@@ -29,33 +34,42 @@ class Descriptor {
     int m_fd;
 };
 
-bool writeAll(int fd, std::string_view bytes) {
-    while (!bytes.empty()) {
-        const ssize_t written = ::write(fd, bytes.data(), bytes.size());
+/// Writes from the start on. Gives how much was written: all of it, or up to the failure.
+std::size_t writeAll(int fd, std::string_view bytes) {
+    std::size_t done = 0;
+    while (done < bytes.size()) {
+        const ssize_t written = ::write(fd, bytes.data() + done, bytes.size() - done);
         if (written < 0 && errno != EINTR)
-            return false;
+            break;
         if (written > 0)
-            bytes.remove_prefix(static_cast<std::size_t>(written));
+            done += static_cast<std::size_t>(written);
     }
-    return true;
+    return done;
 }
 
-/// Room for the bytes before the old contents go. File systems that can't reserve take the risk.
-bool reserve(int fd, std::size_t size) {
-    return size == 0 || ::fallocate(fd, FALLOC_FL_KEEP_SIZE, 0, static_cast<off_t>(size)) == 0 ||
-           (errno != ENOSPC && errno != EDQUOT && errno != EFBIG);
+/// Puts back what the first `written` bytes have replaced. It needs no room on the disk.
+void restore(int fd, std::string_view old, std::size_t written) {
+    if (::lseek(fd, 0, SEEK_SET) == 0 &&
+        writeAll(fd, old.substr(0, written)) == std::min(old.size(), written))
+        static_cast<void>(::ftruncate(fd, static_cast<off_t>(old.size())) == 0);
 }
 
 int writeInPlace(const std::string& path, std::string_view bytes) {
-    Descriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0666));
+    std::string old;
     struct stat status {};
+    if (::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode) &&
+        colour::readWholeFile(path, largestKept, old) != colour::Failure::None)
+        return exitOutputNotWritable; // what can't be kept is not put at risk
+    Descriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0666));
     if (!file || ::fstat(file.get(), &status) != 0)
         return exitOutputNotWritable;
+    const std::size_t written = writeAll(file.get(), bytes);
     const bool regular = S_ISREG(status.st_mode);
-    if (regular && !reserve(file.get(), bytes.size()))
+    if (written < bytes.size()) {
+        if (regular)
+            restore(file.get(), old, written);
         return exitOutputIncomplete;
-    if (!writeAll(file.get(), bytes))
-        return exitOutputIncomplete;
+    }
     if (regular && ::ftruncate(file.get(), static_cast<off_t>(bytes.size())) != 0)
         return exitOutputIncomplete;
     return file.close() ? exitDone : exitOutputIncomplete;
@@ -83,7 +97,7 @@ int replaceWhole(const std::string& path, std::string_view bytes, const struct s
     if (old && ::fchown(file.get(), old->st_uid, old->st_gid) == 0)
         static_cast<void>(::fchmod(file.get(), old->st_mode & 07777));
     int status = exitDone;
-    if (!writeAll(file.get(), bytes) || ::fsync(file.get()) != 0 || !file.close())
+    if (writeAll(file.get(), bytes) < bytes.size() || ::fsync(file.get()) != 0 || !file.close())
         status = exitOutputIncomplete;
     else if (::rename(draft.c_str(), path.c_str()) != 0)
         status = exitOutputNotWritable;

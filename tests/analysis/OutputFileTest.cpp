@@ -1,0 +1,106 @@
+#include "analysis/OutputFile.h"
+
+#include <csignal>
+#include <filesystem>
+
+#include <sys/resource.h>
+#include <sys/stat.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <gtest/gtest.h>
+
+#include "ExitCodes.h"
+#include "RunProgram.h"
+#include "ScratchFolder.h"
+
+namespace {
+
+/// Status of writing "new" over `path` in a process of its own, by an ordinary user or with files
+/// limited to two bytes, as a full disk limits them.
+int statusInChild(const std::string& path, unsigned user, bool diskFull) {
+    const pid_t child = fork();
+    if (child == 0) {
+        if (diskFull) {
+            std::signal(SIGXFSZ, SIG_IGN);
+            const rlimit limit{2, 2};
+            setrlimit(RLIMIT_FSIZE, &limit);
+        }
+        if (user != 0 && !support::becomeUser(user))
+            _exit(127);
+        _exit(analysis::writeOutputFile(path, "new"));
+    }
+    int status = 0;
+    waitpid(child, &status, 0);
+    return WIFEXITED(status) ? WEXITSTATUS(status) : -1;
+}
+
+std::size_t entriesIn(const std::string& folder) {
+    const std::filesystem::directory_iterator entries(folder);
+    return static_cast<std::size_t>(std::distance(begin(entries), end(entries)));
+}
+
+TEST(OutputFile, ReplacesWholeAndKeepsModeAndLinks) {
+    const support::ScratchFolder scratch;
+    const std::string path = scratch.path("new.txt");
+    EXPECT_EQ(analysis::writeOutputFile(path, "first"), exitDone);
+    EXPECT_EQ(support::contentsOf(path), "first");
+    const mode_t mask = umask(0);
+    umask(mask);
+    EXPECT_EQ(support::modeOf(path), 0666u & ~mask);
+
+    chmod(path.c_str(), 0640);
+    EXPECT_EQ(analysis::writeOutputFile(path, "2"), exitDone);
+    EXPECT_EQ(support::contentsOf(path), "2");
+    EXPECT_EQ(support::modeOf(path), 0640u);
+
+    const std::string link = scratch.path("link");
+    std::filesystem::create_symlink(path, link);
+    EXPECT_EQ(analysis::writeOutputFile(link, ""), exitDone);
+    EXPECT_TRUE(std::filesystem::is_symlink(link));
+    EXPECT_EQ(support::contentsOf(path), "");
+    EXPECT_EQ(entriesIn(scratch.path()), 2u);
+}
+
+TEST(OutputFile, SurvivesEveryFailure) {
+    constexpr unsigned other = support::ordinaryUser;
+    const struct {
+        const char* what;
+        mode_t folderMode, fileMode;
+        unsigned user;
+        bool diskFull, link;
+        int status;
+    } cases[] = {
+        {"full disk", 0755, 0644, 0, true, false, exitOutputIncomplete},
+        {"full disk behind a link", 0755, 0644, 0, true, true, exitOutputIncomplete},
+        {"read-only file", 0777, 0444, other, false, false, exitOutputNotWritable},
+        {"read-only folder, own file", 0555, 0666, other, false, false, exitDone},
+        {"full disk in a read-only folder", 0555, 0666, other, true, false, exitOutputIncomplete},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        const support::ScratchFolder scratch;
+        chmod(scratch.path().c_str(), 0755);
+        const std::string folder = scratch.makeFolder("out");
+        const std::string path = scratch.write("out/lab.txt", "a longer text that was there");
+        const std::string link = scratch.path("link");
+        std::filesystem::create_symlink(path, link);
+        chmod(path.c_str(), c.fileMode);
+        chmod(folder.c_str(), c.folderMode);
+        EXPECT_EQ(statusInChild(c.link ? link : path, c.user, c.diskFull), c.status);
+        EXPECT_EQ(support::contentsOf(path),
+                  c.status == exitDone ? "new" : "a longer text that was there");
+        EXPECT_EQ(entriesIn(folder), 1u);
+    }
+}
+
+TEST(OutputFile, SaysWhatIsWrongWithThePath) {
+    const support::ScratchFolder scratch;
+    EXPECT_EQ(analysis::writeOutputFile("/dev/full", "x"), exitOutputIncomplete);
+    EXPECT_EQ(analysis::writeOutputFile("/dev/null", "x"), exitDone);
+    for (const std::string& path : {scratch.path(), scratch.path("no/such"), std::string()})
+        EXPECT_EQ(analysis::writeOutputFile(path, "x"), exitOutputNotWritable) << path;
+    EXPECT_EQ(analysis::writeOutputFile(scratch.path(std::string(255, 'n')), "x"), exitDone);
+}
+
+} // namespace
