@@ -1,5 +1,6 @@
 #include "analysis/JsonWriter.h"
 
+#include <array>
 #include <charconv>
 #include <cmath>
 #include <cstdlib>
@@ -13,7 +14,28 @@ namespace {
 
 constexpr std::size_t longestNumber = 32;
 
-char* writeDigits(char* at, std::uint64_t value) {
+/// "000102" ... "99": two digits at a time.
+constexpr auto digitPairs = [] {
+    std::array<char, 200> pairs{};
+    for (std::size_t i = 0; i < 100; ++i) {
+        pairs[i * 2] = static_cast<char>('0' + i / 10);
+        pairs[i * 2 + 1] = static_cast<char>('0' + i % 10);
+    }
+    return pairs;
+}();
+
+char* writePair(char* at, std::uint32_t below100) {
+    std::memcpy(at, &digitPairs[below100 * 2], 2);
+    return at + 2;
+}
+
+char* writeWhole(char* at, std::uint64_t value) {
+    if (value < 10) {
+        *at = static_cast<char>('0' + value);
+        return at + 1;
+    }
+    if (value < 100)
+        return writePair(at, static_cast<std::uint32_t>(value));
     return std::to_chars(at, at + 20, value).ptr;
 }
 
@@ -22,10 +44,11 @@ char* writeFraction(char* at, std::uint32_t millionths) {
     if (millionths == 0)
         return at;
     *at++ = '.';
-    for (std::uint32_t unit = 100000; millionths > 0; unit /= 10) {
-        *at++ = static_cast<char>('0' + millionths / unit);
-        millionths %= unit;
-    }
+    at = writePair(at, millionths / 10000);
+    at = writePair(at, millionths / 100 % 100);
+    at = writePair(at, millionths % 100);
+    while (at[-1] == '0')
+        --at;
     return at;
 }
 
@@ -53,7 +76,7 @@ char* writeNumber(char* at, double value) {
     }
     if (value < 0 && millionths > 0)
         *at++ = '-';
-    at = writeDigits(at, millionths / 1000000);
+    at = writeWhole(at, millionths / 1000000);
     return writeFraction(at, static_cast<std::uint32_t>(millionths % 1000000));
 }
 

@@ -42,6 +42,9 @@ class JsonWriter {
     void member(std::string_view name, std::int64_t value);
     void member(std::string_view name, bool value);
 
+    /// The line end of the whole text.
+    void endLine() { raw("\n"); }
+
     std::string_view written() const;
 
     /// What was written, as wide text.

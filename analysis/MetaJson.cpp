@@ -13,13 +13,9 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-std::string utf8(const wxString& text) {
-    return documentText(text.ToStdWstring());
-}
-
 /// Absent texts are null, so that a page needs one test.
 Json optional(const wxString& text) {
-    return text.empty() ? Json() : Json(utf8(text));
+    return text.empty() ? Json() : Json(documentText(text.ToStdWstring()));
 }
 
 /// Local time with its distance from UTC: 2024-05-01T12:34:56+02:00.
@@ -35,7 +31,7 @@ std::string now() {
 
 /// A file in the job's folder, where the flow puts the texts of a run.
 Json inFolder(const wxString& folder, const char* name) {
-    return folder.empty() ? Json() : Json(utf8(folder) + "/" + name);
+    return folder.empty() ? Json() : Json(documentText(folder.ToStdWstring()) + "/" + name);
 }
 
 Json jobOf(const KZJobDataStruct& job) {

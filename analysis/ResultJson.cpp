@@ -10,10 +10,6 @@ namespace {
 using colour::DataSet;
 using colour::Lab;
 
-std::string utf8(const wxString& text) {
-    return documentText(text.ToStdWstring());
-}
-
 /// Texts that may be absent are null then, so that an empty text always means a stated one.
 void optionalMember(JsonWriter& json, std::string_view name, const std::string& text) {
     json.key(name);
@@ -35,8 +31,8 @@ void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset)
     json.key("preset");
     json.beginObject();
     json.member("id", std::int64_t{preset.presetID});
-    json.member("name", utf8(preset.name));
-    json.member("file", utf8(preset.filePath));
+    json.member("name", documentText(preset.name.ToStdWstring()));
+    json.member("file", documentText(preset.filePath.ToStdWstring()));
     json.member("psd", preset.fograPSDPreset > 0);
     json.member("illuminationCondition", std::int64_t{preset.illuminationCondition});
     json.endObject();
@@ -252,7 +248,8 @@ std::wstring resultJson(const Comparison& c, const Judgement& judgement,
     writeColumns(json, c);
     writePatches(json, c);
     json.endObject();
-    return json.wide() + L'\n';
+    json.endLine();
+    return json.wide();
 }
 
 } // namespace analysis
