@@ -8,13 +8,11 @@
 #include <gtest/gtest.h>
 
 #include <signal.h>
-#include <spawn.h>
 #include <sys/stat.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <wx/init.h>
 
+#include "RunningProgram.h"
 #include "SuiteRoot.h"
 #include "measure/Helper.h"
 
@@ -35,28 +33,6 @@ double secondsOf(const auto& work) {
     const auto start = Clock::now();
     work();
     return std::chrono::duration<double>(Clock::now() - start).count();
-}
-
-pid_t start(std::string program) {
-    char minute[] = "60";
-    char* arguments[] = {program.data(), minute, nullptr};
-    pid_t number = 0;
-    return posix_spawn(&number, program.c_str(), nullptr, nullptr, arguments, environ) == 0 ? number
-                                                                                            : -1;
-}
-
-// The signal that ended the child; 0 if it had to be ended here.
-int endAndReap(pid_t number) {
-    int status = 0;
-    for (int i = 0; i < 50; ++i) {
-        if (waitpid(number, &status, WNOHANG) == number) {
-            return WIFSIGNALED(status) ? WTERMSIG(status) : 0;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-    }
-    kill(number, SIGKILL);
-    waitpid(number, nullptr, 0);
-    return 0;
 }
 
 class HelperTest : public testing::Test {
@@ -171,18 +147,11 @@ TEST_F(HelperTest, FindsTheMeasuringTool) {
     expect(second);
 }
 
-TEST_F(HelperTest, ChecksWhetherAnythingExists) {
-    fs::create_symlink("/nowhere", m_root.path("dangling"));
-    EXPECT_TRUE(Helper::CheckFileValidity(wxString::FromUTF8(m_root.path())));
-    EXPECT_TRUE(Helper::CheckFileValidity(wxString::FromUTF8(m_root.path("dangling"))));
-    EXPECT_FALSE(Helper::CheckFileValidity(wxString::FromUTF8(m_root.path("missing"))));
-    EXPECT_FALSE(Helper::CheckFileValidity(""));
-}
-
 TEST_F(HelperTest, LooksThreeTimesForARunningApplication) {
     EXPECT_LT(secondsOf([] { EXPECT_FALSE(Helper::IsNMRunning()); }), 0.9);
 
-    const pid_t tool = start(m_root.copyProgram("/bin/sleep", "NerovaMeasure.app/MacOS/x"));
+    const support::RunningProgram tool(
+        m_root.copyProgram("/bin/sleep", "NerovaMeasure.app/MacOS/x"));
     const double watching = secondsOf([] { EXPECT_TRUE(Helper::IsNMRunning()); });
     EXPECT_GE(watching, 2.0);
     EXPECT_LT(watching, 2.9);
@@ -196,8 +165,7 @@ TEST_F(HelperTest, LooksThreeTimesForARunningApplication) {
         secondsOf([] { EXPECT_TRUE(Helper::IsHWBAppsRunning("NerovaMeasure", true)); });
     EXPECT_GE(ending, 1.0);
     EXPECT_LT(ending, 1.9);
-    EXPECT_FALSE(Helper::IsNMRunning()); // Though nobody has waited for it.
-    EXPECT_EQ(endAndReap(tool), SIGTERM);
+    EXPECT_EQ(tool.endingSignal(), SIGTERM);
 }
 
 class Viewer : public HelperTest {
@@ -272,15 +240,15 @@ TEST_F(Viewer, IsNotStartedWhereItCannotBe) {
 }
 
 TEST_F(Viewer, TakesThePlaceOfOneThatRuns) {
-    const pid_t old = start(m_root.copyProgram("/bin/sleep", m_nwjs));
-    const pid_t stranger = start(m_root.copyProgram("/bin/sleep", "Applications/Other.app/x"));
+    const support::RunningProgram old(m_root.copyProgram("/bin/sleep", m_nwjs));
+    const support::RunningProgram other(m_root.copyProgram("/bin/sleep", "Other.app/x"));
     fs::remove(m_root.path(m_nwjs)); // Its process goes on.
     writeViewer(m_viewer);
     int exitCode = 7;
     EXPECT_TRUE(Helper::LaunchNerovaVerify(exitCode, false, " -x", true));
     EXPECT_EQ(report(), m_folder + "\nNerova Verify\n-x\n");
-    EXPECT_EQ(endAndReap(old), SIGTERM);
-    EXPECT_EQ(endAndReap(stranger), 0);
+    EXPECT_EQ(old.endingSignal(), SIGTERM);
+    EXPECT_EQ(other.endingSignal(), 0);
 }
 
 } // namespace

@@ -1,0 +1,254 @@
+#include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
+
+#include <clocale>
+#include <cstring>
+#include <filesystem>
+
+#include <wx/debug.h>
+
+#include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "tests/comm/CommTest.h"
+
+namespace {
+
+using testing::ElementsAre;
+
+class ManagerTest : public CommTest {
+  protected:
+    ManagerTest() : manager(ComGUIManager::GetInstance(true)) {
+        wxDisableAsserts();
+        setlocale(LC_CTYPE, "C.UTF-8");
+        manager->Initialize("user", "secret", "host", 50005, 1);
+        manager->Login(nullptr, nullptr, nullptr, -1);
+        takeCalls();
+    }
+
+    std::string textAt(int offset) const {
+        return reinterpret_cast<const char*>(&plugIn->seen) + offset;
+    }
+    int numberAt(int offset) const {
+        int value = 0;
+        std::memcpy(&value, reinterpret_cast<const char*>(&plugIn->seen) + offset, sizeof value);
+        return value;
+    }
+
+    const std::unique_ptr<ComGUIManager> manager;
+};
+
+TEST_F(CommTest, AFailedLoadIsToldAndEndsTheLoginOnly) {
+    const std::string noTable = "Could not get Interface pointer and Intialize the bundle\n";
+    const struct {
+        const char* name;
+        std::function<void()> harm;
+        std::string messages;
+    } cases[] = {
+        {"CreateInstance", [&] { plugIn->results["CreateInstance"] = 1; },
+         "@TODO: Bundle should be released here\n" + noTable},
+        {"QueryInterface", [&] { plugIn->hasInterface = false; }, noTable},
+        {"bundle", [&] { std::filesystem::remove_all(m_root.path("suite/lib")); },
+         "RegisterPlugIn: CFPlugInCreate() failed\n" + noTable},
+        {"suite", [&] { std::filesystem::remove_all(m_root.path("Library")); },
+         "RegisterPlugIn: CFPlugInCreate() failed\n" + noTable},
+    };
+    for (const auto& [name, harm, messages] : cases) {
+        harm();
+        testing::internal::CaptureStderr();
+        const CKZConnector connector(L"host", L"user", L"secret", 0x5071103, false, true);
+        EXPECT_EQ(testing::internal::GetCapturedStderr(), messages) << name;
+        EXPECT_FALSE(connector.IsLoggedIn()) << name;
+        EXPECT_EQ(connector.getLastRetCode(), -2005) << name;
+        const std::unique_ptr<ComGUIManager> manager(connector.getComGUIMngrInstance());
+        EXPECT_EQ(manager->Login(nullptr, nullptr, nullptr, -1), -2005) << name;
+        EXPECT_EQ(manager->GetIntParameter(3, job, "Input/SubType"), -1) << name;
+        EXPECT_NE(manager->PutFile("a", "b", true), 0) << name;
+    }
+}
+
+TEST_F(ManagerTest, FillsTheSessionRecord) {
+    const std::string name(130, 'u');
+    int lastPort = numberAt(388);
+    for (int i = 0; i < 22; ++i) {
+        manager->Initialize(name.c_str(), nullptr, "10.0.0.1", 1234, i == 0 ? 0x5071103 : i);
+        EXPECT_EQ(numberAt(828), i == 0 ? 7 : 5);
+        EXPECT_EQ(numberAt(388), lastPort == 50026 ? 50006 : lastPort + 1);
+        lastPort = numberAt(388);
+    }
+    EXPECT_EQ(textAt(4), name.substr(0, 127));
+    EXPECT_EQ(textAt(132), "");
+    EXPECT_EQ(textAt(520), "10.0.0.1");
+    EXPECT_THAT((std::vector{numberAt(0), numberAt(648), numberAt(792), numberAt(832)}),
+                ElementsAre(2632, 1234, 21, 1));
+}
+
+TEST_F(ManagerTest, LogsInWithWhatIsGiven) {
+    EXPECT_EQ(manager->GetServerName(), L"host");
+    plugIn->set(0, 0, "System/ServerName", "N\xe4me");
+    plugIn->results["IsAlive"] = 1;
+    EXPECT_EQ(manager->IsAlive("other", 9), 0);
+    // In MacRoman 0x80 is a capital A with diaeresis; only the user's name is converted.
+    EXPECT_EQ(manager->Login("\x80", "\x80", "other", 7), 0);
+    EXPECT_EQ(textAt(4), "\xc3\x84");
+    EXPECT_EQ(textAt(132), "\x80");
+    EXPECT_EQ(numberAt(648), 7);
+    EXPECT_EQ(manager->GetServerName(), (std::wstring{L'N', wchar_t(0xFFFFFFE4), L'm', L'e'}));
+    EXPECT_EQ(manager->GetServerIP(), L"other");
+    EXPECT_EQ(takeCalls(), (Calls{"IsAlive other 9", "Login", "GetContainer"}));
+
+    plugIn->results["Login"] = -2004; // What was there stays.
+    EXPECT_EQ(manager->Login(nullptr, nullptr, "third", -1), -2004);
+    EXPECT_EQ(manager->GetServerIP(), L"other");
+    EXPECT_EQ(manager->GetIntParameter(0, 0, "System/Product/MajorVersion"), 5);
+
+    plugIn->results.clear();
+    plugIn->hasContainer = false;
+    EXPECT_EQ(manager->Login(nullptr, nullptr, nullptr, -1), 0);
+    EXPECT_EQ(manager->GetServerName(), L"third");
+    EXPECT_EQ(manager->SetTicketParameter(3, job, "k", PARAM_DELETE, nullptr, -1), 0);
+    EXPECT_EQ(manager->GetIntParameter(3, job, "k", 0, 9), 9);
+    EXPECT_FALSE(manager->SetMultiParameter(job, 3, PARAM_INT, "k", 0, nullptr));
+}
+
+TEST_F(ManagerTest, KeepsAContainerOnlyIfItHasASystemTicket) {
+    manager->Logout();
+    plugIn->tickets().DeleteTicket(0, 0, false);
+    EXPECT_EQ(manager->GetClientContainer(), nullptr);
+    EXPECT_EQ(takeCalls(), (Calls{"Logout", "GetContainer", "Logout"}));
+    plugIn->tickets().CreateOrOpenTicket(0, 0, nullptr);
+    EXPECT_EQ(manager->GetClientContainer(), manager->GetClientContainer());
+    EXPECT_EQ(takeCalls(), Calls{"GetContainer"});
+}
+
+Calls notified;
+
+int notify(void*, int type, int id, int notification, int enable, const char* const* keys) {
+    std::string line;
+    for (const int number : {type, id, notification, enable}) {
+        line += std::to_string(number) + " ";
+    }
+    for (; keys != nullptr && *keys != nullptr; ++keys) {
+        line += std::string(*keys) + " ";
+    }
+    notified.push_back(line);
+    return 1;
+}
+
+TEST_F(ManagerTest, RegistersForNotifications) {
+    ticket::container::Notification::put(plugIn->access, notify);
+    for (const auto& [result, id] : {std::pair{8, "-1"}, {0, "77"}, {8, "77"}}) {
+        plugIn->results["SendCommand"] = result;
+        EXPECT_EQ(manager->SetCallback(this), result);
+        const std::string given = std::string(" ") + id;
+        EXPECT_EQ(std::exchange(notified, {}),
+                  (Calls{"3 -3" + given + " 0 ",
+                         "3 -4" + given +
+                             " 1 Job/Identification/RemoteEndpoint Job/Identification/Status "
+                             "Process/Progress/Percent Print/Progress/Percent ",
+                         "2 -3" + given + " 0 ", "0 -3" + given + " 0 ", "6 -3" + given + " 0 "}));
+    }
+    EXPECT_EQ(takeCalls()[0], "SendCommand local.set.callback 0");
+}
+
+TEST_F(ManagerTest, HandsTextsOut) {
+    const struct {
+        const char* stored;
+        bool isConverted;
+        std::wstring wide;
+    } cases[] = {
+        {"plain", true, L"plain"},    {"\xc3\xb6", false, L"\u00f6"},   {"\xf6", false, L""},
+        {"\xed\xa0\x80", false, L""}, {"\xf4\x90\x80\x80", false, L""},
+    };
+    for (const auto& [stored, isConverted, wide] : cases) {
+        plugIn->set(3, job, "text", stored);
+        const char* theirs = nullptr;
+        const char* texts[2] = {};
+        ticket::Contained(plugIn->access, 3, job).get("text", PARAM_STRING, &theirs, -1);
+        for (const char*& text : texts) {
+            EXPECT_EQ(manager->GetParameter(3, job, "text", PARAM_STRING, &text, -1), 1);
+            EXPECT_STREQ(text, stored);
+        }
+        EXPECT_EQ(texts[0], texts[1]) << stored;
+        EXPECT_EQ(texts[0] != theirs, isConverted) << stored;
+        EXPECT_EQ(manager->GetStringParameter(3, job, "text"), wide) << stored;
+    }
+    const double half = 0.5;
+    plugIn->set(3, job, "int", 7);
+    plugIn->set(3, job, "double", PARAM_DOUBLE, &half);
+    EXPECT_EQ(manager->GetDoubleParameter(3, job, "int"), 7.0);
+    EXPECT_EQ(manager->GetDoubleParameter(3, job, "double"), -1.0);
+}
+
+TEST_F(ManagerTest, ReadsAndWritesArrays) {
+    int values[] = {5, 6};
+    plugIn->set(3, job, "holes", PARAM_INT, &values[0], 1);
+    plugIn->set(3, job, "holes", PARAM_STRING, "\xf6", 2);
+    plugIn->set(3, job, "holes", PARAM_INT, &values[1], 3);
+    const wxString umlaut = L"\u00f6"; // One byte a character.
+    EXPECT_THAT(manager->GetIntArray(3, job, "holes"), ElementsAre(0, 5, 5, 6));
+    EXPECT_THAT(manager->GetStringArray(3, job, "holes"), ElementsAre("", "", umlaut, umlaut));
+    EXPECT_TRUE(manager->GetIntArray(3, job, "none").empty());
+
+    EXPECT_TRUE(manager->SetMultiParameter(job, 3, PARAM_INT, "key", 2, values));
+    EXPECT_THAT(manager->GetIntArray(3, job, "key"), ElementsAre(5, 6));
+    EXPECT_TRUE(manager->SetMultiParameter(job, 3, PARAM_INT, "key", 0, nullptr));
+    EXPECT_TRUE(manager->GetIntArray(3, job, "key").empty());
+    EXPECT_FALSE(manager->SetMultiParameter(13, 3, PARAM_INT, "key", 1, values));
+
+    SETMULTIPAR_LIST list(true);
+    EXPECT_FALSE(manager->SetMultiParameter(3, job, list));
+    list.AddParameter("list", "text");
+    EXPECT_FALSE(manager->SetMultiParameter(3, 13, list));
+    EXPECT_TRUE(manager->SetMultiParameter(3, job, list));
+    EXPECT_EQ(manager->GetStringParameter(3, job, "list"), L"text");
+    EXPECT_EQ(manager->SetTicketParameter(3, job, "list", PARAM_INT, values, -9), -1);
+}
+
+TEST_F(ManagerTest, SearchesAndDeletesTickets) {
+    int value = 5;
+    char text[] = "x";
+    for (const int id : {13, 14, 15}) {
+        plugIn->tickets().CreateOrOpenTicket(3, id, nullptr);
+        plugIn->set(3, id, "n", PARAM_INT, &value, id == 14 ? 1 : 0);
+        plugIn->set(3, id, "t", text);
+    }
+    EXPECT_THAT(manager->SearchTickets(3, "n", PARAM_INT, &value, false), ElementsAre(13, 14, 15));
+    EXPECT_EQ(manager->SearchTicket(3, "t", text), 13);
+    EXPECT_EQ(manager->SearchTicket(3, "t", "y"), -1);
+    // Of texts only the first ticket, 12, is examined.
+    EXPECT_THAT(manager->SearchTickets(3, "t", PARAM_STRING, text, false), ElementsAre());
+    plugIn->set(3, job, "t", text);
+    EXPECT_THAT(manager->SearchTickets(3, "t", PARAM_STRING, text, true), ElementsAre(job));
+
+    EXPECT_TRUE(manager->DeleteTicketOfType(3, 14));
+    EXPECT_FALSE(manager->DeleteTicketOfType(3, 14));
+    EXPECT_TRUE(manager->DeleteTicketOfType(3, TICKET_ID_ALL));
+    EXPECT_FALSE(plugIn->tickets().TicketExists(3, job) || plugIn->tickets().TicketExists(3, 15));
+    EXPECT_TRUE(manager->DeleteTicketOfType(3, TICKET_ID_ALL));
+}
+
+TEST_F(ManagerTest, PassesDataCommandsAndFilesOn) {
+    std::string data(12041, 'd');
+    for (const auto& [kind, size, first] :
+         {std::tuple{11, 12040, 'd'}, {10, 12041, '\0'}, {2, 12041, 'd'}, {11, 90000, '\0'}}) {
+        int count = size;
+        EXPECT_EQ(manager->SetTicketData(3, kind, 0, &count, data.data()), 0);
+        EXPECT_EQ(plugIn->seenData, std::string(static_cast<std::size_t>(size), first)) << size;
+    }
+    manager->SetTicketData(3, 10, 0, nullptr, nullptr);
+    takeCalls();
+    char path[] = "/pre/view";
+    manager->SendCommand("local.set.previewfolder", 99, path);
+    manager->SendCommand("local.set.thumbnailfolder", 99, nullptr);
+    manager->SendCommand("local.set.Previewfolder", 99, path);
+    manager->PutFile("\x80", "\xc3\x84", false);
+    manager->PutFile("\x80", "p", true);
+    manager->GetFile("\x80", "g", false);
+    manager->GetFile("g", "\x80", true);
+    manager->SendJob(nullptr, "\x80", nullptr);
+    EXPECT_THAT(takeCalls(),
+                ElementsAre("SendCommand local.set.previewfolder 9",
+                            "SendCommand local.set.thumbnailfolder 0",
+                            "SendCommand local.set.Previewfolder 99", "17 \xc3\x84 \xc3\x84",
+                            "20 \x80 p", "18 \xc3\x84 g", "24 g \xc3\x84", "19 \xc3\x84 (null)"));
+}
+
+} // namespace

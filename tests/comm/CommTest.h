@@ -1,0 +1,45 @@
+// A suite in a system root of the test's own, with the scripted plug-in as its comm bundle.
+#pragma once
+
+#include <string>
+#include <utility>
+#include <vector>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include <dlfcn.h>
+
+#include "SuiteRoot.h"
+#include "tests/comm/ScriptedPlugIn.h"
+
+using Calls = std::vector<std::string>;
+
+class CommTest : public testing::Test {
+  protected:
+    static constexpr int job = 12; ///< A ticket of type 3.
+
+    CommTest() {
+        m_root.installPlistReader(PLIST_READER);
+        installSuite();
+        const std::string bundle = m_root.makeBundle(
+            "suite/lib/ComGUI.Bundle", SCRIPTED_PLUGIN,
+            support::plugInEntries(SCRIPTED_PLUGIN_NAME, comGUIPlugInType,
+                                   "00112233-4455-6677-8899-AABBCCDDEEFF", "makeScriptedPlugIn"));
+        const std::string path = bundle + "/Contents/MacOS/" SCRIPTED_PLUGIN_NAME;
+        plugIn = reinterpret_cast<ScriptedPlugIn* (*)()>(
+            dlsym(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL), "scriptedPlugIn"))();
+        plugIn->tickets().CreateOrOpenTicket(3, job, nullptr);
+    }
+
+    void installSuite() const {
+        m_root.writePreferences("Qen/com.qen.packageversion.plist",
+                                {{"Nerova Hue Workbench/library_path", m_root.path("suite")}});
+    }
+
+    /// The calls since the last time.
+    Calls takeCalls() { return std::exchange(plugIn->calls, {}); }
+
+    const support::SuiteRoot m_root;
+    ScriptedPlugIn* plugIn = nullptr;
+};

@@ -1,0 +1,41 @@
+#include "RunningProgram.h"
+
+#include <chrono>
+#include <stdexcept>
+#include <thread>
+
+#include <signal.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+namespace support {
+
+RunningProgram::RunningProgram(const std::string& path) {
+    std::string program = path;
+    char seconds[] = "60";
+    char* arguments[] = {program.data(), seconds, nullptr};
+    // Returns when the program has taken the place of the child.
+    if (posix_spawn(&m_number, path.c_str(), nullptr, nullptr, arguments, environ) != 0) {
+        throw std::runtime_error("can't start " + path);
+    }
+}
+
+RunningProgram::~RunningProgram() {
+    kill(m_number, SIGKILL);
+    waitpid(m_number, nullptr, 0);
+}
+
+int RunningProgram::endingSignal() const {
+    for (int i = 0; i < 50; ++i) {
+        siginfo_t info = {};
+        waitid(P_PID, static_cast<id_t>(m_number), &info, WEXITED | WNOHANG | WNOWAIT);
+        if (info.si_pid == m_number) {
+            return info.si_code == CLD_EXITED ? 0 : info.si_status;
+        }
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+    }
+    return 0;
+}
+
+} // namespace support
