@@ -16,7 +16,7 @@ struct Finding {
     double value = -1.0;   ///< As calculated; -1.0 without an answer.
     double rounded = -1.0; ///< To the decimals of the preset; this is held against the tolerance.
     int decimals = 0;
-    double tolerance = 0;
+    double tolerance = 0;    ///< 0 also where the preset does not name the criterion.
     bool used = false;       ///< Takes part in the verdict.
     bool passed = false;     ///< Answered, and not above the tolerance.
     std::size_t patches = 0; ///< Patches that the value was made of.

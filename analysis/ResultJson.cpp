@@ -92,32 +92,42 @@ void writeStatistics(JsonWriter& json, const Statistics& s) {
     json.endObject();
 }
 
+template<class Write>
+void memberIf(JsonWriter& json, bool given, std::string_view name, Write write) {
+    json.key(name);
+    if (given)
+        write();
+    else
+        json.null();
+}
+
+/// A criterion that the preset does not name is a figure and no judgement, whatever its tolerance
+/// of 0 would make of it.
+const char* outcomeOf(const Finding& finding, bool named) {
+    if (!finding.answered)
+        return "unanswered";
+    if (!named)
+        return "unjudged";
+    return finding.passed ? "pass" : "fail";
+}
+
 void writeFinding(JsonWriter& json, const Finding& finding) {
     const Criterion& criterion = *finding.criterion;
+    const bool named = finding.used || finding.tolerance != 0;
     json.beginCompactObject();
     json.member("index", std::int64_t{criterion.index});
     json.member("name", criterion.name);
     json.member("title", criterion.title);
     json.member("unit", unit(criterion.quantity));
     json.member("used", finding.used);
-    json.member("outcome", !finding.answered ? "unanswered" : finding.passed ? "pass" : "fail");
-    json.member("tolerance", finding.tolerance);
-    json.member("decimals", std::int64_t{finding.decimals});
-    if (finding.answered) {
-        json.member("value", finding.value);
-        json.member("rounded", finding.rounded);
-    } else {
-        json.key("value");
-        json.null();
-        json.key("rounded");
-        json.null();
-    }
+    json.member("outcome", outcomeOf(finding, named));
+    memberIf(json, named, "tolerance", [&] { json.number(finding.tolerance); });
+    memberIf(json, named, "decimals", [&] { json.integer(finding.decimals); });
+    memberIf(json, finding.answered, "value", [&] { json.number(finding.value); });
+    memberIf(json, finding.answered && named, "rounded", [&] { json.number(finding.rounded); });
     json.member("patches", static_cast<std::int64_t>(finding.patches));
-    json.key("worstPatch");
-    if (finding.answered)
-        json.integer(static_cast<std::int64_t>(finding.worst));
-    else
-        json.null();
+    memberIf(json, finding.answered, "worstPatch",
+             [&] { json.integer(static_cast<std::int64_t>(finding.worst)); });
     json.endObject();
 }
 

@@ -100,15 +100,6 @@ TEST(Judgement, EachCriterionLooksAtItsPatches) {
     EXPECT_FALSE(results.overallPassed);
 }
 
-TEST(Judgement, WithoutProcessColoursAnswersFromAllPatchesOnly) {
-    Comparison c;
-    compareAs({{{0, 0, 0, 0}, 1, 0, 0}, {{100, 0, 0, 0}, 3, 0, 0}}, c);
-    c.target.file.set->deviceSpace = colour::DeviceSpace::Other;
-    const Judgement judgement = judge(c, {});
-    EXPECT_EQ(valueOf(judgement, "average"), 2);
-    EXPECT_EQ(valueOf(judgement, "paperWhite"), -1);
-}
-
 TEST(Judgement, StatisticsByNearestRank) {
     const struct {
         std::size_t count;

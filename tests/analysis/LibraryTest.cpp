@@ -89,33 +89,29 @@ TEST(Library, ShowsTenFunctionsAndNoMore) {
 
 // ArgyllCMS pairs by sample id and we by device values: in one chart that is the same.
 TEST(Library, AgreesWithColverifyToSixDecimals) {
-    const struct {
-        const char* target;
-        const char* measurement;
-    } pairs[] = {{"FOGRA39L", "FOGRA40L"}, {"FOGRA40L", "FOGRA39L"}, {"FOGRA28L", "FOGRA29L"},
-                 {"FOGRA28L", "FOGRA30L"}, {"FOGRA29L", "FOGRA30L"}, {"FOGRA39L", "TR003"},
-                 {"FOGRA39L", "TR005"},    {"FOGRA39L", "TR006"},    {"FOGRA40L", "TR003"},
-                 {"FOGRA40L", "TR005"},    {"FOGRA40L", "TR006"},    {"TR003", "TR005"},
-                 {"TR003", "TR006"},       {"TR005", "TR006"}};
-    const std::regex figures("peak = ([0-9.]+), avg = ([0-9.]+)");
+    const std::vector<const char*> charts[] = {
+        {"FOGRA28L", "FOGRA29L", "FOGRA30L"},                // 1,485 patches
+        {"FOGRA39L", "FOGRA40L", "TR003", "TR005", "TR006"}, // 1,617
+    };
+    std::vector<std::vector<std::string>> pairs;
+    for (const auto& conditions : charts)
+        for (const char* target : conditions)
+            for (const char* measurement : conditions)
+                if (target != measurement)
+                    pairs.push_back({sets + target + ".ti3", sets + measurement + ".ti3"});
     for (const auto& pair : pairs)
         for (const int formula : {0, 4}) {
-            const std::string target = sets + pair.target + ".ti3";
-            const std::string measurement = sets + pair.measurement + ".ti3";
-            std::vector<std::string> command = {"colverify", target, measurement};
+            std::vector<std::string> command = {"colverify"};
             if (formula == 4)
-                command.insert(command.begin() + 1, "-k");
+                command.push_back("-k");
+            command.insert(command.end(), pair.begin(), pair.end());
             const support::Outcome peer = support::run(command);
-            std::smatch match;
-            ASSERT_TRUE(std::regex_search(peer.output, match, figures)) << peer.error;
-
-            const Analysis analysis = analyse(target, measurement, "", formula);
+            const Analysis analysis = analyse(pair[0], pair[1], "", formula);
             ASSERT_EQ(analysis.status, 0);
-            char text[40];
-            std::snprintf(text, sizeof text, "%.6f", analysis.results.values[6]);
-            EXPECT_EQ(text, match[1]) << pair.target << " " << pair.measurement;
-            std::snprintf(text, sizeof text, "%.6f", analysis.results.values[5]);
-            EXPECT_EQ(text, match[2]) << pair.target << " " << pair.measurement;
+            char figures[80];
+            std::snprintf(figures, sizeof figures, "peak = %.6f, avg = %.6f\n",
+                          analysis.results.values[6], analysis.results.values[5]);
+            EXPECT_THAT(peer.output, HasSubstr(figures)) << testing::PrintToString(pair);
         }
 
     const Analysis analysis = analyse(sets + "FOGRA39L.ti3", sets + "FOGRA40L.ti3", "", 4);

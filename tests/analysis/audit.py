@@ -37,10 +37,10 @@ def audit_result(result):
             assert abs(difference - math.dist(target, measured)) < 5e-6
     used = [c for c in result["criteria"] if c["used"]]
     for criterion in result["criteria"]:
-        if criterion["outcome"] != "unanswered":
+        if criterion["outcome"] in ("pass", "fail"):
             passed = criterion["rounded"] <= criterion["tolerance"]
             assert criterion["outcome"] == ("pass" if passed else "fail"), criterion
-            assert criterion["patches"] <= len(rows)
+        assert criterion["patches"] <= len(rows)
         if criterion["name"] in ("maximum", "solidCyan", "paperWhite") and criterion["patches"]:
             near(rows[criterion["worstPatch"]][5], criterion["value"])
     outcomes = {c["outcome"] for c in used}
