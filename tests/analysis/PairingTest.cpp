@@ -5,6 +5,7 @@
 
 #include <gtest/gtest.h>
 
+using analysis::pairSets;
 using colour::DataSet;
 using colour::DeviceSpace;
 
