@@ -1,7 +1,9 @@
 #include "analysis/Judgement.h"
 
 #include <cmath>
+#include <fstream>
 #include <map>
+#include <regex>
 #include <string>
 
 #include <gtest/gtest.h>
@@ -98,6 +100,30 @@ TEST(Judgement, EachCriterionLooksAtItsPatches) {
     EXPECT_EQ(results.values[17], -1); // no blue
     EXPECT_EQ(results.values[106], -1);
     EXPECT_FALSE(results.overallPassed);
+}
+
+TEST(Criteria, GoWithTheServersTableAndTheDocs) {
+    // The server shows these values (first) beside these approvals (second).
+    const std::map<int, int> shown = {
+        {0, 6},   {1, 7},   {2, 8},   {3, 9},   {4, 4},   {5, 0},   {6, 1},   {7, 5},   {14, 12},
+        {12, 10}, {19, 13}, {20, 3},  {27, 19}, {13, 11}, {28, 20}, {29, 21}, {32, 24}, {33, 25},
+        {30, 22}, {31, 23}, {36, 28}, {34, 26}, {37, 27}, {38, 30}, {39, 31}, {26, 18}};
+    std::string table;
+    for (const analysis::Criterion& criterion : analysis::criteria) {
+        if (const auto at = shown.find(criterion.value); at != shown.end()) {
+            EXPECT_EQ(at->second, criterion.index) << criterion.name;
+        }
+        table += "| " + std::to_string(criterion.index) + " | `" + criterion.name + "` | " +
+                 std::to_string(criterion.value) + " | " + std::to_string(criterion.psdEntry) +
+                 " | " + unit(criterion.quantity) + " |\n";
+    }
+    std::string documented;
+    const std::regex row("\\| [0-9]+ \\| `\\w+` \\| [0-9]+ \\| [0-9]+ \\| \\w+ \\|");
+    std::ifstream docs(TINTGATE_SOURCE_DIR "/docs/criteria.md");
+    for (std::string line; std::getline(docs, line);)
+        if (std::smatch match; std::regex_search(line, match, row))
+            documented += match.str() + "\n";
+    EXPECT_EQ(table, documented);
 }
 
 TEST(Judgement, StatisticsByNearestRank) {
