@@ -95,27 +95,24 @@ constexpr bool bit0(int result) {
     return (result & 1) != 0;
 }
 
-/// A word that holds a function: its number and its type in one place, for both sides.
-template<int Number, class Signature>
+/// A word of a record that holds a function: its number and its type in one place, for both sides.
+template<class Record, int Number, class Signature>
 struct Slot {
     static constexpr int number = Number;
+    static_assert(Number < sizeof(Record::words) / sizeof(std::uint64_t));
 
     /// The function that the record has there, or null.
-    template<class Record>
     static Signature* of(const Record& record) {
-        static_assert(Number < sizeof(Record::words) / sizeof(std::uint64_t));
         return reinterpret_cast<Signature*>(record.words[Number]);
     }
 
     /// Puts a function there.
-    template<class Record>
     static void put(Record& record, Signature* function) {
-        static_assert(Number < sizeof(Record::words) / sizeof(std::uint64_t));
         record.words[Number] = reinterpret_cast<std::uint64_t>(function);
     }
 
     /// Calls the record's function with the record's handle in front of the arguments.
-    template<class Record, class... Arguments>
+    template<class... Arguments>
     static auto call(const Record& record, Arguments... arguments) {
         return of(record)(reinterpret_cast<void*>(record.words[handleWord]), arguments...);
     }
@@ -123,46 +120,55 @@ struct Slot {
 
 /// Slots of STICKET_ACCESS.
 namespace single {
+template<int Number, class Signature>
+using Word = Slot<STICKET_ACCESS, Number, Signature>;
+
 using GetParameter =
-    Slot<3, int(void* handle, const char* key, PARAM_TYPE type, void* out, int position)>;
+    Word<3, int(void* handle, const char* key, PARAM_TYPE type, void* out, int position)>;
 /// The result is ignored; that of each record counts.
-using GetMultiParameter = Slot<4, int(void* handle, GETMULTIPAR* table)>;
+using GetMultiParameter = Word<4, int(void* handle, GETMULTIPAR* table)>;
 /// Shows each value once: keys in ascending strcmp order, positions ascending within a key. The
 /// result is ignored.
 using Walk =
-    Slot<5, int(void* handle, SCollect callback, void* context, const char* text, int number)>;
+    Word<5, int(void* handle, SCollect callback, void* context, const char* text, int number)>;
 using SetParameter =
-    Slot<26, int(void* handle, const char* key, PARAM_TYPE type, const void* value, int position)>;
-using SetMultiParameter = Slot<27, int(void* handle, SETMULTIPAR* table)>;
+    Word<26, int(void* handle, const char* key, PARAM_TYPE type, const void* value, int position)>;
+using SetMultiParameter = Word<27, int(void* handle, SETMULTIPAR* table)>;
 /// Keys is a table ended by null, where a trailing * makes a prefix; null is all keys. With replace
 /// 1 the ticket's content is replaced, with 0 the source's values overlay it.
 using Transfer =
-    Slot<28, int(void* handle, const STICKET_ACCESS* source, const char* const* keys, int replace)>;
-using Option = Slot<29, int(void* handle, int code, void* record)>;
+    Word<28, int(void* handle, const STICKET_ACCESS* source, const char* const* keys, int replace)>;
+using Option = Word<29, int(void* handle, int code, void* record)>;
 } // namespace single
 
 /// Slots of MTICKET_ACCESS.
 namespace container {
-using GetParameter = Slot<4, int(void* handle, int type, int id, const char* key, PARAM_TYPE ptype,
+template<int Number, class Signature>
+using Word = Slot<MTICKET_ACCESS, Number, Signature>;
+
+using GetParameter = Word<4, int(void* handle, int type, int id, const char* key, PARAM_TYPE ptype,
                                  void* out, int position)>;
 /// The result is ignored; that of each record counts.
-using GetMultiParameter = Slot<5, int(void* handle, int type, int id, GETMULTIPAR* table)>;
-using WalkTickets = Slot<7, int(void* handle, TicketWalk callback, void* context, int type)>;
-using SetParameter = Slot<28, int(void* handle, int type, int id, const char* key, PARAM_TYPE ptype,
+using GetMultiParameter = Word<5, int(void* handle, int type, int id, GETMULTIPAR* table)>;
+using WalkTickets = Word<7, int(void* handle, TicketWalk callback, void* context, int type)>;
+using SetParameter = Word<28, int(void* handle, int type, int id, const char* key, PARAM_TYPE ptype,
                                   const void* value, int position)>;
-using SetMultiParameter = Slot<29, int(void* handle, int type, int id, SETMULTIPAR* table)>;
-using TicketOperation = Slot<31, int(void* handle, int type, int id, TICKET_OP op, void* argument)>;
-using Notification = Slot<54, int(void* handle, int type, int id, int notificationId, int enable,
+using SetMultiParameter = Word<29, int(void* handle, int type, int id, SETMULTIPAR* table)>;
+using TicketOperation = Word<31, int(void* handle, int type, int id, TICKET_OP op, void* argument)>;
+using Notification = Word<54, int(void* handle, int type, int id, int notificationId, int enable,
                                   const char* const* keys)>;
 /// May be null.
 using CreateWithKeys =
-    Slot<57, const STICKET_ACCESS*(void* handle, int type, int id, const char* const* keys)>;
+    Word<57, const STICKET_ACCESS*(void* handle, int type, int id, const char* const* keys)>;
 } // namespace container
 
 /// Slots of Factory, which pass no handle.
 namespace factory {
-using Create = Slot<2, const STICKET_ACCESS*(const char* name)>;
-using Destroy = Slot<3, void(const STICKET_ACCESS** ticket)>;
+template<int Number, class Signature>
+using Word = Slot<Factory, Number, Signature>;
+
+using Create = Word<2, const STICKET_ACCESS*(const char* name)>;
+using Destroy = Word<3, void(const STICKET_ACCESS** ticket)>;
 } // namespace factory
 
 } // namespace ticket
@@ -171,5 +177,5 @@ static_assert(sizeof(TICKET_OP) == 4);
 static_assert(sizeof(STICKET_OPTION_WHOAMI) == 16);
 static_assert(offsetof(STICKET_OPTION_WHOAMI, number1) == 8);
 static_assert(offsetof(STICKET_OPTION_WHOAMI, number2) == 12);
-static_assert(sizeof(STICKET_ACCESS) == 30 * 8 && sizeof(MTICKET_ACCESS) == 58 * 8);
+static_assert(sizeof(STICKET_ACCESS) == 240 && sizeof(MTICKET_ACCESS) == 464);
 static_assert(sizeof(void*) == 8);

@@ -33,7 +33,6 @@ class WorkTicket {
     using Set = ticket::single::SetParameter;
     using GetTable = ticket::single::GetMultiParameter;
 
-    /// Calls one of view()'s functions.
     template<class Call>
     auto with(Call call) const {
         return call(view());
@@ -61,7 +60,7 @@ class TicketInside {
     using Set = ticket::container::SetParameter;
     using GetTable = ticket::container::GetMultiParameter;
 
-    /// Calls one of view()'s functions with type and id in front.
+    /// Calls with the view, and type and id behind it.
     template<class Call>
     auto with(Call call) const {
         return call(view(), type, id);

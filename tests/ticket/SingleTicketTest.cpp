@@ -32,17 +32,6 @@ TEST(SingleTicket, FindsTheFirstEqualElement) {
     EXPECT_EQ(view.FindParameterPosition<int>("none", 0), -1);
 }
 
-TEST(SingleTicket, SetsPointersAndDeletesThem) {
-    const WorkTicket work;
-    std::vector<void*> pointers;
-    EXPECT_TRUE(work.view().SetParameter("pUser", &pointers, POSITION_WHOLE));
-    EXPECT_TRUE(work.view().GetVectorParameter("pUser", pointers));
-    EXPECT_EQ(pointers, std::vector<void*>{&pointers});
-    EXPECT_TRUE(work.view().ParameterExists("pUser", POSITION_WHOLE));
-    EXPECT_TRUE(work.view().DelParameter("pUser", POSITION_WHOLE));
-    EXPECT_FALSE(work.view().ParameterExists("pUser", POSITION_WHOLE));
-}
-
 TEST(SingleTicket, TransfersReplaceOrOverlay) {
     const WorkTicket source;
     const WorkTicket target;

@@ -38,23 +38,20 @@ int typeAt(const Place& place, const char* key, int position) {
 
 /// Writes and reads as a vector and as an array, and looks at the type in the ticket.
 template<class T, class Place>
-void roundTrip(Place& place, PARAM_TYPE type, const std::vector<T>& values) {
+void roundTrip(Place& place, PARAM_TYPE type, std::initializer_list<T> values) {
     SCOPED_TRACE(type);
-    const auto size = values.size();
-    std::vector<T> read{values.back()};
-    EXPECT_TRUE(ON(place, SetVectorParameter, "vector", values));
-    EXPECT_EQ(typeAt(place, "vector", static_cast<int>(size) - 1), type);
-    EXPECT_EQ(typeAt(place, "vector", static_cast<int>(size)), 0);
+    std::vector<T> read{*values.begin()};
+    EXPECT_TRUE(ON(place, SetVectorParameter, "vector", std::vector<T>(values)));
+    EXPECT_EQ(typeAt(place, "vector", static_cast<int>(values.size()) - 1), type);
+    EXPECT_EQ(typeAt(place, "vector", static_cast<int>(values.size())), 0);
     EXPECT_TRUE(ON(place, GetVectorParameter, "vector", read));
-    EXPECT_EQ(read, values);
+    EXPECT_EQ(read, std::vector<T>(values));
     if constexpr (!std::is_same_v<T, std::string>) {
-        const auto sent = std::make_unique<T[]>(size);
-        const auto got = std::make_unique<T[]>(size);
-        std::copy(values.begin(), values.end(), sent.get());
-        EXPECT_TRUE(ON(place, SetArrayParameter, "array", sent.get(), size));
+        T got[3] = {};
+        EXPECT_TRUE(ON(place, SetArrayParameter, "array", values.begin(), values.size()));
         EXPECT_EQ(typeAt(place, "array", 0), type);
-        EXPECT_TRUE(ON(place, GetArrayParameter, "array", got.get(), size));
-        EXPECT_TRUE(std::equal(values.begin(), values.end(), got.get()));
+        EXPECT_TRUE(ON(place, GetArrayParameter, "array", got, values.size()));
+        EXPECT_TRUE(std::equal(values.begin(), values.end(), got));
     }
 }
 
@@ -93,25 +90,20 @@ TYPED_TEST(TicketFamilies, EveryTypeComesBackAsItWent) {
 
 TYPED_TEST(TicketFamilies, HolesCloseUpInAVectorAndFailAnArray) {
     TypeParam& place = this->place;
-    const int numbers[] = {10, 0, 12};
     const double other = 0.5;
-    SETMULTIPAR table[] = {{.key = "key", .type = PARAM_INT, .value = &numbers[0], .position = 0},
-                           {.key = "key", .type = PARAM_DOUBLE, .value = &other, .position = 1},
-                           {.key = "key", .type = PARAM_INT, .value = &numbers[2], .position = 2},
-                           {.key = "key", .type = PARAM_DOUBLE, .value = &other, .position = 3},
+    SETMULTIPAR table[] = {{.key = "key", .type = PARAM_DOUBLE, .value = &other, .position = 1},
                            {}};
+    EXPECT_TRUE(ON(place, SetVectorParameter, "key", std::vector<int>{10, 11, 12}));
     EXPECT_TRUE(ON(place, SetMultiParameter, table));
-
     std::vector<int> vector;
     EXPECT_TRUE(ON(place, GetVectorParameter, "key", vector));
     EXPECT_EQ(vector, (std::vector<int>{10, 12}));
-    int array[] = {-1, -2, -3, -4};
-    EXPECT_FALSE(ON(place, GetArrayParameter, "key", array, 4UL));
-    EXPECT_EQ(std::vector<int>(array, array + 4), (std::vector<int>{10, -2, 12, -4}));
-    bool flags[] = {false, true, false, true};
-    EXPECT_FALSE(ON(place, GetArrayParameter, "key", flags, 4UL));
+    int array[] = {-1, -2, -3};
+    bool flags[] = {false, false, false};
+    EXPECT_FALSE(ON(place, GetArrayParameter, "key", array, 3UL));
+    EXPECT_TRUE(array[0] == 10 && array[1] == -2 && array[2] == 12);
+    EXPECT_FALSE(ON(place, GetArrayParameter, "key", flags, 3UL));
     EXPECT_FALSE(flags[0]); // all or nothing
-
     // Elements there, but none of this type: the vector ends up empty, texts stay as they were.
     std::vector<long long> none{7};
     Texts texts{"kept"};
@@ -142,7 +134,6 @@ TYPED_TEST(TicketFamilies, AMissingKeyLeavesNumbersAndEmptiesTexts) {
 TYPED_TEST(TicketFamilies, NoElementsDeleteTheKeyButForBooleanArrays) {
     TypeParam& place = this->place;
     const std::vector<int> one{1};
-    const std::vector<int> none;
     EXPECT_TRUE(ON(place, SetVectorParameter, "key", one));
     EXPECT_TRUE(ON(place, SetArrayParameter, "key", static_cast<const bool*>(nullptr), 0UL));
     EXPECT_EQ(typeAt(place, "key", 0), PARAM_INT);
@@ -152,7 +143,7 @@ TYPED_TEST(TicketFamilies, NoElementsDeleteTheKeyButForBooleanArrays) {
     EXPECT_TRUE(ON(place, SetArrayParameter, "key", one.data(), 0UL));
     EXPECT_EQ(typeAt(place, "key", 0), 0);
     // A refused deletion is not looked at. Keys that end in * are refused by the engine.
-    EXPECT_TRUE(ON(place, SetVectorParameter, "refused*", none));
+    EXPECT_TRUE(ON(place, SetVectorParameter, "refused*", Texts()));
     EXPECT_FALSE(ON(place, SetVectorParameter, "refused*", one));
 }
 
@@ -162,16 +153,14 @@ TYPED_TEST(TicketFamilies, FileNamesHaveForwardSlashesOnBothWays) {
     const Texts slashed{"C:/jobs/a.tif", "/jobs/b.tif"};
     Texts read;
     std::string name;
-    EXPECT_TRUE(ON(place, SetFilenameVectorParameter, "key", names));
-    EXPECT_TRUE(ON(place, GetVectorParameter, "key", read));
+    EXPECT_TRUE(ON(place, SetFilenameVectorParameter, "sent", names));
+    EXPECT_TRUE(ON(place, GetVectorParameter, "sent", read));
     EXPECT_EQ(read, slashed);
-    EXPECT_TRUE(ON(place, SetVectorParameter, "key", names));
-    EXPECT_TRUE(ON(place, GetFilenameVectorParameter_C, "key", read));
+    EXPECT_TRUE(ON(place, SetVectorParameter, "raw", names));
+    EXPECT_TRUE(ON(place, GetFilenameVectorParameter_C, "raw", read));
     EXPECT_EQ(read, slashed);
-    EXPECT_TRUE(ON(place, GetFilenameParameterChk_C, "key", name, POSITION_WHOLE));
+    EXPECT_TRUE(ON(place, GetFilenameParameterChk_C, "raw", name, POSITION_WHOLE));
     EXPECT_EQ(name, slashed[0]);
-    EXPECT_TRUE(ON(place, GetParameter, "key", name, 0));
-    EXPECT_EQ(name, names[0]);
 }
 
 /// Words that replace the engine's own, with what they answer. Front: what either record passes in
