@@ -1,0 +1,137 @@
+// Entry point. There is no option parser: the number of arguments alone decides what is done, and
+// each argument is read by its position. All that is printed goes to standard output, and a failure
+// shows as the exit code only: the callers rely on both.
+
+#include <algorithm>
+#include <clocale>
+#include <cstddef>
+#include <cstdio>
+#include <cstring>
+#include <fstream>
+#include <ostream>
+#include <string>
+
+#include <langinfo.h>
+
+#include <wx/debug.h>
+#include <wx/log.h>
+#include <wx/string.h>
+
+#include "ExitCodes.h"
+#include "cli/CLogger.h"
+#include "cli/HelpText.h"
+#include "job/AnalysisLibrary.h"
+#include "platform/TemporaryFolder.h"
+
+namespace {
+
+/// The tool's own version; that of the library is a matter of its own.
+constexpr int toolVersion[] = {1, 6, 20};
+
+/// Texts and file names are taken as the user's locale has them, and as UTF-8 where that can't hold
+/// every character. Numbers keep their point. wx is to stay silent whatever happens.
+void prepareProcess() {
+    const char* locale = std::setlocale(LC_CTYPE, "");
+    if (locale == nullptr || std::strcmp(nl_langinfo(CODESET), "UTF-8") != 0) {
+        std::setlocale(LC_CTYPE, "C.UTF-8");
+    }
+    wxDisableAsserts();
+    wxLog::EnableLogging(false);
+}
+
+/// Leaves the arguments of this run, a job's password among them, in a log of its own.
+void logArguments(int count, char* arguments[]) {
+    const std::string folder = platform::temporaryFolder();
+    if (folder.empty()) {
+        return;
+    }
+    CLogger::InitLogger(folder + "/Tintgate.log");
+    for (int i = 0; i < count; ++i) {
+        CLogger::GetLogger()->Log("argument %d: %s", i, arguments[i]);
+    }
+    CLogger::DeleteLogger();
+}
+
+int answerWord(const std::string& word) {
+    if (word == "-help") {
+        std::fputs(helpText, stdout);
+        return exitDone;
+    }
+    if (word == "-version") {
+        std::printf("%d.%d.%d\n", toolVersion[0], toolVersion[1], toolVersion[2]);
+        return exitDone;
+    }
+    if (word == "-versiond") {
+        unsigned int major = 0;
+        unsigned int minor = 0;
+        unsigned int patch = 0;
+        getLibVersion(major, minor, patch);
+        std::printf("%u.%u.%u\n", major, minor, patch);
+        return exitDone;
+    }
+    return validateInputFile(stringToWstring(word));
+}
+
+/// Through wxString in pieces, since the narrow copy of a large result would cost as much memory as
+/// the analysis itself.
+void writeText(std::ostream& stream, const std::wstring& text) {
+    constexpr std::size_t piece = 1 << 14;
+    for (std::size_t at = 0; at < text.size() && stream; at += piece) {
+        stream << wxString(text.data() + at, std::min(piece, text.size() - at));
+    }
+}
+
+/// The output is opened in place, so that links and /dev/stdout work, and not before there is
+/// something to write: a failed comparison leaves an existing file as it was.
+int calculateSummary(char* arguments[], const char* patchSetPath) {
+    const std::wstring target = stringToWstring(arguments[1]);
+    const std::wstring measurement = stringToWstring(arguments[2]);
+    const std::wstring tolerancePath = stringToWstring(arguments[3]);
+    const std::wstring patchSet = stringToWstring(patchSetPath);
+
+    tolerancePresetParameterRecord tolerance;
+    int result = parsePresetParameterXMLFile(tolerancePath, &tolerance, false);
+    if (result != exitDone) {
+        return result;
+    }
+    std::wstring json;
+    result = analyzeMeasurements(target, measurement, patchSet, tolerance, nullptr, &json, nullptr);
+    if (result != exitDone) {
+        return result;
+    }
+
+    std::ofstream output(arguments[4], std::ios::out | std::ios::trunc);
+    if (!output) {
+        return exitResultNotWritten;
+    }
+    writeText(output, json);
+    output.close();
+    return output ? exitDone : exitResultNotWritten;
+}
+
+} // namespace
+
+int main(int argc, char* argv[]) {
+    prepareProcess();
+    logArguments(argc, argv);
+
+    switch (argc) {
+    case 2:
+        return answerWord(argv[1]);
+    case 3:
+        return exitDone; // Required: two arguments are no form and no mistake either.
+    case 4:
+        return writeLabFromReferencesAndICCProfile(
+            stringToWstring(argv[1]), stringToWstring(argv[2]), stringToWstring(argv[3]));
+    case 5:
+        return calculateSummary(argv, "");
+    case 6:
+        return calculateSummary(argv, argv[5]);
+    case 8:
+    case 9:
+        return exitJobFormRefused;
+    default:
+        std::puts("To see usage please use argument -help");
+        return exitWrongArguments;
+    }
+}
