@@ -1,0 +1,106 @@
+#include "jdf/JdfFile.h"
+
+#include <cerrno>
+#include <cstdio>
+#include <cstdlib>
+#include <new>
+
+#include <fcntl.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+namespace jdf {
+namespace {
+
+class Descriptor {
+  public:
+    explicit Descriptor(int number) : m_number(number) {}
+    ~Descriptor() { close(); }
+    Descriptor(const Descriptor&) = delete;
+    Descriptor& operator=(const Descriptor&) = delete;
+
+    bool isOpen() const { return m_number >= 0; }
+    int number() const { return m_number; }
+
+    /// Closing can be the first to tell of a failed write.
+    bool close() {
+        const int number = m_number;
+        m_number = -1;
+        return number < 0 || ::close(number) == 0;
+    }
+
+  private:
+    int m_number;
+};
+
+/// Calls read or write until size bytes have gone through.
+template<class Byte>
+bool transfer(ssize_t (*call)(int, Byte*, std::size_t), const Descriptor& file, Byte* bytes,
+              long size) {
+    auto* at = static_cast<std::conditional_t<std::is_const_v<Byte>, const char, char>*>(bytes);
+    while (size > 0) {
+        const ssize_t count = call(file.number(), at, static_cast<std::size_t>(size));
+        if (count == 0 || (count < 0 && errno != EINTR)) {
+            return false;
+        }
+        at += count > 0 ? count : 0;
+        size -= count > 0 ? count : 0;
+    }
+    return true;
+}
+
+std::string withoutLinks(const std::string& path) {
+    const std::unique_ptr<char, decltype(&std::free)> real(realpath(path.c_str(), nullptr),
+                                                           &std::free);
+    return real == nullptr ? path : std::string(real.get());
+}
+
+} // namespace
+
+Contents readFile(const std::string& path, long smallest, long more) {
+    // Not blocking, so that a pipe in the file's place is refused and not waited for.
+    const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
+    struct stat status = {};
+    if (!file.isOpen() || fstat(file.number(), &status) != 0 || !S_ISREG(status.st_mode) ||
+        status.st_size < smallest) {
+        return {};
+    }
+    const long capacity = status.st_size + more;
+    Contents contents;
+    contents.block.reset(new (std::nothrow) char[static_cast<std::size_t>(capacity) + 2]);
+    if (contents.block == nullptr) {
+        return {};
+    }
+    contents.block[0] = '\0';
+    contents.start = contents.block.get() + 1;
+    contents.limit = contents.start + capacity;
+    contents.length = status.st_size;
+    if (!transfer<void>(::read, file, contents.start, contents.length)) {
+        return {};
+    }
+    *contents.end() = '\0';
+    return contents;
+}
+
+bool replaceFile(const std::string& path, const Contents& contents) {
+    const std::string target = withoutLinks(path);
+    const Descriptor old(open(target.c_str(), O_WRONLY | O_CLOEXEC));
+    struct stat status = {};
+    if (!old.isOpen() || fstat(old.number(), &status) != 0) {
+        return false;
+    }
+    std::string name = target + ".XXXXXX";
+    Descriptor file(mkostemp(name.data(), O_CLOEXEC));
+    if (!file.isOpen()) {
+        return false;
+    }
+    if (transfer<const void>(::write, file, contents.start, contents.length) &&
+        fchmod(file.number(), status.st_mode & 07777) == 0 && file.close() &&
+        std::rename(name.c_str(), target.c_str()) == 0) {
+        return true;
+    }
+    unlink(name.c_str());
+    return false;
+}
+
+} // namespace jdf

@@ -1,0 +1,222 @@
+#include "jdf/JdfMeasurement.h"
+
+#include <algorithm>
+#include <array>
+#include <charconv>
+#include <climits>
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <string>
+#include <string_view>
+
+#include <wx/datetime.h>
+
+#include "jdf/JdfBuffer.h"
+
+namespace {
+
+constexpr std::size_t longestText = 180;
+constexpr std::size_t longestSpectralPiece = 200;
+
+template<std::size_t N>
+std::string_view textOf(const char (&field)[N]) {
+    return {field, strnlen(field, N)};
+}
+
+/// Toward zero. What does not fit, and what is no number, gives the smallest, as the processor has
+/// it.
+long truncated(double value) {
+    return value >= -0x1p63 && value < 0x1p63 ? static_cast<long>(value) : LONG_MIN;
+}
+
+long micro(double value) {
+    return truncated(value * 1000000);
+}
+
+/// Halves away from zero. What does not fit gives the smallest, as above.
+int roundedMicro(double value) {
+    const double rounded = std::round(value * 1000000);
+    return rounded >= INT_MIN && rounded <= INT_MAX ? static_cast<int>(rounded) : INT_MIN;
+}
+
+/// Whole percent of a device value of 0 to 255, as a 16-bit number.
+double percent(double value) {
+    const auto whole = static_cast<std::uint64_t>(truncated(std::floor(value / 2.55 + 0.5)));
+    return static_cast<double>(whole & 0xFFFF);
+}
+
+/// Gathers the pieces that go in at one place, so that what stands behind is moved once. Each is
+/// counted against the buffer as if it were inserted by itself.
+class Pieces {
+  public:
+    Pieces(const char* buffer, const char* limit, long length) : m_room(limit - buffer - length) {
+        m_text.reserve(static_cast<std::size_t>(std::max(m_room, 0L)));
+    }
+
+    Pieces& operator<<(std::string_view text) {
+        m_text += text;
+        return *this;
+    }
+
+    Pieces& operator<<(long number) {
+        char digits[24];
+        const auto end = std::to_chars(std::begin(digits), std::end(digits), number).ptr;
+        m_text.append(digits, static_cast<std::size_t>(end - digits));
+        return *this;
+    }
+
+    /// Length of the piece begun.
+    std::size_t size() const { return m_text.size() - m_begun; }
+
+    /// Ends the piece begun. 0, or -30 and it is gone.
+    int end() {
+        if (static_cast<long>(m_text.size()) >= m_room) {
+            m_text.resize(m_begun);
+            return jdf::BufferFull;
+        }
+        m_begun = m_text.size();
+        return jdf::Done;
+    }
+
+    const std::string& text() const { return m_text; }
+
+  private:
+    const long m_room;
+    std::string m_text;
+    std::size_t m_begun = 0;
+};
+
+std::string_view boolean(bool value) {
+    return value ? "true" : "false";
+}
+
+/// The element's name, or nothing for a strip that has none.
+std::string_view elementName(const JDFMeasurementHeader& header) {
+    constexpr std::string_view names[] = {"tazo:Measurement", "tazo:Measurement2"};
+    return header.secondStrip < std::size(names) ? names[header.secondStrip] : "";
+}
+
+int writeOpening(Pieces& pieces, const JDFMeasurementHeader& header, std::string_view comment) {
+    if (elementName(header).empty()) {
+        return jdf::Done;
+    }
+    const bool isMeasured = header.measureDate[0] != '\0' || header.measureTime[0] != '\0';
+    const std::string date = isMeasured ? std::string(textOf(header.measureDate))
+                                        : wxDateTime::Now().FormatISODate().ToStdString(wxConvLibc);
+    const std::string time = isMeasured ? std::string(textOf(header.measureTime))
+                                        : wxDateTime::Now().FormatISOTime().ToStdString(wxConvLibc);
+    pieces << "<" << elementName(header) << " Date=\"" << date << "\" Time=\"" << time
+           << "\" Comment=\"" << comment << "\" ";
+    return pieces.end();
+}
+
+/// What each of the next parts returns is lost to the one after it: only the last counts.
+int writeAttributes(Pieces& pieces, const measurementDataRecord& measurement,
+                    JDFMeasurementHeader& header) {
+    pieces << "Approval=\"" << boolean(header.approval) << "\" MaxDeltaE=\""
+           << micro(header.maxDeltaE) << "\" TotalPass=\"" << boolean(header.totalPass)
+           << "\" CMMVersion=\"" << textOf(header.cmmVersion) << "\" ";
+    pieces.end();
+
+    if (textOf(header.deltaEType) == "CIELAB") {
+        std::strcpy(header.deltaEType, "CIE Lab");
+    }
+    pieces << "MaxToleranc=\"" << micro(header.maxTolerance) << "\" TypeOfDeltaE=\""
+           << textOf(header.deltaEType) << "\" AverageDeltaE=\"" << micro(header.averageDeltaE)
+           << "\" ";
+    pieces.end();
+
+    pieces << "SpectralCount=\"" << (measurement.hasSpectral ? measurement.numPatches : 0)
+           << "\" PaperWhitePass=\"" << boolean(header.paperWhitePass) << "\" AverageToleranc=\""
+           << micro(header.averageTolerance) << "\">";
+    pieces.end();
+
+    pieces << "<FileSpec URL=\"cid:" << textOf(header.profileName).substr(0, longestText)
+           << "\" MimeType=\"application/icc\" UserFileName=\"\""
+              " DescriptiveName=\"EmbeddedProfileName\"/>\n";
+    return pieces.end();
+}
+
+int writePatchDefinition(Pieces& pieces, int patch, const double* cmyk) {
+    pieces << "<tazo:PatchDefinitionData" << patch << " CValue=\"" << micro(percent(cmyk[0]))
+           << "\" KValue=\"" << micro(percent(cmyk[3])) << "\" MValue=\"" << micro(percent(cmyk[1]))
+           << "\" YValue=\"" << micro(percent(cmyk[2])) << "\"/>\r\n";
+    return pieces.end();
+}
+
+int writePatch(Pieces& pieces, const double* xyz) {
+    pieces << "<tazo:PatchData XValue=\"" << truncated(xyz[0] * 100) << "\" YValue=\""
+           << truncated(xyz[1] * 100) << "\" ZValue=\"" << truncated(xyz[2] * 100) << "\"/>\r\n";
+    return pieces.end();
+}
+
+std::array<std::string, spectralValueCount> spectralNames() {
+    std::array<std::string, spectralValueCount> names;
+    for (int i = 0; i < spectralValueCount; ++i) {
+        names[i] = "dvalue" + std::to_string(i) + "=\"";
+    }
+    return names;
+}
+
+int writeSpectrum(Pieces& pieces, int patch, const spectralRow& row) {
+    static const auto names = spectralNames();
+    pieces << "<tazo:SpectralData" << patch << " ";
+    for (int i = 0; i < spectralValueCount; ++i) {
+        pieces << names[i] << roundedMicro(row.values[i]) << "\"";
+        if (pieces.size() > longestSpectralPiece) {
+            if (const int error = pieces.end()) {
+                return error;
+            }
+        }
+    }
+    pieces << "/>\r\n";
+    return pieces.end();
+}
+
+/// One family of lines after the other, up to the first refused piece.
+int writePatches(Pieces& pieces, const measurementDataRecord& measurement, bool definitions) {
+    int error = jdf::Done;
+    const auto forEachPatch = [&](bool isThere, auto write) {
+        for (int i = 0; isThere && error == jdf::Done && i < measurement.numPatches; ++i) {
+            error = write(i);
+        }
+    };
+    forEachPatch(definitions && measurement.cmyk != nullptr, [&](int i) {
+        return writePatchDefinition(pieces, i, measurement.cmyk + std::ptrdiff_t{4} * i);
+    });
+    forEachPatch(measurement.xyz != nullptr, [&](int i) {
+        return writePatch(pieces, measurement.xyz + std::ptrdiff_t{3} * i);
+    });
+    forEachPatch(measurement.spectral != nullptr,
+                 [&](int i) { return writeSpectrum(pieces, i, measurement.spectral[i]); });
+    return error;
+}
+
+int writeElement(Pieces& pieces, const measurementDataRecord& measurement,
+                 JDFMeasurementHeader& header, std::string_view comment) {
+    writeOpening(pieces, header, comment);
+    int error = writeAttributes(pieces, measurement, header);
+    if (error == jdf::Done) {
+        error = writePatches(pieces, measurement, header.writePatchDefinitions);
+    }
+    if (error != jdf::Done || elementName(header).empty()) {
+        return error;
+    }
+    pieces << "</" << elementName(header) << ">\n";
+    return pieces.end();
+}
+
+} // namespace
+
+int WriteJDFMeasureData(char* at, char* buffer, char* limit, long* length,
+                        measurementDataRecord measurement, JDFMeasurementHeader* header,
+                        wxString comment) {
+    const wxCharBuffer narrow = comment.mb_str(wxConvLibc);
+    const std::string text(narrow.data(), strnlen(narrow.data(), longestText));
+
+    Pieces pieces(buffer, limit, *length);
+    const int error = writeElement(pieces, measurement, *header, text);
+    InsertCStringIntoBuffer(pieces.text().c_str(), at, buffer, limit, length);
+    return error;
+}

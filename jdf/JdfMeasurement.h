@@ -1,0 +1,58 @@
+// The element that carries one measurement:
+//
+//     <tazo:Measurement Date="2024-05-31" Time="13:37:00" Comment="Remote confirmation M1"
+//       Approval="true" MaxDeltaE="3120000" TotalPass="true" CMMVersion="1.1.2.3"
+//       MaxToleranc="5000000" TypeOfDeltaE="CIE2000" AverageDeltaE="1200000"
+//       SpectralCount="72" PaperWhitePass="true" AverageToleranc="3000000">
+//     <FileSpec URL="cid:" MimeType="application/icc" UserFileName=""
+//       DescriptiveName="EmbeddedProfileName"/>
+//     <tazo:PatchDefinitionData0 CValue="100000000" KValue="0" MValue="0" YValue="0"/>
+//     <tazo:PatchData XValue="1493" YValue="2171" ZValue="5214"/>
+//     <tazo:SpectralData0 dvalue0="82000"dvalue1="95000" ... dvalue35="12000"/>
+//     </tazo:Measurement>
+//
+// It is one line up to FileSpec, and that is one too. The second strip's element is
+// tazo:Measurement2. Tolerances, differences, device values in percent and reflectances are whole
+// numbers of millionths, XYZ values of hundredths. The misspelt names and the missing blank between
+// spectral values are what readers of the file expect.
+#pragma once
+
+#include <wx/string.h>
+
+#include "job/JobRecords.h"
+
+/// What is said of a measurement beside its values. Texts end at their NUL or their field's end.
+struct JDFMeasurementHeader {
+    char printDate[16] = {}; ///< ISO form, as printTime.
+    char printTime[16] = {};
+    char measureDate[16] = {}; ///< With both empty, the time of writing.
+    char measureTime[16] = {};
+    char deltaEType[16] = {}; ///< Writing turns "CIELAB" into "CIE Lab", here too.
+    char cmmVersion[16] = {};
+    unsigned char secondStrip =
+        0;                   ///< 0 first strip, 1 second; others have no element of their own.
+    unsigned char party = 0; ///< Who printed: 1 the sender, 2 the receiver, others nobody.
+    bool approval = false;
+    bool totalPass = false;
+    bool paperWhitePass = false;
+    double maxTolerance = 0;
+    double maxDeltaE = 0;
+    double averageTolerance = 0;
+    double averageDeltaE = 0;
+    bool writePatchDefinitions = false;
+    char profileName[256] = {};                   ///< The first 180 bytes are written.
+    measurementDataRecord* measurement = nullptr; ///< Not read here.
+};
+
+/// Writes the element into a buffer (see JdfBuffer.h), in pieces: one for each line and up to six
+/// for a line of spectral values. A piece that would reach the limit is left out and gives -30. Up
+/// to and with FileSpec the next piece is tried all the same, and its result counts; from the
+/// patches on the first refused piece ends the work.
+///
+/// The measurement's arrays may be null; then they give no lines. Spectra have 36 values whatever
+/// their length says. The comment is narrowed to the C library's 8 bits and cut to 180 bytes.
+///
+/// Returns 0 or -30.
+int WriteJDFMeasureData(char* at, char* buffer, char* limit, long* length,
+                        measurementDataRecord measurement, JDFMeasurementHeader* header,
+                        wxString comment);
