@@ -20,9 +20,6 @@ constexpr char linkElement[] =
 constexpr char openingTag[] =
     "<tazo:MeasurementData ID=\"BJDFLink0000006\" Class=\"Parameter\" Status=\"Available\">";
 constexpr char closingTag[] = "</tazo:MeasurementData>";
-constexpr char emptyElement[] =
-    "<tazo:MeasurementData ID=\"BJDFLink0000006\" Class=\"Parameter\" Status=\"Available\">"
-    "</tazo:MeasurementData>\n";
 constexpr char linkPoolEnd[] = "</ResourceLinkPool>";
 constexpr char poolEnd[] = "</ResourcePool>";
 
@@ -87,7 +84,7 @@ class Update {
             return;
         }
         skipBack();
-        insert(emptyElement);
+        insert((std::string(openingTag) + closingTag + "\n").c_str());
         findFrom(m_position, closingTag);
     }
 
