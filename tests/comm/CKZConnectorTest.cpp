@@ -130,7 +130,7 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
         int id, displayStatus, fileType, showInVerifier, verifyActive;
     } jobs[] = {{20, 208, 1, 0, 3}, {21, 208, 4096, 0, 3}, {22, 208, 1, 0, 1},
                 {23, 209, 1, 0, 0}, {24, 212, 4096, 0, 0}, {25, 213, 1, 1, 0},
-                {26, 207, 1, 0, 3}, {27, 211, 1, 1, 0}};
+                {26, 207, 1, 0, 3}, {27, 212, 1, 1, 0}};
     // Job 12 holds nothing: it is judged by the one before it, but for verify active.
     std::vector<int> ids = {20, job, 21, 22, 23, 24, 25, 26, 27};
     for (const auto& [id, displayStatus, fileType, showInVerifier, verifyActive] : jobs) {
@@ -220,9 +220,10 @@ TEST_F(ConnectorTest, MovesFiles) {
 
 TEST_F(ConnectorTest, DownloadsNothingOverAFileThatStays) {
     const auto connector = connect();
-    plugIn->results["18"] = 0;
     std::ofstream(m_local) << "old";
-    std::filesystem::permissions(m_root.path(), std::filesystem::perms(0555));
+    const std::filesystem::path folder = m_root.path();
+    std::filesystem::permissions(folder.parent_path(), std::filesystem::perms(0711));
+    std::filesystem::permissions(folder, std::filesystem::perms(0555));
     const auto downloadAsOrdinaryUser = [&] {
         constexpr unsigned nobody = 65534;
         const bool became = support::becomeUser(nobody);
