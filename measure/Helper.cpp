@@ -159,10 +159,12 @@ long execute(const wxString& program, const wxString& arguments, bool wait) {
     const wxArrayString words = wxCmdLineParser::ConvertStringToArgs(
         "\"" + program + "\"" + arguments, wxCMD_LINE_SPLIT_UNIX);
     std::vector<std::string> bytes;
+    bytes.reserve(words.size());
     for (const wxString& word : words) {
         bytes.push_back(bytesFromText(word));
     }
     std::vector<const char*> pointers;
+    pointers.reserve(bytes.size() + 1);
     for (const std::string& word : bytes) {
         pointers.push_back(word.c_str());
     }
@@ -173,7 +175,7 @@ long execute(const wxString& program, const wxString& arguments, bool wait) {
 
 } // namespace
 
-wxString Helper::GetAttributeValueFromPlist(wxString path, wxString key) {
+wxString Helper::GetAttributeValueFromPlist(const wxString& path, const wxString& key) {
     wxFileName name(path);
     name.Normalize(wxPATH_NORM_TILDE);
     if (!name.Exists(wxFILE_EXISTS_ANY)) {
@@ -222,7 +224,7 @@ wxString Helper::GetNerovaMeasurePath(bool withExecutable) {
     return folder + "/NerovaMeasure.app/Contents/MacOS/NerovaMeasure";
 }
 
-bool Helper::CheckFileValidity(wxString path) {
+bool Helper::CheckFileValidity(const wxString& path) {
     return !path.empty() && wxFileName::Exists(path, wxFILE_EXISTS_ANY);
 }
 
@@ -230,7 +232,7 @@ bool Helper::IsNMRunning() {
     return IsHWBAppsRunning("NerovaMeasure", false);
 }
 
-bool Helper::IsHWBAppsRunning(wxString processName, bool kill) {
+bool Helper::IsHWBAppsRunning(const wxString& processName, bool kill) {
     bool found = false;
     for (int passes = 3; countApplications(processName, kill) > 0;) {
         found = true;
@@ -246,7 +248,7 @@ bool Helper::IsNerovaVerifyRunning(bool) {
     return IsHWBAppsRunning("Nerova Verify", true);
 }
 
-bool Helper::LaunchNerovaVerify(int& exitCode, bool wait, wxString arguments, bool unused) {
+bool Helper::LaunchNerovaVerify(int& exitCode, bool wait, const wxString& arguments, bool unused) {
     exitCode = 0;
     IsNerovaVerifyRunning(unused);
     std::error_code ignored;

@@ -11,7 +11,7 @@ class Helper {
     /// The value of a key such as "installed_path" or "'Nerova Hue Workbench':library_path" in a
     /// property list; empty if there is no such file or value. Of the value, the first line counts,
     /// and of that 255 bytes, without blanks at its end.
-    static wxString GetAttributeValueFromPlist(wxString path, wxString key);
+    static wxString GetAttributeValueFromPlist(const wxString& path, const wxString& key);
 
     /// Folder of the suite, or empty.
     static wxString GetHWBInstallationPath();
@@ -20,7 +20,7 @@ class Helper {
     static wxString GetNerovaMeasurePath(bool withExecutable);
 
     /// True if anything exists at the path.
-    static bool CheckFileValidity(wxString path);
+    static bool CheckFileValidity(const wxString& path);
 
     /// Whether the measuring tool runs. Takes about 2 seconds while it does.
     static bool IsNMRunning();
@@ -29,7 +29,7 @@ class Helper {
     ///
     /// It looks up to three times, a second apart, and stops looking when there is nothing to see.
     /// With an empty name it looks for the applications of the suite, and ends none.
-    static bool IsHWBAppsRunning(wxString processName, bool kill);
+    static bool IsHWBAppsRunning(const wxString& processName, bool kill);
 
     /// Whether the viewer was running. By requirement it ends a viewer that is, whatever the
     /// argument says, so that the viewer to be started takes its place.
@@ -41,7 +41,7 @@ class Helper {
     /// Without wait, true if it was started; with wait, true if it ended with a code below 255.
     /// exitCode becomes 0, or -1 if there is no viewer, in which case the working folder stays that
     /// of the applications. The last argument is not used.
-    static bool LaunchNerovaVerify(int& exitCode, bool wait, wxString arguments, bool);
+    static bool LaunchNerovaVerify(int& exitCode, bool wait, const wxString& arguments, bool);
 
     /// The viewer's executable: of its two forms the first that exists, else the second.
     static wxFileName GetNerovaVerifyPath();

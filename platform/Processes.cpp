@@ -78,7 +78,7 @@ std::optional<std::string> pathOfApplication(std::uint32_t number) {
     if (number == 0 || number > INT_MAX || !isOfThisUser(number)) {
         return std::nullopt;
     }
-    const std::optional<std::string> path = executable(number);
+    std::optional<std::string> path = executable(number);
     const std::string root = platform::systemRoot();
     if (!path || root.empty()) {
         return path;
