@@ -42,6 +42,12 @@ bool isDigit(char c) {
     return static_cast<unsigned char>(c - '0') < 10;
 }
 
+/// True for 1,234 and 12,345: where points are in use too, nobody can say what the comma is.
+bool meansThousands(const char* number, std::size_t whole, std::size_t decimals) {
+    const char first = *number == '-' ? number[1] : *number;
+    return decimals == 3 && whole >= 1 && whole <= 3 && first != '0';
+}
+
 std::string counted(std::size_t number, const char* what) {
     return std::to_string(number) + ' ' + what;
 }
@@ -84,13 +90,13 @@ double numberIn(std::string_view text, char comma) {
 }
 
 Failure RowReader::read(const char*& at, TableHeader header, Table& table) {
-    m_at = at;
+    m_begin = m_at = at;
     m_header = std::move(header);
     m_chars = m_header.chars;
     m_set = &table.set;
     *m_set = {};
     m_ended = false;
-    m_decimalCommas = 0;
+    m_hasPoints = m_hasCommas = m_hasThousands = false;
     m_wavelengthsDiffer = false;
 
     Form form = Form::Lines;
@@ -126,7 +132,9 @@ Failure RowReader::read(const char*& at, TableHeader header, Table& table) {
     while (!m_ended && findRow()) {
         if (m_set->patchCount == maxCgatsPatches)
             return Failure::TooLarge;
-        const bool quick = form == Form::Lines ? quickRow<Form::Lines>() : quickRow<Form::Stream>();
+        const bool quick = form == Form::Lines   ? quickRow<Form::Lines>()
+                           : form == Form::Cells ? quickRow<Form::Cells>()
+                                                 : quickRow<Form::Stream>();
         if (quick) {
             append();
             continue;
@@ -139,7 +147,9 @@ Failure RowReader::read(const char*& at, TableHeader header, Table& table) {
     at = m_at;
     if (const Failure failure = checkEnd(m_end); failure != Failure::None)
         return failure;
-    if (m_decimalCommas > 0)
+    if (m_hasThousands && m_hasPoints)
+        return Failure::NotNumeric;
+    if (m_hasCommas)
         m_notes.add("Commas are read as decimal points.");
     const Failure failure = dropUnreadableGroups();
     table.unevenSpectra = m_layout.unevenSpectra || m_wavelengthsDiffer;
@@ -158,6 +168,14 @@ bool RowReader::findRow() {
         m_at = lineEndOf(m_at, m_end);
     }
     return !takeEndOfData();
+}
+
+/// The whole line, with the separators in front of an empty first cell.
+std::string_view RowReader::lineAtHand() const {
+    const char* start = m_at;
+    while (start != m_begin && m_chars->isBlank(start[-1]))
+        --start;
+    return {start, static_cast<std::size_t>(lineEndOf(m_at, m_end) - start)};
 }
 
 bool RowReader::takeEndOfData() {
@@ -179,54 +197,70 @@ bool RowReader::takeEndOfData() {
 
 /// Settles, by the first row, what separates cells, how many there are, and whether lines count.
 RowReader::Form RowReader::inspectFirstRow() {
-    const std::size_t width = m_header.names.size();
-    const std::string_view line(m_at, static_cast<std::size_t>(lineEndOf(m_at, m_end) - m_at));
+    const std::string_view line = lineAtHand();
     const std::string_view row = unwrapLine(line, m_unwrapped) ? m_unwrapped : line;
-    const std::size_t limit = std::max<std::size_t>(2 * width, maxCgatsColumns) + surplusWords;
+    const char* const behind = line.data() + line.size();
     Form form = Form::Lines;
-
-    splitWords(row, *m_chars, limit, m_words);
-    if (m_words.size() != width && !cellsBySeparator(row)) {
-        splitWords(row, *m_chars, limit, m_words);
+    if (cellsBySeparator(row) || cellsBySpreadsheet(row)) {
+        form = Form::Cells;
+    } else {
+        const std::size_t width = m_header.names.size();
+        splitWords(row, *m_chars, mostWords(), m_words);
         const std::size_t found = m_words.size();
-        if (found < width && m_chars == &blanksSeparate) {
-            for (const CharTable* chars : {&semicolonsSeparate, &commasSeparate}) {
-                m_chars = chars;
-                if (cellsBySeparator(row))
-                    break;
-                m_chars = &blanksSeparate;
-                splitWords(row, *m_chars, limit, m_words);
-            }
-        }
-        if (m_chars == &blanksSeparate && found < width) {
-            if (followingLinesComplete(line.data() + line.size(), found)) {
-                form = Form::Stream;
-                m_notes.add("Rows run on over several lines.");
-            }
+        if (found < width && followingLinesComplete(behind, found)) {
+            form = Form::Stream;
+            m_notes.add("Rows run on over several lines.");
         } else if (found > width && found % width == 0 && m_header.fieldCount != found) {
             form = Form::Stream;
             m_notes.add("Some lines hold several rows.");
-        } else if (found > width && allNumbers(m_words.data())) {
-            // More cells than names. They belong to columns whose names were lost where the header
-            // counts them, or where the next row is as long.
-            const char* next = line.data() + line.size();
-            while (next != m_end && !m_chars->isPlain(*next))
-                ++next;
-            std::vector<Word> nextWords;
-            splitWords({next, static_cast<std::size_t>(lineEndOf(next, m_end) - next)}, *m_chars,
-                       limit, nextWords);
-            if (m_header.fieldCount == found || nextWords.size() == found)
-                widen(found);
+        } else if (found > width && namesAreLost(behind, found)) {
+            m_notes.add("There are " + counted(width, "column names for rows of ") +
+                        counted(found, "cells: the cells behind the named ones are skipped."));
+            m_header.names.resize(found);
         }
     }
-    // What SPECTRAL_NM columns hold.
-    std::vector<double> numbers;
-    for (const Word& word : m_words)
-        numbers.push_back(numberIn(word.text, m_chars->decimalComma()));
-    for (double& number : numbers)
-        number = std::isnan(number) ? 0 : number;
+    std::vector<double> numbers; // for SPECTRAL_NM
+    for (const Word& word : m_words) {
+        const double number = numberIn(word.text, m_chars->decimalComma());
+        numbers.push_back(std::isnan(number) ? 0 : number);
+    }
     m_layout = layoutOf(m_header.names, numbers, m_wants.spectra);
     return form;
+}
+
+/// Words of a line that are looked at; beyond them no line makes sense.
+std::size_t RowReader::mostWords() const {
+    return std::max(2 * m_layout.columns.size(), maxCgatsColumns) + surplusWords;
+}
+
+/// True if semicolons or commas give the row that blanks don't, though the names don't show it.
+bool RowReader::cellsBySpreadsheet(std::string_view row) {
+    if (m_chars != &blanksSeparate)
+        return false;
+    splitWords(row, *m_chars, mostWords(), m_words);
+    if (m_words.size() >= m_layout.columns.size())
+        return false;
+    for (const CharTable* chars : {&semicolonsSeparate, &commasSeparate}) {
+        m_chars = chars;
+        if (cellsBySeparator(row))
+            return true;
+    }
+    m_chars = &blanksSeparate;
+    return false;
+}
+
+/// True if a row with more cells than names belongs to columns whose names were lost: the header
+/// counts them, or the next row has as many.
+bool RowReader::namesAreLost(const char* behind, std::size_t found) const {
+    if (!allNumbers(m_words.data()))
+        return false;
+    const char* next = behind;
+    while (next != m_end && !m_chars->isPlain(*next))
+        ++next;
+    std::vector<Word> words;
+    splitWords({next, static_cast<std::size_t>(lineEndOf(next, m_end) - next)}, *m_chars,
+               mostWords(), words);
+    return m_header.fieldCount == found || words.size() == found;
 }
 
 /// True if the words of the lines from `at` on bring `have` words to exactly one row, at a line
@@ -250,10 +284,20 @@ bool RowReader::followingLinesComplete(const char* at, std::size_t have) const {
     return have == width;
 }
 
-void RowReader::widen(std::size_t width) {
-    m_notes.add("There are " + counted(m_header.names.size(), "column names for rows of ") +
-                counted(width, "cells: the cells behind the named ones are skipped."));
-    m_header.names.resize(width);
+/// A number in any writing, NaN for what is none; takes note of points and commas.
+double RowReader::readNumber(std::string_view text) {
+    const double value = numberIn(text, m_chars->decimalComma());
+    const std::size_t comma = text.find(m_chars->decimalComma());
+    if (std::isnan(value))
+        return value;
+    if (text.find('.') != std::string_view::npos) {
+        m_hasPoints = true;
+    } else if (comma != std::string_view::npos) {
+        m_hasCommas = true;
+        const std::size_t sign = text.find_first_not_of(" +-");
+        m_hasThousands |= meansThousands(text.data() + sign, comma - sign, text.size() - comma - 1);
+    }
+    return value;
 }
 
 /// As plainNumber, for up to seven digits and a point at once, without a loop over them: the eight
@@ -282,6 +326,7 @@ inline bool RowReader::shortNumber(const char*& at, double& value) {
         count = std::countr_zero(others) / 8 - 1;
         decimals = count - length;
         length = count + 1;
+        m_hasPoints = true;
     }
     if (count == 0 || m_chars->isPlain(p[length]))
         return false;
@@ -325,7 +370,12 @@ inline bool RowReader::plainNumber(const char*& at, double& value) {
         return false;
     const double magnitude = static_cast<double>(digits) / powersOfTen[decimals];
     value = negative ? -magnitude : magnitude;
-    m_decimalCommas += comma ? 1 : 0;
+    if (comma) {
+        m_hasCommas = true;
+        m_hasThousands |= meansThousands(at, count - decimals, decimals);
+    } else if (decimals > 0) {
+        m_hasPoints = true;
+    }
     at = p;
     return true;
 }
@@ -335,9 +385,23 @@ inline bool RowReader::plainNumber(const char*& at, double& value) {
 template<RowReader::Form form>
 bool RowReader::quickRow() {
     const CharTable& chars = *m_chars;
+    const char separator = chars.cellSeparator();
     const char* at = m_at;
+    if (form == Form::Cells && at != m_begin && at[-1] == separator)
+        return false; // the first cell is empty
     for (const Column& column : m_layout.columns) {
-        at = skipBlanks(at, m_end, chars);
+        if constexpr (form == Form::Cells) {
+            while (at != m_end && chars.isBlank(*at) && *at != separator)
+                ++at;
+            if (&column != m_layout.columns.data()) {
+                if (at == m_end || *at++ != separator)
+                    return false;
+                while (at != m_end && chars.isBlank(*at) && *at != separator)
+                    ++at;
+            }
+        } else {
+            at = skipBlanks(at, m_end, chars);
+        }
         if constexpr (form == Form::Stream) {
             while (at != m_end && (!chars.isPlain(*at) || *at == '#')) {
                 if (*at == '#')
@@ -362,7 +426,7 @@ bool RowReader::quickRow() {
             if (!shortNumber(at, m_values[column.slot]) &&
                 !plainNumber(at, m_values[column.slot])) {
                 const Word word = takeWord(at, m_end, chars);
-                const double value = numberIn(word.text, chars.decimalComma());
+                const double value = readNumber(word.text);
                 if (std::isnan(value)) {
                     if (form == Form::Lines || sameWord(word.text, "END_DATA"))
                         return false;
@@ -394,9 +458,8 @@ bool RowReader::quickRow() {
 /// Reads the line at hand in every way that makes a row of it: cells between strict separators,
 /// words, several rows, a name with blanks, a remark behind the last cell, missing last cells.
 Failure RowReader::carefulRow() {
-    const char* const lineEnd = lineEndOf(m_at, m_end);
-    const std::string_view line(m_at, static_cast<std::size_t>(lineEnd - m_at));
-    m_at = lineEnd;
+    const std::string_view line = lineAtHand();
+    m_at = line.data() + line.size();
     const std::string_view row = unwrapLine(line, m_unwrapped) ? m_unwrapped : line;
     const std::size_t width = m_layout.columns.size();
 
@@ -405,7 +468,7 @@ Failure RowReader::carefulRow() {
         append();
         return Failure::None;
     }
-    if (!splitWords(row, *m_chars, std::max<std::size_t>(2 * width, 64) + surplusWords, m_words))
+    if (!splitWords(row, *m_chars, mostWords(), m_words))
         return Failure::Damaged;
     if (!m_words.empty() && sameWord(m_words.back().text, "END_DATA")) {
         m_words.pop_back();
@@ -458,9 +521,8 @@ bool RowReader::joinNames() {
             continue;
         const auto first = static_cast<std::size_t>(column - m_layout.columns.begin());
         const auto words = m_words.begin() + static_cast<std::ptrdiff_t>(first);
-        if (std::none_of(words, words + static_cast<std::ptrdiff_t>(surplus + 1), [](const Word& w) {
-                return std::isnan(numberIn(w.text, ','));
-            }))
+        if (std::none_of(words, words + static_cast<std::ptrdiff_t>(surplus + 1),
+                         [](const Word& w) { return std::isnan(numberIn(w.text, ',')); }))
             continue; // numbers alone are no name
         std::vector<Word> joined = m_words;
         const char* const start = joined[first].text.data();
@@ -514,7 +576,7 @@ void RowReader::place(const Word* cells, std::size_t count) {
         } else if (column.kind == Column::Name) {
             m_name = cells[i];
         } else if (column.kind == Column::Number) {
-            const double value = numberIn(cells[i].text, m_chars->decimalComma());
+            const double value = readNumber(cells[i].text);
             m_unreadable[column.slot] += std::isnan(value) ? 1 : 0;
             m_values[column.slot] = std::isnan(value) ? 0 : value;
         }

@@ -51,15 +51,19 @@ class RowReader {
 
   private:
     enum class Form {
-        Lines, ///< A row is a line.
+        Lines, ///< A row is a line, blanks and tabs in any number part its cells.
+        Cells, ///< A row is a line, each separator ends a cell, so that cells can be empty.
         Stream ///< Rows run on over line ends: only the number of cells parts them.
     };
 
     Form inspectFirstRow();
+    std::size_t mostWords() const;
+    bool cellsBySpreadsheet(std::string_view row);
     bool followingLinesComplete(const char* at, std::size_t have) const;
-    void widen(std::size_t width);
+    bool namesAreLost(const char* behind, std::size_t found) const;
 
     bool findRow();
+    std::string_view lineAtHand() const;
     bool takeEndOfData();
     template<Form form>
     bool quickRow();
@@ -69,6 +73,7 @@ class RowReader {
     Failure severalRows();
     void place(const Word* cells, std::size_t count);
     bool allNumbers(const Word* cells) const;
+    double readNumber(std::string_view text);
     bool shortNumber(const char*& at, double& value);
     bool plainNumber(const char*& at, double& value);
     void append();
@@ -82,6 +87,7 @@ class RowReader {
     const CgatsWants& m_wants;
     Notes& m_notes;
 
+    const char* m_begin = nullptr; ///< Where the rows begin.
     const char* m_at = nullptr;
     TableHeader m_header;
     const CharTable* m_chars = &blanksSeparate;
@@ -95,7 +101,9 @@ class RowReader {
     std::vector<Word> m_words;
     std::string m_unwrapped; ///< A line that stood in quotes; m_words point into it.
 
-    std::size_t m_decimalCommas = 0;
+    bool m_hasPoints = false;    ///< A number was written with a decimal point,
+    bool m_hasCommas = false;    ///< one with a comma,
+    bool m_hasThousands = false; ///< and one that may mean thousands: 1,234.
     bool m_wavelengthsDiffer = false;
     std::vector<std::size_t> m_unreadable; ///< Cells that are no number, by slot.
 };

@@ -24,6 +24,9 @@ constexpr double largestByte = 255.5;
 constexpr double smallestWord = 4096; ///< A 16-bit chart has an entry above this.
 constexpr double largestWord = 65535.5;
 
+/// No colour and no device value is larger; sums and squares of such numbers stay finite.
+constexpr double largestValue = 1e9;
+
 /// Rows that are compared to tell two scales apart; spread over the whole table.
 constexpr std::size_t comparedRows = 4096;
 
@@ -42,6 +45,16 @@ bool isZero(double value) {
 template<typename T>
 bool allZero(const std::vector<T>& values) {
     return std::all_of(values.begin(), values.end(), [](const T& value) { return isZero(value); });
+}
+
+bool inRange(const DataSet& set) {
+    const auto fits = [](double value) { return std::abs(value) <= largestValue; };
+    return std::all_of(set.device.begin(), set.device.end(), fits) &&
+           std::all_of(set.spectra.begin(), set.spectra.end(), fits) &&
+           std::all_of(set.xyz.begin(), set.xyz.end(),
+                       [&](const Xyz& xyz) { return fits(xyz.X) && fits(xyz.Y) && fits(xyz.Z); }) &&
+           std::all_of(set.lab.begin(), set.lab.end(),
+                       [&](const Lab& lab) { return fits(lab.L) && fits(lab.a) && fits(lab.b); });
 }
 
 bool holdsPatches(const Table& table) {
@@ -195,7 +208,9 @@ double statedLuminance(const DataSet& set) {
     return sum;
 }
 
-void scaleXyz(DataSet& set, Notes& notes) {
+void scaleXyz(DataSet& set, ScaleHint hint, Notes& notes) {
+    if (hint == ScaleHint::NeverOfOne)
+        return;
     double largest = 0;
     double sum = 0;
     for (const Xyz& xyz : set.xyz)
@@ -239,10 +254,10 @@ void scaleSpectra(Table& table, Notes& notes) {
         notes.add("Spectra are taken as 0 to 100.");
 }
 
-void scaleDevice(DataSet& set, Notes& notes) {
+void scaleDevice(DataSet& set, ScaleHint hint, Notes& notes) {
     const double largest = *std::max_element(set.device.begin(), set.device.end());
     double full = 100;
-    if (largest > 0 && largest <= 1)
+    if (largest > 0 && largest <= 1 && hint != ScaleHint::NeverOfOne)
         full = 1;
     else if (largest > largestPercent && largest <= largestByte)
         full = 255;
@@ -334,17 +349,21 @@ void joinTable(Table& first, Table&& next, Notes& notes) {
     }
 }
 
-Failure complete(Table& table, const StatedScales& scales, const CgatsWants& wants, Notes& notes) {
+Failure complete(Table& table, ScaleHint hint, const CgatsWants& wants, Notes& notes) {
     DataSet& set = table.set;
     if (set.patchCount == 0 || table.kind == TableKind::Curve)
         return Failure::NoPatches;
+    if (!inRange(set))
+        return Failure::NotNumeric;
     dropZeroColumns(set, notes);
-    if (!set.xyz.empty() && !scales.known)
-        scaleXyz(set, notes);
-    if (!set.spectra.empty() && !scales.known)
-        scaleSpectra(table, notes);
-    if (!set.device.empty() && !scales.known)
-        scaleDevice(set, notes);
+    if (hint != ScaleHint::Stated) {
+        if (!set.xyz.empty())
+            scaleXyz(set, hint, notes);
+        if (!set.spectra.empty())
+            scaleSpectra(table, notes);
+        if (!set.device.empty())
+            scaleDevice(set, hint, notes);
+    }
 
     const bool stated = !set.lab.empty() || !set.xyz.empty();
     if (!stated && set.spectra.empty() && table.unevenSpectra)

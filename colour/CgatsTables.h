@@ -5,9 +5,11 @@
 
 namespace colour::cgats {
 
-/// Scales that a text states by the keyword of our own writer (TINTGATE_SCALES).
-struct StatedScales {
-    bool known = false; ///< Device and XYZ are 0 to 100, spectra 0 to 1.
+/// What a header tells of the scales.
+enum class ScaleHint {
+    None,
+    Stated,    ///< By our own writer (TINTGATE_SCALES): as in a DataSet.
+    NeverOfOne ///< A text of ArgyllCMS: device values and XYZ are never 0 to 1.
 };
 
 /// Takes a further table into the first one: new columns for the same patches, or more patches of
@@ -18,6 +20,6 @@ void joinTable(Table& first, Table&& next, Notes& notes);
 ///
 /// A scale is decided by the whole column, never row by row: first by what is stated in two ways
 /// (XYZ and Lab, spectra and Y), then by a name that tells it, then by the largest value.
-Failure complete(Table& table, const StatedScales& scales, const CgatsWants& wants, Notes& notes);
+Failure complete(Table& table, ScaleHint hint, const CgatsWants& wants, Notes& notes);
 
 } // namespace colour::cgats

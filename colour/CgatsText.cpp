@@ -103,6 +103,19 @@ std::string_view firstWordOf(std::string_view line) {
     return word;
 }
 
+/// Where a line has a word, in either case, that stands alone; npos without one.
+std::size_t findWord(std::string_view line, std::string_view word) {
+    const auto isPart = [](char c) { return blanksSeparate.isPlain(c) && c != ',' && c != ';'; };
+    for (std::size_t at = 0; at + word.size() <= line.size(); ++at) {
+        const std::size_t behind = at + word.size();
+        if ((at == 0 || !isPart(line[at - 1])) &&
+            (behind == line.size() || !isPart(line[behind])) &&
+            sameWord(line.substr(at, word.size()), word))
+            return at;
+    }
+    return std::string_view::npos;
+}
+
 bool isStructure(std::string_view word) {
     for (const char* name : {"BEGIN_DATA", "END_DATA", "BEGIN_DATA_FORMAT", "END_DATA_FORMAT"}) {
         if (sameWord(word, name))
@@ -228,8 +241,7 @@ class TextReader {
     std::size_t m_tables = 0;
     Table m_table;
     DataSet m_texts; ///< Header texts alone.
-    bool m_hasDescriptor = false;
-    StatedScales m_scales;
+    ScaleHint m_scaleHint = ScaleHint::None;
     ConditionFinder m_conditions;
 };
 
@@ -242,7 +254,7 @@ Failure TextReader::read(DataSet& set) {
     if (m_tables == 0)
         return Failure::Damaged; // breaks off before its rows
     const bool hadColour = !m_table.set.lab.empty() || !m_table.set.xyz.empty();
-    if (const Failure failure = complete(m_table, m_scales, m_wants, m_notes);
+    if (const Failure failure = complete(m_table, m_scaleHint, m_wants, m_notes);
         failure != Failure::None)
         return failure;
 
@@ -298,12 +310,10 @@ Failure TextReader::readFormat(std::string_view line) {
             m_lines.moveTo(start);
             return Failure::None;
         }
-        // The end may stand behind the last name.
-        const std::string upper = upperCase(line.substr(0, searchedHeader));
-        const std::size_t end = upper.find("END_DATA_FORMAT");
+        const std::size_t end = findWord(line, "END_DATA_FORMAT"); // also behind the last name
         if (!addLine(line.substr(0, end), m_fieldCount, m_names))
             return Failure::TooLarge;
-        if (end != std::string::npos)
+        if (end != std::string_view::npos)
             return Failure::None;
     }
 }
@@ -390,7 +400,10 @@ void TextReader::seeHeader(const KeywordLine& line) {
     else if (line.keyword == "DESCRIPTOR" || line.keyword == "FILE_DESCRIPTOR")
         keep(m_texts.descriptor);
     else if (line.keyword == "TINTGATE_SCALES" && line.value == "device 100, XYZ 100, spectra 1")
-        m_scales.known = true;
+        m_scaleHint = ScaleHint::Stated;
+    else if (m_scaleHint == ScaleHint::None &&
+             (line.keyword == "CTI1" || line.keyword == "CTI2" || line.keyword == "CTI3"))
+        m_scaleHint = ScaleHint::NeverOfOne;
     m_conditions.see(line.keyword, line.value);
 }
 

@@ -27,8 +27,8 @@ bool looksLikeCgats(std::string_view bytes);
 /// Reads all tables of a text and joins them into one data set (columns of tables with the same
 /// rows are joined by id; a table that adds nothing is skipped).
 ///
-/// Gives a data set with colour values, device values, or both; which of them a caller needs is the
-/// caller's affair. On failure `set` is left as it was.
+/// Gives a data set with colour values, device values, or both, all of them finite; which of them a
+/// caller needs is the caller's affair. On failure `set` is left as it was.
 Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set);
 
 /// Value of a header keyword (in either case), UTF-8: the quoted text, else the rest of the line.

@@ -225,6 +225,7 @@ TEST(CgatsText, TellsIdsAndNames) {
         {"SAMPLE_ID\tSAMPLE_NAME\tLAB_L\tLAB_A\tLAB_B", "3\tPaper 100 %\t50\t0\t0", "3",
          "Paper 100 %"},
         {"SAMPLE_ID\tSAMPLE_NAME\tLAB_L\tLAB_A\tLAB_B", "3\t\t50\t0\t0", "3", ""},
+        {"SAMPLE_ID\tSAMPLE_NAME\tLAB_L\tLAB_A\tLAB_B", "\tx y\t50\t0\t0", "", "x y"},
         {"SAMPLE_ID SAMPLE_NAME LAB_L LAB_A LAB_B", "END \"M\xFC\" 50 0 0", "END", "Mü"},
         {"LAB_L LAB_A LAB_B", "50 0 0", "", ""},
     };
@@ -356,6 +357,13 @@ TEST(CgatsText, DecidesScalesByWholeColumns) {
     // A black patch alone: Lab tells that 0.9 is of 100 (L* 8.1) or of 1 (L* 96).
     EXPECT_EQ(xyz("XYZ_X XYZ_Y XYZ_Z LAB_L LAB_A LAB_B", "0.8 0.9 0.7 8.1 0 0\n"), 0.9);
     EXPECT_EQ(xyz("XYZ_X XYZ_Y XYZ_Z LAB_L LAB_A LAB_B", "0.8 0.9 0.7 96 0 0\n"), 90);
+
+    // ArgyllCMS never writes 0 to 1.
+    const std::string dark = "CTI3\nDESCRIPTOR \"Blacks\"\n";
+    const DataSet blacks =
+        readWell(table("RGB_R RGB_G RGB_B XYZ_X XYZ_Y XYZ_Z", "1 0.5 0 0.5 0.25 0.5\n", dark));
+    EXPECT_THAT(blacks.device, ElementsAre(1, 0.5, 0));
+    EXPECT_EQ(blacks.xyz.at(0).Y, 0.25);
 
     EXPECT_EQ(spectra("nm", 0.5, "").spectra[0], 0.5);
     EXPECT_EQ(spectra("nm", 1.25, "").spectra[0], 1.25); // brightened
@@ -512,6 +520,9 @@ TEST(CgatsText, NamesOneCauseForEachFailure) {
          table("SAMPLE_ID\tLAB_L\tLAB_A\tLAB_B", "1\t50\t0\t0\n2\t50\t\t0\n"), Failure::NotNumeric},
         {"no number", rows("1 nan 0 0\n2 50 0 0\n"), Failure::NotNumeric},
         {"infinity", rows("1 inf 0 0\n2 50 0 0\n"), Failure::NotNumeric},
+        {"beyond all colours", rows("1 1e10 0 0\n2 50 0 0\n"), Failure::NotNumeric},
+        {"a thousand or one point something", rows("1 1,234 0 0\n2 50.5 0 0\n"),
+         Failure::NotNumeric},
         {"beyond a double", rows("1 1e999 0 0\n2 50 0 0\n"), Failure::NotNumeric},
         {"point and comma", rows("1 1,234.5 0 0\n2 50 0 0\n"), Failure::NotNumeric},
         {"all colour cells texts", rows("1 x y z\n"), Failure::NotNumeric},
@@ -581,15 +592,15 @@ TEST(CgatsText, ReadsNumbersToTheLastBit) {
         char text[64];
         double number = value(engine);
         if (i % 5 == 0)
-            number *= std::pow(10, static_cast<double>(engine() % 60) - 40);
+            number *= std::pow(10, static_cast<double>(engine() % 50) - 43);
         std::snprintf(text, sizeof text, formats[engine() % std::size(formats)], number);
         rows += std::string(text) + (i % 3 == 2 ? "\n" : " ");
         expected.push_back(std::strtod(text, nullptr));
     }
-    rows += "9007199254740993 .5 5.\n-0.00 007.50 123456789012345678901234567890\n"
+    rows += "123456.78901234567890 .5 5.\n-0.00 007.50 1000000000\n"
             "0.000000000000000000000000001 1e-400 12345678\n";
-    expected.insert(expected.end(), {9007199254740992.0, .5, 5., -0., 7.5,
-                                     123456789012345678901234567890., 1e-27, 0, 12345678});
+    expected.insert(expected.end(),
+                    {123456.78901234567890, .5, 5., -0., 7.5, 1e9, 1e-27, 0, 12345678});
     const DataSet set = readWell(table("LAB_L LAB_A LAB_B", rows));
     ASSERT_EQ(set.lab.size() * 3, expected.size());
     for (std::size_t i = 0; i < expected.size(); ++i) {
