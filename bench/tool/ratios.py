@@ -1,0 +1,102 @@
+#!/usr/bin/env python3
+"""Times the whole program against its peers, and prints ratios.
+
+ratios.py TINTGATE EMPTY_WX PRESET [--quick]
+
+The two sides of a ratio run in turns, so that whatever else the machine does strikes both, and the
+medians are compared. Peers: colverify -k of ArgyllCMS, which reads the same files and computes the
+same differences, and a program that does no more than start with the wx base library. The large
+files repeat the rows of FOGRA39L and FOGRA40L under new ids. --quick leaves out colverify at
+100,000 patches, which takes about half a minute a run.
+"""
+
+import os
+import statistics
+import sys
+import tempfile
+import time
+
+DATA = "/usr/share/color/icc/FOGRA{}L.ti3"
+SETS = ("39", "40")
+
+
+def repeat_rows(source, count, target):
+    """A data set with `count` rows: those of `source` over and over, numbered from 1."""
+    with open(source, encoding="latin-1") as file:
+        head, rest = file.read().split("BEGIN_DATA\n")
+    rows = [row.split(None, 1)[1] for row in rest.split("END_DATA")[0].splitlines() if row.strip()]
+    head = head.replace(f"NUMBER_OF_SETS {len(rows)}", f"NUMBER_OF_SETS {count}")
+    with open(target, "w", encoding="latin-1") as file:
+        file.write(head + "BEGIN_DATA\n")
+        file.writelines(f"{i + 1} {rows[i % len(rows)]}\n" for i in range(count))
+        file.write("END_DATA\n")
+
+
+def run(command):
+    """Seconds and peak memory in MB of one run; its output goes nowhere."""
+    nowhere = [(os.POSIX_SPAWN_OPEN, 1, "/dev/null", os.O_WRONLY, 0)]
+    start = time.perf_counter()
+    child = os.posix_spawnp(command[0], command, os.environ, file_actions=nowhere)
+    _, status, usage = os.wait4(child, 0)
+    seconds = time.perf_counter() - start
+    if status != 0:
+        sys.exit(f"{' '.join(command)}: exit code {os.waitstatus_to_exitcode(status)}")
+    return seconds, usage.ru_maxrss / 1024
+
+
+def medians(first, second, pairs):
+    """Median seconds of two commands that run in turns."""
+    for command in (first, second):
+        run(command)
+    times = [[run(command)[0] for command in (first, second)] for _ in range(pairs)]
+    return tuple(map(statistics.median, zip(*times)))
+
+
+def main(tintgate, empty_wx, preset, *options):
+    quick = "--quick" in options
+    verdicts = []
+
+    def say(what, value, limit, unit=""):
+        verdicts.append(value <= limit)
+        print(f"{what:58} {value:8.4g}{unit} (at most {limit:.4g}{unit})"
+              + ("" if value <= limit else "  MISSED"), flush=True)
+
+    with tempfile.TemporaryDirectory() as folder:
+        os.environ["TMPDIR"] = folder
+
+        def files(count):
+            paths = [f"{folder}/{name}-{count}.ti3" for name in SETS]
+            for name, path in zip(SETS, paths):
+                if not os.path.exists(path):
+                    repeat_rows(DATA.format(name), count, path)
+            return paths
+
+        def compare(count):
+            return [tintgate, *files(count), preset, f"{folder}/result.json"]
+
+        def colverify(count):
+            return ["colverify", "-k", *files(count)]
+
+        ours, theirs = medians([tintgate, "-version"], [empty_wx], 101)
+        say("-version : empty wx program", ours / theirs, 3)
+        print(f"  {ours * 1e3:.2f} ms : {theirs * 1e3:.2f} ms")
+
+        ours, theirs = medians(compare(1617), colverify(1617), 101)
+        say("1,617 patches : colverify -k", ours / theirs, 0.4)
+        print(f"  {ours * 1e3:.2f} ms : {theirs * 1e3:.2f} ms")
+
+        if not quick:
+            ours, theirs = medians(compare(100_000), colverify(100_000), 2)
+            say("100,000 patches : colverify -k", ours / theirs, 1 / 80)
+            print(f"  {ours * 1e3:.1f} ms : {theirs * 1e3:.0f} ms")
+
+        small, large = medians(compare(100_000), compare(1_000_000), 5)
+        say("1,000,000 : 100,000 patches", large / small, 10 * 1.15)
+        print(f"  {large * 1e3:.0f} ms : {small * 1e3:.0f} ms")
+
+        say("100,000 patches, peak memory", run(compare(100_000))[1], 300, " MB")
+    return 0 if all(verdicts) else 1
+
+
+if __name__ == "__main__":
+    sys.exit(main(*sys.argv[1:]))
