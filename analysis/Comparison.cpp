@@ -1,5 +1,7 @@
 #include "analysis/Comparison.h"
 
+#include <algorithm>
+
 #include "ExitCodes.h"
 #include "analysis/Status.h"
 #include "analysis/Text.h"
@@ -37,6 +39,40 @@ int loadAll(const ComparisonPaths& paths, bool keepSpectra, Comparison& c) {
     if (const int status = loadSide(paths.measurement, keepSpectra, c.measurement))
         return status;
     return paths.patchSet.empty() ? exitDone : loadPatchSet(paths.patchSet, c.patchSet);
+}
+
+const char* roleOf(const Comparison& c, const Input& input) {
+    return &input == &c.target ? "target" : &input == &c.measurement ? "measurement" : "patch set";
+}
+
+/// Whether device values tell any patches apart.
+bool varies(const DataSet& set) {
+    const auto channels = static_cast<std::ptrdiff_t>(set.channels.size());
+    return !std::equal(set.device.begin() + channels, set.device.end(), set.device.begin());
+}
+
+/// Tickets without device values come as texts of zeros. Against a file of as many patches whose
+/// values vary, such columns were never filled in, and would make every patch paper.
+void dropPlaceholders(Comparison& c) {
+    const auto isPlaceholder = [&](const DataSet& set) {
+        if (!set.hasDevice() || varies(set))
+            return false;
+        for (const Input* other : {&c.target, &c.measurement, &c.patchSet})
+            if (other->file.set && other->file.set->deviceSpace == set.deviceSpace &&
+                other->file.set->patchCount == set.patchCount && varies(*other->file.set))
+                return true;
+        return false;
+    };
+    for (Input* input : {&c.target, &c.measurement}) {
+        if (!input->file.set || !isPlaceholder(*input->file.set))
+            continue;
+        input->file.set->deviceSpace = colour::DeviceSpace::None;
+        input->file.set->channels.clear();
+        input->file.set->device.clear();
+        c.warnings.push_back(
+            {"deviceValuesIgnored", std::string("The device values of the ") + roleOf(c, *input) +
+                                        " are the same in every row and were not used."});
+    }
 }
 
 Input* selectionOf(Comparison& c) {
@@ -124,10 +160,6 @@ std::string patches(std::size_t count) {
     return std::to_string(count) + (count == 1 ? " patch" : " patches");
 }
 
-const char* roleOf(const Comparison& c, const Input& input) {
-    return &input == &c.target ? "target" : &input == &c.measurement ? "measurement" : "patch set";
-}
-
 void warnOfPairing(Comparison& c) {
     for (const Input* input : {&c.target, &c.measurement}) {
         const std::string role = roleOf(c, *input);
@@ -185,6 +217,7 @@ int compare(const ComparisonPaths& paths, colour::Formula formula, bool keepSpec
     c.formula = formula;
     if (const int status = loadAll(paths, keepSpectra, c))
         return status;
+    dropPlaceholders(c);
     if (const int status = selectPatches(c))
         return status;
     if (const int status = labOf(c, c.target, c.targetLab))

@@ -167,6 +167,24 @@ TEST(Library, WarnsOfConditionsThatDiffer) {
     EXPECT_THAT(analyse(m0, m0).json, Not(HasSubstr("measurementConditionsDiffer")));
 }
 
+// A job whose ticket has no device values comes with zeros in their place.
+TEST(Library, TakesNoNoticeOfDeviceValuesThatWereNeverFilledIn) {
+    const ScratchFolder scratch;
+    const std::string columns = "SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B";
+    const std::string full =
+        scratch.write("full", chart(columns, "1 0 0 0 0 95 0 0\n2 100 0 0 0 55 -36 -50\n"));
+    const std::string zeros =
+        scratch.write("zeros", chart(columns, "2 0 0 0 0 55 -36 -50\n1 0 0 0 0 94 0 0\n"));
+    for (const auto& [target, measurement] : {std::pair(full, zeros), std::pair(zeros, full)}) {
+        const Analysis analysis = analyse(target, measurement);
+        EXPECT_THAT(analysis.json, HasSubstr("deviceValuesIgnored"));
+        EXPECT_EQ(analysis.results.values[6], 1);
+        EXPECT_EQ(analysis.results.values[4], 1); // paper
+        EXPECT_EQ(analysis.results.values[0], 0); // solid cyan
+    }
+    EXPECT_THAT(analyse(zeros, zeros).json, HasSubstr("\"measurement\": \"deviceValues\""));
+}
+
 TEST(Library, GivesOneCodeForOneCause) {
     const ScratchFolder scratch;
     const std::string lab =
