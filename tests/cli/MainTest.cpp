@@ -190,6 +190,39 @@ TEST_F(MainTest, AnOutputThatCannotBeWrittenGives71) {
     }
 }
 
+// With the library of the build, on a name that is no valid UTF-8.
+TEST_F(MainTest, WorksOnRealFiles) {
+    const std::string icc = "/usr/share/color/icc/";
+    const std::string profile = icc + "ghostscript/default_cmyk.icc";
+    const std::string preset = TINTGATE_SOURCE_DIR "/presets/CVP_0001.xml";
+    const std::string target = m_folder.path("papier \xe9.ti3");
+    ASSERT_EQ(symlink((icc + "FOGRA39L.ti3").c_str(), target.c_str()), 0);
+    const std::string lab = m_folder.path("lab \xe9.it8");
+    const struct {
+        std::vector<std::string> arguments;
+        int exitCode;
+        std::string inOutput;
+    } runs[] = {
+        {{target}, 0, ""},
+        {{profile}, 0, ""},
+        {{preset}, 22, ""},
+        {{m_folder.path("missing")}, 20, ""},
+        {{target, profile, lab}, 0, ""},
+        {{lab}, 0, ""},
+        {{target, icc + "FOGRA40L.ti3", preset, "/dev/stdout"}, 0, "\"mean\": 3.932947"},
+        {{profile, profile, preset, "/dev/stdout", target}, 0, "\"maximum\": 0"},
+        {{profile, profile, preset, "/dev/stdout"}, 27, ""},
+        {{target, lab, m_folder.path("missing"), "/dev/stdout"}, 40, ""},
+    };
+    for (const auto& [arguments, exitCode, inOutput] : runs) {
+        const Outcome outcome = run(arguments);
+        const std::string what = testing::PrintToString(arguments);
+        EXPECT_EQ(outcome.exitCode, exitCode) << what;
+        EXPECT_THAT(outcome.output, testing::HasSubstr(inOutput)) << what;
+        EXPECT_EQ(outcome.output.empty(), inOutput.empty()) << what;
+    }
+}
+
 // As an ordinary user, from a copy that one can reach.
 TEST_F(MainTest, PermissionsGive71AndNoLogIsNoFailure) {
     const std::string bin = m_folder.makeFolder("bin");
