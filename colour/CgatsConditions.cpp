@@ -86,7 +86,7 @@ std::optional<std::string> observerIn(std::string_view text) {
 
 /// As observerIn, for a text that is about the observer alone: "2", "CIE 1931".
 std::optional<std::string> observerAlone(std::string_view text) {
-    if (const auto observer = observerIn(text))
+    if (auto observer = observerIn(text))
         return observer;
     std::optional<std::string> found;
     for (const std::string& word : wordsOf(text)) {

@@ -8,11 +8,12 @@
 
 #include "colour/CgatsColumns.h"
 #include "colour/CgatsLines.h"
+#include "colour/CgatsNumbers.h"
 #include "colour/CgatsText.h"
 
 namespace colour::cgats {
 
-/// What a reader had to assume or mend: each remark once, and so many that a person reads them.
+/// What a reader had to assume or mend: each remark once, and no more than a person reads.
 class Notes {
   public:
     void add(std::string note);
@@ -32,22 +33,23 @@ struct Table {
 
 /// What the header said of the rows.
 struct TableHeader {
-    std::vector<std::string> names;
+    std::vector<std::string> names; ///< One at least.
     const CharTable* chars = &blanksSeparate;
     std::optional<unsigned long long> fieldCount;
     std::optional<unsigned long long> setCount;
     bool hasBegin = true; ///< False for a bare list of rows without BEGIN_DATA.
 };
 
-/// Reads rows up to END_DATA or the end of the text.
+/// Reads the rows of one table, up to END_DATA or the end of the text.
 class RowReader {
   public:
-    /// `text` is the whole text, `ascii` whether it is ASCII throughout; both outlive the reader.
-    RowReader(std::string_view text, bool ascii, const CgatsWants& wants, Notes& notes)
-        : m_end(text.data() + text.size()), m_ascii(ascii), m_wants(wants), m_notes(notes) {}
+    /// `text` is the whole text, `ascii` whether it is ASCII throughout. All arguments outlive the
+    /// reader.
+    RowReader(std::string_view text, bool ascii, const TableHeader& header,
+              const CgatsWants& wants, Notes& notes);
 
     /// Reads the rows that start at `at`, which is behind END_DATA afterwards.
-    Failure read(const char*& at, TableHeader header, Table& table);
+    Failure read(const char*& at, Table& table);
 
   private:
     enum class Form {
@@ -56,59 +58,63 @@ class RowReader {
         Stream ///< Rows run on over line ends: only the number of cells parts them.
     };
 
+    // The first row settles how the others are read.
     Form inspectFirstRow();
+    Form formOfWords(const char* behind);
     std::size_t mostWords() const;
     bool cellsBySpreadsheet(std::string_view row);
-    bool followingLinesComplete(const char* at, std::size_t have) const;
-    bool namesAreLost(const char* behind, std::size_t found) const;
+    bool completedByNextLines(const char* at);
+    bool namesAreLost(const char* behind) const;
+    void useNames(const std::vector<std::string>& names, const std::vector<double>& firstRow);
+    void reserveRows();
 
+    // Each row.
+    Failure readRows(Form form);
     bool findRow();
-    std::string_view lineAtHand() const;
     bool takeEndOfData();
-    template<Form form>
+    std::string_view lineAtHand() const;
+    template <Form form>
+    const char* toCell(const char* at, bool isFirst) const;
+    template <Form form>
     bool quickRow();
+    template <Form form>
+    bool quickNumber(const char*& at, std::size_t slot);
     Failure carefulRow();
-    bool cellsBySeparator(std::string_view line);
+    bool cellsBySeparator(std::string_view row);
     bool joinNames();
     Failure severalRows();
-    void place(const Word* cells, std::size_t count);
     bool allNumbers(const Word* cells) const;
-    double readNumber(std::string_view text);
-    bool shortNumber(const char*& at, double& value);
-    bool plainNumber(const char*& at, double& value);
-    void append();
+    void place(const Word* cells);
     std::string textOf(const Word& word) const;
+    void append();
 
-    Failure checkEnd(const char* end);
+    // All rows together.
+    Failure checkEnd();
+    std::size_t unreadableIn(const Group& group) const;
     Failure dropUnreadableGroups();
 
     const char* m_end;
     bool m_ascii;
+    const TableHeader& m_header;
     const CgatsWants& m_wants;
     Notes& m_notes;
 
     const char* m_begin = nullptr; ///< Where the rows begin.
-    const char* m_at = nullptr;
-    TableHeader m_header;
-    const CharTable* m_chars = &blanksSeparate;
+    const char* m_at = nullptr;    ///< The row at hand, or behind the last one.
+    bool m_ended = false;          ///< END_DATA was met.
+    const CharTable* m_chars;
+    NumberReader m_numbers;
     Layout m_layout;
-    DataSet* m_set = nullptr;
-    bool m_ended = false; ///< END_DATA was met.
+    DataSet m_set;
+    std::vector<std::size_t> m_unreadable; ///< Cells that are no number, by slot.
+    bool m_wavelengthsDiffer = false;
 
-    std::vector<double> m_values; ///< Of the row at hand.
+    // The row at hand.
+    std::vector<double> m_values;
     Word m_id;
     Word m_name;
     std::vector<Word> m_words;
     std::string m_unwrapped; ///< A line that stood in quotes; m_words point into it.
-
-    bool m_hasPoints = false;    ///< A number was written with a decimal point,
-    bool m_hasCommas = false;    ///< one with a comma,
-    bool m_hasThousands = false; ///< and one that may mean thousands: 1,234.
-    bool m_wavelengthsDiffer = false;
-    std::vector<std::size_t> m_unreadable; ///< Cells that are no number, by slot.
 };
-
-/// The number that a cell holds, with a point or `comma`; a NaN for anything else.
-double numberIn(std::string_view text, char comma);
 
 } // namespace colour::cgats

@@ -367,11 +367,12 @@ Failure TextReader::readRows(const char* at, bool hasBegin) {
     if (const Failure failure = findNames(rows); failure != Failure::None)
         return failure;
 
-    TableHeader header{m_names.names, m_names.chars, m_fieldCount, m_setCount, hasBegin};
-    RowReader reader(m_text, m_ascii, m_wants, m_notes);
+    const TableHeader header{m_names.names, m_names.chars, m_fieldCount, m_setCount, hasBegin};
     Table table;
     at = rows.at();
-    if (const Failure failure = reader.read(at, std::move(header), table); failure != Failure::None)
+    if (const Failure failure =
+            RowReader(m_text, m_ascii, header, m_wants, m_notes).read(at, table);
+        failure != Failure::None)
         return failure;
     m_lines.moveTo(at);
     if (++m_tables == 1)

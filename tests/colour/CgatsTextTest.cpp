@@ -170,6 +170,8 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
                   "-50.75 A2 0 40.5 0 0 71.25 33 -0.5 END_DATA\n",
          "several rows"},
         {"two rows in a later line", with("-50.75\n", "-50.75 "), "several rows"},
+        {"tabs, a remark behind a row", replaced(with("-50.75\n", "-50.75 checked\n"), " ", "\t"),
+         "Words behind"},
         {"a remark behind a row", with("-50.75\n", "-50.75 checked twice\n"), "Words behind"},
         {"unknown columns",
          replaced(replaced(with("SAMPLE_ID", "LGOROWLENGTH SAMPLE_ID Remark"), "A1 ",
@@ -406,7 +408,7 @@ TEST(CgatsText, WorksOutWhatIsNotStated) {
         table("LAB_L LAB_A LAB_B XYZ_X XYZ_Y XYZ_Z", "50 1 2 - - -\n60 1 2 n/a n/a n/a\n"));
     EXPECT_EQ(half.lab.at(1).L, 60);
     EXPECT_EQ(half.xyz.at(1).Y, xyzFromLab({60, 1, 2}).Y);
-    EXPECT_THAT(notesOf(half), HasSubstr("XYZ hold no numbers"));
+    EXPECT_THAT(notesOf(half), HasSubstr("XYZ columns hold no numbers"));
 }
 
 TEST(CgatsText, JoinsTables) {
@@ -503,6 +505,8 @@ TEST(CgatsText, NamesOneCauseForEachFailure) {
         {"no names", "CGATS.17\nEND_DATA_FORMAT\nBEGIN_DATA\n1 50 0 0\nEND_DATA\n",
          Failure::Damaged},
         {"a short row", rows("1 50 0 0\n2 50 0\n"), Failure::Damaged},
+        {"a long row between tabs", replaced(rows("1 50 0 0\n2 50 0 0 7 8\n"), " ", "\t"),
+         Failure::Damaged},
         {"a long row", rows("1 50 0 0\n2 50 0 0 7 8\n"), Failure::Damaged},
         {"no END_DATA, fewer rows than stated",
          "CGATS.17\nBEGIN_DATA_FORMAT\n" + labNames +
