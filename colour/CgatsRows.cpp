@@ -159,7 +159,8 @@ RowReader::Form RowReader::inspectFirstRow() {
     const std::string_view row = unwrapLine(line, m_unwrapped) ? m_unwrapped : line;
     Form form = Form::Cells;
     if (!cellsBySeparator(row) && !cellsBySpreadsheet(row)) {
-        splitWords(row, *m_chars, mostWords(), m_words);
+        if (!splitWords(row, *m_chars, mostWords(), m_words)) // as many whole rows as were looked at
+            m_words.resize(m_words.size() - m_words.size() % m_layout.columns.size());
         form = formOfWords(line.data() + line.size());
     }
     std::vector<std::string> names = m_header.names;
@@ -187,7 +188,7 @@ RowReader::Form RowReader::formOfWords(const char* behind) {
         m_notes.add("Rows run on over several lines.");
         return Form::Stream;
     }
-    if (found > width && found % width == 0 && m_header.fieldCount != found) {
+    if (m_header.fieldCount != found && holdSeveralRows()) {
         m_notes.add("Some lines hold several rows.");
         return Form::Stream;
     }
@@ -235,17 +236,19 @@ bool RowReader::completedByNextLines(const char* at) {
 }
 
 /// True if a first row with more cells than names belongs to columns whose names were lost: the
-/// header counts them, or the next row has as many.
+/// header counts them, or the next row has as many and no name with blanks explains it.
 bool RowReader::namesAreLost(const char* behind) const {
-    if (!allNumbers(m_words.data()))
+    if (!allNumbers(m_words.data()) || m_header.fieldCount == m_layout.columns.size())
         return false;
+    if (m_header.fieldCount == m_words.size())
+        return true;
     const char* next = behind;
     while (next != m_end && !m_chars->isPlain(*next))
         ++next;
     std::vector<Word> words;
     splitWords({next, static_cast<std::size_t>(lineEndOf(next, m_end) - next)}, *m_chars,
                mostWords(), words);
-    return m_header.fieldCount == m_words.size() || words.size() == m_words.size();
+    return words.size() == m_words.size() && joinedNames().empty();
 }
 
 /// Goes to the first sign of the next cell, or to where there is none.
@@ -357,9 +360,12 @@ Failure RowReader::carefulRow() {
             return Failure::Damaged;
         m_words.resize(width);
     } else if (m_words.size() > width) {
-        if (m_words.size() % width == 0)
-            return severalRows();
-        if (!joinNames()) {
+        if (holdSeveralRows())
+            return appendSeveralRows();
+        if (std::vector<Word> joined = joinedNames(); !joined.empty()) {
+            m_words = std::move(joined);
+            m_notes.add("Names with blanks are not quoted.");
+        } else {
             const bool remark = std::isnan(numberIn(m_words[width].text, '.'));
             if (!remark || !allNumbers(m_words.data()))
                 return Failure::Damaged;
@@ -383,43 +389,43 @@ bool RowReader::cellsBySeparator(std::string_view row) {
     return m_words.size() == width;
 }
 
-/// A row with more words than cells, whose name or id has blanks: joins the words of that cell, if
-/// all numbers then fall into place.
-bool RowReader::joinNames() {
-    const std::size_t width = m_layout.columns.size();
-    const std::size_t surplus = m_words.size() - width;
+/// The cells of a row with more words than cells whose name or id has blanks; empty if it is not
+/// such a row: all numbers must fall into place, and numbers alone are no name.
+std::vector<Word> RowReader::joinedNames() const {
+    const auto surplus = static_cast<std::ptrdiff_t>(m_words.size() - m_layout.columns.size());
     for (const Column::Kind kind : {Column::Name, Column::Id}) {
         const auto column = std::find_if(m_layout.columns.begin(), m_layout.columns.end(),
                                          [&](const Column& c) { return c.kind == kind; });
         if (column == m_layout.columns.end())
             continue;
-        const auto first = static_cast<std::size_t>(column - m_layout.columns.begin());
-        const auto words = m_words.begin() + static_cast<std::ptrdiff_t>(first);
-        if (std::none_of(words, words + static_cast<std::ptrdiff_t>(surplus + 1),
-                         [](const Word& w) { return std::isnan(numberIn(w.text, ',')); }))
-            continue; // numbers alone are no name
-        std::vector<Word> joined = m_words;
-        const char* const start = joined[first].text.data();
-        const std::string_view lastWord = joined[first + surplus].text;
-        joined[first].text = {start,
-                              static_cast<std::size_t>(lastWord.data() + lastWord.size() - start)};
-        joined.erase(joined.begin() + static_cast<std::ptrdiff_t>(first + 1),
-                     joined.begin() + static_cast<std::ptrdiff_t>(first + 1 + surplus));
-        if (allNumbers(joined.data())) {
-            m_words = std::move(joined);
-            m_notes.add("Names with blanks are not quoted.");
-            return true;
-        }
+        const auto first = m_words.begin() + (column - m_layout.columns.begin());
+        const auto last = first + surplus;
+        if (std::none_of(first, last + 1, [](const Word& word) {
+                return std::isnan(numberIn(word.text, ','));
+            }))
+            continue;
+        std::vector<Word> joined(m_words.begin(), first + 1);
+        const char* const start = first->text.data();
+        const char* const end = last->text.data() + last->text.size();
+        joined.back().text = {start, static_cast<std::size_t>(end - start)};
+        joined.insert(joined.end(), last + 1, m_words.end());
+        if (allNumbers(joined.data()))
+            return joined;
     }
-    return false;
+    return {};
 }
 
-/// Rows that run on in one line.
-Failure RowReader::severalRows() {
+/// True if the words are two rows or more.
+bool RowReader::holdSeveralRows() const {
     const std::size_t width = m_layout.columns.size();
-    for (std::size_t first = 0; first < m_words.size(); first += width) {
-        if (!allNumbers(m_words.data() + first))
-            return Failure::Damaged;
+    bool numbers = m_words.size() >= 2 * width && m_words.size() % width == 0;
+    for (std::size_t first = 0; numbers && first < m_words.size(); first += width)
+        numbers = allNumbers(m_words.data() + first);
+    return numbers;
+}
+
+Failure RowReader::appendSeveralRows() {
+    for (std::size_t first = 0; first < m_words.size(); first += m_layout.columns.size()) {
         if (m_set.patchCount == maxCgatsPatches)
             return Failure::TooLarge;
         place(m_words.data() + first);

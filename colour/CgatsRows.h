@@ -81,8 +81,9 @@ class RowReader {
     bool quickNumber(const char*& at, std::size_t slot);
     Failure carefulRow();
     bool cellsBySeparator(std::string_view row);
-    bool joinNames();
-    Failure severalRows();
+    std::vector<Word> joinedNames() const;
+    bool holdSeveralRows() const;
+    Failure appendSeveralRows();
     bool allNumbers(const Word* cells) const;
     void place(const Word* cells);
     std::string textOf(const Word& word) const;
