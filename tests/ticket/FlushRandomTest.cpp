@@ -153,7 +153,7 @@ class Maker {
 };
 
 TEST(FlushRandom, EqualsTheEditsMadeDirectly) {
-    for (unsigned seed = 0; seed < 5000; ++seed) {
+    for (unsigned seed = 0; seed < 3000; ++seed) {
         const Sequence sequence = Maker(seed).make();
         if (fails(sequence)) {
             const Sequence small = shrunk(sequence);

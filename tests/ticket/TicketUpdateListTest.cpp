@@ -131,12 +131,12 @@ TEST_F(UpdateList, KeepsWhatDeletionsTakeAway) {
     EXPECT_EQ(deleted<std::string>("s"), std::vector<std::string>{"old"});
     EXPECT_EQ(deleted<double>("d"), std::vector<double>{0.5});
 
-    const MTICKET_READ& own = ticket::as<MTICKET_READ>(record);
     std::vector<int> none;
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "u", none), 1); // Of another type.
     EXPECT_TRUE(none.empty());
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, 13, "a", none), 0);
-    EXPECT_TRUE(own.TicketExists(jobs, id));
+    list.DelParameter(jobs, id, "a", -1, false); // As a whole, in place of what was kept.
+    EXPECT_EQ(deleted<int>("a"), std::vector<int>{1});
 
     // Both maps had the ticket, so the flag follows the kept values alone.
     const int value = 1;
