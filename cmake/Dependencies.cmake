@@ -18,6 +18,8 @@ target_link_libraries(wx INTERFACE ${_wx_libs})
 
 pkg_check_modules(lcms2 REQUIRED IMPORTED_TARGET lcms2)
 pkg_check_modules(libplist REQUIRED IMPORTED_TARGET libplist-2.0)
+pkg_check_modules(sqlite3 REQUIRED IMPORTED_TARGET sqlite3)
+pkg_check_modules(libsodium REQUIRED IMPORTED_TARGET libsodium)
 pkg_check_modules(libmd REQUIRED IMPORTED_TARGET libmd)
 find_package(pugixml REQUIRED)
 find_package(nlohmann_json REQUIRED)

@@ -15,17 +15,11 @@ Tickets& tickets() {
     return all;
 }
 
-/// Holding it keeps the ticket alive, be it destroyed from a callback of its own walk.
-std::shared_ptr<Ticket> find(const void* handle) {
-    const auto found = tickets().find(handle);
-    return found == tickets().end() ? nullptr : found->second;
-}
-
 /// Runs one word on the ticket; false for an unknown handle.
 template<class Body>
 int on(void* handle, Body body) {
     return guarded([&] {
-        const auto ticket = find(handle);
+        const auto ticket = findTicket(handle);
         return ticket != nullptr && body(*ticket);
     });
 }
@@ -37,7 +31,7 @@ int getParameter(void* handle, const char* key, PARAM_TYPE type, void* out, int 
 }
 
 int getMultiParameter(void* handle, GETMULTIPAR* table) {
-    const auto ticket = find(handle);
+    const auto ticket = findTicket(handle);
     getMultiple(table, [&](const char* key, PARAM_TYPE type, void* out, int position) {
         return ticket != nullptr && ticket->get(key, type, out, position);
     });
@@ -65,7 +59,7 @@ int setParameter(void* handle, const char* key, PARAM_TYPE type, const void* val
 int setMultiParameter(void* handle, SETMULTIPAR* table) {
     return guarded([&] {
         return setMultiple(table, [&](SETMULTIPAR* records) {
-            const auto ticket = find(handle);
+            const auto ticket = findTicket(handle);
             return ticket != nullptr && ticket->apply(records);
         });
     });
@@ -74,7 +68,7 @@ int setMultiParameter(void* handle, SETMULTIPAR* table) {
 /// A replacing transfer from nowhere empties the ticket all the same, and fails.
 int transfer(void* handle, const STICKET_ACCESS* source, const char* const* keys, int replace) {
     return on(handle, [&](Ticket& ticket) {
-        const auto from = find(source);
+        const auto from = findTicket(source);
         const auto content = from == nullptr ? nullptr : from->content(KeyFilter(keys));
         if (content != nullptr) {
             return ticket.transfer(*content, ticket::bit0(replace));
@@ -94,6 +88,11 @@ int option(void* handle, int code, void* record) {
 }
 
 } // namespace
+
+std::shared_ptr<Ticket> findTicket(const void* record) {
+    const auto found = tickets().find(record);
+    return found == tickets().end() ? nullptr : found->second;
+}
 
 TicketRecord::TicketRecord(std::shared_ptr<Ticket> ticket) {
     namespace single = ::ticket::single;

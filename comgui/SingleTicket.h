@@ -44,6 +44,10 @@ class TicketRecord {
     STICKET_ACCESS m_access{};
 };
 
+/// The ticket whose record stands at an address; null for anything else. Holding it keeps the
+/// ticket alive, be it destroyed from a callback of its own walk.
+std::shared_ptr<Ticket> findTicket(const void* record);
+
 /// Runs one word: false when memory runs out.
 template<class Body>
 bool guarded(Body body) {

@@ -1,5 +1,6 @@
 #include "comgui/TicketContent.h"
 
+#include <algorithm>
 #include <unordered_set>
 #include <vector>
 
@@ -36,6 +37,12 @@ KeyFilter::KeyFilter(const char* const* table) : m_all(table == nullptr || *tabl
             m_exact.insert(std::move(key));
         }
     }
+}
+
+bool KeyFilter::takes(std::string_view key) const {
+    return m_all || m_exact.find(key) != m_exact.end() ||
+           std::any_of(m_prefixes.begin(), m_prefixes.end(),
+                       [&](const auto& prefix) { return startsWith(key, prefix); });
 }
 
 /// A table on its way into a ticket.

@@ -20,12 +20,13 @@ class KeyFilter {
     explicit KeyFilter(const char* const* table = nullptr);
 
     bool all() const { return m_all; }
-    const std::set<std::string>& exact() const { return m_exact; }
+    bool takes(std::string_view key) const;
+    const std::set<std::string, std::less<>>& exact() const { return m_exact; }
     const std::set<std::string>& prefixes() const { return m_prefixes; } ///< Without their *.
 
   private:
     bool m_all;
-    std::set<std::string> m_exact;
+    std::set<std::string, std::less<>> m_exact;
     std::set<std::string> m_prefixes;
 };
 

@@ -1,6 +1,7 @@
 // The elements of one key.
 #pragma once
 
+#include <algorithm>
 #include <cstddef>
 #include <map>
 #include <memory>
@@ -20,6 +21,8 @@ class Elements {
     bool empty() const { return m_filled == 0; }
     /// At most highestPosition + 1.
     int count() const;
+    /// How many positions are filled.
+    int filled() const { return static_cast<int>(m_filled); }
 
     /// Null for a hole and beyond the end.
     const Value* at(int position) const;
@@ -29,6 +32,14 @@ class Elements {
     /// Sets the element at a position from 0 to highestPosition. Positions that are passed over
     /// become holes.
     void put(int position, Value value);
+
+    /// Makes room for that many more elements, where there are no holes so far.
+    void reserve(int more) {
+        const auto wanted = m_near.size() + static_cast<std::size_t>(more);
+        if (m_near.size() == m_filled && wanted > m_near.capacity()) {
+            m_near.reserve(std::max(wanted, 2 * m_near.capacity()));
+        }
+    }
 
     /// Takes out what stands at the position, be it a hole; what stands behind it moves up, and
     /// holes that then end the key go. False beyond the end.

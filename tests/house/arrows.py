@@ -35,7 +35,9 @@ ARROWS = {
     "analysis": "colour records",  # libTintgate without its ten functions' names
     "libTintgate": "analysis colour records",
     "ticketengine": "ticketrecords",
-    "ComGUI": "commrecords ticketrecords ticketengine StoreEngine",
+    "StoreEngine": "ticketengine",
+    "store": "StoreEngine",
+    "ComGUI": "commrecords ticketrecords ticketengine StoreEngine store",
 }
 
 # Arrows that go on through a target, because a header that it publishes needs them itself.
@@ -46,6 +48,8 @@ EXPOSES = {
     "analysis": "records",
     "ticket": "ticketrecords",
     "ticketengine": "ticketrecords",
+    "StoreEngine": "ticketengine",
+    "store": "StoreEngine",
 }
 
 # Made by the build for everybody who returns or explains an exit code.

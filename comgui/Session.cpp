@@ -1,0 +1,198 @@
+#include "comgui/Session.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <utility>
+
+#include <unistd.h>
+
+#include "comgui/SingleTicket.h"
+
+namespace store {
+
+namespace {
+
+constexpr std::size_t longestAddress = 127;
+
+std::string utf8FromLatin1(const std::string& text) {
+    std::string utf8;
+    for (const unsigned char c : text) {
+        if (c < 0x80) {
+            utf8 += static_cast<char>(c);
+        } else {
+            utf8 += static_cast<char>(0xC0 | c >> 6);
+            utf8 += static_cast<char>(0x80 | (c & 0x3F));
+        }
+    }
+    return utf8;
+}
+
+/// A local file under another name beside it, until it is complete.
+class LocalCopy {
+  public:
+    explicit LocalCopy(const std::string& path)
+        : m_path(path), m_part(path + ".part-" + std::to_string(getpid())),
+          m_stream(m_part, std::ios::binary | std::ios::trunc) {}
+    ~LocalCopy() {
+        if (!m_part.empty()) {
+            std::remove(m_part.c_str());
+        }
+    }
+    LocalCopy(const LocalCopy&) = delete;
+    LocalCopy& operator=(const LocalCopy&) = delete;
+
+    std::ostream& stream() { return m_stream; }
+
+    bool putInPlace() {
+        m_stream.close();
+        if (!m_stream || std::rename(m_part.c_str(), m_path.c_str()) != 0) {
+            return false;
+        }
+        m_part.clear();
+        return true;
+    }
+
+  private:
+    const std::string m_path;
+    std::string m_part; ///< Empty once in place.
+    std::ofstream m_stream;
+};
+
+template<class T>
+void put(void* to, const T& value) {
+    std::memcpy(to, &value, sizeof value);
+}
+
+} // namespace
+
+Code codeOf(const StoreFailure& failure) {
+    switch (failure.fault) {
+    case Fault::Newer:
+        return codeStoreIsNewer;
+    case Fault::Older:
+        return codeStoreIsOlder;
+    case Fault::BadPath:
+        return codeBadPath;
+    case Fault::NoFile:
+        return codeNoFile;
+    case Fault::ReadOnly:
+    case Fault::Full:
+    case Fault::Busy:
+        return codeNotWritten;
+    default:
+        return codeNoStore;
+    }
+}
+
+std::unique_ptr<StoreEngine> openStoreAt(const std::string& address) {
+    if (address.empty() || address.size() > longestAddress) {
+        throw StoreFailure(Fault::Missing, "no server address");
+    }
+    try {
+        return openStore(address);
+    } catch (const StoreFailure& failure) {
+        const bool ascii =
+            std::all_of(address.begin(), address.end(), [](unsigned char c) { return c < 0x80; });
+        if (failure.fault != Fault::Missing || ascii) {
+            throw;
+        }
+    }
+    return openStore(utf8FromLatin1(address));
+}
+
+Session::Session(std::string address, std::unique_ptr<StoreEngine> engine)
+    : m_address(std::move(address)), m_engine(std::move(engine)),
+      m_keep(std::make_shared<StoreKeep>(m_engine)), m_container(m_keep) {}
+
+Code Session::getTicketData(int type, int kind, int index, int* size, void* buffer) {
+    constexpr int numberKind = 0;
+    constexpr int idsKind = 1;
+    if (!TICKET_TYPE_Valid(type) || (kind != numberKind && kind != idsKind) || index != 0 ||
+        size == nullptr || *size < 0 || buffer == nullptr) {
+        return codeRefused;
+    }
+    const std::vector<int> ids = m_keep->ids(type);
+    if (kind == numberKind) {
+        const int number = static_cast<int>(ids.size());
+        if (*size < static_cast<int>(sizeof number)) {
+            return codeRefused;
+        }
+        put(buffer, number);
+        *size = sizeof number;
+        return codeDone;
+    }
+    const std::size_t fitting = std::min(ids.size(), static_cast<std::size_t>(*size) / sizeof(int));
+    if (fitting != 0) {
+        std::memcpy(buffer, ids.data(), fitting * sizeof(int));
+    }
+    *size = static_cast<int>(fitting * sizeof(int));
+    return codeDone;
+}
+
+Code Session::sendCommand(std::string_view command, int size, void* data) {
+    if (command == "local.set.callback") {
+        return setCallback(data);
+    }
+    std::string* const folder = command == "local.set.previewfolder"     ? &m_previewFolder
+                                : command == "local.set.thumbnailfolder" ? &m_thumbnailFolder
+                                                                         : nullptr;
+    if (folder == nullptr || size < 0 || data == nullptr) {
+        return codeRefused;
+    }
+    const auto* const text = static_cast<const char*>(data);
+    folder->assign(text, strnlen(text, static_cast<std::size_t>(size)));
+    return codeDone;
+}
+
+/// Takes the client's pointer out of the ticket, and gives it the number under which the client
+/// then enables notifications. This store accepts and remembers them, and has none to send.
+Code Session::setCallback(void* ticket) {
+    const auto found = findTicket(ticket);
+    if (found == nullptr) {
+        return codeRefused;
+    }
+    void* user = nullptr;
+    found->get("pUser", PARAM_POINTER, &user, POSITION_WHOLE);
+    static int lastNotificationId = 0;
+    const int id = m_notificationId != 0 ? m_notificationId : lastNotificationId + 1;
+    const bool told = setSingle("iGUINotificationID", PARAM_INT, &id, POSITION_WHOLE,
+                                [&](SETMULTIPAR* table) { return found->apply(table); });
+    if (!told) {
+        return codeRefused;
+    }
+    lastNotificationId = std::max(lastNotificationId, id);
+    m_notificationId = id;
+    m_callbackUser = user;
+    return codeDone;
+}
+
+Code Session::putFile(const std::string& local, const std::string& server) {
+    std::error_code failure;
+    // A pipe would have us wait for its writer.
+    if (!std::filesystem::is_regular_file(local, failure)) {
+        return codeNoFile;
+    }
+    std::ifstream from(local, std::ios::binary);
+    if (!from) {
+        return codeNoFile;
+    }
+    m_engine->putFile(server, from);
+    return codeDone;
+}
+
+Code Session::getFile(const std::string& local, const std::string& server) {
+    if (local.empty()) {
+        return codeRefused;
+    }
+    LocalCopy copy(local);
+    if (!copy.stream()) {
+        return codeNotWritten;
+    }
+    m_engine->getFile(server, copy.stream());
+    return copy.putInPlace() ? codeDone : codeNotWritten;
+}
+
+} // namespace store

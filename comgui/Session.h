@@ -1,0 +1,67 @@
+// One login to a store.
+#pragma once
+
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include "comgui/StoreEngine.h"
+#include "comgui/StoreKeep.h"
+#include "comgui/TicketContainer.h"
+
+namespace store {
+
+/// What slots of the plug-in's table answer. A login that fails gives one of the first five.
+enum Code : std::int32_t {
+    codeDone = 0,
+    codeWrongUserOrPassword = -2004,
+    codeNoStore = -2005, ///< Nor one that this process may use.
+    codeUserDisabled = -2030,
+    codeStoreIsNewer = -2031,
+    codeStoreIsOlder = -2033,
+    codeRefused = -1,    ///< An argument, handle or command that means nothing here.
+    codeNoFile = -2050,  ///< The server has no such file.
+    codeBadPath = -2051, ///< A server path that leads out of the store's files, or to a folder.
+    codeNotWritten = -2052,
+};
+
+Code codeOf(const StoreFailure& failure);
+
+/// Opens the store at a server address: a path of at most 127 bytes. Client programs pass a path
+/// one byte a character, so that what is no path as it stands is tried as Latin-1.
+std::unique_ptr<StoreEngine> openStoreAt(const std::string& address);
+
+class Session {
+  public:
+    Session(std::string address, std::unique_ptr<StoreEngine> engine);
+
+    const std::string& address() const { return m_address; }
+    const MTICKET_ACCESS* container() const { return m_container.access(); }
+
+    // As the slots of these names, with what came from outside checked for null.
+
+    Code getTicketData(int type, int kind, int index, int* size, void* buffer);
+    Code sendCommand(std::string_view command, int size, void* data);
+    /// From a local file to a server path.
+    Code putFile(const std::string& local, const std::string& server);
+    /// The local file appears complete, and does so before this returns.
+    Code getFile(const std::string& local, const std::string& server);
+
+    const std::string& previewFolder() const { return m_previewFolder; }
+    const std::string& thumbnailFolder() const { return m_thumbnailFolder; }
+
+  private:
+    Code setCallback(void* ticket);
+
+    const std::string m_address;
+    const std::shared_ptr<StoreEngine> m_engine;
+    const std::shared_ptr<StoreKeep> m_keep;
+    TicketContainer m_container;
+    int m_notificationId = 0; ///< 0: there is no callback.
+    void* m_callbackUser = nullptr;
+    std::string m_previewFolder;
+    std::string m_thumbnailFolder;
+};
+
+} // namespace store

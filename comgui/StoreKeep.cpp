@@ -1,0 +1,190 @@
+#include "comgui/StoreKeep.h"
+
+#include <algorithm>
+#include <cstring>
+#include <optional>
+#include <utility>
+
+namespace store {
+
+namespace {
+
+constexpr int jobType = 3;
+
+/// In the order in which a client reads them.
+const std::vector<std::string> jobOverview = {"Input/SubType", "Job/Display/Status",
+                                              "Remote/ShowInVerifier", "Input/FileType",
+                                              "Workflow/Verify/Active"};
+
+/// Room for a number or a few; whoever put more there has it read singly.
+constexpr std::size_t largestOverviewBytes = 64;
+
+template<class Body, class Result>
+Result orElse(Result otherwise, Body body) {
+    try {
+        return body();
+    } catch (const StoreFailure&) {
+        return otherwise;
+    }
+}
+
+/// Whether a record, as the first one of its key, leaves nothing of what the key held.
+bool replacesKey(const SETMULTIPAR& record) {
+    if (record.position != POSITION_WHOLE) {
+        return false;
+    }
+    switch (record.type) {
+    case PARAM_DELETE:
+    case PARAM_POINTER:
+        return true;
+    case PARAM_INT:
+    case PARAM_DOUBLE:
+    case PARAM_STRING:
+    case PARAM_INT64:
+    case PARAM_UINT:
+    case PARAM_UINT64:
+        return record.value != nullptr;
+    default:
+        return false;
+    }
+}
+
+Scope scopeOf(const SETMULTIPAR* table) {
+    Scope scope;
+    const char* last = nullptr;
+    for (const auto* record = table; record->key != nullptr; ++record) {
+        if (record->key != last) {
+            last = record->key;
+            scope.keys.try_emplace(last, !replacesKey(*record));
+        }
+    }
+    return scope;
+}
+
+void clearResults(SETMULTIPAR* table) {
+    for (; table->key != nullptr; ++table) {
+        table->result = 0;
+    }
+}
+
+} // namespace
+
+StoreKeep::StoreKeep(std::shared_ptr<StoreEngine> engine) : m_engine(std::move(engine)) {}
+
+std::vector<int> StoreKeep::ids(int type) {
+    m_idsAsked = m_idsAsked || type == jobType;
+    return orElse(std::vector<int>(), [&] { return m_engine->ids(type); });
+}
+
+bool StoreKeep::exists(int type, int id) {
+    return orElse(false, [&] { return m_engine->exists(type, id); });
+}
+
+bool StoreKeep::create(int type, int id) {
+    return orElse(false, [&] { return m_engine->create(type, id); });
+}
+
+int StoreKeep::createNext(int type) {
+    return orElse(-1, [&] { return m_engine->createNext(type); });
+}
+
+bool StoreKeep::remove(int type, int id) {
+    return orElse(false, [&] { return m_engine->remove(type, id); });
+}
+
+std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_view key) {
+    return orElse(SharedElements(), [&] {
+        // Asked before the store is: what is committed in between makes the next read fetch again.
+        const std::uint64_t commits = m_engine->commits();
+        if (commits == m_fetched.commits && id == m_fetched.id && type == m_fetched.type &&
+            key == m_fetched.key) {
+            return m_fetched.elements;
+        }
+        if (type == jobType) {
+            const auto name = std::find(jobOverview.begin(), jobOverview.end(), key);
+            if (name != jobOverview.end() && wantsOverview(commits)) {
+                const auto row = m_overview.find(id);
+                if (row == m_overview.end()) {
+                    return SharedElements();
+                }
+                const auto& seen =
+                    row->second[static_cast<std::size_t>(name - jobOverview.begin())];
+                if (!seen.large) {
+                    return seen.elements;
+                }
+            }
+        }
+        m_fetched.type = -1;
+        m_fetched.elements = m_engine->key(type, id, key);
+        m_fetched.key = key;
+        m_fetched.id = id;
+        m_fetched.type = type;
+        m_fetched.commits = commits;
+        return m_fetched.elements;
+    });
+}
+
+/// Whether the overview of this moment is there; it is fetched where that is worth it. While others
+/// keep writing, it is fetched again only after so many reads that they cost more.
+bool StoreKeep::wantsOverview(std::uint64_t commits) {
+    if (m_overviewHeld && m_overviewCommits == commits) {
+        return true;
+    }
+    m_overviewHeld = false;
+    ++m_readsSince;
+    if (!m_idsAsked && m_readsSince <= m_readsUntilNext) {
+        return false;
+    }
+    fetchOverview(commits);
+    return true;
+}
+
+void StoreKeep::fetchOverview(std::uint64_t commits) {
+    m_overview.clear();
+    m_engine->keysOfAll(jobType, jobOverview, largestOverviewBytes,
+                        [&](int id, std::size_t name, SharedElements elements) {
+                            auto& seen = m_overview[id][name];
+                            seen.large = elements == nullptr;
+                            seen.elements = std::move(elements);
+                        });
+    m_overviewCommits = commits;
+    m_overviewHeld = true;
+    m_idsAsked = false;
+    m_readsSince = 0;
+    m_readsUntilNext = 20 + m_overview.size();
+}
+
+std::shared_ptr<const TicketContent> StoreKeep::content(int type, int id, const KeyFilter& filter) {
+    return orElse(std::shared_ptr<const TicketContent>(),
+                  [&] { return m_engine->content(type, id, filter); });
+}
+
+bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
+    if (table == nullptr || table->key == nullptr) {
+        return exists(type, id);
+    }
+    try {
+        return m_engine->change(type, id, scopeOf(table),
+                                [&](TicketContent& content) { content.apply(table); });
+    } catch (const StoreFailure&) {
+        clearResults(table);
+        return false;
+    } catch (...) {
+        clearResults(table);
+        throw;
+    }
+}
+
+bool StoreKeep::transfer(int type, int id, const TicketContent& source, bool replace) {
+    Scope scope;
+    scope.everything = replace;
+    for (const auto& [key, elements] : source.keys()) {
+        scope.keys.emplace(key, false);
+    }
+    return orElse(false, [&] {
+        return m_engine->change(type, id, scope,
+                                [&](TicketContent& content) { content.transfer(source, replace); });
+    });
+}
+
+} // namespace store

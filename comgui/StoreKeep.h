@@ -1,0 +1,70 @@
+// The tickets of a store, as a session's container asks for them.
+#pragma once
+
+#include <array>
+#include <cstdint>
+#include <memory>
+#include <string>
+#include <unordered_map>
+#include <vector>
+
+#include "comgui/StoreEngine.h"
+#include "comgui/TicketKeep.h"
+
+namespace store {
+
+/// A failure of the store is a ticket that isn't there, or a table that can't be written.
+///
+/// What was read is given again only while nobody has committed anything since, so a reader always
+/// sees what is there now. Two things are kept that way: the key that was read last, so that the
+/// count and the elements of an array are one fetch; and, once the ids of the jobs have been asked
+/// for, the keys of all jobs by which a client picks those that concern it, since it is about to
+/// ask each job for each of them.
+class StoreKeep : public TicketKeep {
+  public:
+    explicit StoreKeep(std::shared_ptr<StoreEngine> engine);
+
+    std::vector<int> ids(int type) override;
+    bool exists(int type, int id) override;
+    bool create(int type, int id) override;
+    int createNext(int type) override;
+    bool remove(int type, int id) override;
+    std::shared_ptr<const Elements> key(int type, int id, std::string_view key) override;
+    std::shared_ptr<const TicketContent> content(int type, int id,
+                                                 const KeyFilter& filter) override;
+    bool apply(int type, int id, SETMULTIPAR* table) override;
+    bool transfer(int type, int id, const TicketContent& source, bool replace) override;
+
+  private:
+    using SharedElements = std::shared_ptr<const Elements>;
+
+    struct Fetched {
+        int type = -1;
+        int id = -1;
+        std::string key;
+        SharedElements elements;
+        std::uint64_t commits = 0;
+    };
+
+    /// A key of the overview; large ones are not in it.
+    struct Seen {
+        bool large = false;
+        SharedElements elements;
+    };
+    static constexpr std::size_t overviewKeys = 5;
+    using Row = std::array<Seen, overviewKeys>;
+
+    bool wantsOverview(std::uint64_t commits);
+    void fetchOverview(std::uint64_t commits);
+
+    const std::shared_ptr<StoreEngine> m_engine;
+    Fetched m_fetched;
+    std::unordered_map<int, Row> m_overview;
+    std::uint64_t m_overviewCommits = 0;
+    bool m_overviewHeld = false;
+    bool m_idsAsked = false;          ///< Since the last overview.
+    std::size_t m_readsSince = 0;     ///< Of keys that an overview would have held.
+    std::size_t m_readsUntilNext = 0; ///< An overview is due again after so many.
+};
+
+} // namespace store
