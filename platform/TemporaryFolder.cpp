@@ -29,7 +29,7 @@ std::string temporaryFolder() {
             return path;
         }
     }
-    const std::string path = "/tmp/tintgate-" + std::to_string(geteuid());
+    std::string path = "/tmp/tintgate-" + std::to_string(geteuid());
     mkdir(path.c_str(), 0700);
     if (!isOurOwnFolder(path.c_str())) {
         return {};
