@@ -59,8 +59,6 @@ set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS ON)
 set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS "${CMAKE_LIBRARY_OUTPUT_DIRECTORY}")
-set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS ON)
-set(CPACK_DEBIAN_PACKAGE_GENERATE_SHLIBS_POLICY ">=")
 
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_NAME tintgate)
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_SECTION graphics)
@@ -75,8 +73,10 @@ Reads CGATS and IT8 text and ICC profiles for CMYK.")
 
 set(CPACK_DEBIAN_LIBTINTGATE1_PACKAGE_NAME libtintgate1)
 set(CPACK_DEBIAN_LIBTINTGATE1_PACKAGE_SECTION libs)
+get_target_property(_version libTintgate SOVERSION)
+file(WRITE "${_made}/shlibs" "libTintgate ${_version} libtintgate1 (>= ${PROJECT_VERSION})\n")
 file(WRITE "${_made}/triggers" "activate-noawait ldconfig\n")
-set(CPACK_DEBIAN_LIBTINTGATE1_PACKAGE_CONTROL_EXTRA "${_made}/triggers")
+set(CPACK_DEBIAN_LIBTINTGATE1_PACKAGE_CONTROL_EXTRA "${_made}/shlibs;${_made}/triggers")
 set(CPACK_DEBIAN_LIBTINTGATE1_DESCRIPTION "analysis library of Tintgate
 Compares colour data, judges the outcome by a tolerance preset and writes it as
 JSON.")
