@@ -8,6 +8,7 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "tests/comm/CommTest.h"
+#include "ticket/TicketUpdateList.h"
 
 namespace {
 
@@ -200,6 +201,14 @@ TEST_F(ManagerTest, ReadsAndWritesArrays) {
     EXPECT_TRUE(manager->SetMultiParameter(3, job, list));
     EXPECT_EQ(manager->GetStringParameter(3, job, "list"), L"text");
     EXPECT_EQ(manager->SetTicketParameter(3, job, "list", PARAM_INT, values, -9), -1);
+
+    TICKET_UPDATE_LIST updates(manager->GetClientContainer());
+    updates.xSetParameter(3, job, "held", PARAM_INT, values, POSITION_WHOLE, false);
+    EXPECT_EQ(manager->GetIntParameter(3, job, "held"), -1);
+    EXPECT_TRUE(manager->SetMultiParameter(updates));
+    EXPECT_EQ(manager->GetIntParameter(3, job, "held"), 5);
+    manager->Logout();
+    EXPECT_FALSE(manager->SetMultiParameter(updates));
 }
 
 TEST_F(ManagerTest, SearchesAndDeletesTickets) {

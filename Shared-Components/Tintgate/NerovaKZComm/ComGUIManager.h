@@ -16,6 +16,7 @@
 #include "ticket/TicketContainer.h"
 
 class __CFBundle;
+class TICKET_UPDATE_LIST;
 
 enum COMERR : int {
     COMERR_NONE = 0,
@@ -117,6 +118,9 @@ class ComGUIManager {
     /// container.
     bool SetMultiParameter(int id, int type, PARAM_TYPE ptype, const char* key, int count,
                            void* values);
+    /// Flushes the list into the container that is held: true if a ticket was changed, or there was
+    /// nothing to flush.
+    bool SetMultiParameter(TICKET_UPDATE_LIST& list);
     bool DeleteParameter(int type, int id, const char* key, int position);
     bool SetPartial(int type, int id, const char* const* prefixes); ///< Raw.
 

@@ -11,6 +11,8 @@
 #include "text/CharSetsWx.h"
 #include "ticket/ParameterTables.h"
 #include "ticket/SingleTicket.h"
+#include "ticket/TicketUpdateCallback.h"
+#include "ticket/TicketUpdateList.h"
 
 namespace {
 
@@ -181,6 +183,11 @@ bool ComGUIManager::SetMultiParameter(int id, int type, PARAM_TYPE ptype, const 
     }
     MultiParListDestroy(&list);
     return done;
+}
+
+bool ComGUIManager::SetMultiParameter(TICKET_UPDATE_LIST& list) {
+    const TICKET_UPDATE_CALLBACK nobody;
+    return list.FlushToContainer(m_container, nullptr, nobody);
 }
 
 bool ComGUIManager::DeleteParameter(int type, int id, const char* key, int position) {
