@@ -1,5 +1,6 @@
 #include "analysis/LabWriter.h"
 
+#include <cmath>
 #include <utility>
 
 #include "ExitCodes.h"
@@ -23,6 +24,11 @@ colour::DataSet chartOf(colour::DataSet set) {
     chart.originator = "Tintgate";
     chart.conditions = {.illuminant = "D50", .observer = "2", .measurement = {}};
     return chart;
+}
+
+/// Six decimals: more than a profile's floating road can mean, and short enough to read.
+double sixDecimals(double value) {
+    return std::round(value * 1e6) / 1e6;
 }
 
 } // namespace
@@ -49,6 +55,8 @@ int writeLab(const std::string& reference, const std::string& profile, const std
     if (const int status = statusOf(profileFile.profile->evaluate(
             chart.device.data(), chart.patchCount, chart.channels.size(), chart.lab.data())))
         return status;
+    for (colour::Lab& lab : chart.lab)
+        lab = {sixDecimals(lab.L), sixDecimals(lab.a), sixDecimals(lab.b)};
     return writeOutputFile(output, colour::writeCgats(chart));
 }
 
