@@ -185,7 +185,11 @@ bool unwrapLine(std::string_view line, std::string& inner) {
     if (!alone || word.text.find(' ') == std::string_view::npos)
         return false;
     inner = wordText(word);
-    return true;
+    // A spreadsheet doubles every quote inside; others belong to cells of their own.
+    const auto quotes = [](std::string_view text) {
+        return std::count(text.begin(), text.end(), '"');
+    };
+    return quotes(word.text) == 2 * quotes(inner);
 }
 
 KeywordLine keywordLine(std::string_view line) {
@@ -203,16 +207,15 @@ KeywordLine keywordLine(std::string_view line) {
             line = inner;
     }
     const char* const end = line.data() + line.size();
-    const char* at = skipBlanks(line.data(), end, blanksSeparate);
+    const char* at = skipBlanks(line.data(), end, anySeparates);
     if (at == end)
         return result;
-    const Word keyword = takeWord(at, end, blanksSeparate);
-    std::string_view name = keyword.text.substr(0, 256); // no keyword is longer
-    while (name.size() > 1 && (name.back() == ',' || name.back() == ';' || name.back() == ':'))
+    std::string_view name = takeWord(at, end, anySeparates).text;
+    if (name.ends_with(':'))
         name.remove_suffix(1);
-    result.keyword = upperCase(name);
+    result.keyword = upperCase(name.substr(0, 256)); // no keyword is longer
 
-    at = skipBlanks(at, end, blanksSeparate);
+    at = skipBlanks(at, end, anySeparates);
     if (at == end || *at == '#')
         return result;
     if (*at == '"') {

@@ -17,13 +17,15 @@ enum CharKind : std::uint8_t { plainChar, blankChar, lineEndChar };
 class CharTable {
   public:
     /// `separator` is 0 for blanks and tabs alone, else the sign that separates too.
-    explicit constexpr CharTable(char separator) : m_separator(separator) {
+    explicit constexpr CharTable(char separator, char another = 0) : m_separator(separator) {
         for (const char blank : {' ', '\t', '\v', '\f', '\x1a'}) // 1A ends texts of old systems
             m_kinds[static_cast<unsigned char>(blank)] = blankChar;
         for (const char lineEnd : {'\n', '\r'})
             m_kinds[static_cast<unsigned char>(lineEnd)] = lineEndChar;
-        if (separator != 0)
-            m_kinds[static_cast<unsigned char>(separator)] = blankChar;
+        for (const char more : {separator, another}) {
+            if (more != 0)
+                m_kinds[static_cast<unsigned char>(more)] = blankChar;
+        }
     }
 
     bool isPlain(char c) const { return m_kinds[static_cast<unsigned char>(c)] == plainChar; }
@@ -44,6 +46,7 @@ class CharTable {
 inline constexpr CharTable blanksSeparate{0};
 inline constexpr CharTable semicolonsSeparate{';'};
 inline constexpr CharTable commasSeparate{','};
+inline constexpr CharTable anySeparates{',', ';'}; ///< For keywords, which hold none of these.
 
 /// One cell or word. The view lies in the text: between the quotes where it was quoted.
 struct Word {

@@ -72,7 +72,7 @@ class Lines {
 
     bool next(std::string_view& line) {
         while (true) {
-            while (m_at != m_end && !blanksSeparate.isPlain(*m_at))
+            while (m_at != m_end && !anySeparates.isPlain(*m_at))
                 ++m_at;
             if (m_at == m_end)
                 return false;
@@ -94,18 +94,15 @@ class Lines {
     const char* m_end;
 };
 
-/// First word of a line, without quotes and the signs that a spreadsheet leaves of empty cells.
+/// First word of a line, without its quotes.
 std::string_view firstWordOf(std::string_view line) {
     const char* at = line.data();
-    std::string_view word = takeWord(at, line.data() + line.size(), blanksSeparate).text;
-    while (!word.empty() && (word.back() == ',' || word.back() == ';'))
-        word.remove_suffix(1);
-    return word;
+    return takeWord(at, line.data() + line.size(), anySeparates).text;
 }
 
 /// Where a line has a word, in either case, that stands alone; npos without one.
 std::size_t findWord(std::string_view line, std::string_view word) {
-    const auto isPart = [](char c) { return blanksSeparate.isPlain(c) && c != ',' && c != ';'; };
+    const auto isPart = [](char c) { return anySeparates.isPlain(c) && c != '"'; };
     for (std::size_t at = 0; at + word.size() <= line.size(); ++at) {
         const std::size_t behind = at + word.size();
         if ((at == 0 || !isPart(line[at - 1])) &&
@@ -138,9 +135,29 @@ std::size_t knownNames(const std::vector<std::string>& names) {
         }));
 }
 
-void addNames(const std::vector<Word>& words, std::vector<std::string>& names) {
+std::vector<std::string> textsOf(const std::vector<Word>& words) {
+    std::vector<std::string> texts;
     for (const Word& word : words)
-        names.push_back(toUtf8(wordText(word)));
+        texts.push_back(toUtf8(wordText(word)));
+    return texts;
+}
+
+/// What separates the names of a line: that which gives the most names that mean something.
+const CharTable* separatorOf(std::string_view line) {
+    const CharTable* best = &blanksSeparate;
+    if (line.find_first_of(",;") == std::string_view::npos)
+        return best;
+    std::size_t most = 0;
+    for (const CharTable* chars : {&blanksSeparate, &semicolonsSeparate, &commasSeparate}) {
+        std::vector<Word> words;
+        splitWords(line, *chars, maxCgatsColumns, words);
+        const std::size_t known = knownNames(textsOf(words));
+        if (known > most) {
+            most = known;
+            best = chars;
+        }
+    }
+    return best;
 }
 
 /// Adds the names of one line. False if there are more than may be.
@@ -148,36 +165,25 @@ bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount
     std::string inner;
     if (unwrapLine(line, inner))
         line = inner;
-    std::vector<Word> words;
+    const bool isFirst = list.names.empty();
+    if (isFirst)
+        list.chars = separatorOf(line);
     const std::size_t room = maxCgatsColumns - list.names.size();
-    if (!splitWords(line, blanksSeparate, room, words))
+    std::vector<Word> words;
+    if (!splitWords(line, *list.chars, room, words))
         return false;
-    for (const CharTable* chars : {&semicolonsSeparate, &commasSeparate}) {
-        const bool separates = std::any_of(words.begin(), words.end(), [&](const Word& word) {
-            return !word.quoted && word.text.find(chars->cellSeparator()) != std::string_view::npos;
-        });
-        if (separates && list.chars == &blanksSeparate)
-            list.chars = chars;
-    }
-    if (list.chars != &blanksSeparate && !splitWords(line, *list.chars, room, words))
-        return false;
+    std::vector<std::string> names = textsOf(words);
 
-    // Tabs alone separate where that gives the count stated, or names that make more sense.
-    std::vector<Word> cells;
-    std::vector<std::string> byWords;
-    std::vector<std::string> byCells;
-    addNames(words, byWords);
-    const bool hasCells = line.find(list.chars->cellSeparator()) != std::string_view::npos &&
-                          splitCells(line, *list.chars, room, cells);
-    while (!cells.empty() && cells.back().text.empty())
-        cells.pop_back();
-    if (hasCells && list.names.empty() && cells.size() != words.size() &&
-        fieldCount != words.size()) {
-        addNames(cells, byCells);
-        if (fieldCount == cells.size() || knownNames(byCells) > knownNames(byWords))
-            byWords = std::move(byCells);
+    // Names may have blanks in them: tabs alone part them where that gives the count stated, or
+    // names that mean more.
+    if (isFirst && fieldCount != names.size() && splitCells(line, *list.chars, room, words)) {
+        while (!words.empty() && words.back().text.empty())
+            words.pop_back();
+        std::vector<std::string> cells = textsOf(words);
+        if (fieldCount == cells.size() || knownNames(cells) > knownNames(names))
+            names = std::move(cells);
     }
-    std::move(byWords.begin(), byWords.end(), std::back_inserter(list.names));
+    std::move(names.begin(), names.end(), std::back_inserter(list.names));
     return true;
 }
 

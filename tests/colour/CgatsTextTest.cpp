@@ -161,6 +161,14 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
         {"semicolons", with(" ", ";"), ""},
         {"commas between cells", with(" ", ","), ""},
         {"commas and blanks between cells", with(" ", ", "), ""},
+        {"all cells quoted, empty ones at the end",
+         "\"CGATS.17\",,\n\"ORIGINATOR\",\"Press, \"\"A\"\"\",\n\"NUMBER_OF_SETS\",\"3\",\n"
+         "\"BEGIN_DATA_FORMAT\",,\n\"SAMPLE_ID\",\"CMYK_C\",\"CMYK_M\",\"CMYK_Y\",\"CMYK_K\","
+         "\"LAB_L\",\"LAB_A\",\"LAB_B\",\"Note, if any\"\n\"END_DATA_FORMAT\",,\n\"BEGIN_DATA\","
+         ",\n\"A1\",\"0\",\"0\",\"0\",\"0\",\"95.5\",\"0.25\",\"-2.125\",\"x, y\"\n"
+         "\"A2\",\"100\",\"0\",\"0\",\"0\",\"55\",\"-37.5\",\"-50.75\",\n"
+         "A2,0,40.5,0,0,71.25,33,-0.5,\n\"END_DATA\",,\n",
+         ""},
         {"spreadsheet quoting", with("ORIGINATOR \"Press\"", "\"ORIGINATOR \"\"Press\"\"\""), ""},
         {"rows quoted by a spreadsheet",
          replaced(replaced(commas, "A2 0", "\"A2 0"), "-0,5\n", "-0,5\"\t\t\n"), "Commas"},
