@@ -38,6 +38,7 @@ ARROWS = {
     "StoreEngine": "ticketengine",
     "store": "StoreEngine",
     "ComGUI": "commrecords ticketrecords ticketengine StoreEngine store",
+    "tintgate-store": "store",
 }
 
 # Arrows that go on through a target, because a header that it publishes needs them itself.

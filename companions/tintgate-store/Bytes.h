@@ -1,0 +1,29 @@
+// Bytes as text: base64, UTF-8, and what a terminal may be shown.
+#pragma once
+
+#include <optional>
+#include <string>
+#include <string_view>
+
+#include <nlohmann/json.hpp>
+
+namespace admin {
+
+using Json = nlohmann::json;
+
+/// Whether the bytes are UTF-8 as JSON has it: no surrogates, nothing above U+10FFFF, no overlong
+/// forms.
+bool isUtf8(std::string_view bytes);
+
+std::string toBase64(std::string_view bytes);
+/// Nothing for text that toBase64 would not have written.
+std::optional<std::string> fromBase64(std::string_view text);
+
+/// A JSON string, or {"base64": "..."} for bytes that are no UTF-8.
+Json textOrBytes(const std::string& bytes);
+
+/// The text with control characters, and bytes that are no UTF-8, as \xNN, so that nothing that is
+/// stored can act on a terminal.
+std::string printable(std::string_view bytes);
+
+} // namespace admin

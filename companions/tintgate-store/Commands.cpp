@@ -1,0 +1,58 @@
+#include "companions/tintgate-store/Commands.h"
+
+#include <chrono>
+#include <cstdio>
+#include <filesystem>
+
+#include <unistd.h>
+
+#include "companions/tintgate-store/Failure.h"
+
+namespace admin {
+
+namespace {
+
+std::int64_t milliseconds() {
+    return std::chrono::duration_cast<std::chrono::milliseconds>(
+               std::chrono::steady_clock::now().time_since_epoch())
+        .count();
+}
+
+} // namespace
+
+const std::string& Invocation::givenAddress() const {
+    if (address.empty()) {
+        throw Failure(Status::BadCommand,
+                      "which store? Say --store FOLDER, or set TINTGATE_STORE to it");
+    }
+    return address;
+}
+
+std::unique_ptr<store::StoreEngine> Invocation::open() const {
+    return store::openStore(givenAddress());
+}
+
+CLI::App& addGroup(CLI::App& program, const std::string& name, const std::string& text) {
+    auto* group = program.add_subcommand(name, text);
+    group->require_subcommand(1);
+    return *group;
+}
+
+Progress::Progress(std::size_t total, std::string what)
+    : m_total(total), m_what(std::move(what)), m_shown(isatty(STDERR_FILENO) != 0) {}
+
+Progress::~Progress() {
+    if (m_shown && m_last != 0) {
+        std::fputs("\r\x1b[K", stderr);
+    }
+}
+
+void Progress::done(std::size_t count) {
+    const std::int64_t now = milliseconds();
+    if (m_shown && now - m_last >= 100) {
+        m_last = now;
+        std::fprintf(stderr, "\r%zu of %zu %s\x1b[K", count, m_total, m_what.c_str());
+    }
+}
+
+} // namespace admin

@@ -1,0 +1,233 @@
+#include <ctime>
+#include <filesystem>
+#include <iostream>
+
+#include "companions/tintgate-store/Bytes.h"
+#include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/LocalFile.h"
+#include "companions/tintgate-store/Rows.h"
+#include "companions/tintgate-store/TicketName.h"
+#include "companions/tintgate-store/XmlCheck.h"
+
+namespace admin {
+
+namespace {
+
+namespace fs = std::filesystem;
+
+struct FileOptions {
+    std::string local;
+    std::string path;
+    std::string version;
+    std::string keep;
+    bool all = false;
+};
+
+int versionNumber(const FileOptions& options) {
+    return wholeNumber(options.version, 1, std::numeric_limits<int>::max(), "version");
+}
+
+/// Server paths are shown as they are told to the store: from its root.
+std::string shownPath(const std::string& path) {
+    return "/" + path.substr(std::min(path.size(), path.find_first_not_of('/')));
+}
+
+std::string shownTime(std::int64_t seconds) {
+    const std::time_t time = seconds;
+    std::tm parts = {};
+    localtime_r(&time, &parts);
+    char text[32];
+    std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &parts);
+    return text;
+}
+
+/// As XML's judge sees a content: "xml" is null for what is no XML, "fault" tells what is wrong.
+template<class Write>
+void judge(Row& row, bool named, Write write) {
+    XmlCheck check;
+    write(check.stream());
+    const bool isXml = named || check.looksLikeXml();
+    const std::string fault = check.fault();
+    row["wellFormed"] = isXml ? Row(fault.empty()) : Row();
+    row["fault"] = isXml && !fault.empty() ? Row(fault) : Row();
+}
+
+/// For people: "well-formed", or the fault.
+void tellXml(Row& row) {
+    row["xml"] = row["wellFormed"].is_null() ? Row()
+                 : row["fault"].is_null()
+                     ? Row("well-formed")
+                     : Row("not well-formed, " + row["fault"].get<std::string>());
+}
+
+Row versionRow(const Row& number, std::uint64_t size, std::int64_t time) {
+    return {{"version", number}, {"size", size}, {"time", time}, {"written", shownTime(time)}};
+}
+
+void put(const Invocation& invocation, const FileOptions& options) {
+    const auto store = invocation.open();
+    std::error_code none;
+    if (options.local == "-" || !fs::is_directory(options.local, none)) {
+        LocalInput input(options.local);
+        store->putFile(options.path, input.stream());
+        return;
+    }
+    std::vector<fs::path> files;
+    for (const auto& entry : fs::recursive_directory_iterator(options.local)) {
+        if (entry.is_regular_file()) {
+            files.push_back(entry.path());
+        }
+    }
+    std::sort(files.begin(), files.end());
+    Progress progress(files.size(), "files");
+    std::size_t count = 0;
+    for (const auto& file : files) {
+        LocalInput input(file.string());
+        store->putFile((fs::path(options.path) / fs::relative(file, options.local)).string(),
+                       input.stream());
+        progress.done(++count);
+    }
+}
+
+void get(const Invocation& invocation, const FileOptions& options) {
+    const auto store = invocation.open();
+    writeLocalFile(options.local, [&](std::ostream& to) {
+        if (options.version.empty()) {
+            store->getFile(options.path, to);
+        } else {
+            store->getVersion(options.path, versionNumber(options), to);
+        }
+    });
+}
+
+void list(const Invocation& invocation, const FileOptions& options) {
+    const auto store = invocation.open();
+    const std::string prefix = shownPath(options.path);
+    std::vector<Row> rows;
+    for (const auto& file : store->files()) {
+        const std::string path = shownPath(file.path);
+        if (path.compare(0, prefix.size(), prefix) != 0) {
+            continue;
+        }
+        Row row{{"path", textOrBytes(path)},
+                {"size", file.size},
+                {"time", file.time},
+                {"written", shownTime(file.time)},
+                {"versions", store->versions(file.path).size()}};
+        row["wellFormed"] = row["fault"] = nullptr;
+        if (isXmlName(path)) {
+            judge(row, true, [&](std::ostream& to) { store->getFile(file.path, to); });
+        }
+        if (!invocation.json) {
+            tellXml(row);
+        }
+        rows.push_back(row);
+    }
+    showRows({{"path", "PATH"},
+              {"size", "SIZE"},
+              {"written", "WRITTEN"},
+              {"versions", "OLD VERSIONS"},
+              {"xml", "XML"}},
+             rows, invocation.json);
+}
+
+void versions(const Invocation& invocation, const FileOptions& options) {
+    const auto store = invocation.open();
+    const bool named = isXmlName(options.path);
+    std::vector<Row> rows;
+    for (const auto& version : store->versions(options.path)) {
+        Row row = versionRow(version.number, version.size, version.time);
+        judge(row, named,
+              [&](std::ostream& to) { store->getVersion(options.path, version.number, to); });
+        rows.push_back(row);
+    }
+    const std::string wanted = shownPath(options.path);
+    for (const auto& file : store->files()) {
+        if (shownPath(file.path) == wanted) {
+            Row row = versionRow("now", file.size, file.time);
+            judge(row, named, [&](std::ostream& to) { store->getFile(file.path, to); });
+            rows.push_back(row);
+        }
+    }
+    if (rows.empty()) {
+        throw Failure(Status::NotThere, "there is no file " + printable(wanted));
+    }
+    if (!invocation.json) {
+        std::for_each(rows.begin(), rows.end(), tellXml);
+    }
+    showRows({{"version", "VERSION"}, {"size", "SIZE"}, {"written", "WRITTEN"}, {"xml", "XML"}},
+             rows, invocation.json);
+}
+
+void restore(const Invocation& invocation, const FileOptions& options) {
+    invocation.open()->restoreVersion(options.path, versionNumber(options));
+}
+
+void prune(const Invocation& invocation, const FileOptions& options) {
+    const int keep =
+        wholeNumber(options.keep, 0, std::numeric_limits<int>::max(), "number of versions");
+    if (options.all != options.path.empty()) {
+        throw Failure(Status::BadCommand, "say a path, or --all");
+    }
+    const auto store = invocation.open();
+    std::int64_t removed = 0;
+    if (options.all) {
+        for (const auto& file : store->files()) {
+            removed += store->pruneVersions(file.path, keep);
+        }
+    } else {
+        removed = store->pruneVersions(options.path, keep);
+    }
+    std::cout << "Removed " << removed << (removed == 1 ? " version\n" : " versions\n");
+}
+
+void clean(const Invocation& invocation) {
+    const int removed = invocation.open()->removeLeftovers();
+    std::cout << "Removed " << removed << (removed == 1 ? " leftover\n" : " leftovers\n");
+}
+
+} // namespace
+
+void addFileCommands(CLI::App& program, Invocation& invocation) {
+    auto& group = addGroup(program, "file", "Files of the server, and what they were before");
+    const auto options = std::make_shared<FileOptions>();
+    const auto command = [&](const char* word, const char* text, auto run) -> CLI::App& {
+        return addCommand<FileOptions>(
+            group, invocation, word, text, options,
+            [&invocation, run](const FileOptions& given) { run(invocation, given); });
+    };
+    const auto withPath = [&](CLI::App& added) {
+        added.add_option("path", options->path, "Server path, such as /jobs/7/job.jdf")->required();
+    };
+
+    auto& putting = command("put", "Deliver a file, or all files of a folder", put);
+    putting.add_option("local", options->local, "File or folder; - for standard input")->required();
+    withPath(putting);
+    putting.footer("A file that is replaced is kept as a version.");
+
+    auto& getting = command("get", "Fetch a file", get);
+    withPath(getting);
+    getting.add_option("local", options->local, "Where to; - for standard output")->required();
+    getting.add_option("--version", options->version, "An older version, by its number");
+
+    command("list", "List files, and whether each XML file is well-formed", list)
+        .add_option("prefix", options->path, "Only paths that start so");
+    withPath(command("versions", "List versions of a file, and whether each is well-formed XML",
+                     versions));
+
+    auto& restoring = command("restore", "Put an older version in place again", restore);
+    withPath(restoring);
+    restoring.add_option("version", options->version, "Its number")->required();
+    restoring.footer("What it replaces is kept as a version in turn.");
+
+    auto& pruning = command("prune", "Remove older versions", prune);
+    pruning.add_option("path", options->path, "Server path");
+    pruning.add_flag("--all", options->all, "Of all files");
+    pruning.add_option("--keep", options->keep, "How many of the newest versions stay")->required();
+
+    command("clean", "Remove what interrupted deliveries left behind",
+            [](const auto& invoked, const auto&) { clean(invoked); });
+}
+
+} // namespace admin

@@ -1,0 +1,131 @@
+#include <iostream>
+
+#include "companions/tintgate-store/Bytes.h"
+#include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/Jobs.h"
+#include "companions/tintgate-store/Rows.h"
+#include "companions/tintgate-store/TicketName.h"
+
+namespace admin {
+
+namespace {
+
+struct ResetOptions {
+    std::string job;
+    std::string strip;
+    bool family = false;
+};
+
+struct NoOptions {};
+
+Row stripJson(const Strip& strip) {
+    const bool judged = strip.approval.value_or(-1) >= 0;
+    return {{"measurements", strip.measurements},
+            {"passed", judged ? Row(*strip.approval > 0) : Row()}};
+}
+
+Row stripText(const Strip& strip) {
+    if (strip.approval.value_or(-1) < 0) {
+        return strip.measurements > 0 ? Row("measured") : Row();
+    }
+    return *strip.approval > 0 ? "passed" : "failed";
+}
+
+void list(const Invocation& invocation) {
+    std::vector<Row> rows;
+    for (const auto& job : allJobs(*invocation.open())) {
+        Row row{{"job", job.id},
+                {"title", textOrBytes(job.title)},
+                {"state", job.state()},
+                {"displayStatus", job.displayStatus},
+                {"waits", job.waits()},
+                {"twoStrips", job.twoStrips},
+                {"strip1", invocation.json ? stripJson(job.strips[0]) : stripText(job.strips[0])},
+                {"strip2", invocation.json ? stripJson(job.strips[1]) : stripText(job.strips[1])},
+                {"parent", job.parent > 0 ? Row(job.parent) : Row()}};
+        rows.push_back(row);
+    }
+    showRows({{"job", "JOB"},
+              {"title", "TITLE"},
+              {"state", "STATE"},
+              {"displayStatus", "CODE"},
+              {"strip1", "STRIP 1"},
+              {"strip2", "STRIP 2"},
+              {"parent", "PARENT"}},
+             rows, invocation.json);
+}
+
+int jobNumber(const std::string& text) {
+    const TicketName name =
+        text.find('/') != std::string::npos ? ticketNamed(text) : ticketNamed("job/" + text);
+    if (name.type != jobType) {
+        throw Failure(Status::BadInput, textOf(name) + " is no job");
+    }
+    return name.id;
+}
+
+void tellReset(const ResetResult& result) {
+    std::cout << textOf({jobType, result.id}) << ": ";
+    if (!result.there) {
+        std::cout << "there is no such ticket\n";
+        return;
+    }
+    std::string text;
+    for (const auto& key : result.removed) {
+        text += (text.empty() ? "removed " : ", ") + key;
+    }
+    if (result.reopened) {
+        text += (text.empty() ? "" : "; ") + std::string("waits for its verification again");
+    }
+    std::cout << (text.empty() ? "nothing to do" : text) << '\n';
+}
+
+void reset(const Invocation& invocation, const ResetOptions& options) {
+    const int id = jobNumber(options.job);
+    std::vector<int> strips = {0, 1};
+    if (!options.strip.empty()) {
+        strips = {wholeNumber(options.strip, 1, 2, "strip") - 1};
+    }
+    const auto results = resetJob(*invocation.open(), id, strips, options.family);
+    if (!results[0].there) {
+        throw Failure(Status::NotThere, "there is no job " + std::to_string(id));
+    }
+    if (!invocation.json) {
+        std::for_each(results.begin(), results.end(), tellReset);
+        return;
+    }
+    std::vector<Row> rows;
+    for (const auto& result : results) {
+        rows.push_back({{"job", result.id},
+                        {"there", result.there},
+                        {"removed", result.removed},
+                        {"reopened", result.reopened}});
+    }
+    showRows({}, rows, true);
+}
+
+} // namespace
+
+void addJobCommands(CLI::App& program, Invocation& invocation) {
+    addCommand<NoOptions>(
+        program, invocation, "jobs", "List jobs and how far their verification is",
+        std::make_shared<NoOptions>(), [&](const NoOptions&) { list(invocation); })
+        .footer("STATE: waiting, passed, failed, or - for a job that is not verified. CODE is the "
+                "number that the\njob shows (211 passed, 212 failed). A strip that is measured "
+                "without a result was cut off.");
+
+    const auto options = std::make_shared<ResetOptions>();
+    auto& command = addCommand<ResetOptions>(
+        program, invocation, "reset", "Let a job be measured again", options,
+        [&](const ResetOptions& given) { reset(invocation, given); });
+    command.add_option("job", options->job, "Number of the job")->required();
+    command.add_option("--strip", options->strip, "1 or 2; both where this is left out");
+    command.add_flag("--family", options->family, "The jobs of the same parent and the parent too");
+    command.footer(
+        "For a job whose results were written in part only. Takes away the strip's count "
+        "of measurements and\nits approval, and offers the job to the verifier again if "
+        "it was closed. Measured values stay until\nnew ones take their place.");
+}
+
+} // namespace admin

@@ -1,0 +1,188 @@
+#include "companions/tintgate-store/Jobs.h"
+
+#include <algorithm>
+#include <set>
+
+#include "companions/tintgate-store/TicketName.h"
+
+namespace admin {
+
+namespace {
+
+constexpr int waiting = 208;
+constexpr int verified = 211;
+constexpr int verificationFailed = 212;
+constexpr int noVerification = 4096; ///< A file type that is never verified.
+constexpr int bothStrips = 3;        ///< Of "Workflow/Verify/Active".
+
+constexpr const char* displayKey = "Job/Display/Status";
+constexpr const char* showKey = "Remote/ShowInVerifier";
+constexpr const char* fileTypeKey = "Input/FileType";
+
+constexpr const char* roots[] = {"Remote/Measurement", "Remote/Measurement2"};
+
+std::string statusKey(int strip) {
+    return roots[strip] + std::string("/Status");
+}
+
+std::string approvalKey(int strip) {
+    return roots[strip] + std::string("/Approval");
+}
+
+/// The integer that a job's reader would find: the key's first element, if it is one.
+std::optional<int> integer(const std::shared_ptr<const store::Elements>& elements) {
+    const auto* value = elements ? elements->first() : nullptr;
+    const auto* number = value != nullptr ? std::get_if<int>(value) : nullptr;
+    return number != nullptr ? std::optional(*number) : std::nullopt;
+}
+
+std::string text(const std::shared_ptr<const store::Elements>& elements) {
+    const auto* value = elements ? elements->first() : nullptr;
+    const auto* bytes = value != nullptr ? std::get_if<store::Text>(value) : nullptr;
+    return bytes != nullptr ? bytes->bytes->text : std::string();
+}
+
+using Elements = std::shared_ptr<const store::Elements>;
+
+/// What each key says about a job.
+const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> readers = {
+    {"Input/Title", [](Job& job, const Elements& value) { job.title = text(value); }},
+    {"General/ParentID",
+     [](Job& job, const Elements& value) { job.parent = integer(value).value_or(0); }},
+    {displayKey,
+     [](Job& job, const Elements& value) { job.displayStatus = integer(value).value_or(0); }},
+    {showKey,
+     [](Job& job, const Elements& value) {
+         job.hasShowInVerifier = integer(value).has_value();
+         job.showInVerifier = integer(value).value_or(0);
+     }},
+    {fileTypeKey,
+     [](Job& job, const Elements& value) { job.fileType = integer(value).value_or(0); }},
+    {"Workflow/Verify/Active",
+     [](Job& job, const Elements& value) { job.twoStrips = integer(value) == bothStrips; }},
+    {statusKey(0),
+     [](Job& job, const Elements& value) {
+         job.strips[0].measurements = integer(value).value_or(0);
+     }},
+    {statusKey(1),
+     [](Job& job, const Elements& value) {
+         job.strips[1].measurements = integer(value).value_or(0);
+     }},
+    {approvalKey(0),
+     [](Job& job, const Elements& value) { job.strips[0].approval = integer(value); }},
+    {approvalKey(1),
+     [](Job& job, const Elements& value) { job.strips[1].approval = integer(value); }},
+};
+
+std::set<int> familyOf(store::StoreEngine& store, int id) {
+    const auto jobs = allJobs(store);
+    const auto self =
+        std::find_if(jobs.begin(), jobs.end(), [&](const Job& job) { return job.id == id; });
+    const int parent = self == jobs.end() ? 0 : self->parent;
+    std::set<int> ids;
+    if (parent > 0) {
+        ids.insert(parent);
+    }
+    for (const auto& job : jobs) {
+        if (job.parent == id || (parent > 0 && job.parent == parent)) {
+            ids.insert(job.id);
+        }
+    }
+    ids.erase(id);
+    return ids;
+}
+
+void removeKey(store::TicketContent& content, const std::string& key, ResetResult& result) {
+    if (!content.find(key)) {
+        return;
+    }
+    SETMULTIPAR table[2];
+    table[0].key = key.c_str();
+    table[0].position = POSITION_WHOLE;
+    content.apply(table);
+    result.removed.push_back(key);
+}
+
+/// Writing results ends with a 0 for the verifier. Where that was not there before, the job had
+/// another way to be found, and keeps it.
+void reopen(store::TicketContent& content, ResetResult& result) {
+    Job job;
+    for (const auto& [key, read] : readers) {
+        read(job, content.find(key));
+    }
+    if (job.waits() || !job.hasShowInVerifier) {
+        return;
+    }
+    auto shown = std::make_shared<store::Elements>();
+    shown->put(0, 1);
+    content.put(showKey, shown);
+    result.reopened = true;
+}
+
+ResetResult resetOne(store::StoreEngine& store, int id, const std::vector<int>& strips) {
+    store::Scope scope;
+    for (const char* const key : {displayKey, showKey, fileTypeKey}) {
+        scope.keys.emplace(key, true);
+    }
+    for (const int strip : strips) {
+        scope.keys.emplace(statusKey(strip), true);
+        scope.keys.emplace(approvalKey(strip), true);
+    }
+    ResetResult result;
+    result.id = id;
+    result.there = store.change(jobType, id, scope, [&](store::TicketContent& content) {
+        for (const int strip : strips) {
+            removeKey(content, statusKey(strip), result);
+            removeKey(content, approvalKey(strip), result);
+        }
+        reopen(content, result);
+    });
+    return result;
+}
+
+} // namespace
+
+bool Job::waits() const {
+    return (displayStatus == waiting || showInVerifier == 1) && fileType != noVerification;
+}
+
+std::string Job::state() const {
+    return waits()                               ? "waiting"
+           : displayStatus == verified           ? "passed"
+           : displayStatus == verificationFailed ? "failed"
+                                                 : "-";
+}
+
+std::vector<Job> allJobs(store::StoreEngine& store) {
+    std::vector<std::string> names;
+    for (const auto& [key, read] : readers) {
+        names.push_back(key);
+    }
+    std::map<int, Job> jobs;
+    for (const int id : store.ids(jobType)) {
+        jobs[id].id = id;
+    }
+    constexpr std::size_t anySize = static_cast<std::size_t>(-1) / 2;
+    store.keysOfAll(jobType, names, anySize, [&](int id, std::size_t name, Elements elements) {
+        jobs[id].id = id;
+        readers[name].second(jobs[id], elements);
+    });
+    std::vector<Job> sorted;
+    for (auto& [id, job] : jobs) {
+        sorted.push_back(std::move(job));
+    }
+    return sorted;
+}
+
+std::vector<ResetResult> resetJob(store::StoreEngine& store, int id, const std::vector<int>& strips,
+                                  bool family) {
+    std::vector<ResetResult> results = {resetOne(store, id, strips)};
+    if (family && results[0].there) {
+        for (const int relative : familyOf(store, id)) {
+            results.push_back(resetOne(store, relative, strips));
+        }
+    }
+    return results;
+}
+
+} // namespace admin

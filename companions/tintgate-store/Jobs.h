@@ -1,0 +1,56 @@
+// Jobs, as their verification goes.
+#pragma once
+
+#include <map>
+#include <optional>
+#include <string>
+#include <vector>
+
+#include "comgui/StoreEngine.h"
+
+namespace admin {
+
+/// What a job's ticket says of one strip.
+struct Strip {
+    int measurements = 0;
+    std::optional<int> approval; ///< 0 failed, above passed; there is no result below 0.
+};
+
+struct Job {
+    int id = 0;
+    int parent = 0;
+    std::string title;
+    int displayStatus = 0;
+    int showInVerifier = 0;
+    int fileType = 0;
+    bool twoStrips = false;
+    bool hasShowInVerifier = false;
+    Strip strips[2];
+
+    /// Whether a run that does not remeasure finds the job.
+    bool waits() const;
+    /// "passed", "failed" or "waiting"; else "-".
+    std::string state() const;
+};
+
+/// All jobs, by id.
+std::vector<Job> allJobs(store::StoreEngine& store);
+
+struct ResetResult {
+    int id = 0;
+    bool there = true; ///< False for a ticket that is missing.
+    std::vector<std::string> removed;
+    bool reopened = false;
+};
+
+/// Takes the results of strips away, so that a job whose write-back was cut off can run again: the
+/// count of measurements, without which the job is measured anew, and the approval, which would
+/// close a job of two strips too early. A job that the run had closed, and that nobody would find
+/// any more, is offered to the verifier again. One step for each ticket.
+///
+/// Strips are 0 and 1. With family: also for all jobs of the same parent, for the parent, and for
+/// all jobs whose parent this one is. The job itself comes first.
+std::vector<ResetResult> resetJob(store::StoreEngine& store, int id, const std::vector<int>& strips,
+                                  bool family);
+
+} // namespace admin

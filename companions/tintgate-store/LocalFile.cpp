@@ -1,0 +1,117 @@
+#include "companions/tintgate-store/LocalFile.h"
+
+#include <cerrno>
+#include <cstring>
+#include <filesystem>
+#include <iostream>
+
+#include <unistd.h>
+
+#include "companions/tintgate-store/Bytes.h"
+#include "companions/tintgate-store/Failure.h"
+
+namespace admin {
+
+namespace {
+
+namespace fs = std::filesystem;
+
+[[noreturn]] void fail(const std::string& path, const char* what) {
+    const std::string reason = errno != 0 ? std::string(": ") + std::strerror(errno) : "";
+    throw Failure(Status::LocalFile, printable(path) + " can't be " + what + reason);
+}
+
+/// Writes to a path where nothing but the content is to be; it goes if that fails.
+class Part {
+  public:
+    explicit Part(std::string path) : m_path(std::move(path)) {}
+    ~Part() {
+        if (!m_path.empty()) {
+            unlink(m_path.c_str());
+        }
+    }
+    Part(const Part&) = delete;
+    Part& operator=(const Part&) = delete;
+
+    const std::string& path() const { return m_path; }
+    bool moveTo(const std::string& target) {
+        if (std::rename(m_path.c_str(), target.c_str()) != 0) {
+            return false;
+        }
+        m_path.clear();
+        return true;
+    }
+
+  private:
+    std::string m_path;
+};
+
+void writeTo(const std::string& file, const std::string& shown,
+             const std::function<void(std::ostream&)>& write) {
+    errno = 0;
+    std::ofstream stream(file, std::ios::binary);
+    if (!stream) {
+        fail(shown, "written");
+    }
+    write(stream);
+    errno = 0;
+    stream.close();
+    if (!stream) {
+        fail(shown, "written");
+    }
+}
+
+} // namespace
+
+LocalInput::LocalInput(const std::string& path) : m_standardInput(path == "-") {
+    if (m_standardInput) {
+        return;
+    }
+    errno = 0;
+    m_file.open(path, std::ios::binary);
+    if (m_file && fs::is_directory(path)) {
+        errno = EISDIR;
+        m_file.close();
+        fail(path, "read");
+    }
+    if (!m_file) {
+        fail(path, "read");
+    }
+}
+
+std::istream& LocalInput::stream() {
+    return m_standardInput ? std::cin : m_file;
+}
+
+void writeLocalFile(const std::string& path, const std::function<void(std::ostream&)>& write) {
+    if (path == "-") {
+        write(std::cout);
+        return;
+    }
+    std::error_code ignored;
+    const std::string target = fs::weakly_canonical(path, ignored).string();
+    const auto kind = fs::status(target, ignored).type();
+    if (ignored || target.empty() ||
+        (kind != fs::file_type::not_found && kind != fs::file_type::regular)) {
+        writeTo(path, path, write);
+        return;
+    }
+    Part part(target + ".part-" + std::to_string(getpid()));
+    writeTo(part.path(), path, write);
+    if (kind == fs::file_type::regular) {
+        fs::permissions(part.path(), fs::status(target, ignored).permissions(), ignored);
+    }
+    if (!part.moveTo(target)) {
+        fail(path, "written");
+    }
+}
+
+void finishStandardOutput() {
+    errno = 0;
+    std::cout.flush();
+    if (!std::cout) {
+        fail("standard output", "written");
+    }
+}
+
+} // namespace admin

@@ -1,0 +1,169 @@
+#include "companions/tintgate-store/TicketsFile.h"
+
+#include <istream>
+#include <ostream>
+#include <set>
+
+#include "companions/tintgate-store/ElementsJson.h"
+#include "companions/tintgate-store/Failure.h"
+#include "ticket/TicketRecords.h"
+
+namespace admin {
+
+namespace {
+
+constexpr const char* formatName = "tintgate tickets";
+constexpr int formatVersion = 1;
+
+[[noreturn]] void refuse(const std::string& text) {
+    throw Failure(Status::BadInput, text);
+}
+
+/// Parses, and refuses an object that has a member twice: JSON readers differ in which one counts.
+Json parse(std::istream& from) {
+    std::vector<std::set<std::string>> members;
+    const auto watch = [&](int, Json::parse_event_t event, Json& parsed) {
+        if (event == Json::parse_event_t::object_start) {
+            members.emplace_back();
+        } else if (event == Json::parse_event_t::object_end) {
+            members.pop_back();
+        } else if (event == Json::parse_event_t::key &&
+                   !members.back().insert(parsed.get<std::string>()).second) {
+            refuse("\"" + printable(parsed.get<std::string>()) + "\" stands there twice");
+        }
+        return true;
+    };
+    try {
+        return Json::parse(from, watch);
+    } catch (const Json::exception& failure) {
+        const std::string text = failure.what();
+        refuse("no JSON: " + printable(text.substr(std::min(text.size(), text.find("] ") + 2))));
+    }
+}
+
+/// Refuses members that are not in the list.
+void allow(const Json& object, const std::set<std::string>& names, const std::string& what) {
+    if (!object.is_object()) {
+        refuse(what + " is no object");
+    }
+    for (const auto& [name, member] : object.items()) {
+        if (names.count(name) == 0) {
+            refuse(what + " has an unknown member \"" + printable(name) + "\"");
+        }
+    }
+}
+
+/// A whole number in its limits, else -1.
+int numberAt(const Json& object, const char* name, int highest) {
+    if (!object.contains(name) || !object[name].is_number_integer()) {
+        return -1;
+    }
+    const auto number = object[name].get<std::int64_t>();
+    return number < 0 || number > highest ? -1 : static_cast<int>(number);
+}
+
+void putKey(NamedTicket& ticket, const std::string& key, const Json& elements) {
+    const std::string where = textOf(ticket.name) + ", key \"" + printable(key) + "\": ";
+    if (key.empty() || key.back() == '*' || key.find('\0') != std::string::npos) {
+        refuse(where + "a key is not empty, does not end in * and holds no zero byte");
+    }
+    if (ticket.content.find(key)) {
+        refuse(where + "it stands there twice");
+    }
+    try {
+        ticket.content.put(key, elementsFromJson(elements));
+    } catch (const Failure& failure) {
+        refuse(where + failure.what());
+    }
+}
+
+NamedTicket ticketFrom(const Json& json) {
+    allow(json, {"type", "id", "keys", "byteKeys"}, "a ticket");
+    NamedTicket ticket;
+    ticket.name = {numberAt(json, "type", 0xFFFF), numberAt(json, "id", 0xFFFFFFF)};
+    if (!TICKET_Valid(ticket.name.type, ticket.name.id)) {
+        refuse("a ticket's type is 0 to 49 and its id 0 to 16777215");
+    }
+    if (!json.contains("keys")) {
+        refuse(textOf(ticket.name) + " has no \"keys\"");
+    }
+    for (const char* const name : {"keys", "byteKeys"}) {
+        if (json.contains(name) && !json[name].is_object()) {
+            refuse(textOf(ticket.name) + ": \"" + name + "\" is no object");
+        }
+    }
+    for (const auto& [key, elements] : json["keys"].items()) {
+        putKey(ticket, key, elements);
+    }
+    if (json.contains("byteKeys")) {
+        for (const auto& [text, elements] : json["byteKeys"].items()) {
+            const auto key = fromBase64(text);
+            if (!key) {
+                refuse(textOf(ticket.name) + ": \"" + printable(text) + "\" is no base64");
+            }
+            putKey(ticket, *key, elements);
+        }
+    }
+    return ticket;
+}
+
+std::string inOneLine(const Json& json) {
+    return json.dump(-1, ' ', true);
+}
+
+} // namespace
+
+std::vector<NamedTicket> readTickets(std::istream& from) {
+    const Json file = parse(from);
+    if (!file.is_object() || file.value("format", Json()) != formatName) {
+        refuse(std::string("\"format\" is not \"") + formatName + "\"");
+    }
+    if (numberAt(file, "version", formatVersion) != formatVersion) {
+        refuse("\"version\" is not " + std::to_string(formatVersion));
+    }
+    allow(file, {"format", "version", "tickets"}, "the file");
+    if (!file.contains("tickets") || !file["tickets"].is_array()) {
+        refuse("\"tickets\" is no list");
+    }
+    std::vector<NamedTicket> tickets;
+    std::set<TicketName> seen;
+    for (const auto& json : file["tickets"]) {
+        tickets.push_back(ticketFrom(json));
+        if (!seen.insert(tickets.back().name).second) {
+            refuse(textOf(tickets.back().name) + " stands there twice");
+        }
+    }
+    return tickets;
+}
+
+TicketsWriter::TicketsWriter(std::ostream& to) : m_to(to) {
+    m_to << "{\n  \"format\": " << inOneLine(formatName) << ",\n  \"version\": " << formatVersion
+         << ",\n  \"tickets\": [";
+}
+
+void TicketsWriter::add(const TicketName& name, const store::TicketContent& content) {
+    m_to << (m_first ? "\n" : ",\n") << "    {\n      \"type\": " << name.type
+         << ",\n      \"id\": " << name.id;
+    m_first = false;
+    for (const bool utf8 : {true, false}) {
+        std::string lines;
+        for (const auto& [key, elements] : content.keys()) {
+            if (isUtf8(key) == utf8) {
+                lines += (lines.empty() ? "\n        " : ",\n        ") +
+                         inOneLine(utf8 ? key : toBase64(key)) + ": " +
+                         inOneLine(elementsJson(*elements));
+            }
+        }
+        if (utf8 || !lines.empty()) {
+            m_to << ",\n      \"" << (utf8 ? "keys" : "byteKeys") << "\": {" << lines
+                 << (lines.empty() ? "}" : "\n      }");
+        }
+    }
+    m_to << "\n    }";
+}
+
+void TicketsWriter::finish() {
+    m_to << (m_first ? "]\n}\n" : "\n  ]\n}\n");
+}
+
+} // namespace admin

@@ -1,0 +1,100 @@
+#include <iostream>
+
+#include "comgui/Users.h"
+#include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Credentials.h"
+#include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/Rows.h"
+
+namespace admin {
+
+namespace {
+
+struct UserOptions {
+    std::string name;
+    std::string passwordFile;
+};
+
+store::User userNamed(store::StoreEngine& store, const std::string& typed) {
+    auto user = store.user(userName(typed));
+    if (!user) {
+        throw Failure(Status::NotThere, "there is no user " + typed);
+    }
+    return *user;
+}
+
+void add(const Invocation& invocation, const UserOptions& options) {
+    const std::string name = userName(options.name);
+    const auto store = invocation.open();
+    if (store->user(name)) {
+        throw Failure(Status::Exists, "there is a user " + options.name);
+    }
+    const std::string password = askPassword(options.passwordFile, options.name);
+    store->putUser({name, store::passwordHash(password), false});
+}
+
+void changePassword(const Invocation& invocation, const UserOptions& options) {
+    const auto store = invocation.open();
+    userNamed(*store, options.name);
+    const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
+    // Fetched again: a person may take minutes to type a password.
+    store::User user = userNamed(*store, options.name);
+    user.passwordHash = hash;
+    store->putUser(user);
+}
+
+void setDisabled(const Invocation& invocation, const UserOptions& options, bool disabled) {
+    const auto store = invocation.open();
+    store::User user = userNamed(*store, options.name);
+    user.disabled = disabled;
+    store->putUser(user);
+}
+
+void remove(const Invocation& invocation, const UserOptions& options) {
+    const auto store = invocation.open();
+    if (!store->removeUser(userNamed(*store, options.name).name)) {
+        throw Failure(Status::NotThere, "there is no user " + options.name);
+    }
+}
+
+void list(const Invocation& invocation) {
+    std::vector<Row> rows;
+    for (const auto& user : invocation.open()->users()) {
+        rows.push_back(
+            {{"name", shownName(user.name)}, {"state", user.disabled ? "disabled" : "enabled"}});
+    }
+    showRows({{"name", "NAME"}, {"state", "STATE"}}, rows, invocation.json);
+}
+
+} // namespace
+
+void addUserCommands(CLI::App& program, Invocation& invocation) {
+    auto& group = addGroup(program, "user", "Users, who can log in and see all of the store");
+    const auto options = std::make_shared<UserOptions>();
+    const auto command = [&](const char* word, const char* text, auto run) -> CLI::App& {
+        auto& added = addCommand<UserOptions>(
+            group, invocation, word, text, options,
+            [&invocation, run](const UserOptions& given) { run(invocation, given); });
+        added.add_option("name", options->name, "The user's name")->required();
+        return added;
+    };
+    const auto withPassword = [&](CLI::App& added) {
+        added.add_option("--password-file", options->passwordFile,
+                         "File whose first line is the password; - for standard input");
+        added.footer("Without --password-file the password is asked for, without echo. It never "
+                     "stands on the\ncommand line, where everybody could see it.");
+    };
+    withPassword(command("add", "Add a user", add));
+    withPassword(command("password", "Set a user's password", changePassword));
+    command("disable", "Let a user log in no more",
+            [](const auto& invoked, const auto& given) { setDisabled(invoked, given, true); });
+    command("enable", "Let a user log in again",
+            [](const auto& invoked, const auto& given) { setDisabled(invoked, given, false); });
+    command("remove", "Remove a user", remove);
+    addCommand<UserOptions>(group, invocation, "list", "List users", options,
+                            [&](const UserOptions&) { list(invocation); });
+    group.footer("Names and passwords have 1 to 127 characters, none above U+00FF: a login brings "
+                 "one byte for each.");
+}
+
+} // namespace admin

@@ -1,0 +1,159 @@
+// The administration tool of a store: users, tickets, files and jobs.
+#include <algorithm>
+#include <cstdio>
+#include <exception>
+#include <filesystem>
+#include <new>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "companions/tintgate-store/Bytes.h"
+#include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/LocalFile.h"
+
+namespace {
+
+using admin::Status;
+
+/// The longest path that a job can name as its server.
+constexpr std::size_t longestAddress = 127;
+
+constexpr const char* footer = R"(
+Examples:
+  tintgate-store --store /srv/tintgate make --name "Print room"
+  export TINTGATE_STORE=/srv/tintgate     from here on --store may be left out
+  tintgate-store user add anna            asks for the password
+  tintgate-store import tickets.json
+  tintgate-store file put chart.it8 /server/ControlCharts/chart.it8
+  tintgate-store jobs
+  tintgate-store key list job/7 Workflow/
+  tintgate-store key set job/7 Input/Title string "Summer catalogue"
+  tintgate-store export job/7 -o job-7.json
+  tintgate-store file versions /jobs/7/job.jdf
+  tintgate-store reset 7 --strip 1
+
+Each command has a --help of its own. docs/stores.md shows how to set up a whole job.
+
+Exit status:
+   0  done
+   1  there is no such ticket, key, user, file or version
+   2  there is one already
+   3  a value, name, password or JSON file is refused; nothing was changed
+   4  there is no store at that address
+   5  the store is of an older format: tintgate-store upgrade
+   6  the store is of a newer format: use the newer program
+   7  the store can't be written by this user
+   8  there is no room left
+   9  others held the store for too long: try again
+  10  the store is damaged
+  11  the server path leads to no file inside the store
+  12  a file of this machine can't be read or written
+  13  anything else; the message tells
+  64  the command line is not understood)";
+
+int end(Status status) {
+    return static_cast<int>(status);
+}
+
+int fail(Status status, const char* text) {
+    std::fprintf(stderr, "tintgate-store: %s\n", admin::printable(text).c_str());
+    return end(status);
+}
+
+void warnOfLongAddress(const std::string& address) {
+    std::error_code none;
+    const auto length = std::filesystem::absolute(address, none).string().size();
+    if (length > longestAddress) {
+        std::fprintf(stderr,
+                     "tintgate-store: warning: the store's path has %zu bytes; a job can name at "
+                     "most %zu\n",
+                     length, longestAddress);
+    }
+}
+
+// CLI11 takes "[a,b]" for a list of two values, "-Infinity" for options, and lets an inner command
+// have nothing of what stands behind "--". Such arguments are marked while it parses.
+constexpr char mark = '\x01';
+
+std::vector<std::string> markedArguments(int count, char** arguments) {
+    std::vector<std::string> result;
+    bool values = false; // "--" has been.
+    for (int i = 1; i < count; ++i) {
+        const std::string argument = arguments[i];
+        if (!values && argument == "--") {
+            values = true;
+            continue;
+        }
+        const bool list = !argument.empty() && argument.front() == '[' && argument.back() == ']';
+        const bool marks = values || list || argument == "-Infinity" || argument[0] == mark;
+        result.push_back(marks ? mark + argument : argument);
+    }
+    return result;
+}
+
+std::string unmarked(const std::string& argument) {
+    return argument[0] == mark ? argument.substr(1) : argument;
+}
+
+void unmarkOptions(CLI::App& command) {
+    for (auto* option : command.get_options()) {
+        if (option->get_items_expected_max() > 0) {
+            option->transform(unmarked);
+        }
+    }
+    for (auto* below : command.get_subcommands([](CLI::App*) { return true; })) {
+        unmarkOptions(*below);
+    }
+}
+
+int run(const admin::Invocation& invocation) {
+    try {
+        if (!invocation.address.empty()) {
+            warnOfLongAddress(invocation.address);
+        }
+        invocation.action();
+        admin::finishStandardOutput();
+        return end(Status::Done);
+    } catch (const admin::Failure& failure) {
+        return fail(failure.status, failure.what());
+    } catch (const store::StoreFailure& failure) {
+        return fail(admin::statusOf(failure.fault), failure.what());
+    } catch (const std::bad_alloc&) {
+        return fail(Status::Full, "there is not enough memory");
+    } catch (const std::filesystem::filesystem_error& failure) {
+        return fail(Status::LocalFile, failure.what());
+    } catch (const std::exception& failure) {
+        return fail(Status::Other, failure.what());
+    }
+}
+
+} // namespace
+
+int main(int argumentCount, char** arguments) {
+    CLI::App program("Sets up and looks after a store: the tickets, users and files of a server.",
+                     "tintgate-store");
+    admin::Invocation invocation;
+    program.fallthrough();
+    program.require_subcommand(1);
+    program.add_option("-s,--store", invocation.address, "The store's folder")
+        ->envname("TINTGATE_STORE");
+    program.add_flag("--json", invocation.json, "Lists and values as JSON, for scripts");
+    admin::addStoreCommands(program, invocation);
+    admin::addUserCommands(program, invocation);
+    admin::addTicketCommands(program, invocation);
+    admin::addKeyCommands(program, invocation);
+    admin::addFileCommands(program, invocation);
+    admin::addJobCommands(program, invocation);
+    program.footer(footer);
+    unmarkOptions(program);
+    auto words = markedArguments(argumentCount, arguments);
+    std::reverse(words.begin(), words.end()); // As CLI11 wants them.
+    try {
+        program.parse(std::move(words));
+    } catch (const CLI::ParseError& failure) {
+        return program.exit(failure) == 0 ? end(Status::Done) : end(Status::BadCommand);
+    }
+    return run(invocation);
+}
