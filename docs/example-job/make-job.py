@@ -1,0 +1,238 @@
+#!/usr/bin/env python3
+"""Makes a complete job for a store: tickets, and the files that they name.
+
+The job asks whether a print on super-calendered paper (measured: FOGRA40L) keeps to the printing
+condition for coated paper (references: FOGRA39L). Both data sets are in Debian's icc-profiles-free.
+
+  make-job.py FOLDER          then, with the store made:
+  tintgate-store import FOLDER/tickets.json
+  tintgate-store file put FOLDER/server /server
+"""
+
+import argparse
+import json
+import math
+import shutil
+import sys
+import xml.etree.ElementTree as xml
+from pathlib import Path
+
+HERE = Path(__file__).resolve().parent
+ICC = Path("/usr/share/color/icc")
+PRESETS = (HERE.parents[1] / "presets", HERE.parents[2] / "tintgate/presets")  # Source, installed.
+
+INSTALL = "/server"  # The server's own folder, as its jobs name it.
+TEMP = "/server/temp"
+STRIP = "example"
+DEVICE = 33  # Number of the instrument; the names file of docs/instruments.md has its name.
+JDF_BYTES = 8192  # Updates of a JDF want 5,000 at least; blanks behind the end fill it up.
+STRIP_COLUMNS = 16
+
+FIELDS = ("XYZ_X", "XYZ_Y", "XYZ_Z", "LAB_L", "LAB_A", "LAB_B")
+GREYS = ((10, 6, 6), (20, 12, 12), (40, 27, 27), (60, 45, 45), (80, 65, 65), (100, 85, 85))
+
+
+def read_chart(path):
+    """Device values in percent to the six values of FIELDS, of the first patch that has them."""
+    lines = iter(path.read_text(encoding="latin-1").splitlines())
+    for line in lines:
+        if line.strip() == "BEGIN_DATA_FORMAT":
+            fields = next(lines).split()
+        if line.strip() == "BEGIN_DATA":
+            break
+    patches = {}
+    for line in lines:
+        if line.strip() == "END_DATA":
+            break
+        row = dict(zip(fields, line.split()))
+        device = tuple(float(row["CMYK_" + ink]) for ink in "CMYK")
+        patches.setdefault(device, [float(row[field]) for field in FIELDS])
+    return patches
+
+
+def strip_patches():
+    """A strip as contract proofs have it: paper, ramps of each ink, overprints, greys, mixtures."""
+    patches = [(0, 0, 0, 0)]
+    for ink in range(4):
+        for tone in (10, 20, 40, 70, 100):
+            patches.append(tuple(tone if i == ink else 0 for i in range(4)))
+    for tone in (40, 70, 100):
+        patches += [(0, tone, tone, 0), (tone, 0, tone, 0), (tone, tone, 0, 0)]
+    patches += [(*grey, 0) for grey in GREYS]
+    patches += [(0, 0, 0, 60), (0, 0, 0, 80), (100, 100, 100, 0)]
+    patches += [(100, 40, 0, 0), (40, 100, 0, 0), (0, 100, 40, 0), (0, 40, 100, 0),
+                (40, 0, 100, 0), (100, 0, 40, 0), (40, 40, 40, 0), (70, 40, 40, 0),
+                (10, 40, 40, 0)]
+    return [tuple(float(tone) for tone in patch) for patch in patches]
+
+
+def criteria_entries():
+    """From the table of docs/criteria.md: name of a criterion to its entry in a preset's arrays."""
+    entries = {}
+    for line in (HERE.parent / "criteria.md").read_text(encoding="utf-8").splitlines():
+        cells = [cell.strip() for cell in line.split("|")]
+        if len(cells) > 3 and cells[1].isdigit():
+            entries[cells[2].strip("`")] = int(cells[1])
+    return entries
+
+
+def preset_keys(path):
+    """The ticket of a tolerance preset, from its file."""
+    preset = xml.parse(path).getroot()
+    used, tolerances, decimals = [0] * 32, [0.0] * 32, [0] * 32
+    entries = criteria_entries()
+    for criterion in preset.find("criteria"):
+        entry = entries[criterion.tag]
+        used[entry] = int(criterion.get("used") == "yes")
+        tolerances[entry] = float(criterion.get("tolerance"))
+        decimals[entry] = int(criterion.get("decimals"))
+
+    def yes(name):
+        return {"int": int(preset.findtext(name) == "yes")}
+
+    return {
+        "Name": {"string": preset.findtext("name")},
+        "Editable": yes("editable"),
+        "ShowInClient": yes("showInClient"),
+        "UsedForDynamicWedge": yes("usedForDynamicWedge"),
+        "IlluminationCondition": {"int": int(preset.findtext("illuminationCondition"))},
+        "FograPSDPreset": yes("psd"),
+        "Values/UsedForResult": {"int": used},
+        "Values/Preset": {"double": tolerances},
+        "Values/DecimalPlaces": {"int": decimals},
+    }
+
+
+def value_keys(root, chart, patches):
+    """XYZ (0 to 100) and Lab, one key for each column."""
+    columns = list(zip(*(chart[patch] for patch in patches)))
+    names = [f"XYZValues/{axis}Values" for axis in "XYZ"]
+    names += [f"LabValues/{axis}Values" for axis in "LAB"]
+    return {f"{root}/{name}": {"double": list(column)} for name, column in zip(names, columns)}
+
+
+def job_keys(arguments, preset_id, patches, measured, references):
+    root = "Remote/Measurement"
+    keys = {
+        # What it is, and that it waits for its verification.
+        "Input/Title": {"string": "Summer catalogue, sheet 1"},
+        "Input/SubType": {"int": 0},
+        "Input/FileType": {"int": 0},
+        "Job/Display/Status": {"int": 208},
+        "Job/FromEsko": {"int": 0},
+        "Remote/ShowInVerifier": {"int": 1},
+        "General/ParentID": {"int": 0},
+        "CMM/PaperName": {"string": "Super-calendered, 60 g/m2"},
+        # Where the server keeps its files: server paths.
+        "System/InstallFolder": {"string": INSTALL},
+        "System/Folders/Temp": {"string": TEMP},
+        "Output/Jdf/FileName": {"string": f"job-{arguments.job}.jdf"},
+        # How it is verified: one strip, stored references, CIEDE2000, the preset.
+        "Workflow/Name": {"string": "Verification of proofs"},
+        "Workflow/Verify/Active": {"int": 1},
+        "Workflow/Verify/MeasurementWorkflow": {"int": 3},
+        "Workflow/Verify/DeltaEMode": {"int": 4},
+        "Workflow/Verify/ComparisonMethod": {"int": preset_id},
+        # The control strip.
+        "Footer/Dynstrip/UseDynstrip": {"int": 0},
+        "Footer/ControlstripFile": {"string": f"{STRIP}.it8"},
+        # The measurement: how many there have been, and its values. CMYK is in percent.
+        f"{root}/Status": {"int": 1},
+        f"{root}/Illumination/Mode": {"int": 1},
+        f"{root}/Numpatches": {"int": len(patches)},
+        # No spectra. The three keys must be there all the same.
+        f"{root}/SpectralValues/Base": {"int": 380},
+        f"{root}/SpectralValues/Length": {"int": 0},
+        f"{root}/SpectralValues/Stepsize": {"int": 10},
+        # The references, CMYK from 0 to 255.
+        f"{root}/Reference/Numpatches": {"int": len(patches)},
+    }
+    keys.update(value_keys(root, measured, patches))
+    keys.update(value_keys(f"{root}/Reference", references, patches))
+    for index, ink in enumerate("CMYK"):
+        tones = [patch[index] for patch in patches]
+        keys[f"{root}/CMYKValues/{ink}Values"] = {"double": tones}
+        keys[f"{root}/Reference/CMYKValues/{ink}Values"] = {
+            "int": [math.floor(tone * 2.55 + 0.5) for tone in tones]}
+    return keys
+
+
+def strip_text(patches, references):
+    """The control strip, in rows of STRIP_COLUMNS; the value of DEVICE must be the first line that
+    has that word."""
+    rows = len(patches) // STRIP_COLUMNS
+    lines = ["CGATS.17", f"DEVICE {DEVICE}", f"NUMBER_OF_STRIPS {rows}",
+             f"NUMBER_OF_COLS {STRIP_COLUMNS}", "NUMBER_OF_FIELDS 11", "BEGIN_DATA_FORMAT",
+             "\t".join(["SAMPLE_ID", "CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K", "LAB_L", "LAB_A",
+                        "LAB_B", "XYZ_X", "XYZ_Y", "XYZ_Z"]),
+             "END_DATA_FORMAT", f"NUMBER_OF_SETS {len(patches)}", "BEGIN_DATA"]
+    for number, patch in enumerate(patches, 1):
+        values = references[patch]
+        lines.append("\t".join([str(number)] + [f"{value:.2f}" for value in
+                                                (*patch, *values[3:], *values[:3])]))
+    return "\r\n".join(lines + ["END_DATA", ""])
+
+
+def jdf_text(arguments):
+    text = f"""<?xml version="1.0" encoding="UTF-8"?>
+<JDF xmlns="http://www.CIP4.org/JDFSchema_1_1" xmlns:xsi="http://www.w3.org/2001/XMLSchema-instance"
+     ID="J{arguments.job}" JobID="{arguments.job}" JobPartID="1" Type="Combined"
+     Types="ColorSpaceConversion DigitalPrinting" Status="Waiting" Version="1.4">
+  <AuditPool>
+    <Created AgentName="make-job.py" ID="A1" TimeStamp="2024-01-01T12:00:00Z"/>
+  </AuditPool>
+  <ResourcePool>
+    <Media ID="M1" Class="Consumable" Status="Available" MediaType="Paper" Weight="60"/>
+  </ResourcePool>
+  <ResourceLinkPool>
+    <MediaLink rRef="M1" Usage="Input"/>
+  </ResourceLinkPool>
+</JDF>
+"""
+    return text + " " * (JDF_BYTES - len(text))
+
+
+def parse_arguments():
+    parser = argparse.ArgumentParser(description=__doc__,
+                                     formatter_class=argparse.RawDescriptionHelpFormatter)
+    default = next((str(folder) for folder in PRESETS if folder.is_dir()), ".")
+    parser.add_argument("folder", type=Path, help="is made, or filled")
+    parser.add_argument("--job", type=int, default=7, help="number of the job (default 7)")
+    parser.add_argument("--measured", type=Path, default=ICC / "FOGRA40L.ti3",
+                        help="chart with the measured values")
+    parser.add_argument("--references", type=Path, default=ICC / "FOGRA39L.ti3",
+                        help="chart with the reference values")
+    parser.add_argument("--preset", type=Path, default=Path(default) / "CVP_0001.xml",
+                        help="file of the tolerance preset")
+    return parser.parse_args()
+
+
+def main():
+    arguments = parse_arguments()
+    for path in (arguments.measured, arguments.references, arguments.preset):
+        if not path.is_file():
+            sys.exit(f"{path} is not there (the charts are in the package icc-profiles-free)")
+    measured, references = read_chart(arguments.measured), read_chart(arguments.references)
+    patches = [patch for patch in strip_patches() if patch in measured and patch in references]
+    patches = patches[:len(patches) // STRIP_COLUMNS * STRIP_COLUMNS]
+
+    preset_id = int(xml.parse(arguments.preset).getroot().findtext("id"))
+    tickets = {"format": "tintgate tickets", "version": 1, "tickets": [
+        {"type": 27, "id": preset_id, "keys": preset_keys(arguments.preset)},
+        {"type": 3, "id": arguments.job,
+         "keys": job_keys(arguments, preset_id, patches, measured, references)}]}
+
+    server = arguments.folder / "server"
+    for name in ("ControlCharts", "tickets", "temp"):
+        (server / name).mkdir(parents=True, exist_ok=True)
+    (arguments.folder / "tickets.json").write_text(json.dumps(tickets, indent=1) + "\n",
+                                                   encoding="ascii")
+    (server / f"ControlCharts/{STRIP}.it8").write_bytes(
+        strip_text(patches, references).encode("ascii"))
+    shutil.copyfile(arguments.preset, server / f"tickets/CVP_{preset_id:04}.xml")
+    (server / f"temp/job-{arguments.job}.jdf").write_text(jdf_text(arguments), encoding="ascii")
+    print(f"Job {arguments.job} with {len(patches)} patches is in {arguments.folder}")
+
+
+if __name__ == "__main__":
+    main()
