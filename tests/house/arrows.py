@@ -31,7 +31,8 @@ ARROWS = {
     "job": "comm jdf records log helper text libTintgate",
     "Tintgate": "job log records platform libTintgate",
     "colour": "",
-    "report": "",
+    "report": "colour",
+    "viewer": "report platform",
     "analysis": "colour records",  # libTintgate without its ten functions' names
     "libTintgate": "analysis colour records",
     "ticketengine": "ticketrecords",
@@ -46,6 +47,7 @@ EXPOSES = {
     "commrecords": "platformrecords ticketrecords",
     "comm": "commrecords ticket",
     "platform": "platformrecords",
+    "report": "colour",
     "analysis": "records",
     "ticket": "ticketrecords",
     "ticketengine": "ticketrecords",

@@ -1,0 +1,29 @@
+// What is known of a job beside its colours, read back from its JSON (docs/meta.schema.json).
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+
+namespace report {
+
+/// Texts are empty where nothing is known.
+struct Meta {
+    std::string created; ///< Local time: 2024-05-01T12:34:56+02:00.
+    std::int64_t jobId = 0;
+    std::optional<std::int64_t> parentId;
+    std::string title;
+    int strip = 1;
+    std::string instrument;
+    std::string paper;
+    std::string workflow;
+    std::string server;
+    std::string user;
+};
+
+/// Nothing where the text is no meta file of a format that this version knows; `problem` then says
+/// why.
+std::optional<Meta> readMeta(std::string_view json, std::string& problem);
+
+} // namespace report

@@ -1,0 +1,92 @@
+// The result of a comparison, read back from its JSON (docs/result.md).
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "colour/DataSet.h"
+
+namespace report {
+
+enum class Verdict { Passed, Failed, Incomplete };
+enum class Outcome { Pass, Fail, Unanswered, Unjudged };
+
+struct Criterion {
+    std::string name; ///< Such as "average"; docs/criteria.md lists them.
+    std::string title;
+    std::string unit; ///< "dE", "dH" or "dCh".
+    bool used = false;
+    Outcome outcome = Outcome::Unjudged;
+    std::optional<double> tolerance;
+    std::optional<double> value;
+    std::optional<double> rounded; ///< The value that was judged.
+    int decimals = 2;              ///< 0 to 6.
+    std::size_t patches = 0;
+    std::optional<std::size_t> worstPatch; ///< Index into `patches`.
+};
+
+/// Numbers are NaN where the result has null.
+struct Patch {
+    std::string id;
+    std::string name;
+    colour::Lab target;
+    colour::Lab measured;
+    double difference = 0;
+};
+
+/// One side of the comparison, with what its file says of itself. Empty where it says nothing.
+struct Input {
+    std::string path;
+    std::string kind; ///< "text" or "profile".
+    std::vector<std::pair<std::string, std::string>> statements;
+};
+
+struct Statistics {
+    double mean = 0;
+    double median = 0;
+    double percentile95 = 0;
+    double maximum = 0;
+    double standardDeviation = 0;
+};
+
+struct Unpaired {
+    std::size_t count = 0;
+    std::vector<std::string> labels; ///< Ids or names of the first `Result::mostLabels` of them.
+};
+
+struct Result {
+    static constexpr std::size_t mostLabels = 20;
+
+    std::string toolVersion;
+    std::string libraryVersion;
+    Verdict verdict = Verdict::Incomplete;
+    std::string formula; ///< Such as "CIE2000".
+    std::string presetName;
+    std::int64_t presetId = 0;
+    Input target;
+    Input measurement;
+    std::optional<Input> patchSet;
+    std::string selection;     ///< Whose patches: "target", "measurement" or "patchSet".
+    std::string measurementBy; ///< How the measured patches were found (docs/result.md).
+    std::string targetBy;
+    Statistics statistics;
+    std::vector<Criterion> criteria;
+    std::vector<std::string> warnings;
+    Unpaired unpairedTarget;
+    Unpaired unpairedMeasurement;
+    Unpaired unpairedPatchSet;
+    std::vector<std::string> channels; ///< Names of the device values.
+    std::vector<Patch> patches;        ///< In the result's order.
+    std::vector<double> device;        ///< Percent; channels.size() for each patch.
+};
+
+/// Reads a whole result, patches row by row without a tree of them. Nothing where the text is no
+/// result of a format that this version knows; `problem` then says why.
+std::optional<Result> readResult(std::string_view json, std::string& problem);
+
+} // namespace report

@@ -1,0 +1,427 @@
+
+"use strict";
+// Shows the data that stands in this page. Texts of tickets and files are set as text, never as
+// markup.
+(() => {
+  const data = JSON.parse(document.getElementById("data").textContent);
+  const byId = (id) => document.getElementById(id);
+  const signs = { passed: "✓", failed: "✕", incomplete: "?", unjudged: "" };
+
+  // Fields of a row.
+  const [INDEX, ID, NAME, DEVICE, TARGET, MEASURED, DELTA, DIFFERENCE, TARGET_SWATCH,
+    MEASURED_SWATCH] = Array(10).keys();
+
+  function make(tag, className, text) {
+    const element = document.createElement(tag);
+    if (className) element.className = className;
+    if (text !== undefined) element.textContent = text;
+    return element;
+  }
+
+  const fixed = (value, decimals) =>
+    value === null ? "–" : value.toFixed(decimals).replace(/^-(0\.?0*)$/, "$1");
+  const signed = (value) => (value > 0 ? "+" : "") + fixed(value, 2);
+
+  // ---- The top of the page
+
+  function showHead() {
+    document.title = `${data.word} – ${data.title}`;
+    byId("title").textContent = data.title;
+    byId("subtitle").textContent = data.subtitle;
+    byId("verdict").className = data.verdict;
+    document.querySelector("#verdict .sign").textContent = signs[data.verdict];
+    byId("word").textContent = data.word;
+    byId("sentence").textContent = data.sentence;
+    const shown = data.reasons.length > 4 ? 3 : data.reasons.length;
+    for (const reason of data.reasons.slice(0, shown)) {
+      byId("reasons").append(make("li", "", reason));
+    }
+    if (data.reasons.length > shown) {
+      byId("reasons").append(make("li", "", `${data.reasons.length - shown} more below`));
+    }
+    for (const warning of data.warnings) byId("warnings").append(make("p", "", warning));
+    byId("warnings").hidden = data.warnings.length === 0;
+    appendFacts(byId("statistics"), data.statistics, true);
+  }
+
+  function appendFacts(list, facts, grouped) {
+    for (const [label, text] of facts) {
+      const parent = grouped ? list.appendChild(make("div")) : list;
+      parent.append(make("dt", "", label), make("dd", "", text));
+    }
+  }
+
+  function criterionRow(figure) {
+    const row = make("tr", figure.outcome);
+    const badge = make("td");
+    const sign = signs[figure.outcome];
+    badge.append(make("span", `badge ${figure.outcome}`, `${sign} ${figure.word}`.trim()));
+    const value = make("td", "number", `${figure.value} `);
+    value.append(make("span", "unit", figure.unit));
+    const bar = make("td");
+    if (figure.distance) {
+      const track = bar.appendChild(make("div", "bar"));
+      track.appendChild(make("i")).style.width = `${100 * figure.fill}%`;
+      bar.append(make("span", "distance", figure.distance));
+    }
+    row.append(badge, make("td", "", figure.title), value,
+      make("td", "number", figure.tolerance), bar, make("td", "", figure.worst));
+    return row;
+  }
+
+  function showCriteria() {
+    const [judged, others] = ["criteria", "others"].map((id) => byId(id).tBodies[0]);
+    judged.append(...data.judged.map(criterionRow));
+    others.append(...data.others.map(criterionRow));
+    others.className = "muted";
+    byId("more").hidden = data.others.length === 0;
+    byId("more").firstElementChild.textContent = data.others.length === 1
+      ? "1 more figure, which takes no part in the verdict"
+      : `${data.others.length} more figures, which take no part in the verdict`;
+  }
+
+  function showSections() {
+    for (const [title, facts] of data.sections) {
+      const section = byId("sections").appendChild(make("div"));
+      const list = make("dl");
+      appendFacts(list, facts, false);
+      section.append(make("h3", "", title), list);
+    }
+  }
+
+  // ---- Patches
+
+  const pageSize = 100;
+  const patchText = (row) =>
+    row[ID] === "" && row[NAME] === "" ? `row ${row[INDEX] + 1}` : row[ID] || row[NAME];
+  const device = (row) => row[DEVICE].map((value) => (value === null ? "–" : +value.toFixed(2)));
+  const lab = (values) => values.map((value) => fixed(value, 2)).join(" ");
+  const natural = new Intl.Collator("en", { numeric: true });
+  const byNumber = (get) => (a, b) => (get(a) ?? -Infinity) - (get(b) ?? -Infinity);
+  const channels = data.channels.map((name) => name.replace(/^[A-Z0-9]+_(?=.)/, "")).join(" ");
+
+  // Title, class of the cells, order of rows (falling first where `falls`), cell.
+  const columns = [
+    { title: "Patch", kind: "patch",
+      order: (a, b) => natural.compare(patchText(a), patchText(b)) || a[INDEX] - b[INDEX],
+      fill(cell, row) {
+        cell.textContent = patchText(row);
+        if (row[ID] !== "" && row[NAME] !== "" && row[NAME] !== row[ID]) {
+          cell.append(" ", make("span", "name", row[NAME]));
+        }
+      } },
+    { title: "Target, measured", kind: "swatches", order: byNumber((row) => row[TARGET][0]),
+      fill(cell, row) {
+        const pair = cell.appendChild(make("div", "pair"));
+        for (const [side, swatch] of [["Target", row[TARGET_SWATCH]],
+          ["Measured", row[MEASURED_SWATCH]]]) {
+          const half = pair.appendChild(make("span", swatch.endsWith("!") ? "clipped" : ""));
+          half.style.backgroundColor = swatch.slice(0, 7);
+          half.title = half.className ? `${side}: beyond what an sRGB screen shows` : side;
+        }
+      } },
+    { title: channels, kind: "device", hidden: data.channels.length === 0,
+      order: (a, b) => a[DEVICE].reduce((found, value, i) => found || value - b[DEVICE][i], 0),
+      fill(cell, row) { cell.textContent = device(row).join(" "); } },
+    { title: "Target L*a*b*", kind: "lab", order: byNumber((row) => row[TARGET][0]),
+      fill(cell, row) { cell.textContent = lab(row[TARGET]); } },
+    { title: "Measured L*a*b*", kind: "lab", order: byNumber((row) => row[MEASURED][0]),
+      fill(cell, row) { cell.textContent = lab(row[MEASURED]); } },
+    ...["ΔL*", "Δa*", "Δb*"].map((title, i) => ({
+      title, kind: "number delta", falls: true, order: byNumber((row) => row[DELTA][i]),
+      fill(cell, row) { cell.textContent = signed(row[DELTA][i]); } })),
+    { title: data.unit, kind: "number difference", falls: true,
+      order: byNumber((row) => row[DIFFERENCE]),
+      fill(cell, row) { cell.textContent = fixed(row[DIFFERENCE], 2); } },
+  ].filter((column) => !column.hidden);
+
+  let sorted = columns[columns.length - 1]; // As the rows come: the worst first.
+  let falling = true;
+  let rows = data.rows;
+  let start = 0;
+
+  function showHeadings() {
+    const line = byId("patches").tHead.rows[0];
+    line.replaceChildren(...columns.map((column) => {
+      const heading = make("th", column.kind);
+      heading.scope = "col";
+      const sign = column !== sorted ? "" : falling ? " ▼" : " ▲";
+      if (sign) heading.setAttribute("aria-sort", falling ? "descending" : "ascending");
+      const button = heading.appendChild(make("button", "", column.title + sign));
+      button.type = "button";
+      button.addEventListener("click", () => {
+        falling = column === sorted ? !falling : Boolean(column.falls);
+        sorted = column;
+        choose();
+        byId("patches").tHead.rows[0].cells[columns.indexOf(column)].firstChild.focus();
+      });
+      return heading;
+    }));
+  }
+
+  function choose() {
+    const wanted = byId("find").value.trim().toLowerCase();
+    rows = data.rows.filter((row) => wanted === "" || row[ID].toLowerCase().includes(wanted) ||
+      row[NAME].toLowerCase().includes(wanted) || device(row).join(" ") === wanted ||
+      patchText(row) === wanted);
+    rows.sort((a, b) => (falling ? sorted.order(b, a) : sorted.order(a, b)));
+    start = 0;
+    showHeadings();
+    showRows();
+  }
+
+  function showRows() {
+    const end = Math.min(start + pageSize, rows.length);
+    byId("patches").tBodies[0].replaceChildren(...rows.slice(start, end).map((row) => {
+      const line = make("tr");
+      for (const column of columns) {
+        column.fill(line.appendChild(make("td", column.kind)), row);
+      }
+      return line;
+    }));
+    const range = rows.length === 0 ? "None found" : `${start + 1}–${end} of ${rows.length}`;
+    byId("range").textContent = range;
+    byId("back").disabled = start === 0;
+    byId("next").disabled = end === rows.length;
+    byId("printed").textContent = end - start < data.rows.length
+      ? `Shown: ${range}${rows.length < data.rows.length ? " found" : ""}, ${
+        data.rows.length} in all. "Save all as CSV" gives every patch.` : "";
+  }
+
+  function csvText() {
+    // A spreadsheet would run a text that begins like a formula.
+    const cell = (value) => {
+      if (typeof value === "number") return String(value);
+      if (value === null) return "";
+      const safe = /^[=+\-@\t\r]/.test(value) ? `'${value}` : value;
+      return /[",\r\n]/.test(safe) ? `"${safe.replaceAll("\"", "\"\"")}"` : safe;
+    };
+    const head = ["id", "name", ...data.channels, "target_L", "target_a", "target_b",
+      "measured_L", "measured_a", "measured_b", "difference"];
+    const lines = [...data.rows].sort((a, b) => a[INDEX] - b[INDEX]).map((row) =>
+      [row[ID], row[NAME], ...row[DEVICE], ...row[TARGET], ...row[MEASURED], row[DIFFERENCE]]);
+    return [head, ...lines].map((line) => line.map(cell).join(",")).join("\r\n") + "\r\n";
+  }
+
+  function saveCsv() {
+    const link = make("a");
+    link.href = URL.createObjectURL(new Blob(["\ufeff", csvText()], { type: "text/csv" }));
+    link.download = "patches.csv";
+    link.click();
+    setTimeout(() => URL.revokeObjectURL(link.href), 60000);
+  }
+
+  function showPatches() {
+    showHeadings();
+    showRows();
+    byId("find").addEventListener("input", choose);
+    byId("back").addEventListener("click", () => { start -= pageSize; showRows(); });
+    byId("next").addEventListener("click", () => { start += pageSize; showRows(); });
+    byId("csv").addEventListener("click", saveCsv);
+  }
+
+  // ---- Charts
+
+  const colourOf = (name) =>
+    getComputedStyle(document.documentElement).getPropertyValue(name).trim();
+  const number = { type: "linear", ticks: { maxTicksLimit: 9 } };
+  let charts = [];
+
+  // Bars at or above the first limit are hatched, so that they stand out in grey too.
+  function hatch(colour) {
+    const tile = document.createElement("canvas");
+    tile.width = tile.height = 8;
+    const pen = tile.getContext("2d");
+    pen.fillStyle = colour;
+    pen.globalAlpha = 0.3;
+    pen.fillRect(0, 0, 8, 8);
+    pen.globalAlpha = 1;
+    pen.strokeStyle = colour;
+    pen.lineWidth = 2.4;
+    pen.beginPath();
+    for (const shift of [-8, 0, 8]) { pen.moveTo(shift, 8); pen.lineTo(shift + 8, 0); }
+    pen.stroke();
+    return pen.createPattern(tile, "repeat");
+  }
+
+  const markLines = {
+    id: "markLines",
+    afterDatasetsDraw(chart) {
+      const { ctx: pen, scales: { x }, chartArea: area } = chart;
+      pen.save();
+      pen.font = `12px ${getComputedStyle(document.body).fontFamily}`;
+      data.marks.forEach((mark, i) => {
+        const at = x.getPixelForValue(mark.value);
+        if (at < area.left || at > area.right) return;
+        const y = area.top + 12 + 16 * i;
+        pen.strokeStyle = pen.fillStyle = colourOf(mark.limit ? "--failed" : "--ink");
+        pen.setLineDash(mark.limit ? [] : [4, 3]);
+        pen.lineWidth = mark.limit ? 2 : 1;
+        pen.beginPath();
+        pen.moveTo(at, area.top);
+        pen.lineTo(at, area.bottom);
+        pen.stroke();
+        const room = at + 6 + pen.measureText(mark.label).width < area.right;
+        pen.textAlign = room ? "left" : "right";
+        pen.lineWidth = 4;
+        pen.setLineDash([]);
+        pen.strokeStyle = colourOf("--card");
+        pen.strokeText(mark.label, at + (room ? 6 : -6), y);
+        pen.fillText(mark.label, at + (room ? 6 : -6), y);
+      });
+      pen.restore();
+    },
+  };
+
+  function drawHistogram() {
+    const limits = data.marks.filter((mark) => mark.limit).map((mark) => mark.value);
+    const limit = limits.length ? Math.max(...limits) : Infinity;
+    const plain = colourOf("--accent");
+    const over = hatch(colourOf("--failed"));
+    const last = data.histogram[data.histogram.length - 1];
+    const width = last[1] - last[0];
+    byId("histogram").setAttribute("aria-label", `Patches by difference. ${data.histogramText}`);
+    const decimals = Math.max(0, Math.ceil(-Math.log10(width) - 1e-9));
+    charts.push(new Chart(byId("histogram"), {
+      type: "bar",
+      data: { datasets: [{
+        data: data.histogram.map(([from, to, count]) => ({ x: (from + to) / 2, y: count })),
+        backgroundColor: data.histogram.map(([from]) => (from >= limit - 1e-9 ? over : plain)),
+        barPercentage: 0.94, categoryPercentage: 1,
+      }] },
+      options: {
+        plugins: { tooltip: { callbacks: {
+          title: ([item]) => {
+            const [from, to] = data.histogram[item.dataIndex];
+            return `${from.toFixed(decimals)} to ${to.toFixed(decimals)} ${data.unit}`;
+          },
+          label: (item) => `${item.parsed.y} patches` } } },
+        scales: {
+          x: { ...number, offset: false, min: 0, max: last[1], grid: { display: false },
+            title: { display: true, text: data.unit } },
+          y: { ...number, beginAtZero: true, ticks: { precision: 0, maxTicksLimit: 6 },
+            title: { display: true, text: "patches" } },
+        },
+      },
+      plugins: [markLines],
+    }));
+  }
+
+  const drawnRows = data.drawn.map((i) => data.rows[i])
+    .filter((row) => row[TARGET].every((v) => v !== null) && row[MEASURED].every((v) => v !== null));
+  const tooltip = (rows) => ({
+    displayColors: false,
+    callbacks: { label: ({ dataIndex }) => {
+      const row = rows[dataIndex];
+      return [`${patchText(row)}${row[ID] && row[NAME] ? ` ${row[NAME]}` : ""}`,
+        `target ${lab(row[TARGET])}`, `measured ${lab(row[MEASURED])}`,
+        `${data.unit} ${fixed(row[DIFFERENCE], 2)}`];
+    } },
+  });
+
+  // A line from each target to what was measured.
+  const shifts = {
+    id: "shifts",
+    beforeDatasetsDraw(chart) {
+      const { ctx: pen, scales: { x, y } } = chart;
+      pen.save();
+      pen.strokeStyle = colourOf("--soft");
+      pen.lineWidth = 1;
+      pen.beginPath();
+      for (const row of drawnRows) {
+        pen.moveTo(x.getPixelForValue(row[TARGET][1]), y.getPixelForValue(row[TARGET][2]));
+        pen.lineTo(x.getPixelForValue(row[MEASURED][1]), y.getPixelForValue(row[MEASURED][2]));
+      }
+      pen.stroke();
+      pen.restore();
+    },
+  };
+
+  function drawPlane() {
+    const many = drawnRows.length > 300;
+    const point = (values) => ({ x: values[1], y: values[2] });
+    const reach = drawnRows.reduce((most, row) => Math.max(most,
+      ...[row[TARGET], row[MEASURED]].map(([, a, b]) => Math.max(Math.abs(a), Math.abs(b)))), 10);
+    const edge = Math.ceil(reach / 10) * 10;
+    const axis = (text) => ({ ...number, min: -edge, max: edge,
+      title: { display: true, text },
+      grid: { color: ({ tick }) => colourOf(tick && tick.value === 0 ? "--soft" : "--faint") } });
+    charts.push(new Chart(byId("plane"), {
+      type: "scatter",
+      data: { datasets: [
+        { label: "measured (filled)", data: drawnRows.map((row) => point(row[MEASURED])),
+          pointBackgroundColor: drawnRows.map((row) => row[MEASURED_SWATCH].slice(0, 7)),
+          pointBorderColor: colourOf("--soft"), borderWidth: many ? 0.5 : 1,
+          pointRadius: many ? 3 : 5 },
+        { label: "target (ring)", data: drawnRows.map((row) => point(row[TARGET])),
+          pointBackgroundColor: "transparent", pointBorderColor: colourOf("--ink"),
+          borderWidth: 1, pointRadius: many ? 2 : 6 },
+      ] },
+      options: { aspectRatio: 1,
+        plugins: { legend: legend(), tooltip: tooltip(drawnRows) },
+        scales: { x: axis("a*  green – red"), y: axis("b*  blue – yellow") } },
+      plugins: [shifts],
+    }));
+  }
+
+  const legend = () => ({ display: true, position: "bottom",
+    labels: { usePointStyle: true, boxWidth: 6, boxHeight: 6, padding: 16, color: colourOf("--soft"),
+      generateLabels: (chart) => Chart.defaults.plugins.legend.labels.generateLabels(chart)
+        .map((label, i) => ({ ...label, strokeStyle: colourOf("--ink"), lineWidth: 1,
+          fillStyle: i === 0 ? colourOf("--soft") : "transparent" })) } });
+
+  function drawLightness() {
+    charts.push(new Chart(byId("lightness"), {
+      type: "scatter",
+      data: { datasets: [{
+        data: drawnRows.map((row) => ({ x: row[TARGET][0], y: row[DELTA][0] })),
+        pointBackgroundColor: drawnRows.map((row) => row[MEASURED_SWATCH].slice(0, 7)),
+        pointBorderColor: colourOf("--soft"), borderWidth: 0.5,
+        pointRadius: drawnRows.length > 300 ? 3 : 5,
+      }] },
+      options: {
+        plugins: { tooltip: tooltip(drawnRows) },
+        scales: {
+          x: { ...number, min: 0, suggestedMax: 100,
+            title: { display: true, text: "L* of the target  dark – light" } },
+          y: { ...number, suggestedMin: -2, suggestedMax: 2,
+            title: { display: true, text: "ΔL*  darker – lighter" },
+            grid: { color: ({ tick }) => colourOf(tick && tick.value === 0 ? "--ink" : "--faint") } },
+        },
+      },
+    }));
+  }
+
+  function drawCharts() {
+    for (const chart of charts) chart.destroy();
+    charts = [];
+    Chart.defaults.animation = false;
+    const printing = document.documentElement.classList.contains("printing");
+    Chart.defaults.devicePixelRatio = printing ? 3 : devicePixelRatio;
+    Chart.defaults.maintainAspectRatio = false;
+    Chart.defaults.plugins.legend.display = false;
+    Chart.defaults.font.family = getComputedStyle(document.body).fontFamily;
+    Chart.defaults.color = colourOf("--soft");
+    Chart.defaults.borderColor = colourOf("--faint");
+    drawHistogram();
+    drawPlane();
+    drawLightness();
+    byId("drawn").textContent = data.drawnText;
+  }
+
+  // On paper the page is light, and the charts have the sizes of their own.
+  function turnPrinting(on) {
+    document.documentElement.classList.toggle("printing", on);
+    drawCharts();
+  }
+
+  showHead();
+  showCriteria();
+  showPatches();
+  showSections();
+  document.querySelector("main").hidden = false;
+  drawCharts();
+  addEventListener("beforeprint", () => turnPrinting(true));
+  addEventListener("afterprint", () => turnPrinting(false));
+  matchMedia("(prefers-color-scheme: dark)").addEventListener("change", drawCharts);
+})();

@@ -1,0 +1,147 @@
+// Shows a verified job: makes a page of its result and opens it. Below the system root this program
+// stands at "/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify", where the tool
+// looks for it.
+#include <cstdio>
+#include <new>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <unistd.h>
+#include <vector>
+
+#include "colour/ColourFile.h"
+#include "companions/report/Meta.h"
+#include "companions/report/Page.h"
+#include "companions/report/PageFile.h"
+#include "companions/report/Result.h"
+#include "companions/viewer/Browser.h"
+#include "companions/viewer/Reports.h"
+#include "platform/TemporaryFolder.h"
+
+namespace {
+
+enum : int {
+    done = 0,
+    metaMissing = 2,
+    metaBroken = 3,
+    resultMissing = 4,
+    resultBroken = 5,
+    pageNotWritten = 6,
+    pageNotOpened = 7,
+    commandNotUnderstood = 64,
+    outOfMemory = 70
+};
+
+constexpr std::size_t mostBytes = std::size_t{1} << 30; ///< Of a result: millions of patches.
+
+constexpr const char* help = R"(Shows the result of a verified job as a page in the browser.
+
+  Nerova Verify                       the index of all reports in the temporary folder
+  Nerova Verify -detail -meta PATH    the report of the job whose meta file is PATH
+
+The page is written beside the meta file, as report-strip1-2024-05-01-123456.html, and opened where
+there is a display. PATH is all words behind -meta, with one blank in between. On a terminal the
+page's path is printed.
+
+Exit status:
+   0  the page is there, and opened where there is a display
+   2  the meta file is missing or can't be read
+   3  the meta file is broken
+   4  the result ("output.json" beside the meta file) is missing or can't be read
+   5  the result is broken
+   6  the page could not be written
+   7  the page is there but could not be opened
+  64  the command is not understood
+  70  out of memory
+)";
+
+int fail(int code, const std::string& words) {
+    std::fprintf(stderr, "Nerova Verify: %s\n", words.c_str());
+    return code;
+}
+
+bool read(const std::string& path, std::string& bytes) {
+    return colour::readWholeFile(path, mostBytes, bytes) == colour::Failure::None;
+}
+
+std::string folderOf(const std::string& path) {
+    const std::size_t slash = path.rfind('/');
+    return slash == path.npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
+}
+
+/// report-strip1-2024-05-01-123456: the strip and the time of the run, not of the viewing.
+std::string stemOf(const report::Meta& meta) {
+    const std::string& t = meta.created;
+    return "report-strip" + std::to_string(meta.strip) + "-" + t.substr(0, 10) + "-" +
+           t.substr(11, 2) + t.substr(14, 2) + t.substr(17, 2);
+}
+
+int show(const std::string& page) {
+    if (isatty(STDOUT_FILENO))
+        std::printf("%s\n", page.c_str());
+    std::string problem;
+    if (viewer::hasDisplay() && !viewer::openFile(page, problem))
+        return fail(pageNotOpened, page + " is not opened: " + problem);
+    return done;
+}
+
+int showReport(const std::string& metaPath) {
+    std::string bytes;
+    std::string problem;
+    if (!read(metaPath, bytes))
+        return fail(metaMissing, "can't read " + metaPath);
+    const std::optional<report::Meta> meta = report::readMeta(bytes, problem);
+    if (!meta)
+        return fail(metaBroken, metaPath + " is broken: " + problem);
+    const std::string folder = folderOf(metaPath);
+    const std::string resultPath = folder + "/output.json";
+    if (!read(resultPath, bytes))
+        return fail(resultMissing, "can't read " + resultPath);
+    const std::optional<report::Result> result = report::readResult(bytes, problem);
+    if (!result)
+        return fail(resultBroken, resultPath + " is broken: " + problem);
+    const std::string page =
+        report::keepPage(folder, stemOf(*meta), report::pageOf(*result, &*meta), problem);
+    if (page.empty())
+        return fail(pageNotWritten, "can't write a page in " + folder + ": " + problem);
+    return show(page);
+}
+
+int showIndex() {
+    const std::string temporary = platform::temporaryFolder();
+    if (temporary.empty())
+        return fail(pageNotWritten, "there is no temporary folder that may be used");
+    // The tool's working folder, or the temporary folder as long as there is none.
+    const std::string working = temporary + "/Tintgate";
+    const std::string folder = access(working.c_str(), W_OK | X_OK) == 0 ? working : temporary;
+    const std::string path = folder + "/reports.html";
+    std::string problem;
+    if (!report::replacePage(path, report::indexOf(viewer::reportsBelow(folder), folder), problem))
+        return fail(pageNotWritten, "can't write " + path + ": " + problem);
+    return show(path);
+}
+
+int run(const std::vector<std::string_view>& words) {
+    if (words.empty())
+        return showIndex();
+    if (words.size() == 1 && (words[0] == "--help" || words[0] == "-h"))
+        return std::fputs(help, stdout) < 0 ? pageNotWritten : done;
+    const std::size_t meta = words[0] == "-detail" ? 1 : 0;
+    if (words.size() < meta + 2 || words[meta] != "-meta")
+        return fail(commandNotUnderstood, "not understood; --help tells how it is called");
+    // Whoever starts this program does not quote the path, so blanks part it into words.
+    std::string path(words[meta + 1]);
+    for (std::size_t i = meta + 2; i < words.size(); ++i)
+        path.append(" ").append(words[i]);
+    return showReport(path);
+}
+
+} // namespace
+
+int main(int argumentCount, char** arguments) {
+    try {
+        return run({arguments + (argumentCount > 0), arguments + argumentCount});
+    } catch (const std::bad_alloc&) {
+        return fail(outOfMemory, "out of memory");
+    }
+}
