@@ -4,7 +4,9 @@
 #include <bit>
 #include <cstdint>
 #include <cstring>
+#include <optional>
 #include <type_traits>
+#include <utility>
 
 namespace store {
 
@@ -184,6 +186,25 @@ bool takeRun(PARAM_TYPE type, Reader& reader, Elements& elements, int position,
     }
 }
 
+/// Bytes of one run of numbers alone, which need no more than to be copied.
+std::optional<Elements> packed(std::string_view bytes) {
+    constexpr std::size_t header = 1 + 1 + sizeof(std::uint32_t);
+    Reader reader(bytes);
+    char first = 0;
+    std::uint8_t type = 0;
+    std::uint32_t length = 0;
+    if (std::endian::native != std::endian::little || !reader.take(first) || first != version ||
+        !reader.take(type) || !reader.take(length)) {
+        return std::nullopt;
+    }
+    const std::size_t size = numberSize(static_cast<PARAM_TYPE>(type));
+    if (size == 0 || length == 0 || length > std::uint32_t{highestPosition} + 1 ||
+        reader.left() != length * size) {
+        return std::nullopt;
+    }
+    return Elements::ofNumbers(static_cast<PARAM_TYPE>(type), std::string(bytes.substr(header)));
+}
+
 } // namespace
 
 std::string keyBytes(const Elements& elements) {
@@ -198,6 +219,9 @@ std::string keyBytes(const Elements& elements) {
 }
 
 std::shared_ptr<Elements> elementsFromBytes(std::string_view bytes) {
+    if (auto numbers = packed(bytes)) {
+        return std::make_shared<Elements>(std::move(*numbers));
+    }
     Reader reader(bytes);
     char first = 0;
     if (!reader.take(first) || first != version || reader.left() == 0) {

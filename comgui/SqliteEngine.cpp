@@ -194,10 +194,21 @@ class SqliteEngine : public StoreEngine {
                              list + ") ORDER BY t.id")
                                 .c_str());
         auto run = statement.runList(type, static_cast<std::int64_t>(largestBytes), names);
+        // Such keys hold few different values.
+        std::map<std::string, std::shared_ptr<const Elements>, std::less<>> known;
         while (run.step()) {
             const auto name = std::find(names.begin(), names.end(), run.bytes(1));
+            std::shared_ptr<const Elements> elements;
+            if (!run.isNull(2)) {
+                const std::string_view bytes = run.bytes(2);
+                auto same = known.find(bytes);
+                if (same == known.end()) {
+                    same = known.emplace(bytes, decoded(bytes)).first;
+                }
+                elements = same->second;
+            }
             show(static_cast<int>(run.number(0)), static_cast<std::size_t>(name - names.begin()),
-                 run.isNull(2) ? nullptr : decoded(run.bytes(2)));
+                 std::move(elements));
         }
     }
 

@@ -112,7 +112,7 @@ class StoreEngine {
     using ShowKey =
         std::function<void(int id, std::size_t name, std::shared_ptr<const Elements> elements)>;
     /// Some keys of all tickets of a type, all of one moment, as far as each takes at most
-    /// largestBytes in the store.
+    /// largestBytes in the store; by ascending id. Equal elements may be one object.
     virtual void keysOfAll(int type, const std::vector<std::string>& names,
                            std::size_t largestBytes, const ShowKey& show) = 0;
 

@@ -1,8 +1,6 @@
 #include "comgui/StoreKeep.h"
 
 #include <algorithm>
-#include <cstring>
-#include <optional>
 #include <utility>
 
 namespace store {
@@ -103,14 +101,13 @@ std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_vie
         if (type == jobType) {
             const auto name = std::find(jobOverview.begin(), jobOverview.end(), key);
             if (name != jobOverview.end() && wantsOverview(commits)) {
-                const auto row = m_overview.find(id);
-                if (row == m_overview.end()) {
+                const Row* const row = overviewRow(id);
+                const auto index = static_cast<std::size_t>(name - jobOverview.begin());
+                if (row == nullptr) {
                     return SharedElements();
                 }
-                const auto& seen =
-                    row->second[static_cast<std::size_t>(name - jobOverview.begin())];
-                if (!seen.large) {
-                    return seen.elements;
+                if (!row->large[index]) {
+                    return row->elements[index];
                 }
             }
         }
@@ -139,14 +136,34 @@ bool StoreKeep::wantsOverview(std::uint64_t commits) {
     return true;
 }
 
+/// Null for a job that has none of the keys.
+const StoreKeep::Row* StoreKeep::overviewRow(int id) {
+    const auto isAt = [&](std::size_t row) {
+        return row < m_overview.size() && m_overview[row].id == id;
+    };
+    if (!isAt(m_lastRow)) {
+        ++m_lastRow;
+    }
+    if (!isAt(m_lastRow)) {
+        const auto found = std::lower_bound(m_overview.begin(), m_overview.end(), id,
+                                            [](const Row& row, int id) { return row.id < id; });
+        m_lastRow = static_cast<std::size_t>(found - m_overview.begin());
+    }
+    return isAt(m_lastRow) ? &m_overview[m_lastRow] : nullptr;
+}
+
 void StoreKeep::fetchOverview(std::uint64_t commits) {
     m_overview.clear();
     m_engine->keysOfAll(jobType, jobOverview, largestOverviewBytes,
                         [&](int id, std::size_t name, SharedElements elements) {
-                            auto& seen = m_overview[id][name];
-                            seen.large = elements == nullptr;
-                            seen.elements = std::move(elements);
+                            if (m_overview.empty() || m_overview.back().id != id) {
+                                m_overview.push_back({id, {}, {}});
+                            }
+                            auto& row = m_overview.back();
+                            row.large[name] = elements == nullptr;
+                            row.elements[name] = std::move(elements);
                         });
+    m_lastRow = 0;
     m_overviewCommits = commits;
     m_overviewHeld = true;
     m_idsAsked = false;

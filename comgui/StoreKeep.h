@@ -5,7 +5,6 @@
 #include <cstdint>
 #include <memory>
 #include <string>
-#include <unordered_map>
 #include <vector>
 
 #include "comgui/StoreEngine.h"
@@ -46,20 +45,21 @@ class StoreKeep : public TicketKeep {
         std::uint64_t commits = 0;
     };
 
-    /// A key of the overview; large ones are not in it.
-    struct Seen {
-        bool large = false;
-        SharedElements elements;
-    };
     static constexpr std::size_t overviewKeys = 5;
-    using Row = std::array<Seen, overviewKeys>;
+    struct Row {
+        int id;
+        std::array<SharedElements, overviewKeys> elements;
+        std::array<bool, overviewKeys> large; ///< Not held for its size.
+    };
 
+    const Row* overviewRow(int id);
     bool wantsOverview(std::uint64_t commits);
     void fetchOverview(std::uint64_t commits);
 
     const std::shared_ptr<StoreEngine> m_engine;
     Fetched m_fetched;
-    std::unordered_map<int, Row> m_overview;
+    std::vector<Row> m_overview; ///< By id.
+    std::size_t m_lastRow = 0;   ///< Jobs are asked for in this order.
     std::uint64_t m_overviewCommits = 0;
     bool m_overviewHeld = false;
     bool m_idsAsked = false;          ///< Since the last overview.

@@ -1,5 +1,6 @@
 #include "comgui/TicketContainer.h"
 
+#include <cstring>
 #include <unordered_map>
 
 namespace store {
@@ -14,9 +15,21 @@ Containers& containers() {
     return all;
 }
 
+/// The container that was found last; most calls in a row are for one.
+struct {
+    const void* handle = nullptr;
+    TicketContainer* container = nullptr;
+} lastFound;
+
 TicketContainer* find(const void* handle) {
-    const auto found = containers().find(handle);
-    return found == containers().end() ? nullptr : found->second;
+    if (handle != lastFound.handle) {
+        const auto found = containers().find(handle);
+        if (found == containers().end()) {
+            return nullptr;
+        }
+        lastFound = {handle, found->second};
+    }
+    return lastFound.container;
 }
 
 /// Runs one word on the container; false for an unknown handle.
@@ -183,6 +196,7 @@ TicketContainer::TicketContainer(std::shared_ptr<TicketKeep> keep) : m_keep(std:
 
 TicketContainer::~TicketContainer() {
     containers().erase(&m_access);
+    lastFound = {};
 }
 
 bool TicketContainer::exists(int type, int id) {
@@ -217,7 +231,7 @@ bool TicketContainer::remove(int type, int id) {
     if (!TICKET_Valid(type, id) || !m_keep->remove(type, id)) {
         return false;
     }
-    m_snapshot.reset();
+    dropSnapshot();
     m_shown.erase({type, id});
     m_partial.erase({type, id});
     return true;
@@ -240,15 +254,30 @@ bool TicketContainer::walkTickets(TicketWalk callback, void* context, int type) 
 
 bool TicketContainer::get(int type, int id, const char* key, PARAM_TYPE ptype, void* out,
                           int position) {
+    // Short, and apart from what fetches: an array comes through here one element at a time.
+    if (position > 0 && m_snapshot.held && m_snapshot.address == Address(type, id) &&
+        std::strcmp(m_snapshot.key.c_str(), key) == 0) {
+        return readElement(m_snapshot.elements.get(), ptype, out, position, m_handedOut);
+    }
+    return fetchAndGet(type, id, key, ptype, out, position);
+}
+
+void TicketContainer::dropSnapshot() {
+    m_snapshot.held = false;
+    m_snapshot.elements.reset();
+}
+
+bool TicketContainer::fetchAndGet(int type, int id, const char* key, PARAM_TYPE ptype, void* out,
+                                  int position) {
     if (!TICKET_Valid(type, id)) {
         return false;
     }
-    const Address address(type, id);
-    if (position <= 0 || !m_snapshot || m_snapshot->address != address || m_snapshot->key != key) {
-        m_snapshot.reset();
-        m_snapshot = Snapshot{address, key, m_keep->key(type, id, key)};
-    }
-    return readElement(m_snapshot->elements.get(), ptype, out, position, m_handedOut);
+    dropSnapshot();
+    m_snapshot.key = key;
+    m_snapshot.elements = m_keep->key(type, id, m_snapshot.key);
+    m_snapshot.address = {type, id};
+    m_snapshot.held = true;
+    return readElement(m_snapshot.elements.get(), ptype, out, position, m_handedOut);
 }
 
 std::shared_ptr<const TicketContent> TicketContainer::content(int type, int id,
@@ -267,7 +296,7 @@ bool TicketContainer::apply(int type, int id, SETMULTIPAR* table) {
     if (!TICKET_Valid(type, id)) {
         return false;
     }
-    m_snapshot.reset();
+    dropSnapshot();
     // The table may point into what a walk showed, so that goes last.
     const auto shown = m_shown.extract({type, id});
     return m_keep->apply(type, id, table);
@@ -277,7 +306,7 @@ bool TicketContainer::transfer(int type, int id, const TicketContent& source, bo
     if (!TICKET_Valid(type, id)) {
         return false;
     }
-    m_snapshot.reset();
+    dropSnapshot();
     m_shown.erase({type, id});
     return m_keep->transfer(type, id, source, replace);
 }

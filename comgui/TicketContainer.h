@@ -3,7 +3,6 @@
 
 #include <map>
 #include <memory>
-#include <optional>
 #include <string>
 #include <tuple>
 #include <utility>
@@ -73,15 +72,19 @@ class TicketContainer {
 
     /// The last key that was read.
     struct Snapshot {
+        bool held = false;
         Address address;
         std::string key;
         std::shared_ptr<const Elements> elements;
     };
 
+    void dropSnapshot();
+    bool fetchAndGet(int type, int id, const char* key, PARAM_TYPE ptype, void* out, int position);
+
     const std::shared_ptr<TicketKeep> m_keep;
     MTICKET_ACCESS m_access{};
     HandedOut m_handedOut;
-    std::optional<Snapshot> m_snapshot;
+    Snapshot m_snapshot;
     std::map<Address, std::unique_ptr<TicketRecord>> m_opened;
     /// The contents that walks showed, until their tickets change.
     std::map<Address, std::shared_ptr<const TicketContent>> m_shown;

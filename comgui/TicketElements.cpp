@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <cstring>
+#include <type_traits>
+#include <utility>
 
 namespace store {
 
@@ -9,6 +11,55 @@ namespace {
 
 bool isHole(const Value& value) {
     return typeOf(value) == PARAM_DELETE;
+}
+
+/// Reads one of the elements that are numbers of the type that is asked for.
+bool readNumber(const Elements& elements, void* out, int position) {
+    const std::string& bytes = elements.numbers();
+    const auto index = static_cast<std::size_t>(std::max(position, 0));
+    const auto copy = [&](auto size) {
+        if (out == nullptr || position < POSITION_WHOLE || index >= bytes.size() / size) {
+            return false;
+        }
+        std::memcpy(out, bytes.data() + index * size, size);
+        return true;
+    };
+    if (numberSize(elements.numberType()) == 8) {
+        return copy(std::integral_constant<std::size_t, 8>());
+    }
+    return copy(std::integral_constant<std::size_t, 4>());
+}
+
+/// Reads what readNumber does not.
+bool readValue(const Elements& key, PARAM_TYPE type, void* out, int position,
+               HandedOut& handedOut) {
+    if (type == PARAM_COUNT) {
+        if (position != POSITION_WHOLE || out == nullptr) {
+            return false;
+        }
+        const auto count = static_cast<unsigned long>(key.count());
+        std::memcpy(out, &count, sizeof count);
+        return true;
+    }
+    if (key.numberType() != PARAM_DELETE && type != PARAM_DELETE) {
+        return false; // Another type than the one that was asked for.
+    }
+    const Value* value = position == POSITION_WHOLE ? key.first() : key.at(position);
+    if (value == nullptr) {
+        return false;
+    }
+    if (type == PARAM_DELETE) {
+        if (out != nullptr) {
+            const PARAM_TYPE stored = typeOf(*value);
+            std::memcpy(out, &stored, sizeof stored);
+        }
+        return true;
+    }
+    if (typeOf(*value) != type || out == nullptr) {
+        return false;
+    }
+    giveValue(*value, out, handedOut);
+    return true;
 }
 
 bool removeElement(std::shared_ptr<Elements>& key, int position) {
@@ -29,11 +80,38 @@ bool removeElement(std::shared_ptr<Elements>& key, int position) {
 
 } // namespace
 
+Elements Elements::ofNumbers(PARAM_TYPE type, std::string bytes) {
+    Elements elements;
+    elements.m_filled = bytes.size() / numberSize(type);
+    elements.m_numbers = std::move(bytes);
+    elements.m_numberType = type;
+    return elements;
+}
+
+void Elements::unpack() const {
+    if (m_numberType == PARAM_DELETE) {
+        return;
+    }
+    const std::size_t size = numberSize(m_numberType);
+    std::vector<Value> values;
+    values.reserve(m_filled);
+    for (std::size_t at = 0; at + size <= m_numbers.size(); at += size) {
+        values.push_back(*takeValue(m_numberType, m_numbers.data() + at));
+    }
+    m_near = std::move(values);
+    m_numberType = PARAM_DELETE;
+    m_numbers = {};
+}
+
 int Elements::count() const {
+    if (m_numberType != PARAM_DELETE) {
+        return static_cast<int>(m_filled);
+    }
     return m_far.empty() ? static_cast<int>(m_near.size()) : m_far.rbegin()->first + 1;
 }
 
 const Value* Elements::at(int position) const {
+    unpack();
     if (position < 0) {
         return nullptr;
     }
@@ -46,6 +124,7 @@ const Value* Elements::at(int position) const {
 }
 
 const Value* Elements::first() const {
+    unpack();
     for (const auto& value : m_near) {
         if (!isHole(value)) {
             return &value;
@@ -55,6 +134,7 @@ const Value* Elements::first() const {
 }
 
 void Elements::put(int position, Value value) {
+    unpack();
     const auto index = static_cast<std::size_t>(position);
     if (index < m_near.size()) {
         m_filled += isHole(m_near[index]) ? 1 : 0;
@@ -72,6 +152,7 @@ bool Elements::remove(int position) {
     if (position < 0 || position >= count()) {
         return false;
     }
+    unpack();
     const auto index = static_cast<std::size_t>(position);
     if (index < m_near.size()) {
         m_filled -= isHole(m_near[index]) ? 0 : 1;
@@ -139,30 +220,10 @@ bool readElement(const Elements* key, PARAM_TYPE type, void* out, int position,
     if (key == nullptr) {
         return false;
     }
-    if (type == PARAM_COUNT) {
-        if (position != POSITION_WHOLE || out == nullptr) {
-            return false;
-        }
-        const auto count = static_cast<unsigned long>(key->count());
-        std::memcpy(out, &count, sizeof count);
-        return true;
+    if (key->numberType() == type && type != PARAM_DELETE) {
+        return readNumber(*key, out, position);
     }
-    const Value* value = position == POSITION_WHOLE ? key->first() : key->at(position);
-    if (value == nullptr) {
-        return false;
-    }
-    if (type == PARAM_DELETE) {
-        if (out != nullptr) {
-            const PARAM_TYPE stored = typeOf(*value);
-            std::memcpy(out, &stored, sizeof stored);
-        }
-        return true;
-    }
-    if (typeOf(*value) != type || out == nullptr) {
-        return false;
-    }
-    giveValue(*value, out, handedOut);
-    return true;
+    return readValue(*key, type, out, position, handedOut);
 }
 
 } // namespace store

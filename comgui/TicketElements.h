@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <map>
 #include <memory>
+#include <string>
 #include <vector>
 
 #include "comgui/TicketValue.h"
@@ -18,11 +19,20 @@ inline constexpr int highestPosition = 0xFFFFFF; ///< 16,777,215; positions beyo
 /// The count is the highest filled position plus one: the last position is never a hole.
 class Elements {
   public:
+    /// Numbers of one type, from PARAM_INT on, in positions from 0 on; bytes holds them as they lie
+    /// in memory, and not none of them.
+    static Elements ofNumbers(PARAM_TYPE type, std::string bytes);
+
     bool empty() const { return m_filled == 0; }
     /// At most highestPosition + 1.
     int count() const;
     /// How many positions are filled.
     int filled() const { return static_cast<int>(m_filled); }
+
+    /// Where all of it is what ofNumbers made, its type, else PARAM_DELETE. Such elements are read
+    /// from numbers() alone, which spares making a Value of each.
+    PARAM_TYPE numberType() const { return m_numberType; }
+    const std::string& numbers() const { return m_numbers; }
 
     /// Null for a hole and beyond the end.
     const Value* at(int position) const;
@@ -48,6 +58,7 @@ class Elements {
     /// Calls visit(position, value) for each element in ascending order as long as it gives true.
     template<class Visit>
     void visit(Visit visit) const {
+        unpack();
         for (std::size_t i = 0; i < m_near.size(); ++i) {
             if (typeOf(m_near[i]) != PARAM_DELETE && !visit(static_cast<int>(i), m_near[i])) {
                 return;
@@ -63,14 +74,35 @@ class Elements {
   private:
     std::size_t nearLimit() const;
     void settle();
+    /// Makes values of the numbers, for those who want values.
+    void unpack() const;
 
     // A lone element far out must not cost the memory of all the holes in front of it, whereas an
     // array that is filled in any order is to end up as an array. So elements stand in m_near up to
     // a size that follows from their number, and what lies beyond in m_far.
-    std::vector<Value> m_near;
+    mutable std::vector<Value> m_near;
     std::map<int, Value> m_far;
-    std::size_t m_filled = 0; ///< Elements in both, holes not counted.
+    std::size_t m_filled = 0; ///< Elements in both, or numbers; holes not counted.
+
+    // Empty as soon as there are values.
+    mutable std::string m_numbers;
+    mutable PARAM_TYPE m_numberType = PARAM_DELETE;
 };
+
+/// Bytes that a number takes; 0 for a type that is none.
+constexpr std::size_t numberSize(PARAM_TYPE type) {
+    switch (type) {
+    case PARAM_INT:
+    case PARAM_UINT:
+        return 4;
+    case PARAM_DOUBLE:
+    case PARAM_INT64:
+    case PARAM_UINT64:
+        return 8;
+    default:
+        return 0;
+    }
+}
 
 /// The object itself where nobody else holds it, else a copy that takes its place.
 template<class T>
