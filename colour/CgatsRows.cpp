@@ -159,7 +159,8 @@ RowReader::Form RowReader::inspectFirstRow() {
     const std::string_view row = unwrapLine(line, m_unwrapped) ? m_unwrapped : line;
     Form form = Form::Cells;
     if (!cellsBySeparator(row) && !cellsBySpreadsheet(row)) {
-        if (!splitWords(row, *m_chars, mostWords(), m_words)) // as many whole rows as were looked at
+        if (!splitWords(row, *m_chars, mostWords(),
+                        m_words)) // as many whole rows as were looked at
             m_words.resize(m_words.size() - m_words.size() % m_layout.columns.size());
         form = formOfWords(line.data() + line.size());
     }
@@ -252,7 +253,7 @@ bool RowReader::namesAreLost(const char* behind) const {
 }
 
 /// Goes to the first sign of the next cell, or to where there is none.
-template <RowReader::Form form>
+template<RowReader::Form form>
 inline const char* RowReader::toCell(const char* at, bool isFirst) const {
     const CharTable& chars = *m_chars;
     if constexpr (form == Form::Cells) {
@@ -277,7 +278,7 @@ inline const char* RowReader::toCell(const char* at, bool isFirst) const {
 
 /// Reads the row at hand in one pass. False if it needs care or, in a stream, breaks off; then
 /// nothing has moved.
-template <RowReader::Form form>
+template<RowReader::Form form>
 bool RowReader::quickRow() {
     const CharTable& chars = *m_chars;
     const char* at = m_at;
@@ -317,7 +318,7 @@ bool RowReader::quickRow() {
 }
 
 /// A stream has no lines that could be looked at once more: there a text counts at once.
-template <RowReader::Form form>
+template<RowReader::Form form>
 inline bool RowReader::quickNumber(const char*& at, std::size_t slot) {
     if (m_numbers.readPlain(at, m_end, m_values[slot]))
         return true;
@@ -400,9 +401,8 @@ std::vector<Word> RowReader::joinedNames() const {
             continue;
         const auto first = m_words.begin() + (column - m_layout.columns.begin());
         const auto last = first + surplus;
-        if (std::none_of(first, last + 1, [](const Word& word) {
-                return std::isnan(numberIn(word.text, ','));
-            }))
+        if (std::none_of(first, last + 1,
+                         [](const Word& word) { return std::isnan(numberIn(word.text, ',')); }))
             continue;
         std::vector<Word> joined(m_words.begin(), first + 1);
         const char* const start = first->text.data();

@@ -45,8 +45,8 @@ class RowReader {
   public:
     /// `text` is the whole text, `ascii` whether it is ASCII throughout. All arguments outlive the
     /// reader.
-    RowReader(std::string_view text, bool ascii, const TableHeader& header,
-              const CgatsWants& wants, Notes& notes);
+    RowReader(std::string_view text, bool ascii, const TableHeader& header, const CgatsWants& wants,
+              Notes& notes);
 
     /// Reads the rows that start at `at`, which is behind END_DATA afterwards.
     Failure read(const char*& at, Table& table);
@@ -73,11 +73,11 @@ class RowReader {
     bool findRow();
     bool takeEndOfData();
     std::string_view lineAtHand() const;
-    template <Form form>
+    template<Form form>
     const char* toCell(const char* at, bool isFirst) const;
-    template <Form form>
+    template<Form form>
     bool quickRow();
-    template <Form form>
+    template<Form form>
     bool quickNumber(const char*& at, std::size_t slot);
     Failure carefulRow();
     bool cellsBySeparator(std::string_view row);

@@ -28,8 +28,8 @@ bool looksLikeCgats(std::string_view bytes);
 /// rows are joined by id; a table that adds nothing is skipped).
 ///
 /// Rows stay in the text's order, repeated ids included. Scales are decided by whole columns. What
-/// had to be assumed or mended is in the set's notes, but a text that breaks off is Damaged: without
-/// END_DATA it must hold the stated number of rows, the last one with its line end.
+/// had to be assumed or mended is in the set's notes, but a text that breaks off is Damaged:
+/// without END_DATA it must hold the stated number of rows, the last one with its line end.
 ///
 /// Gives a data set with colour values, device values, or both, all of them finite; which of them a
 /// caller needs is the caller's affair. On failure `set` is left as it was.

@@ -21,8 +21,8 @@ struct ColourFile {
 Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file);
 
 /// Whole contents of a file; Missing, Unreadable, TooLarge (above `limit`) or OutOfMemory. Devices
-/// and pipes are read to their end, but no more than 512 MB of them (TooLarge), and a pipe that stays
-/// silent for 30 seconds is Unreadable.
+/// and pipes are read to their end, but no more than 512 MB of them (TooLarge), and a pipe that
+/// stays silent for 30 seconds is Unreadable.
 Failure readWholeFile(const std::string& path, std::size_t limit, std::string& bytes);
 
 } // namespace colour
