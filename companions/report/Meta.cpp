@@ -13,6 +13,12 @@ std::string text(const Json& value) {
     return value.is_null() ? "" : value.get<std::string>();
 }
 
+std::int64_t integer(const Json& value) {
+    if (!value.is_number_integer())
+        throw std::runtime_error("a number that is not whole");
+    return value.get<std::int64_t>();
+}
+
 /// The stamp becomes a part of a file name, so nothing but its own form is taken.
 std::string stamp(const std::string& value) {
     constexpr std::string_view form = "0000-00-00T00:00:00+00:00";
@@ -33,16 +39,16 @@ std::optional<Meta> readMeta(std::string_view bytes, std::string& problem) {
         const Json json = Json::parse(bytes);
         if (!json.is_object() || json.value("format", Json()) != "tintgate-meta")
             throw std::runtime_error("not a meta file");
-        if (json.at("formatVersion").get<int>() != 1)
+        if (json.at("formatVersion") != 1)
             throw std::runtime_error("a format that this version does not know");
         Meta meta;
         meta.created = stamp(json.at("created"));
         const Json& job = json.at("job");
-        meta.jobId = job.at("id");
+        meta.jobId = integer(job.at("id"));
         if (!job.at("parentId").is_null())
-            meta.parentId = job.at("parentId").get<std::int64_t>();
+            meta.parentId = integer(job.at("parentId"));
         meta.title = text(job.at("title"));
-        meta.strip = job.at("strip").get<int>() == 2 ? 2 : 1;
+        meta.strip = job.at("strip") == 2 ? 2 : 1;
         meta.instrument = text(json.at("instrument").at("name"));
         meta.paper = text(json.at("paper"));
         meta.workflow = text(json.at("workflow").at("name"));

@@ -18,6 +18,19 @@ double number(const Json& value) {
     return value.is_null() ? std::numeric_limits<double>::quiet_NaN() : value.get<double>();
 }
 
+/// A whole number. A real one is not turned into it, for it may have no room there.
+std::int64_t whole(const Json& value) {
+    if (!value.is_number_integer())
+        throw std::runtime_error("a number that is not whole");
+    return value.get<std::int64_t>();
+}
+
+std::size_t count(const Json& value) {
+    if (whole(value) < 0)
+        throw std::runtime_error("a count below 0");
+    return value.get<std::size_t>();
+}
+
 std::optional<double> optionalNumber(const Json& value) {
     return value.is_null() ? std::nullopt : std::optional(value.get<double>());
 }
@@ -48,10 +61,10 @@ Criterion criterion(const Json& json) {
     c.value = optionalNumber(json.at("value"));
     c.rounded = optionalNumber(json.at("rounded"));
     if (const Json& decimals = json.at("decimals"); !decimals.is_null())
-        c.decimals = std::clamp(decimals.get<int>(), 0, 6);
-    c.patches = json.at("patches");
+        c.decimals = static_cast<int>(std::clamp<std::int64_t>(whole(decimals), 0, 6));
+    c.patches = count(json.at("patches"));
     if (const Json& worst = json.at("worstPatch"); !worst.is_null())
-        c.worstPatch = worst.get<std::size_t>();
+        c.worstPatch = count(worst);
     return c;
 }
 
@@ -135,7 +148,7 @@ class Rows {
 void checkFormat(const Json& json) {
     if (!json.is_object() || json.value("format", Json()) != "tintgate-result")
         throw std::runtime_error("not a result");
-    if (json.at("formatVersion").get<int>() != knownVersion)
+    if (json.at("formatVersion") != knownVersion)
         throw std::runtime_error("a format that this version does not know");
 }
 
@@ -147,7 +160,7 @@ void fill(Result& result, const Json& json) {
                                                          {"incomplete", Verdict::Incomplete}});
     result.formula = json.at("formula").at("name");
     result.presetName = json.at("preset").at("name");
-    result.presetId = json.at("preset").at("id");
+    result.presetId = whole(json.at("preset").at("id"));
     const Json& inputs = json.at("inputs");
     result.target = input(inputs.at("target"));
     result.measurement = input(inputs.at("measurement"));

@@ -176,7 +176,9 @@ TEST(ReadResult, RefusesWhatIsNoResult) {
          {std::string(), std::string("[]"), std::string("null"), whole.substr(0, whole.size() / 2),
           with("tintgate-result", "other"), with("\"formatVersion\": 1", "\"formatVersion\": 2"),
           with("\"failed\"", "\"won\""), with("[100,0,0,0]", "[100,0,0]"),
-          with("\"worstPatch\":1", "\"worstPatch\":4"), with("[55,-37,-50]", "[55,\"x\",-50]"),
+          with("\"worstPatch\":1", "\"worstPatch\":4"),
+          with("\"decimals\":2", "\"decimals\":1e300"),
+          with("\"worstPatch\":1", "\"worstPatch\":-1"), with("[55,-37,-50]", "[55,\"x\",-50]"),
           with("\"patches\": [", "\"others\": ["), with("\"CIE2000\"", "4")}) {
         problem.clear();
         EXPECT_FALSE(readResult(text, problem)) << text.substr(0, 200);

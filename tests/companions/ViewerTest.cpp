@@ -101,6 +101,52 @@ TEST_F(Viewer, ItsPolicyStopsWhatIsNotThePagesOwn) {
     EXPECT_THAT(seen.error, HasSubstr("Content Security Policy"));
 }
 
+// A person's hand: a script in the page, which its policy has to let in for once.
+TEST_F(Viewer, SortsFindsAndSavesPatches) {
+    ASSERT_EQ(show().exitCode, 0);
+    std::string page = support::contentsOf(m_folder + "/" + pageName);
+    const std::size_t policy = page.find("<meta http-equiv=\"Content-Security-Policy\"");
+    page.erase(policy, page.find('\n', policy) - policy);
+    page.insert(page.rfind("</body>"), R"(<script>
+        const seen = (name, text) => { document.body.append(`\n[${name}: ${text}]\n`); };
+        const ids = () => [...document.querySelectorAll("td.patch")].map((cell) =>
+            cell.firstChild.data.trim()).join("|");
+        const heading = (i) => document.querySelectorAll("#patches th button")[i];
+        const find = (text) => {
+            document.getElementById("find").value = text;
+            document.getElementById("find").dispatchEvent(new Event("input"));
+        };
+        seen("worst", ids());
+        heading(8).click();
+        seen("best", ids());
+        heading(0).click();
+        seen("labels", ids());
+        heading(5).click();
+        seen("lighter", ids());
+        find("100 0 0 0");
+        seen("device", ids());
+        find("PAPER");
+        seen("name", ids());
+        find("nothing");
+        seen("none", document.getElementById("range").textContent);
+        HTMLAnchorElement.prototype.click = () => {};
+        URL.createObjectURL = (blob) => { blob.text().then((text) => seen("csv", text)); return ""; };
+        document.getElementById("csv").click();
+    </script>)");
+    const support::Outcome seen = browse(m_scratch.write("handled.html", page));
+    EXPECT_THAT(seen.error, Not(HasSubstr("CONSOLE")));
+    for (const char* part :
+         {"[worst: =2+5|row 3|A1|A4]", "[best: A4|A1|row 3|=2+5]", "[labels: =2+5|A1|A4|row 3]",
+          "[lighter: A1|row 3|=2+5|A4]", "[device: =2+5]", "[name: A1]", "[none: None found]",
+          "id,name,CMYK_C,CMYK_M,CMYK_Y,CMYK_K,target_L,target_a,target_b,measured_L,measured_a,"
+          "measured_b,difference",
+          "\nA1,paper,0,0,0,0,95,0,-2,95,0.5,-3,1.25",
+          "\n'=2+5,\"\"\"&gt;&lt;img src=x "
+          "onerror=hostile()&gt;\",100,0,0,0,55,-37,-50,52,-35,-46,4.75",
+          "\n,,0,0,100,0,89,-5,93,88,-4,90,1.5", "\nA4,,0,0,0,100,16,0,0,,0,0,\r\n"})
+        EXPECT_THAT(seen.output, HasSubstr(part));
+}
+
 TEST_F(Viewer, ListsReportsAndPassesOverWhatIsNone) {
     const std::string job = m_scratch.makeFolder("Tintgate") + "/JobID_7";
     std::filesystem::rename(m_folder, job);
