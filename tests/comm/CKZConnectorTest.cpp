@@ -34,24 +34,23 @@ class ConnectorTest : public CommTest {
 TEST_F(ConnectorTest, LogsInStepByStep) {
     auto connector = connect();
     EXPECT_TRUE(connector->IsLoggedIn());
-    EXPECT_THAT(takeCalls(), ElementsAre("Release", "CreateInstance", "Initialize",
-                                         "IsAlive host 50005", "Login", "GetContainer"));
-    EXPECT_STREQ(plugIn->seen.user, "Aus");
-    EXPECT_STREQ(plugIn->seen.password, "p\xe4ss");
+    EXPECT_THAT(takeCalls(), ElementsAre("3", "4", "6", "26 host 50005", "9", "12"));
+    EXPECT_STREQ(plugIn->record.user, "Aus");
+    EXPECT_STREQ(plugIn->record.password, "p\xe4ss");
     connector.reset();
-    EXPECT_THAT(takeCalls(), ElementsAre("Logout", "Uninitialize"));
+    EXPECT_THAT(takeCalls(), ElementsAre("10", "11"));
 
     plugIn->set(0, 0, "System/Product/MajorVersion", 4);
     const struct {
-        const char* slot;
+        int slot;
         int answer;
         int code;
         const char* lastCall;
     } cases[] = {
-        {"Initialize", 4, 4, "Initialize"},
-        {"IsAlive", 2, -2005, "IsAlive host 50005"},
-        {"Login", -2030, -2030, "Login"},
-        {"", 0, 0, "Uninitialize"}, // The server is too old.
+        {6, 4, 4, "6"},
+        {26, 2, -2005, "26 host 50005"},
+        {9, -2030, -2030, "9"},
+        {0, 0, 0, "11"}, // The server is too old.
     };
     for (const auto& [slot, answer, code, lastCall] : cases) {
         plugIn->results = {{slot, answer}};
@@ -143,14 +142,14 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
     int number = 9; // As the plug-in counts them, and then how many it writes, with which result.
     int written = 9;
     int code = 0;
-    plugIn->onGetTicketData = [&](int kind, int* size, int* buffer) {
-        if (kind == 0) {
-            *buffer = number;
-            return 0;
+    plugIn->onCall = [&](int slot) {
+        if (slot == 13 && *plugIn->size == 4) {
+            *static_cast<int*>(plugIn->data) = number;
+        } else if (slot == 13) {
+            std::copy_n(ids.begin(), std::min(written, 9), static_cast<int*>(plugIn->data));
+            *plugIn->size = written * static_cast<int>(sizeof(int));
+            plugIn->results[13] = code;
         }
-        std::copy_n(ids.begin(), std::min(written, 9), buffer);
-        *size = written * static_cast<int>(sizeof(int));
-        return code;
     };
     const auto find = [&](bool remeasure, int result) {
         int* found = &code;
@@ -159,11 +158,12 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
         EXPECT_TRUE(count > 0 || found == nullptr || code != 0);
         const std::vector<int> list(found, found + count);
         std::free(found);
+        plugIn->results.clear();
         return list;
     };
     takeCalls();
     EXPECT_THAT(find(false, 0), ElementsAre(20, job, 22, 25, 27));
-    EXPECT_THAT(takeCalls(), ElementsAre("GetTicketData 3 0 4", "GetTicketData 3 1 36"));
+    EXPECT_THAT(takeCalls(), testing::IsSupersetOf({"13 3 0 0 4", "13 3 1 0 36"}));
     EXPECT_THAT(find(true, 0), ElementsAre(20, 21, 23, 27));
     written = 1000;
     EXPECT_THAT(find(true, 0), ElementsAre(20, 21, 23, 27));
@@ -184,12 +184,14 @@ TEST_F(ConnectorTest, MovesFiles) {
     const wxString local = wxString::FromUTF8(m_local);
     std::thread delivery;
     int delay = 0;
-    plugIn->onGetFile = [&](const std::string& path) {
-        EXPECT_FALSE(support::exists(path)); // The old one is not taken for the new one.
-        delivery = std::thread([path, wait = delay] {
-            std::this_thread::sleep_for(std::chrono::milliseconds(wait));
-            std::ofstream(path) << "new";
-        });
+    plugIn->onCall = [&](int slot) {
+        if (slot == 18) {
+            EXPECT_FALSE(support::exists(m_local)); // The old one is not taken for the new one.
+            delivery = std::thread([this, wait = delay] {
+                std::this_thread::sleep_for(std::chrono::milliseconds(wait));
+                std::ofstream(m_local) << "new";
+            });
+        }
     };
     const auto download = [&](int limit, int milliseconds) {
         std::ofstream(m_local) << "old";
@@ -202,11 +204,11 @@ TEST_F(ConnectorTest, MovesFiles) {
     EXPECT_EQ(takeCalls().back(), "18 " + m_local + " server.txt");
     EXPECT_FALSE(download(60, 300));
     EXPECT_FALSE(download(0, 0));
-    plugIn->results["18"] = 3;
+    plugIn->results[18] = 3;
     EXPECT_FALSE(download(5000, 50));
     EXPECT_EQ(support::contentsOf(m_local), "new"); // It was waited for all the same.
     plugIn->results.clear();
-    plugIn->onGetFile = nullptr;
+    plugIn->onCall = nullptr;
     std::filesystem::remove(m_local);
     std::filesystem::create_directory(m_local);
     EXPECT_FALSE(connector->DownloadFile(local, "server.txt", 40));
@@ -214,7 +216,7 @@ TEST_F(ConnectorTest, MovesFiles) {
 
     EXPECT_TRUE(connector->UploadFile(L"J\u00f6\xdcff", "to"));
     EXPECT_EQ(takeCalls().back(), "20 J\xc3\xb6\xff to");
-    plugIn->results["IsAlive"] = 2;
+    plugIn->results[26] = 2;
     EXPECT_FALSE(connector->UploadFile(local, "x") || connector->DownloadFile(local, "x", 40));
 }
 

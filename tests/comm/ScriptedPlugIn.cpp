@@ -1,6 +1,5 @@
 #include "tests/comm/ScriptedPlugIn.h"
 
-#include <cstring>
 #include <memory>
 
 #include "comgui/MemoryKeep.h"
@@ -26,119 +25,91 @@ namespace {
 constexpr std::uint64_t handle = 0x8877665544332211;
 int instanceWord = 0;
 
-std::string text(const char* value) {
-    return value == nullptr ? "(null)" : value;
+std::string shown(int number) {
+    return " " + std::to_string(number);
 }
-
-int answer(const std::string& slot, const std::string& arguments = "") {
-    ScriptedPlugIn& state = *scriptedPlugIn();
-    state.calls.push_back(slot + arguments);
-    return state.results.count(slot) != 0 ? state.results[slot] : 0;
+std::string shown(const char* text) {
+    return std::string(" ") + (text == nullptr ? "(null)" : text);
 }
-
-// Instance and session have to be those that were given out.
-int answer(const std::string& slot, void* instance, std::uint64_t session,
-           const std::string& arguments = "") {
-    const bool known = instance == &instanceWord && session == handle;
-    return answer(slot, (known ? "" : " STRANGER") + arguments);
+std::string shown(std::uint64_t session) {
+    return session == handle ? "" : " ?";
 }
-
-int see(const char* slot, void* instance, ComSessionRecord* record) {
-    scriptedPlugIn()->seen = *record;
+std::string shown(ComSessionRecord* record) {
+    scriptedPlugIn()->record = *record;
     record->session = handle;
-    return answer(slot, instance, handle);
+    return "";
+}
+std::string shown(int* size) {
+    scriptedPlugIn()->size = size;
+    return size == nullptr ? "" : shown(*size);
+}
+std::string shown(void* data) {
+    scriptedPlugIn()->data = data;
+    return "";
+}
+std::string shown(TJobIdentification*) {
+    return "";
 }
 
-template<int Slot>
-int file(void* instance, std::uint64_t session, const char* first, const char* second) {
-    const int result =
-        answer(std::to_string(Slot), instance, session, " " + text(first) + " " + text(second));
-    if (Slot == 18 && scriptedPlugIn()->onGetFile) {
-        scriptedPlugIn()->onGetFile(first);
+int answer(int slot, const std::string& arguments) {
+    ScriptedPlugIn& plugIn = *scriptedPlugIn();
+    plugIn.calls.push_back(std::to_string(slot) + arguments);
+    if (plugIn.onCall) {
+        plugIn.onCall(slot);
     }
-    return result;
+    return plugIn.results[slot];
 }
 
-ComGUIModuleInterface operations() {
-    ComGUIModuleInterface table;
-    table.CreateInstance = [](void** instance) {
-        *instance = &instanceWord;
-        return answer("CreateInstance");
-    };
-    table.Initialize = [](void* instance, ComSessionRecord* record) {
-        return see("Initialize", instance, record);
-    };
-    table.Login = [](void* instance, ComSessionRecord* record) {
-        return see("Login", instance, record);
-    };
-    table.Logout = [](void* instance, std::uint64_t session) {
-        return answer("Logout", instance, session);
-    };
-    table.Uninitialize = [](void* instance, ComSessionRecord*) {
-        return answer("Uninitialize", instance, handle);
-    };
-    table.GetContainer = [](void* instance, std::uint64_t session) -> const MTICKET_ACCESS* {
-        answer("GetContainer", instance, session);
-        return scriptedPlugIn()->hasContainer ? &scriptedPlugIn()->access : nullptr;
-    };
-    table.GetTicketData = [](void* instance, std::uint64_t session, int type, int kind, int,
-                             int* size, void* buffer) {
-        const int result = answer("GetTicketData", instance, session,
-                                  " " + std::to_string(type) + " " + std::to_string(kind) + " " +
-                                      std::to_string(*size));
-        const auto& script = scriptedPlugIn()->onGetTicketData;
-        return script ? script(kind, size, static_cast<int*>(buffer)) : result;
-    };
-    table.SetTicketData = [](void* instance, std::uint64_t session, int, int, int, int* size,
-                             void* buffer) {
-        const auto length = static_cast<std::size_t>(size == nullptr ? 0 : *size);
-        scriptedPlugIn()->seenData.assign(static_cast<const char*>(buffer), length);
-        return answer("SetTicketData", instance, session);
-    };
-    table.SendCommand = [](void* instance, std::uint64_t session, const char* command, int size,
-                           void* data) {
-        if (std::strcmp(command, "local.set.callback") == 0) {
-            const int id = 77;
-            ticket::single::SetParameter::call(*static_cast<const STICKET_ACCESS*>(data),
-                                               "iGUINotificationID", PARAM_INT, &id,
-                                               POSITION_WHOLE);
-        }
-        return answer("SendCommand", instance, session,
-                      " " + text(command) + " " + std::to_string(size));
-    };
-    table.PutFile = file<17>;
-    table.GetFile = file<18>;
-    table.SendJob = [](void* instance, std::uint64_t session, TJobIdentification*,
-                       const char* first,
-                       const char* second) { return file<19>(instance, session, first, second); };
-    table.PutFileRaw = file<20>;
-    table.hSTicketInstance = store::ticketFactory();
-    table.GetFileRaw = file<24>;
-    table.IsAlive = [](void* instance, const char* host, int port) {
-        return answer("IsAlive", instance, handle, " " + text(host) + " " + std::to_string(port));
-    };
-    return table;
+template<int Slot, class... Arguments>
+std::int32_t call(void* instance, Arguments... arguments) {
+    return answer(Slot,
+                  (std::string(instance == &instanceWord ? "" : " ?") + ... + shown(arguments)));
 }
 
-constexpr unsigned char interfaceID[16] = {0x33, 0xFC, 0x3B, 0x14, 0x6C, 0xFF, 0x11, 0xD8,
-                                           0xAB, 0x09, 0x00, 0x30, 0x65, 0xB1, 0x34, 0x6E};
+std::int32_t createInstance(void** instance) {
+    *instance = &instanceWord;
+    return answer(4, "");
+}
+
+const MTICKET_ACCESS* getContainer(void* instance, std::uint64_t session) {
+    call<12>(instance, session);
+    return scriptedPlugIn()->hasContainer ? &scriptedPlugIn()->access : nullptr;
+}
+
+std::int32_t queryInterface(void*, CFUUIDBytes id, void** interface) {
+    static ComGUIModuleInterface table = {
+        .CreateInstance = createInstance,
+        .Initialize = call<6>,
+        .Login = call<9>,
+        .Logout = call<10>,
+        .Uninitialize = call<11>,
+        .GetContainer = getContainer,
+        .GetTicketData = call<13>,
+        .SetTicketData = call<14>,
+        .SendCommand = call<16>,
+        .PutFile = call<17>,
+        .GetFile = call<18>,
+        .SendJob = call<19>,
+        .PutFileRaw = call<20>,
+        .hSTicketInstance = store::ticketFactory(),
+        .GetFileRaw = call<24>,
+        .IsAlive = call<26>,
+    };
+    static ComGUIModuleInterface* given = &table;
+    const bool known = id.bytes[0] == 0x33 && id.bytes[15] == 0x6E;
+    *interface = known && scriptedPlugIn()->hasInterface ? &given : nullptr;
+    return 0;
+}
+
+std::uint32_t release(void*) {
+    return static_cast<std::uint32_t>(answer(3, ""));
+}
 
 } // namespace
 
 // The object that the factory makes is not the interface that it is asked for.
 EXPORTED void* makeScriptedPlugIn(const void*, const void*) {
-    static ComGUIModuleInterface header;
+    static ComGUIModuleInterface header = {.QueryInterface = queryInterface, .Release = release};
     static ComGUIModuleInterface* object = &header;
-    header.QueryInterface = [](void*, CFUUIDBytes id, void** interface) {
-        static ComGUIModuleInterface table = operations();
-        static ComGUIModuleInterface* given = &table;
-        const bool known = std::memcmp(id.bytes, interfaceID, sizeof interfaceID) == 0;
-        *interface = known && scriptedPlugIn()->hasInterface ? &given : nullptr;
-        return 0;
-    };
-    header.Release = [](void*) -> std::uint32_t {
-        answer("Release");
-        return 0;
-    };
     return &object;
 }

@@ -1,5 +1,5 @@
 // A comm plug-in whose answers a test sets and whose calls it reads. It is a shared object in a
-// bundle; its tickets are those of the real engine.
+// bundle; its tickets are those of the real engine. Slots go by their numbers.
 #pragma once
 
 #include <functional>
@@ -9,16 +9,21 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
 #include "ticket/TicketContainer.h"
+#include "ticket/TicketSlots.h"
 
 struct ScriptedPlugIn {
-    std::vector<std::string> calls;     ///< Names of slots with their arguments.
-    std::map<std::string, int> results; ///< By the name of the slot, for files its number; else 0.
+    /// Each with its texts and integers: "26 host 50005". Instance and session are not shown if
+    /// they are those that were given out, and "?" otherwise.
+    std::vector<std::string> calls;
+    std::map<int, int> results; ///< 0 where nothing is set.
+    std::function<void(int slot)> onCall;
     bool hasInterface = true;
     bool hasContainer = true;
-    ComSessionRecord seen; ///< The record as Initialize or Login last saw it.
-    std::string seenData;  ///< The bytes of SetTicketData.
-    std::function<void(const std::string& local)> onGetFile;
-    std::function<int(int kind, int* size, int* buffer)> onGetTicketData;
+
+    // Of the last call that had one.
+    ComSessionRecord record;
+    int* size = nullptr;
+    void* data = nullptr;
 
     MTICKET_ACCESS access; ///< A copy of the container's record, whose words may be replaced.
 
