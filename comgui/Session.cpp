@@ -2,11 +2,13 @@
 
 #include <algorithm>
 #include <cstdio>
+#include <cstdlib>
 #include <cstring>
 #include <filesystem>
 #include <fstream>
 #include <utility>
 
+#include <sys/stat.h>
 #include <unistd.h>
 
 #include "comgui/SingleTicket.h"
@@ -30,12 +32,23 @@ std::string utf8FromLatin1(const std::string& text) {
     return utf8;
 }
 
-/// A local file under another name beside it, until it is complete.
+/// A local file under another name in its folder, until it is complete.
 class LocalCopy {
   public:
     explicit LocalCopy(const std::string& path)
-        : m_path(path), m_part(path + ".part-" + std::to_string(getpid())),
-          m_stream(m_part, std::ios::binary | std::ios::trunc) {}
+        : m_path(path), m_part(path.substr(0, path.rfind('/') + 1) + ".tintgate-part-XXXXXX") {
+        const int file = mkstemp(m_part.data());
+        if (file < 0) {
+            m_part.clear();
+            return;
+        }
+        // As any new file has it, where mkstemp leaves nothing to others.
+        const mode_t mask = umask(0);
+        umask(mask);
+        fchmod(file, 0666 & ~mask);
+        close(file);
+        m_stream.open(m_part, std::ios::binary | std::ios::trunc);
+    }
     ~LocalCopy() {
         if (!m_part.empty()) {
             std::remove(m_part.c_str());
@@ -44,6 +57,7 @@ class LocalCopy {
     LocalCopy(const LocalCopy&) = delete;
     LocalCopy& operator=(const LocalCopy&) = delete;
 
+    bool isOpen() const { return m_stream.is_open(); }
     std::ostream& stream() { return m_stream; }
 
     bool putInPlace() {
@@ -57,7 +71,7 @@ class LocalCopy {
 
   private:
     const std::string m_path;
-    std::string m_part; ///< Empty once in place.
+    std::string m_part; ///< Empty where there is none (any more).
     std::ofstream m_stream;
 };
 
@@ -114,7 +128,7 @@ Code Session::getTicketData(int type, int kind, int index, int* size, void* buff
         size == nullptr || *size < 0 || buffer == nullptr) {
         return codeRefused;
     }
-    const std::vector<int> ids = m_keep->ids(type);
+    const std::vector<int> ids = m_keep->listIds(type);
     if (kind == numberKind) {
         const int number = static_cast<int>(ids.size());
         if (*size < static_cast<int>(sizeof number)) {
@@ -188,7 +202,7 @@ Code Session::getFile(const std::string& local, const std::string& server) {
         return codeRefused;
     }
     LocalCopy copy(local);
-    if (!copy.stream()) {
+    if (!copy.isOpen()) {
         return codeNotWritten;
     }
     m_engine->getFile(server, copy.stream());

@@ -388,22 +388,19 @@ class SqliteEngine : public StoreEngine {
     Statement m_removeUser{m_database, "DELETE FROM users WHERE name = ?"};
 };
 
-std::shared_ptr<Elements> single(Value value) {
-    auto elements = std::make_shared<Elements>();
-    elements->put(0, std::move(value));
-    return elements;
-}
-
 /// What every client asks a server for; below version 5 they log out again.
-void makeSystemTicket(StoreEngine& store, const std::string& serverName) {
+void makeSystemTicket(Database& database, const std::string& serverName) {
     constexpr int majorVersion = 5;
-    TicketContent system;
-    system.put("System/Product/MajorVersion", single(majorVersion));
-    system.put("System/ServerName", single(Text{std::make_shared<Bytes>(serverName)}));
-    Scope scope;
-    scope.everything = true;
-    store.create(0, 0);
-    store.change(0, 0, scope, [&](TicketContent& content) { content = system; });
+    Statement insert(database, "INSERT INTO keys (ticket, name, value)"
+                               " SELECT number, ?, ? FROM tickets WHERE type = 0 AND id = 0");
+    const auto put = [&](const char* name, Value value) {
+        Elements elements;
+        elements.put(0, std::move(value));
+        insert.run(name, keyBytes(elements)).finish();
+    };
+    database.run("INSERT INTO tickets (type, id) VALUES (0, 0)");
+    put("System/Product/MajorVersion", majorVersion);
+    put("System/ServerName", Text{std::make_shared<Bytes>(serverName)});
 }
 
 void makeEmptyFolder(const std::string& address) {
@@ -432,21 +429,19 @@ void makeStore(const std::string& address, const std::string& serverName) {
     makeEmptyFolder(address);
     const std::string folder = realPath(address);
     const ServerFiles files(folder, true);
-    {
-        Database database(databasePath(folder), true);
-        // Log and index take the database's permissions. Password hashes are nobody else's.
-        const mode_t mask = umask(0);
-        umask(mask);
-        chmod(databasePath(folder).c_str(), 0660 & ~mask);
-        database.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = FULL");
-        Transaction transaction(database);
-        database.run(tables);
-        database.run(("PRAGMA user_version = " + std::to_string(format)).c_str());
-        // Last, so that a store that was not made to its end is none.
-        database.run(("PRAGMA application_id = " + std::to_string(applicationId)).c_str());
-        transaction.commit();
-    }
-    makeSystemTicket(*openStore(folder), serverName);
+    Database database(databasePath(folder), true);
+    // Log and index take the database's permissions. Password hashes are nobody else's.
+    const mode_t mask = umask(0);
+    umask(mask);
+    chmod(databasePath(folder).c_str(), 0660 & ~mask);
+    database.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = FULL");
+    Transaction transaction(database);
+    database.run(tables);
+    makeSystemTicket(database, serverName);
+    database.run(("PRAGMA user_version = " + std::to_string(format)).c_str());
+    // Without it a database is no store, so one that was not made to its end is none.
+    database.run(("PRAGMA application_id = " + std::to_string(applicationId)).c_str());
+    transaction.commit();
 }
 
 bool bringStoreUpToDate(const std::string& address) {

@@ -70,8 +70,12 @@ void clearResults(SETMULTIPAR* table) {
 StoreKeep::StoreKeep(std::shared_ptr<StoreEngine> engine) : m_engine(std::move(engine)) {}
 
 std::vector<int> StoreKeep::ids(int type) {
+    return orElse(std::vector<int>(), [&] { return listIds(type); });
+}
+
+std::vector<int> StoreKeep::listIds(int type) {
     m_idsAsked = m_idsAsked || type == jobType;
-    return orElse(std::vector<int>(), [&] { return m_engine->ids(type); });
+    return m_engine->ids(type);
 }
 
 bool StoreKeep::exists(int type, int id) {

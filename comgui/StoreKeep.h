@@ -24,6 +24,8 @@ class StoreKeep : public TicketKeep {
     explicit StoreKeep(std::shared_ptr<StoreEngine> engine);
 
     std::vector<int> ids(int type) override;
+    /// The same, but that a failure of the store is thrown: none is not the same as not known.
+    std::vector<int> listIds(int type);
     bool exists(int type, int id) override;
     bool create(int type, int id) override;
     int createNext(int type) override;
