@@ -23,21 +23,26 @@ store::User userNamed(store::StoreEngine& store, const std::string& typed) {
     return *user;
 }
 
+void refuseKnown(store::StoreEngine& store, const UserOptions& options) {
+    if (store.user(userName(options.name))) {
+        throw Failure(Status::Exists, "there is a user " + options.name);
+    }
+}
+
 void add(const Invocation& invocation, const UserOptions& options) {
     const std::string name = userName(options.name);
     const auto store = invocation.open();
-    if (store->user(name)) {
-        throw Failure(Status::Exists, "there is a user " + options.name);
-    }
-    const std::string password = askPassword(options.passwordFile, options.name);
-    store->putUser({name, store::passwordHash(password), false});
+    refuseKnown(*store, options);
+    const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
+    refuseKnown(*store, options); // A person may take minutes to type a password.
+    store->putUser({name, hash, false});
 }
 
 void changePassword(const Invocation& invocation, const UserOptions& options) {
     const auto store = invocation.open();
     userNamed(*store, options.name);
     const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
-    // Fetched again: a person may take minutes to type a password.
+    // Fetched again, as above.
     store::User user = userNamed(*store, options.name);
     user.passwordHash = hash;
     store->putUser(user);
