@@ -102,7 +102,8 @@ void appendChanges(Records& out, const Run& present, const Run& wanted) {
     for (int position = highOld; position > highNew; --position) {
         changes.push_back(deletion(wanted.first->key, position));
     }
-    if (changes.front().position == POSITION_WHOLE) {
+    // There are none where a plug-in shows an element twice.
+    if (!changes.empty() && changes.front().position == POSITION_WHOLE) {
         changes.front().position = 0; // As the whole key it would replace the other elements.
     }
     append(out, changes.data(), changes.data() + changes.size());

@@ -1,3 +1,4 @@
+#include "ticket/TicketDifference.h"
 #include "ticket/TicketUpdateList.h"
 
 #include <gtest/gtest.h>
@@ -107,6 +108,7 @@ TEST(Flush, SendsTheDifferenceAlone) {
         {"a=1,2,3,4,5", "a[3]=-", "a[3]=5 a[4]=-"},
         {"a=1,2,3", "a[0]=7 a[1]=8 a[2]=9", "a[-1]=7 a[1]=8 a[2]=9"},
         {"a=1,2,3", "a[0]=7 a[2]=9", "a[0]=7 a[2]=9"},
+        {"a=1,2,3", "a[-1]=1 a[2]=2", "a[2]=2"}, // The same value at another position.
         // A scalar, or a vector of one, is always sent whole.
         {"a[-1]=1", "a[1]=2", "a[-1]=1 a[1]=2"},
         {"a=1,2,3", "a[-1]=1", "a[-1]=1"},
@@ -116,6 +118,7 @@ TEST(Flush, SendsTheDifferenceAlone) {
         {"a[-1]=1 b=1,2 c[-1]=3", "b[-1]=-", "b[-1]=-"},
         {"a[-1]=1 c[-1]=3", "c[-1]=- a[-1]=-", "a[-1]=- c[-1]=-"},
         {"a[-1]=1", "b[-1]=-", ""},
+        {"a[-1]=1 b=1,2", "a[-1]=1 b[-1]=-", "b[-1]=-"},
         {"a[-1]=1", "a[-1]=- a[-1]=1", ""},
         {"a=1,2,3", "a[-1]=- a[-2]=1 a[-2]=2", "a[2]=-"},
         {"a=1,2", "a[1]=- a[0]=-", "a[-1]=-"},
@@ -148,6 +151,14 @@ TEST(Flush, SendsTheDifferenceAlone) {
         EXPECT_TRUE(list.FlushToContainer(server.record(), &count, {})); // Nothing is left.
         EXPECT_EQ(count, 0u);
     }
+}
+
+TEST(Flush, BearsAPlugInThatShowsAnElementTwice) {
+    RecordTable table("a=1,2 a[1]=2");
+    SETMULTIPAR* present = table.records();
+    present[1].key = present[2].key = present[0].key;
+    const SETMULTIPAR wanted[] = {present[0], present[1], {}};
+    EXPECT_TRUE(ticket::difference(present, wanted).empty());
 }
 
 /// Substitutions as "type -1>3" and "id -9999>1".
@@ -189,6 +200,8 @@ TEST(Flush, CreatesVirtualTicketsFirst) {
     EXPECT_FALSE(list.GetActualTicketID(real, -9997));
     EXPECT_EQ(real, -1);
     EXPECT_TRUE(list.IsEmpty(TICKET_TYPE_LOCAL, 7));
+    EXPECT_TRUE(list.FlushToContainer(server.record(), nullptr, {}));
+    EXPECT_FALSE(list.GetActualTicketID(real, -9998));
 }
 
 TEST(Flush, OfOneTicketLeavesTheOthers) {
@@ -214,10 +227,12 @@ TEST(Flush, OfOneTicketLeavesTheOthers) {
     EXPECT_EQ(server.sent, "3/13 a[-1]=3");
     int real = 0;
     EXPECT_TRUE(list.GetActualTicketID(real, -9998));
+    id = -9998; // Again, and nothing is pending there now.
+    EXPECT_FALSE(list.FlushToContainer(server.record(), type, id, nullptr, {}));
+    EXPECT_FALSE(list.GetActualTicketID(real, -9998));
 
     EXPECT_TRUE(list.FlushToContainer(server.record(), &count, {}));
     EXPECT_EQ(server.sent, "3/13 a[-1]=3\n3/12 a[-1]=2");
-    EXPECT_FALSE(list.GetActualTicketID(real, -9998));
 
     edit(list, jobs, 12, "a[-1]=4");
     type = 51;
@@ -275,8 +290,11 @@ TEST(Flush, FailsWithoutTicketsOfItsOwn) {
     EXPECT_EQ(server.sent, "");
 
     // A ticket that can't be made does not stop the others.
-    ticket::container::TicketOperation::put(*server.record(),
-                                            [](void*, int, int, TICKET_OP, void*) { return 0; });
+    ticket::container::TicketOperation::put(
+        *server.record(), [](void*, int, int id, TICKET_OP op, void*) {
+            EXPECT_EQ(id, op.code == MTICKET_OP_CREATE_NEXT ? TICKET_ID_NEW : 12);
+            return 0;
+        });
     takeUpdateLog();
     Substitutions substitutions;
     EXPECT_TRUE(list.FlushToContainer(server.record(), nullptr, substitutions.callback()));

@@ -97,6 +97,7 @@ TEST_F(UpdateList, OverlaysTheServersValues) {
 
     EXPECT_TRUE(set("a", 3));
     EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, -1), 1);
+    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, 1), 0); // No longer deleted.
     std::set<std::string> keys;
     EXPECT_TRUE(list.GetChangedKeysList(jobs, id, keys));
     EXPECT_EQ(keys, std::set<std::string>{"a"});
@@ -144,7 +145,14 @@ TEST_F(UpdateList, KeepsWhatDeletionsTakeAway) {
     EXPECT_TRUE(list.Clear(jobs, id));
     EXPECT_TRUE(list.m_empty);
     EXPECT_FALSE(list.IsEmpty(jobs, 13));
+    list.xSetParameter(jobs, 14, "k", PARAM_INT, &value, -1, false);
     EXPECT_FALSE(list.Clear(jobs, 13));
+    EXPECT_FALSE(list.m_empty);
+    EXPECT_FALSE(list.Clear(jobs, 14));
+    EXPECT_TRUE(list.m_empty);
+    list.DelParameter(jobs, id, "a", -1, false);
+    list.Clear();
+    EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "a", none), 0);
 }
 
 TEST_F(UpdateList, ToleratesAMissingContainer) {
@@ -158,6 +166,7 @@ TEST_F(UpdateList, ToleratesAMissingContainer) {
 }
 
 TEST_F(UpdateList, TellsOfEachChange) {
+    list.AddParameter(jobs, id, "n", "replaced", false);
     std::string told;
     list.RegisterSetParamCallback(
         [&](int type, int ticket, const char* key, PARAM_TYPE ptype, const void* value) {
@@ -183,6 +192,7 @@ TEST_F(UpdateList, TellsOfEachChange) {
     list.AddParameter(jobs, id, "m", "c", false);
     list.xGetParameter(jobs, id, "m", PARAM_STRING, &again, -1);
     EXPECT_EQ(first, again);
+    EXPECT_TRUE(list.m_stringCache.find("c"));
 }
 
 TEST_F(UpdateList, RefusesWithoutATrace) {
@@ -235,7 +245,10 @@ TEST_F(UpdateList, MergesATicketAsItIsWalked) {
         EXPECT_EQ(taken, c.taken) << c.keys[0];
     }
     list.Clear();
+    int told = 0;
+    list.RegisterSetParamCallback([&](int, int, const char*, PARAM_TYPE, const void*) { ++told; });
     list.Merge(jobs, 13, source.real(), PARTIAL_MODE());
+    EXPECT_EQ(told, 3);
     list.Merge(jobs, 13, nullptr, PARTIAL_MODE());
     std::set<std::string> taken;
     list.GetChangedKeysList(jobs, 13, taken);
