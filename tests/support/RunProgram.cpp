@@ -75,8 +75,13 @@ std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     const int nothing = open("/dev/null", O_RDONLY);
     dup2(nothing, STDIN_FILENO);
     dup2(error, STDERR_FILENO);
-    if (options.user != 0 && !becomeUser(options.user)) {
-        refuse("become another user");
+    // An ordinary user may not be able to reach the build tree, so the program is opened before.
+    int program = -1;
+    if (options.user != 0) {
+        program = open(arguments[0], O_RDONLY | O_CLOEXEC);
+        if (!becomeUser(options.user)) {
+            refuse("become another user");
+        }
     }
     if (!options.outputPath.empty()) {
         output = open(options.outputPath.c_str(), O_WRONLY | O_CREAT, 0644);
@@ -87,7 +92,11 @@ std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     if (!options.folder.empty() && chdir(options.folder.c_str()) != 0) {
         refuse(options.folder.c_str());
     }
-    execvpe(arguments[0], arguments, environment);
+    if (program >= 0) {
+        fexecve(program, arguments, environment);
+    } else {
+        execvpe(arguments[0], arguments, environment);
+    }
     refuse(arguments[0]);
 }
 
