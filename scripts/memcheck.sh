@@ -1,6 +1,6 @@
 #!/bin/sh
 # Runs the tests of the ticket library and its engine under valgrind, leaks included.
-# Needs a release build (scripts/test.sh makes one) and the package valgrind.
+# Needs a release build (scripts/test.sh makes one) and Debian's package valgrind.
 set -eu
 cd "$(dirname "$0")/.."
 

@@ -8,7 +8,7 @@ packages=(
   nlohmann-json3-dev libicu-dev libplist-dev libmd-dev libsqlite3-dev libsodium-dev libcli11-dev
   libexpat1-dev libjs-chart.js
   # To test and to measure
-  libgtest-dev libgmock-dev libbenchmark-dev python3-jsonschema argyll chromium
+  libgtest-dev libgmock-dev libbenchmark-dev python3-jsonschema argyll liblcms2-utils chromium
   # Data of printing conditions, and CMYK profiles
   icc-profiles-free libgs-common
 )
