@@ -9,6 +9,7 @@
 
 #include "ExitCodes.h"
 #include "analysis/Status.h"
+#include "analysis/Text.h"
 #include "colour/CgatsText.h"
 #include "colour/ColourFile.h"
 
@@ -17,14 +18,6 @@ namespace {
 
 constexpr std::size_t largestNamesFile = 1 << 20;
 constexpr std::size_t largestDefinition = 64 << 20;
-
-std::string_view trimmed(std::string_view text) {
-    constexpr std::string_view blanks = " \t\r\n";
-    const std::size_t from = text.find_first_not_of(blanks);
-    if (from == std::string_view::npos)
-        return {};
-    return text.substr(from, text.find_last_not_of(blanks) - from + 1);
-}
 
 /// A whole text that is a number.
 std::optional<unsigned int> numberOf(std::string_view text) {

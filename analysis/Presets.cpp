@@ -45,14 +45,6 @@ constexpr int largestId = 2147483647;
 
 using Status = int; // of ExitCodes.h; exitDone goes on
 
-std::string_view trimmed(std::string_view text) {
-    constexpr std::string_view blanks = " \t\r\n";
-    const std::size_t first = text.find_first_not_of(blanks);
-    if (first == std::string_view::npos)
-        return {};
-    return text.substr(first, text.find_last_not_of(blanks) - first + 1);
-}
-
 /// A number with a decimal point, whatever the locale, within its range.
 template<class Number>
 Status readNumber(std::string_view text, Number smallest, Number largest, Number& number) {

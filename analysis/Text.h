@@ -23,4 +23,7 @@ std::string documentText(std::wstring_view text);
 /// off.
 int decodeUtf8(const char*& from, const char* end);
 
+/// The text without the blanks, tabs and line ends around it.
+std::string_view trimmed(std::string_view text);
+
 } // namespace analysis

@@ -8,26 +8,12 @@
 #include <random>
 #include <string>
 
+#include "Fastest.h"
 #include "colour/CgatsText.h"
 
 using namespace colour;
 
 namespace {
-
-volatile double g_sink; // keeps a result from being optimised away
-
-/// Milliseconds of the fastest of several runs.
-double fastest(const std::function<double()>& work) {
-    double best = std::numeric_limits<double>::max();
-    for (int run = 0; run < 9; ++run) {
-        const auto start = std::chrono::steady_clock::now();
-        g_sink = work();
-        const std::chrono::duration<double, std::milli> taken =
-            std::chrono::steady_clock::now() - start;
-        best = std::min(best, taken.count());
-    }
-    return best;
-}
 
 std::string makeText(std::size_t patches, bool withSpectra) {
     std::mt19937 engine(1); // NOLINT: the same patches each time
@@ -81,8 +67,8 @@ double read(const std::string& text, bool spectra) {
 }
 
 void compare(const char* what, const std::string& text, bool spectra) {
-    const double bare = fastest([&] { return splitAndConvert(text); });
-    const double ours = fastest([&] { return read(text, spectra); });
+    const double bare = bench::fastest([&] { return splitAndConvert(text); });
+    const double ours = bench::fastest([&] { return read(text, spectra); });
     std::printf("%-44s %8.2f ms  bare %8.2f ms  ratio %.2f\n", what, ours, bare, ours / bare);
 }
 

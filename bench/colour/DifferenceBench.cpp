@@ -9,6 +9,7 @@
 
 #include <lcms2.h>
 
+#include "Fastest.h"
 #include "colour/Difference.h"
 
 using namespace colour;
@@ -16,21 +17,6 @@ using namespace colour;
 namespace {
 
 constexpr std::size_t count = 100'000;
-
-volatile double g_sink; // keeps a result from being optimised away
-
-/// Milliseconds of the fastest of several runs.
-double fastest(const std::function<double()>& work) {
-    double best = std::numeric_limits<double>::max();
-    for (int run = 0; run < 9; ++run) {
-        const auto start = std::chrono::steady_clock::now();
-        g_sink = work();
-        const std::chrono::duration<double, std::milli> taken =
-            std::chrono::steady_clock::now() - start;
-        best = std::min(best, taken.count());
-    }
-    return best;
-}
 
 using Peer = cmsFloat64Number (*)(const cmsCIELab*, const cmsCIELab*);
 
@@ -66,13 +52,13 @@ int main() {
                  {Formula::Cmc21, peerCmc},
                  {Formula::Ciede2000, peer2000}};
     for (const auto& c : cases) {
-        const double ours = fastest([&] {
+        const double ours = bench::fastest([&] {
             double sum = 0;
             for (std::size_t i = 0; i < count; ++i)
                 sum += difference(c.formula, targets[i], measured[i]);
             return sum;
         });
-        const double theirs = fastest([&] {
+        const double theirs = bench::fastest([&] {
             double sum = 0;
             for (std::size_t i = 0; i < count; ++i) {
                 const cmsCIELab first = asPeer(targets[i]);
