@@ -1,8 +1,9 @@
 #!/usr/bin/env python3
 """Makes a complete job for a store: tickets, and the files that they name.
 
-The job asks whether a print on super-calendered paper (measured: FOGRA40L) keeps to the printing
-condition for coated paper (references: FOGRA39L). Both data sets are in Debian's icc-profiles-free.
+By itself the job asks whether a print on super-calendered paper (measured: FOGRA40L) keeps to the
+printing condition for coated paper (references: FOGRA39L). Both data sets are in Debian's
+icc-profiles-free. The options make other jobs, also such that are still to be measured.
 
   make-job.py FOLDER          then, with the store made:
   tintgate-store import FOLDER/tickets.json
@@ -24,6 +25,7 @@ PRESETS = (HERE.parents[1] / "presets", HERE.parents[2] / "tintgate/presets")  #
 INSTALL = "/server"  # The server's own folder, as its jobs name it.
 TEMP = "/server/temp"
 STRIP = "example"
+CIEDE2000 = 4
 DEVICE = 33  # Number of the instrument; the names file of docs/instruments.md has its name.
 JDF_BYTES = 8192  # Updates of a JDF want 5,000 at least; blanks behind the end fill it up.
 STRIP_COLUMNS = 16
@@ -111,32 +113,72 @@ def value_keys(root, chart, patches):
     return {f"{root}/{name}": {"double": list(column)} for name, column in zip(names, columns)}
 
 
-def job_keys(arguments, preset_id, patches, measured, references):
-    root = "Remote/Measurement"
+def job_keys(arguments, preset_id):
+    """What is the same for both strips."""
     keys = {
         # What it is, and that it waits for its verification.
-        "Input/Title": {"string": "Summer catalogue, sheet 1"},
+        "Input/Title": {"string": arguments.title},
         "Input/SubType": {"int": 0},
         "Input/FileType": {"int": 0},
         "Job/Display/Status": {"int": 208},
         "Job/FromEsko": {"int": 0},
         "Remote/ShowInVerifier": {"int": 1},
-        "General/ParentID": {"int": 0},
-        "CMM/PaperName": {"string": "Super-calendered, 60 g/m2"},
+        "General/ParentID": {"int": arguments.parent},
+        "CMM/PaperName": {"string": arguments.paper},
         # Where the server keeps its files: server paths.
         "System/InstallFolder": {"string": INSTALL},
         "System/Folders/Temp": {"string": TEMP},
         "Output/Jdf/FileName": {"string": f"job-{arguments.job}.jdf"},
-        # How it is verified: one strip, stored references, CIEDE2000, the preset.
         "Workflow/Name": {"string": "Verification of proofs"},
-        "Workflow/Verify/Active": {"int": 1},
-        "Workflow/Verify/MeasurementWorkflow": {"int": 3},
-        "Workflow/Verify/DeltaEMode": {"int": 4},
-        "Workflow/Verify/ComparisonMethod": {"int": preset_id},
-        # The control strip.
+        "Workflow/Verify/Active": {"int": 3 if arguments.two_strips else 1},
         "Footer/Dynstrip/UseDynstrip": {"int": 0},
-        "Footer/ControlstripFile": {"string": f"{STRIP}.it8"},
-        # The measurement: how many there have been, and its values. CMYK is in percent.
+    }
+    for strip in strips(arguments):
+        keys.update(strip_keys(arguments, preset_id, "" if strip == 1 else "2"))
+    return keys
+
+
+def strips(arguments):
+    return (1, 2) if arguments.two_strips else (1,)
+
+
+def strip_keys(arguments, preset_id, suffix):
+    """How a strip is verified, and against what. The suffix is that of its keys."""
+    keys = {
+        f"Workflow/Verify/DeltaEMode{suffix}": {"int": CIEDE2000},
+        f"Workflow/Verify/ComparisonMethod{suffix}": {"int": preset_id},
+        f"Footer/ControlstripFile{suffix}": {"string": f"{STRIP}.it8"},
+    }
+    if arguments.parent:
+        keys["Footer/Nesting/ControlstripMode"] = {"int": 1}
+        keys[f"Footer/Nesting/ControlstripFile{suffix}"] = {"string": f"{STRIP}.it8"}
+    if is_profile(arguments.references):
+        keys[f"Footer/ControlstripInputProfile{suffix}"] = {
+            "string": f"{INSTALL}/{arguments.references.name}"}
+    elif arguments.unmeasured:
+        keys[f"Workflow/Verify/CharacterizationData{suffix}"] = {
+            "string": arguments.references.name}
+    keys[f"Workflow/Verify/MeasurementWorkflow{suffix}"] = {"int": workflow(arguments)}
+    return keys
+
+
+def workflow(arguments):
+    """Of a job's ways to its references, the one that fits. The third takes those of the ticket, or
+    a profile where the ticket has none, and is the only one that has a JDF updated."""
+    if arguments.unmeasured:
+        return 3 if is_profile(arguments.references) else 2
+    return 1 if is_profile(arguments.references) else 3
+
+
+def is_profile(path):
+    return path.suffix.lower() in (".icc", ".icm")
+
+
+def measurement_keys(root, patches, measured, references):
+    """A measurement below "Remote/Measurement" or "Remote/Measurement2", and the references, where
+    they are values."""
+    keys = {
+        # How many measurements there have been, and the values of the last. CMYK is in percent.
         f"{root}/Status": {"int": 1},
         f"{root}/Illumination/Mode": {"int": 1},
         f"{root}/Numpatches": {"int": len(patches)},
@@ -144,14 +186,16 @@ def job_keys(arguments, preset_id, patches, measured, references):
         f"{root}/SpectralValues/Base": {"int": 380},
         f"{root}/SpectralValues/Length": {"int": 0},
         f"{root}/SpectralValues/Stepsize": {"int": 10},
-        # The references, CMYK from 0 to 255.
-        f"{root}/Reference/Numpatches": {"int": len(patches)},
     }
     keys.update(value_keys(root, measured, patches))
+    for ink, tones in zip("CMYK", zip(*patches)):
+        keys[f"{root}/CMYKValues/{ink}Values"] = {"double": list(tones)}
+    if references is None:
+        return keys
+
+    keys[f"{root}/Reference/Numpatches"] = {"int": len(patches)}
     keys.update(value_keys(f"{root}/Reference", references, patches))
-    for index, ink in enumerate("CMYK"):
-        tones = [patch[index] for patch in patches]
-        keys[f"{root}/CMYKValues/{ink}Values"] = {"double": tones}
+    for ink, tones in zip("CMYK", zip(*patches)):  # From 0 to 255.
         keys[f"{root}/Reference/CMYKValues/{ink}Values"] = {
             "int": [math.floor(tone * 2.55 + 0.5) for tone in tones]}
     return keys
@@ -198,13 +242,54 @@ def parse_arguments():
     default = next((str(folder) for folder in PRESETS if folder.is_dir()), ".")
     parser.add_argument("folder", type=Path, help="is made, or filled")
     parser.add_argument("--job", type=int, default=7, help="number of the job (default 7)")
+    parser.add_argument("--title", default="Summer catalogue, sheet 1")
+    parser.add_argument("--paper", default="Super-calendered, 60 g/m2")
     parser.add_argument("--measured", type=Path, default=ICC / "FOGRA40L.ti3",
-                        help="chart with the measured values")
+                        help="chart with the measured values (default FOGRA40L)")
+    parser.add_argument("--unmeasured", action="store_true",
+                        help="the job is still to be measured")
     parser.add_argument("--references", type=Path, default=ICC / "FOGRA39L.ti3",
-                        help="chart with the reference values")
+                        help="chart with the reference values, or CMYK profile that gives them "
+                             "(default FOGRA39L)")
+    parser.add_argument("--two-strips", action="store_true",
+                        help="the job has a second strip, with the same patches")
+    parser.add_argument("--parent", type=int, default=0,
+                        help="the job is nested: number of its parent, whose ticket is made too")
     parser.add_argument("--preset", type=Path, default=Path(default) / "CVP_0001.xml",
                         help="file of the tolerance preset")
     return parser.parse_args()
+
+
+def tickets(arguments, patches, measured, references):
+    preset_id = int(xml.parse(arguments.preset).getroot().findtext("id"))
+    keys = job_keys(arguments, preset_id)
+    if not arguments.unmeasured:
+        for strip in strips(arguments):
+            root = "Remote/Measurement" if strip == 1 else "Remote/Measurement2"
+            keys.update(measurement_keys(root, patches, measured, references))
+    made = [{"type": 27, "id": preset_id, "keys": preset_keys(arguments.preset)},
+            {"type": 3, "id": arguments.job, "keys": keys}]
+    if arguments.parent:
+        # No job to be verified itself: it gets the results of its children.
+        made.append({"type": 3, "id": arguments.parent,
+                     "keys": {"Input/Title": {"string": "Sheet with several jobs"},
+                              "Job/Display/Status": {"int": 0},
+                              "Workflow/Verify/Active": {"int": 1}}})
+    return {"format": "tintgate tickets", "version": 1, "tickets": made}
+
+
+def put_server_files(server, arguments, patches, values):
+    for name in ("ControlCharts", "tickets", "temp", "IT8_CharacterizationData"):
+        (server / name).mkdir(parents=True, exist_ok=True)
+    (server / f"ControlCharts/{STRIP}.it8").write_bytes(strip_text(patches, values).encode("ascii"))
+    preset_id = int(xml.parse(arguments.preset).getroot().findtext("id"))
+    shutil.copyfile(arguments.preset, server / f"tickets/CVP_{preset_id:04}.xml")
+    (server / f"temp/job-{arguments.job}.jdf").write_text(jdf_text(arguments), encoding="ascii")
+    if is_profile(arguments.references):
+        shutil.copyfile(arguments.references, server / arguments.references.name)
+    elif arguments.unmeasured:
+        shutil.copyfile(arguments.references,
+                        server / "IT8_CharacterizationData" / arguments.references.name)
 
 
 def main():
@@ -212,25 +297,16 @@ def main():
     for path in (arguments.measured, arguments.references, arguments.preset):
         if not path.is_file():
             sys.exit(f"{path} is not there (the charts are in the package icc-profiles-free)")
-    measured, references = read_chart(arguments.measured), read_chart(arguments.references)
-    patches = [patch for patch in strip_patches() if patch in measured and patch in references]
+    measured = read_chart(arguments.measured)
+    references = None if is_profile(arguments.references) else read_chart(arguments.references)
+    values = measured if references is None else references  # What a strip's file shows.
+    patches = [patch for patch in strip_patches() if patch in measured and patch in values]
     patches = patches[:len(patches) // STRIP_COLUMNS * STRIP_COLUMNS]
 
-    preset_id = int(xml.parse(arguments.preset).getroot().findtext("id"))
-    tickets = {"format": "tintgate tickets", "version": 1, "tickets": [
-        {"type": 27, "id": preset_id, "keys": preset_keys(arguments.preset)},
-        {"type": 3, "id": arguments.job,
-         "keys": job_keys(arguments, preset_id, patches, measured, references)}]}
-
-    server = arguments.folder / "server"
-    for name in ("ControlCharts", "tickets", "temp"):
-        (server / name).mkdir(parents=True, exist_ok=True)
-    (arguments.folder / "tickets.json").write_text(json.dumps(tickets, indent=1) + "\n",
-                                                   encoding="ascii")
-    (server / f"ControlCharts/{STRIP}.it8").write_bytes(
-        strip_text(patches, references).encode("ascii"))
-    shutil.copyfile(arguments.preset, server / f"tickets/CVP_{preset_id:04}.xml")
-    (server / f"temp/job-{arguments.job}.jdf").write_text(jdf_text(arguments), encoding="ascii")
+    put_server_files(arguments.folder / "server", arguments, patches, values)
+    (arguments.folder / "tickets.json").write_text(
+        json.dumps(tickets(arguments, patches, measured, references), indent=1) + "\n",
+        encoding="ascii")
     print(f"Job {arguments.job} with {len(patches)} patches is in {arguments.folder}")
 
 
