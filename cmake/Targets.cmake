@@ -83,6 +83,8 @@ function(tintgate_test target)
   target_link_libraries(${target} PRIVATE ${T_LINKS} GTest::gmock GTest::gtest_main tintgate_options)
   target_compile_definitions(${target} PRIVATE
     TINTGATE_SOURCE_DIR="${PROJECT_SOURCE_DIR}" TINTGATE_BINARY_DIR="${PROJECT_BINARY_DIR}")
+  # Only what is tested is worth optimising: this halves the time that tests take to compile.
+  target_compile_options(${target} PRIVATE -O0)
   add_test(NAME ${target} COMMAND ${target})
   set_tests_properties(${target} PROPERTIES TIMEOUT ${T_TIMEOUT} ENVIRONMENT "${T_ENVIRONMENT}")
 endfunction()
