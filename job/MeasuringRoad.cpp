@@ -1,0 +1,79 @@
+// The two steps that only a job to be measured takes: measuring it, and handing its result back.
+#include <cstdlib>
+#include <filesystem>
+#include <system_error>
+#include <utility>
+
+#include "ExitCodes.h"
+#include "cli/CLogger.h"
+#include "job/KZVerifyJobProcessor.h"
+
+namespace {
+
+/// Whether there is a regular file of this name, logging where there is none.
+bool isThere(const wxString& path, const char* complaint) {
+    const std::string bytes = wstringToString(path.ToStdWstring());
+    std::error_code ignored;
+    const bool found = std::filesystem::is_regular_file(bytes, ignored);
+    if (!found) {
+        CLogger::GetLogger()->Log("%s file not found = %s", complaint, bytes.c_str());
+    }
+    return found;
+}
+
+template<class T>
+void freeArray(T*& values) {
+    std::free(std::exchange(values, nullptr));
+}
+
+} // namespace
+
+// A missing reference file ends this road, though not that of stored measurements. Where both files
+// are missing the measurement's code stands.
+int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord* results,
+                                     std::wstring* json) {
+    CLogger::GetLogger()->Log("Veryfing existing measurement job");
+    const int launched = ConfigureAndLaunchNerovaMeasure(job);
+    CLogger::GetLogger()->Log("ConfigureAndLaunchNerovaMeasure returns = %d", launched);
+    if (launched != 0) {
+        return exitMeasuringFailed;
+    }
+    int result = exitDone;
+    if (!isThere(job->referenceFile, "Reference")) {
+        result = exitReferenceMissing;
+    }
+    if (!isThere(job->sampleFile, "Measurement")) {
+        result = exitSampleMissing;
+    }
+    return result == exitDone ? AnalyzeJob(job, results, json) : result;
+}
+
+// A nested job is among its parent's jobs, as long as it is open, and the parent comes last. Which
+// of the writes succeed does not matter to the run.
+void KZVerifyJobProcessor::WriteBackResults(int jobID, const KZJobDataStruct& job,
+                                            const analyseResultsRecord& results, bool remeasure) {
+    const auto writeTo = [&](int id) {
+        CopyResulDataToJobTicket(id, job, results, remeasure);
+        SetJobStatus(id, results.overallPassed);
+    };
+    if (job.childJobIDs != nullptr && job.parentID > 0) {
+        CLogger::GetLogger()->Log("Copying resulting data to child jobs and parent");
+        for (int i = 0; i < job.childJobCount; ++i) {
+            writeTo(job.childJobIDs[i]);
+        }
+        writeTo(job.parentID);
+    } else {
+        CLogger::GetLogger()->Log("Copying resulting data to job ticket");
+        writeTo(jobID);
+    }
+    FreeMeasurementData(job);
+}
+
+void KZVerifyJobProcessor::FreeMeasurementData(KZJobDataStruct job) {
+    measurementDataRecord& measurement = job.measurement;
+    freeArray(measurement.spectral);
+    freeArray(measurement.xyz);
+    freeArray(measurement.lab);
+    freeArray(measurement.cmyk);
+    freeArray(measurement.reservedValues);
+}

@@ -1,0 +1,315 @@
+// The result of one strip, written to its job: into the JDF, where the job's workflow asks for it,
+// and into the ticket, under the keys of the strip.
+#include <algorithm>
+#include <array>
+#include <cmath>
+#include <cstdint>
+#include <cstring>
+#include <iterator>
+#include <memory>
+#include <new>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include <wx/datetime.h>
+
+#include "jdf/JdfHandler.h"
+#include "job/JobTicket.h"
+#include "job/KZVerifyJobProcessor.h"
+#include "job/StripKeys.h"
+#include "text/CharSets.h"
+#include "text/MathLib.h"
+
+namespace {
+
+constexpr int workflowWithJdf = 3;     ///< Of KZJobDataStruct::measurementWorkflow.
+constexpr int mostPatches = 1'000'000; ///< Arrays of more count as memory that is not there.
+
+constexpr int paperWhite = 4;    ///< Of analyseResultsRecord::approvals.
+constexpr int averageDeltaE = 5; ///< Of analyseResultsRecord::values.
+constexpr int maximumDeltaE = 6;
+
+/// What the server shows at one position: an entry of analyseResultsRecord::values, and the entry
+/// of approvals and decimals that goes with it.
+struct ResultPosition {
+    int value;
+    int verdict;
+};
+
+constexpr int noValue = -1; ///< Stands as -1.0.
+constexpr int spotAverage = 26;
+constexpr int spotMaximum = 27;    ///< A PSD preset that does not judge it shows spotAverage.
+constexpr int psdSpotMaximum = 21; ///< Of tolerancePresetParameterRecord::usedForPSDResult.
+
+// clang-format off
+constexpr ResultPosition positions[] = {
+    /*  0 */ {0, 6},
+    /*  1 */ {1, 7},
+    /*  2 */ {2, 8},
+    /*  3 */ {3, 9},
+    /*  4 */ {4, paperWhite},
+    /*  5 */ {averageDeltaE, 0},
+    /*  6 */ {maximumDeltaE, 1},
+    /*  7 */ {7, 5},
+    /*  8 */ {14, 12},
+    /*  9 */ {12, 10},
+    /* 10 */ {19, 13},
+    /* 11 */ {20, 3},
+    /* 12 */ {noValue, 2},
+    /* 13 */ {spotMaximum, 19},
+    /* 14 */ {13, 11},
+    /* 15 */ {28, 20},
+    /* 16 */ {29, 21},
+    /* 17 */ {32, 24},
+    /* 18 */ {33, 25},
+    /* 19 */ {30, 22},
+    /* 20 */ {31, 23},
+    /* 21 */ {36, 28},
+    /* 22 */ {34, 26},
+    /* 23 */ {37, 27},
+    /* 24 */ {38, 30},
+    /* 25 */ {39, 31},
+    /* 26 */ {spotAverage, 18},
+};
+// clang-format on
+constexpr int positionCount = std::size(positions);
+constexpr int psdPositionCount = 10; ///< Verdicts of a PSD preset stand in their own order.
+
+/// An array of the ticket, one element for each patch.
+struct Column {
+    const char* name;
+    double* measurementDataRecord::*rows;
+    int width; ///< Values of a row.
+    int index; ///< Of the value that is taken.
+};
+
+constexpr Column columns[] = {
+    {"XYZValues/XValues", &measurementDataRecord::xyz, 3, 0},
+    {"XYZValues/YValues", &measurementDataRecord::xyz, 3, 1},
+    {"XYZValues/ZValues", &measurementDataRecord::xyz, 3, 2},
+    {"LabValues/LValues", &measurementDataRecord::lab, 3, 0},
+    {"LabValues/AValues", &measurementDataRecord::lab, 3, 1},
+    {"LabValues/BValues", &measurementDataRecord::lab, 3, 2},
+    {"CMYKValues/CValues", &measurementDataRecord::cmyk, 4, 0},
+    {"CMYKValues/MValues", &measurementDataRecord::cmyk, 4, 1},
+    {"CMYKValues/YValues", &measurementDataRecord::cmyk, 4, 2},
+    {"CMYKValues/KValues", &measurementDataRecord::cmyk, 4, 3},
+};
+
+/// A job's ticket, below the root of one of its strips.
+class StripTicket {
+  public:
+    StripTicket(CKZConnector* connector, int jobID, Strip strip)
+        : m_ticket(connector, jobID), m_strip(strip) {}
+
+    Strip strip() const { return m_strip; }
+
+    template<class T>
+    int write(std::string_view name, const T& value) const {
+        return m_ticket.write(measurementKey(m_strip, name), value);
+    }
+
+    template<class T>
+    void writeArray(std::string_view name, int count, const T* values) const {
+        m_ticket.writeArray(measurementKey(m_strip, name), count, values);
+    }
+
+  private:
+    const JobTicket m_ticket;
+    const Strip m_strip;
+};
+
+std::string commentOf(Strip strip) {
+    return strip == Strip::first ? "Remote confirmation M1" : "Remote confirmation M2";
+}
+
+/// How the JDF names a formula.
+const char* formulaName(int deltaEType) {
+    switch (deltaEType) {
+    case 2:
+        return "CIECMC";
+    case 3:
+        return "CIE94";
+    case 4:
+        return "CIE2000";
+    case 5:
+        return "CIECMC_2_1";
+    default:
+        return "CIE76";
+    }
+}
+
+/// A device value of 0 to 255 in percent: of the first strip with two decimals, of the second one,
+/// as a 16-bit number, without any. The difference is required.
+double percentOf(double value, Strip strip) {
+    if (strip == Strip::first) {
+        return round_(value / 2.55, 2);
+    }
+    const auto whole = MathLib::cast_value<std::int64_t>(std::floor(value / 2.55 + 0.5));
+    return static_cast<std::uint16_t>(whole);
+}
+
+using Bytes = std::array<unsigned char, presetValueCount>;
+
+/// Flags as they lie in the record: another vendor's library may mean more than 0 and 1 by them.
+Bytes bytesOf(const bool (&flags)[presetValueCount]) {
+    static_assert(sizeof flags == sizeof(Bytes));
+    Bytes bytes;
+    std::memcpy(bytes.data(), flags, sizeof flags);
+    return bytes;
+}
+
+/// The JDF calls every measurement approved; whether it passed is another attribute.
+JDFMeasurementHeader headerOf(KZJobDataStruct& job, const analyseResultsRecord& results) {
+    JDFMeasurementHeader header;
+    JdfHandler::SetJDFMeasurementHeaderDefaults(&header);
+    header.secondStrip = stripOf(job.secondStrip) == Strip::first ? 0 : 1;
+    header.party = job.jobType != 0 ? 2 : 1;
+    CharSets::stracpy(header.deltaEType, formulaName(job.measurement.deltaEType),
+                      sizeof header.deltaEType);
+    header.approval = true;
+    header.totalPass = results.overallPassed;
+    header.paperWhitePass = bytesOf(results.approvals)[paperWhite] != 0;
+    header.maxTolerance = job.tolerance.presetValues[1];
+    header.maxDeltaE = results.values[maximumDeltaE];
+    header.averageTolerance = job.tolerance.presetValues[0];
+    header.averageDeltaE = results.values[averageDeltaE];
+    header.writePatchDefinitions = true;
+    header.measurement = &job.measurement;
+    return header;
+}
+
+/// What fails here changes nothing of the rest.
+void updateJdf(CKZConnector& connector, KZJobDataStruct& job, const analyseResultsRecord& results) {
+    JDFMeasurementHeader header = headerOf(job, results);
+    JdfHandler::AppendJDFFileData(job, commentOf(stripOf(job.secondStrip)), &header, true);
+    connector.UploadFile(job.jdfLocalFile, job.jdfServerFile);
+}
+
+int oneMore(int count) {
+    return static_cast<int>(static_cast<unsigned>(count) + 1U); // After the largest, the smallest.
+}
+
+/// The verdict, and when it was found. By requirement date and time are read one after the other,
+/// so that midnight can fall between them, and the code is that of the last write.
+int writeVerdict(const StripTicket& ticket, bool passed) {
+    ticket.write("Approval", passed ? 1 : 0);
+    ticket.write("Comment", commentOf(ticket.strip()));
+    const wxString date = wxDateTime::Now().FormatISODate();
+    ticket.write("Date", std::string(date.mb_str(wxConvLibc)));
+    const wxString time = wxDateTime::Now().FormatISOTime();
+    return ticket.write("Time", std::string(time.mb_str(wxConvLibc)));
+}
+
+/// A number of samples that does not fit a row is damage.
+bool hasSpectra(const measurementDataRecord& measurement) {
+    return measurement.spectral != nullptr && measurement.numPatches > 0 &&
+           measurement.spectral->length >= 0 && measurement.spectral->length <= spectralValueCount;
+}
+
+void writeColumns(const StripTicket& ticket, const measurementDataRecord& measurement,
+                  double* values) {
+    for (const auto& [name, rows, width, index] : columns) {
+        const double* value = measurement.*rows;
+        if (value == nullptr) {
+            continue;
+        }
+        const bool isDevice = rows == &measurementDataRecord::cmyk;
+        value += index;
+        for (int i = 0; i < measurement.numPatches; ++i, value += width) {
+            values[i] = isDevice ? percentOf(*value, ticket.strip()) : *value;
+        }
+        ticket.writeArray(name, measurement.numPatches, values);
+    }
+}
+
+/// Only a measurement with spectra has its patches written, XYZ, Lab and device values included.
+/// The first patch tells the range of all spectra.
+void writePatches(const StripTicket& ticket, const measurementDataRecord& measurement) {
+    const auto& [unused, base, stepsize, length] = measurement.spectral[0];
+    const int patches = measurement.numPatches;
+    ticket.write("SpectralValues/Stepsize", stepsize);
+    ticket.write("SpectralValues/Base", base);
+    ticket.write("SpectralValues/Length", length);
+    ticket.write("Numpatches", patches);
+    if (patches > mostPatches) {
+        return;
+    }
+    const std::size_t count = static_cast<std::size_t>(patches) * std::max(length, 1);
+    const std::unique_ptr<double[]> values(new (std::nothrow) double[count]);
+    if (values == nullptr) {
+        return;
+    }
+    double* end = values.get();
+    for (int i = 0; i < patches; ++i) {
+        end = std::copy_n(measurement.spectral[i].values, length, end);
+    }
+    ticket.writeArray("SpectralValues/DValues", static_cast<int>(end - values.get()), values.get());
+    writeColumns(ticket, measurement, values.get());
+}
+
+void writeMeasured(const StripTicket& ticket, const tolerancePresetParameterRecord& tolerance,
+                   const double (&results)[resultValueCount]) {
+    const bool showsSpotMaximum =
+        tolerance.fograPSDPreset == 0 || tolerance.usedForPSDResult[psdSpotMaximum] == 1;
+    double measured[positionCount];
+    for (int i = 0; i < positionCount; ++i) {
+        const int value = positions[i].value;
+        if (value == noValue) {
+            measured[i] = -1.0;
+        } else if (value == spotMaximum && !showsSpotMaximum) {
+            measured[i] = results[spotAverage];
+        } else {
+            measured[i] = results[value];
+        }
+    }
+    ticket.writeArray("Values/Measured", positionCount, measured);
+}
+
+/// Approvals or decimals: those of a PSD preset under a name and in an order of their own.
+void writeVerdicts(const StripTicket& ticket, const std::string& name, bool isPsd,
+                   const Bytes& verdicts) {
+    int numbers[positionCount];
+    const int count = isPsd ? psdPositionCount : positionCount;
+    for (int i = 0; i < count; ++i) {
+        numbers[i] = verdicts[static_cast<std::size_t>(isPsd ? i : positions[i].verdict)];
+    }
+    ticket.writeArray((isPsd ? "Values/PSD" : "Values/") + name, count, numbers);
+}
+
+} // namespace
+
+// What can't be written is passed over: the job goes on without it.
+int KZVerifyJobProcessor::CopyResulDataToJobTicket(int jobID, KZJobDataStruct job,
+                                                   analyseResultsRecord results, bool remeasure) {
+    if (jobID < 0 || (job.secondStrip != 0 && job.secondStrip != 1)) {
+        return 0;
+    }
+    const StripTicket ticket(m_connector, jobID, stripOf(job.secondStrip));
+    if (job.measurementWorkflow == workflowWithJdf) {
+        updateJdf(*m_connector, job, results);
+    }
+    if (!remeasure) {
+        job.measurementStatus = oneMore(job.measurementStatus);
+        ticket.write("Status", job.measurementStatus);
+    }
+    const int result = writeVerdict(ticket, results.overallPassed);
+    if (hasSpectra(job.measurement)) {
+        writePatches(ticket, job.measurement);
+    }
+    writeMeasured(ticket, job.tolerance, results.values);
+    const bool isPsd = job.tolerance.fograPSDPreset != 0;
+    writeVerdicts(ticket, "Approval", isPsd, bytesOf(results.approvals));
+    writeVerdicts(ticket, "Decimal", isPsd, bytesOf(results.decimals));
+    return result;
+}
+
+int KZVerifyJobProcessor::WrietErrorToJobTicket(int errorCode, int jobID) {
+    constexpr const char* key = "Process/ErrorMessage";
+    std::vector<std::string> messages;
+    m_connector->GetJobTicketStringArray(JobTicket::jobType, jobID, key, &messages);
+    std::string message = "k_TintgateError: " + std::to_string(errorCode);
+    return m_connector->SetJobTicketKeyValue(JobTicket::jobType, jobID, key, PARAM_STRING,
+                                             message.data(), static_cast<int>(messages.size()));
+}
