@@ -81,6 +81,12 @@ bool holds(const std::string& path, std::string_view page) {
 
 } // namespace
 
+std::string pageStem(const Meta& meta) {
+    const std::string& t = meta.created;
+    return "report-strip" + std::to_string(meta.strip) + "-" + t.substr(0, 10) + "-" +
+           t.substr(11, 2) + t.substr(14, 2) + t.substr(17, 2);
+}
+
 std::string keepPage(const std::string& folder, const std::string& stem, std::string_view page,
                      std::string& problem) {
     constexpr int mostOfOneName = 10'000;

@@ -4,7 +4,12 @@
 #include <string>
 #include <string_view>
 
+#include "companions/report/Meta.h"
+
 namespace report {
+
+/// report-strip1-2024-05-01-123456: the strip and the time of the run, not of the viewing.
+std::string pageStem(const Meta& meta);
 
 /// Writes a page to FOLDER/STEM.html, or to STEM-2.html and on where other pages have the name:
 /// none is overwritten. Where one of them holds this very text already, that one is taken. The page

@@ -13,9 +13,9 @@
 #include "companions/report/Meta.h"
 #include "companions/report/Page.h"
 #include "companions/report/PageFile.h"
+#include "companions/report/Reports.h"
 #include "companions/report/Result.h"
 #include "companions/viewer/Browser.h"
-#include "companions/viewer/Reports.h"
 #include "platform/TemporaryFolder.h"
 
 namespace {
@@ -69,13 +69,6 @@ std::string folderOf(const std::string& path) {
     return slash == path.npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
 }
 
-/// report-strip1-2024-05-01-123456: the strip and the time of the run, not of the viewing.
-std::string stemOf(const report::Meta& meta) {
-    const std::string& t = meta.created;
-    return "report-strip" + std::to_string(meta.strip) + "-" + t.substr(0, 10) + "-" +
-           t.substr(11, 2) + t.substr(14, 2) + t.substr(17, 2);
-}
-
 int show(const std::string& page) {
     if (isatty(STDOUT_FILENO))
         std::printf("%s\n", page.c_str());
@@ -101,7 +94,7 @@ int showReport(const std::string& metaPath) {
     if (!result)
         return fail(resultBroken, resultPath + " is broken: " + problem);
     const std::string page =
-        report::keepPage(folder, stemOf(*meta), report::pageOf(*result, &*meta), problem);
+        report::keepPage(folder, report::pageStem(*meta), report::pageOf(*result, &*meta), problem);
     if (page.empty())
         return fail(pageNotWritten, "can't write a page in " + folder + ": " + problem);
     return show(page);
@@ -116,7 +109,7 @@ int showIndex() {
     const std::string folder = access(working.c_str(), W_OK | X_OK) == 0 ? working : temporary;
     const std::string path = folder + "/reports.html";
     std::string problem;
-    if (!report::replacePage(path, report::indexOf(viewer::reportsBelow(folder), folder), problem))
+    if (!report::replacePage(path, report::indexOf(report::reportsBelow(folder), folder), problem))
         return fail(pageNotWritten, "can't write " + path + ": " + problem);
     return show(path);
 }

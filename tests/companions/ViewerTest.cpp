@@ -8,6 +8,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "Browse.h"
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 
@@ -39,24 +40,8 @@ class Viewer : public testing::Test {
             {VIEWER, "-detail", "-meta", m_scratch.path("Größe"), "a", "b/meta.json"}, options);
     }
 
-    /// The document as a browser leaves it; what its console got is in `error`.
     support::Outcome browse(const std::string& page) const {
-        std::vector<std::string> command = {CHROMIUM,
-                                            "--headless",
-                                            "--disable-gpu",
-                                            "--disable-quic",
-                                            "--no-first-run",
-                                            "--disable-background-networking",
-                                            "--disable-component-update",
-                                            "--disable-sync",
-                                            "--enable-logging=stderr",
-                                            "--virtual-time-budget=5000",
-                                            "--dump-dom",
-                                            "--user-data-dir=" + m_scratch.path("browser")};
-        if (geteuid() == 0)
-            command.emplace_back("--no-sandbox");
-        command.push_back("file://" + page);
-        return support::run(command);
+        return support::browse(page, m_scratch.path("browser"));
     }
 
     const support::ScratchFolder m_scratch;

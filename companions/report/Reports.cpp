@@ -1,16 +1,16 @@
-#include "companions/viewer/Reports.h"
+#include "companions/report/Reports.h"
 
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
 
-namespace viewer {
+namespace report {
 namespace {
 
 namespace fs = std::filesystem;
 
 std::string startOf(const fs::path& path) {
-    std::string bytes(report::summaryWithin, '\0');
+    std::string bytes(summaryWithin, '\0');
     std::ifstream file(path, std::ios::binary);
     file.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
     bytes.resize(static_cast<std::size_t>(file.gcount()));
@@ -44,11 +44,11 @@ std::vector<fs::path> entriesOf(const fs::path& folder, Wanted wanted) {
 
 } // namespace
 
-std::vector<report::Listed> reportsBelow(const std::string& folder) {
-    std::vector<report::Listed> reports;
+std::vector<Listed> reportsBelow(const std::string& folder) {
+    std::vector<Listed> reports;
     for (const fs::path& job : entriesOf(folder, isJobFolder))
         for (const fs::path& page : entriesOf(job, isReport))
-            if (auto summary = report::summaryIn(startOf(page)))
+            if (auto summary = summaryIn(startOf(page)))
                 reports.push_back(
                     {job.filename().string() + "/" + page.filename().string(), *summary});
     // Stamps carry the distance from UTC; within one room they sort as text.
@@ -59,4 +59,4 @@ std::vector<report::Listed> reportsBelow(const std::string& folder) {
     return reports;
 }
 
-} // namespace viewer
+} // namespace report

@@ -6,10 +6,10 @@
 
 #include "companions/report/Page.h"
 
-namespace viewer {
+namespace report {
 
 /// Reports in the folders of jobs (JobID_N/report-*.html) below `folder`, the latest first, with
 /// paths relative to it. Links and what is no report of ours are passed over.
-std::vector<report::Listed> reportsBelow(const std::string& folder);
+std::vector<Listed> reportsBelow(const std::string& folder);
 
-} // namespace viewer
+} // namespace report
