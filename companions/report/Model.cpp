@@ -69,12 +69,6 @@ const char* wordOf(Outcome outcome) {
     return "Not judged";
 }
 
-std::string labelOf(const Patch& patch, std::size_t index) {
-    if (patch.id.empty())
-        return patch.name.empty() ? "row " + std::to_string(index + 1) : patch.name;
-    return patch.name.empty() || patch.name == patch.id ? patch.id : patch.id + " " + patch.name;
-}
-
 /// " (100 0 0 0)": the device values of a patch, not to be broken; empty without any.
 std::string deviceText(const Result& result, std::size_t patch) {
     const std::size_t channels = result.channels.size();
@@ -98,8 +92,7 @@ Figure figureOf(const Criterion& criterion, const Result& result) {
     figure.value = fixedText(value, criterion.decimals);
     figure.tolerance = dash;
     if (criterion.worstPatch)
-        figure.worstLabel = labelOf(result.patches[*criterion.worstPatch], *criterion.worstPatch) +
-                            deviceText(result, *criterion.worstPatch);
+        figure.worstLabel = labelOf(result, *criterion.worstPatch);
     if (!criterion.tolerance)
         return figure;
 
@@ -319,6 +312,15 @@ void addHead(Model& model, const Result& result, const Meta* meta) {
 }
 
 } // namespace
+
+std::string labelOf(const Result& result, std::size_t index) {
+    const Patch& patch = result.patches[index];
+    const std::string device = deviceText(result, index);
+    if (patch.id.empty())
+        return (patch.name.empty() ? "row " + std::to_string(index + 1) : patch.name) + device;
+    return (patch.name.empty() || patch.name == patch.id ? patch.id : patch.id + " " + patch.name) +
+           device;
+}
 
 std::string fixedText(double value, int decimals) {
     char text[400];

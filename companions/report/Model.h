@@ -86,6 +86,9 @@ Model makeModel(const Result& result, const Meta* meta);
 /// about 12 to 30 of them. Values that are not finite are left out, negative ones count as 0.
 std::vector<Bin> histogramOf(const std::vector<double>& values);
 
+/// A patch for a person: its id and name or, without either, its row; then its device values.
+std::string labelOf(const Result& result, std::size_t patch);
+
 /// Fixed decimals with a point in every locale; "–" where not finite.
 std::string fixedText(double value, int decimals);
 

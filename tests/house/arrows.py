@@ -39,7 +39,9 @@ ARROWS = {
     "StoreEngine": "ticketengine",
     "store": "StoreEngine",
     "ComGUI": "commrecords ticketrecords ticketengine StoreEngine store",
-    "tintgate-store": "store",
+    "bytes": "",
+    "tintgate-store": "bytes store",
+    "tintgate-report": "report analysis libTintgate bytes store platform",
 }
 
 # Arrows that go on through a target, because a header that it publishes needs them itself.

@@ -1,0 +1,52 @@
+#include "companions/tintgate-report/Explain.h"
+
+#include <algorithm>
+#include <iterator>
+
+#include "ExitCodes.h"
+#include "companions/tintgate-report/Failure.h"
+
+namespace reporting {
+namespace {
+
+/// The text behind its label, broken at blanks to lines that fit a terminal.
+std::string paragraph(const std::string& label, const std::string& text) {
+    constexpr std::size_t indent = 8;
+    constexpr std::size_t width = 79;
+    std::string lines = label;
+    lines.resize(indent, ' ');
+    std::size_t column = indent;
+    for (std::size_t start = 0; start < text.size();) {
+        const std::size_t end = std::min(text.find(' ', start), text.size());
+        if (column > indent && column + 1 + end - start > width) {
+            lines += '\n' + std::string(indent, ' ');
+            column = indent;
+        }
+        if (column > indent) {
+            lines += ' ';
+            ++column;
+        }
+        lines += text.substr(start, end - start);
+        column += end - start;
+        start = end + 1;
+    }
+    return lines + '\n';
+}
+
+} // namespace
+
+std::string explanationOf(int code) {
+    const auto found = std::find_if(std::begin(exitCodeTexts), std::end(exitCodeTexts),
+                                    [&](const ExitCodeText& text) { return text.code == code; });
+    if (found == std::end(exitCodeTexts))
+        throw Failure(Status::UnknownCode,
+                      "Tintgate has no exit code " + std::to_string(code) +
+                          (code > 128 && code < 160 ? "; a shell gives 128 and the number of the "
+                                                      "signal that ended a program"
+                                                    : ""));
+    return paragraph(std::to_string(code), found->meaning + std::string(".")) +
+           paragraph("Cause", found->cause + std::string(".")) +
+           paragraph("Remedy", found->remedy + std::string("."));
+}
+
+} // namespace reporting

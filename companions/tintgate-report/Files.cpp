@@ -1,0 +1,132 @@
+#include "companions/tintgate-report/Files.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdio>
+#include <cstring>
+#include <filesystem>
+#include <memory>
+
+#include "colour/ColourFile.h"
+#include "companions/report/PageFile.h"
+#include "companions/tintgate-report/Failure.h"
+
+namespace reporting {
+namespace {
+
+namespace fs = std::filesystem;
+
+constexpr std::size_t mostBytes = std::size_t{1} << 30; ///< Of a result: millions of patches.
+
+std::string bytesOf(const std::string& path) {
+    std::string bytes;
+    switch (colour::readWholeFile(path == "-" ? "/dev/stdin" : path, mostBytes, bytes)) {
+    case colour::Failure::None:
+        return bytes;
+    case colour::Failure::Missing:
+        throw Failure(Status::Unreadable, path + " is not there");
+    case colour::Failure::TooLarge:
+        throw Failure(Status::Unreadable, path + " is too large");
+    case colour::Failure::OutOfMemory:
+        throw std::bad_alloc();
+    default:
+        throw Failure(Status::Unreadable, path + " can't be read");
+    }
+}
+
+report::Meta metaOf(const std::string& path) {
+    std::string problem;
+    if (auto meta = report::readMeta(bytesOf(path), problem))
+        return *meta;
+    throw Failure(Status::Broken, path + " is broken: " + problem);
+}
+
+/// Standard output and whatever else is not a plain file.
+void writeInPlace(const std::string& path, std::string_view text) {
+    const bool standardOutput = path == "-";
+    const std::unique_ptr<std::FILE, int (*)(std::FILE*)> opened(
+        standardOutput ? nullptr : std::fopen(path.c_str(), "wbe"),
+        [](std::FILE* file) { return file != nullptr ? std::fclose(file) : 0; });
+    std::FILE* const file = standardOutput ? stdout : opened.get();
+    if (file == nullptr || std::fwrite(text.data(), 1, text.size(), file) != text.size() ||
+        std::fflush(file) != 0)
+        throw Failure(Status::NotWritten, (standardOutput ? "standard output" : path) +
+                                              " can't be written: " + std::strerror(errno));
+}
+
+} // namespace
+
+std::string LoadedResult::folder() const {
+    const std::size_t slash = path.rfind('/');
+    return slash == path.npos ? "." : slash == 0 ? "/" : path.substr(0, slash);
+}
+
+std::string LoadedResult::stem() const {
+    const std::string name = path == "-" ? "result" : fs::path(path).filename().string();
+    return name.ends_with(".json") && name.size() > 5 ? name.substr(0, name.size() - 5) : name;
+}
+
+LoadedResult loadResult(const std::string& path, const std::string& metaPath, std::string& note) {
+    LoadedResult loaded;
+    loaded.path = path;
+    std::string problem;
+    auto result = report::readResult(bytesOf(path), problem);
+    if (!result)
+        throw Failure(Status::Broken, path + " is broken: " + problem);
+    loaded.result = std::move(*result);
+    if (!metaPath.empty()) {
+        loaded.meta = metaOf(metaPath);
+        return loaded;
+    }
+    const std::string beside = loaded.folder() + "/meta.json";
+    std::error_code ignored;
+    if (loaded.stem() != "output" || !fs::exists(fs::symlink_status(beside, ignored)))
+        return loaded;
+    try {
+        loaded.meta = metaOf(beside);
+    } catch (const Failure& failure) {
+        note = failure.what() + std::string("; the result goes without it");
+    }
+    return loaded;
+}
+
+std::vector<FoundFile> filesOf(const std::vector<std::string>& arguments) {
+    std::vector<FoundFile> files;
+    for (const std::string& argument : arguments) {
+        std::error_code failure;
+        if (!fs::is_directory(argument, failure)) {
+            files.push_back({argument, true});
+            continue;
+        }
+        std::vector<std::string> inside;
+        constexpr auto options = fs::directory_options::skip_permission_denied;
+        for (fs::recursive_directory_iterator at(argument, options, failure), end;
+             !failure && at != end; at.increment(failure)) {
+            std::error_code ignored;
+            const std::string name = at->path().filename();
+            if (name.ends_with(".json") && name != "meta.json" && at->is_regular_file(ignored))
+                inside.push_back(at->path());
+        }
+        if (failure)
+            throw Failure(Status::Unreadable, argument + " can't be read: " + failure.message());
+        std::sort(inside.begin(), inside.end());
+        for (std::string& path : inside)
+            files.push_back({std::move(path), false});
+    }
+    return files;
+}
+
+void writeOutput(const std::string& path, std::string_view text) {
+    std::error_code ignored;
+    if (path == "-" || fs::is_other(fs::status(path, ignored)))
+        return writeInPlace(path, text);
+    // A link stays one: what it leads to is replaced.
+    const fs::path target = fs::is_symlink(fs::symlink_status(path, ignored))
+                                ? fs::weakly_canonical(path, ignored)
+                                : fs::path(path);
+    std::string problem;
+    if (!report::replacePage(target.empty() ? path : target.string(), text, problem))
+        throw Failure(Status::NotWritten, path + " can't be written: " + problem);
+}
+
+} // namespace reporting

@@ -1,0 +1,17 @@
+// A result in a few lines for a terminal.
+#pragma once
+
+#include <string>
+
+#include "companions/report/Meta.h"
+#include "companions/report/Result.h"
+#include "companions/tintgate-report/Terminal.h"
+
+namespace reporting {
+
+/// The verdict with its reasons, the criteria that it rests on, the statistics, the patches that
+/// differ most, and the warnings: the page's own words and numbers. `meta` may be null.
+std::string summaryText(const report::Result& result, const report::Meta* meta,
+                        const Painter& paint);
+
+} // namespace reporting

@@ -1,0 +1,76 @@
+#include "companions/tintgate-report/Terminal.h"
+
+#include <algorithm>
+#include <cstdlib>
+
+#include <unistd.h>
+
+#include "companions/tintgate-store/Bytes.h"
+
+namespace reporting {
+namespace {
+
+/// In characters, not bytes.
+std::size_t widthOf(std::string_view text) {
+    return static_cast<std::size_t>(
+        std::count_if(text.begin(), text.end(), [](char byte) { return (byte & 0xC0) != 0x80; }));
+}
+
+const char* sequenceOf(Tone tone) {
+    switch (tone) {
+    case Tone::Plain:
+        break;
+    case Tone::Bold:
+        return "\x1b[1m";
+    case Tone::Soft:
+        return "\x1b[2m";
+    case Tone::Passed:
+        return "\x1b[32m";
+    case Tone::Failed:
+        return "\x1b[1;31m";
+    case Tone::Open:
+        return "\x1b[33m";
+    }
+    return "";
+}
+
+} // namespace
+
+std::string Painter::operator()(Tone tone, std::string_view text) const {
+    const std::string shown = admin::printable(text);
+    if (!m_colours || tone == Tone::Plain || shown.empty())
+        return shown;
+    return sequenceOf(tone) + shown + "\x1b[0m";
+}
+
+bool terminalTakesColours() {
+    const char* const off = std::getenv("NO_COLOR");
+    const char* const kind = std::getenv("TERM");
+    return isatty(STDOUT_FILENO) != 0 && (off == nullptr || *off == '\0') && kind != nullptr &&
+           std::string_view(kind) != "dumb" && *kind != '\0';
+}
+
+std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter& paint) {
+    std::vector<std::size_t> widths;
+    for (const auto& cells : lines) {
+        widths.resize(std::max(widths.size(), cells.size()));
+        for (std::size_t i = 0; i < cells.size(); ++i)
+            widths[i] = std::max(widths[i], widthOf(admin::printable(cells[i].text)));
+    }
+    std::string text;
+    for (const auto& cells : lines) {
+        std::string line;
+        for (std::size_t i = 0; i < cells.size(); ++i) {
+            const Cell& cell = cells[i];
+            const std::size_t gap = widths[i] - widthOf(admin::printable(cell.text));
+            line +=
+                "  " + std::string(cell.toTheRight ? gap : 0, ' ') + paint(cell.tone, cell.text);
+            if (!cell.toTheRight && i + 1 < cells.size())
+                line.append(gap, ' ');
+        }
+        text += line.substr(0, line.find_last_not_of(' ') + 1) + '\n';
+    }
+    return text;
+}
+
+} // namespace reporting
