@@ -1,0 +1,101 @@
+#include "measure/ControlStripText.h"
+
+#include <algorithm>
+#include <filesystem>
+#include <limits>
+#include <system_error>
+
+#include <fcntl.h>
+#include <unistd.h>
+
+#include <wx/convauto.h>
+
+#include "job/KZVerifyJobProcessor.h"
+
+namespace {
+
+constexpr std::size_t longestLine = 511; ///< Bytes of a conditioned line.
+constexpr int noSuchFile = 10;           ///< A result code.
+
+std::string bytesOf(const wxString& path) {
+    return wstringToString(path.ToStdWstring());
+}
+
+/// The first bytes of a text as UTF-8, up to a NUL, and never half a character.
+std::string firstBytes(const wxString& text) {
+    std::string bytes = text.utf8_string();
+    std::size_t size = std::min({bytes.size(), bytes.find('\0'), longestLine});
+    const auto continuesAt = [&](std::size_t index) {
+        return index < bytes.size() && (static_cast<unsigned char>(bytes[index]) & 0xC0) == 0x80;
+    };
+    while (size > 0 && continuesAt(size)) {
+        --size;
+    }
+    bytes.resize(size);
+    return bytes;
+}
+
+} // namespace
+
+bool findStringInFile(wxTextFile* file, wxString needle, wxString* line) {
+    for (const wxString* text = &file->GetFirstLine(); !file->Eof(); text = &file->GetNextLine()) {
+        if (text->Contains(needle)) {
+            *line = *text;
+            return true;
+        }
+    }
+    return false;
+}
+
+// Required as it is: the walk starts at an index that counts characters, and looks at bytes.
+wxString StringConditioning(wxString line) {
+    std::string bytes = firstBytes(line);
+    for (std::size_t end = std::min(line.length(), longestLine); end > 0; --end) {
+        const bool isText = end <= bytes.size() && static_cast<signed char>(bytes[end - 1]) > 31;
+        if (isText) {
+            bytes.resize(end);
+            break;
+        }
+    }
+    return wxString::FromUTF8(bytes) + "\r\n";
+}
+
+bool measure::isFile(const wxString& path) {
+    std::error_code ignored;
+    return std::filesystem::is_regular_file(bytesOf(path), ignored);
+}
+
+// wx would lose a path that is not valid in the user's locale, so the file goes to it opened.
+bool measure::readLines(const wxString& path, wxTextFile* file) {
+    if (!isFile(path)) {
+        return false;
+    }
+    const int opened = open(bytesOf(path).c_str(), O_RDONLY | O_CLOEXEC);
+    if (opened >= 0) {
+        file->Open("/proc/self/fd/" + std::to_string(opened), wxConvAuto());
+        close(opened);
+    }
+    return true;
+}
+
+long measure::numberBehind(const wxString& line, std::size_t offset) {
+    long number = 0;
+    // A number that is followed by something else is stored all the same.
+    return line.Mid(offset).BeforeFirst('\n').ToLong(&number, 10) ? number : 0;
+}
+
+int KZVerifyJobProcessor::GetDeviceIDFromIt8ControlStripFileEx(wxString path, int* deviceID) {
+    *deviceID = 0;
+    wxTextFile file;
+    if (!measure::readLines(path, &file)) {
+        return noSuchFile;
+    }
+    wxString line;
+    constexpr std::size_t afterKeyword = 6;
+    if (findStringInFile(&file, "DEVICE", &line)) {
+        const long number = measure::numberBehind(line, afterKeyword);
+        using Limits = std::numeric_limits<int>;
+        *deviceID = number < Limits::min() || number > Limits::max() ? 0 : static_cast<int>(number);
+    }
+    return 0;
+}

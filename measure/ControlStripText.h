@@ -1,0 +1,35 @@
+// Text files of control strips, line by line, as the definition for the measuring tool is made from
+// them.
+#pragma once
+
+#include <cstddef>
+#include <string>
+
+#include <wx/string.h>
+#include <wx/textfile.h>
+
+/// Finds the first line of the file that contains the needle. The file's current line stays there,
+/// or at the file's end where there is none; then false, and *line is left alone.
+bool findStringInFile(wxTextFile* file, wxString needle, wxString* line);
+
+/// The line without the control characters at its end, and with "\r\n" there.
+///
+/// It is cut at 511 bytes of UTF-8, so that a list of 36 spectral columns with long names arrives
+/// short. By requirement a line with characters of several bytes loses as many bytes at its end as
+/// it has more bytes than characters, and what is no ASCII character behind those; a line of
+/// control characters alone keeps them.
+wxString StringConditioning(wxString line);
+
+namespace measure {
+
+/// Whether there is a regular file of this name.
+bool isFile(const wxString& path);
+
+/// Reads all lines of a file; none where it can't be read. False if there is no such file.
+bool readLines(const wxString& path, wxTextFile* file);
+
+/// The whole number that a line ends with, behind its first `offset` characters; 0 where that is
+/// anything else.
+long numberBehind(const wxString& line, std::size_t offset);
+
+} // namespace measure

@@ -1,0 +1,132 @@
+// The text file that a job's stored values go to the analysis in. Its lines end in "\n", its columns
+// are parted by tabs:
+//
+//     CGATS.17
+//     KEYWORD ILLUMINATION_CONDITION
+//     ILLUMINATION_CONDITION 1
+//     NUMBER_OF_FIELDS 8
+//     BEGIN_DATA_FORMAT
+//     SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B
+//     END_DATA_FORMAT
+//     NUMBER_OF_SETS 1
+//     BEGIN_DATA
+//     1 0 0 0 100 16.25 0.25 -0.5
+//     END_DATA
+#include <charconv>
+#include <cstdint>
+#include <fstream>
+#include <span>
+#include <string>
+#include <string_view>
+
+#include "job/KZVerifyJobProcessor.h"
+
+namespace {
+
+/// Used entries of a spectral row; 0 where there are no spectra, or none that fit their rows.
+int spectralLength(const measurementDataRecord& measurement) {
+    if (measurement.spectral == nullptr || measurement.numPatches < 1) {
+        return 0;
+    }
+    const int length = measurement.spectral[0].length;
+    return length < 0 || length > spectralValueCount ? 0 : length;
+}
+
+struct Fields {
+    int count;
+    std::string names; ///< Parted by tabs.
+};
+
+Fields fieldsOf(const measurementDataRecord& measurement) {
+    Fields fields = {5, "SAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K"};
+    if (measurement.lab != nullptr) {
+        fields.count += 3;
+        fields.names += "\tLAB_L\tLAB_A\tLAB_B";
+    }
+    if (measurement.xyz != nullptr) {
+        fields.count += 3;
+        fields.names += "\tXYZ_X\tXYZ_Y\tXYZ_Z";
+    }
+    const int length = spectralLength(measurement);
+    fields.count += length;
+    for (int i = 0; i < length; ++i) {
+        const spectralRow& range = measurement.spectral[0];
+        const std::int64_t wavelength = range.base + std::int64_t{i} * range.stepsize;
+        fields.names += "\tSPECTRAL_" + std::to_string(wavelength);
+    }
+    return fields;
+}
+
+/// Rows of data, one after the other.
+class Row {
+  public:
+    Row() { m_text.reserve(1024); }
+
+    void start(int number) { m_text.assign(std::to_string(number)); }
+
+    /// Significant digits from here on, in the rows to come as well.
+    void setPrecision(int digits) { m_precision = digits; }
+
+    void add(std::span<const double> values) {
+        for (const double value : values) {
+            // What a C++ stream writes by default in the "C" locale, without its price.
+            char text[32];
+            const auto [end, fault] = std::to_chars(text, text + sizeof text, value,
+                                                    std::chars_format::general, m_precision);
+            m_text += '\t';
+            m_text.append(text, end);
+        }
+    }
+
+    const std::string& finish() { return m_text += '\n'; }
+
+  private:
+    std::string m_text;
+    int m_precision = 6;
+};
+
+/// By requirement the precision that one row ends with is the one that the next row's device and
+/// Lab values get: only the first row has them with 6 digits.
+void writeRows(const measurementDataRecord& measurement, std::ofstream& file) {
+    const auto length = static_cast<std::size_t>(spectralLength(measurement));
+    Row row;
+    for (int i = 0; i < measurement.numPatches; ++i) {
+        const auto patch = static_cast<std::size_t>(i);
+        row.start(i + 1);
+        row.add({measurement.cmyk + patch * 4, 4});
+        if (measurement.lab != nullptr) {
+            row.add({measurement.lab + patch * 3, 3});
+        }
+        if (measurement.xyz != nullptr) {
+            row.setPrecision(7);
+            row.add({measurement.xyz + patch * 3, 3});
+        }
+        if (length > 0) {
+            row.setPrecision(8);
+            row.add({measurement.spectral[patch].values, length});
+        }
+        file << row.finish();
+    }
+}
+
+} // namespace
+
+int KZVerifyJobProcessor::WriteTemporarySampleFile(KZJobDataStruct job, bool reference) {
+    const wxString& path = reference ? job.referenceFile : job.sampleFile;
+    std::ofstream file(wstringToString(path.ToStdWstring()));
+    const measurementDataRecord& measurement = job.measurement;
+    if (measurement.cmyk == nullptr) {
+        return -1;
+    }
+    const Fields fields = fieldsOf(measurement);
+    file << "CGATS.17\n"
+            "KEYWORD ILLUMINATION_CONDITION\n"
+            "ILLUMINATION_CONDITION "
+         << std::to_string(job.illuminationMode) << "\nNUMBER_OF_FIELDS "
+         << std::to_string(fields.count) << "\nBEGIN_DATA_FORMAT\n"
+         << fields.names << "\nEND_DATA_FORMAT\nNUMBER_OF_SETS "
+         << std::to_string(measurement.numPatches) << "\nBEGIN_DATA\n";
+    writeRows(measurement, file);
+    file << "END_DATA\n";
+    return 0;
+}

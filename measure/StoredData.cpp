@@ -1,0 +1,195 @@
+// The values that a job's ticket holds for one of its strips, measured or reference, as the record
+// wants them: one array of a key in the ticket is one column of the record.
+#include <algorithm>
+#include <cmath>
+#include <cstddef>
+#include <cstdint>
+#include <cstdlib>
+#include <memory>
+#include <span>
+#include <string>
+#include <string_view>
+#include <utility>
+
+#include "job/JobTicket.h"
+#include "job/KZVerifyJobProcessor.h"
+#include "job/StripKeys.h"
+
+namespace {
+
+constexpr int mostPatches = 1'000'000; ///< Arrays of more count as memory that is not there.
+
+using Columns = std::span<const char* const>;
+
+constexpr const char* xyzColumns[] = {"XYZValues/XValues", "XYZValues/YValues",
+                                      "XYZValues/ZValues"};
+constexpr const char* labColumns[] = {"LabValues/LValues", "LabValues/AValues",
+                                      "LabValues/BValues"};
+constexpr const char* cmykColumns[] = {"CMYKValues/CValues", "CMYKValues/MValues",
+                                       "CMYKValues/YValues", "CMYKValues/KValues"};
+
+struct Freed {
+    void operator()(void* block) const { std::free(block); }
+};
+
+/// Memory that the record can take over.
+template<class T>
+using Block = std::unique_ptr<T[], Freed>;
+
+/// Rows of zeros; null where there is no memory for them.
+template<class T>
+Block<T> makeRows(int patches, std::size_t width) {
+    const std::size_t count = static_cast<std::size_t>(patches) * std::max<std::size_t>(width, 1);
+    return Block<T>(
+        patches > mostPatches ? nullptr : static_cast<T*>(std::calloc(count, sizeof(T))));
+}
+
+/// One data set of a job's strip.
+class StoredSet {
+  public:
+    StoredSet(CKZConnector* connector, const KZJobDataStruct& job, std::string_view folder)
+        : m_ticket(connector, job.jobID),
+          m_root(measurementKey(stripOf(job.secondStrip), folder)) {}
+
+    int read(const char* name, int* value) const { return m_ticket.read(m_root + name, 0, value); }
+
+    template<class T>
+    int readArray(const char* name, int maximum, T* values) const {
+        return m_ticket.readArray(m_root + name, maximum, values);
+    }
+
+  private:
+    const JobTicket m_ticket;
+    const std::string m_root;
+};
+
+template<class T>
+void freeArray(T*& values) {
+    std::free(std::exchange(values, nullptr));
+}
+
+/// Empties the record and reads the number of patches into it, 0 where there are none.
+int startRecord(const StoredSet& stored, measurementDataRecord* record) {
+    freeArray(record->spectral);
+    freeArray(record->xyz);
+    freeArray(record->lab);
+    freeArray(record->cmyk);
+    record->hasSpectral = 0;
+    record->numPatches = 0;
+    int count = 0;
+    const int code = stored.read("Numpatches", &count);
+    if (code == 0 && count > 0) {
+        record->numPatches = count;
+    }
+    return code;
+}
+
+/// Fills all rows, whose first one tells the range. False where the ticket holds less than that.
+bool fillSpectra(const StoredSet& stored, int patches, spectralRow* rows) {
+    const spectralRow& first = rows[0];
+    const int count = patches * first.length;
+    const auto values = makeRows<double>(patches, static_cast<std::size_t>(first.length));
+    if (values == nullptr ||
+        stored.readArray("SpectralValues/DValues", count, values.get()) != count) {
+        return false;
+    }
+    const double* next = values.get();
+    for (spectralRow& row : std::span(rows, static_cast<std::size_t>(patches))) {
+        row.base = first.base;
+        row.stepsize = first.stepsize;
+        row.length = first.length;
+        std::copy_n(next, first.length, row.values);
+        next += first.length;
+    }
+    return true;
+}
+
+/// Returns the code of the first read that failed: what stands behind it is not read, and 0.
+/// Without all values of all spectra only the first row's range is set.
+int loadSpectra(const StoredSet& stored, measurementDataRecord* record) {
+    auto rows = makeRows<spectralRow>(record->numPatches, 1);
+    if (rows == nullptr) {
+        return 0;
+    }
+    constexpr std::pair<const char*, int spectralRow::*> range[] = {
+        {"SpectralValues/Base", &spectralRow::base},
+        {"SpectralValues/Length", &spectralRow::length},
+        {"SpectralValues/Stepsize", &spectralRow::stepsize},
+    };
+    int code = 0;
+    for (const auto& [name, member] : range) {
+        if (code == 0) {
+            code = stored.read(name, &(rows[0].*member));
+        }
+    }
+    if (rows[0].length < 0 || rows[0].length > spectralValueCount) {
+        return code; // No row has room for it: there are no spectra.
+    }
+    if (code == 0 && fillSpectra(stored, record->numPatches, rows.get())) {
+        record->hasSpectral = 1;
+    }
+    record->spectral = rows.release();
+    return code;
+}
+
+double rowValue(double stored) {
+    return stored;
+}
+
+/// Device values of references are kept in 0 to 255, and used in whole percent.
+double rowValue(int stored) {
+    const auto percent = static_cast<std::int64_t>(std::floor(stored / 2.55 + 0.5));
+    return static_cast<std::uint16_t>(percent);
+}
+
+/// Rows of a column each. Values that the ticket lacks stay 0, and without mayRead all of them do.
+template<class Stored>
+double* loadRows(const StoredSet& stored, Columns columns, int patches, bool mayRead) {
+    auto rows = makeRows<double>(patches, columns.size());
+    const auto values = makeRows<Stored>(patches, 1);
+    if (mayRead && rows != nullptr && values != nullptr) {
+        for (std::size_t i = 0; i < columns.size(); ++i) {
+            const int count = stored.readArray(columns[i], patches, values.get());
+            double* to = &rows[i];
+            for (int patch = 0; patch < count; ++patch, to += columns.size()) {
+                *to = rowValue(values[static_cast<std::size_t>(patch)]);
+            }
+        }
+    }
+    return rows.release();
+}
+
+template<class StoredDevice>
+void loadColumns(const StoredSet& stored, measurementDataRecord* record, bool mayRead) {
+    const int patches = record->numPatches;
+    record->xyz = loadRows<double>(stored, xyzColumns, patches, mayRead);
+    record->lab = loadRows<double>(stored, labColumns, patches, mayRead);
+    record->cmyk = loadRows<StoredDevice>(stored, cmykColumns, patches, mayRead);
+}
+
+} // namespace
+
+int KZVerifyJobProcessor::LoadKZJobMeasurements(KZJobDataStruct* job) {
+    if (job->jobID < 0) {
+        return 0;
+    }
+    const StoredSet stored(m_connector, *job, "");
+    int code = startRecord(stored, &job->measurement);
+    if (job->measurement.numPatches > 0) {
+        code = loadSpectra(stored, &job->measurement);
+        loadColumns<double>(stored, &job->measurement, code == 0);
+    }
+    return code;
+}
+
+int KZVerifyJobProcessor::LoadKZJobReferences(KZJobDataStruct* job) {
+    if (job->jobID < 0) {
+        return 0;
+    }
+    const StoredSet stored(m_connector, *job, "Reference/");
+    const int code = startRecord(stored, &job->measurement);
+    if (job->measurement.numPatches > 0) {
+        loadColumns<int>(stored, &job->measurement, true);
+    }
+    return code;
+}
