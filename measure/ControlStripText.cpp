@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include <wx/convauto.h>
+#include <wx/filename.h>
 
 #include "job/KZVerifyJobProcessor.h"
 
@@ -16,10 +17,6 @@ namespace {
 
 constexpr std::size_t longestLine = 511; ///< Bytes of a conditioned line.
 constexpr int noSuchFile = 10;           ///< A result code.
-
-std::string bytesOf(const wxString& path) {
-    return wstringToString(path.ToStdWstring());
-}
 
 /// The first bytes of a text as UTF-8, up to a NUL, and never half a character.
 std::string firstBytes(const wxString& text) {
@@ -60,17 +57,24 @@ wxString StringConditioning(wxString line) {
     return wxString::FromUTF8(bytes) + "\r\n";
 }
 
-bool measure::isFile(const wxString& path) {
-    std::error_code ignored;
-    return std::filesystem::is_regular_file(bytesOf(path), ignored);
+wxString measure::pathBeside(const wxString& path, const char* name) {
+    wxFileName beside(path);
+    beside.SetFullName(name);
+    return beside.GetFullPath();
+}
+
+std::string measure::pathBytes(const wxString& path) {
+    return wstringToString(path.ToStdWstring());
 }
 
 // wx would lose a path that is not valid in the user's locale, so the file goes to it opened.
 bool measure::readLines(const wxString& path, wxTextFile* file) {
-    if (!isFile(path)) {
+    const std::string bytes = pathBytes(path);
+    std::error_code ignored;
+    if (!std::filesystem::is_regular_file(bytes, ignored)) {
         return false;
     }
-    const int opened = open(bytesOf(path).c_str(), O_RDONLY | O_CLOEXEC);
+    const int opened = open(bytes.c_str(), O_RDONLY | O_CLOEXEC);
     if (opened >= 0) {
         file->Open("/proc/self/fd/" + std::to_string(opened), wxConvAuto());
         close(opened);

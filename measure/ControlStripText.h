@@ -22,10 +22,16 @@ wxString StringConditioning(wxString line);
 
 namespace measure {
 
-/// Whether there is a regular file of this name.
-bool isFile(const wxString& path);
+inline constexpr const char* definitionName = "NMPatchSetDefinition.it8";
 
-/// Reads all lines of a file; none where it can't be read. False if there is no such file.
+/// A file of this name in the folder of another one.
+wxString pathBeside(const wxString& path, const char* name);
+
+/// A path as the bytes that the system knows it by.
+std::string pathBytes(const wxString& path);
+
+/// Reads all lines of a file; none where it can't be read. False if there is no regular file of
+/// this name.
 bool readLines(const wxString& path, wxTextFile* file);
 
 /// The whole number that a line ends with, behind its first `offset` characters; 0 where that is

@@ -5,6 +5,7 @@
 #include <chrono>
 #include <cstdio>
 #include <filesystem>
+#include <fstream>
 #include <string>
 #include <system_error>
 #include <thread>
@@ -18,6 +19,7 @@
 #include <wx/filefn.h>
 #include <wx/utils.h>
 
+#include "measure/MeasureOptions.h"
 #include "platform/CoreFoundationStrings.h"
 #include "platform/Processes.h"
 #include "platform/SystemRoot.h"
@@ -150,14 +152,22 @@ class ChildSignalKept {
     struct sigaction m_before;
 };
 
+// One word of a command line, which eats backslashes and quotes.
+wxString quoted(const wxString& word) {
+    wxString escaped = word;
+    escaped.Replace("\\", "\\\\");
+    escaped.Replace("\"", "\\\"");
+    return "\"" + escaped + "\"";
+}
+
 // The ended program's code, or the started program's number; -1 and 0 if there is nothing that can
 // be executed, which a started child would only say on standard error.
 long execute(const wxString& program, const wxString& arguments, bool wait) {
     if (!canBeExecuted(bytesFromText(program))) {
         return wait ? -1 : 0;
     }
-    const wxArrayString words = wxCmdLineParser::ConvertStringToArgs(
-        "\"" + program + "\"" + arguments, wxCMD_LINE_SPLIT_UNIX);
+    const wxArrayString words =
+        wxCmdLineParser::ConvertStringToArgs(quoted(program) + arguments, wxCMD_LINE_SPLIT_UNIX);
     std::vector<std::string> bytes;
     bytes.reserve(words.size());
     for (const wxString& word : words) {
@@ -226,6 +236,31 @@ wxString Helper::GetNerovaMeasurePath(bool withExecutable) {
 
 bool Helper::CheckFileValidity(const wxString& path) {
     return !path.empty() && wxFileName::Exists(path, wxFILE_EXISTS_ANY);
+}
+
+bool Helper::LaunchNerovaMeasure(const NerovaMeasureParams& params, int& exitCode, bool) {
+    if (IsNMRunning()) {
+        exitCode = 1015;
+        return false;
+    }
+    const wxFileName name(GetNerovaMeasurePath(true));
+    if (!isFolder(name.GetPath())) {
+        return false;
+    }
+    const wxString tool = name.GetFullPath();
+    const wxString options = wxFileName::CreateTempFileName("NerovaMeasure");
+    std::ofstream(bytesFromText(options), std::ios::binary) << measure::optionsText(params);
+    if (!CheckFileValidity(tool) || !CheckFileValidity(options)) {
+        exitCode = 1000;
+        return false;
+    }
+    execute(tool, " " + quoted(options), false);
+    std::this_thread::sleep_for(std::chrono::seconds(2));
+    while (IsNMRunning()) {
+        std::this_thread::sleep_for(std::chrono::seconds(1));
+    }
+    exitCode = 0; // Its own code is never known.
+    return true;
 }
 
 bool Helper::IsNMRunning() {

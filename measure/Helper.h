@@ -5,6 +5,8 @@
 #include <wx/filename.h>
 #include <wx/string.h>
 
+struct NerovaMeasureParams;
+
 /// Each call looks afresh at the machine, below the system root (platform/SystemRoot.h).
 class Helper {
   public:
@@ -21,6 +23,15 @@ class Helper {
 
     /// True if anything exists at the path.
     static bool CheckFileValidity(const wxString& path);
+
+    /// Runs the measuring tool with these options, and waits until it has gone away, two seconds at
+    /// least. A tool that takes longer to show up is not waited for.
+    ///
+    /// True once it was started, with exitCode 0 whatever became of it: only its files tell. False
+    /// with 1015 if the tool was running already, with 1000 if there is no such tool or no place
+    /// for the options, and with exitCode left alone if there is not even its folder. The options
+    /// are a file in the temporary folder, which stays there. The last argument is not used.
+    static bool LaunchNerovaMeasure(const NerovaMeasureParams& params, int& exitCode, bool);
 
     /// Whether the measuring tool runs. Takes about 2 seconds while it does.
     static bool IsNMRunning();

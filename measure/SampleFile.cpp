@@ -1,5 +1,5 @@
-// The text file that a job's stored values go to the analysis in. Its lines end in "\n", its columns
-// are parted by tabs:
+// The text file in which a job's stored values go to the analysis. Its lines end in "\n", its
+// columns are parted by tabs:
 //
 //     CGATS.17
 //     KEYWORD ILLUMINATION_CONDITION

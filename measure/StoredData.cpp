@@ -40,16 +40,16 @@ using Block = std::unique_ptr<T[], Freed>;
 template<class T>
 Block<T> makeRows(int patches, std::size_t width) {
     const std::size_t count = static_cast<std::size_t>(patches) * std::max<std::size_t>(width, 1);
-    return Block<T>(
-        patches > mostPatches ? nullptr : static_cast<T*>(std::calloc(count, sizeof(T))));
+    return Block<T>(patches > mostPatches ? nullptr
+                                          : static_cast<T*>(std::calloc(count, sizeof(T))));
 }
 
 /// One data set of a job's strip.
 class StoredSet {
   public:
     StoredSet(CKZConnector* connector, const KZJobDataStruct& job, std::string_view folder)
-        : m_ticket(connector, job.jobID),
-          m_root(measurementKey(stripOf(job.secondStrip), folder)) {}
+        : m_ticket(connector, job.jobID), m_root(measurementKey(stripOf(job.secondStrip), folder)) {
+    }
 
     int read(const char* name, int* value) const { return m_ticket.read(m_root + name, 0, value); }
 

@@ -1,0 +1,284 @@
+// What the measuring tool is told to measure: a text made from the job's control-strip file,
+// keyword by keyword. Every line ends in "\r\n":
+//
+//     CGATS.17
+//     ORIGINATOR "Nerova Verify"
+//     NUMBER_OF_FIELDS 11
+//     BEGIN_DATA_FORMAT
+//     SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B XYZ_X XYZ_Y XYZ_Z
+//     END_DATA_FORMAT
+//     KEYWORD DEVICE
+//     DEVICE 21
+//     KEYWORD ZEBRA_RULER_MODE        (by the instrument)
+//     ZEBRA_RULER_MODE 1
+//     KEYWORD LOWRES
+//     LOWRES 0
+//     KEYWORD ILLUMINATION_CONDITION
+//     ILLUMINATION_CONDITION 1
+//     KEYWORD NUMBER_OF_STRIPS
+//     NUMBER_OF_STRIPS 3
+//     KEYWORD NUMBER_OF_SETS
+//     NUMBER_OF_SETS 72
+//     KEYWORD NUMBER_OF_COLS
+//     NUMBER_OF_COLS 24
+//     BEGIN_DATA
+//     1 0 0 0 100 16 0 0 2.1 2.2 1.8
+//     ...
+//     END_DATA
+#include <algorithm>
+#include <fstream>
+#include <initializer_list>
+#include <string>
+#include <string_view>
+
+#include <unistd.h>
+
+#include <wx/textfile.h>
+
+#include "job/KZVerifyJobProcessor.h"
+#include "measure/ControlStripText.h"
+
+namespace {
+
+constexpr long mostSets = 1'000'000; ///< A strip of more patches is taken for damage.
+
+// Where the number of a keyword's line starts. The last one leaves the separator to the number,
+// which may have blanks in front.
+constexpr std::size_t behindStrips = 17;
+constexpr std::size_t behindSets = 15;
+constexpr std::size_t behindColumns = 14;
+
+/// Patches of paper white, as filling rows behind their number.
+constexpr const char* rgbWhite = "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\r\n";
+constexpr const char* cmykWhite =
+    "\t0.00\t0.00\t0.00\t0.00\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\r\n";
+
+/// What the instruments want to be told, in this order.
+struct InstrumentLines {
+    std::initializer_list<int> deviceIDs;
+    const char* text;
+};
+
+constexpr InstrumentLines instrumentLines[] = {
+    {{28, 29, 31, 32, 33, 43},
+     "KEYWORD DEVICEMODE\r\nDEVICEMODE 0\r\n"
+     "KEYWORD POSITIONING\r\nPOSITIONING 0\r\n"
+     "KEYWORD MEASURINGTYPE\r\nMEASURINGTYPE 2\r\n"},
+    {{33}, "KEYWORD APERTURESIZE\r\nAPERTURESIZE 6\r\n"},
+    {{28, 29, 31, 32, 43}, "KEYWORD APERTURESIZE\r\nAPERTURESIZE 2\r\n"},
+    {{21, 22, 48, 49, 50}, "KEYWORD ZEBRA_RULER_MODE\r\nZEBRA_RULER_MODE 1\r\n"},
+};
+
+bool contains(const wxString& line, std::initializer_list<const char*> words) {
+    return std::any_of(words.begin(), words.end(),
+                       [&](const char* word) { return line.Contains(word); });
+}
+
+/// The text of a definition, made from the lines of a strip.
+class Definition {
+  public:
+    Definition(wxTextFile& strip, const KZJobDataStruct& job)
+        : m_strip(strip), m_job(job), m_isDynamic(job.useDynstrip == 1 && job.secondStrip == 0) {}
+
+    /// False where the size of the strip can't be told: the text ends there.
+    bool build() {
+        m_text = "CGATS.17\r\nORIGINATOR \"Nerova Verify\"\r\n";
+        addFormat();
+        addDevice();
+        addInstrument();
+        addLineOf("VERTICAL_MEAS");
+        addLineOf("BORDER_PATCHES");
+        const long strips = addNumberOf("NUMBER_OF_STRIPS", behindStrips);
+        if (m_isDynamic ? !addDynamicSize(strips) : !addSize(strips)) {
+            return false;
+        }
+        addStartOfData();
+        if (m_isDynamic) {
+            addFilledRows();
+        } else {
+            addRows();
+        }
+        return true;
+    }
+
+    const std::string& text() const { return m_text; }
+
+  private:
+    void add(std::string_view text) { m_text += text; }
+    void addLine(const wxString& line) { m_text += StringConditioning(line).utf8_string(); }
+
+    bool find(const char* word) { return findStringInFile(&m_strip, word, &m_line); }
+
+    void addFormat() {
+        if (find("NUMBER_OF_FIELDS")) {
+            addLine(m_line);
+        }
+        if (find("BEGIN_DATA_FORMAT")) {
+            addLine(m_line);
+            addLine(m_strip.GetNextLine()); // The field list stands on one line.
+        }
+        add("END_DATA_FORMAT\r\n");
+    }
+
+    /// By requirement an instrument that the strip does not name gets no KEYWORD line.
+    void addDevice() {
+        for (std::size_t i = 0; i < m_strip.GetLineCount(); ++i) {
+            const wxString& line = m_strip.GetLine(i);
+            if (line.Contains("DEVICE") && !line.Contains("KEYWORD")) {
+                add("KEYWORD\tDEVICE\r\n");
+                addLine(line);
+                return;
+            }
+        }
+        add("DEVICE " + std::to_string(m_job.deviceID) + "\r\n");
+    }
+
+    void addInstrument() {
+        for (const auto& [deviceIDs, text] : instrumentLines) {
+            if (std::find(deviceIDs.begin(), deviceIDs.end(), m_job.deviceID) != deviceIDs.end()) {
+                add(text);
+            }
+        }
+        add("KEYWORD LOWRES\r\nLOWRES 0\r\n"
+            "KEYWORD ILLUMINATION_CONDITION\r\n");
+        add("ILLUMINATION_CONDITION " + std::to_string(m_job.illuminationMode) + "\r\n");
+        if (m_isDynamic) {
+            add("KEYWORD FORCE_LAB_CALCULATION\r\nFORCE_LAB_CALCULATION 1\r\n");
+        }
+    }
+
+    /// The first line with the word, where there is one. It becomes m_line.
+    bool addLineOf(const char* word) {
+        const bool found = find(word);
+        if (found) {
+            add("KEYWORD " + std::string(word) + "\r\n");
+            addLine(m_line);
+        }
+        return found;
+    }
+
+    /// The same; its number, or 0.
+    long addNumberOf(const char* word, std::size_t offset) {
+        return addLineOf(word) ? measure::numberBehind(m_line, offset) : 0;
+    }
+
+    void addNumber(const std::string& word, long number) {
+        add("KEYWORD " + word + "\r\n" + word + "\t" + std::to_string(number) + "\r\n");
+    }
+
+    /// A dynamic strip has as many patches as its grid has places, whatever it says itself.
+    bool addDynamicSize(long strips) {
+        const long columns = addNumberOf("NUMBER_OF_COLS", behindColumns);
+        if (columns < 1 || strips < 1 || columns > mostSets / strips) {
+            return false;
+        }
+        m_sets = columns * strips;
+        addNumber("NUMBER_OF_SETS", m_sets);
+        return true;
+    }
+
+    bool addSize(long strips) {
+        const long sets = addNumberOf("NUMBER_OF_SETS", behindSets);
+        if (addLineOf("NUMBER_OF_COLS")) {
+            return true;
+        }
+        if (sets < 1 || strips < 1 || sets > mostSets) {
+            return false;
+        }
+        addNumber("NUMBER_OF_COLS", sets / strips);
+        return true;
+    }
+
+    /// Leaves the strip at the line in front of its rows, or at its end.
+    void addStartOfData() {
+        if (!find("END_DATA_FORMAT")) {
+            return;
+        }
+        while (!m_strip.Eof()) {
+            const wxString& line = m_strip.GetNextLine();
+            if (line.Contains("BEGIN_DATA")) {
+                addLine(line);
+                return;
+            }
+        }
+    }
+
+    /// All that follows, and an empty line: what comes behind the last line is one.
+    void addRows() {
+        while (!m_strip.Eof()) {
+            addLine(m_strip.GetNextLine());
+        }
+    }
+
+    /// The strip's rows, and white ones up to the size of the grid.
+    void addFilledRows() {
+        long rows = 0;
+        while (!m_strip.Eof()) {
+            const wxString& line = m_strip.GetNextLine();
+            if (line.Contains("END_DATA")) {
+                break;
+            }
+            ++rows; // By requirement also the empty line behind the last one.
+            addLine(line);
+        }
+        const char* const white =
+            find("RGB_R") && find("RGB_G") && find("RGB_B") ? rgbWhite : cmykWhite;
+        for (long row = rows + 1; row <= m_sets; ++row) {
+            add(std::to_string(row) + white);
+        }
+        add("END_DATA"); // By requirement without a line end.
+    }
+
+    wxTextFile& m_strip;
+    const KZJobDataStruct& m_job;
+    const bool m_isDynamic;
+    long m_sets = 0; ///< Of a dynamic strip.
+    wxString m_line; ///< Found last.
+    std::string m_text;
+};
+
+/// The head of a strip for those instruments that are set up by a file of their own beside the
+/// definition: what stands in front of its table.
+std::string headOf(wxTextFile& strip) {
+    std::string text;
+    const wxString* line = &strip.GetFirstLine();
+    while (!contains(*line, {"BEGIN_DATA_FORMAT", "NUMBER_OF_FIELDS", "SAMPLE_NAME"})) {
+        text += StringConditioning(*line).utf8_string();
+        if (strip.Eof()) {
+            break;
+        }
+        line = &strip.GetNextLine();
+    }
+    return text;
+}
+
+/// In place of what was there. That it can't be written shows when the tool looks for it.
+void write(const wxString& path, const std::string& text) {
+    const std::string bytes = measure::pathBytes(path);
+    unlink(bytes.c_str());
+    std::ofstream(bytes, std::ios::binary) << text;
+}
+
+} // namespace
+
+// The strip is read whole before anything is removed: it may bear the definition's name itself.
+wxString KZVerifyJobProcessor::WriteTemporaryMeasurementDefinitionFile(wxString path,
+                                                                       KZJobDataStruct* job) {
+    wxTextFile strip;
+    if (!measure::readLines(path, &strip)) {
+        return {};
+    }
+    Definition definition(strip, *job);
+    const bool isWhole = definition.build();
+    const wxString output = measure::pathBeside(path, measure::definitionName);
+    write(output, definition.text());
+    if (!isWhole) {
+        return {};
+    }
+    wxString line;
+    if (findStringInFile(&strip, "File_Format=BARBIERI", &line) ||
+        findStringInFile(&strip, "iSis_INFO", &line)) {
+        write(measure::pathBeside(path, "NMPatchSetDefinition.dcf"), headOf(strip));
+    }
+    return output;
+}

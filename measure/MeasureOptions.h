@@ -1,0 +1,14 @@
+// The options file of the measuring tool.
+#pragma once
+
+#include <string>
+
+#include "measure/NerovaMeasureParams.h"
+
+namespace measure {
+
+/// Its text, as bytes: each option that is given, and its value as it stands, on a line of their
+/// own. A value with a line break breaks the format; a path that is not valid UTF-8 does not.
+std::string optionsText(const NerovaMeasureParams& params);
+
+} // namespace measure

@@ -1,0 +1,131 @@
+#include "measure/MeasuringTool.h"
+
+#include <filesystem>
+#include <fstream>
+#include <iterator>
+#include <string>
+#include <system_error>
+
+#include <unistd.h>
+
+#include <wx/filename.h>
+
+#include "job/KZVerifyJobProcessor.h"
+#include "measure/ControlStripText.h"
+#include "measure/Helper.h"
+#include "measure/NerovaMeasureParams.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+
+enum Outcome {
+    done = 0,
+    alreadyRunning = -1,
+    notStarted = -2,
+    noControlStrip = -3,
+    noDefinition = -4,
+    noDefinitionPath = -5,
+};
+
+constexpr int codeOfRunningTool = 1015;
+
+constexpr int anyLanguage = 57;
+constexpr struct {
+    const char* language;
+    int number;
+} languages[] = {
+    {"en_US", 59},  {"fr_FR", 79},  {"it_IT", 109}, {"ja_JP", 111}, {"zh_TW", 45},  {"zh_CN", 46},
+    {"ko_KR", 124}, {"de_DE", 88},  {"es_ES", 179}, {"pt_BR", 154}, {"pt_PT", 153}, {"nl_NL", 55},
+    {"ru_RU", 159}, {"tr_TR", 214}, {"cs_CZ", 53},  {"pl_PL", 152},
+};
+
+void removeFile(const wxString& path) {
+    unlink(measure::pathBytes(path).c_str());
+}
+
+/// A control strip that bears the definition's name, or leads to it: the definition takes its place
+/// for a while, and its own bytes come back with the end of this object.
+class ReplacedStrip {
+  public:
+    explicit ReplacedStrip(const wxString& strip) : m_path(measure::pathBytes(strip)) {
+        const wxString definition = measure::pathBeside(strip, measure::definitionName);
+        std::error_code ignored;
+        m_isReplaced = fs::equivalent(m_path, measure::pathBytes(definition), ignored);
+        if (m_isReplaced) {
+            std::ifstream file(m_path, std::ios::binary);
+            m_bytes.assign(std::istreambuf_iterator<char>(file), {});
+        }
+    }
+    ~ReplacedStrip() {
+        if (m_isReplaced) {
+            std::ofstream(m_path, std::ios::binary) << m_bytes;
+        }
+    }
+    ReplacedStrip(const ReplacedStrip&) = delete;
+    ReplacedStrip& operator=(const ReplacedStrip&) = delete;
+
+    explicit operator bool() const { return m_isReplaced; }
+
+  private:
+    const std::string m_path;
+    std::string m_bytes;
+    bool m_isReplaced = false;
+};
+
+wxString instrumentOf(const wxString& definition) {
+    wxString name;
+    return getDeviceNameFromIt8ControlStripFile(definition, &name) == 0 ? name : "Unknown";
+}
+
+/// Runs the tool. Where that fails, no samples are left.
+Outcome launch(const NerovaMeasureParams& params) {
+    int exitCode = 0;
+    if (Helper::LaunchNerovaMeasure(params, exitCode, true) && exitCode == 0) {
+        return done;
+    }
+    removeFile(params.o);
+    return exitCode == -1 || exitCode == codeOfRunningTool ? alreadyRunning : notStarted;
+}
+
+} // namespace
+
+int GetLanguageID(KZJobDataStruct* job) {
+    for (const auto& [language, number] : languages) {
+        if (job->language == language) {
+            return number;
+        }
+    }
+    return anyLanguage;
+}
+
+int KZVerifyJobProcessor::ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job) {
+    const wxString& controlStrip = job->controlStripFile;
+    if (controlStrip.empty()) {
+        return noControlStrip;
+    }
+    const ReplacedStrip replacedStrip(controlStrip);
+    const wxString definition = WriteTemporaryMeasurementDefinitionFile(controlStrip, job);
+    if (definition.empty()) {
+        return noDefinition;
+    }
+    removeFile(job->sampleFile); // An old one is not to be taken for a new one.
+    NerovaMeasureParams params;
+    params.apnm = "Nerova Verify";
+    params.l = wxString::Format("%d", GetLanguageID(job));
+    params.createchart4meas = "False";
+    params.patchname = wxFileName(controlStrip).GetFullName();
+    params.patch = definition;
+    if (params.patch.empty()) {
+        return noDefinitionPath;
+    }
+    params.i = instrumentOf(definition);
+    params.m = "measure";
+    params.o = job->sampleFile;
+    params.forcemeasure = "True";
+    const Outcome outcome = launch(params);
+    if (!replacedStrip) {
+        removeFile(definition);
+    }
+    return outcome;
+}
