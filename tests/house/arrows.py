@@ -33,6 +33,7 @@ ARROWS = {
     "colour": "",
     "report": "colour",
     "viewer": "report platform",
+    "NerovaMeasure": "colour report platform",
     "analysis": "colour records",  # libTintgate without its ten functions' names
     "libTintgate": "analysis colour records",
     "ticketengine": "ticketrecords",

@@ -1,0 +1,45 @@
+#include "companions/measure-tool/Failure.h"
+
+namespace measuring {
+
+const char* wordsFor(colour::Failure failure) {
+    switch (failure) {
+    case colour::Failure::Missing:
+        return "is not there";
+    case colour::Failure::TooLarge:
+        return "is too large";
+    case colour::Failure::NotRecognised:
+        return "is neither CGATS text nor an ICC profile";
+    case colour::Failure::Damaged:
+        return "is damaged or cut off";
+    case colour::Failure::NoPatches:
+        return "has no patches";
+    case colour::Failure::NoColourValues:
+    case colour::Failure::SpectraUnusable:
+        return "has no colour values that can be used";
+    case colour::Failure::NoDeviceValues:
+        return "has no device values";
+    case colour::Failure::NotNumeric:
+        return "has a text where a number belongs";
+    case colour::Failure::ProfileDamaged:
+        return "is no intact ICC profile";
+    case colour::Failure::ProfileClass:
+        return "is a profile of a class that describes no print";
+    case colour::Failure::ProfileColourSpace:
+        return "is no profile for CMYK";
+    case colour::Failure::ProfileUnusable:
+        return "is a profile that gives no colours";
+    default:
+        return "can't be read";
+    }
+}
+
+void expectUsable(colour::Failure failure, Status status, const std::string& path) {
+    if (failure == colour::Failure::None)
+        return;
+    if (failure == colour::Failure::OutOfMemory)
+        status = Status::OutOfMemory;
+    throw Failure(status, path + " " + wordsFor(failure));
+}
+
+} // namespace measuring

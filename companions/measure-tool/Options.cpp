@@ -1,0 +1,70 @@
+// The options file: a line with a name, a line with its value, and so on. Nothing is escaped; the
+// value of -pwd alone stands in quotes.
+//
+//     -apnm
+//     Nerova Verify
+//     -pwd
+//     ""
+//     -m
+//     measure
+//     -o
+//     /tmp/Tintgate/JobID_7/Measured sample.txt
+//     -patch
+//     /tmp/Tintgate/JobID_7/NMPatchSetDefinition.it8
+#include "companions/measure-tool/Options.h"
+
+#include <map>
+#include <string_view>
+
+#include "colour/ColourFile.h"
+#include "companions/measure-tool/Failure.h"
+
+namespace measuring {
+namespace {
+
+constexpr std::size_t largestFile = 1 << 20;
+
+std::string takeLine(std::string_view& rest) {
+    const std::size_t end = rest.find('\n');
+    const std::string line(rest.substr(0, end));
+    rest.remove_prefix(end == rest.npos ? rest.size() : end + 1);
+    return line;
+}
+
+std::map<std::string, std::string> pairsOf(const std::string& path) {
+    std::string bytes;
+    expectUsable(colour::readWholeFile(path, largestFile, bytes), Status::BadOptions, path);
+    std::map<std::string, std::string> pairs;
+    for (std::string_view rest = bytes; !rest.empty();) {
+        const std::string name = takeLine(rest);
+        // A value with a line break in it shifts all that follows.
+        if (name.size() < 2 || name.front() != '-')
+            throw Failure(Status::BadOptions, path + " has \"" + name + "\" for an option's name");
+        if (rest.empty())
+            throw Failure(Status::BadOptions, path + " has no value for " + name);
+        if (!pairs.emplace(name, takeLine(rest)).second)
+            throw Failure(Status::BadOptions, path + " has " + name + " twice");
+    }
+    return pairs;
+}
+
+} // namespace
+
+Options readOptions(const std::string& path) {
+    const std::map<std::string, std::string> pairs = pairsOf(path);
+    const auto valueOf = [&](const char* name) {
+        const auto found = pairs.find(name);
+        return found == pairs.end() ? std::string() : found->second;
+    };
+    const auto needed = [&](const char* name) {
+        const std::string value = valueOf(name);
+        if (value.empty())
+            throw Failure(Status::BadOptions, path + " has no " + name);
+        return value;
+    };
+    if (needed("-m") != "measure")
+        throw Failure(Status::BadOptions, path + " asks for something else than to measure");
+    return {needed("-patch"), needed("-o"), valueOf("-patchname"), valueOf("-i")};
+}
+
+} // namespace measuring

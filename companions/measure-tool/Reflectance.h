@@ -1,0 +1,39 @@
+// From XYZ back to a reflectance that has it.
+#pragma once
+
+#include <array>
+#include <vector>
+
+#include "colour/DataSet.h"
+
+namespace measuring {
+
+/// Countless reflectances have the same XYZ. This one is the smoothest that stays between 0 and 1:
+/// "least hyperbolic tangent slope squared", Scott A. Burns, "Numerical methods for smoothest
+/// reflectance reconstruction", Color Research and Application 45 (2020).
+class ReflectanceMaker {
+  public:
+    static constexpr colour::SpectralAxis axis{380, 10, 36};
+
+    ReflectanceMaker();
+
+    /// A reflectance whose XYZ under D50 for the 2 degree observer is `xyz`, in eight decimals.
+    /// Papers with brighteners may reflect more than they get, so up to 1.5 is tried where 1 does
+    /// not do. False, with the reflectance untouched, where there is none.
+    bool make(const colour::Xyz& xyz, std::vector<double>& reflectance) const;
+
+  private:
+    static constexpr std::size_t length = 36;
+    static constexpr std::size_t unknowns = length + 3; ///< And a multiplier for X, Y and Z each.
+
+    using Vector = std::array<double, unknowns>;
+    using Matrix = std::array<Vector, unknowns>;
+
+    bool solve(const std::array<double, 3>& target, double most, Vector& solution) const;
+    double residual(const std::array<double, 3>& target, double most, const Vector& at,
+                    Vector& value, Matrix* slope) const;
+
+    std::array<std::array<double, 3>, length> m_weights; ///< XYZ of each wavelength's light, 0 to 1.
+};
+
+} // namespace measuring

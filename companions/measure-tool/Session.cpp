@@ -1,0 +1,67 @@
+#include "companions/measure-tool/Session.h"
+
+#include <sys/resource.h>
+
+#include <algorithm>
+#include <cstdlib>
+#include <string>
+
+#include "companions/measure-tool/Cancel.h"
+#include "companions/measure-tool/Failure.h"
+
+namespace measuring {
+namespace {
+
+[[noreturn]] void crash() {
+    const rlimit none{0, 0};
+    setrlimit(RLIMIT_CORE, &none); // it is no fault that anybody wants to look into
+    std::abort();
+}
+
+/// What goes wrong in front of a patch.
+void meet(Mishap mishap, std::size_t patch) {
+    switch (mishap) {
+    case Mishap::None:
+        return;
+    case Mishap::Fail:
+        throw Failure(Status::InstrumentFailed, "the instrument failed at patch " +
+                                                    std::to_string(patch + 1) +
+                                                    ", as the settings want it");
+    case Mishap::Cancel:
+        throw Failure(Status::Cancelled, "cancelled at patch " + std::to_string(patch + 1) +
+                                             ", as the settings want it");
+    case Mishap::Hang:
+        while (true)
+            pauseFor(std::chrono::hours(1));
+    case Mishap::Crash:
+        crash();
+    }
+}
+
+void append(const Reading& reading, colour::DataSet& measurement) {
+    measurement.lab.push_back(reading.lab);
+    measurement.xyz.push_back(reading.xyz);
+    measurement.spectra.insert(measurement.spectra.end(), reading.spectrum.begin(),
+                               reading.spectrum.end());
+}
+
+} // namespace
+
+colour::DataSet measureAll(const colour::DataSet& chart, Instrument& instrument,
+                           const Settings& settings, Progress& progress) {
+    const std::size_t count = chart.patchCount;
+    const std::size_t middle = (count + 1) / 2;
+    const std::size_t mishapAt = std::min(settings.mishapAt.value_or(middle), count) - 1;
+    colour::DataSet measurement = chart;
+    instrument.describe(measurement);
+    for (std::size_t patch = 0; patch < count; ++patch) {
+        if (patch == mishapAt)
+            meet(settings.mishap, patch);
+        pauseFor(settings.delay);
+        append(instrument.measure(patch), measurement);
+        progress.show(measurement, patch + 1, count);
+    }
+    return measurement;
+}
+
+} // namespace measuring

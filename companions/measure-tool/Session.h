@@ -1,0 +1,16 @@
+// One measurement, from the first patch to the last.
+#pragma once
+
+#include "colour/DataSet.h"
+#include "companions/measure-tool/Instrument.h"
+#include "companions/measure-tool/Progress.h"
+#include "companions/measure-tool/Settings.h"
+
+namespace measuring {
+
+/// Measures all patches of a chart, at the pace and with the mishap that the settings want. Throws
+/// Failure: InstrumentFailed, Cancelled, and what the instrument throws.
+colour::DataSet measureAll(const colour::DataSet& chart, Instrument& instrument,
+                           const Settings& settings, Progress& progress);
+
+} // namespace measuring
