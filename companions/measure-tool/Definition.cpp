@@ -117,9 +117,8 @@ void cutBehind(std::size_t cells, std::string& line) {
 /// The sample number of a filling row; empty for any other line.
 std::string numberOfFilling(std::string_view line) {
     const std::size_t digits = std::min(line.find_first_not_of("0123456789"), line.size());
-    const bool filling =
-        std::find(std::begin(fillings), std::end(fillings), line.substr(digits)) !=
-        std::end(fillings);
+    const bool filling = std::find(std::begin(fillings), std::end(fillings), line.substr(digits)) !=
+                         std::end(fillings);
     return std::string(line.substr(0, filling ? digits : 0));
 }
 

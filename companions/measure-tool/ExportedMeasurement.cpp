@@ -30,7 +30,10 @@ State stateOf(const std::string& path) {
     struct stat status {};
     if (stat(path.c_str(), &status) != 0)
         return {};
-    return {true, status.st_dev, status.st_ino, status.st_size,
+    return {true,
+            status.st_dev,
+            status.st_ino,
+            status.st_size,
             {status.st_mtim.tv_sec, status.st_mtim.tv_nsec}};
 }
 
@@ -89,8 +92,9 @@ void ExportedMeasurement::describe(colour::DataSet& measurement) const {
 
 Reading ExportedMeasurement::measure(std::size_t patch) {
     const std::size_t row = m_rows[patch];
-    const auto spectrum = m_set.spectra.begin() +
-                          static_cast<std::ptrdiff_t>(row * static_cast<std::size_t>(m_set.axis.length));
+    const auto spectrum =
+        m_set.spectra.begin() +
+        static_cast<std::ptrdiff_t>(row * static_cast<std::size_t>(m_set.axis.length));
     return {m_set.lab[row], m_set.xyz[row], {spectrum, spectrum + m_set.axis.length}};
 }
 

@@ -33,7 +33,8 @@ class ReflectanceMaker {
     double residual(const std::array<double, 3>& target, double most, const Vector& at,
                     Vector& value, Matrix* slope) const;
 
-    std::array<std::array<double, 3>, length> m_weights; ///< XYZ of each wavelength's light, 0 to 1.
+    std::array<std::array<double, 3>, length>
+        m_weights; ///< XYZ of each wavelength's light, 0 to 1.
 };
 
 } // namespace measuring

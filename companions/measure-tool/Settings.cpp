@@ -191,8 +191,9 @@ std::string settingsPath() {
         if (std::filesystem::exists(place, ignored))
             return place;
     }
-    throw Failure(Status::BadSettings, "no instrument is chosen: there is no TINTGATE_MEASURE, no " +
-                                           places[0] + " and no " + places[1]);
+    throw Failure(Status::BadSettings,
+                  "no instrument is chosen: there is no TINTGATE_MEASURE, no " + places[0] +
+                      " and no " + places[1]);
 }
 
 Settings readSettings(const std::string& path) {

@@ -15,5 +15,7 @@ install(TARGETS ComGUI COMPONENT companions EXCLUDE_FROM_ALL
   LIBRARY DESTINATION "${_contents}/MacOS")
 install(FILES "${TINTGATE_COMGUI_BUNDLE}/Contents/Info.plist" COMPONENT companions
   EXCLUDE_FROM_ALL DESTINATION "${_contents}")
+install(FILES NerovaMeasure.conf.example COMPONENT companions EXCLUDE_FROM_ALL
+  DESTINATION Library/Preferences)
 install(SCRIPT "${CMAKE_CURRENT_SOURCE_DIR}/PropertyLists.cmake" COMPONENT companions
   EXCLUDE_FROM_ALL)

@@ -57,9 +57,8 @@ const double meanLength = std::sqrt(8 / std::numbers::pi);
 VirtualInstrument::VirtualInstrument(const Settings& settings, const std::string& name,
                                      const colour::DataSet& chart)
     : m_chart(chart), m_path(settings.profile), m_name(name),
-      m_deviation(settings.error / meanLength), m_bias(settings.bias),
-      m_spectra(settings.spectra), m_profile(openProfile(settings.profile)),
-      m_engine(settings.seed) {
+      m_deviation(settings.error / meanLength), m_bias(settings.bias), m_spectra(settings.spectra),
+      m_profile(openProfile(settings.profile)), m_engine(settings.seed) {
     checkPrintable(chart);
 }
 

@@ -11,8 +11,9 @@
 
 namespace measuring {
 
-/// A print without any error is what the profile says, absolute colorimetric; then each patch is off
-/// by the bias and by a random part, which depends on the seed and the number of the patch alone.
+/// A print without any error is what the profile says, absolute colorimetric; then each patch is
+/// off by the bias and by a random part, which depends on the seed and the number of the patch
+/// alone.
 class VirtualInstrument : public Instrument {
   public:
     /// `name` is that of the instrument that it stands for; may be empty. The chart outlives it.

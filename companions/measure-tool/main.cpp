@@ -29,7 +29,8 @@ namespace {
 
 using namespace measuring;
 
-constexpr const char* help = R"(Measures the patches of a definition, with a virtual instrument or by
+constexpr const char* help =
+    R"(Measures the patches of a definition, with a virtual instrument or by
 handing over what an instrument's own software has exported.
 
   NerovaMeasure OPTIONS     OPTIONS is a file: a line with an option, a line with its value, ...

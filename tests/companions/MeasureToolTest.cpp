@@ -1,0 +1,588 @@
+// Runs of the measuring tool on definitions as the writer makes them.
+#include <cmath>
+#include <cstdio>
+#include <filesystem>
+#include <fstream>
+#include <sstream>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include <signal.h>
+#include <spawn.h>
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "RunProgram.h"
+#include "ScratchFolder.h"
+#include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
+#include "SuiteRoot.h"
+#include "colour/CgatsText.h"
+#include "colour/Difference.h"
+#include "job/AnalysisLibrary.h"
+#include "measure/Helper.h"
+
+namespace {
+
+using testing::HasSubstr;
+
+const std::string profile = "/usr/share/color/icc/ghostscript/default_cmyk.icc";
+const std::string virtualPrint = "instrument = virtual\nprofile = " + profile + "\n";
+
+const std::string tail =
+    "NUMBER_OF_SETS 2\nBEGIN_DATA\n1\t100\t0\t0\t0\n2\t40\t27\t27\t0\nEND_DATA\n";
+const std::string head = "CGATS.17\nORIGINATOR \"Nerova Verify\"\n";
+const std::string cmyk = "CMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K";
+const std::string colours = "LAB_L\tLAB_A\tLAB_B\tXYZ_X\tXYZ_Y\tXYZ_Z";
+
+std::string format(const std::string& names) {
+    return "BEGIN_DATA_FORMAT\nSAMPLE_ID\t" + names + "\nEND_DATA_FORMAT\n";
+}
+
+/// The lines of a definition end in CR LF.
+std::string crlf(const std::string& text) {
+    std::string result;
+    for (const char c : text)
+        result += c == '\n' ? "\r\n" : std::string(1, c);
+    return result;
+}
+
+/// A definition of these rows of C, M, Y, K.
+std::string definitionOf(const std::vector<double>& inks) {
+    std::ostringstream text;
+    text << head << format(cmyk) << "KEYWORD\tDEVICE\nDEVICE 33\nNUMBER_OF_SETS\t"
+         << inks.size() / 4 << "\nBEGIN_DATA\n";
+    for (std::size_t i = 0; i < inks.size(); ++i)
+        text << (i % 4 == 0 ? std::to_string(i / 4 + 1) : "") << '\t' << inks[i]
+             << (i % 4 == 3 ? "\n" : "");
+    return crlf(text.str() + "END_DATA\n");
+}
+
+std::vector<double> grid(std::initializer_list<double> steps) {
+    std::vector<double> inks;
+    for (const double c : steps)
+        for (const double m : steps)
+            for (const double y : steps)
+                for (const double k : steps)
+                    inks.insert(inks.end(), {c, m, y, k});
+    return inks;
+}
+
+/// "1: 100 0 0 0; 2: 40 27 27 0; "
+std::string patchesText(const colour::DataSet& set) {
+    std::ostringstream text;
+    const std::size_t channels = set.channels.size();
+    for (std::size_t patch = 0; patch < set.patchCount; ++patch) {
+        text << set.ids[patch] << ':';
+        for (std::size_t i = 0; i < channels; ++i)
+            text << ' ' << std::round(100 * set.device[patch * channels + i]) / 100;
+        text << "; ";
+    }
+    return text.str();
+}
+
+class MeasureTool : public testing::Test {
+  protected:
+    MeasureTool() { m_folder.makeFolder("out"); }
+
+    support::Outcome measure(const std::string& definition, const std::string& settings,
+                             const std::string& program = MEASURE_TOOL) const {
+        m_folder.write("definition.it8", definition);
+        return support::run({program, writeOptions()}, environmentWith(settings));
+    }
+
+    std::string writeOptions() const {
+        return m_folder.write("options",
+                              "-apnm\nNerova Verify\n-l\n57\n-pwd\n\"\"\n-i\nInstrument 33"
+                              "\n-m\nmeasure\n-o\n" +
+                                  m_output + "\n-patch\n" + m_folder.path("definition.it8") +
+                                  "\n-patchname\nstrip.it8\n-forcemeasure\nTrue\n");
+    }
+
+    support::RunOptions environmentWith(const std::string& settings) const {
+        support::RunOptions options;
+        options.environment["TINTGATE_MEASURE"] = m_folder.write("settings", settings);
+        return options;
+    }
+
+    /// What was measured; empties the folder that it was written to.
+    colour::DataSet takeResult() const {
+        colour::DataSet set;
+        if (support::exists(m_output)) {
+            EXPECT_EQ(colour::readCgats(support::contentsOf(m_output), {}, set),
+                      colour::Failure::None);
+            std::filesystem::remove(m_output);
+        }
+        EXPECT_TRUE(std::filesystem::is_empty(m_folder.path("out")));
+        return set;
+    }
+
+    /// Measures with what works.
+    colour::DataSet measured(const std::string& definition, const std::string& settings) const {
+        const support::Outcome outcome = measure(definition, settings);
+        EXPECT_EQ(outcome.exitCode, 0) << outcome.error;
+        EXPECT_EQ(outcome.output + outcome.error, "");
+        return takeResult();
+    }
+
+    /// One distinct failure, one line, and no file.
+    void expectFailure(const support::Outcome& outcome, int exitCode, const std::string& words) {
+        EXPECT_EQ(outcome.exitCode, exitCode) << words;
+        EXPECT_THAT(outcome.error, HasSubstr(words));
+        EXPECT_EQ(outcome.error.find('\n'), outcome.error.size() - 1) << outcome.error;
+        EXPECT_EQ(takeResult().patchCount, 0u) << words;
+    }
+
+    const support::ScratchFolder m_folder;
+    const std::string m_output = m_folder.path("out/Measured sample.txt");
+};
+
+// The tool's own reader and that of the analysis library, on what the writer makes of strips.
+TEST_F(MeasureTool, ReadsEveryDefinition) {
+    const std::string device = "KEYWORD\tDEVICE\nDEVICE 33\n";
+    const std::string simple = "1: 100 0 0 0; 2: 40 27 27 0; ";
+    const std::string white = "\t0.00\t0.00\t0.00\t0.00\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\n";
+    const std::string whiteRgb = "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\n";
+    std::string spectra;
+    std::string reflectances;
+    for (int nm = 380; nm <= 730; nm += 10) {
+        spectra += "\tSPECTRAL_NM_" + std::to_string(nm);
+        reflectances += "\t0.123456789012";
+    }
+    const std::string longNames = ("SAMPLE_ID\t" + cmyk + spectra).substr(0, 511);
+
+    const struct {
+        const char* what;
+        std::string text;
+        std::string patches;
+        const char* instrument = "Instrument 33";
+    } cases[] = {
+        {"plain", head + format(cmyk) + device + tail, simple},
+        {"no keyword", head + format(cmyk) + "DEVICE 28\n" + tail, simple, "Instrument 28"},
+        {"value behind a tab", head + format(cmyk) + "DEVICE\t28\n" + tail, simple,
+         "Instrument 28"},
+        {"no device", head + format(cmyk) + tail, simple, ""},
+        {"low count",
+         head + format(cmyk) + device +
+             "NUMBER_OF_SETS 1\nBEGIN_DATA\n1\t100\t0\t0\t0\n2\t40\t27\t27\t0\n"
+             "END_DATA\n\n\n",
+         simple},
+        {"no count, no end of the line",
+         head + format(cmyk) + device + "BEGIN_DATA\n1\t100\t0\t0\t0\n2\t40\t27\t27\t0\nEND_DATA",
+         simple},
+        {"no end, but the count",
+         head + format(cmyk) + device +
+             "NUMBER_OF_SETS 2\nBEGIN_DATA\n1\t100\t0\t0\t0\n"
+             "2\t40\t27\t27\t0\n\n",
+         simple},
+        {"another table behind",
+         head + format(cmyk) + device + tail +
+             "BEGIN_DATA_FORMAT\nINDEX\tD_VIS\nEND_DATA_FORMAT\n"
+             "BEGIN_DATA\n1\t2\nEND_DATA\n",
+         simple},
+        {"names of several bytes, whose rows are cut off",
+         head + format("SAMPLE_NAME\t" + cmyk + "\t" + colours) + device +
+             "BEGIN_DATA\n1\tGr\xc3\xb6\xc3\x9f"
+             "e a\t100\t0\t0\t0\t55\t-36\t-50\t1\t2\t74.\n"
+             "2\t\xe7\x99\xbd\xe3\x81\x84 \xe7\xb4\x99\t40\t27\t27\t0\t95.00\t0.00\t0.00\t84.00\n"
+             "3\t\t0\t0\t0\t50\t95\t0\t0\t84\t87\t74\nEND_DATA\n",
+         simple + "3: 0 0 0 50; "},
+        {"names cut off behind the values",
+         head + format(cmyk + "\tSAMPLE_NAME") + device +
+             "BEGIN_DATA\n1\t100\t0\t0\t0\tGr\n2\t40\t27\t27\t0\t\n"
+             "END_DATA\n",
+         simple},
+        {"rows and names cut off at 511 bytes",
+         head + "NUMBER_OF_FIELDS 41\nBEGIN_DATA_FORMAT\n" + longNames + "\nEND_DATA_FORMAT\n" +
+             device + "BEGIN_DATA\n" + ("1\t100\t0\t0\t0" + reflectances).substr(0, 511) + "\n" +
+             ("2\t40\t27\t27\t0" + reflectances).substr(0, 511) + "\nEND_DATA\n",
+         simple},
+        {"blanks between the cells",
+         head +
+             "BEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M CMYK_Y "
+             "CMYK_K LAB_L LAB_A LAB_B\nEND_DATA_FORMAT\n" +
+             device +
+             "BEGIN_DATA\n1 100 0 0 0 55 -36 -50\n"
+             "2  40 27 27 0\t60 0 0\nEND_DATA\n",
+         simple},
+        {"filling rows",
+         head + format(cmyk + "\t" + colours) + device +
+             "NUMBER_OF_SETS\t3\nBEGIN_DATA\n1\t100\t0\t0\t0\t55\t-36\t-50\t1\t2\t3\n2" + white +
+             "3" + white + "END_DATA",
+         "1: 100 0 0 0; 2: 0 0 0 0; 3: 0 0 0 0; "},
+        {"filling rows with columns of their own",
+         head + format("SAMPLE_NAME\tCMYK_K\tCMYK_C\tCMYK_M\tCMYK_Y\tSPOT_1") + device +
+             "BEGIN_DATA\n1\tA1\t5\t100\t0\t0\t0\n2" + white + "END_DATA",
+         "1: 100 0 0 5 0; 2: 0 0 0 0 0; "},
+        {"RGB",
+         head + format("RGB_R\tRGB_G\tRGB_B\t" + colours) + device +
+             "BEGIN_DATA\n1\t0\t51\t255\t3\t0\t0\t1\t1\t1\n2" + whiteRgb + "END_DATA",
+         "1: 0 20 100; 2: 100 100 100; "},
+        {"RGB in percent",
+         head + format("RGB_R\tRGB_G\tRGB_B\tLAB_L\tLAB_A\tLAB_B") + device +
+             "BEGIN_DATA\n1\t0\t20\t100\t3\t0\t0\n2" + whiteRgb + "END_DATA",
+         "1: 0 20 100; 2: 100 100 100; "},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        const colour::DataSet set = measured(crlf(c.text), virtualPrint);
+        EXPECT_EQ(patchesText(set), c.patches);
+        wxString name;
+        const int status = getDeviceNameFromIt8ControlStripFile(
+            stringToWstring(m_folder.path("definition.it8")), &name);
+        EXPECT_EQ(name, c.instrument);
+        EXPECT_EQ(status == 0, !name.empty());
+    }
+}
+
+TEST_F(MeasureTool, RefusesOtherDefinitions) {
+    const std::string good = crlf(head + format(cmyk) + tail);
+    const struct {
+        std::string text;
+        int exitCode;
+        const char* words;
+    } cases[] = {
+        {"", 4, "is neither"},
+        {good.substr(0, good.size() - 30), 4, "is damaged or cut off"},
+        {crlf(head + "END_DATA_FORMAT\n" + tail), 4, "is damaged or cut off"},
+        {crlf(head + format(cmyk) + "BEGIN_DATA\nEND_DATA\n"), 4, "has no patches"},
+        {crlf(head + format(cmyk) + "BEGIN_DATA\n1\t100\t\n2\t40\t27\t27\t0\nEND_DATA\n"), 4,
+         "is damaged"},
+        {crlf(head + format(cmyk) + "BEGIN_DATA\n1\t100\tx\t0\t0\nEND_DATA\n"), 4, "has a text"},
+        {crlf(head + format("LAB_L\tLAB_A\tLAB_B") + "BEGIN_DATA\n1\t50\t0\t0\nEND_DATA\n"), 5,
+         "other colorants"},
+        {crlf(head + format(cmyk + "\tSPOT_1") + "BEGIN_DATA\n1\t0\t0\t0\t0\t9\nEND_DATA\n"), 5,
+         "other colorants"},
+    };
+    for (const auto& c : cases)
+        expectFailure(measure(c.text, virtualPrint), c.exitCode, c.words);
+    std::filesystem::remove(m_folder.path("definition.it8"));
+    expectFailure(support::run({MEASURE_TOOL, writeOptions()}, environmentWith(virtualPrint)), 4,
+                  "is not there");
+}
+
+TEST_F(MeasureTool, PrintsWhatTheProfileSays) {
+    const std::vector<double> inks = grid({0, 30, 70, 100});
+    const colour::DataSet set = measured(definitionOf(inks), virtualPrint);
+    ASSERT_EQ(set.lab.size(), inks.size() / 4);
+    EXPECT_THAT(set.instrumentation, HasSubstr("Virtual"));
+    EXPECT_EQ(set.descriptor, "strip.it8");
+
+    std::ostringstream lines;
+    for (std::size_t i = 0; i < inks.size(); ++i)
+        lines << inks[i] << (i % 4 == 3 ? '\n' : ' ');
+    std::istringstream answers(support::run({"sh", "-c",
+                                             "transicc -n -t3 '-o*Lab4' -i" + profile + " < " +
+                                                 m_folder.write("inks", lines.str())})
+                                   .output);
+    for (const colour::Lab& lab : set.lab) {
+        colour::Lab expected;
+        ASSERT_TRUE(answers >> expected.L >> expected.a >> expected.b);
+        EXPECT_LE(colour::deltaE76(lab, expected), 0.01);
+    }
+}
+
+// The library takes the measurement, finds every patch and, against the profile itself, no error.
+TEST_F(MeasureTool, IsReadByTheLibrary) {
+    ASSERT_EQ(measure(definitionOf(grid({0, 40, 100})), virtualPrint + "spectra = yes\n").exitCode,
+              0);
+    tolerancePresetParameterRecord preset;
+    ASSERT_EQ(parsePresetParameterXMLFile(
+                  stringToWstring(TINTGATE_SOURCE_DIR "/presets/CVP_0001.xml"), &preset, false),
+              0);
+    analyseResultsRecord results;
+    std::wstring json;
+    ASSERT_EQ(analyzeMeasurements(stringToWstring(profile), stringToWstring(m_output), L"", preset,
+                                  &results, &json, nullptr),
+              0);
+    EXPECT_LE(results.values[6], 1e-5); // the largest difference
+    EXPECT_EQ(json.find(L"patchesUnpaired"), json.npos);
+    EXPECT_EQ(json.find(L"readerNote"), json.npos);
+}
+
+// Spectra hold their colour: spec2cie takes them at 10 nm and integrates them every nm.
+TEST_F(MeasureTool, SpectraHaveTheColourMeasured) {
+    const colour::DataSet set =
+        measured(definitionOf(grid({0, 40, 100})), virtualPrint + "spectra = yes\nerror = 1\n");
+    ASSERT_EQ(set.axis.base, 380);
+    ASSERT_EQ(set.axis.step, 10);
+    ASSERT_EQ(set.axis.length, 36);
+    std::ostringstream text;
+    text << "CTI3\n\nDEVICE_CLASS \"OUTPUT\"\nCOLOR_REP \"RGB_XYZ\"\nSPECTRAL_BANDS \"36\"\n"
+         << "SPECTRAL_START_NM \"380\"\nSPECTRAL_END_NM \"730\"\nNUMBER_OF_FIELDS 43\n"
+         << "BEGIN_DATA_FORMAT\nSAMPLE_ID RGB_R RGB_G RGB_B XYZ_X XYZ_Y XYZ_Z";
+    for (int nm = 380; nm <= 730; nm += 10)
+        text << " SPEC_" << nm;
+    text << "\nEND_DATA_FORMAT\nNUMBER_OF_SETS " << set.patchCount << "\nBEGIN_DATA\n";
+    text.precision(12);
+    for (std::size_t i = 0; i < set.spectra.size(); ++i) {
+        ASSERT_GT(set.spectra[i], 0);
+        ASSERT_LT(set.spectra[i], 1);
+        if (i % 36 == 0)
+            text << i / 36 + 1 << " 0 0 0 0 0 0";
+        text << ' ' << 100 * set.spectra[i] << (i % 36 == 35 ? "\n" : "");
+    }
+    const std::string in = m_folder.write("in.ti3", text.str() + "END_DATA\n");
+    const std::string out = m_folder.path("out.ti3");
+    ASSERT_EQ(support::run({"spec2cie", "-n", in, out}).exitCode, 0);
+    std::istringstream output(support::contentsOf(out));
+    for (std::string line; line != "BEGIN_DATA" && std::getline(output, line);) {
+    }
+    for (const colour::Lab& lab : set.lab) {
+        double skipped = 0;
+        colour::Lab expected;
+        for (int i = 0; i < 7; ++i)
+            output >> skipped;
+        ASSERT_TRUE(output >> expected.L >> expected.a >> expected.b);
+        EXPECT_LE(colour::deltaE76(lab, expected), 0.05);
+    }
+}
+
+TEST_F(MeasureTool, ErrorsHaveTheirSizeAndCanBeRepeated) {
+    std::vector<double> inks;
+    for (int i = 0; i < 4000; ++i)
+        inks.insert(inks.end(), {20, 15, 15, 0});
+    const std::string definition = definitionOf(inks);
+    const colour::Lab printed = measured(definition, virtualPrint).lab[0];
+    const std::string settings = virtualPrint + "error = 2\nbias = 1 -2 0.5\n";
+    const colour::DataSet set = measured(definition, settings);
+    colour::Lab mean;
+    double size = 0;
+    const colour::Lab centre{printed.L + 1, printed.a - 2, printed.b + 0.5};
+    for (const colour::Lab& lab : set.lab) {
+        mean.L += (lab.L - centre.L) / 4000;
+        mean.a += (lab.a - centre.a) / 4000;
+        mean.b += (lab.b - centre.b) / 4000;
+        size += colour::deltaE76(lab, centre) / 4000;
+    }
+    EXPECT_LT(std::hypot(mean.L, mean.a, mean.b), 0.1); // four times its own deviation
+    EXPECT_NEAR(size, 2, 0.06);
+
+    const auto labOfLast = [](const colour::DataSet& s) { return s.lab.back().a; };
+    EXPECT_EQ(labOfLast(measured(definition, settings)), labOfLast(set));
+    EXPECT_EQ(labOfLast(measured(definition, settings + "spectra = yes\nseed = 1\n")),
+              labOfLast(set));
+    EXPECT_NE(labOfLast(measured(definition, settings + "seed = 2\n")), labOfLast(set));
+}
+
+TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
+    const std::string definition =
+        crlf(head + format(cmyk + "\tSAMPLE_NAME") + "DEVICE 33\n" +
+             "BEGIN_DATA\n1\t100\t0\t0\t0\tA1\n2\t40\t27\t27\t0\tA2\n3\t0\t0\t0\t0\tA3\n"
+             "4\t0\t0\t0\t0\tA4\nEND_DATA\n");
+    const std::string rows[] = {"1 100 0 0 0 55 -37 -50\n", "2 40 27 27 0 60 1 2\n",
+                                "3 0 0 0 0 95 0 -2\n", "4 0 0 0 0 95 0 -3\n"};
+    const std::string names =
+        "BEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A "
+        "LAB_B\nEND_DATA_FORMAT\nBEGIN_DATA\n";
+    const std::string made =
+        "CGATS.17\nINSTRUMENTATION \"i9\"\nMEASUREMENT_CONDITION \"M1\"\n" + names;
+    const std::string labels = "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID\tLAB_L\tLAB_A\tLAB_B\n"
+                               "END_DATA_FORMAT\nBEGIN_DATA\n";
+    const struct {
+        const char* what;
+        std::string text;
+        int exitCode = 0;
+        const char* words = "";
+    } cases[] = {
+        {"as asked", made + rows[0] + rows[1] + rows[2] + rows[3] + "END_DATA\n"},
+        {"in another order", made + rows[2] + rows[1] + rows[3] + rows[0] + "END_DATA\n"},
+        {"numbered anew, rounded", made + "11 100 0 0 0 55 -37 -50\n12 39.6 27.4 27 0 60 1 2\n"
+                                          "13 0 0 0 0 95 0 -2\n14 0 0 0 0 95 0 -3\nEND_DATA\n"},
+        {"by ids", labels + "4\t95\t0\t-3\n1\t55\t-37\t-50\n2\t60\t1\t2\n3\t95\t0\t-2\nEND_DATA\n"},
+        {"ids that are names here",
+         labels + "A4\t95\t0\t-3\nA1\t55\t-37\t-50\nA2\t60\t1\t2\nA3\t95\t0\t-2\nEND_DATA\n"},
+        {"one too few", made + rows[0] + rows[1] + rows[2] + "END_DATA\n", 8, "3 patches where 4"},
+        {"one too many", made + rows[0] + rows[1] + rows[2] + rows[3] + rows[3] + "END_DATA\n", 8,
+         "5 patches where 4"},
+        {"another patch",
+         made + rows[0] + "2 40 27 29 0 60 1 2\n" + rows[2] + rows[3] + "END_DATA\n", 8,
+         "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
+        {"a patch twice", made + rows[0] + rows[1] + rows[2] + rows[1] + "END_DATA\n", 8,
+         "patch 4 should be 0 0 0 0"},
+        {"other ids",
+         labels + "4\t95\t0\t-3\n1\t55\t-37\t-50\n2\t60\t1\t2\n5\t95\t0\t-2\nEND_DATA\n", 8,
+         "there is no patch 3"},
+        {"no ids",
+         "CGATS.17\nBEGIN_DATA_FORMAT\nLAB_L\tLAB_A\tLAB_B\nEND_DATA_FORMAT\nBEGIN_DATA\n"
+         "1\t2\t3\n1\t2\t3\n1\t2\t3\n1\t2\t3\nEND_DATA\n",
+         8, "neither device values nor ids"},
+        {"cut off", made + rows[0] + rows[1], 7, "is damaged"},
+        {"no colours", crlf(head + format(cmyk) + tail), 7, "holds no measured colours"},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        m_folder.write("export.txt", c.text);
+        // A relative path starts from the settings.
+        const std::string settings = "instrument = file\nfile = export.txt\n";
+        if (c.exitCode != 0) {
+            expectFailure(measure(definition, settings), c.exitCode, c.words);
+            continue;
+        }
+        const colour::DataSet set = measured(definition, settings);
+        EXPECT_EQ(patchesText(set), "1: 100 0 0 0; 2: 40 27 27 0; 3: 0 0 0 0; 4: 0 0 0 0; ");
+        ASSERT_EQ(set.lab.size(), 4u);
+        EXPECT_EQ(set.lab[0].b, -50);
+        EXPECT_EQ(set.lab[1].L, 60);
+        EXPECT_EQ(set.lab[2].b, -2);
+        EXPECT_EQ(set.lab[3].b, -3);
+        EXPECT_EQ(set.conditions.measurement, c.text.starts_with(made) ? "M1" : "");
+    }
+    expectFailure(measure(definition, "instrument = file\nfile = " + profile + "\n"), 7,
+                  "no measured");
+    expectFailure(measure(definition, "instrument = file\nfile = missing\n"), 7, "is not there");
+}
+
+TEST_F(MeasureTool, WaitsForANewExport) {
+    const std::string definition = definitionOf({100, 0, 0, 0});
+    const std::string names =
+        "CGATS.17\n" + format(cmyk + "\tLAB_L\tLAB_A\tLAB_B") + "BEGIN_DATA\n";
+    const std::string path = m_folder.write("export.txt", names + "1 100 0 0 0 11 0 0\nEND_DATA\n");
+    expectFailure(measure(definition, "instrument = file\nfile = export.txt\nwait = 1\n"), 7,
+                  "was not exported in time");
+    std::thread software([&] {
+        std::this_thread::sleep_for(std::chrono::milliseconds(400));
+        std::ofstream file(path);
+        file << names << std::flush; // a slow one: it rests before it is done
+        std::this_thread::sleep_for(std::chrono::milliseconds(1200));
+        file << "1 100 0 0 0 22 0 0\nEND_DATA\n";
+    });
+    const colour::DataSet set =
+        measured(definition, "instrument = file\nfile = export.txt\nwait = 60\n");
+    software.join();
+    EXPECT_EQ(set.lab.at(0).L, 22);
+}
+
+TEST_F(MeasureTool, MishapsLeaveNoFile) {
+    const std::string definition = definitionOf(grid({0, 100}));
+    expectFailure(measure(definition, virtualPrint + "mishap = fail\n"), 10, "failed at patch 8,");
+    expectFailure(measure(definition, virtualPrint + "mishap = cancel\nmishap-at = 99\n"), 11,
+                  "cancelled at patch 16,");
+    const support::Outcome crashed = measure(definition, virtualPrint + "mishap = crash\n");
+    EXPECT_EQ(crashed.signal, SIGABRT);
+    EXPECT_EQ(takeResult().patchCount, 0u);
+    support::RunOptions impatient = environmentWith(virtualPrint + "mishap = hang\n");
+    impatient.limit = std::chrono::milliseconds(500);
+    EXPECT_TRUE(support::run({MEASURE_TOOL, writeOptions()}, impatient).timedOut);
+    EXPECT_EQ(takeResult().patchCount, 0u);
+
+    // 16 patches take at least their time.
+    const auto start = std::chrono::steady_clock::now();
+    measured(definition, virtualPrint + "delay = 10\n");
+    EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(160));
+
+    for (const std::string slow : {"mishap = hang\n", "delay = 60000\n"}) {
+        const support::Outcome ended = support::run(
+            {"timeout", "--signal=TERM", "--preserve-status", "0.3", MEASURE_TOOL, writeOptions()},
+            environmentWith(virtualPrint + slow));
+        expectFailure(ended, 11, "cancelled");
+    }
+}
+
+TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
+    m_folder.write("definition.it8", definitionOf({0, 0, 0, 0}));
+    const std::string options = support::contentsOf(writeOptions());
+    const auto replaced = [&](const std::string& from, const std::string& to) {
+        std::string text = options;
+        return text.replace(text.find(from), from.size(), to);
+    };
+    const struct {
+        std::string options;
+        std::string settings;
+        int exitCode;
+        const char* words;
+    } cases[] = {
+        {"", virtualPrint, 2, "has no -m"},
+        {replaced("measure\n", "chart\n"), virtualPrint, 2, "something else than to measure"},
+        {replaced("-patch\n", "-parch\n"), virtualPrint, 2, "has no -patch"},
+        {replaced("Instrument 33", "Instrument\n33"), virtualPrint, 2, "has \"33\" for"},
+        {options + "-o\n/x\n", virtualPrint, 2, "has -o twice"},
+        {options + "-s\n", virtualPrint, 2, "has no value for -s"},
+        {replaced("-o\n" + m_output, "-o\n" + m_folder.path("definition.it8")), virtualPrint, 2,
+         "would replace"},
+        {replaced("-o\n" + m_output, "-o\n" + m_folder.path("out")), virtualPrint, 9,
+         "is no ordinary file"},
+        {replaced("-o\n" + m_output, "-o\n" + m_folder.path("nowhere/x")), virtualPrint, 9,
+         "nothing can be written"},
+        {options, "# nothing\n", 3, "has no instrument"},
+        {options, "instrument = virtual\n", 3, "has no profile"},
+        {options, "instrument = file\n", 3, "has no file"},
+        {options, virtualPrint + "\nerror = 51", 3, "line 4 wants a number from 0 to 50 for error"},
+        {options, virtualPrint + "error = nan", 3, "wants a number"},
+        {options, virtualPrint + "bias = 1 2", 3, "wants three numbers"},
+        {options, virtualPrint + "bias = 1 2 3 4", 3, "wants three numbers"},
+        {options, virtualPrint + "seed = -1", 3, "wants a whole number"},
+        {options, virtualPrint + "mishap = explode", 3, "wants none, fail"},
+        {options, virtualPrint + "mishap-at = 0", 3, "wants the number of a patch"},
+        {options, virtualPrint + "profile = x", 3, "has profile a second time"},
+        {options, virtualPrint + "colour = yes", 3, "\"colour\", which is no setting"},
+        {options, virtualPrint + "spectra", 3, "has no ="},
+        {options, "instrument = virtual\nprofile = missing", 6, "missing is not there"},
+        {options, "instrument = virtual\nprofile = /usr/share/color/icc/sRGB.icc", 6, "for CMYK"},
+        {options, "instrument = virtual\nprofile = definition.it8", 6, "is no ICC profile"},
+        {options, virtualPrint + "spectra = yes\nbias = 50 0 0", 5, "no spectrum has the colour"},
+    };
+    for (const auto& c : cases) {
+        const std::string path = m_folder.write("options", c.options);
+        expectFailure(support::run({MEASURE_TOOL, path}, environmentWith(c.settings)), c.exitCode,
+                      c.words);
+    }
+    EXPECT_EQ(support::contentsOf(m_folder.path("definition.it8")), definitionOf({0, 0, 0, 0}));
+    EXPECT_EQ(support::run({MEASURE_TOOL}).exitCode, 64);
+    EXPECT_EQ(support::run({MEASURE_TOOL, "a", "b"}).exitCode, 64);
+    EXPECT_EQ(support::run({MEASURE_TOOL, m_folder.path("missing")}).exitCode, 2);
+}
+
+TEST_F(MeasureTool, ShowsProgressOnATerminalOnly) {
+    m_folder.write("definition.it8", definitionOf({100, 0, 0, 0, 0, 0, 0, 100}));
+    const std::string command = std::string(MEASURE_TOOL) + " " + writeOptions();
+    const support::Outcome outcome = support::run({"script", "-qec", command, "/dev/null"},
+                                                  environmentWith(virtualPrint + "delay = 60\n"));
+    EXPECT_EQ(outcome.exitCode, 0);
+    EXPECT_THAT(outcome.output, HasSubstr("Patch 1 of 2    100 0 0 0    L*a*b* 55."));
+    EXPECT_THAT(outcome.output, HasSubstr("Patch 2 of 2    0 0 0 100"));
+}
+
+// One installation is a whole system root.
+TEST_F(MeasureTool, IsInstalledWithItsSuite) {
+    const support::SuiteRoot root("a root");
+    ASSERT_EQ(support::run({CMAKE, "--install", TINTGATE_BINARY_DIR, "--component", "companions",
+                            "--prefix", root.path()})
+                  .exitCode,
+              0);
+    EXPECT_EQ(Helper::GetHWBInstallationPath(), root.path());
+    __CFBundle* plugIn = nullptr;
+    ComGUIModuleInterface** interface = nullptr;
+    ComGUIManager manager;
+    EXPECT_EQ(manager.RegisterPlugIn(&plugIn), 0);
+    EXPECT_EQ(manager.CreateComGUIModuleInterface(plugIn, &interface), 0);
+    EXPECT_TRUE(Helper::GetNerovaVerifyPath().FileExists());
+    const std::string program = Helper::GetNerovaMeasurePath(true).ToStdString();
+    ASSERT_TRUE(program.starts_with(root.path()));
+
+    // The settings of the root count where nothing else names any.
+    m_folder.write("definition.it8", definitionOf({0, 0, 0, 0}));
+    std::ofstream(root.path("Library/Preferences/NerovaMeasure.conf"))
+        << virtualPrint << "mishap = hang\n";
+    EXPECT_FALSE(Helper::IsNMRunning());
+    support::RunOptions options;
+    options.environment["TINTGATE_MEASURE"] = std::nullopt;
+    std::thread running([&] {
+        expectFailure(
+            support::run({"timeout", "--preserve-status", "3", program, writeOptions()}, options),
+            11, "cancelled");
+    });
+    bool seen = false;
+    for (int i = 0; i < 200 && !seen; ++i) {
+        std::this_thread::sleep_for(std::chrono::milliseconds(10));
+        seen = Helper::IsNMRunning();
+    }
+    EXPECT_TRUE(seen);
+    running.join();
+    EXPECT_FALSE(Helper::IsNMRunning());
+}
+
+} // namespace
