@@ -476,7 +476,7 @@ TEST_F(MeasureTool, MishapsLeaveNoFile) {
 
     for (const std::string slow : {"mishap = hang\n", "delay = 60000\n"}) {
         const support::Outcome ended = support::run(
-            {"timeout", "--signal=TERM", "--preserve-status", "0.3", MEASURE_TOOL, writeOptions()},
+            {"timeout", "--signal=TERM", "--preserve-status", "1", MEASURE_TOOL, writeOptions()},
             environmentWith(virtualPrint + slow));
         expectFailure(ended, 11, "cancelled");
     }
