@@ -2,29 +2,24 @@
 // each argument is read by its position. All that is printed goes to standard output, and a failure
 // shows as the exit code only: the callers rely on both.
 
-#include <algorithm>
 #include <clocale>
-#include <cstddef>
 #include <cstdio>
 #include <cstring>
-#include <fstream>
-#include <functional>
-#include <numeric>
-#include <ostream>
 #include <string>
-#include <string_view>
 
 #include <langinfo.h>
 #include <malloc.h>
 
 #include <wx/debug.h>
+#include <wx/init.h>
 #include <wx/log.h>
-#include <wx/string.h>
 
 #include "ExitCodes.h"
 #include "cli/CLogger.h"
 #include "cli/HelpText.h"
 #include "job/AnalysisLibrary.h"
+#include "job/JobFiles.h"
+#include "job/KZVerifyJobProcessor.h"
 #include "platform/TemporaryFolder.h"
 
 namespace {
@@ -85,25 +80,6 @@ int answerWord(const std::string& word) {
     return validateInputFile(stringToWstring(word));
 }
 
-/// Through wxString in pieces, since the narrow copy of a large result would cost as much memory as
-/// the analysis itself. A piece of plain ASCII, as all of ours are, is narrowed here: wx goes
-/// through the C library's converter twice, which took a seventh of a whole run.
-void writeText(std::ostream& stream, std::wstring_view text) {
-    constexpr std::size_t pieceLength = 1 << 14;
-    std::string narrow;
-    for (; !text.empty() && stream; text.remove_prefix(std::min(pieceLength, text.size()))) {
-        const std::wstring_view piece = text.substr(0, pieceLength);
-        const bool ascii =
-            (std::reduce(piece.begin(), piece.end(), wchar_t{}, std::bit_or<>()) & ~0x7F) == 0;
-        if (ascii) {
-            narrow.assign(piece.begin(), piece.end());
-            stream << narrow;
-        } else {
-            stream << wxString(piece.data(), piece.size());
-        }
-    }
-}
-
 /// The output is opened in place, so that links and /dev/stdout work, and not before there is
 /// something to write: a failed comparison leaves an existing file as it was.
 int calculateSummary(char* arguments[], const char* patchSetPath) {
@@ -123,13 +99,34 @@ int calculateSummary(char* arguments[], const char* patchSetPath) {
         return result;
     }
 
-    std::ofstream output(arguments[4], std::ios::out | std::ios::trunc);
-    if (!output) {
-        return exitResultNotWritten;
+    return writeTextFile(arguments[4], json) ? exitDone : exitResultNotWritten;
+}
+
+/// What stands behind the last ":" of an argument, or all of it.
+std::wstring valueOf(const char* argument) {
+    const std::wstring text = stringToWstring(argument);
+    return text.substr(text.rfind(L':') + 1); // Without a ":", from the start.
+}
+
+/// A client application starts one run for each job, and looks at nothing but its exit code. An
+/// exception is not caught: a job id that is no number ends the process by one.
+int verifyJob(int count, char* arguments[]) {
+    if (std::strstr(arguments[1], "KEY_KZ_HOST") == nullptr) {
+        return exitJobFormRefused;
     }
-    writeText(output, json);
-    output.close();
-    return output ? exitDone : exitResultNotWritten;
+    const bool remeasure = count == 9 && std::strcmp(arguments[8], "KEY_KZ_REMEASURE:=:true") == 0;
+    const wxInitializer wx; // The file forms do without, which saves a part of their time.
+    KZVerifyJobProcessor processor;
+    unsigned int major = 0;
+    unsigned int minor = 0;
+    unsigned int patch = 0;
+    getLibVersion(major, minor, patch);
+    CLogger::GetLogger()->Log("Tintgate.exe verion = %d.%d.%d", toolVersion[0], toolVersion[1],
+                              toolVersion[2]);
+    CLogger::GetLogger()->Log("TintgateLib.dll verion = %u.%u.%u", major, minor, patch);
+    return processor.VerifyKZJob(valueOf(arguments[1]), valueOf(arguments[7]),
+                                 valueOf(arguments[6]), valueOf(arguments[3]),
+                                 valueOf(arguments[2]), valueOf(arguments[4]), remeasure);
 }
 
 } // namespace
@@ -153,7 +150,7 @@ int main(int argc, char* argv[]) {
         return calculateSummary(argv, argv[5]);
     case 8:
     case 9:
-        return exitJobFormRefused;
+        return verifyJob(argc, argv);
     default:
         std::puts("To see usage please use argument -help");
         return exitWrongArguments;

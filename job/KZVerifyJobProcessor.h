@@ -27,8 +27,9 @@ class KZVerifyJobProcessor {
     KZVerifyJobProcessor(const KZVerifyJobProcessor&) = delete;
     KZVerifyJobProcessor& operator=(const KZVerifyJobProcessor&) = delete;
 
-    /// Finds the program's folder in the temporary folder, making it where it is missing. By
-    /// requirement only the first call in a process does; a later one returns an empty text.
+    /// Finds the program's folder in the temporary folder, making it where it is missing. Empty
+    /// where that is a link or somebody else's: what a job writes holds passwords. By requirement
+    /// only the first call in a process looks; a later one returns an empty text.
     wxString SetWorkingDir();
     /// m_workingDir as bytes.
     std::string GetNerovaKZJobDataDir() const;
@@ -93,6 +94,12 @@ class KZVerifyJobProcessor {
     int m_lastRetCode = 0;               ///< Last return code of the connector.
 
   private:
+    /// Whether the server lists the job among those to be verified or remeasured.
+    bool IsListed(int jobID, bool remeasure);
+    /// All that follows once a job is loaded.
+    int VerifyLoadedJob(KZJobDataStruct* job, bool remeasure);
+    /// Compares the measurement that the ticket holds. Writes nothing to the ticket.
+    int CompareStoredData(KZJobDataStruct* job, std::wstring* json);
     /// Compares referenceFile with sampleFile. *results may be null.
     int AnalyzeJob(KZJobDataStruct* job, analyseResultsRecord* results, std::wstring* json);
     /// A new measurement and its comparison.

@@ -1,25 +1,13 @@
 // The two steps that only a job to be measured takes: measuring it, and handing its result back.
 #include <cstdlib>
-#include <filesystem>
-#include <system_error>
 #include <utility>
 
 #include "ExitCodes.h"
 #include "cli/CLogger.h"
+#include "job/JobFiles.h"
 #include "job/KZVerifyJobProcessor.h"
 
 namespace {
-
-/// Whether there is a regular file of this name, logging where there is none.
-bool isThere(const wxString& path, const char* complaint) {
-    const std::string bytes = wstringToString(path.ToStdWstring());
-    std::error_code ignored;
-    const bool found = std::filesystem::is_regular_file(bytes, ignored);
-    if (!found) {
-        CLogger::GetLogger()->Log("%s file not found = %s", complaint, bytes.c_str());
-    }
-    return found;
-}
 
 template<class T>
 void freeArray(T*& values) {

@@ -14,13 +14,14 @@ bool isFolder(const char* path) {
     return stat(path, &status) == 0 && S_ISDIR(status.st_mode);
 }
 
-// Anybody may make names in /tmp, so what stands there is looked at without following a link.
-bool isOurOwnFolder(const char* path) {
-    struct stat status;
-    return lstat(path, &status) == 0 && S_ISDIR(status.st_mode) && status.st_uid == geteuid();
-}
-
 } // namespace
+
+bool haveOwnFolder(const std::string& path, unsigned mode) {
+    mkdir(path.c_str(), mode);
+    struct stat status;
+    return lstat(path.c_str(), &status) == 0 && S_ISDIR(status.st_mode) &&
+           status.st_uid == geteuid();
+}
 
 std::string temporaryFolder() {
     for (const char* variable : {"TMPDIR", "TMP", "TEMP"}) {
@@ -30,8 +31,7 @@ std::string temporaryFolder() {
         }
     }
     std::string path = "/tmp/tintgate-" + std::to_string(geteuid());
-    mkdir(path.c_str(), 0700);
-    if (!isOurOwnFolder(path.c_str())) {
+    if (!haveOwnFolder(path, 0700)) {
         return {};
     }
     setenv("TMPDIR", path.c_str(), 1);

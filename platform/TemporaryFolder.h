@@ -15,4 +15,8 @@ namespace platform {
 /// it: its command line is not quoted.
 std::string temporaryFolder();
 
+/// Makes a folder where it is missing; the umask applies. True if it is a folder of this user then,
+/// and no symbolic link: anybody may make names in a shared folder such as /tmp.
+bool haveOwnFolder(const std::string& path, unsigned mode);
+
 } // namespace platform

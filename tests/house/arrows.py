@@ -28,7 +28,7 @@ ARROWS = {
     "comm": "commrecords ticket text helper platform",
     "records": "",
     "jdf": "records",
-    "job": "comm jdf records log helper text libTintgate",
+    "job": "comm jdf records log helper text libTintgate platform",
     "Tintgate": "job log records platform libTintgate",
     "colour": "",
     "report": "colour",

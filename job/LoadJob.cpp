@@ -1,0 +1,285 @@
+// Loading a job: what its ticket says, and the files that it names.
+//
+// The steps are required in this order, and so is what becomes of their codes: most reads replace
+// the code of the one before, and the step of the JDF, which comes last, replaces them all. What a
+// failed step leaves out is found later, by whatever needs it.
+#include <algorithm>
+#include <cstdlib>
+#include <filesystem>
+#include <iterator>
+#include <system_error>
+
+#include <wx/filename.h>
+
+#include "ExitCodes.h"
+#include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "job/JobTicket.h"
+#include "job/KZVerifyJobProcessor.h"
+#include "job/StripKeys.h"
+#include "measure/ControlStripText.h"
+#include "measure/StripLookups.h"
+#include "ticket/ParameterTables.h"
+
+namespace {
+
+constexpr int presetIncomplete = 102; ///< Never leaves a load.
+constexpr int fileWait = 1000;        ///< Milliseconds that a preset or a JDF is waited for.
+
+template<class Values>
+bool isOneOf(const Values& values, int number) {
+    return std::find(std::begin(values), std::end(values), number) != std::end(values);
+}
+
+void makeJobFolder(JobLoad& load, const wxString& workingDir) {
+    KZJobDataStruct& job = *load.job;
+    job.tempDir = workingDir + wxString::Format("/JobID_%i", job.jobID);
+    load.ticket.read("Job/FromEsko", 0, &load.fromEsko);
+    std::error_code ignored;
+    std::filesystem::create_directories(measure::pathBytes(job.tempDir), ignored);
+    job.sampleFile = job.tempDir + "/Measured sample.txt";
+}
+
+/// The control strip is looked up whatever could be read before it.
+int loadControlStrip(JobLoad& load) {
+    KZJobDataStruct& job = *load.job;
+    int code = load.ticket.read("System/InstallFolder", &load.installFolder);
+    job.deviceID = 0;
+    load.ticket.read("Input/Title", &job.title);
+    if (code == 0) {
+        load.ticket.read("Footer/Dynstrip/UseDynstrip", 0, &job.useDynstrip);
+    }
+    code = lookUpControlStrip(load);
+    job.instrumentName = GetInstrumentNameFromID(static_cast<unsigned>(job.deviceID));
+    return code;
+}
+
+/// Of these reads only the workflow's depends on what came before: without a control strip the job
+/// has none. None of their failures stands.
+void readMeasurementKeys(JobLoad& load, int code) {
+    constexpr int devicesOfModeZero[] = {5, 11, 13, 15, 25};
+    KZJobDataStruct& job = *load.job;
+    if (code == 0) {
+        load.ticket.read(stripKey(load.strip, "Workflow/Verify/MeasurementWorkflow"), 0,
+                         &job.measurementWorkflow);
+    }
+    load.ticket.read(measurementKey(load.strip, "Illumination/Mode"), 1, &job.illuminationMode);
+    if (isOneOf(devicesOfModeZero, job.deviceID)) {
+        job.illuminationMode = 0;
+    }
+    load.ticket.read("CMM/PaperName", &job.paperName);
+    load.ticket.read("Workflow/Name", &job.workflowName);
+    load.ticket.read(measurementKey(load.strip, "Status"), 0, &job.measurementStatus);
+    load.ticket.read("Input/SubType", 0, &load.subType);
+    if (job.measurementWorkflow == 3 && job.measurementStatus > 0) {
+        int patches = 0;
+        load.ticket.read(measurementKey(load.strip, "Reference/Numpatches"), 0, &patches);
+        load.hasStoredReferences = patches >= 1;
+    }
+}
+
+/// How colours are compared, and under which preset.
+int readComparison(JobLoad& load) {
+    KZJobDataStruct& job = *load.job;
+    const int code = load.ticket.read(stripKey(load.strip, "Workflow/Verify/DeltaEMode"), 0,
+                                      &job.tolerance.deltaEMode);
+    return code != 0 ? code
+                     : load.ticket.read(stripKey(load.strip, "Workflow/Verify/ComparisonMethod"), 0,
+                                        &job.presetID);
+}
+
+/// The digits fill up to four.
+wxString presetFileName(int id) {
+    const char* zeros = id <= 9 ? "000" : id <= 99 ? "00" : id <= 999 ? "0" : "";
+    return wxString::Format("CVP_%s%i.xml", zeros, id);
+}
+
+/// Values of the preset's ticket. The first that is missing ends the row, by requirement without a
+/// consequence.
+void readPresetKeys(const JobTicket& ticket, tolerancePresetParameterRecord& tolerance) {
+    const struct {
+        const char* key;
+        int fallback;
+        int* value;
+    } keys[] = {
+        {"Editable", 0, &tolerance.editable},
+        {"ShowInClient", 0, &tolerance.showInClient},
+        {"UsedForDynamicWedge", 0, &tolerance.usedForDynamicWedge},
+        {"IlluminationCondition", -1, &tolerance.illuminationCondition},
+    };
+    for (const auto& [key, fallback, value] : keys) {
+        if (ticket.read(key, fallback, value) != 0) {
+            break;
+        }
+    }
+}
+
+/// Its file is fetched, and what its ticket says is read. Returns 0, or presetIncomplete for a
+/// preset without a name.
+int loadTolerance(JobLoad& load) {
+    KZJobDataStruct& job = *load.job;
+    tolerancePresetParameterRecord& tolerance = job.tolerance;
+    const JobTicket ticket(load.processor->m_connector, job.presetID, JobTicket::presetType);
+    tolerance.presetID = job.presetID;
+    ticket.read("Name", &tolerance.name);
+    if (tolerance.name.empty()) {
+        return presetIncomplete;
+    }
+    job.presetFile = presetFileName(job.presetID);
+    job.presetLocalFile = job.tempDir + "/" + job.presetFile;
+    fetchFile(load, load.installFolder + "/tickets/" + job.presetFile, fileWait,
+              &tolerance.filePath);
+    readPresetKeys(ticket, tolerance);
+    // By requirement the ticket's "FograPSDPreset" does not count and the arrays of the plain kind
+    // are read in any case: only the preset's file can make it one of the PSD kind.
+    tolerance.fograPSDPreset = 0;
+    ticket.readArray("Values/UsedForResult", presetValueCount, tolerance.usedForResult);
+    ticket.readArray("Values/Preset", presetValueCount, tolerance.presetValues);
+    ticket.readArray("Values/DecimalPlaces", presetValueCount, tolerance.decimalPlaces);
+    return 0;
+}
+
+/// The strip that a job shares with the others of its parent takes the place of its own.
+void loadNesting(JobLoad& load) {
+    KZJobDataStruct& job = *load.job;
+    load.ticket.read("General/ParentID", 0, &job.parentID);
+    job.nestedStrip = 0;
+    if (job.parentID <= 0) {
+        return;
+    }
+    int mode = 0;
+    load.ticket.read("Footer/Nesting/ControlstripMode", 0, &mode);
+    // Required: a job without this text keeps its own strip.
+    int code = load.ticket.read("Footer/Nesting/PSDAssessment", &job.psdAssessment);
+    if (mode == 1 && code == 0) {
+        wxString name;
+        code = load.ticket.read(stripKey(load.strip, "Footer/Nesting/ControlstripFile"), &name);
+        job.nestedStrip = code == 0 && fetchControlStrip(load, name, &job.controlStripFile) ? 1 : 0;
+    }
+    if (job.nestedStrip == 1) {
+        load.processor->GetChildJobIDsFromParent(&job);
+    }
+}
+
+void readInlineValues(JobLoad& load) {
+    KZJobDataStruct& job = *load.job;
+    job.inlineVerifyJob = 1;
+    if (load.ticket.read("Output/Prn/Specific/Measurement/VerifyMode", 0, &job.illuminationMode) !=
+        0) {
+        job.illuminationMode = -1;
+    }
+    // Missing values stay 0: -1 is for a server that refuses the read, which this one never does.
+    load.ticket.readArray(measurementKey(load.strip, "Values/Measured"), presetValueCount,
+                          job.measuredValues);
+}
+
+/// The type that the number of measurements gives.
+int typeFor(int measurements) {
+    constexpr int types[] = {0, 2, 3};
+    return types[std::clamp(measurements, 0, 2)];
+}
+
+void decideJobType(JobLoad& load) {
+    constexpr int verificationTypes[] = {80, 81, 86};
+    constexpr int outputType = 96;
+    KZJobDataStruct& job = *load.job;
+    const bool isInline = job.deviceID == 0 || (job.deviceID >= 40 && job.deviceID <= 47);
+
+    job.inlineVerifyJob = 0;
+    if (isOneOf(verificationTypes, load.subType) && job.jobType != 3) {
+        job.jobType = 1;
+    } else if (load.subType != outputType) {
+        job.jobType = typeFor(job.measurementStatus);
+    } else if (isInline) {
+        readInlineValues(load);
+        job.jobType = typeFor(std::max(job.measurementStatus, 1)); // Never one to be measured.
+    } else if (job.measurementStatus >= 0) { // Else it stays as the references left it.
+        job.jobType = typeFor(job.measurementStatus);
+    }
+}
+
+int fetchJdf(JobLoad& load) {
+    KZJobDataStruct& job = *load.job;
+    const int code = load.processor->GetJobJDFFileName(&job);
+    if (code != 0 || load.fromEsko != 0) {
+        return code;
+    }
+    const wxString path = wxFileName(job.jdfServerFile).GetFullPath();
+    if (fetchFile(load, path, fileWait, &job.jdfLocalFile)) {
+        return 0;
+    }
+    job.jdfServerFile.clear();
+    job.jdfLocalFile.clear();
+    return exitJdfMissing;
+}
+
+} // namespace
+
+int KZVerifyJobProcessor::LoadKZJobData(int jobID, KZJobDataStruct* job) {
+    job->childJobIDs = nullptr;
+    job->jobID = jobID;
+    job->jobType = 0;
+    JobLoad load{.processor = this,
+                 .job = job,
+                 .ticket = JobTicket(m_connector, jobID),
+                 .strip = stripOf(job->secondStrip)};
+    makeJobFolder(load, m_workingDir);
+    readMeasurementKeys(load, loadControlStrip(load));
+    int code = lookUpReferences(load);
+    if (code == 0) {
+        code = readComparison(load);
+    }
+    if (code == 0) {
+        code = loadTolerance(load);
+    }
+    if (code == 0) {
+        loadNesting(load);
+        decideJobType(load);
+    }
+    return fetchJdf(load);
+}
+
+void KZVerifyJobProcessor::GetChildJobIDsFromParent(KZJobDataStruct* job) {
+    job->childJobCount = 0;
+    int* listed = nullptr;
+    int count = 0;
+    const int code = m_connector->GetVerifierJobTicketIDs(&listed, &count, false);
+    const ticket::Block<int> ids(listed);
+    if (code != 0 || ids == nullptr || count < 1) {
+        return;
+    }
+    job->childJobIDs =
+        static_cast<int*>(std::malloc(static_cast<std::size_t>(count) * sizeof(int)));
+    if (job->childJobIDs == nullptr) {
+        return;
+    }
+    for (int i = 0; i < count; ++i) {
+        int parent = 0;
+        if (JobTicket(m_connector, ids[i]).read("General/ParentID", 0, &parent) == 0 &&
+            parent == job->parentID) {
+            job->childJobIDs[job->childJobCount++] = ids[i];
+        }
+    }
+}
+
+// Only jobs that the server calls verifications (type 1) name the whole path.
+int KZVerifyJobProcessor::GetJobJDFFileName(KZJobDataStruct* job) {
+    const JobTicket ticket(m_connector, job->jobID);
+    wxString name;
+    job->jdfServerFile.clear();
+    int code = ticket.read("Output/Jdf/FileName", &name);
+    if (code != 0) {
+        return code;
+    }
+    if (job->jobType == 0 || job->jobType == 2 || job->jobType == 3) {
+        wxString folder;
+        code = ticket.read("System/Folders/Temp", &folder);
+        if (folder.empty()) {
+            code = ticket.read("Workflow/RemoteOutFolder", &folder);
+        }
+        if (!folder.empty()) {
+            job->jdfServerFile = folder + "/" + name;
+        }
+        return code;
+    }
+    return ticket.read("Remote/JDFName", &job->jdfServerFile);
+}

@@ -1,0 +1,222 @@
+// The way of a job from its arguments to its result code.
+#include <algorithm>
+#include <chrono>
+#include <iterator>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <thread>
+
+#include "ExitCodes.h"
+#include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "cli/CLogger.h"
+#include "job/JobFiles.h"
+#include "job/KZVerifyJobProcessor.h"
+#include "job/StripKeys.h"
+#include "measure/ControlStripText.h"
+#include "measure/Helper.h"
+#include "ticket/ParameterTables.h"
+
+namespace {
+
+using std::chrono::steady_clock;
+
+constexpr int applicationID = 0x5071103;
+
+/// Nothing where the text is no whole number or beyond what an int holds.
+std::optional<int> numberOf(const std::wstring& text) {
+    try {
+        return std::stoi(text);
+    } catch (const std::logic_error&) {
+        return std::nullopt;
+    }
+}
+
+/// Bytes that were widened one by one become text again.
+wxString textOf(const std::wstring& text) {
+    return stringToWstring(wstringToString(text));
+}
+
+/// Result of a login, by the connector's code.
+int loginFailure(int code) {
+    switch (code) {
+    case -2005:
+        return exitLoginNoServer;
+    case -2030:
+        return exitLoginDisabled;
+    case -2031:
+        return exitLoginServerNewer;
+    case -2033:
+        return exitLoginServerOlder;
+    default:
+        return exitLoginRefused;
+    }
+}
+
+/// How long a job waits for its server: a third of the time that the login took.
+std::chrono::milliseconds pauseAfter(steady_clock::duration login) {
+    constexpr double longest = 5000.0;
+    const double pause = std::chrono::duration<double>(login).count() * 1000.0 / 3.0;
+    return std::chrono::milliseconds(static_cast<int>(std::min(pause, longest)));
+}
+
+/// Whether the ticket holds what is to be shown; else the job is measured.
+bool isMeasured(const KZJobDataStruct& job) {
+    constexpr int inlineDevices[] = {40, 45, 46, 47};
+    return job.jobType == 2 || job.jobType == 3 ||
+           (job.secondStrip == 1 &&
+            std::count(std::begin(inlineDevices), std::end(inlineDevices), job.deviceID) != 0);
+}
+
+/// Writes a file for the viewer, logging where that fails.
+bool writeForViewer(const wxString& path, const std::wstring& text, const char* complaint) {
+    const std::string bytes = measure::pathBytes(path);
+    const bool written = writeTextFile(bytes, text) && fileExists(path);
+    if (!written) {
+        CLogger::GetLogger()->Log("Resulting %s file not found = %s", complaint, bytes.c_str());
+    }
+    return written;
+}
+
+/// The viewer is ended first where one runs.
+int showResult(KZJobDataStruct& job, const std::wstring& json) {
+    if (!writeForViewer(job.tempDir + "/output.json", json, "json")) {
+        return exitResultNotWritten;
+    }
+    const wxString meta = job.tempDir + "/meta.json";
+    if (!writeForViewer(meta, getJsonMetaFileString(&job), "json meta")) {
+        return exitMetaNotWritten;
+    }
+    CLogger::GetLogger()->Log("LaunchNerovaVerify");
+    int result = exitDone;
+    if (!Helper::LaunchNerovaVerify(result, false, " -detail -meta " + meta, true)) {
+        CLogger::GetLogger()->Log("Nerova Verify.exe allready running");
+        return exitViewerRunning;
+    }
+    return result;
+}
+
+} // namespace
+
+// By requirement a job id that is no number ends the process by an uncaught exception.
+int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std::wstring password,
+                                      std::wstring jobID, std::wstring strip, std::wstring language,
+                                      bool remeasure) {
+    if (jobID.empty()) {
+        return exitWrongArguments;
+    }
+    const int id = std::stoi(jobID);
+    if (id == -1) {
+        int result = exitDone;
+        Helper::LaunchNerovaVerify(result, false, wxString(), true);
+        return result;
+    }
+    const std::optional<int> stripNumber = numberOf(strip);
+    if (host.empty() || user.empty() || !stripNumber) {
+        return exitWrongArguments;
+    }
+
+    const auto start = steady_clock::now();
+    m_connector = ConnectToKZWithLoginCredentials(host, user, password, applicationID, true);
+    const auto pause = pauseAfter(steady_clock::now() - start);
+    const std::string server = wstringToString(host);
+    if (m_connector == nullptr) {
+        const int result = loginFailure(m_lastRetCode);
+        CLogger::GetLogger()->Log("Not able to connect to = %s last ComGui error = %d",
+                                  server.c_str(), result);
+        return result;
+    }
+
+    KZJobDataStruct job;
+    std::wstring address;
+    std::wstring name;
+    job.jobID = id;
+    job.secondStrip = *stripNumber;
+    job.language = language;
+    m_connector->GetServerInfo(&address, &name);
+    job.serverName = textOf(name);
+    job.serverHost = textOf(host);
+    job.userName = textOf(user);
+    job.password = textOf(password);
+    CLogger::GetLogger()->Log("Logged in to = %s", server.c_str());
+    if (!IsListed(id, remeasure)) {
+        return exitJobNotListed;
+    }
+
+    CLogger::GetLogger()->Log("Veryfing Job ID = %s", wstringToString(jobID).c_str());
+    int result = LoadKZJobData(id, &job);
+    const ticket::Block<int> children(job.childJobIDs);
+    // wxMilliSleep would end at the signal of any child that ends.
+    std::this_thread::sleep_for(pause);
+    CLogger::GetLogger()->Log("LoadKZJobData returns = %d", result);
+    if (result == exitDone) {
+        result = VerifyLoadedJob(&job, remeasure);
+    }
+    CLogger::GetLogger()->Log("Overall result = %d", result);
+    return result;
+}
+
+bool KZVerifyJobProcessor::IsListed(int jobID, bool remeasure) {
+    int* listed = nullptr;
+    int count = 0;
+    const int code = m_connector->GetVerifierJobTicketIDs(&listed, &count, remeasure);
+    const ticket::Block<int> ids(listed);
+    return code == 0 && ids != nullptr &&
+           std::find(listed, listed + count, jobID) != listed + count;
+}
+
+int KZVerifyJobProcessor::VerifyLoadedJob(KZJobDataStruct* job, bool remeasure) {
+    int result =
+        parsePresetParameterXMLFile(job->tolerance.filePath.ToStdWstring(), &job->tolerance, true);
+    result = result == 0 ? exitDone : exitPresetFailed;
+    CLogger::GetLogger()->Log("parsePresetParameterXMLFile returns = %d", result);
+    if (result != exitDone) {
+        return result;
+    }
+    CLogger::GetLogger()->Log("m_jobType is = %d", job->jobType);
+    std::wstring json;
+    if (!remeasure && isMeasured(*job)) {
+        result = CompareStoredData(job, &json);
+        FreeMeasurementData(*job);
+    } else {
+        analyseResultsRecord results;
+        result = MeasureJob(job, &results, &json);
+        if (result == exitDone) {
+            WriteBackResults(job->jobID, *job, results, remeasure);
+        } else {
+            FreeMeasurementData(*job);
+        }
+    }
+    // The arrays of the job's measurement are gone from here on.
+    return result == exitDone ? showResult(*job, json) : result;
+}
+
+// A missing reference file is logged and does not end this road: the analysis says what is wrong.
+int KZVerifyJobProcessor::CompareStoredData(KZJobDataStruct* job, std::wstring* json) {
+    CLogger::GetLogger()->Log("Comparing existing data");
+    const int loaded = LoadKZJobMeasurements(job);
+    CLogger::GetLogger()->Log("LoadKZJobMeasurements returns = %d", loaded);
+    if (loaded != 0) {
+        return exitStoredDataFailed;
+    }
+    isThere(job->referenceFile, "Reference");
+    if (WriteTemporarySampleFile(*job, false) != 0) {
+        CLogger::GetLogger()->Log("Measurement file not found = %s",
+                                  measure::pathBytes(job->sampleFile).c_str());
+        return exitSampleMissing;
+    }
+    return isThere(job->sampleFile, "Measurement") ? AnalyzeJob(job, nullptr, json)
+                                                   : exitSampleMissing;
+}
+
+int KZVerifyJobProcessor::AnalyzeJob(KZJobDataStruct* job, analyseResultsRecord* results,
+                                     std::wstring* json) {
+    CLogger::GetLogger()->Log("Reference file = %s",
+                              measure::pathBytes(job->referenceFile).c_str());
+    CLogger::GetLogger()->Log("Measurement file = %s", measure::pathBytes(job->sampleFile).c_str());
+    const int result =
+        analyzeMeasurements(job->referenceFile.ToStdWstring(), job->sampleFile.ToStdWstring(),
+                            std::wstring(), job->tolerance, results, json, job);
+    CLogger::GetLogger()->Log("analyzeMeasurements returns = %d", result);
+    return result;
+}

@@ -1,0 +1,205 @@
+#include "measure/StripLookups.h"
+
+#include <iterator>
+#include <string>
+
+#include <wx/filename.h>
+
+#include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "cli/CLogger.h"
+#include "job/JobFiles.h"
+#include "measure/ControlStripText.h"
+
+namespace {
+
+// Milliseconds that a file is waited for.
+constexpr int usualWait = 1000;
+constexpr int definitionWait = 200;
+constexpr int dynstripWait = 500;
+constexpr int profileWait = 5000;
+
+/// The path as wxFileName writes it, with doubled slashes as one. Nothing is looked up.
+wxString normalised(const wxString& path) {
+    return wxFileName(path).GetFullPath();
+}
+
+wxString inControlCharts(const JobLoad& load, const wxString& name) {
+    return load.installFolder + "/ControlCharts/" + wxFileName(name).GetName() + ".it8";
+}
+
+bool isDynamic(const JobLoad& load) {
+    return load.job->useDynstrip == 1 && load.strip == Strip::first;
+}
+
+/// The definition that the server made of a dynamic strip lies beside the strip, and takes the name
+/// that a definition of ours would have. It need not be there.
+void fetchDynamicDefinition(const JobLoad& load, wxString stripServerPath) {
+    stripServerPath.Replace(".it8", ".dcf");
+    load.processor->m_connector->DownloadFile(load.job->tempDir + "/NMPatchSetDefinition.dcf",
+                                              stripServerPath, definitionWait);
+}
+
+int lookUpDynamicStrip(const JobLoad& load) {
+    wxString path;
+    int code = load.ticket.read("Footer/Dynstrip/DeviceID", 0, &load.job->deviceID);
+    if (code == 0) {
+        code = load.ticket.read("Footer/Dynstrip/IT8", &path);
+    }
+    if (code != 0) {
+        return code;
+    }
+    path = normalised(path);
+    if (fetchFile(load, path, usualWait, &load.job->controlStripFile)) {
+        fetchDynamicDefinition(load, path);
+    }
+    code = load.ticket.read("Footer/Dynstrip/File", &path);
+    if (code == 0) {
+        fetchFile(load, path, dynstripWait, &load.job->dynstripFile);
+    }
+    return code;
+}
+
+int lookUpFixedStrip(const JobLoad& load) {
+    constexpr std::size_t shortestName = 4; // In bytes.
+    std::string name;
+    int code = load.ticket.read(stripKey(load.strip, "Footer/ControlstripFile"), &name);
+    if (code != 0 || name.size() < shortestName) {
+        code = load.ticket.read(stripKey(load.strip, "Footer/Nesting/ControlstripFile"), &name);
+    }
+    KZJobDataStruct& job = *load.job;
+    if (code == 0 && fetchControlStrip(load, wxString::FromUTF8(name), &job.controlStripFile)) {
+        load.processor->GetDeviceIDFromIt8ControlStripFileEx(job.controlStripFile, &job.deviceID);
+    }
+    return code;
+}
+
+/// A job of a packaging workflow: characterisation data, else the values of its strip. The last
+/// read alone decides: where it finds a strip, references that were not found are no failure.
+int lookUpEskoReferences(const JobLoad& load) {
+    wxString path;
+    if (load.ticket.read("Workflow/Verify/CharacterizationData", &path) != 0) {
+        wxString name;
+        if (load.ticket.read("Footer/ControlstripFile", &name) == 0) {
+            path = inControlCharts(load, name);
+        }
+    }
+    if (!path.empty()) {
+        fetchFile(load, path, usualWait, &load.job->referenceFile);
+    }
+    if (load.ticket.read("Footer/ControlstripIT8", &path) != 0 || path.empty()) {
+        return noReference;
+    }
+    fetchFile(load, path, usualWait, &load.job->controlStripFile);
+    return 0;
+}
+
+int lookUpProfile(const JobLoad& load) {
+    if (load.job->measurementStatus > 0) {
+        load.job->jobType = 3;
+    }
+    wxString path;
+    load.ticket.read(stripKey(load.strip, "Footer/ControlstripInputProfile"), &path);
+    if (path.empty()) {
+        load.ticket.read("Remote/UsedICCProfile", &path);
+    }
+    if (path.empty()) {
+        return noReference;
+    }
+    fetchFile(load, path, profileWait, &load.job->referenceFile);
+    return 0;
+}
+
+/// The values of the strip itself.
+int takeStripAsReference(const JobLoad& load) {
+    load.job->referenceFile = load.job->controlStripFile;
+    return 0;
+}
+
+/// The first mark that the value contains tells the server's folder.
+wxString characterisationPath(const JobLoad& load, const wxString& value) {
+    if (value.Contains("(TEMP)/")) {
+        return normalised(value);
+    }
+    const wxString folder = load.installFolder + "/IT8_CharacterizationData/";
+    for (const char* version : {"MKCheck10", "MKCheck11"}) {
+        if (value.Contains(version)) {
+            return folder + "Fogra_" + version + "/" + value;
+        }
+    }
+    return folder + value;
+}
+
+int lookUpCharacterisation(const JobLoad& load) {
+    wxString value;
+    load.ticket.read(stripKey(load.strip, "Workflow/Verify/CharacterizationData"), &value);
+    if (value.empty()) {
+        return noReference;
+    }
+    fetchFile(load, characterisationPath(load, value), usualWait, &load.job->referenceFile);
+    return 0;
+}
+
+int takeStoredReferences(const JobLoad& load) {
+    KZJobDataStruct& job = *load.job;
+    job.jobType = job.measurementStatus > 1 ? 3 : 2;
+    job.referenceFile = job.tempDir + "/Measured reference.txt";
+    const int code = load.processor->LoadKZJobReferences(&job);
+    CLogger::GetLogger()->Log("LoadKZJobReferences returns = %d", code);
+    if (code != 0) {
+        return referencesNotLoaded;
+    }
+    if (load.processor->WriteTemporarySampleFile(job, true) != 0 ||
+        !fileExists(job.referenceFile)) {
+        // By requirement the line names the other file.
+        CLogger::GetLogger()->Log("Temporary Reference file not found = %s",
+                                  measure::pathBytes(job.sampleFile).c_str());
+        return noReference;
+    }
+    return 0;
+}
+
+/// The ways to a job's references: the first whose condition holds is taken.
+constexpr struct {
+    bool (*isMeant)(const JobLoad&);
+    int (*lookUp)(const JobLoad&);
+} referenceWays[] = {
+    {[](const JobLoad& load) { return load.fromEsko == 1 && load.job->measurementWorkflow == 4; },
+     lookUpEskoReferences},
+    {[](const JobLoad& load) { return load.job->measurementWorkflow == 1; }, lookUpProfile},
+    {[](const JobLoad& load) {
+         return load.job->measurementWorkflow == 3 && !load.hasStoredReferences;
+     },
+     lookUpProfile},
+    {isDynamic, takeStripAsReference},
+    {[](const JobLoad& load) { return load.job->measurementWorkflow == 2; },
+     lookUpCharacterisation},
+    {[](const JobLoad& load) { return load.job->measurementWorkflow == 3; }, takeStoredReferences},
+};
+
+} // namespace
+
+bool fetchFile(const JobLoad& load, const wxString& serverPath, int limit, wxString* localFile) {
+    const wxString local = load.job->tempDir + "/" + wxFileName(serverPath).GetFullName();
+    const bool came = load.processor->m_connector->DownloadFile(local, serverPath, limit);
+    if (came) {
+        *localFile = local;
+    }
+    return came;
+}
+
+bool fetchControlStrip(const JobLoad& load, const wxString& name, wxString* localFile) {
+    return fetchFile(load, inControlCharts(load, name), usualWait, localFile);
+}
+
+int lookUpControlStrip(const JobLoad& load) {
+    return isDynamic(load) ? lookUpDynamicStrip(load) : lookUpFixedStrip(load);
+}
+
+int lookUpReferences(const JobLoad& load) {
+    for (const auto& way : referenceWays) {
+        if (way.isMeant(load)) {
+            return way.lookUp(load);
+        }
+    }
+    return noReference;
+}
