@@ -22,6 +22,10 @@ pkg_check_modules(sqlite3 REQUIRED IMPORTED_TARGET sqlite3)
 pkg_check_modules(libsodium REQUIRED IMPORTED_TARGET libsodium)
 pkg_check_modules(expat REQUIRED IMPORTED_TARGET expat)
 pkg_check_modules(libmd REQUIRED IMPORTED_TARGET libmd)
+# The store's plug-in loads libpq itself, when it is needed: only the headers are for building.
+pkg_check_modules(libpq REQUIRED IMPORTED_TARGET libpq)
+add_library(libpqheaders INTERFACE)
+target_include_directories(libpqheaders SYSTEM INTERFACE ${libpq_INCLUDE_DIRS})
 find_package(pugixml REQUIRED)
 find_package(nlohmann_json REQUIRED)
 

@@ -66,6 +66,8 @@ set(CPACK_DEBIAN_TINTGATE_PACKAGE_SECTION graphics)
 file(STRINGS "${ICU_INCLUDE_DIR}/unicode/uvernum.h" _icu REGEX "^#define U_ICU_VERSION_SHORT ")
 string(REGEX MATCH "[0-9]+" _icu "${_icu}")
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_DEPENDS "libtintgate1 (>= ${PROJECT_VERSION}), libicu${_icu}")
+# So is libpq, by those whose store is on a server.
+set(CPACK_DEBIAN_TINTGATE_PACKAGE_RECOMMENDS "libpq5 (>= 14)")
 set(CPACK_DEBIAN_TINTGATE_DESCRIPTION "verifies the colour of print jobs
 Compares the colours of a proof, a print or a printing condition with their
 targets under a tolerance preset, and says in a JSON file whether they pass.

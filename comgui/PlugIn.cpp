@@ -199,7 +199,7 @@ std::int32_t isAlive(void* instance, const char* host, int) {
         }
         for (const auto& [handle, session] : known->sessions) {
             if (session->address() == host) {
-                return codeDone;
+                return session->alive() ? codeDone : codeNoStore;
             }
         }
         openForLogin(host);

@@ -18,15 +18,14 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "comgui/ServerPath.h"
+
 namespace store {
 
 namespace {
 
-constexpr std::string_view ownPrefix = ".tintgate-";
 constexpr std::string_view deliveryPrefix = ".tintgate-new-";
 constexpr const char* versionsFolder = ".tintgate-versions";
-constexpr std::size_t longestPath = 2'048;
-constexpr std::size_t longestPart = 255;
 constexpr std::size_t blockSize = 1 << 16;
 
 [[noreturn]] void fail(int error, const std::string& what) {
@@ -55,38 +54,10 @@ constexpr std::size_t blockSize = 1 << 16;
     }
 }
 
-/// A server path as a message shows it: short, and without what would upset a terminal.
-std::string shown(std::string_view path) {
-    std::string text(path.substr(0, 100));
-    std::replace_if(
-        text.begin(), text.end(), [](unsigned char c) { return c < 0x20 || c == 0x7F; }, '?');
-    return "server path \"" + text + (path.size() > 100 ? "..." : "") + "\"";
-}
-
 /// The folders and the name that a server path consists of.
 class Place {
   public:
-    explicit Place(std::string_view path) {
-        if (path.size() > longestPath || path.find('\0') != std::string_view::npos ||
-            path.empty() || path.back() == '/') {
-            refuse(path);
-        }
-        for (std::size_t start = 0; start < path.size();) {
-            const std::size_t end = std::min(path.find('/', start), path.size());
-            const std::string_view part = path.substr(start, end - start);
-            start = end + 1;
-            if (part.empty() || part == ".") {
-                continue;
-            }
-            if (part == ".." || part.size() > longestPart || part.starts_with(ownPrefix)) {
-                refuse(path);
-            }
-            m_parts.emplace_back(part);
-        }
-        if (m_parts.empty()) {
-            refuse(path);
-        }
-    }
+    explicit Place(std::string_view path) : m_parts(partsOfServerPath(path)) {}
 
     std::vector<std::string> folders() const { return {m_parts.begin(), m_parts.end() - 1}; }
     const std::string& name() const { return m_parts.back(); }
@@ -98,19 +69,9 @@ class Place {
         return folders;
     }
 
-    std::string text() const {
-        std::string text;
-        for (const auto& part : m_parts) {
-            text += (text.empty() ? "" : "/") + part;
-        }
-        return shown(text);
-    }
+    std::string text() const { return shownServerPath(joinedParts(m_parts, m_parts.size())); }
 
   private:
-    [[noreturn]] static void refuse(std::string_view path) {
-        throw StoreFailure(Fault::BadPath, shown(path) + " names no file of the store");
-    }
-
     std::vector<std::string> m_parts;
 };
 
@@ -238,6 +199,16 @@ void copyOut(const Descriptor& file, std::ostream& to, const std::string& what) 
 /// Takes the next bytes; 0 at the end.
 using Source = std::function<std::size_t(char* block, std::size_t size)>;
 
+Source sourceOf(std::istream& from, const Place& place) {
+    return [&from, &place](char* block, std::size_t size) {
+        from.read(block, static_cast<std::streamsize>(size));
+        if (from.bad()) {
+            throw StoreFailure(Fault::Other, place.text() + ": the source can't be read");
+        }
+        return static_cast<std::size_t>(from.gcount());
+    };
+}
+
 /// A file that is being written under a name of its own; gone again unless it is put in place. It
 /// holds a lock on itself, which tells it from what an interrupted delivery left.
 class Delivery {
@@ -269,6 +240,13 @@ class Delivery {
             writeAll(m_file, block.data(), count, m_what);
         }
         flush(m_file, m_what);
+    }
+
+    void setTime(std::int64_t seconds) {
+        const timespec times[2] = {{0, UTIME_OMIT}, {static_cast<time_t>(seconds), 0}};
+        if (futimens(m_file.get(), times) != 0) {
+            fail(errno, m_what);
+        }
     }
 
     void putInPlace(const std::string& name) {
@@ -437,13 +415,7 @@ ServerFiles::ServerFiles(const std::string& storeFolder, bool create) {
 
 void ServerFiles::put(std::string_view path, std::istream& from) {
     const Place place(path);
-    deliver(m_files, place, [&](char* block, std::size_t size) {
-        from.read(block, static_cast<std::streamsize>(size));
-        if (from.bad()) {
-            throw StoreFailure(Fault::Other, place.text() + ": the source can't be read");
-        }
-        return static_cast<std::size_t>(from.gcount());
-    });
+    deliver(m_files, place, sourceOf(from, place));
 }
 
 void ServerFiles::get(std::string_view path, std::ostream& to) {
@@ -551,6 +523,19 @@ int ServerFiles::removeLeftovers() {
                  }
              });
     return removed;
+}
+
+void ServerFiles::placeVersion(std::string_view path, const FileVersion& version,
+                               std::istream& from) {
+    const Place place(path);
+    const std::string what = place.text();
+    const bool current = version.number == 0;
+    const Descriptor folder =
+        walk(m_files, current ? place.folders() : place.versions(), true, what);
+    Delivery delivery(folder, what);
+    delivery.fill(sourceOf(from, place));
+    delivery.setTime(version.time);
+    delivery.putInPlace(current ? place.name() : versionName(version.number));
 }
 
 } // namespace store

@@ -53,6 +53,7 @@ class ServerFiles {
     void restoreVersion(std::string_view path, int number);
     int pruneVersions(std::string_view path, int keepNewest);
     int removeLeftovers();
+    void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
 
   private:
     Descriptor m_files;

@@ -28,8 +28,8 @@ enum Code : std::int32_t {
 
 Code codeOf(const StoreFailure& failure);
 
-/// Opens the store at a server address: a path of at most 127 bytes. Client programs pass a path
-/// one byte a character, so that what is no path as it stands is tried as Latin-1.
+/// Opens the store at a server address, which has at most 127 bytes. Client programs pass it one
+/// byte a character, so that what leads nowhere as it stands is tried as Latin-1.
 std::unique_ptr<StoreEngine> openStoreAt(const std::string& address);
 
 class Session {
@@ -37,6 +37,7 @@ class Session {
     Session(std::string address, std::unique_ptr<StoreEngine> engine);
 
     const std::string& address() const { return m_address; }
+    bool alive() const { return m_engine->alive(); }
     const MTICKET_ACCESS* container() const { return m_container.access(); }
 
     // As the slots of these names, with what came from outside checked for null.

@@ -14,12 +14,14 @@
 #include <filesystem>
 #include <utility>
 
+#include <fcntl.h>
+#include <sys/file.h>
 #include <sys/stat.h>
 
+#include "comgui/Engines.h"
 #include "comgui/KeyBytes.h"
 #include "comgui/ServerFiles.h"
 #include "comgui/Sqlite.h"
-#include "comgui/StoreEngine.h"
 #include "comgui/WalWatch.h"
 
 namespace store {
@@ -30,9 +32,9 @@ using sqlite::Database;
 using sqlite::Statement;
 using sqlite::Transaction;
 
-constexpr std::int64_t applicationId = 0x54474154; // "TGAT", as file(1) can show it.
+constexpr std::int64_t applicationId = 0x54474154;    // "TGAT", as file(1) can show it.
+constexpr std::int64_t unfinishedCopyId = 0x54474143; // "TGAC"
 constexpr std::int64_t format = 1;
-constexpr int highestId = 0xFFFFFF;
 
 constexpr const char* tables = R"(
     CREATE TABLE tickets (
@@ -73,8 +75,8 @@ std::string realPath(const std::string& address) {
     return path.get();
 }
 
-/// The database in a store's folder, whatever its format.
-Database openDatabase(const std::string& folder) {
+/// The database in a store's folder, whatever its format, if it is of this kind.
+Database openDatabase(const std::string& folder, std::int64_t kind = applicationId) {
     const std::string path = databasePath(folder);
     struct stat status;
     if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode)) {
@@ -84,8 +86,12 @@ Database openDatabase(const std::string& folder) {
     if (sqlite3_db_readonly(database.get(), "main") == 1) {
         throw StoreFailure(Fault::ReadOnly, path + " can't be written");
     }
-    if (database.number("PRAGMA application_id") != applicationId) {
-        throw StoreFailure(Fault::Missing, path + " is no database of a store");
+    const std::int64_t found = database.number("PRAGMA application_id");
+    if (found != kind) {
+        throw StoreFailure(Fault::Missing,
+                           found == unfinishedCopyId
+                               ? folder + " is a copy of a store that was not finished"
+                               : path + " is no database of a store");
     }
     // What is in the file is data, and never to be run.
     database.run("PRAGMA trusted_schema = OFF");
@@ -93,20 +99,21 @@ Database openDatabase(const std::string& folder) {
 }
 
 void checkFormat(Database& database) {
-    const std::int64_t found = database.number("PRAGMA user_version");
-    if (found != format) {
-        throw StoreFailure(found > format ? Fault::Newer : Fault::Older,
-                           "the store has format " + std::to_string(found) + ", not " +
-                               std::to_string(format));
-    }
+    store::checkFormat(database.number("PRAGMA user_version"), format);
+}
+
+void setKind(Database& database, std::int64_t kind) {
+    database.run(("PRAGMA application_id = " + std::to_string(kind)).c_str());
 }
 
 class SqliteEngine : public StoreEngine {
   public:
-    explicit SqliteEngine(const std::string& folder)
-        : m_database(openDatabase(folder)), m_ready(m_database), m_files(folder, false) {}
+    explicit SqliteEngine(const std::string& folder, std::int64_t kind = applicationId)
+        : m_database(openDatabase(folder, kind)), m_ready(m_database), m_files(folder, false) {}
 
-    std::uint64_t commits() override { return m_watch.commits(); }
+    bool alive() override { return true; }
+
+    std::uint64_t commits(std::chrono::milliseconds) override { return m_watch.commits(); }
 
     std::vector<int> ids(int type) override {
         std::vector<int> ids;
@@ -133,21 +140,21 @@ class SqliteEngine : public StoreEngine {
 
     int createNext(int type) override {
         Transaction transaction(m_database);
-        std::int64_t id = 1;
+        int id = 1;
         {
             auto run = m_highest.run(type);
             if (run.step()) {
-                id = run.number(0) + 1;
+                id = static_cast<int>(run.number(0)) + 1;
             }
         }
-        if (id > highestId) {
-            id = lowestFree(type);
+        if (id > highestTicketId) {
+            id = lowestFree(ids(type));
         }
-        if (id > highestId || !insert(type, static_cast<int>(id))) {
+        if (id > highestTicketId || !insert(type, id)) {
             return -1;
         }
         transaction.commit();
-        return static_cast<int>(id);
+        return id;
     }
 
     bool remove(int type, int id) override {
@@ -289,6 +296,26 @@ class SqliteEngine : public StoreEngine {
     }
     int removeLeftovers() override { return m_files.removeLeftovers(); }
 
+    std::map<int, int> highestIds() override {
+        Statement statement(m_database, "SELECT type, id FROM highest_ids");
+        auto run = statement.run();
+        std::map<int, int> ids;
+        while (run.step()) {
+            ids.emplace(run.number(0), run.number(1));
+        }
+        return ids;
+    }
+    void raiseHighestId(int type, int id) override {
+        Transaction transaction(m_database);
+        m_raiseHighest.run(type, id).finish();
+        transaction.commit();
+    }
+    void placeVersion(std::string_view path, const FileVersion& version,
+                      std::istream& from) override {
+        m_files.placeVersion(path, version, from);
+    }
+    void finishCopy() override { setKind(m_database, applicationId); }
+
   private:
     /// Settles the connection before a statement is prepared.
     struct Ready {
@@ -298,14 +325,6 @@ class SqliteEngine : public StoreEngine {
         }
     };
 
-    static std::shared_ptr<Elements> decoded(std::string_view bytes) {
-        auto elements = elementsFromBytes(bytes);
-        if (elements == nullptr) {
-            throw StoreFailure(Fault::Damaged, "a key of the store can't be read");
-        }
-        return elements;
-    }
-
     bool insert(int type, int id) {
         m_insert.run(type, id).finish();
         if (sqlite3_changes(m_database.get()) == 0) {
@@ -313,15 +332,6 @@ class SqliteEngine : public StoreEngine {
         }
         m_raiseHighest.run(type, id).finish();
         return true;
-    }
-
-    std::int64_t lowestFree(int type) {
-        std::int64_t free = 1;
-        auto run = m_ids.run(type);
-        while (run.step() && run.number(0) <= free) {
-            free = std::max(free, run.number(0) + 1);
-        }
-        return free;
     }
 
     /// False when there was nothing to write.
@@ -388,19 +398,13 @@ class SqliteEngine : public StoreEngine {
     Statement m_removeUser{m_database, "DELETE FROM users WHERE name = ?"};
 };
 
-/// What every client asks a server for; below version 5 they log out again.
 void makeSystemTicket(Database& database, const std::string& serverName) {
-    constexpr int majorVersion = 5;
+    database.run("INSERT INTO tickets (type, id) VALUES (0, 0)");
     Statement insert(database, "INSERT INTO keys (ticket, name, value)"
                                " SELECT number, ?, ? FROM tickets WHERE type = 0 AND id = 0");
-    const auto put = [&](const char* name, Value value) {
-        Elements elements;
-        elements.put(0, std::move(value));
-        insert.run(name, keyBytes(elements)).finish();
-    };
-    database.run("INSERT INTO tickets (type, id) VALUES (0, 0)");
-    put("System/Product/MajorVersion", majorVersion);
-    put("System/ServerName", Text{std::make_shared<Bytes>(serverName)});
+    for (const auto& [name, value] : systemKeys(serverName)) {
+        insert.run(name, value).finish();
+    }
 }
 
 void makeEmptyFolder(const std::string& address) {
@@ -419,13 +423,8 @@ void makeEmptyFolder(const std::string& address) {
                        address + ": " + std::strerror(error));
 }
 
-} // namespace
-
-std::unique_ptr<StoreEngine> openStore(const std::string& address) {
-    return std::make_unique<SqliteEngine>(realPath(address));
-}
-
-void makeStore(const std::string& address, const std::string& serverName) {
+/// Without a server's name there is nothing in it.
+void makeSqlite(const std::string& address, const std::string* serverName, std::int64_t kind) {
     makeEmptyFolder(address);
     const std::string folder = realPath(address);
     const ServerFiles files(folder, true);
@@ -437,25 +436,66 @@ void makeStore(const std::string& address, const std::string& serverName) {
     database.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = FULL");
     Transaction transaction(database);
     database.run(tables);
-    makeSystemTicket(database, serverName);
+    if (serverName != nullptr) {
+        makeSystemTicket(database, *serverName);
+    }
     database.run(("PRAGMA user_version = " + std::to_string(format)).c_str());
     // Without it a database is no store, so one that was not made to its end is none.
-    database.run(("PRAGMA application_id = " + std::to_string(applicationId)).c_str());
+    setKind(database, kind);
     transaction.commit();
 }
 
-bool bringStoreUpToDate(const std::string& address) {
-    Database database = openDatabase(realPath(address));
+std::unique_ptr<StoreEngine> openSqlite(const std::string& address) {
+    return std::make_unique<SqliteEngine>(realPath(address));
+}
+
+void makeSqliteStore(const std::string& address, const std::string& serverName) {
+    makeSqlite(address, &serverName, applicationId);
+}
+
+/// The engine of a copy holds the lock on its folder.
+class SqliteCopy : public SqliteEngine {
+  public:
+    explicit SqliteCopy(const std::string& folder)
+        : SqliteEngine(folder, unfinishedCopyId),
+          m_folder(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {
+        if (flock(m_folder.get(), LOCK_EX | LOCK_NB) != 0) {
+            throw StoreFailure(Fault::Busy, "somebody else is copying to " + folder);
+        }
+    }
+
+  private:
+    Descriptor m_folder;
+};
+
+std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
+    struct stat status;
+    if (stat(databasePath(address).c_str(), &status) != 0) {
+        makeSqlite(address, nullptr, unfinishedCopyId);
+    }
     try {
-        checkFormat(database);
-        return false;
+        return std::make_unique<SqliteCopy>(realPath(address));
     } catch (const StoreFailure& failure) {
-        if (failure.fault != Fault::Older) {
+        if (failure.fault != Fault::Missing) {
             throw;
         }
+        throw StoreFailure(Fault::Exists, address + " holds something else than a begun copy");
+    }
+}
+
+bool upgradeSqlite(const std::string& address) {
+    Database database = openDatabase(realPath(address));
+    if (database.number("PRAGMA user_version") >= format) {
+        checkFormat(database);
+        return false;
     }
     // Format 1 is the first that was ever given out: a step for each later one goes here.
     throw StoreFailure(Fault::Damaged, "no way is known from this format to the present one");
 }
+
+} // namespace
+
+constinit const EngineKind sqliteKind = {openSqlite, makeSqliteStore, openSqliteCopy,
+                                         upgradeSqlite};
 
 } // namespace store

@@ -2,6 +2,7 @@
 // known. What a table does to a ticket is said above it, by TicketContent.
 #pragma once
 
+#include <chrono>
 #include <cstddef>
 #include <cstdint>
 #include <functional>
@@ -31,10 +32,13 @@ enum class Fault {
               ///< file.
     NoFile,   ///< No such file or version.
     Exists,   ///< There is one already.
+    Lost,     ///< The server does not answer (any more). Whether it still took what was under way
+              ///< is not known; it took all of it or nothing.
     Other,    ///< The text tells.
 };
 
-/// A failure of a store. Whatever was under way is undone. The text is one for people.
+/// A failure of a store. Whatever was under way is undone, but see Lost. The text is one for
+/// people.
 class StoreFailure : public std::runtime_error {
   public:
     StoreFailure(Fault fault, const std::string& text) : std::runtime_error(text), fault(fault) {}
@@ -85,9 +89,14 @@ class StoreEngine {
   public:
     virtual ~StoreEngine() = default;
 
+    /// False once the connection to a server is lost, which is for good. Asks nobody.
+    virtual bool alive() = 0;
+
     /// A number that differs from the last one if anybody has committed anything since. It may
-    /// differ without that. Meant to be asked before each read: it costs next to nothing.
-    virtual std::uint64_t commits() = 0;
+    /// differ without that. Meant to be asked before each read. Where only a server knows, it is
+    /// asked if something fetched by keysOfAll may still be as it was; an answer that may be of
+    /// this age spares that. Commits of this object itself are noticed at any age.
+    virtual std::uint64_t commits(std::chrono::milliseconds age) = 0;
 
     // Tickets.
 
@@ -101,7 +110,8 @@ class StoreEngine {
     virtual int createNext(int type) = 0;
     virtual bool remove(int type, int id) = 0;
 
-    /// One key; null when there is no such key or ticket.
+    /// One key; null when there is no such key or ticket. The same key again costs no more than to
+    /// see that it has not changed.
     virtual std::shared_ptr<const Elements> key(int type, int id, std::string_view name) = 0;
     /// The keys that the filter takes, all of one moment; null when there is no such ticket.
     virtual std::shared_ptr<const TicketContent> content(int type, int id,
@@ -150,14 +160,34 @@ class StoreEngine {
     virtual int pruneVersions(std::string_view path, int keepNewest) = 0;
     /// Removes what interrupted deliveries left behind. The number of files removed.
     virtual int removeLeftovers() = 0;
+
+    // What a copy needs on top of these.
+
+    /// By type, the highest id that it ever had.
+    virtual std::map<int, int> highestIds() = 0;
+    /// Makes createNext go on behind this id at the least.
+    virtual void raiseHighestId(int type, int id) = 0;
+    /// Puts a content in place with its number and time, and keeps nothing of what it replaces.
+    /// Number 0 is the file itself. The size is not looked at.
+    virtual void placeVersion(std::string_view path, const FileVersion& version,
+                              std::istream& from) = 0;
+    /// Makes a store of what openCopy opened.
+    virtual void finishCopy() = 0;
 };
 
-/// Opens a store: the path of a folder on a local disk, as bytes.
+// A store's address, as bytes, is the path of a folder on a local disk where it starts with a
+// slash. Any other names a connection service of a PostgreSQL server (pg_service.conf), with a
+// store in the schema "tintgate" of its database.
+
 std::unique_ptr<StoreEngine> openStore(const std::string& address);
 
-/// Makes a new store, with the system ticket in it, under a path where nothing is or an empty
-/// folder. Its folder and database are for owner and group alone, as the umask allows.
+/// Makes a new store, with the system ticket in it, where nothing is or an empty folder. A folder
+/// and what is in it are for owner and group alone, as the umask allows.
 void makeStore(const std::string& address, const std::string& serverName);
+
+/// Makes a store without anything in it, as makeStore, or opens one of which a copy was begun and
+/// not finished. Until finishCopy nobody can open it otherwise, and nobody else to copy to it.
+std::unique_ptr<StoreEngine> openCopy(const std::string& address);
 
 /// Brings a store of an earlier format up to date. False when it was.
 bool bringStoreUpToDate(const std::string& address);

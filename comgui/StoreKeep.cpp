@@ -1,6 +1,7 @@
 #include "comgui/StoreKeep.h"
 
 #include <algorithm>
+#include <limits>
 #include <utility>
 
 namespace store {
@@ -8,6 +9,10 @@ namespace store {
 namespace {
 
 constexpr int jobType = 3;
+
+// Places in a listing: in front of all, and where none is under way.
+constexpr std::pair listingStarts = {-1, std::size_t{0}};
+constexpr std::pair notListing = {std::numeric_limits<int>::max(), std::size_t{0}};
 
 /// In the order in which a client reads them.
 const std::vector<std::string> jobOverview = {"Input/SubType", "Job/Display/Status",
@@ -74,7 +79,10 @@ std::vector<int> StoreKeep::ids(int type) {
 }
 
 std::vector<int> StoreKeep::listIds(int type) {
-    m_idsAsked = m_idsAsked || type == jobType;
+    if (type == jobType) {
+        m_idsAsked = true;
+        m_listed = listingStarts;
+    }
     return m_engine->ids(type);
 }
 
@@ -96,23 +104,27 @@ bool StoreKeep::remove(int type, int id) {
 
 std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_view key) {
     return orElse(SharedElements(), [&] {
+        const auto name = type != jobType ? jobOverview.end()
+                                          : std::find(jobOverview.begin(), jobOverview.end(), key);
+        const auto index = static_cast<std::size_t>(name - jobOverview.begin());
+        const bool again = id == m_fetched.id && type == m_fetched.type && key == m_fetched.key;
+        const bool listing = index != overviewKeys && goesOn(id, index);
         // Asked before the store is: what is committed in between makes the next read fetch again.
-        const std::uint64_t commits = m_engine->commits();
-        if (commits == m_fetched.commits && id == m_fetched.id && type == m_fetched.type &&
-            key == m_fetched.key) {
+        // So for a key that is fetched anyway, any earlier number will do.
+        const std::uint64_t commits =
+            m_engine->commits(listing                          ? oldestListed
+                              : again || index != overviewKeys ? std::chrono::milliseconds(0)
+                                                               : std::chrono::milliseconds::max());
+        if (again && commits == m_fetched.commits) {
             return m_fetched.elements;
         }
-        if (type == jobType) {
-            const auto name = std::find(jobOverview.begin(), jobOverview.end(), key);
-            if (name != jobOverview.end() && wantsOverview(commits)) {
-                const Row* const row = overviewRow(id);
-                const auto index = static_cast<std::size_t>(name - jobOverview.begin());
-                if (row == nullptr) {
-                    return SharedElements();
-                }
-                if (!row->large[index]) {
-                    return row->elements[index];
-                }
+        if (index != overviewKeys && wantsOverview(commits, listing)) {
+            const Row* const row = overviewRow(id);
+            if (row == nullptr) {
+                return SharedElements();
+            }
+            if (!row->large[index]) {
+                return row->elements[index];
             }
         }
         m_fetched.type = -1;
@@ -125,15 +137,26 @@ std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_vie
     });
 }
 
+/// Whether a read of the overview goes on in a listing, behind its first one.
+bool StoreKeep::goesOn(int id, std::size_t overviewKey) {
+    const std::pair next = {id, overviewKey};
+    const bool starts = m_listed == listingStarts;
+    const bool goesOn = !starts && m_listed < next;
+    m_listed = starts || goesOn ? next : notListing;
+    return goesOn;
+}
+
 /// Whether the overview of this moment is there; it is fetched where that is worth it. While others
-/// keep writing, it is fetched again only after so many reads that they cost more.
-bool StoreKeep::wantsOverview(std::uint64_t commits) {
+/// keep writing, it is fetched again only after so many reads that they cost more, or after so long
+/// a time that a listing does not notice.
+bool StoreKeep::wantsOverview(std::uint64_t commits, bool listing) {
     if (m_overviewHeld && m_overviewCommits == commits) {
         return true;
     }
     m_overviewHeld = false;
     ++m_readsSince;
-    if (!m_idsAsked && m_readsSince <= m_readsUntilNext) {
+    if (!m_idsAsked && m_readsSince <= m_readsUntilNext &&
+        !(listing && std::chrono::steady_clock::now() - m_overviewFetched > oldestListed)) {
         return false;
     }
     fetchOverview(commits);
@@ -168,6 +191,7 @@ void StoreKeep::fetchOverview(std::uint64_t commits) {
                             row.elements[name] = std::move(elements);
                         });
     m_lastRow = 0;
+    m_overviewFetched = std::chrono::steady_clock::now();
     m_overviewCommits = commits;
     m_overviewHeld = true;
     m_idsAsked = false;

@@ -2,9 +2,11 @@
 #pragma once
 
 #include <array>
+#include <chrono>
 #include <cstdint>
 #include <memory>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "comgui/StoreEngine.h"
@@ -14,11 +16,15 @@ namespace store {
 
 /// A failure of the store is a ticket that isn't there, or a table that can't be written.
 ///
-/// What was read is given again only while nobody has committed anything since, so a reader always
-/// sees what is there now. Two things are kept that way: the key that was read last, so that the
+/// What was read is given again only while nobody has committed anything since, so a reader sees
+/// what is there now. Two things are kept that way: the key that was read last, so that the
 /// count and the elements of an array are one fetch; and, once the ids of the jobs have been asked
 /// for, the keys of all jobs by which a client picks those that concern it, since it is about to
 /// ask each job for each of them.
+///
+/// A listing is the one thing that may be seen as it was a moment ago: from where a client starts,
+/// having asked for the ids, to where it no longer goes on to a further one of these keys or a job
+/// of a higher id, what it sees may be as old as oldestListed where asking costs a round trip.
 class StoreKeep : public TicketKeep {
   public:
     explicit StoreKeep(std::shared_ptr<StoreEngine> engine);
@@ -35,6 +41,8 @@ class StoreKeep : public TicketKeep {
                                                  const KeyFilter& filter) override;
     bool apply(int type, int id, SETMULTIPAR* table) override;
     bool transfer(int type, int id, const TicketContent& source, bool replace) override;
+
+    static constexpr std::chrono::milliseconds oldestListed{100};
 
   private:
     using SharedElements = std::shared_ptr<const Elements>;
@@ -54,14 +62,17 @@ class StoreKeep : public TicketKeep {
         std::array<bool, overviewKeys> large; ///< Not held for its size.
     };
 
+    bool goesOn(int id, std::size_t overviewKey);
     const Row* overviewRow(int id);
-    bool wantsOverview(std::uint64_t commits);
+    bool wantsOverview(std::uint64_t commits, bool listing);
     void fetchOverview(std::uint64_t commits);
 
     const std::shared_ptr<StoreEngine> m_engine;
     Fetched m_fetched;
-    std::vector<Row> m_overview; ///< By id.
-    std::size_t m_lastRow = 0;   ///< Jobs are asked for in this order.
+    std::vector<Row> m_overview;            ///< By id.
+    std::size_t m_lastRow = 0;              ///< Jobs are asked for in this order.
+    std::pair<int, std::size_t> m_listed{}; ///< Job and overview key that a listing read last.
+    std::chrono::steady_clock::time_point m_overviewFetched;
     std::uint64_t m_overviewCommits = 0;
     bool m_overviewHeld = false;
     bool m_idsAsked = false;          ///< Since the last overview.

@@ -22,8 +22,9 @@ std::int64_t milliseconds() {
 
 const std::string& Invocation::givenAddress() const {
     if (address.empty()) {
-        throw Failure(Status::BadCommand,
-                      "which store? Say --store FOLDER, or set TINTGATE_STORE to it");
+        throw Failure(
+            Status::BadCommand,
+            "which store? Say --store FOLDER or --store SERVICE, or set TINTGATE_STORE to it");
     }
     return address;
 }

@@ -24,6 +24,7 @@ enum class Status : int {
     BadPath = 11,    ///< A server path that leads to no file inside the store.
     LocalFile = 12,  ///< A file of this machine can't be read or written.
     Other = 13,      ///< Anything else; the message tells.
+    Lost = 14,       ///< The server was lost on the way.
     BadCommand = 64, ///< The command line is not understood.
 };
 
@@ -57,6 +58,8 @@ constexpr Status statusOf(store::Fault fault) {
         return Status::NotThere;
     case store::Fault::Exists:
         return Status::Exists;
+    case store::Fault::Lost:
+        return Status::Lost;
     case store::Fault::Other:
         break;
     }

@@ -17,12 +17,13 @@ namespace {
 
 using admin::Status;
 
-/// The longest path that a job can name as its server.
+/// The longest address that a job can name as its server.
 constexpr std::size_t longestAddress = 127;
 
 constexpr const char* footer = R"(
 Examples:
   tintgate-store --store /srv/tintgate make --name "Print room"
+  tintgate-store copy /srv/tintgate room  to the PostgreSQL server of the service "room"
   export TINTGATE_STORE=/srv/tintgate     from here on --store may be left out
   tintgate-store user add anna            asks for the password
   tintgate-store import tickets.json
@@ -51,6 +52,7 @@ Exit status:
   11  the server path leads to no file inside the store
   12  a file of this machine can't be read or written
   13  anything else; the message tells
+  14  the server was lost on the way; a change may have been made: look, and try again
   64  the command line is not understood)";
 
 int end(Status status) {
@@ -62,14 +64,18 @@ int fail(Status status, const char* text) {
     return end(status);
 }
 
-void warnOfLongAddress(const std::string& address) {
-    std::error_code none;
-    const auto length = std::filesystem::absolute(address, none).string().size();
-    if (length > longestAddress) {
+/// A job and every other client name a folder by its whole path; here people may name it as a shell
+/// does. What has no slash is a connection service.
+void completeAddress(std::string& address) {
+    if (address.find('/') != std::string::npos) {
+        std::error_code none;
+        address = std::filesystem::absolute(address, none).string();
+    }
+    if (address.size() > longestAddress) {
         std::fprintf(stderr,
-                     "tintgate-store: warning: the store's path has %zu bytes; a job can name at "
-                     "most %zu\n",
-                     length, longestAddress);
+                     "tintgate-store: warning: the store's address has %zu bytes; a job can name "
+                     "at most %zu\n",
+                     address.size(), longestAddress);
     }
 }
 
@@ -108,11 +114,9 @@ void unmarkOptions(CLI::App& command) {
     }
 }
 
-int run(const admin::Invocation& invocation) {
+int run(admin::Invocation& invocation) {
     try {
-        if (!invocation.address.empty()) {
-            warnOfLongAddress(invocation.address);
-        }
+        completeAddress(invocation.address);
         invocation.action();
         admin::finishStandardOutput();
         return end(Status::Done);
@@ -137,7 +141,10 @@ int main(int argumentCount, char** arguments) {
     admin::Invocation invocation;
     program.fallthrough();
     program.require_subcommand(1);
-    program.add_option("-s,--store", invocation.address, "The store's folder")
+    program
+        .add_option("-s,--store", invocation.address,
+                    "Folder of the store, a path with a slash, or connection service of its "
+                    "PostgreSQL server")
         ->envname("TINTGATE_STORE");
     program.add_flag("--json", invocation.json, "Lists and values as JSON, for scripts");
     admin::addStoreCommands(program, invocation);

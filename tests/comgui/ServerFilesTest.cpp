@@ -16,16 +16,16 @@ class ServerFiles : public StoreTest {
   protected:
     const std::unique_ptr<store::StoreEngine> engine = open();
 };
+ON_BOTH_ENGINES(ServerFiles);
+
+class FilesInFolder : public FolderStoreTest {
+  protected:
+    const std::unique_ptr<store::StoreEngine> engine = open();
+};
 
 } // namespace
 
-TEST_F(ServerFiles, PathsStayBelowTheFilesWhateverTheyContain) {
-    folder.write("secret", "secret");
-    const std::string outside = folder.makeFolder("outside");
-    symlink(outside.c_str(), (address + "/files/out").c_str());
-    symlink(folder.path("secret").c_str(), (address + "/files/link").c_str());
-    symlink(".", (address + "/files/round").c_str());
-    mkfifo((address + "/files/pipe").c_str(), 0666);
+TEST_P(ServerFiles, PathsStayBelowTheFilesWhateverTheyContain) {
     putFile(*engine, "inside/file", "x");
     const std::string longPart(256, 'a');
     std::string deep;
@@ -44,10 +44,6 @@ TEST_F(ServerFiles, PathsStayBelowTheFilesWhateverTheyContain) {
         {"inside/", Fault::BadPath},
         {"inside/file/", Fault::BadPath},
         {"inside/file/more", Fault::BadPath},
-        {"out/file", Fault::BadPath},
-        {"link", Fault::BadPath},
-        {"round/inside/file", Fault::BadPath},
-        {"pipe", Fault::BadPath},
         {std::string("inside/file\0.txt", 16), Fault::BadPath},
         {longPart, Fault::BadPath},
         {std::string(10'240, 'a'), Fault::BadPath},
@@ -61,18 +57,39 @@ TEST_F(ServerFiles, PathsStayBelowTheFilesWhateverTheyContain) {
         EXPECT_EQ(faultOf([&, at = path] { putFile(*engine, at, "hostile"); }), fault) << shown;
     }
     EXPECT_EQ(faultOf([&] { file(*engine, "missing/file"); }), Fault::NoFile);
-    EXPECT_EQ(support::contentsOf(folder.path("secret")), "secret");
-    EXPECT_TRUE(std::filesystem::is_empty(outside));
     ASSERT_EQ(engine->files().size(), 1u) << "what was refused left something";
 
     // Absolute paths mean the same below the files, and names of any bytes are names.
     putFile(*engine, "//opt/server/./ControlCharts/a\\b \xFF\n.it8", "chart");
     EXPECT_EQ(file(*engine, "opt/server/ControlCharts/a\\b \xFF\n.it8"), "chart");
-    EXPECT_EQ(support::contentsOf(address + "/files/opt/server/ControlCharts/a\\b \xFF\n.it8"),
-              "chart");
+    EXPECT_EQ(engine->files().back().path, "opt/server/ControlCharts/a\\b \xFF\n.it8");
+    std::string large(1'000'003, 'x'); // Of several pieces, where there are pieces.
+    large.replace(262'100, 100, "where one ends");
+    putFile(*engine, "large", large);
+    EXPECT_EQ(file(*engine, "large"), large);
+    putFile(*engine, "large", large.substr(0, 524'288));
+    EXPECT_EQ(file(*engine, "large"), large.substr(0, 524'288));
 }
 
-TEST_F(ServerFiles, KeepsEachVersionUntilItIsPruned) {
+TEST_F(FilesInFolder, NoLinkLeadsOut) {
+    folder.write("secret", "secret");
+    const std::string outside = folder.makeFolder("outside");
+    symlink(outside.c_str(), (address + "/files/out").c_str());
+    symlink(folder.path("secret").c_str(), (address + "/files/link").c_str());
+    symlink(".", (address + "/files/round").c_str());
+    mkfifo((address + "/files/pipe").c_str(), 0666);
+    for (const std::string path : {"out/file", "link", "round/inside/file", "pipe"}) {
+        EXPECT_EQ(faultOf([&] { file(*engine, path); }), Fault::BadPath) << path;
+        EXPECT_EQ(faultOf([&] { putFile(*engine, path, "hostile"); }), Fault::BadPath) << path;
+    }
+    EXPECT_EQ(support::contentsOf(folder.path("secret")), "secret");
+    EXPECT_TRUE(std::filesystem::is_empty(outside));
+    EXPECT_TRUE(engine->files().empty());
+    putFile(*engine, "/opt/chart.it8", "chart");
+    EXPECT_EQ(support::contentsOf(address + "/files/opt/chart.it8"), "chart");
+}
+
+TEST_P(ServerFiles, KeepsEachVersionUntilItIsPruned) {
     const std::string path = "jobs/7/job.jdf";
     EXPECT_TRUE(engine->versions(path).empty());
     for (const std::string text : {"one", "two!", "three", "three", ""}) {
@@ -111,7 +128,7 @@ TEST_F(ServerFiles, KeepsEachVersionUntilItIsPruned) {
     EXPECT_EQ(listed, "jobs/7/job.jdf:4 jobs/7/job.jdf.d/1:5 ");
 }
 
-TEST_F(ServerFiles, LeftoversGoWhileDeliveriesStay) {
+TEST_F(FilesInFolder, LeftoversGoWhileDeliveriesStay) {
     putFile(*engine, "a/file", "x");
     const std::string left = folder.write("store/files/a/.tintgate-new-1-1", "half");
     EXPECT_EQ(engine->removeLeftovers(), 0) << "it may be a delivery that just began";

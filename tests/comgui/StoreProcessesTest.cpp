@@ -14,6 +14,7 @@
 namespace {
 
 class StoreProcesses : public StoreTest {};
+ON_BOTH_ENGINES(StoreProcesses);
 
 /// The one int that a ticket's key holds, or -1.
 int single(store::StoreEngine& engine, const char* key) {
@@ -23,7 +24,7 @@ int single(store::StoreEngine& engine, const char* key) {
 
 } // namespace
 
-TEST_F(StoreProcesses, TwoWritersOfAThousandTablesEachLoseAndMixNothing) {
+TEST_P(StoreProcesses, TwoWritersOfAThousandTablesEachLoseAndMixNothing) {
     constexpr int tables = 1'000;
     open()->create(3, 1);
     const auto write = [&](const std::string& name) {
@@ -76,7 +77,7 @@ TEST_F(StoreProcesses, TwoWritersOfAThousandTablesEachLoseAndMixNothing) {
     });
 }
 
-TEST_F(StoreProcesses, WritersKilledAtAnyMomentLeaveWholeTablesAndFiles) {
+TEST_P(StoreProcesses, WritersKilledAtAnyMomentLeaveWholeTablesAndFiles) {
     constexpr int rounds = 100;
     open()->create(3, 1);
     // What the writer has been told to be done, which must then be there.
@@ -162,7 +163,7 @@ TEST_F(StoreProcesses, WritersKilledAtAnyMomentLeaveWholeTablesAndFiles) {
     munmap(memory, sizeof(Shared));
 }
 
-TEST_F(StoreProcesses, ManyDeliveriesToOnePlaceKeepEachOther) {
+TEST_P(StoreProcesses, ManyDeliveriesToOnePlaceKeepEachOther) {
     constexpr int writers = 4;
     constexpr int files = 25;
     std::vector<pid_t> children;

@@ -12,7 +12,9 @@
 #include <unistd.h>
 
 #include <gtest/gtest.h>
+#include <sqlite3.h>
 
+#include "Postgres.h"
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 #include "TicketText.h"
@@ -41,9 +43,23 @@ inline int endOf(pid_t child) {
     return WIFEXITED(status) ? WEXITSTATUS(status) : 1000 + WTERMSIG(status);
 }
 
-class StoreTest : public testing::Test {
+enum class Engine { Sqlite, Postgres };
+
+inline std::string engineName(const testing::TestParamInfo<Engine>& info) {
+    return info.param == Engine::Sqlite ? "Sqlite" : "Postgres";
+}
+
+/// For a suite of tests that hold wherever a store is.
+#define ON_BOTH_ENGINES(Suite)                                                                     \
+    INSTANTIATE_TEST_SUITE_P(, Suite, testing::Values(Engine::Sqlite, Engine::Postgres), engineName)
+
+class StoreTest : public testing::TestWithParam<Engine> {
   protected:
-    StoreTest() { store::makeStore(address, "Press room"); }
+    explicit StoreTest(Engine kind = GetParam())
+        : room(kind == Engine::Postgres ? std::make_unique<support::PostgresRoom>() : nullptr),
+          address(room ? "room" : folder.path("store")) {
+        store::makeStore(address, "Press room");
+    }
 
     std::unique_ptr<store::StoreEngine> open() const { return store::openStore(address); }
 
@@ -99,6 +115,31 @@ class StoreTest : public testing::Test {
 
     using RecordTable = support::RecordTable;
 
+    /// Runs SQL behind the store's back: the first text where it is a folder, else the second.
+    void sql(const std::string& sqlite, const std::string& postgres) const {
+        if (room) {
+            support::BarePostgres("room").run(postgres);
+            return;
+        }
+        sqlite3* database = nullptr;
+        sqlite3_open((address + "/tickets.db").c_str(), &database);
+        EXPECT_EQ(sqlite3_exec(database, sqlite.c_str(), nullptr, nullptr, nullptr), SQLITE_OK)
+            << sqlite3_errmsg(database);
+        sqlite3_close(database);
+    }
+
+    void setFormat(int format) const {
+        const std::string number = std::to_string(format);
+        sql("PRAGMA user_version = " + number, "UPDATE tintgate.store SET format = " + number);
+    }
+
     const support::ScratchFolder folder;
-    const std::string address = folder.path("store");
+    const std::unique_ptr<support::PostgresRoom> room; ///< Null where the store is a folder.
+    const std::string address;
+};
+
+/// Tests of what only a store in a folder has.
+class FolderStoreTest : public StoreTest {
+  protected:
+    FolderStoreTest() : StoreTest(Engine::Sqlite) {}
 };

@@ -1,0 +1,408 @@
+// A store in the database of a PostgreSQL server; PostgresSchema.cpp has its tables.
+//
+// What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction of two
+// round trips: it locks the ticket's row and fetches what it needs, then writes and commits.
+#include <algorithm>
+#include <map>
+#include <utility>
+
+#include "comgui/Engines.h"
+#include "comgui/KeyBytes.h"
+#include "comgui/Postgres.h"
+#include "comgui/PostgresFiles.h"
+#include "comgui/PostgresSchema.h"
+
+namespace store {
+
+namespace {
+
+using postgres::ArrayReader;
+using postgres::Connection;
+using postgres::Result;
+using postgres::Statement;
+using postgres::Transaction;
+
+constexpr Statement idsOf = {
+    "SELECT ARRAY (SELECT id FROM tintgate.tickets WHERE type = $1 ORDER BY id)"};
+constexpr Statement isThere = {
+    "SELECT EXISTS (SELECT FROM tintgate.tickets WHERE type = $1 AND id = $2)"};
+
+// The row of the highest id is locked before a ticket is made. Whoever makes one takes them in this
+// order, so that nobody waits in a circle.
+constexpr Statement createTicket = {
+    "WITH raised AS (INSERT INTO tintgate.highest_ids AS highest (type, id) VALUES ($1, $2)"
+    " ON CONFLICT (type) DO UPDATE SET id = greatest(highest.id, excluded.id) RETURNING type)"
+    " INSERT INTO tintgate.tickets (type, id) SELECT type, $2 FROM raised ON CONFLICT DO NOTHING"};
+constexpr Statement raiseHighest = {
+    "INSERT INTO tintgate.highest_ids AS highest (type, id) VALUES ($1, $2)"
+    " ON CONFLICT (type) DO UPDATE SET id = greatest(highest.id, excluded.id)"
+    " RETURNING id"};
+constexpr Statement allHighest = {"SELECT type, id FROM tintgate.highest_ids"};
+constexpr Statement removeTicket = {"DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2"};
+
+// The value only if it is another one than the caller has: one that this change of that ticket
+// wrote.
+constexpr Statement oneKey = {
+    "SELECT number, change, CASE WHEN (number, change) <> ($4::bigint, $5::bigint) THEN value END"
+    " FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
+    " WHERE type = $1 AND id = $2 AND hash = sha256($3)"};
+constexpr Statement allKeys = {
+    "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number"
+    " WHERE type = $1 AND id = $2"};
+constexpr Statement someKeys = {
+    "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
+    " (hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact)) OR"
+    " EXISTS (SELECT FROM unnest($4::bytea[]) AS prefix"
+    " WHERE substring(name FOR length(prefix)) = prefix))"
+    " WHERE type = $1 AND id = $2"};
+constexpr Statement keysOfType = {
+    "SELECT id, name, CASE WHEN length(value) <= $3 THEN value END"
+    " FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
+    " WHERE type = $1 AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($2::bytea[]) AS name))"
+    " ORDER BY id"};
+/// Which transactions have come to their end. While this is the same, nobody has committed
+/// anything.
+constexpr Statement snapshot = {"SELECT pg_current_snapshot()::text"};
+
+constexpr Statement lockTicket = {
+    "UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = $1 AND id = $2"
+    " RETURNING number, changes"};
+constexpr Statement neededKeys = {
+    "SELECT name, value FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
+    " WHERE type = $1 AND id = $2"
+    " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
+constexpr Statement putKeys = {
+    "INSERT INTO tintgate.keys (ticket, name, value, change)"
+    " SELECT $1, name, value, $2 FROM unnest($3::bytea[], $4::bytea[]) AS new (name, value)"
+    " ON CONFLICT (ticket, hash) DO UPDATE SET value = excluded.value, change = excluded.change"};
+constexpr Statement deleteKeys = {
+    "DELETE FROM tintgate.keys WHERE ticket = $1"
+    " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($2::bytea[]) AS name))"};
+constexpr Statement emptyTicket = {"DELETE FROM tintgate.keys WHERE ticket = $1"};
+
+constexpr Statement allUsers = {"SELECT name, hash, disabled FROM tintgate.users ORDER BY name"};
+constexpr Statement oneUser = {"SELECT name, hash, disabled FROM tintgate.users WHERE name = $1"};
+constexpr Statement putOneUser = {
+    "INSERT INTO tintgate.users (name, hash, disabled) VALUES ($1, $2, $3)"
+    " ON CONFLICT (name) DO UPDATE SET hash = excluded.hash, disabled = excluded.disabled"};
+constexpr Statement removeOneUser = {"DELETE FROM tintgate.users WHERE name = $1"};
+
+/// Held by the one who copies to the store. "TGAT" as a number.
+constexpr Statement lockCopy = {"SELECT pg_try_advisory_lock(1413955924)"};
+
+using Names = std::vector<std::string_view>;
+
+User userIn(const Result& rows, int row) {
+    return {rows.text(row, 0), rows.text(row, 1), rows.number(row, 2) != 0};
+}
+
+class PostgresEngine : public StoreEngine {
+  public:
+    explicit PostgresEngine(Connection connection) : m_connection(std::move(connection)) {}
+
+    bool alive() override { return !m_connection.lost(); }
+
+    std::uint64_t commits(std::chrono::milliseconds age) override {
+        const auto now = std::chrono::steady_clock::now();
+        if (m_snapshot.empty() ||
+            (now - m_asked > age && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
+            noteChange();
+        } else if (now - m_asked > age) {
+            m_asked = now;
+        }
+        return m_commits;
+    }
+
+    std::vector<int> ids(int type) override {
+        const Result row = m_connection.run(idsOf, type);
+        std::vector<int> ids;
+        for (ArrayReader array(row.bytes(0, 0)); array.left() != 0;) {
+            ids.push_back(static_cast<int>(postgres::numberOf(array.next())));
+        }
+        return ids;
+    }
+
+    bool exists(int type, int id) override {
+        return m_connection.run(isThere, type, id).number(0, 0) != 0;
+    }
+
+    bool create(int type, int id) override {
+        if (exists(type, id)) {
+            return false; // Without waiting for others.
+        }
+        noteChange();
+        return m_connection.run(createTicket, type, id).changed() != 0;
+    }
+
+    int createNext(int type) override {
+        noteChange();
+        Transaction transaction(m_connection);
+        m_connection.send(raiseHighest, type, 0);
+        const auto results = transaction.finish();
+        int id = static_cast<int>(results[0].number(0, 0)) + 1;
+        if (id > highestTicketId) {
+            id = lowestFree(ids(type));
+        }
+        if (id > highestTicketId) {
+            return -1;
+        }
+        m_connection.send(createTicket, type, id);
+        return transaction.commit()[0].changed() != 0 ? id : -1;
+    }
+
+    bool remove(int type, int id) override {
+        noteChange();
+        return m_connection.run(removeTicket, type, id).changed() != 0;
+    }
+
+    std::shared_ptr<const Elements> key(int type, int id, std::string_view name) override {
+        const bool again = type == m_last.type && id == m_last.id && name == m_last.name;
+        const Result row =
+            m_connection.run(oneKey, type, id, name, std::int64_t{again ? m_last.ticket : 0},
+                             std::int64_t{again ? m_last.change : 0});
+        if (row.rows() == 0) {
+            m_last = {};
+            return nullptr;
+        }
+        if (!row.isNull(0, 2)) {
+            m_last = {};
+            auto elements = decoded(row.bytes(0, 2));
+            m_last = {type, id, std::string(name), row.number(0, 0), row.number(0, 1), elements};
+        }
+        return m_last.elements;
+    }
+
+    std::shared_ptr<const TicketContent> content(int type, int id,
+                                                 const KeyFilter& filter) override {
+        const Names exact(filter.exact().begin(), filter.exact().end());
+        const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
+        const Result rows = filter.all() ? m_connection.run(allKeys, type, id)
+                                         : m_connection.run(someKeys, type, id, exact, prefixes);
+        return rows.rows() == 0 ? nullptr : std::make_shared<TicketContent>(contentOf(rows));
+    }
+
+    void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
+                   const ShowKey& show) override {
+        // The snapshot first: what is committed between the two only has it all fetched again.
+        m_asked = std::chrono::steady_clock::now();
+        m_connection.send(snapshot);
+        m_connection.send(keysOfType, type, Names(names.begin(), names.end()),
+                          static_cast<int>(largestBytes));
+        const auto results = m_connection.finish();
+        showKeys(results[1], names, show);
+        m_snapshot = results[0].text(0, 0);
+    }
+
+    bool change(int type, int id, const Scope& scope,
+                const std::function<void(TicketContent&)>& work) override {
+        noteChange();
+        Transaction transaction(m_connection);
+        m_connection.send(lockTicket, type, id);
+        Names needed;
+        for (const auto& [name, isNeeded] : scope.keys) {
+            if (isNeeded && !scope.everything) {
+                needed.push_back(name);
+            }
+        }
+        if (!needed.empty()) {
+            m_connection.send(neededKeys, type, id, needed);
+        }
+        const auto results = transaction.finish();
+        if (results[0].rows() == 0) {
+            return false;
+        }
+        TicketContent content = results.size() == 1 ? TicketContent() : contentOf(results[1]);
+        const TicketContent before = content; // Shares the elements: a change makes others.
+        work(content);
+        if (write(results[0].number(0, 0), results[0].number(0, 1), scope, before, content)) {
+            transaction.commit();
+        }
+        return true;
+    }
+
+    std::vector<User> users() override {
+        const Result rows = m_connection.run(allUsers);
+        std::vector<User> users;
+        for (int row = 0; row < rows.rows(); ++row) {
+            users.push_back(userIn(rows, row));
+        }
+        return users;
+    }
+
+    std::optional<User> user(std::string_view name) override {
+        const Result rows = m_connection.run(oneUser, name);
+        return rows.rows() == 0 ? std::nullopt : std::optional(userIn(rows, 0));
+    }
+
+    void putUser(const User& user) override {
+        noteChange();
+        m_connection.run(putOneUser, user.name, user.passwordHash, user.disabled);
+    }
+
+    bool removeUser(std::string_view name) override {
+        noteChange();
+        return m_connection.run(removeOneUser, name).changed() != 0;
+    }
+
+    void putFile(std::string_view path, std::istream& from) override {
+        noteChange();
+        m_files.put(path, from);
+    }
+    void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
+    std::vector<FileEntry> files() override { return m_files.list(); }
+    std::vector<FileVersion> versions(std::string_view path) override {
+        return m_files.versions(path);
+    }
+    void getVersion(std::string_view path, int number, std::ostream& to) override {
+        m_files.getVersion(path, number, to);
+    }
+    void restoreVersion(std::string_view path, int number) override {
+        noteChange();
+        m_files.restoreVersion(path, number);
+    }
+    int pruneVersions(std::string_view path, int keepNewest) override {
+        noteChange();
+        return m_files.pruneVersions(path, keepNewest);
+    }
+    int removeLeftovers() override { return 0; } // The server undoes what is cut off.
+
+    std::map<int, int> highestIds() override {
+        const Result rows = m_connection.run(allHighest);
+        std::map<int, int> ids;
+        for (int row = 0; row < rows.rows(); ++row) {
+            ids.emplace(rows.number(row, 0), rows.number(row, 1));
+        }
+        return ids;
+    }
+    void raiseHighestId(int type, int id) override { m_connection.run(raiseHighest, type, id); }
+    void placeVersion(std::string_view path, const FileVersion& version,
+                      std::istream& from) override {
+        m_files.placeVersion(path, version, from);
+    }
+    void finishCopy() override { postgres::finishCopy(m_connection); }
+
+  private:
+    /// The key that was fetched last.
+    struct Fetched {
+        int type = -1;
+        int id = -1;
+        std::string name;
+        std::int64_t ticket = 0;
+        std::int64_t change = 0;
+        std::shared_ptr<const Elements> elements;
+    };
+
+    void noteChange() {
+        m_snapshot.clear();
+        ++m_commits;
+    }
+
+    /// Of rows of name and value. A ticket without keys may have one of nulls.
+    static TicketContent contentOf(const Result& rows) {
+        TicketContent content;
+        for (int row = 0; row < rows.rows(); ++row) {
+            if (!rows.isNull(row, 0)) {
+                content.put(rows.text(row, 0), decoded(rows.bytes(row, 1)));
+            }
+        }
+        return content;
+    }
+
+    static void showKeys(const Result& rows, const std::vector<std::string>& names,
+                         const ShowKey& show) {
+        // Such keys hold few different values.
+        std::map<std::string_view, std::shared_ptr<const Elements>> known;
+        for (int row = 0; row < rows.rows(); ++row) {
+            const auto name = std::find(names.begin(), names.end(), rows.bytes(row, 1));
+            std::shared_ptr<const Elements> elements;
+            if (!rows.isNull(row, 2)) {
+                const std::string_view bytes = rows.bytes(row, 2);
+                auto same = known.find(bytes);
+                if (same == known.end()) {
+                    same = known.emplace(bytes, decoded(bytes)).first;
+                }
+                elements = same->second;
+            }
+            show(static_cast<int>(rows.number(row, 0)),
+                 static_cast<std::size_t>(name - names.begin()), std::move(elements));
+        }
+    }
+
+    /// Sends what makes the ticket's keys those of after. False when there is nothing to write.
+    bool write(std::int64_t ticket, std::int64_t change, const Scope& scope,
+               const TicketContent& before, const TicketContent& after) {
+        Names put;
+        Names deleted;
+        std::vector<std::string> bytes;
+        const auto putKey = [&](const std::string& name, const Elements& elements) {
+            put.push_back(name);
+            bytes.push_back(keyBytes(elements));
+        };
+        if (scope.everything) {
+            m_connection.send(emptyTicket, ticket);
+            for (const auto& [name, elements] : after.keys()) {
+                putKey(name, *elements);
+            }
+        } else {
+            for (const auto& [name, needed] : scope.keys) {
+                const auto elements = after.find(name);
+                if (needed && elements == before.find(name)) {
+                    continue;
+                }
+                if (elements != nullptr) {
+                    putKey(name, *elements);
+                } else {
+                    deleted.push_back(name);
+                }
+            }
+        }
+        if (!deleted.empty()) {
+            m_connection.send(deleteKeys, ticket, deleted);
+        }
+        if (!put.empty()) {
+            m_connection.send(putKeys, ticket, change, put, Names(bytes.begin(), bytes.end()));
+        }
+        return scope.everything || !deleted.empty() || !put.empty();
+    }
+
+    Connection m_connection;
+    postgres::Files m_files{m_connection};
+    Fetched m_last;
+    std::uint64_t m_commits = 0;
+    std::string m_snapshot; ///< Of the last keysOfAll; empty once somebody has committed since.
+    std::chrono::steady_clock::time_point m_asked; ///< When that was still the server's.
+};
+
+std::unique_ptr<StoreEngine> openPostgres(const std::string& service) {
+    Connection connection(service);
+    postgres::checkSchema(connection);
+    return std::make_unique<PostgresEngine>(std::move(connection));
+}
+
+void makePostgres(const std::string& service, const std::string& serverName) {
+    Connection connection(service);
+    postgres::makeSchema(connection, &serverName);
+}
+
+std::unique_ptr<StoreEngine> openPostgresCopy(const std::string& service) {
+    Connection connection(service);
+    if (!postgres::isUnfinishedCopy(connection)) {
+        postgres::makeSchema(connection, nullptr);
+    }
+    if (connection.run(lockCopy).number(0, 0) == 0) {
+        throw StoreFailure(Fault::Busy, "somebody else is copying to this store");
+    }
+    return std::make_unique<PostgresEngine>(std::move(connection));
+}
+
+bool upgradePostgres(const std::string& service) {
+    Connection connection(service);
+    return postgres::upgradeSchema(connection);
+}
+
+} // namespace
+
+constinit const EngineKind postgresKind = {openPostgres, makePostgres, openPostgresCopy,
+                                           upgradePostgres};
+
+} // namespace store
