@@ -1,9 +1,7 @@
 #include "measure/ControlStripText.h"
 
 #include <algorithm>
-#include <filesystem>
 #include <limits>
-#include <system_error>
 
 #include <fcntl.h>
 #include <unistd.h>
@@ -11,6 +9,7 @@
 #include <wx/convauto.h>
 #include <wx/filename.h>
 
+#include "job/JobFiles.h"
 #include "job/KZVerifyJobProcessor.h"
 
 namespace {
@@ -69,12 +68,10 @@ std::string measure::pathBytes(const wxString& path) {
 
 // wx would lose a path that is not valid in the user's locale, so the file goes to it opened.
 bool measure::readLines(const wxString& path, wxTextFile* file) {
-    const std::string bytes = pathBytes(path);
-    std::error_code ignored;
-    if (!std::filesystem::is_regular_file(bytes, ignored)) {
+    if (!fileExists(path)) {
         return false;
     }
-    const int opened = open(bytes.c_str(), O_RDONLY | O_CLOEXEC);
+    const int opened = open(pathBytes(path).c_str(), O_RDONLY | O_CLOEXEC);
     if (opened >= 0) {
         file->Open("/proc/self/fd/" + std::to_string(opened), wxConvAuto());
         close(opened);

@@ -1,0 +1,200 @@
+#include "measure/MeasuringTool.h"
+
+#include <chrono>
+#include <clocale>
+#include <filesystem>
+#include <fstream>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include <wx/init.h>
+
+#include "RunningProgram.h"
+#include "SuiteRoot.h"
+#include "job/KZVerifyJobProcessor.h"
+#include "measure/Helper.h"
+#include "measure/NerovaMeasureParams.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using Clock = std::chrono::steady_clock;
+
+class MeasuringTool : public testing::Test {
+  protected:
+    // Names that a command line would fall apart on.
+    MeasuringTool() {
+        setlocale(LC_CTYPE, "C.UTF-8");
+        fs::create_directories(m_temporary);
+        setenv("TMPDIR", m_temporary.c_str(), 1);
+        m_root.installPlistReader(PLIST_READER);
+        fs::create_directories(m_installed + "/NerovaMeasure.app/Contents/MacOS");
+        m_root.writePreferences("ApplicationsUsingNerovaMeasure.plist",
+                                {{"installed_path", m_installed}});
+        fs::create_directories(m_root.path("job"));
+        m_job.controlStripFile = wide(m_strip);
+        m_job.sampleFile = wide(m_samples);
+        m_job.language = "de_DE";
+        m_job.deviceID = 21;
+        writeFile(m_strip, "NUMBER_OF_COLS 1\niSis_INFO\n");
+        writeFile(m_samples, "old");
+    }
+
+    static void writeFile(const std::string& path, const std::string& text) {
+        std::ofstream(path) << text;
+    }
+
+    void writeTool(const std::string& lines, unsigned mode = 0755) const {
+        writeFile(m_tool, "#!/bin/sh\n" + lines);
+        chmod(m_tool.c_str(), mode);
+    }
+
+    static wxString wide(const std::string& path) { return stringToWstring(path); }
+
+    int launch() {
+        const auto start = Clock::now();
+        const int result = KZVerifyJobProcessor().ConfigureAndLaunchNerovaMeasure(&m_job);
+        m_seconds = std::chrono::duration<double>(Clock::now() - start).count();
+        return result;
+    }
+
+    bool hasSamples() const { return support::exists(m_samples); }
+    bool hasDefinition() const { return support::exists(m_definition); }
+
+    /// Empty where there is none.
+    std::string optionsFile() const {
+        for (const auto& entry : fs::directory_iterator(m_temporary)) {
+            if (entry.path().filename().string().starts_with("NerovaMeasure")) {
+                return entry.path();
+            }
+        }
+        return "";
+    }
+
+    const support::SuiteRoot m_root;
+    const wxInitializer m_wx;
+    const std::string m_temporary = m_root.path("t \"m\" \\p");
+    const std::string m_installed = m_root.path("in \"st\" \\alled \xc3\xbc");
+    const std::string m_tool = m_installed + "/NerovaMeasure.app/Contents/MacOS/NerovaMeasure";
+    const std::string m_strip = m_root.path("job/Str\xf6p 1.it8");
+    const std::string m_definition = m_root.path("job/NMPatchSetDefinition.it8");
+    const std::string m_samples = m_root.path("job/samples");
+    KZJobDataStruct m_job;
+    double m_seconds = 0;
+};
+
+TEST_F(MeasuringTool, IsAwaited) {
+    fs::copy_file(SCRIPTED_TOOL, m_tool);
+    const std::string kept = m_root.path("options");
+    setenv("SCRIPTED_TOOL_KEEPS", kept.c_str(), 1);
+    EXPECT_EQ(launch(), 0);
+    EXPECT_EQ(support::contentsOf(m_samples), "samples\n");
+    EXPECT_EQ(support::contentsOf(kept), "-apnm\nNerova Verify\n-l\n88\n-pwd\n\"\"\n-i\n" +
+                                             GetInstrumentNameFromID(21).utf8_string() +
+                                             "\n-m\nmeasure\n-o\n" + m_samples + "\n-patch\n" +
+                                             m_definition +
+                                             "\n-patchname\nStr\xf6p 1.it8\n-createchart4meas\n"
+                                             "False\n-forcemeasure\nTrue\n");
+    EXPECT_FALSE(hasDefinition());
+    EXPECT_TRUE(support::exists(m_root.path("job/NMPatchSetDefinition.dcf")));
+    // The options stay in the temporary folder.
+    EXPECT_EQ(support::contentsOf(optionsFile()), support::contentsOf(kept));
+}
+
+TEST_F(MeasuringTool, IsNotStartedTwice) {
+    const support::RunningProgram running(
+        m_root.copyProgram("/bin/sleep", "x/NerovaMeasure.app/y"));
+    writeTool("> '" + m_samples + "'");
+    int exitCode = 0;
+    EXPECT_FALSE(Helper::LaunchNerovaMeasure({}, exitCode, true));
+    EXPECT_EQ(exitCode, 1015);
+    EXPECT_EQ(launch(), -1);
+    EXPECT_FALSE(hasSamples() || hasDefinition());
+    EXPECT_EQ(optionsFile(), "");
+    EXPECT_EQ(running.endingSignal(), 0);
+}
+
+// Whatever becomes of the tool, only its samples tell.
+TEST_F(MeasuringTool, ThatEndsAtOnceIsNotNoticed) {
+    writeTool("kill -SEGV $$");
+    EXPECT_EQ(launch(), 0);
+    EXPECT_GE(m_seconds, 2.0);
+    EXPECT_FALSE(hasSamples() || hasDefinition());
+}
+
+TEST_F(MeasuringTool, ThatShowsUpLateIsNotAwaited) {
+    writeTool("sleep 2.8; > '" + m_samples + "'");
+    EXPECT_EQ(launch(), 0);
+    EXPECT_FALSE(hasSamples());
+    for (int i = 0; i < 1000 && !hasSamples(); ++i) {
+        usleep(10'000);
+    }
+    EXPECT_TRUE(hasSamples());
+}
+
+TEST_F(MeasuringTool, ThatMayNotBeExecutedIsPassedOver) {
+    writeTool("> '" + m_samples + "'", 0644);
+    testing::internal::CaptureStderr();
+    EXPECT_EQ(launch(), 0);
+    EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+    EXPECT_FALSE(hasSamples() || hasDefinition());
+}
+
+TEST_F(MeasuringTool, NeedsAStripAndAProgram) {
+    // There is a folder for it, then there is none.
+    int exitCode = 0;
+    EXPECT_FALSE(Helper::LaunchNerovaMeasure({}, exitCode, true));
+    EXPECT_EQ(exitCode, 1000);
+    EXPECT_EQ(launch(), -2);
+    EXPECT_FALSE(hasSamples() || hasDefinition());
+    fs::remove_all(m_installed);
+    exitCode = 7;
+    EXPECT_FALSE(Helper::LaunchNerovaMeasure({}, exitCode, true));
+    EXPECT_EQ(exitCode, 7);
+    EXPECT_EQ(launch(), -2);
+    EXPECT_FALSE(hasDefinition());
+
+    writeFile(m_samples, "old");
+    writeFile(m_strip, "no size");
+    EXPECT_EQ(launch(), -4);
+    EXPECT_TRUE(hasDefinition());
+    m_job.controlStripFile.clear();
+    EXPECT_EQ(launch(), -3);
+    EXPECT_TRUE(hasSamples()) << "nothing was to take their place";
+}
+
+TEST_F(MeasuringTool, GivesAStripOfTheDefinitionsNameBack) {
+    for (const bool isLink : {false, true}) {
+        if (isLink) {
+            fs::remove(m_strip);
+            fs::create_symlink(m_definition, m_strip);
+        } else {
+            m_job.controlStripFile = wide(m_definition);
+        }
+        for (const std::string strip : {"NUMBER_OF_COLS 1\nx", "no size"}) {
+            writeFile(m_definition, strip);
+            EXPECT_EQ(launch(), strip == "no size" ? -4 : -2);
+            EXPECT_EQ(support::contentsOf(m_definition), strip);
+        }
+        m_job.controlStripFile = wide(m_strip);
+    }
+}
+
+TEST(MeasuringToolLanguage, IsNumbered) {
+    KZJobDataStruct job;
+    const std::string languages[] = {"en_US", "fr_FR", "it_IT", "ja_JP", "zh_TW", "zh_CN", "ko_KR",
+                                     "de_DE", "es_ES", "pt_BR", "pt_PT", "nl_NL", "ru_RU", "tr_TR",
+                                     "cs_CZ", "pl_PL", "",      "de_de", "de"};
+    std::string numbers;
+    for (const std::string& language : languages) {
+        job.language = language;
+        numbers += std::to_string(GetLanguageID(&job)) + " ";
+    }
+    EXPECT_EQ(numbers, "59 79 109 111 45 46 124 88 179 154 153 55 159 214 53 152 57 57 57 ");
+}
+
+} // namespace
