@@ -227,23 +227,23 @@ void writeColumns(const StripTicket& ticket, const measurementDataRecord& measur
 /// Only a measurement with spectra has its patches written, XYZ, Lab and device values included.
 /// The first patch tells the range of all spectra.
 void writePatches(const StripTicket& ticket, const measurementDataRecord& measurement) {
-    const auto& [unused, base, stepsize, length] = measurement.spectral[0];
+    const spectralRow& first = measurement.spectral[0];
     const int patches = measurement.numPatches;
-    ticket.write("SpectralValues/Stepsize", stepsize);
-    ticket.write("SpectralValues/Base", base);
-    ticket.write("SpectralValues/Length", length);
+    ticket.write("SpectralValues/Stepsize", first.stepsize);
+    ticket.write("SpectralValues/Base", first.base);
+    ticket.write("SpectralValues/Length", first.length);
     ticket.write("Numpatches", patches);
     if (patches > mostPatches) {
         return;
     }
-    const std::size_t count = static_cast<std::size_t>(patches) * std::max(length, 1);
+    const std::size_t count = static_cast<std::size_t>(patches) * std::max(first.length, 1);
     const std::unique_ptr<double[]> values(new (std::nothrow) double[count]);
     if (values == nullptr) {
         return;
     }
     double* end = values.get();
     for (int i = 0; i < patches; ++i) {
-        end = std::copy_n(measurement.spectral[i].values, length, end);
+        end = std::copy_n(measurement.spectral[i].values, first.length, end);
     }
     ticket.writeArray("SpectralValues/DValues", static_cast<int>(end - values.get()), values.get());
     writeColumns(ticket, measurement, values.get());

@@ -67,6 +67,13 @@ std::string SuiteRoot::makeBundle(const std::string& name, const std::string& sh
     return path(name);
 }
 
+void SuiteRoot::installCommBundle(const std::string& bundle) const {
+    writePreferences("Qen/com.qen.packageversion.plist",
+                     {{"Nerova Hue Workbench/library_path", path("suite")}});
+    fs::create_directories(path("suite/lib"));
+    fs::create_directory_symlink(bundle, path("suite/lib/ComGUI.Bundle"));
+}
+
 std::string SuiteRoot::copyProgram(const std::string& program, const std::string& name) const {
     fs::create_directories(fs::path(path(name)).parent_path());
     fs::copy_file(program, path(name), fs::copy_options::overwrite_existing);

@@ -33,6 +33,9 @@ class SuiteRoot {
     std::string makeBundle(const std::string& name, const std::string& sharedObject,
                            const std::string& entries) const;
 
+    /// Puts a comm bundle where the tool looks for it, as a link, and says so in the Library.
+    void installCommBundle(const std::string& bundle) const;
+
     /// Copies a program to a name in the root and returns its path.
     std::string copyProgram(const std::string& program, const std::string& name) const;
 

@@ -1,0 +1,107 @@
+// A job on a store of the test's own, and a processor that reaches it through the real comm bundle.
+#pragma once
+
+#include <charconv>
+#include <map>
+#include <memory>
+#include <optional>
+#include <sstream>
+#include <string>
+#include <utility>
+
+#include <gtest/gtest.h>
+
+#include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "SuiteRoot.h"
+#include "TicketText.h"
+#include "cli/CLogger.h"
+#include "comgui/StoreEngine.h"
+#include "comgui/StoreKeep.h"
+#include "comgui/Users.h"
+#include "job/KZVerifyJobProcessor.h"
+
+class JobOnStore : public testing::Test {
+  protected:
+    static constexpr int job = 7;
+
+    JobOnStore() {
+        root.installPlistReader(PLIST_READER);
+        root.installCommBundle(COMGUI_BUNDLE);
+        store::makeStore(address, "Press room");
+        const auto made = store::openStore(address);
+        made->putUser({"press", hash, false});
+        made->create(3, job);
+        connect();
+    }
+
+    void connect() {
+        engine = store::openStore(address);
+        CLogger::InitLogger(logPath()); // Once one is open, the processor opens none of its own.
+        processor.emplace();
+        processor->m_connector = new CKZConnector(std::wstring(address.begin(), address.end()),
+                                                  L"press", L"room", 0x5071103, false, false);
+        EXPECT_TRUE(processor->m_connector->IsLoggedIn());
+    }
+
+    /// Before a process is forked, which must not go on with our connections.
+    void disconnect() {
+        processor.reset();
+        engine.reset();
+    }
+
+    /// Sends a table, in the words of TicketText.h.
+    void set(const std::string& records, int id = job) const {
+        store::StoreKeep keep(engine);
+        support::RecordTable table(records);
+        ASSERT_TRUE(keep.apply(3, id, table.records())) << records;
+    }
+
+    /// A ticket's keys, each with its elements: 5,6 are ints, 5.0 is a double, 'a a text.
+    std::map<std::string, std::string> keys(int id = job) const {
+        std::map<std::string, std::string> all;
+        const auto content = engine->content(3, id, store::KeyFilter());
+        for (const auto& [key, elements] : content->keys()) {
+            std::string& text = all[key];
+            elements->visit([&](int, const store::Value& value) {
+                text += (text.empty() ? "" : ",") + shown(value);
+                return true;
+            });
+        }
+        return all;
+    }
+
+    /// The log's messages since the last time.
+    std::string takeLog() const {
+        CLogger::DeleteLogger();
+        std::istringstream lines(support::contentsOf(logPath()));
+        std::string text;
+        for (std::string line; std::getline(lines, line);) {
+            text += line.substr(line.find(":\t") + 2) + "\n";
+        }
+        CLogger::InitLogger(logPath());
+        return text;
+    }
+
+    const support::SuiteRoot root;
+    const std::string address = root.path("store");
+    std::shared_ptr<store::StoreEngine> engine;
+    std::optional<KZVerifyJobProcessor> processor;
+
+  private:
+    std::string logPath() const { return root.path("log"); }
+
+    static std::string shown(const store::Value& value) {
+        if (const auto* number = std::get_if<double>(&value)) {
+            char digits[40];
+            const std::string text(digits, std::to_chars(digits, std::end(digits), *number).ptr);
+            return text.find_first_of(".en") == std::string::npos ? text + ".0" : text;
+        }
+        if (const auto* text = std::get_if<store::Text>(&value)) {
+            return "'" + text->bytes->text;
+        }
+        return std::to_string(std::get<int>(value));
+    }
+
+    /// Hashing is slow by intent.
+    inline static const std::string hash = store::passwordHash("room");
+};
