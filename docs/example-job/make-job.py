@@ -151,6 +151,8 @@ def strip_keys(arguments, preset_id, suffix):
     }
     if arguments.parent:
         keys["Footer/Nesting/ControlstripMode"] = {"int": 1}
+        # Without it the nested strip is not looked for, nor are the parent's other jobs.
+        keys["Footer/Nesting/PSDAssessment"] = {"string": ""}
         keys[f"Footer/Nesting/ControlstripFile{suffix}"] = {"string": f"{STRIP}.it8"}
     if is_profile(arguments.references):
         keys[f"Footer/ControlstripInputProfile{suffix}"] = {
