@@ -68,10 +68,21 @@ std::size_t findLine(const Lines& lines, const char* word, std::size_t first, st
     return first;
 }
 
-/// True for a column of references: Lab, XYZ, or a spectral value, told by its wavelength.
-bool isReference(std::string name) {
+std::string upperCase(std::string name) {
     std::transform(name.begin(), name.end(), name.begin(),
                    [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
+    return name;
+}
+
+bool isDevice(const std::string& name) {
+    const std::string upper = upperCase(name);
+    return upper.starts_with("CMYK") || upper.starts_with("RGB") || upper.starts_with("SPOT") ||
+           upper.find("CLR") != upper.npos;
+}
+
+/// True for a column of references: Lab, XYZ, or a spectral value, told by its wavelength.
+bool isReference(std::string name) {
+    name = upperCase(std::move(name));
     for (const char* start : {"LAB_", "XYZ_", "CIE", "SPECTRAL"})
         if (name.starts_with(start))
             return true;
@@ -87,6 +98,8 @@ bool isReference(std::string name) {
 /// Takes away the meaning of the references' columns. Returns the number of columns up to the last
 /// one that is none, or 0 where the names are not parted by one tab each.
 std::size_t hideReferences(std::string& names) {
+    if (names.find('"') != names.npos)
+        return 0; // a name may have blanks in it
     std::string hidden;
     std::size_t count = 0;
     std::size_t needed = 0;
@@ -97,7 +110,7 @@ std::size_t hideReferences(std::string& names) {
         const bool reference = isReference(name);
         tabs = tabs && (end == names.size() || names[end] == '\t') &&
                (at == 0 || names[at - 1] == '\t') && (at < 2 || names[at - 2] != '\t');
-        hidden += (count == 0 ? "" : "\t") + (reference ? "-" : name);
+        hidden.append(count == 0 ? "" : "\t").append(reference ? "-" : name);
         ++count;
         needed = reference ? needed : count;
         at = end;
@@ -141,6 +154,18 @@ Lines takeFillings(Lines& lines, std::size_t firstRow, std::size_t lastRow) {
     return numbers;
 }
 
+/// Where device values end a row, what was cut off is theirs, and the black of 100 reads 10.
+void checkUncut(const std::string& names, std::span<const std::string> rows) {
+    if (!isDevice(names.substr(names.find_last_of(" \t") + 1)))
+        return;
+    for (std::size_t row = 0; row < rows.size(); ++row)
+        if (std::any_of(rows[row].begin(), rows[row].end(), [](char c) { return (c & 0x80) != 0; }))
+            throw Failure(Status::BadDefinition,
+                          "row " + std::to_string(row + 1) +
+                              " of the definition has lost the end of its device values to a name "
+                              "of several bytes a character: in the strip, names go behind them");
+}
+
 /// Makes a text that the reader of colour files takes whole. Returns the numbers of filling rows.
 Lines prepare(Lines& lines) {
     const std::size_t format = findLine(lines, "BEGIN_DATA_FORMAT", 0, lines.size());
@@ -154,6 +179,7 @@ Lines prepare(Lines& lines) {
     const std::size_t cells = hideReferences(lines[names]);
     Lines numbers = takeFillings(lines, firstRow, lastRow);
     const auto rows = std::span(lines).subspan(firstRow, lastRow - firstRow - numbers.size());
+    checkUncut(lines[names], rows);
     const bool tabs = std::all_of(rows.begin(), rows.end(), [](const std::string& row) {
         return row.empty() || row.find('\t') != row.npos;
     });

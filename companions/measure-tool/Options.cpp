@@ -26,12 +26,15 @@ constexpr std::size_t largestFile = 1 << 20;
 
 std::string takeLine(std::string_view& rest) {
     const std::size_t end = rest.find('\n');
-    const std::string line(rest.substr(0, end));
+    std::string line(rest.substr(0, end));
     rest.remove_prefix(end == rest.npos ? rest.size() : end + 1);
     return line;
 }
 
 std::map<std::string, std::string> pairsOf(const std::string& path) {
+    const auto refuse = [&](const std::string& problem) {
+        throw Failure(Status::BadOptions, path + " has " + problem);
+    };
     std::string bytes;
     expectUsable(colour::readWholeFile(path, largestFile, bytes), Status::BadOptions, path);
     std::map<std::string, std::string> pairs;
@@ -39,11 +42,11 @@ std::map<std::string, std::string> pairsOf(const std::string& path) {
         const std::string name = takeLine(rest);
         // A value with a line break in it shifts all that follows.
         if (name.size() < 2 || name.front() != '-')
-            throw Failure(Status::BadOptions, path + " has \"" + name + "\" for an option's name");
+            refuse("\"" + name + "\" for an option's name");
         if (rest.empty())
-            throw Failure(Status::BadOptions, path + " has no value for " + name);
+            refuse("no value for " + name);
         if (!pairs.emplace(name, takeLine(rest)).second)
-            throw Failure(Status::BadOptions, path + " has " + name + " twice");
+            refuse(name + " twice");
     }
     return pairs;
 }
@@ -57,7 +60,7 @@ Options readOptions(const std::string& path) {
         return found == pairs.end() ? std::string() : found->second;
     };
     const auto needed = [&](const char* name) {
-        const std::string value = valueOf(name);
+        std::string value = valueOf(name);
         if (value.empty())
             throw Failure(Status::BadOptions, path + " has no " + name);
         return value;

@@ -180,7 +180,7 @@ std::string configurationFolder() {
 } // namespace
 
 std::string settingsPath() {
-    if (const std::string named = valueOf("TINTGATE_MEASURE"); !named.empty())
+    if (std::string named = valueOf("TINTGATE_MEASURE"); !named.empty())
         return named;
     const std::string places[] = {
         platform::underRoot("/Library/Preferences/NerovaMeasure.conf"),

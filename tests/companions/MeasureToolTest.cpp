@@ -251,6 +251,9 @@ TEST_F(MeasureTool, RefusesOtherDefinitions) {
         {crlf(head + format(cmyk) + "BEGIN_DATA\nEND_DATA\n"), 4, "has no patches"},
         {crlf(head + format(cmyk) + "BEGIN_DATA\n1\t100\t\n2\t40\t27\t27\t0\nEND_DATA\n"), 4,
          "is damaged"},
+        {crlf(head + format("SAMPLE_NAME\t" + cmyk) +
+              "BEGIN_DATA\n1\tGr\xc3\xbcn\t0\t0\t0\t10\nEND_DATA\n"),
+         4, "row 1 of the definition has lost"},
         {crlf(head + format(cmyk) + "BEGIN_DATA\n1\t100\tx\t0\t0\nEND_DATA\n"), 4, "has a text"},
         {crlf(head + format("LAB_L\tLAB_A\tLAB_B") + "BEGIN_DATA\n1\t50\t0\t0\nEND_DATA\n"), 5,
          "other colorants"},
