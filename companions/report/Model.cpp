@@ -51,10 +51,6 @@ std::string formulaTitle(const std::string& formula) {
     return formula == "CIECMC_2_1" ? "CMC 2:1" : formula;
 }
 
-std::string unitOf(const Criterion& criterion, const std::string& differences) {
-    return criterion.unit == "dH" ? "ΔH*ab" : criterion.unit == "dCh" ? "ΔCh" : differences;
-}
-
 const char* wordOf(Outcome outcome) {
     switch (outcome) {
     case Outcome::Pass:
@@ -83,7 +79,7 @@ std::string deviceText(const Result& result, std::size_t patch) {
 Figure figureOf(const Criterion& criterion, const Result& result) {
     Figure figure;
     figure.title = criterion.title;
-    figure.unit = unitOf(criterion, differenceUnit(result.formula));
+    figure.unit = unitOf(criterion, result.formula);
     figure.outcome = criterion.outcome;
     figure.word = wordOf(criterion.outcome);
     figure.patches = criterion.patches;
@@ -136,9 +132,9 @@ void sayVerdict(Model& model, Verdict verdict) {
         }
     }
     const std::size_t all = model.judged.size();
+    model.word = report::wordOf(verdict);
     switch (verdict) {
     case Verdict::Passed:
-        model.word = "Passed";
         model.sentence =
             all == 1 ? "The one criterion is within its tolerance."
                      : "All " + std::to_string(all) + " criteria are within their tolerances.";
@@ -149,12 +145,10 @@ void sayVerdict(Model& model, Verdict verdict) {
         }
         return;
     case Verdict::Failed:
-        model.word = "Failed";
         model.sentence = std::to_string(failed) + " of " +
                          counted(all, "criterion is", "criteria are") + " above tolerance.";
         return;
     case Verdict::Incomplete:
-        model.word = "Incomplete";
         if (all == 0)
             model.sentence = "The preset judges no criterion, so nothing can pass.";
         else
@@ -313,6 +307,12 @@ void addHead(Model& model, const Result& result, const Meta* meta) {
 
 } // namespace
 
+const char* wordOf(Verdict verdict) {
+    return verdict == Verdict::Passed   ? "Passed"
+           : verdict == Verdict::Failed ? "Failed"
+                                        : "Incomplete";
+}
+
 std::string labelOf(const Result& result, std::size_t index) {
     const Patch& patch = result.patches[index];
     const std::string device = deviceText(result, index);
@@ -331,14 +331,25 @@ std::string fixedText(double value, int decimals) {
     return error == std::errc() ? std::string(text, end) : dash;
 }
 
-std::string dateText(const std::string& created) {
+std::string unitOf(const Criterion& criterion, const std::string& formula) {
+    return criterion.unit == "dH"    ? "ΔH*ab"
+           : criterion.unit == "dCh" ? "ΔCh"
+                                     : differenceUnit(formula);
+}
+
+std::string dayText(int day, int month, int year) {
     static constexpr const char* months[] = {"January",   "February", "March",    "April",
                                              "May",       "June",     "July",     "August",
                                              "September", "October",  "November", "December"};
-    const int month = std::stoi(created.substr(5, 2));
-    const std::string name = month >= 1 && month <= 12 ? months[month - 1] : created.substr(5, 2);
-    return std::to_string(std::stoi(created.substr(8, 2))) + ' ' + name + ' ' +
-           created.substr(0, 4) + ", " + created.substr(11, 5) + " (UTC" + created.substr(19) + ")";
+    return std::to_string(day) + ' ' +
+           (month >= 1 && month <= 12 ? months[month - 1] : std::to_string(month)) + ' ' +
+           std::to_string(year);
+}
+
+std::string dateText(const std::string& created) {
+    return dayText(std::stoi(created.substr(8, 2)), std::stoi(created.substr(5, 2)),
+                   std::stoi(created.substr(0, 4))) +
+           ", " + created.substr(11, 5) + " (UTC" + created.substr(19) + ")";
 }
 
 std::vector<Bin> histogramOf(const std::vector<double>& values) {

@@ -86,11 +86,20 @@ Model makeModel(const Result& result, const Meta* meta);
 /// about 12 to 30 of them. Values that are not finite are left out, negative ones count as 0.
 std::vector<Bin> histogramOf(const std::vector<double>& values);
 
+/// "Passed", "Failed", "Incomplete".
+const char* wordOf(Verdict verdict);
+
 /// A patch for a person: its id and name or, without either, its row; then its device values.
 std::string labelOf(const Result& result, std::size_t patch);
 
 /// Fixed decimals with a point in every locale; "–" where not finite.
 std::string fixedText(double value, int decimals);
+
+/// "1 May 2024"
+std::string dayText(int day, int month, int year);
+
+/// What a criterion is measured in, such as "ΔE00" under the formula "CIE2000".
+std::string unitOf(const Criterion& criterion, const std::string& formula);
 
 /// 2024-05-01T12:34:56+02:00 as "1 May 2024, 12:34 (UTC+02:00)".
 std::string dateText(const std::string& created);

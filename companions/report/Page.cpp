@@ -1,61 +1,21 @@
 #include "companions/report/Page.h"
 
-#include <charconv>
 #include <cmath>
 
-#include <nlohmann/json.hpp>
-
+#include "companions/report/InPage.h"
 #include "companions/report/Template.h"
 
 namespace report {
 namespace {
 
-using Json = nlohmann::ordered_json;
+using Json = PageJson;
 
 constexpr std::string_view summaryStart = R"(<script type="application/json" id="summary">)";
 constexpr std::size_t longestText = 500; ///< Of a text in a summary, in bytes.
 
-/// JSON that can stand in a script element: nothing in it can end the element or open a comment.
-std::string inScript(const Json& json) {
-    std::string safe;
-    for (const char c : json.dump(-1, ' ', true, Json::error_handler_t::replace))
-        switch (c) {
-        case '<':
-            safe += "\\u003c";
-            break;
-        case '>':
-            safe += "\\u003e";
-            break;
-        case '&':
-            safe += "\\u0026";
-            break;
-        default:
-            safe += c;
-        }
-    return safe;
-}
-
-void appendNumber(std::string& text, double value) {
-    char digits[32];
-    if (!std::isfinite(value))
-        text += "null";
-    else
-        text.append(digits, std::to_chars(digits, digits + sizeof digits, value).ptr);
-}
-
 /// Measured less target, without the noise that a subtraction adds behind the sixth decimal.
 double less(double measured, double target) {
     return std::round((measured - target) * 1e6) / 1e6;
-}
-
-void appendSwatch(std::string& text, const Swatch& swatch) {
-    static constexpr char digits[] = "0123456789abcdef";
-    text += "\"#";
-    for (const std::uint8_t channel : {swatch.red, swatch.green, swatch.blue}) {
-        text += digits[channel >> 4];
-        text += digits[channel & 15];
-    }
-    text += swatch.clipped ? "!\"" : "\"";
 }
 
 /// Rows are the bulk of a page, so they are written without a tree:
@@ -87,30 +47,7 @@ void appendRow(std::string& text, const Result& result, const Row& row) {
           less(patch.measured.b, patch.target.b)});
     appendNumber(text, patch.difference);
     text += ',';
-    appendSwatch(text, row.target);
-    text += ',';
-    appendSwatch(text, row.measured);
-    text += ']';
-}
-
-const char* keyOf(Verdict verdict) {
-    return verdict == Verdict::Passed   ? "passed"
-           : verdict == Verdict::Failed ? "failed"
-                                        : "incomplete";
-}
-
-const char* keyOf(Outcome outcome) {
-    switch (outcome) {
-    case Outcome::Pass:
-        return "passed";
-    case Outcome::Fail:
-        return "failed";
-    case Outcome::Unanswered:
-        return "incomplete";
-    case Outcome::Unjudged:
-        break;
-    }
-    return "unjudged";
+    text += '"' + swatchText(row.target) + "\",\"" + swatchText(row.measured) + "\"]";
 }
 
 Json figures(const std::vector<Figure>& figures) {
@@ -200,22 +137,6 @@ Json summaryJson(const Summary& summary) {
     return {{"verdict", keyOf(summary.verdict)},       {"word", summary.word},
             {"sentence", shortened(summary.sentence)}, {"title", shortened(summary.title)},
             {"subtitle", shortened(summary.subtitle)}, {"created", summary.created}};
-}
-
-/// A relative URL of a path: its bytes, with all that means something in a URL escaped.
-std::string linkTo(const std::string& path) {
-    static constexpr char digits[] = "0123456789ABCDEF";
-    std::string url = "./";
-    for (const char c : path) {
-        const auto byte = static_cast<unsigned char>(c);
-        const bool plain = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
-                           (c >= '0' && c <= '9') || c == '/' || c == '-' || c == '.' || c == '_';
-        if (plain)
-            url += c;
-        else
-            url += {'%', digits[byte >> 4], digits[byte & 15]};
-    }
-    return url;
 }
 
 } // namespace

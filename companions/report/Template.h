@@ -7,5 +7,6 @@ namespace report {
 
 extern const std::string_view pageTemplate[3];  ///< Summary, then data.
 extern const std::string_view indexTemplate[2]; ///< The list of reports.
+extern const std::string_view trendTemplate[2]; ///< The trend's data.
 
 } // namespace report

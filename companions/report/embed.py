@@ -67,7 +67,8 @@ def definition(name, pieces):
 def main(folder, chart, output):
     source = '#include "companions/report/Template.h"\n\nnamespace report {\n'
     source += definition("pageTemplate", assemble(Path(folder), "page.html", Path(chart)))
-    source += definition("indexTemplate", assemble(Path(folder), "index.html", Path(chart)))
+    for name in ("index", "trend"):
+        source += definition(f"{name}Template", assemble(Path(folder), f"{name}.html", Path(chart)))
     Path(output).write_text(source + "} // namespace report\n")
 
 

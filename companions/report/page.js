@@ -4,19 +4,11 @@
 // markup.
 (() => {
   const data = JSON.parse(document.getElementById("data").textContent);
-  const byId = (id) => document.getElementById(id);
-  const signs = { passed: "✓", failed: "✕", incomplete: "?", unjudged: "" };
+  const { byId, signs, make, badge, swatchPair, colourOf, hatch, drawAlways } = common;
 
   // Fields of a row.
   const [INDEX, ID, NAME, DEVICE, TARGET, MEASURED, DELTA, DIFFERENCE, TARGET_SWATCH,
     MEASURED_SWATCH] = Array(10).keys();
-
-  function make(tag, className, text) {
-    const element = document.createElement(tag);
-    if (className) element.className = className;
-    if (text !== undefined) element.textContent = text;
-    return element;
-  }
 
   const fixed = (value, decimals) =>
     value === null ? "–" : value.toFixed(decimals).replace(/^-(0\.?0*)$/, "$1");
@@ -53,9 +45,8 @@
 
   function criterionRow(figure) {
     const row = make("tr", figure.outcome);
-    const badge = make("td");
-    const sign = signs[figure.outcome];
-    badge.append(make("span", `badge ${figure.outcome}`, `${sign} ${figure.word}`.trim()));
+    const outcome = make("td");
+    outcome.append(badge(figure.outcome, figure.word));
     const value = make("td", "number", `${figure.value} `);
     value.append(make("span", "unit", figure.unit));
     const bar = make("td");
@@ -64,7 +55,7 @@
       track.appendChild(make("i")).style.width = `${100 * figure.fill}%`;
       bar.append(make("span", "distance", figure.distance));
     }
-    row.append(badge, make("td", "", figure.title), value,
+    row.append(outcome, make("td", "", figure.title), value,
       make("td", "number", figure.tolerance), bar, make("td", "", figure.worst));
     return row;
   }
@@ -112,13 +103,8 @@
       } },
     { title: "Target, measured", kind: "swatches", order: byNumber((row) => row[TARGET][0]),
       fill(cell, row) {
-        const pair = cell.appendChild(make("div", "pair"));
-        for (const [side, swatch] of [["Target", row[TARGET_SWATCH]],
-          ["Measured", row[MEASURED_SWATCH]]]) {
-          const half = pair.appendChild(make("span", swatch.endsWith("!") ? "clipped" : ""));
-          half.style.backgroundColor = swatch.slice(0, 7);
-          half.title = half.className ? `${side}: beyond what an sRGB screen shows` : side;
-        }
+        cell.append(swatchPair([["Target", row[TARGET_SWATCH]],
+          ["Measured", row[MEASURED_SWATCH]]]));
       } },
     { title: channels, kind: "device", hidden: data.channels.length === 0,
       order: (a, b) => a[DEVICE].reduce((found, value, i) => found || value - b[DEVICE][i], 0),
@@ -222,27 +208,8 @@
 
   // ---- Charts
 
-  const colourOf = (name) =>
-    getComputedStyle(document.documentElement).getPropertyValue(name).trim();
   const number = { type: "linear", ticks: { maxTicksLimit: 9 } };
   let charts = [];
-
-  // Bars at or above the first limit are hatched, so that they stand out in grey too.
-  function hatch(colour) {
-    const tile = document.createElement("canvas");
-    tile.width = tile.height = 8;
-    const pen = tile.getContext("2d");
-    pen.fillStyle = colour;
-    pen.globalAlpha = 0.3;
-    pen.fillRect(0, 0, 8, 8);
-    pen.globalAlpha = 1;
-    pen.strokeStyle = colour;
-    pen.lineWidth = 2.4;
-    pen.beginPath();
-    for (const shift of [-8, 0, 8]) { pen.moveTo(shift, 8); pen.lineTo(shift + 8, 0); }
-    pen.stroke();
-    return pen.createPattern(tile, "repeat");
-  }
 
   const markLines = {
     id: "markLines",
@@ -273,6 +240,7 @@
     },
   };
 
+  // Bars at or above the first limit are hatched.
   function drawHistogram() {
     const limits = data.marks.filter((mark) => mark.limit).map((mark) => mark.value);
     const limit = limits.length ? Math.max(...limits) : Infinity;
@@ -395,24 +363,10 @@
   function drawCharts() {
     for (const chart of charts) chart.destroy();
     charts = [];
-    Chart.defaults.animation = false;
-    const printing = document.documentElement.classList.contains("printing");
-    Chart.defaults.devicePixelRatio = printing ? 3 : devicePixelRatio;
-    Chart.defaults.maintainAspectRatio = false;
-    Chart.defaults.plugins.legend.display = false;
-    Chart.defaults.font.family = getComputedStyle(document.body).fontFamily;
-    Chart.defaults.color = colourOf("--soft");
-    Chart.defaults.borderColor = colourOf("--faint");
     drawHistogram();
     drawPlane();
     drawLightness();
     byId("drawn").textContent = data.drawnText;
-  }
-
-  // On paper the page is light, and the charts have the sizes of their own.
-  function turnPrinting(on) {
-    document.documentElement.classList.toggle("printing", on);
-    drawCharts();
   }
 
   showHead();
@@ -420,8 +374,5 @@
   showPatches();
   showSections();
   document.querySelector("main").hidden = false;
-  drawCharts();
-  addEventListener("beforeprint", () => turnPrinting(true));
-  addEventListener("afterprint", () => turnPrinting(false));
-  matchMedia("(prefers-color-scheme: dark)").addEventListener("change", drawCharts);
+  drawAlways(drawCharts);
 })();

@@ -1,0 +1,152 @@
+#include <cmath>
+#include <limits>
+#include <random>
+#include <string>
+#include <vector>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+
+#include "companions/report/Drift.h"
+#include "companions/report/Trend.h"
+
+namespace {
+
+using namespace report;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+constexpr double none = std::numeric_limits<double>::quiet_NaN();
+
+// The example of the NIST/SEMATECH e-Handbook of Statistical Methods, 6.3.2.4.
+TEST(Drift, AveragesAsTheHandbookDoes) {
+    const std::vector<double> data = {52.0, 47.0, 53.0, 49.3, 50.1, 47.0, 51.0, 50.1, 51.2, 50.5,
+                                      49.6, 47.6, 49.9, 51.3, 47.8, 51.2, 52.6, 52.4, 53.6, 52.1};
+    const std::vector<double> published = {50.60, 49.52, 50.56, 50.18, 50.16, 49.21, 49.75,
+                                           49.85, 50.26, 50.33, 50.11, 49.36, 49.52, 50.05,
+                                           49.38, 49.92, 50.73, 51.23, 51.94, 51.99};
+    const std::vector<double> averages = movingAverage(data, 50, 0.3);
+    ASSERT_EQ(averages.size(), published.size());
+    for (std::size_t i = 0; i < published.size(); ++i)
+        EXPECT_NEAR(averages[i], published[i], 0.006) << i;
+    EXPECT_THAT(movingAverage({1, none, 1}, 0, 0.5), ElementsAre(0.5, 0.5, 0.75));
+}
+
+TEST(Drift, SeesASlowMoveAndRarelyAnythingElse) {
+    std::mt19937 random(7);
+    std::normal_distribution<double> noise(0, 0.3);
+    constexpr int rounds = 1000;
+    int false_alarms = 0;
+    int seen = 0;
+    double scatter = 0;
+    for (int round = 0; round < rounds; ++round) {
+        std::vector<double> still, moving;
+        for (int i = 0; i < 60; ++i) {
+            still.push_back(noise(random));
+            moving.push_back(noise(random) + (i > 20 ? 1.0 * (i - 20) / 40 : 0));
+        }
+        moving[30] = none;
+        false_alarms += driftOf(still).significant;
+        seen += driftOf(moving).significant;
+        scatter += scatterOf(moving) / rounds;
+    }
+    EXPECT_LT(false_alarms, rounds / 50);
+    EXPECT_GT(seen, rounds * 95 / 100);
+    EXPECT_NEAR(scatter, 0.3, 0.02); // The drift does not count as scatter.
+
+    EXPECT_FALSE(driftOf({0, 0, 0, 0, 0, 5, 5, 5, 5}).significant); // Too few to say.
+    EXPECT_TRUE(driftOf({0, 0, 0, 0, 0, 5, 5, 5, 5, 5}).significant);
+    EXPECT_FALSE(driftOf(std::vector<double>(50, 3.25)).significant);
+    EXPECT_TRUE(std::isnan(driftOf({none, none}).began));
+}
+
+TEST(Ink, IsToldByDeviceValues) {
+    const struct {
+        std::vector<double> device;
+        std::optional<Ink> ink;
+    } cases[] = {{{0, 0, 0, 0}, Ink::Paper},
+                 {{99.6, 0.4, 0, 0}, Ink::Cyan},
+                 {{0, 100, 0, 0}, Ink::Magenta},
+                 {{0, 0, 100, 0}, Ink::Yellow},
+                 {{0, 0, 0, 100, 0}, Ink::Black},
+                 {{99, 0, 0, 0}, {}},
+                 {{100, 100, 0, 0}, {}},
+                 {{100, 1, 0, 0}, {}},
+                 {{0, 0, 0, 0, 100}, {}},
+                 {{0, 0, 0}, {}},
+                 {{none, 0, 0, 0}, {}}};
+    for (const auto& [device, ink] : cases)
+        EXPECT_EQ(inkOf(device.data(), device.size()), ink) << device[0] << ' ' << device.size();
+}
+
+Sample sampleAt(int day, double value, double tolerance, const std::string& paper = "Matt") {
+    Sample sample;
+    sample.time = 1'770'000'000 + 86400 * day;
+    sample.title = "Job " + std::to_string(day);
+    sample.paper = paper;
+    sample.formula = "CIE2000";
+    Criterion cyan;
+    cyan.name = "solidCyan";
+    cyan.title = "Solid cyan";
+    cyan.unit = "dE";
+    cyan.used = true;
+    cyan.tolerance = tolerance;
+    cyan.value = value;
+    cyan.rounded = std::round(value * 100) / 100;
+    cyan.outcome = *cyan.rounded <= tolerance ? Outcome::Pass : Outcome::Fail;
+    sample.verdict = cyan.outcome == Outcome::Pass ? Verdict::Passed : Verdict::Failed;
+    sample.criteria = {cyan};
+    sample.inks[static_cast<std::size_t>(Ink::Cyan)] = colour::Lab{55 + value, -37, -50};
+    sample.inks[static_cast<std::size_t>(Ink::Paper)] = colour::Lab{95, 0, -2};
+    return sample;
+}
+
+TEST(Trend, SaysWhichInkDriftsAndComparesLikeWithLike) {
+    std::vector<Sample> samples;
+    for (int day = 39; day >= 0; --day) // In no order of time.
+        samples.push_back(sampleAt(day, day < 20 ? 0.5 : 0.5 + 0.15 * (day - 19), 3));
+    for (int day = 0; day < 50; ++day)
+        samples.push_back(sampleAt(day, 1, 3, "Gloss"));
+    samples.push_back(sampleAt(3, 1, 3, "Newsprint"));
+    const TrendModel trend = makeTrend(samples, "files", {});
+    ASSERT_EQ(trend.series.size(), 3u);
+
+    const Series& drifting = trend.series[0]; // In front of a longer one that is steady.
+    EXPECT_EQ(drifting.name, "Matt");
+    EXPECT_EQ(drifting.word, "Drifting: cyan");
+    EXPECT_EQ(trend.samples[drifting.samples[0]].title, "Job 0");
+    const InkTrend& cyan = drifting.inks[static_cast<std::size_t>(Ink::Cyan)];
+    EXPECT_EQ(cyan.movement, Movement::Drifting);
+    EXPECT_NEAR(cyan.began.L, 55.5, 1e-9);
+    EXPECT_THAT(cyan.sentence, HasSubstr("lighter (L* +"));
+    EXPECT_EQ(cyan.value, "3.50");
+    EXPECT_TRUE(cyan.above);
+    EXPECT_THAT(drifting.reasons, ElementsAre("Cyan: " + cyan.sentence,
+                                              "4 of the last 20 failed, most often by Solid cyan"));
+    EXPECT_EQ(drifting.inks[0].movement, Movement::Steady);
+    EXPECT_EQ(drifting.inks[2].word, "No data");
+    EXPECT_EQ(drifting.span, "2 February 2026 to 13 March 2026");
+
+    EXPECT_EQ(trend.series[1].word, "Steady");
+    EXPECT_THAT(trend.series[1].sentence, HasSubstr("Nearest to its limit: cyan, 1.00 of 3.00."));
+    EXPECT_EQ(trend.series[2].word, "Too few jobs");
+    EXPECT_EQ(nearestText(trend.samples[0]), "Solid cyan 0.50 of 3.00");
+}
+
+TEST(Trend, KeepsTheToleranceThatEachJobWasJudgedBy) {
+    std::vector<Sample> samples;
+    for (int day = 0; day < 12; ++day)
+        samples.push_back(sampleAt(day, 2.5, day < 6 ? 3 : 2.25));
+    samples[11].criteria[0].value.reset();
+    samples[11].criteria[0].rounded.reset();
+    samples[11].criteria[0].outcome = Outcome::Unanswered;
+    const TrendModel trend = makeTrend(samples, "files", {});
+    const CriterionTrend& cyan = trend.series[0].criteria[0];
+    EXPECT_THAT(cyan.tolerances, ElementsAre(std::pair(0u, 3.0), std::pair(6u, 2.25)));
+    EXPECT_EQ(cyan.failed, 5u);
+    EXPECT_EQ(cyan.answered, 11u);
+    EXPECT_TRUE(std::isnan(cyan.values[11]));
+    EXPECT_EQ(cyan.latest, "2.50");
+}
+
+} // namespace
