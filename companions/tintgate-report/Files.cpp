@@ -5,6 +5,7 @@
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
+#include <fstream>
 #include <memory>
 
 #include "colour/ColourFile.h"
@@ -39,6 +40,18 @@ report::Meta metaOf(const std::string& path) {
     if (auto meta = report::readMeta(bytesOf(path), problem))
         return *meta;
     throw Failure(Status::Broken, path + " is broken: " + problem);
+}
+
+/// Of a file met in a folder, where other JSON lies, too.
+bool beginsAsResult(const fs::directory_entry& entry) {
+    std::error_code ignored;
+    if (!entry.path().filename().string().ends_with(".json") || !entry.is_regular_file(ignored))
+        return false;
+    char start[512];
+    std::ifstream file(entry.path(), std::ios::binary);
+    file.read(start, sizeof start);
+    return std::string_view(start, static_cast<std::size_t>(file.gcount()))
+               .find("\"tintgate-result\"") != std::string_view::npos;
 }
 
 /// Standard output and whatever else is not a plain file.
@@ -90,30 +103,31 @@ LoadedResult loadResult(const std::string& path, const std::string& metaPath, st
     return loaded;
 }
 
-std::vector<FoundFile> filesOf(const std::vector<std::string>& arguments) {
-    std::vector<FoundFile> files;
+std::vector<std::string> filesOf(const std::vector<std::string>& arguments) {
+    std::vector<std::string> files;
     for (const std::string& argument : arguments) {
         std::error_code failure;
         if (!fs::is_directory(argument, failure)) {
-            files.push_back({argument, true});
+            files.push_back(argument);
             continue;
         }
         std::vector<std::string> inside;
         constexpr auto options = fs::directory_options::skip_permission_denied;
         for (fs::recursive_directory_iterator at(argument, options, failure), end;
-             !failure && at != end; at.increment(failure)) {
-            std::error_code ignored;
-            const std::string name = at->path().filename();
-            if (name.ends_with(".json") && name != "meta.json" && at->is_regular_file(ignored))
+             !failure && at != end; at.increment(failure))
+            if (beginsAsResult(*at))
                 inside.push_back(at->path());
-        }
         if (failure)
             throw Failure(Status::Unreadable, argument + " can't be read: " + failure.message());
         std::sort(inside.begin(), inside.end());
-        for (std::string& path : inside)
-            files.push_back({std::move(path), false});
+        files.insert(files.end(), inside.begin(), inside.end());
     }
     return files;
+}
+
+std::string relativeTo(const std::string& folder, const std::string& path) {
+    std::error_code failure;
+    return fs::relative(path, folder, failure).string();
 }
 
 void writeOutput(const std::string& path, std::string_view text) {

@@ -26,14 +26,13 @@ struct LoadedResult {
 /// result goes without. Throws Failure (Unreadable, Broken), for a meta file only if it is named.
 LoadedResult loadResult(const std::string& path, const std::string& metaPath, std::string& note);
 
-/// The files that the arguments mean, in their order: of a folder all "*.json" in it and in the
-/// folders below, by name, but no "meta.json". Links to folders are not followed. Throws Failure
-/// (Unreadable) for an argument that is not there.
-struct FoundFile {
-    std::string path;
-    bool named = false; ///< By an argument, not met in a folder.
-};
-std::vector<FoundFile> filesOf(const std::vector<std::string>& arguments);
+/// The files that the arguments mean, in their order: of a folder all results (named "*.json", with
+/// the format's name in their beginning) in it and in the folders below, by name. Links to folders
+/// are not followed. Throws Failure (Unreadable) for a folder that can't be read.
+std::vector<std::string> filesOf(const std::vector<std::string>& arguments);
+
+/// The path as seen from a folder.
+std::string relativeTo(const std::string& folder, const std::string& path);
 
 /// Writes to a file whole or not at all, or to standard output for "-". Devices and pipes are
 /// written in place. Throws Failure (NotWritten).

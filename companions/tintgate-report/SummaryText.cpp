@@ -12,7 +12,7 @@ using report::fixedText;
 constexpr std::size_t mostPatches = 5;
 
 struct Mark {
-    const char* sign;
+    std::string sign;
     Tone tone;
 };
 
@@ -63,7 +63,81 @@ std::string patchesText(const report::Model& model, const report::Result& result
            tableText(lines, paint);
 }
 
+// ---- Trends
+
+constexpr std::size_t mostJobs = 10;
+
+Mark markOf(report::Movement movement) {
+    return movement == report::Movement::Drifting ? Mark{"↗ ", Tone::Failed}
+           : movement == report::Movement::Steady ? Mark{"= ", Tone::Passed}
+                                                  : Mark{"? ", Tone::Open};
+}
+
+std::string inksText(const report::Series& series, const Painter& paint) {
+    std::vector<std::vector<Cell>> lines;
+    for (const report::InkTrend& ink : series.inks) {
+        const Mark mark = markOf(ink.movement);
+        lines.push_back({{mark.sign + ink.word, mark.tone},
+                         {report::inkName(ink.ink)},
+                         {ink.value, Tone::Bold, true},
+                         {ink.tolerance.empty() ? "" : "of " + ink.tolerance, Tone::Plain, true},
+                         {ink.above ? "above" : "", Tone::Failed},
+                         {ink.sentence, Tone::Soft}});
+    }
+    return tableText(lines, paint);
+}
+
+std::string criteriaText(const report::Series& series, const Painter& paint) {
+    std::vector<std::vector<Cell>> lines;
+    for (const report::CriterionTrend& criterion : series.criteria)
+        if (criterion.used)
+            lines.push_back({{criterion.title},
+                             {criterion.latest, Tone::Bold, true},
+                             {"of " + criterion.tolerance, Tone::Plain, true},
+                             {criterion.unit, Tone::Soft},
+                             {std::to_string(criterion.failed) + " of " +
+                                  std::to_string(criterion.answered) + " above",
+                              criterion.failed != 0 ? Tone::Failed : Tone::Soft}});
+    return lines.empty() ? "" : '\n' + tableText(lines, paint);
+}
+
+std::string jobsText(const report::TrendModel& trend, const report::Series& series,
+                     const Painter& paint) {
+    std::vector<std::vector<Cell>> lines;
+    for (std::size_t i = 0; i < std::min(mostJobs, series.samples.size()); ++i) {
+        const auto& sample = trend.samples[series.samples[series.samples.size() - 1 - i]];
+        const Mark mark = markOf(sample.verdict);
+        lines.push_back({{mark.sign + report::wordOf(sample.verdict), mark.tone},
+                         {report::timeText(sample.time), Tone::Soft},
+                         {sample.title},
+                         {report::nearestText(sample), Tone::Soft}});
+    }
+    return "\n" + paint(Tone::Bold, "Latest jobs") + "\n" + tableText(lines, paint);
+}
+
 } // namespace
+
+std::string trendText(const report::TrendModel& trend, const Painter& paint) {
+    std::string text;
+    for (const std::string& note : trend.notes)
+        text += paint(Tone::Open, "! ") + paint(Tone::Plain, note) + '\n';
+    for (const report::Series& series : trend.series) {
+        const bool bad = series.failing && series.movement == report::Movement::Steady;
+        const Mark mark = bad ? markOf(report::Verdict::Failed) : markOf(series.movement);
+        text += (text.empty() ? "" : "\n") + paint(mark.tone, mark.sign + series.word) + "  " +
+                paint(Tone::Bold, series.name) + '\n' +
+                paint(Tone::Soft, std::to_string(series.samples.size()) + " results, " +
+                                      series.span + ": " + std::to_string(series.passed) +
+                                      " passed, " + std::to_string(series.failed) + " failed, " +
+                                      std::to_string(series.incomplete) + " incomplete") +
+                '\n' + paint(Tone::Plain, series.sentence) + '\n';
+        for (const std::string& reason : series.reasons)
+            text += "  " + paint(Tone::Plain, reason) + '\n';
+        text += '\n' + inksText(series, paint) + criteriaText(series, paint) +
+                jobsText(trend, series, paint);
+    }
+    return text;
+}
 
 std::string summaryText(const report::Result& result, const report::Meta* meta,
                         const Painter& paint) {

@@ -1,10 +1,11 @@
-// A result in a few lines for a terminal.
+// A result, or the trend of many, in a few lines for a terminal.
 #pragma once
 
 #include <string>
 
 #include "companions/report/Meta.h"
 #include "companions/report/Result.h"
+#include "companions/report/Trend.h"
 #include "companions/tintgate-report/Terminal.h"
 
 namespace reporting {
@@ -13,5 +14,9 @@ namespace reporting {
 /// differ most, and the warnings: the page's own words and numbers. `meta` may be null.
 std::string summaryText(const report::Result& result, const report::Meta* meta,
                         const Painter& paint);
+
+/// Of each series: whether it drifts and which ink, where the inks stand, the criteria, and the
+/// latest jobs.
+std::string trendText(const report::TrendModel& trend, const Painter& paint);
 
 } // namespace reporting

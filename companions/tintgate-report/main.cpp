@@ -1,25 +1,31 @@
-// Reports for people who have files: pages, terminal summaries, patches as CSV, verdicts for
-// scripts, and what exit codes mean.
+// Reports for people who have result files or a store: pages, trends, terminal summaries, patches
+// as CSV, verdicts for scripts, and what exit codes mean.
 #include <cstdio>
+#include <cstdlib>
 #include <exception>
-#include <iostream>
+#include <filesystem>
 #include <new>
 #include <optional>
 #include <string>
+#include <tuple>
 #include <vector>
 
 #include <CLI/CLI.hpp>
 
 #include "companions/report/Page.h"
 #include "companions/report/PageFile.h"
+#include "companions/report/TrendPage.h"
 #include "companions/tintgate-report/Explain.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/PatchesCsv.h"
 #include "companions/tintgate-report/SummaryText.h"
+#include "companions/tintgate-report/Trend.h"
 #include "companions/tintgate-store/Bytes.h"
 
 namespace {
+
+namespace fs = std::filesystem;
 
 using reporting::Failure;
 using reporting::Status;
@@ -32,6 +38,9 @@ Exit status:
    3  a result or meta file is missing or can't be read
    4  a result or meta file is broken
    5  the output could not be written
+   6  the trend is there, but results that could not be read are not in it
+   7  there is no result that fits; nothing was written
+   8  the store can't be opened or read
    9  there is no such exit code
   64  the command line is not understood
   70  out of memory)";
@@ -43,7 +52,15 @@ struct Options {
     bool text = false;
     bool csv = false;
     bool verdict = false;
+    bool trend = false;
+    bool noPages = false;
+    std::string store;
+    std::string since;
+    std::string until;
+    reporting::Filter filter;
     std::optional<int> code;
+
+    bool fromStore() const { return !store.empty(); }
 };
 
 void say(const std::string& words) {
@@ -103,12 +120,62 @@ void reportOne(const Options& options) {
     reporting::writeOutput(output, page);
 }
 
+/// "trend.html" becomes "trend-jobs".
+reporting::PagePlace placeOf(const Options& options) {
+    if (options.text || options.output == "-")
+        return {};
+    const fs::path output = options.output.empty() ? "trend.html" : options.output;
+    reporting::PagePlace place;
+    place.folder = output.has_parent_path() ? output.parent_path().string() : ".";
+    if (!options.noPages)
+        place.name = output.stem().string() + "-jobs";
+    return place;
+}
+
+void writeTrend(const Options& options, const report::TrendModel& trend) {
+    const std::string output = options.output.empty() ? "-" : options.output;
+    if (options.text) {
+        const reporting::Painter paint(output == "-" && reporting::terminalTakesColours());
+        return reporting::writeOutput(output, reporting::trendText(trend, paint));
+    }
+    const std::string page = report::trendPageOf(trend);
+    if (!options.output.empty())
+        return reporting::writeOutput(output, page);
+    std::string problem;
+    const std::string path = report::keepPage(".", "trend", page, problem);
+    if (path.empty())
+        throw Failure(Status::NotWritten, "can't write a page in this folder: " + problem);
+    reporting::writeOutput("-", path + '\n');
+}
+
+Status reportTrend(const Options& options) {
+    const reporting::PagePlace place = placeOf(options);
+    reporting::Gathered gathered =
+        options.fromStore() ? reporting::gatherStore(options.store, options.filter, place)
+                            : reporting::gatherFiles(options.results, options.filter, place, say);
+    if (gathered.samples.empty())
+        throw Failure(gathered.leftOut != 0 ? Status::Unreadable : Status::NothingFound,
+                      "there is no result that fits what was asked for");
+    const std::string source = options.fromStore() ? "the store " + options.store : "files";
+    writeTrend(options,
+               report::makeTrend(std::move(gathered.samples), source, std::move(gathered.notes)));
+    return gathered.leftOut != 0 ? Status::SomeLeftOut : Status::Done;
+}
+
+bool wantsTrend(const Options& options) {
+    std::error_code ignored;
+    return options.trend || options.fromStore() || options.results.size() > 1 ||
+           fs::is_directory(options.results[0], ignored);
+}
+
 int run(const Options& options) {
     if (options.verdict)
         return verdictOf(options);
     try {
         if (options.code)
             reporting::writeOutput("-", reporting::explanationOf(*options.code));
+        else if (wantsTrend(options))
+            return static_cast<int>(reportTrend(options));
         else
             reportOne(options);
         return static_cast<int>(Status::Done);
@@ -119,27 +186,89 @@ int run(const Options& options) {
     }
 }
 
+void addOptions(CLI::App& program, Options& options) {
+    program.add_option("RESULT", options.results,
+                       "Result files, and folders of them; \"-\" is standard input");
+    program.add_option(
+        "-o,--output", options.output,
+        "Where to write; \"-\" is standard output. Without it a page is kept under a "
+        "name of its own, which is printed");
+    auto* text = program.add_flag("--text", options.text, "A summary for a terminal");
+    auto* csv = program.add_flag("--csv", options.csv, "The patches of one result as CSV");
+    auto* verdict =
+        program.add_flag("--verdict", options.verdict, "Nothing is printed; the exit status tells");
+    csv->excludes(text);
+    verdict->excludes(text)->excludes(csv);
+    program.add_option("--meta", options.meta,
+                       "What is known of one result's job; \"meta.json\" beside an \"output.json\" "
+                       "is found without this");
+
+    const char* const trend = "Trend";
+    program.add_flag("--trend", options.trend, "A trend also of one result")->group(trend);
+    program
+        .add_option("--store", options.store,
+                    "The results that the jobs of this store hold. Without results the store is "
+                    "that of TINTGATE_STORE")
+        ->group(trend);
+    program
+        .add_option("--since", options.since,
+                    "From this day on: 2026-11-24, or 30d for 30 days ago")
+        ->group(trend);
+    program.add_option("--until", options.until, "Up to this day and with it")->group(trend);
+    for (const auto& [name, value, what] :
+         {std::tuple{"--paper", &options.filter.paper, "Of papers whose names hold this text"},
+          std::tuple{"--preset", &options.filter.preset,
+                     "Of the preset of this number, or of presets whose names hold this text"},
+          std::tuple{"--instrument", &options.filter.instrument,
+                     "Of instruments whose names hold this text"},
+          std::tuple{"--workflow", &options.filter.workflow,
+                     "Of the server's workflows whose names hold this text"}})
+        program.add_option(name, *value, what)->group(trend);
+    program
+        .add_flag("--no-pages", options.noPages,
+                  "Make no pages of jobs; lead only to those that are there")
+        ->group(trend);
+
+    program.add_option("--explain", options.code, "What an exit code of Tintgate means")
+        ->group("Help");
+    program.footer(footer);
+}
+
+/// Days in words become times, and what does not go together is refused.
+void settle(Options& options) {
+    constexpr std::int64_t secondsOfDay = 86400;
+    const auto day = [](const std::string& text, const char* option) {
+        const auto time = reporting::dayOf(text);
+        if (!time)
+            throw CLI::ValidationError(option,
+                                       "\"" + text + "\" is no day such as 2026-11-24 or 30d");
+        return *time;
+    };
+    if (!options.since.empty())
+        options.filter.since = day(options.since, "--since");
+    if (!options.until.empty())
+        options.filter.until = day(options.until, "--until") + secondsOfDay;
+    const char* const store = std::getenv("TINTGATE_STORE");
+    if (!options.code && options.results.empty() && options.store.empty() && store != nullptr)
+        options.store = store;
+    if (options.code.has_value() + options.fromStore() + !options.results.empty() != 1)
+        throw CLI::RequiredError("Either results, --store or --explain");
+    if ((options.csv || options.verdict || !options.meta.empty()) && wantsTrend(options))
+        throw CLI::ValidationError("--csv, --verdict and --meta", "are for one result");
+}
+
 } // namespace
 
 int main(int argumentCount, char** arguments) {
-    CLI::App program("Shows the results of colour verifications to people.", "tintgate-report");
     Options options;
-    program.add_option("RESULT", options.results, "Result files (\"-\" is standard input)");
-    program.add_option("-o,--output", options.output, "Where to write; \"-\" is standard output");
-    program.add_option("--meta", options.meta,
-                       "What is known of the result's job (\"meta.json\" beside an \"output.json\" "
-                       "is found without this)");
-    auto* text = program.add_flag("--text", options.text, "A summary for a terminal");
-    auto* csv = program.add_flag("--csv", options.csv, "The patches as CSV")->excludes(text);
-    program.add_flag("--verdict", options.verdict, "Print nothing; the exit status tells")
-        ->excludes(text)
-        ->excludes(csv);
-    program.add_option("--explain", options.code, "What an exit code of Tintgate means");
-    program.footer(footer);
+    CLI::App program(
+        "Shows the results of colour verifications to people: one result as a page, a "
+        "summary or a table of patches; many results, or those of a store, as a trend.",
+        "tintgate-report");
+    addOptions(program, options);
     try {
         program.parse(argumentCount, arguments);
-        if (options.code.has_value() == !options.results.empty())
-            throw CLI::RequiredError("One result file, or --explain,");
+        settle(options);
     } catch (const CLI::ParseError& failure) {
         return program.exit(failure) == 0 ? 0 : static_cast<int>(Status::BadCommand);
     }

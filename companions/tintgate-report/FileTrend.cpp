@@ -1,0 +1,102 @@
+#include <ctime>
+#include <filesystem>
+
+#include <sys/stat.h>
+
+#include "companions/report/Page.h"
+#include "companions/report/PageFile.h"
+#include "companions/tintgate-report/Failure.h"
+#include "companions/tintgate-report/Files.h"
+#include "companions/tintgate-report/Trend.h"
+
+namespace reporting {
+namespace {
+
+namespace fs = std::filesystem;
+
+/// When a result was made: by its job, else as its measurement says, else as its file.
+std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile) {
+    byFile = false;
+    if (loaded.meta)
+        if (const auto time = timeOf(loaded.meta->created))
+            return *time;
+    for (const auto& [label, text] : loaded.result.measurement.statements)
+        if (label == "Created")
+            if (const auto time = timeOf(text))
+                return *time;
+    struct stat status {};
+    byFile = true;
+    stat(loaded.path.c_str(), &status);
+    return localTime(status.st_mtime);
+}
+
+/// The path of the job's page from the trend's page.
+std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {
+    if (place.folder.empty())
+        return {};
+    const std::string stem = loaded.meta ? report::pageStem(*loaded.meta) : loaded.stem();
+    const std::string viewers = loaded.folder() + "/" + stem + ".html";
+    std::error_code ignored;
+    if (loaded.meta && fs::is_regular_file(viewers, ignored))
+        return relativeTo(place.folder, viewers);
+
+    if (place.name.empty())
+        return {};
+    const std::string folder = place.folder + "/" + place.name;
+    std::error_code failure;
+    fs::create_directories(folder, failure);
+    const std::string name =
+        loaded.meta ? "job-" + std::to_string(loaded.meta->jobId) + "-" + stem.substr(7) : stem;
+    std::string problem = failure.message();
+    const std::string page =
+        failure ? ""
+                : report::keepPage(folder, name, report::pageOf(loaded.result, loaded.metaOrNull()),
+                                   problem);
+    if (page.empty())
+        throw Failure(Status::NotWritten, "can't write a page in " + folder + ": " + problem);
+    return place.name + page.substr(folder.size());
+}
+
+std::string counted(std::size_t count, const std::string& one, const std::string& many) {
+    return std::to_string(count) + (count == 1 ? one : many);
+}
+
+} // namespace
+
+Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& filter,
+                     const PagePlace& place, const std::function<void(const std::string&)>& say) {
+    Gathered gathered;
+    std::size_t byFile = 0;
+    for (const std::string& path : filesOf(arguments)) {
+        try {
+            std::string note;
+            const LoadedResult loaded = loadResult(path, "", note);
+            if (!note.empty())
+                say(note);
+            report::Sample sample = report::sampleOf(loaded.result, loaded.metaOrNull());
+            bool guessed = false;
+            sample.time = timeOfResult(loaded, guessed);
+            if (!filter.takes(sample))
+                continue;
+            byFile += guessed;
+            sample.page = pageFor(loaded, place);
+            gathered.samples.push_back(std::move(sample));
+        } catch (const Failure& failure) {
+            if (failure.status == Status::NotWritten)
+                throw;
+            say(failure.what());
+            ++gathered.leftOut;
+        }
+    }
+    if (byFile != 0)
+        gathered.notes.push_back(
+            counted(byFile, " result does not tell its time; it stands at that of its file.",
+                    " results do not tell their time; they stand at those of their files."));
+    if (gathered.leftOut != 0)
+        gathered.notes.push_back(counted(gathered.leftOut,
+                                         " file could not be read and is left out.",
+                                         " files could not be read and are left out."));
+    return gathered;
+}
+
+} // namespace reporting

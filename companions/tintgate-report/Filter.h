@@ -1,0 +1,38 @@
+// Which results a trend is made of.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+
+#include "companions/report/Sample.h"
+
+namespace reporting {
+
+/// Seconds since 1970 on the room's own clock of a text such as "2026-11-24", "2026-11-24 21:53",
+/// "2026-11-24T21:53:07+01:00" (the zone counts for nothing) or "Tue Nov 24 21:53:07 2026"; nothing
+/// for any other.
+std::optional<std::int64_t> timeOf(const std::string& text);
+
+/// The same of a time of this machine, in its own zone.
+std::int64_t localTime(std::int64_t secondsSince1970);
+
+/// Texts match where they are a part of what a result has, whatever the case of ASCII letters. What
+/// is empty takes everything.
+struct Filter {
+    std::optional<std::int64_t> since;
+    std::optional<std::int64_t> until; ///< The first time that is too late.
+    std::string paper;
+    std::string preset; ///< A part of its name, or its number.
+    std::string instrument;
+    std::string workflow;
+
+    bool takesTime(std::int64_t time) const;
+    bool takes(const report::Sample& sample) const;
+};
+
+/// The begin of a day: "2026-11-24", or "30d" for so many days before today. Nothing for any other
+/// text.
+std::optional<std::int64_t> dayOf(const std::string& text);
+
+} // namespace reporting

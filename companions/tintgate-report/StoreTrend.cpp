@@ -1,0 +1,457 @@
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <cstring>
+#include <limits>
+#include <map>
+#include <set>
+#include <sstream>
+
+#include "analysis/Criteria.h"
+#include "analysis/Judgement.h"
+#include "analysis/Presets.h"
+#include "colour/CgatsText.h"
+#include "colour/Difference.h"
+#include "comgui/StoreEngine.h"
+#include "companions/report/Reports.h"
+#include "companions/tintgate-report/Failure.h"
+#include "companions/tintgate-report/Files.h"
+#include "companions/tintgate-report/Trend.h"
+#include "job/AnalysisLibrary.h"
+#include "platform/TemporaryFolder.h"
+
+namespace reporting {
+namespace {
+
+constexpr int jobType = 3;
+constexpr int presetType = 27;
+constexpr std::size_t largestArray = std::size_t{16} << 20; ///< Bytes of a key: a million patches.
+
+/// The criterion whose value and approval stand at each of the server's positions for results; -1
+/// for none. Further positions have none.
+constexpr int criterionAt[] = {6,  7,  8,  9,  4,  0,  1,  5,  12, 10, 13, 3,  -1, 19,
+                               11, 20, 21, -1, -1, 22, -1, -1, -1, -1, -1, -1, 18};
+/// Where the server shows the largest difference of spot colours, or, of presets of the PSD kind
+/// that don't use it, the average, which has a place of its own, too.
+constexpr std::size_t spotPosition = 13;
+constexpr int psdSpotMaximum = 21;
+constexpr int psdApprovals = 10; ///< Of a preset of the PSD kind only these are kept, by entry.
+
+// ---- Reading keys
+
+using SharedContent = std::shared_ptr<const store::TicketContent>;
+
+std::optional<int> integerOf(const std::shared_ptr<const store::Elements>& elements) {
+    const auto* value = elements ? elements->first() : nullptr;
+    const auto* number = value != nullptr ? std::get_if<int>(value) : nullptr;
+    return number != nullptr ? std::optional(*number) : std::nullopt;
+}
+
+std::string textOf(const std::shared_ptr<const store::Elements>& elements) {
+    const auto* value = elements ? elements->first() : nullptr;
+    const auto* bytes = value != nullptr ? std::get_if<store::Text>(value) : nullptr;
+    return bytes != nullptr ? bytes->bytes->text : std::string();
+}
+
+/// Holes, and elements that are no doubles, are NaN.
+std::vector<double> doublesOf(const std::shared_ptr<const store::Elements>& elements) {
+    if (!elements || static_cast<std::size_t>(elements->count()) > largestArray / sizeof(double))
+        return {};
+    std::vector<double> values(static_cast<std::size_t>(elements->count()),
+                               std::numeric_limits<double>::quiet_NaN());
+    if (elements->numberType() == PARAM_DOUBLE) {
+        std::memcpy(values.data(), elements->numbers().data(), values.size() * sizeof(double));
+        return values;
+    }
+    elements->visit([&](int position, const store::Value& value) {
+        if (const auto* number = std::get_if<double>(&value))
+            values[static_cast<std::size_t>(position)] = *number;
+        return true;
+    });
+    return values;
+}
+
+std::vector<int> integersOf(const std::shared_ptr<const store::Elements>& elements) {
+    std::vector<int> values;
+    if (elements)
+        elements->visit([&](int position, const store::Value& value) {
+            const auto* number = std::get_if<int>(&value);
+            if (number == nullptr || position != static_cast<int>(values.size()))
+                return false;
+            values.push_back(*number);
+            return true;
+        });
+    return values;
+}
+
+/// A job's keys as one of its strips has them.
+class StripKeys {
+  public:
+    explicit StripKeys(int strip) : m_suffix(strip == 2 ? "2" : "") {}
+
+    std::string measured(const std::string& name) const {
+        return "Remote/Measurement" + m_suffix + "/" + name;
+    }
+    std::string own(const std::string& key) const { return key + m_suffix; }
+
+  private:
+    std::string m_suffix;
+};
+
+/// What a sample is made of, beside the strip's measurement.
+constexpr const char* sharedKeys[] = {"Input/Title",
+                                      "CMM/PaperName",
+                                      "Workflow/Name",
+                                      "System/InstallFolder",
+                                      "Footer/Dynstrip/UseDynstrip",
+                                      "Footer/Dynstrip/DeviceID"};
+constexpr const char* stripOnlyKeys[] = {"Workflow/Verify/ComparisonMethod",
+                                         "Workflow/Verify/DeltaEMode", "Footer/ControlstripFile",
+                                         "Footer/Nesting/ControlstripFile"};
+constexpr const char* measuredKeys[] = {"Approval",
+                                        "Date",
+                                        "Time",
+                                        "Values/Measured",
+                                        "Values/Approval",
+                                        "Values/PSDApproval",
+                                        "LabValues/LValues",
+                                        "LabValues/AValues",
+                                        "LabValues/BValues",
+                                        "CMYKValues/CValues",
+                                        "CMYKValues/MValues",
+                                        "CMYKValues/YValues",
+                                        "CMYKValues/KValues"};
+
+store::KeyFilter keysOf(const StripKeys& keys) {
+    std::vector<std::string> names(std::begin(sharedKeys), std::end(sharedKeys));
+    for (const char* key : stripOnlyKeys)
+        names.push_back(keys.own(key));
+    for (const char* name : measuredKeys)
+        names.push_back(keys.measured(name));
+    std::vector<const char*> table;
+    for (const std::string& name : names)
+        table.push_back(name.c_str());
+    table.push_back(nullptr);
+    return store::KeyFilter(table.data());
+}
+
+// ---- Jobs that have a result
+
+struct Verified {
+    int job = 0;
+    int strip = 1;
+    std::int64_t time = 0;
+};
+
+/// The strips of all jobs that have a result of a time that the filter takes.
+std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& filter) {
+    const std::vector<std::string> names = {
+        StripKeys(1).measured("Approval"), StripKeys(1).measured("Date"),
+        StripKeys(1).measured("Time"),     StripKeys(2).measured("Approval"),
+        StripKeys(2).measured("Date"),     StripKeys(2).measured("Time")};
+    struct Row {
+        bool judged = false;
+        std::string date;
+        std::string time;
+    };
+    std::map<std::pair<int, int>, Row> rows;
+    constexpr std::size_t anySize = static_cast<std::size_t>(-1) / 2;
+    store.keysOfAll(jobType, names, anySize, [&](int id, std::size_t name, const auto& elements) {
+        Row& row = rows[{id, name < 3 ? 1 : 2}];
+        if (name % 3 == 0)
+            row.judged = integerOf(elements).value_or(-1) >= 0;
+        else
+            (name % 3 == 1 ? row.date : row.time) = textOf(elements);
+    });
+    std::vector<Verified> verified;
+    for (const auto& [key, row] : rows) {
+        auto time = timeOf(row.date + " " + row.time);
+        if (!time)
+            time = timeOf(row.date);
+        if (row.judged && time && filter.takesTime(*time))
+            verified.push_back({key.first, key.second, *time});
+    }
+    return verified;
+}
+
+// ---- Presets and instruments of the server
+
+std::string fileOf(store::StoreEngine& store, const std::string& path) {
+    std::ostringstream bytes;
+    try {
+        store.getFile(path, bytes);
+    } catch (const store::StoreFailure& failure) {
+        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath)
+            throw;
+        return {};
+    }
+    return std::move(bytes).str();
+}
+
+struct Preset {
+    std::string name;
+    std::optional<tolerancePresetParameterRecord> values; ///< Of the file; none without it.
+
+    bool psd() const { return values && values->fograPSDPreset > 0; }
+};
+
+/// Presets and instruments, each looked up once.
+class Server {
+  public:
+    explicit Server(store::StoreEngine& store) : m_store(store) {}
+
+    /// The tool judges by the preset's file, so its ticket gives no more than the name.
+    const Preset& preset(int id, const std::string& installFolder) {
+        const auto [at, fresh] = m_presets.try_emplace({id, installFolder});
+        if (!fresh)
+            return at->second;
+        at->second.name = textOf(m_store.key(presetType, id, "Name"));
+        char name[32];
+        std::snprintf(name, sizeof name, "CVP_%04d.xml", id);
+        const std::string bytes = fileOf(m_store, installFolder + "/tickets/" + name);
+        tolerancePresetParameterRecord values;
+        if (!bytes.empty() && analysis::parsePreset(bytes, true, values) == 0)
+            at->second.values = values;
+        else
+            m_missing.insert(id);
+        return at->second;
+    }
+
+    /// Of the control strip that the job names; empty where it tells none.
+    std::string instrument(const store::TicketContent& job, const StripKeys& keys, int strip) {
+        if (strip == 1 && integerOf(job.find("Footer/Dynstrip/UseDynstrip")) == 1)
+            return nameOf(integerOf(job.find("Footer/Dynstrip/DeviceID")).value_or(0));
+        constexpr std::size_t shortestName = 4;
+        std::string file = textOf(job.find(keys.own("Footer/ControlstripFile")));
+        if (file.size() < shortestName)
+            file = textOf(job.find(keys.own("Footer/Nesting/ControlstripFile")));
+        file.erase(0, file.rfind('/') + 1);
+        file.resize(std::min(file.rfind('.'), file.size()));
+        if (file.empty())
+            return {};
+        const std::string path =
+            textOf(job.find("System/InstallFolder")) + "/ControlCharts/" + file + ".it8";
+        const auto [at, fresh] = m_strips.try_emplace(path);
+        if (fresh)
+            if (const auto device = colour::cgatsKeyword(fileOf(m_store, path), "DEVICE"))
+                at->second = nameOf(std::atoi(device->c_str()));
+        return at->second;
+    }
+
+    const std::set<int>& presetsWithoutFile() const { return m_missing; }
+
+  private:
+    static std::string nameOf(int device) {
+        if (device <= 0)
+            return {};
+        return GetInstrumentNameFromID(static_cast<unsigned>(device)).utf8_string();
+    }
+
+    store::StoreEngine& m_store;
+    std::map<std::pair<int, std::string>, Preset> m_presets;
+    std::map<std::string, std::string> m_strips;
+    std::set<int> m_missing;
+};
+
+// ---- One sample
+
+/// A criterion with what the preset asks of it.
+report::Criterion criterionOf(const analysis::Criterion& known, const Preset& preset) {
+    report::Criterion criterion;
+    criterion.name = known.name;
+    criterion.title = known.title;
+    criterion.unit = analysis::unit(known.quantity);
+    if (!preset.values)
+        return criterion;
+    const auto& values = *preset.values;
+    const double tolerance =
+        preset.psd() ? values.psdPresetValues[known.psdEntry] : values.presetValues[known.index];
+    criterion.used = (preset.psd() ? values.usedForPSDResult[known.psdEntry]
+                                   : values.usedForResult[known.index]) != 0;
+    criterion.decimals = std::clamp(values.decimalPlaces[known.index], 0, 6);
+    if (criterion.used || tolerance != 0)
+        criterion.tolerance = tolerance;
+    return criterion;
+}
+
+struct Results {
+    std::vector<double> measured;
+    std::vector<int> approvals; ///< By the server's position, or by entry for the PSD kind.
+};
+
+std::optional<bool> approvalOf(const Results& results, std::size_t position, int entry, bool psd) {
+    const std::size_t at = psd ? static_cast<std::size_t>(entry) : position;
+    if (at >= results.approvals.size() || (psd && entry >= psdApprovals))
+        return std::nullopt;
+    return results.approvals[at] != 0;
+}
+
+/// Fills in value and outcome as they were judged then. True where today's tolerance would say
+/// something else.
+bool judge(report::Criterion& criterion, double value, std::optional<bool> approval) {
+    if (!(value >= 0)) { // -1 stands for no answer.
+        criterion.outcome =
+            criterion.tolerance ? report::Outcome::Unanswered : report::Outcome::Unjudged;
+        return false;
+    }
+    criterion.value = value;
+    criterion.patches = 1;
+    if (!criterion.tolerance)
+        return false;
+    criterion.rounded = analysis::roundedTo(value, criterion.decimals);
+    const bool within = *criterion.rounded <= *criterion.tolerance;
+    criterion.outcome = approval.value_or(within) ? report::Outcome::Pass : report::Outcome::Fail;
+    return approval && *approval != within;
+}
+
+bool addCriteria(report::Sample& sample, const Results& results, const Preset& preset) {
+    bool changed = false;
+    for (std::size_t i = 0; i < std::size(criterionAt) && i < results.measured.size(); ++i) {
+        const auto known =
+            std::find_if(std::begin(analysis::criteria), std::end(analysis::criteria),
+                         [&](const analysis::Criterion& c) { return c.index == criterionAt[i]; });
+        const bool holdsAverage = i == spotPosition && preset.psd() &&
+                                  preset.values->usedForPSDResult[psdSpotMaximum] != 1;
+        if (known == std::end(analysis::criteria) || holdsAverage)
+            continue;
+        report::Criterion criterion = criterionOf(*known, preset);
+        changed |= judge(criterion, results.measured[i],
+                         approvalOf(results, i, known->index, preset.psd()));
+        if (criterion.value || criterion.used)
+            sample.criteria.push_back(std::move(criterion));
+    }
+    return changed;
+}
+
+report::InkColours inksOf(const store::TicketContent& job, const StripKeys& keys) {
+    std::vector<double> lab[3];
+    std::vector<double> cmyk[4];
+    std::size_t patches = largestArray;
+    const auto read = [&](std::vector<double>& values, const char* name) {
+        values = doublesOf(job.find(keys.measured(name)));
+        patches = std::min(patches, values.size());
+    };
+    for (int i = 0; i < 3; ++i)
+        read(lab[i],
+             (const char*[]){"LabValues/LValues", "LabValues/AValues", "LabValues/BValues"}[i]);
+    for (int i = 0; i < 4; ++i)
+        read(cmyk[i], (const char*[]){"CMYKValues/CValues", "CMYKValues/MValues",
+                                      "CMYKValues/YValues", "CMYKValues/KValues"}[i]);
+    report::InkMeans means;
+    for (std::size_t i = 0; i < patches; ++i) {
+        const double device[4] = {cmyk[0][i], cmyk[1][i], cmyk[2][i], cmyk[3][i]};
+        if (const auto ink = report::inkOf(device, 4))
+            means.add(*ink, {lab[0][i], lab[1][i], lab[2][i]});
+    }
+    return means.means();
+}
+
+report::Verdict verdictOf(const report::Sample& sample, int approval) {
+    if (approval > 0)
+        return report::Verdict::Passed;
+    const auto used = [&](report::Outcome outcome) {
+        return std::any_of(sample.criteria.begin(), sample.criteria.end(),
+                           [&](const auto& c) { return c.used && c.outcome == outcome; });
+    };
+    return used(report::Outcome::Unanswered) ? report::Verdict::Incomplete
+                                             : report::Verdict::Failed;
+}
+
+/// The pages of jobs that lie on this machine.
+class LocalPages {
+  public:
+    LocalPages() : m_folder(platform::temporaryFolder() + "/Tintgate") {
+        for (report::Listed& page : report::reportsBelow(m_folder))
+            m_pages[page.path.substr(0, page.path.find('/'))].push_back(std::move(page));
+    }
+
+    /// The page of the run that wrote the sample: the first one since then. Empty for none.
+    std::string of(const report::Sample& sample) const {
+        const std::string folder = "JobID_" + std::to_string(*sample.jobId);
+        const auto found = m_pages.find(folder);
+        if (found == m_pages.end())
+            return {};
+        const std::string start = folder + "/report-strip" + std::to_string(sample.strip) + "-";
+        std::string earliest;
+        for (const report::Listed& page : found->second) { // The latest first.
+            const auto made = timeOf(page.summary.created);
+            if (page.path.starts_with(start) && page.summary.title == sample.title && made &&
+                *made >= sample.time)
+                earliest = m_folder + "/" + page.path;
+        }
+        return earliest;
+    }
+
+  private:
+    std::string m_folder;
+    std::map<std::string, std::vector<report::Listed>> m_pages;
+};
+
+report::Sample sampleOf(const store::TicketContent& job, const Verified& verified, Server& server,
+                        bool& changed) {
+    const StripKeys keys(verified.strip);
+    report::Sample sample;
+    sample.time = verified.time;
+    sample.jobId = verified.job;
+    sample.strip = verified.strip;
+    sample.title = textOf(job.find("Input/Title"));
+    if (sample.title.empty())
+        sample.title = "Job " + std::to_string(verified.job);
+    sample.paper = textOf(job.find("CMM/PaperName"));
+    sample.workflow = textOf(job.find("Workflow/Name"));
+    sample.instrument = server.instrument(job, keys, verified.strip);
+    const int id = integerOf(job.find(keys.own("Workflow/Verify/ComparisonMethod"))).value_or(0);
+    const Preset& preset = server.preset(id, textOf(job.find("System/InstallFolder")));
+    sample.preset = preset.name;
+    sample.presetId = id;
+    sample.formula = colour::formulaName(colour::formulaFromNumber(
+        integerOf(job.find(keys.own("Workflow/Verify/DeltaEMode"))).value_or(0)));
+    Results results;
+    results.measured = doublesOf(job.find(keys.measured("Values/Measured")));
+    results.approvals = integersOf(
+        job.find(keys.measured(preset.psd() ? "Values/PSDApproval" : "Values/Approval")));
+    changed = addCriteria(sample, results, preset);
+    sample.verdict = verdictOf(sample, integerOf(job.find(keys.measured("Approval"))).value_or(0));
+    sample.inks = inksOf(job, keys);
+    return sample;
+}
+
+} // namespace
+
+Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place) {
+    try {
+        const auto store = store::openStore(address);
+        Server server(*store);
+        const LocalPages pages;
+        Gathered gathered;
+        std::size_t changes = 0;
+        const store::KeyFilter keys[] = {keysOf(StripKeys(1)), keysOf(StripKeys(2))};
+        for (const Verified& verified : verifiedStrips(*store, filter)) {
+            const SharedContent job =
+                store->content(jobType, verified.job, keys[verified.strip == 2]);
+            if (!job) // Deleted meanwhile.
+                continue;
+            bool changed = false;
+            report::Sample sample = sampleOf(*job, verified, server, changed);
+            if (!filter.takes(sample))
+                continue;
+            changes += changed;
+            if (const std::string page = pages.of(sample); !page.empty() && !place.folder.empty())
+                sample.page = relativeTo(place.folder, page);
+            gathered.samples.push_back(std::move(sample));
+        }
+        for (const int id : server.presetsWithoutFile())
+            gathered.notes.push_back("The file of preset " + std::to_string(id) +
+                                     " can't be read, so its tolerances are not known.");
+        if (changes != 0)
+            gathered.notes.push_back(
+                std::to_string(changes) + (changes == 1 ? " job was" : " jobs were") +
+                " judged by other tolerances than the preset has today. Passed and failed are as "
+                "they were judged; the lines show the tolerances of today.");
+        return gathered;
+    } catch (const store::StoreFailure& failure) {
+        throw Failure(Status::Store, failure.what());
+    }
+}
+
+} // namespace reporting

@@ -1,0 +1,37 @@
+// The trend of many results, from files or a store.
+#pragma once
+
+#include <functional>
+#include <string>
+#include <vector>
+
+#include "companions/report/Trend.h"
+#include "companions/tintgate-report/Filter.h"
+
+namespace reporting {
+
+/// Samples, with what a person should know of where they come from.
+struct Gathered {
+    std::vector<report::Sample> samples;
+    std::vector<std::string> notes;
+    std::size_t leftOut = 0; ///< Results that could not be read.
+};
+
+/// Where the pages of jobs go, and how a trend's page leads to them.
+struct PagePlace {
+    std::string folder; ///< Of the trend's page; empty where jobs get no links.
+    std::string
+        name; ///< Of the folder of jobs' pages in it, made for the first; empty: none is made.
+};
+
+/// Reads result files, or all below folders, and makes the page of each job where the viewer has
+/// not made it already. What can't be read is told through `say` and left out. Throws Failure
+/// (Unreadable for a folder, NotWritten).
+Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& filter,
+                     const PagePlace& place, const std::function<void(const std::string&)>& say);
+
+/// Reads the results that the jobs of a store hold. Links lead to the pages that lie in the tool's
+/// folder on this machine. Throws Failure (Store).
+Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place);
+
+} // namespace reporting
