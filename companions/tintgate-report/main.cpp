@@ -1,5 +1,6 @@
 // Reports for people who have result files or a store: pages, trends, terminal summaries, patches
 // as CSV, verdicts for scripts, and what exit codes mean.
+#include <algorithm>
 #include <cstdio>
 #include <cstdlib>
 #include <exception>
@@ -20,8 +21,10 @@
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/PatchesCsv.h"
 #include "companions/tintgate-report/SummaryText.h"
+#include "companions/tintgate-report/Tidy.h"
 #include "companions/tintgate-report/Trend.h"
 #include "companions/tintgate-store/Bytes.h"
+#include "platform/TemporaryFolder.h"
 
 namespace {
 
@@ -42,6 +45,7 @@ Exit status:
    7  there is no result that fits; nothing was written
    8  the store can't be opened or read
    9  there is no such exit code
+  10  a job's folder could not be looked at or removed
   64  the command line is not understood
   70  out of memory)";
 
@@ -59,6 +63,8 @@ struct Options {
     std::string until;
     reporting::Filter filter;
     std::optional<int> code;
+    std::optional<int> tidyDays;
+    bool dryRun = false;
 
     bool fromStore() const { return !store.empty(); }
 };
@@ -162,6 +168,20 @@ Status reportTrend(const Options& options) {
     return gathered.leftOut != 0 ? Status::SomeLeftOut : Status::Done;
 }
 
+Status tidyFolders(const Options& options) {
+    constexpr std::int64_t secondsOfDay = 86400;
+    const std::string temporary = platform::temporaryFolder();
+    if (temporary.empty())
+        throw Failure(Status::NotTidied, "there is no temporary folder that may be used");
+    const auto folders =
+        reporting::tidy(temporary + "/Tintgate", *options.tidyDays * secondsOfDay, options.dryRun);
+    reporting::writeOutput("-", reporting::tidiedText(folders, options.dryRun));
+    const bool failed = std::any_of(folders.begin(), folders.end(), [](const auto& folder) {
+        return folder.fate == reporting::Fate::Failed;
+    });
+    return failed ? Status::NotTidied : Status::Done;
+}
+
 bool wantsTrend(const Options& options) {
     std::error_code ignored;
     return options.trend || options.fromStore() || options.results.size() > 1 ||
@@ -174,6 +194,8 @@ int run(const Options& options) {
     try {
         if (options.code)
             reporting::writeOutput("-", reporting::explanationOf(*options.code));
+        else if (options.tidyDays)
+            return static_cast<int>(tidyFolders(options));
         else if (wantsTrend(options))
             return static_cast<int>(reportTrend(options));
         else
@@ -230,7 +252,15 @@ void addOptions(CLI::App& program, Options& options) {
         ->group(trend);
 
     program.add_option("--explain", options.code, "What an exit code of Tintgate means")
-        ->group("Help");
+        ->group("Upkeep");
+    program
+        .add_option("--tidy", options.tidyDays,
+                    "Remove the folders of jobs in the temporary folder in which nothing has "
+                    "changed for so many days and that no process uses")
+        ->check(CLI::Range(1, 36500))
+        ->group("Upkeep");
+    program.add_flag("--dry-run", options.dryRun, "With --tidy: only say what would go")
+        ->group("Upkeep");
     program.footer(footer);
 }
 
@@ -249,10 +279,15 @@ void settle(Options& options) {
     if (!options.until.empty())
         options.filter.until = day(options.until, "--until") + secondsOfDay;
     const char* const store = std::getenv("TINTGATE_STORE");
-    if (!options.code && options.results.empty() && options.store.empty() && store != nullptr)
+    if (!options.code && !options.tidyDays && options.results.empty() && options.store.empty() &&
+        store != nullptr)
         options.store = store;
-    if (options.code.has_value() + options.fromStore() + !options.results.empty() != 1)
-        throw CLI::RequiredError("Either results, --store or --explain");
+    if (options.code.has_value() + options.tidyDays.has_value() + options.fromStore() +
+            !options.results.empty() !=
+        1)
+        throw CLI::RequiredError("One of results, --store, --explain and --tidy");
+    if (options.dryRun && !options.tidyDays)
+        throw CLI::RequiresError("--dry-run", "--tidy");
     if ((options.csv || options.verdict || !options.meta.empty()) && wantsTrend(options))
         throw CLI::ValidationError("--csv, --verdict and --meta", "are for one result");
 }
