@@ -5,6 +5,7 @@
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/JobJdf.h"
 #include "companions/tintgate-store/LocalFile.h"
 #include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
@@ -65,12 +66,27 @@ Row versionRow(const Row& number, std::uint64_t size, std::int64_t time) {
     return {{"version", number}, {"size", size}, {"time", time}, {"written", shownTime(time)}};
 }
 
+/// A JDF that can't be prepared is delivered as it is: it's still the job's.
+void deliver(store::StoreEngine& store, const std::string& local, const std::string& path,
+             int updates) {
+    LocalInput input(local);
+    store.putFile(path, input.stream());
+    if (updates == 0 || !isJdfName(path)) {
+        return;
+    }
+    try {
+        readyJdf(store, path, updates);
+    } catch (const Failure& failure) {
+        std::cerr << "tintgate-store: warning: delivered as it is, " << failure.what() << '\n';
+    }
+}
+
 void put(const Invocation& invocation, const FileOptions& options) {
     const auto store = invocation.open();
+    const int updates = updatesAtDelivery(*store);
     std::error_code none;
     if (options.local == "-" || !fs::is_directory(options.local, none)) {
-        LocalInput input(options.local);
-        store->putFile(options.path, input.stream());
+        deliver(*store, options.local, options.path, updates);
         return;
     }
     std::vector<fs::path> files;
@@ -83,9 +99,8 @@ void put(const Invocation& invocation, const FileOptions& options) {
     Progress progress(files.size(), "files");
     std::size_t count = 0;
     for (const auto& file : files) {
-        LocalInput input(file.string());
-        store->putFile((fs::path(options.path) / fs::relative(file, options.local)).string(),
-                       input.stream());
+        deliver(*store, file.string(),
+                (fs::path(options.path) / fs::relative(file, options.local)).string(), updates);
         progress.done(++count);
     }
 }
@@ -204,7 +219,9 @@ void addFileCommands(CLI::App& program, Invocation& invocation) {
     auto& putting = command("put", "Deliver a file, or all files of a folder", put);
     putting.add_option("local", options->local, "File or folder; - for standard input")->required();
     withPath(putting);
-    putting.footer("A file that is replaced is kept as a version.");
+    putting.footer(
+        "A file that is replaced is kept as a version. A name that ends in .jdf is a JDF, "
+        "which is made ready for\nits updates where the store says so: see jdf --help.");
 
     auto& getting = command("get", "Fetch a file", get);
     withPath(getting);

@@ -56,15 +56,6 @@ void list(const Invocation& invocation) {
              rows, invocation.json);
 }
 
-int jobNumber(const std::string& text) {
-    const TicketName name =
-        text.find('/') != std::string::npos ? ticketNamed(text) : ticketNamed("job/" + text);
-    if (name.type != jobType) {
-        throw Failure(Status::BadInput, textOf(name) + " is no job");
-    }
-    return name.id;
-}
-
 void tellReset(const ResetResult& result) {
     std::cout << textOf({jobType, result.id}) << ": ";
     if (!result.there) {

@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <set>
 
+#include "companions/tintgate-store/KeyValue.h"
 #include "companions/tintgate-store/TicketName.h"
 
 namespace admin {
@@ -29,49 +30,37 @@ std::string approvalKey(int strip) {
     return roots[strip] + std::string("/Approval");
 }
 
-/// The integer that a job's reader would find: the key's first element, if it is one.
-std::optional<int> integer(const std::shared_ptr<const store::Elements>& elements) {
-    const auto* value = elements ? elements->first() : nullptr;
-    const auto* number = value != nullptr ? std::get_if<int>(value) : nullptr;
-    return number != nullptr ? std::optional(*number) : std::nullopt;
-}
-
-std::string text(const std::shared_ptr<const store::Elements>& elements) {
-    const auto* value = elements ? elements->first() : nullptr;
-    const auto* bytes = value != nullptr ? std::get_if<store::Text>(value) : nullptr;
-    return bytes != nullptr ? bytes->bytes->text : std::string();
-}
-
 using Elements = std::shared_ptr<const store::Elements>;
 
 /// What each key says about a job.
 const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> readers = {
-    {"Input/Title", [](Job& job, const Elements& value) { job.title = text(value); }},
+    {"Input/Title",
+     [](Job& job, const Elements& value) { job.title = textOf(value).value_or(""); }},
     {"General/ParentID",
-     [](Job& job, const Elements& value) { job.parent = integer(value).value_or(0); }},
+     [](Job& job, const Elements& value) { job.parent = integerOf(value).value_or(0); }},
     {displayKey,
-     [](Job& job, const Elements& value) { job.displayStatus = integer(value).value_or(0); }},
+     [](Job& job, const Elements& value) { job.displayStatus = integerOf(value).value_or(0); }},
     {showKey,
      [](Job& job, const Elements& value) {
-         job.hasShowInVerifier = integer(value).has_value();
-         job.showInVerifier = integer(value).value_or(0);
+         job.hasShowInVerifier = integerOf(value).has_value();
+         job.showInVerifier = integerOf(value).value_or(0);
      }},
     {fileTypeKey,
-     [](Job& job, const Elements& value) { job.fileType = integer(value).value_or(0); }},
+     [](Job& job, const Elements& value) { job.fileType = integerOf(value).value_or(0); }},
     {"Workflow/Verify/Active",
-     [](Job& job, const Elements& value) { job.twoStrips = integer(value) == bothStrips; }},
+     [](Job& job, const Elements& value) { job.twoStrips = integerOf(value) == bothStrips; }},
     {statusKey(0),
      [](Job& job, const Elements& value) {
-         job.strips[0].measurements = integer(value).value_or(0);
+         job.strips[0].measurements = integerOf(value).value_or(0);
      }},
     {statusKey(1),
      [](Job& job, const Elements& value) {
-         job.strips[1].measurements = integer(value).value_or(0);
+         job.strips[1].measurements = integerOf(value).value_or(0);
      }},
     {approvalKey(0),
-     [](Job& job, const Elements& value) { job.strips[0].approval = integer(value); }},
+     [](Job& job, const Elements& value) { job.strips[0].approval = integerOf(value); }},
     {approvalKey(1),
-     [](Job& job, const Elements& value) { job.strips[1].approval = integer(value); }},
+     [](Job& job, const Elements& value) { job.strips[1].approval = integerOf(value); }},
 };
 
 std::set<int> familyOf(store::StoreEngine& store, int id) {

@@ -3,6 +3,7 @@
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/KeyValue.h"
 #include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
 
@@ -39,11 +40,9 @@ std::size_t ticketCount(store::StoreEngine& store) {
 
 void info(const Invocation& invocation) {
     const auto store = invocation.open();
-    const auto name = store->key(0, 0, "System/ServerName");
-    const auto* value = name ? name->first() : nullptr;
-    const auto* text = value != nullptr ? std::get_if<store::Text>(value) : nullptr;
+    const auto name = textOf(store->key(0, 0, "System/ServerName"));
     showObject(Row{{"store", textOrBytes(invocation.givenAddress())},
-                   {"server", text != nullptr ? textOrBytes(text->bytes->text) : Json()},
+                   {"server", name ? textOrBytes(*name) : Json()},
                    {"jobs", store->ids(jobType).size()},
                    {"presets", store->ids(presetType).size()},
                    {"tickets", ticketCount(*store)},

@@ -59,6 +59,15 @@ TicketName ticketNamed(const std::string& text) {
             wholeNumber(text.substr(slash + 1), 0, highestId, "id of a ticket")};
 }
 
+int jobNumber(const std::string& text) {
+    const TicketName name =
+        text.find('/') != std::string::npos ? ticketNamed(text) : ticketNamed("job/" + text);
+    if (name.type != jobType) {
+        throw Failure(Status::BadInput, textOf(name) + " is no job");
+    }
+    return name.id;
+}
+
 std::string textOf(const TicketName& name) {
     if (name == TicketName{}) {
         return "system";

@@ -19,6 +19,9 @@ struct TicketName {
 /// for anything else, and for types above 49 and ids above 16,777,215.
 TicketName ticketNamed(const std::string& text);
 
+/// The id of a job, from "7" or "job/7".
+int jobNumber(const std::string& text);
+
 /// From "job", "preset", "system" or a number.
 int typeNamed(const std::string& text);
 

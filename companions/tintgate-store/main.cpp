@@ -34,6 +34,7 @@ Examples:
   tintgate-store export job/7 -o job-7.json
   tintgate-store file versions /jobs/7/job.jdf
   tintgate-store reset 7 --strip 1
+  tintgate-store jdf ready 7 --updates 6
 
 Each command has a --help of its own. docs/stores.md shows how to set up a whole job.
 
@@ -53,6 +54,8 @@ Exit status:
   12  a file of this machine can't be read or written
   13  anything else; the message tells
   14  the server was lost on the way; a change may have been made: look, and try again
+  15  the JDF is not well-formed, or would mislead its update; nothing was changed
+  16  the JDF would be too large; nothing was changed
   64  the command line is not understood)";
 
 int end(Status status) {
@@ -153,6 +156,7 @@ int main(int argumentCount, char** arguments) {
     admin::addKeyCommands(program, invocation);
     admin::addFileCommands(program, invocation);
     admin::addJobCommands(program, invocation);
+    admin::addJdfCommands(program, invocation);
     program.footer(footer);
     unmarkOptions(program);
     auto words = markedArguments(argumentCount, arguments);

@@ -1,0 +1,176 @@
+#include "companions/tintgate-store/JobJdf.h"
+
+#include <algorithm>
+#include <sstream>
+
+#include <strings.h>
+
+#include "companions/tintgate-store/Bytes.h"
+#include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/JdfText.h"
+#include "companions/tintgate-store/KeyValue.h"
+#include "companions/tintgate-store/TicketName.h"
+
+namespace admin {
+
+namespace {
+
+/// Sub types of jobs whose JDF has a place of its own until they have been measured.
+constexpr int remoteSubTypes[] = {80, 81, 86};
+
+std::string contentOf(store::StoreEngine& store, const std::string& path) {
+    std::ostringstream content;
+    store.getFile(path, content);
+    return std::move(content).str();
+}
+
+std::string versionOf(store::StoreEngine& store, const std::string& path, int number) {
+    std::ostringstream content;
+    store.getVersion(path, number, content);
+    return std::move(content).str();
+}
+
+bool isThere(store::StoreEngine& store, const std::string& path) {
+    try {
+        contentOf(store, path);
+        return true;
+    } catch (const store::StoreFailure& failure) {
+        if (failure.fault != store::Fault::NoFile) {
+            throw;
+        }
+        return false;
+    }
+}
+
+/// Throws Failure (Busy), with the file as others wrote it, where it was not `before` any more.
+/// Then what was kept last is neither that nor, where others wrote since, `after`.
+void exchange(store::StoreEngine& store, const std::string& path, const std::string& before,
+              const std::string& after) {
+    std::istringstream from(after);
+    store.putFile(path, from);
+    const auto versions = store.versions(path);
+    if (versions.empty()) { // Pruned already.
+        return;
+    }
+    const int last = versions.back().number;
+    const std::string kept = versionOf(store, path, last);
+    if (kept != before && kept != after) {
+        store.restoreVersion(path, last);
+        throw Failure(Status::Busy, "somebody else wrote the file meanwhile: try again");
+    }
+}
+
+/// Has a failure's text start with the file that it is about.
+template<class Work>
+auto about(const std::string& path, Work work) {
+    try {
+        return work();
+    } catch (const Failure& failure) {
+        throw Failure(failure.status, printable(path) + ": " + failure.what());
+    }
+}
+
+/// By number, and the file as it stands behind them with the number 0.
+std::vector<std::pair<int, std::string>> allVersions(store::StoreEngine& store,
+                                                     const std::string& path, int from) {
+    std::vector<std::pair<int, std::string>> versions;
+    for (const auto& version : store.versions(path)) {
+        if (version.number >= from) {
+            versions.emplace_back(version.number, versionOf(store, path, version.number));
+        }
+    }
+    versions.emplace_back(0, contentOf(store, path));
+    return versions;
+}
+
+} // namespace
+
+std::vector<std::string> jdfPathsOf(store::StoreEngine& store, int job) {
+    const std::string name = textOf({jobType, job});
+    if (!store.exists(jobType, job)) {
+        throw Failure(Status::NotThere, "there is no " + name);
+    }
+    const auto text = [&](const char* key) {
+        return textOf(store.key(jobType, job, key)).value_or("");
+    };
+    std::vector<std::string> paths;
+    const std::string folder = text("System/Folders/Temp");
+    const std::string jdf = text("Output/Jdf/FileName");
+    const std::string inFolder = (folder.empty() ? text("Workflow/RemoteOutFolder") : folder);
+    if (!inFolder.empty() && !jdf.empty()) {
+        paths.push_back(inFolder + "/" + jdf);
+    }
+    const int subType = integerOf(store.key(jobType, job, "Input/SubType")).value_or(0);
+    const std::string remote = text("Remote/JDFName");
+    if (std::find(std::begin(remoteSubTypes), std::end(remoteSubTypes), subType) !=
+            std::end(remoteSubTypes) &&
+        !remote.empty()) {
+        paths.push_back(remote);
+    }
+    if (paths.empty()) {
+        throw Failure(Status::NotThere, name + " names no JDF (Output/Jdf/FileName, "
+                                               "System/Folders/Temp)");
+    }
+    std::string missing;
+    const auto gone = [&](const std::string& path) {
+        const bool there = isThere(store, path);
+        missing += there ? "" : " " + printable(path);
+        return !there;
+    };
+    paths.erase(std::remove_if(paths.begin(), paths.end(), gone), paths.end());
+    if (paths.empty()) {
+        throw Failure(Status::NotThere, "the JDF of " + name + " is not there:" + missing);
+    }
+    return paths;
+}
+
+bool isJdfName(const std::string& path) {
+    constexpr std::size_t length = 4;
+    return path.size() > length && strcasecmp(path.c_str() + path.size() - length, ".jdf") == 0;
+}
+
+int updatesAtDelivery(store::StoreEngine& store) {
+    return std::max(0, integerOf(store.key(0, 0, "System/Jdf/Updates")).value_or(0));
+}
+
+std::vector<std::string> readyJdf(store::StoreEngine& store, const std::string& path, int updates) {
+    return about(path, [&] {
+        const std::string before = contentOf(store, path);
+        const PreparedJdf jdf = prepared(before, updates);
+        if (!jdf.changes.empty()) {
+            exchange(store, path, before, jdf.text);
+        }
+        return jdf.changes;
+    });
+}
+
+Rebuilt rebuildJdf(store::StoreEngine& store, const std::string& path, int from, int updates) {
+    return about(path, [&] {
+        const auto versions = allVersions(store, path, from);
+        const auto base = std::find_if(versions.begin(), versions.end(),
+                                       [](const auto& version) { return isSound(version.second); });
+        if (base == versions.end()) {
+            throw Failure(Status::JdfNotSound, "no version of it is well-formed");
+        }
+        const std::string sound = prepared(base->second, updates).text;
+        std::vector<std::string> added;
+        for (const auto& [number, text] : versions) {
+            for (auto& measurement : measurementsIn(text)) {
+                if (sound.find(measurement) == std::string::npos &&
+                    std::find(added.begin(), added.end(), measurement) == added.end()) {
+                    added.push_back(std::move(measurement));
+                }
+            }
+        }
+        const std::string after = withMeasurements(sound, added);
+        const std::string& before = versions.back().second;
+        Rebuilt result{base->first, static_cast<int>(measurementsIn(after).size()),
+                       after != before};
+        if (result.changed) {
+            exchange(store, path, before, after);
+        }
+        return result;
+    });
+}
+
+} // namespace admin

@@ -1,0 +1,28 @@
+// What the reader of one value finds in a key: its first element, where that has the wanted type.
+#pragma once
+
+#include <memory>
+#include <optional>
+#include <string>
+
+#include "comgui/TicketContent.h"
+
+namespace admin {
+
+template<class T>
+const T* firstOf(const std::shared_ptr<const store::Elements>& elements) {
+    const auto* const value = elements ? elements->first() : nullptr;
+    return value != nullptr ? std::get_if<T>(value) : nullptr;
+}
+
+inline std::optional<int> integerOf(const std::shared_ptr<const store::Elements>& elements) {
+    const int* const number = firstOf<int>(elements);
+    return number != nullptr ? std::optional(*number) : std::nullopt;
+}
+
+inline std::optional<std::string> textOf(const std::shared_ptr<const store::Elements>& elements) {
+    const auto* const text = firstOf<store::Text>(elements);
+    return text != nullptr ? std::optional(text->bytes->text) : std::nullopt;
+}
+
+} // namespace admin
