@@ -314,7 +314,7 @@ TEST_P(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
         m_day = 0;
         put(c.before);
         const Outcome outcome = run({"jdf", "ready", "7"});
-        EXPECT_EQ(outcome.exitCode, c.after.empty() ? 14 : 0) << outcome.error;
+        EXPECT_EQ(outcome.exitCode, c.after.empty() ? 15 : 0) << outcome.error;
         EXPECT_THAT(outcome.error, HasSubstr(c.words));
         EXPECT_EQ(withoutBlanks(stored()), c.after.empty() ? c.before : c.after);
         if (!c.after.empty()) {
@@ -355,7 +355,7 @@ TEST_P(JdfUpdates, ThatDidDamageAreUndone) {
     EXPECT_THAT(stored(), HasSubstr("<JDF><new/>"));
     EXPECT_TRUE(measurements(stored()).empty());
     put("<JDF>");
-    EXPECT_EQ(run({"jdf", "rebuild", "7", "--from", "99"}).exitCode, 14);
+    EXPECT_EQ(run({"jdf", "rebuild", "7", "--from", "99"}).exitCode, 15);
     EXPECT_EQ(stored(), "<JDF>");
 }
 
@@ -372,7 +372,7 @@ TEST_P(JdfCommands, SayWhatIsMissing) {
     EXPECT_THAT(refused({"jdf", "ready", "7"}, 1), HasSubstr("not there: " + jdfPath));
     EXPECT_THAT(refused({"jdf", "rebuild", "preset/1"}, 3), HasSubstr("no job"));
     put(delivered);
-    EXPECT_THAT(refused({"jdf", "ready", "7", "--updates", "17"}, 15), HasSubstr("too many"));
+    EXPECT_THAT(refused({"jdf", "ready", "7", "--updates", "17"}, 16), HasSubstr("too many"));
     refused({"jdf", "ready", "7", "--updates", "0"}, 3);
     EXPECT_EQ(stored(), delivered);
     answer({"jdf", "ready", "7", "--updates", "16"});
