@@ -39,7 +39,7 @@ Json jobOf(const KZJobDataStruct& job) {
             {"title", optional(job.title)},
             {"type", job.jobType},
             {"parentId", job.parentID > 0 ? Json(job.parentID) : Json()},
-            {"strip", job.secondStrip == 1 ? 2 : 1},
+            {"strip", job.secondStrip != 0 ? 2 : 1},
             {"dynamicStrip", job.useDynstrip == 1},
             {"nestedStrip", job.nestedStrip == 1},
             {"inline", job.inlineVerifyJob == 1},

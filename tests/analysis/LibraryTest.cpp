@@ -309,7 +309,7 @@ TEST(Library, MetaTellsOfTheJobButNotItsPassword) {
     job.title = wxString(L"\u00dcber \"alles\"\n\U0001F3A8");
     job.password = "s3cret";
     job.userName = "anna";
-    job.secondStrip = 1;
+    job.secondStrip = 2; // Whatever is not 0 is the second.
     job.parentID = 5;
     job.tempDir = wxString(stringToWstring("/tmp/JobID_7\xff"));
     job.tolerance.deltaEMode = 4;
