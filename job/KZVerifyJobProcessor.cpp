@@ -9,18 +9,22 @@
 
 namespace {
 
-/// The program's folder in the temporary folder; empty where that is no folder of this user's own.
+/// Where the program has no folder of its own: nothing can be made below it, so that log and files
+/// fail to open. An empty name would put them at the top of the machine.
+constexpr const char* nowhere = "/dev/null/Tintgate";
+
+/// The program's folder in the temporary folder; nowhere if that is no folder of this user's own.
 /// As bytes throughout: a folder's name need not be valid text.
 wxString makeWorkingDir() {
     std::string folder = platform::temporaryFolder();
     if (folder.empty()) {
-        return {};
+        return nowhere;
     }
     while (folder.size() > 1 && folder.back() == '/') {
         folder.pop_back();
     }
     folder += "/Tintgate";
-    return platform::haveOwnFolder(folder, 0777) ? wxString(stringToWstring(folder)) : wxString();
+    return platform::haveOwnFolder(folder, 0777) ? wxString(stringToWstring(folder)) : wxString(nowhere);
 }
 
 } // namespace
