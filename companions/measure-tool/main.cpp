@@ -4,11 +4,13 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <algorithm>
 #include <cstdio>
 #include <ctime>
 #include <filesystem>
 #include <memory>
 #include <new>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -71,8 +73,11 @@ int end(Status status) {
     return static_cast<int>(status);
 }
 
-int fail(Status status, const char* words) {
-    std::fprintf(stderr, "NerovaMeasure: %s\n", words);
+/// Ids and names of foreign files may stand in the words: a terminal is not to obey them.
+int fail(Status status, std::string words) {
+    std::replace_if(
+        words.begin(), words.end(), [](unsigned char c) { return c < 0x20 || c == 0x7F; }, '?');
+    std::fprintf(stderr, "NerovaMeasure: %s\n", words.c_str());
     return end(status);
 }
 
@@ -147,7 +152,7 @@ int main(int argumentCount, char** arguments) {
         return fail(failure.status, failure.what());
     } catch (const std::bad_alloc&) {
         return fail(Status::OutOfMemory, "out of memory");
-    } catch (const std::exception& failure) {
-        return fail(Status::BadOptions, failure.what());
+    } catch (const std::length_error&) {
+        return fail(Status::OutOfMemory, "out of memory");
     }
 }

@@ -521,6 +521,7 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
         {options, virtualPrint + "mishap = explode", 3, "wants none, fail"},
         {options, virtualPrint + "mishap-at = 0", 3, "wants the number of a patch"},
         {options, virtualPrint + "profile = x", 3, "has profile a second time"},
+        {options, virtualPrint + "\x1b[2J = yes", 3, "\"?[2J\", which"},
         {options, virtualPrint + "colour = yes", 3, "\"colour\", which is no setting"},
         {options, virtualPrint + "spectra", 3, "has no ="},
         {options, "instrument = virtual\nprofile = missing", 6, "missing is not there"},
