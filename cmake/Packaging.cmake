@@ -1,6 +1,9 @@
-# What an installation holds, and the Debian packages made of it by `cpack` in the build folder:
-# tintgate (programs, presets, pages), libtintgate1 (the analysis library) and libtintgate-dev (its
-# headers).
+# What an installation holds, and the Debian packages made of it by scripts/package.sh: tintgate (the
+# tool, presets, pages), libtintgate1 (the analysis library), libtintgate-dev (its headers),
+# tintgate-comgui (the comm plug-in) and tintgate-companions (the programs beside the tool).
+#
+# The packages share a system root, with which the packaged tool is built (TINTGATE_PACKAGE):
+# tintgate-comgui and tintgate-companions each bring their part of what Suite.cmake installs.
 
 set(_share "${CMAKE_INSTALL_DATADIR}/tintgate")
 set(_doc "${CMAKE_INSTALL_DATADIR}/doc")
@@ -14,6 +17,7 @@ set(_maker "${PROJECT_SOURCE_DIR}/scripts/make-exit-codes.py")
 set(_page "${PROJECT_SOURCE_DIR}/docs/Tintgate.1.in")
 set(_changes "${PROJECT_SOURCE_DIR}/debian/changelog")
 set(_pages "${_made}/exit-codes.md" "${_made}/Tintgate.1.gz" "${_made}/changelog.gz")
+set(_cli_maker "${PROJECT_SOURCE_DIR}/scripts/make-cli-pages.py")
 find_program(GZIP gzip REQUIRED)
 file(MAKE_DIRECTORY "${_made}")
 add_custom_command(OUTPUT ${_pages}
@@ -23,6 +27,38 @@ add_custom_command(OUTPUT ${_pages}
   COMMAND ${GZIP} -9nc "${_changes}" > "${_made}/changelog.gz"
   DEPENDS "${_codes}" "${_maker}" "${_page}" "${_changes}"
   COMMENT "Making the pages that list exit codes" VERBATIM)
+
+# Programs that explain themselves: name of the page, and the target that is asked.
+set(_explained
+  tintgate-store=tintgate-store
+  tintgate-report=tintgate-report)
+foreach(_pair IN LISTS _explained)
+  string(REPLACE "=" ";" _pair "${_pair}")
+  list(GET _pair 0 _name)
+  list(GET _pair 1 _target)
+  add_custom_command(OUTPUT "${_made}/${_name}.1.gz" "${_made}/${_name}.completion"
+    COMMAND Python3::Interpreter "${_cli_maker}" man $<TARGET_FILE:${_target}> ${PROJECT_VERSION}
+      "${_made}/${_name}.1"
+    COMMAND Python3::Interpreter "${_cli_maker}" completion $<TARGET_FILE:${_target}>
+      "${_made}/${_name}.completion"
+    COMMAND ${GZIP} -9nc "${_made}/${_name}.1" > "${_made}/${_name}.1.gz"
+    DEPENDS ${_target} "${_cli_maker}"
+    COMMENT "Asking ${_name} for its pages" VERBATIM)
+  list(APPEND _pages "${_made}/${_name}.1.gz" "${_made}/${_name}.completion")
+  install(FILES "${_made}/${_name}.1.gz" DESTINATION "${CMAKE_INSTALL_MANDIR}/man1"
+    COMPONENT tintgate-companions)
+  install(FILES "${_made}/${_name}.completion" RENAME ${_name}
+    DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions"
+    COMPONENT tintgate-companions)
+endforeach()
+foreach(_name NerovaMeasure NerovaVerify)
+  add_custom_command(OUTPUT "${_made}/${_name}.1.gz"
+    COMMAND ${GZIP} -9nc "${PROJECT_SOURCE_DIR}/docs/${_name}.1" > "${_made}/${_name}.1.gz"
+    DEPENDS "${PROJECT_SOURCE_DIR}/docs/${_name}.1" VERBATIM)
+  list(APPEND _pages "${_made}/${_name}.1.gz")
+  install(FILES "${_made}/${_name}.1.gz" DESTINATION "${CMAKE_INSTALL_MANDIR}/man1"
+    COMPONENT tintgate-companions)
+endforeach()
 add_custom_target(pages ALL DEPENDS ${_pages})
 
 install(TARGETS Tintgate RUNTIME COMPONENT tintgate)
@@ -33,13 +69,32 @@ install(FILES README.md "${_made}/exit-codes.md" DESTINATION "${_doc}/tintgate"
   COMPONENT tintgate)
 install(DIRECTORY docs/ DESTINATION "${_doc}/tintgate" COMPONENT tintgate
   FILES_MATCHING PATTERN "*.md" PATTERN "*.json")
+install(FILES docs/Tintgate.completion RENAME Tintgate
+  DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions" COMPONENT tintgate)
+
+# The suite's installation, below the packages' root, less what the other package brings.
+function(install_suite_for component)
+  list(TRANSFORM ARGN PREPEND "\${_root}/" OUTPUT_VARIABLE _others)
+  list(JOIN _others "\" \"" _others)
+  install(CODE "
+    set(_root \"\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/${TINTGATE_PACKAGE_ROOT}\")
+    execute_process(COMMAND \"${CMAKE_COMMAND}\" --install \"${PROJECT_BINARY_DIR}\"
+      --component companions --prefix \"\${CMAKE_INSTALL_PREFIX}/${TINTGATE_PACKAGE_ROOT}\"
+      OUTPUT_QUIET COMMAND_ERROR_IS_FATAL ANY)
+    file(REMOVE_RECURSE \"${_others}\")" COMPONENT ${component})
+endfunction()
+install_suite_for(tintgate-comgui Applications Library/Preferences/NerovaMeasure.conf.example
+  Library/Preferences/ApplicationsUsingNerovaMeasure_x64.plist)
+install_suite_for(tintgate-companions lib usr Library/Preferences/Qen)
+
 install(TARGETS libTintgate
   LIBRARY COMPONENT libtintgate1 NAMELINK_COMPONENT libtintgate-dev)
 install(FILES job/AnalysisLibrary.h job/JobRecords.h DESTINATION "${_include}/job"
   COMPONENT libtintgate-dev)
 install(FILES "${PROJECT_BINARY_DIR}/see/exitcodes/ExitCodes.h" DESTINATION "${_include}"
   COMPONENT libtintgate-dev)
-foreach(_package tintgate libtintgate1 libtintgate-dev)
+set(_packages tintgate libtintgate1 libtintgate-dev tintgate-comgui tintgate-companions)
+foreach(_package IN LISTS _packages)
   install(FILES debian/copyright "${_made}/changelog.gz" DESTINATION "${_doc}/${_package}"
     COMPONENT ${_package})
 endforeach()
@@ -50,10 +105,12 @@ set(CPACK_PACKAGE_VENDOR "Tintgate")
 set(CPACK_PACKAGE_CONTACT "Tintgate maintainers <maintainers@tintgate.example>")
 set(CPACK_PACKAGE_DESCRIPTION_SUMMARY "") # Each package has one of its own.
 set(CPACK_PACKAGING_INSTALL_PREFIX /usr)
+set(CPACK_SET_DESTDIR ON) # What is written at installation names its final place.
+set(CPACK_INSTALL_PREFIX /usr)
 set(CPACK_STRIP_FILES ON)
 set(CPACK_INSTALL_DEFAULT_DIRECTORY_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE
   GROUP_READ GROUP_EXECUTE WORLD_READ WORLD_EXECUTE)
-set(CPACK_COMPONENTS_ALL tintgate libtintgate1 libtintgate-dev)
+set(CPACK_COMPONENTS_ALL ${_packages})
 set(CPACK_DEB_COMPONENT_INSTALL ON)
 set(CPACK_DEBIAN_FILE_NAME DEB-DEFAULT)
 set(CPACK_DEBIAN_PACKAGE_CONTROL_STRICT_PERMISSION ON)
@@ -66,6 +123,7 @@ set(CPACK_DEBIAN_TINTGATE_PACKAGE_SECTION graphics)
 file(STRINGS "${ICU_INCLUDE_DIR}/unicode/uvernum.h" _icu REGEX "^#define U_ICU_VERSION_SHORT ")
 string(REGEX MATCH "[0-9]+" _icu "${_icu}")
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_DEPENDS "libtintgate1 (>= ${PROJECT_VERSION}), libicu${_icu}")
+set(CPACK_DEBIAN_TINTGATE_PACKAGE_RECOMMENDS "tintgate-comgui, tintgate-companions")
 # So is libpq, by those whose store is on a server.
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_RECOMMENDS "libpq5 (>= 14)")
 set(CPACK_DEBIAN_TINTGATE_DESCRIPTION "verifies the colour of print jobs
@@ -90,4 +148,21 @@ set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_DEPENDS
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_DESCRIPTION "analysis library of Tintgate, for developers
 Compares colour data, judges the outcome by a tolerance preset and writes it as
 JSON. This package holds the headers.")
+
+set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_NAME tintgate-comgui)
+set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_SECTION graphics)
+# Opened when a store's address names a server.
+set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_RECOMMENDS libpq5)
+set(CPACK_DEBIAN_TINTGATE-COMGUI_DESCRIPTION "ticket stores for Tintgate
+The plug-in that connects Tintgate to a print server's jobs: a store in a folder,
+or on a PostgreSQL server.")
+
+set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_NAME tintgate-companions)
+set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_SECTION graphics)
+set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_DEPENDS
+  "tintgate-comgui (= ${PROJECT_VERSION})")
+set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_RECOMMENDS "icc-profiles-free, xdg-utils")
+set(CPACK_DEBIAN_TINTGATE-COMPANIONS_DESCRIPTION "programs beside Tintgate
+The measuring tool, the viewer of verified jobs, the administration of ticket
+stores (tintgate-store), and reports and trends of results (tintgate-report).")
 include(CPack)

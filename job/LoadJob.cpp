@@ -204,7 +204,7 @@ int fetchJdf(JobLoad& load) {
         return code;
     }
     const wxString path = wxFileName(job.jdfServerFile).GetFullPath();
-    if (fetchFile(load, path, fileWait, &job.jdfLocalFile)) {
+    if (!path.empty() && fetchFile(load, path, fileWait, &job.jdfLocalFile)) {
         return 0;
     }
     job.jdfServerFile.clear();

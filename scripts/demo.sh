@@ -1,10 +1,13 @@
 #!/usr/bin/env bash
 # Builds the tool and shows it at work on real data: characterisations of printing conditions, and
-# CMYK profiles, as Debian ships them. The result files stay in build/demo.
+# CMYK profiles, as Debian ships them. First it compares files, then it verifies the jobs of a print
+# room. What comes out stays in build/demo.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
 scripts/setup.sh
 cmake --preset release >/dev/null
-cmake --build --preset release --target Tintgate
-exec python3 scripts/demo.py build/release/bin/Tintgate build/demo
+cmake --build --preset release --target Tintgate tintgate-store tintgate-report ComGUI \
+  NerovaMeasure viewer plist-reader
+python3 scripts/demo.py build/release/bin/Tintgate build/demo/files
+exec python3 scripts/demo_jobs.py build/release build/demo/jobs

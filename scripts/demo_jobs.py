@@ -13,8 +13,9 @@ import os
 import shutil
 import subprocess
 import sys
+import textwrap
 import time
-from dataclasses import dataclass, field
+from dataclasses import dataclass
 from pathlib import Path
 
 ICC = Path("/usr/share/color/icc")
@@ -39,7 +40,7 @@ class Run:
     title: str
     strip: int = 1
     remeasure: bool = False
-    instrument: dict = field(default_factory=dict)  # Settings of the measuring tool.
+    instrument: str = ""  # Settings of the measuring tool.
 
 
 STORED = [
@@ -49,6 +50,31 @@ STORED = [
         (1, 2)),
     Job(4, "Against a profile", ["--references", PROFILE, "--measured", ICC / "TR002.ti3"]),
 ]
+
+
+# Jobs that are still to be measured, printed by the virtual instrument. Nobody uses the results of a
+# virtual instrument for a print.
+PRINTED = f"instrument = virtual\nprofile = {PROFILE}\nerror = 0.6\n"
+TINTED = PRINTED + "bias = -1.5 0.5 4\n"
+TO_MEASURE = ["--unmeasured", "--references", PROFILE]
+UNMEASURED = [
+    Job(5, "One strip", TO_MEASURE),
+    Job(6, "Two strips", [*TO_MEASURE, "--two-strips"], (1, 2)),
+    Job(7, "Nested, left", [*TO_MEASURE, "--parent", "100"]),
+    Job(8, "Nested, right", [*TO_MEASURE, "--parent", "100"]),
+]
+# One after the other; the runs of a batch side by side.
+BATCHES = [
+    ("One strip, the first of two, and a strip for two nested jobs",
+     [Run(5, "One strip", instrument=TINTED), Run(6, "First of two strips", instrument=PRINTED),
+      Run(7, "Nested, for both jobs", instrument=PRINTED)]),
+    ("The second strip, and the first job again, on a better print",
+     [Run(6, "Second of two strips", 2, instrument=PRINTED + "spectra = yes\n"),
+      Run(5, "One strip, remeasured", remeasure=True, instrument=PRINTED)]),
+]
+SHOWN = ["Job/Display/Status", "Process/InfoMessage", "Remote/Measurement/Status",
+         "Remote/Measurement/Approval", "Remote/Measurement/Values/Measured",
+         "Remote/Measurement2/Approval"]
 
 
 def headline(text):
@@ -97,8 +123,11 @@ class Room:
         environment = {name: value for name, value in os.environ.items()
                        if name not in ("DISPLAY", "WAYLAND_DISPLAY")}  # No browser for each.
         environment |= {"TINTGATE_ROOT": str((place / "root").resolve()),
-                        "TMPDIR": str((place / "tmp").resolve()), **run.instrument}
-        arguments = [f"KEY_KZ_HOST:=:{self.store.resolve()}", f"KEY_KZ_STRIP:=:{run.strip}",
+                        "TMPDIR": str((place / "tmp").resolve())}
+        if run.instrument:
+            (place / "measure.conf").write_text(run.instrument, encoding="ascii")
+            environment["TINTGATE_MEASURE"] = str((place / "measure.conf").resolve())
+        arguments = [f"KEY_KZ_HOST:=:{self.store.resolve()}", f"KEY_KZ_STRIP:=:{run.strip - 1}",
                      f"KEY_KZ_JOBID:=:{run.job}", "KEY_KZ_LANGUAGE:=:en_US", "KEY_KZ_MODE:=:0",
                      f"KEY_KZ_PASSWORD:=:{PASSWORD}", f"KEY_KZ_USER:=:{USER}"]
         if run.remeasure:
@@ -150,16 +179,62 @@ def verdict_of(result):
                                f"at most {worst['tolerance']:g} {worst['unit']}")
 
 
+def show_tickets(room, numbers):
+    """What the write-back changes, of some tickets."""
+    rows = [(f"job {number}", [held(room, number, key) for key in SHOWN]) for number in numbers]
+    names = [key.removeprefix("Remote/").replace("Measurement", "M") for key in SHOWN]
+    widths = [max(len(name), *(len(values[index]) for _, values in rows))
+              for index, name in enumerate(names)]
+    print("\n  TICKET   " + "  ".join(f"{name:{width}}" for name, width in zip(names, widths)))
+    for ticket, values in rows:
+        print(f"  {ticket:8} " + "  ".join(f"{value:{width}}" for value, width in zip(values, widths)))
+
+
+def held(room, number, key):
+    done = subprocess.run([room.build / "bin/tintgate-store", "--store", room.store, "key", "get",
+                           f"job/{number}", key], capture_output=True, text=True, check=False)
+    values = done.stdout.split("\n")[:-1]
+    return "-" if done.returncode != 0 else values[0] if len(values) == 1 else f"{len(values)} values"
+
+
+def show_jdf(room, number):
+    """The element that the write-back puts into a job's JDF, without its many patches."""
+    path = room.folder / f"job-{number}.jdf"
+    room.administer("file", "get", f"/server/temp/job-{number}.jdf", path)
+    text = path.read_text(encoding="utf-8", errors="replace")
+    print(f"\nThe measurement in the JDF of job {number} ({len(text)} bytes, in {path}):\n")
+    lines = [line.strip() for line in text.splitlines() if "<tazo:" in line]
+    for line in lines[:2]:
+        print(textwrap.fill(line, 100, initial_indent="  ", subsequent_indent="      "))
+    print(f"  ... and {len(lines) - 2} lines more")
+    return len(lines) == 0
+
+
 def main(build, folder):
     room = Room(Path(build), Path(folder))
     codes = meanings()
 
-    headline("Jobs that were measured already")
+    headline("Jobs that were measured already: compared, and shown")
     for job in STORED:
         room.deliver(job)
     print(room.administer("jobs"))
-    runs = [Run(job.number, job.title, strip) for job in STORED for strip in job.strips]
-    surprises = run_all(room, runs, codes)
+    surprises = run_all(
+        room, [Run(job.number, job.title, strip) for job in STORED for strip in job.strips], codes)
+
+    headline("Jobs to be measured: printed by a virtual instrument, results written back")
+    # Each JDF is made ready for its updates at delivery.
+    room.administer("key", "set", "system", "System/Jdf/Updates", "int", "6")
+    for job in UNMEASURED:
+        room.deliver(job)
+    numbers = [5, 6, 7, 8, 100]
+    show_tickets(room, numbers)
+    for title, runs in BATCHES:
+        print(f"\n{title}:")
+        surprises += run_all(room, runs, codes)
+        show_tickets(room, numbers)
+    surprises += show_jdf(room, 5)
+    print()
+    print(room.administer("jobs"))
     return 1 if surprises else 0
 
 

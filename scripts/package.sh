@@ -1,0 +1,14 @@
+#!/usr/bin/env bash
+# Builds the Debian packages; they stand in build/package.
+set -euo pipefail
+cd "$(dirname "$0")/.."
+
+scripts/setup.sh
+cmake --preset package >/dev/null
+cmake --build --preset package
+cd build/package
+rm -f ./*.deb
+cpack -G DEB
+if command -v lintian >/dev/null; then
+  lintian --fail-on error ./*.deb
+fi
