@@ -1,4 +1,4 @@
-#include "companions/measure-tool/Session.h"
+#include "companions/measure-tool/MeasureAll.h"
 
 #include <sys/resource.h>
 
