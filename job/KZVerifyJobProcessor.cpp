@@ -24,7 +24,8 @@ wxString makeWorkingDir() {
         folder.pop_back();
     }
     folder += "/Tintgate";
-    return platform::haveOwnFolder(folder, 0777) ? wxString(stringToWstring(folder)) : wxString(nowhere);
+    return platform::haveOwnFolder(folder, 0777) ? wxString(stringToWstring(folder))
+                                                 : wxString(nowhere);
 }
 
 } // namespace

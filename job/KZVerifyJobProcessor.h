@@ -27,9 +27,10 @@ class KZVerifyJobProcessor {
     KZVerifyJobProcessor(const KZVerifyJobProcessor&) = delete;
     KZVerifyJobProcessor& operator=(const KZVerifyJobProcessor&) = delete;
 
-    /// Finds the program's folder in the temporary folder, making it where it is missing. Empty
-    /// where that is a link or somebody else's: what a job writes holds passwords. By requirement
-    /// only the first call in a process looks; a later one returns an empty text.
+    /// Finds the program's folder in the temporary folder, making it where it is missing. Where
+    /// that is a link or somebody else's, a name below which nothing can be made: what a job writes
+    /// holds passwords. By requirement only the first call in a process looks; a later one returns
+    /// an empty text.
     wxString SetWorkingDir();
     /// m_workingDir as bytes.
     std::string GetNerovaKZJobDataDir() const;
