@@ -1,0 +1,127 @@
+#!/usr/bin/env python3
+"""Times a whole run of the job form against the comparison of the same two files.
+
+job_run.py BUILD SOURCE
+
+The job has 1,617 stored patches (FOGRA40L), each with 36 spectral values, and is compared with a
+file of characterisation data (FOGRA39L). The login, of whose time most goes into the password's
+hash, and the pause of a third of it are left out: a run with a job that is not on the server's list
+ends right after the login, and what it takes beyond `-version` is the login. The sides take turns
+and the medians of processor time are compared; time on the clock is printed beside it.
+"""
+
+import json
+import os
+import statistics
+import subprocess
+import sys
+import tempfile
+import time
+from pathlib import Path
+
+ICC = Path("/usr/share/color/icc")
+REFERENCES, MEASURED = ICC / "FOGRA39L.ti3", ICC / "FOGRA40L.ti3"
+RUNS = 15
+LIMIT = 3.0
+BANDS = 36
+
+
+def timed(command, environment, expected):
+    """Processor seconds and seconds on the clock of one run."""
+    start = time.perf_counter()
+    child = os.posix_spawn(command[0], command, environment)
+    _, status, usage = os.wait4(child, 0)
+    seconds = time.perf_counter() - start
+    code = os.waitstatus_to_exitcode(status)
+    if code != expected:
+        sys.exit(f"{' '.join(command)}: exit code {code}")
+    return usage.ru_utime + usage.ru_stime, seconds
+
+
+def whole_chart():
+    """Device values and the six colour values of each row of the measured chart."""
+    lines = MEASURED.read_text(encoding="latin-1").splitlines()
+    fields = lines[lines.index("BEGIN_DATA_FORMAT") + 1].split()
+    rows = []
+    for line in lines[lines.index("BEGIN_DATA") + 1:]:
+        if line.startswith("END_DATA"):
+            return rows
+        row = dict(zip(fields, line.split()))
+        rows.append({name: float(row[name]) for name in
+                     [f"CMYK_{ink}" for ink in "CMYK"] + ["XYZ_X", "XYZ_Y", "XYZ_Z"] +
+                     ["LAB_L", "LAB_A", "LAB_B"]})
+    return rows
+
+
+def fill_store(store, folder, source):
+    """The example job, with the whole chart as its measurement."""
+    subprocess.run([sys.executable, f"{source}/docs/example-job/make-job.py", folder / "job",
+                    "--unmeasured"], check=True, stdout=subprocess.DEVNULL)
+    tickets = json.loads((folder / "job/tickets.json").read_text(encoding="ascii"))
+    keys = next(ticket["keys"] for ticket in tickets["tickets"] if ticket["type"] == 3)
+    rows, root = whole_chart(), "Remote/Measurement"
+    for name, value in {"Status": 1, "Numpatches": len(rows), "SpectralValues/Base": 380,
+                        "SpectralValues/Length": BANDS, "SpectralValues/Stepsize": 10}.items():
+        keys[f"{root}/{name}"] = {"int": value}
+    for group, field, axes in (("CMYKValues", "CMYK", "CMYK"), ("XYZValues", "XYZ", "XYZ"),
+                               ("LabValues", "LAB", "LAB")):
+        for axis in axes:
+            keys[f"{root}/{group}/{axis}Values"] = {
+                "double": [row[f"{field}_{axis}"] for row in rows]}
+    # Spectra of grey patches: their values are written and read, and not looked at.
+    keys[f"{root}/SpectralValues/DValues"] = {
+        "double": [row["XYZ_Y"] / 100 + band / 1e4 for row in rows for band in range(BANDS)]}
+    (folder / "job/tickets.json").write_text(json.dumps(tickets), encoding="ascii")
+    for words in (["make"], ["user", "add", "anna", "--password-file", "-"],
+                  ["import", folder / "job/tickets.json"],
+                  ["file", "put", folder / "job/server", "/server"]):
+        subprocess.run([*store, *words], input="gate\n", text=True, check=True,
+                       stdout=subprocess.DEVNULL)
+
+
+def main(build, source):
+    with tempfile.TemporaryDirectory() as name:
+        folder = Path(name)
+        fill_store([f"{build}/bin/tintgate-store", "--store", folder / "store"], folder, source)
+        subprocess.run(["cmake", "--install", build, "--component", "companions", "--prefix",
+                        folder / "root"], check=True, stdout=subprocess.DEVNULL)
+        # No viewer: its start is its own affair, and it would run beside what is timed.
+        viewer = folder / "root/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify"
+        viewer.unlink()
+        viewer.symlink_to("/bin/true")
+        (folder / "tmp").mkdir()
+        environment = {"TINTGATE_ROOT": str(folder / "root"), "TMPDIR": str(folder / "tmp"),
+                       "PATH": "/usr/bin:/bin"}
+        tool = f"{build}/bin/Tintgate"
+
+        def job(number):
+            return [tool, f"KEY_KZ_HOST:=:{folder / 'store'}", "0", str(number), "en_US", "0",
+                    "gate", "anna"]
+
+        files = folder / "tmp/Tintgate/JobID_7"
+        sides = {"job": (job(7), 0), "login": (job(999), 108), "nothing": ([tool, "-version"], 0),
+                 "files": ([tool, str(files / REFERENCES.name), str(files / "Measured sample.txt"),
+                            str(files / "CVP_0001.xml"), str(folder / "result.json")], 0)}
+        os.dup2(os.open("/dev/null", os.O_WRONLY), 3)
+        sys.stdout.flush()
+        quiet = os.dup(1)
+        os.dup2(3, 1)  # -version says something.
+        runs = {side: [] for side in sides}
+        for _ in range(RUNS):
+            for side, (command, code) in sides.items():
+                runs[side].append(timed(command, environment, code))
+        os.dup2(quiet, 1)
+
+    processor, clock = ({side: statistics.median(run[measure] for run in of) * 1e3
+                         for side, of in runs.items()} for measure in (0, 1))
+    for what, times, share in (("processor", processor, 1.0), ("clock", clock, 4.0 / 3.0)):
+        besides = times["job"] - share * (times["login"] - times["nothing"])
+        ratio = besides / times["files"]
+        limit = f" (at most {LIMIT}){'' if ratio <= LIMIT else '  MISSED'}" if share == 1.0 else ""
+        print(f"a job against its files, {what}: {ratio:.2f}{limit}")
+        print(f"  job {times['job']:.1f} ms, of which login {times['login'] - times['nothing']:.1f} "
+              f"ms; files {times['files']:.1f} ms")
+
+
+if __name__ == "__main__":
+    main(*sys.argv[1:])
