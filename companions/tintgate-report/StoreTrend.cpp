@@ -306,17 +306,16 @@ bool judge(report::Criterion& criterion, double value, std::optional<bool> appro
 
 bool addCriteria(report::Sample& sample, const Results& results, const Preset& preset) {
     bool changed = false;
-    for (std::size_t i = 0; i < std::size(criterionAt) && i < results.measured.size(); ++i) {
-        const auto known =
-            std::find_if(std::begin(analysis::criteria), std::end(analysis::criteria),
-                         [&](const analysis::Criterion& c) { return c.index == criterionAt[i]; });
-        const bool holdsAverage = i == spotPosition && preset.psd() &&
+    for (const analysis::Criterion& known : analysis::criteria) {
+        const auto at = std::find(std::begin(criterionAt), std::end(criterionAt), known.index);
+        const auto position = static_cast<std::size_t>(at - std::begin(criterionAt));
+        const bool holdsAverage = position == spotPosition && preset.psd() &&
                                   preset.values->usedForPSDResult[psdSpotMaximum] != 1;
-        if (known == std::end(analysis::criteria) || holdsAverage)
+        if (at == std::end(criterionAt) || position >= results.measured.size() || holdsAverage)
             continue;
-        report::Criterion criterion = criterionOf(*known, preset);
-        changed |= judge(criterion, results.measured[i],
-                         approvalOf(results, i, known->index, preset.psd()));
+        report::Criterion criterion = criterionOf(known, preset);
+        changed |= judge(criterion, results.measured[position],
+                         approvalOf(results, position, known.index, preset.psd()));
         if (criterion.value || criterion.used)
             sample.criteria.push_back(std::move(criterion));
     }
