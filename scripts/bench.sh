@@ -17,3 +17,5 @@ for bench in "${benches[@]}"; do
 done
 echo "== the whole program"
 cmake --build --preset release --target bench_tool
+echo "== the pages of reports"
+cmake --build --preset release --target bench_report

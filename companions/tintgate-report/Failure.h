@@ -20,7 +20,7 @@ enum class Status {
     UnknownCode = 9,  ///< There is no such exit code.
     NotTidied = 10,   ///< A job's folder could not be looked at or removed.
     BadCommand = 64,
-    OutOfMemory = 70,
+    Internal = 70, ///< Out of memory, or a fault of the program.
 };
 
 /// Ends the program. The text is a sentence for people, without a full stop.

@@ -34,6 +34,22 @@ using reporting::Failure;
 using reporting::Status;
 
 constexpr const char* footer = R"(
+Examples:
+  tintgate-report result.json                     the page, beside the result
+  tintgate-report --text result.json              what matters, in the terminal
+  tintgate-report --csv result.json -o patches.csv
+  tintgate-report --verdict result.json && echo passed
+  tintgate-report results/ -o trend.html          the trend of all results below
+  tintgate-report --store /srv/tintgate --since 30d --paper matt -o trend.html
+  tintgate-report --explain $?                    behind a run of Tintgate
+  tintgate-report --tidy 30 --dry-run
+
+A trend compares only results of one paper, preset, instrument, workflow and strip
+with each other, and says which ink drifts. Its table of jobs leads to their pages,
+which stand in a folder beside it (trend.html has trend-jobs), or where the viewer
+has made them. The times are those of the jobs, else those that the measurements
+tell, else those of the files.
+
 Exit status:
    0  done; with --verdict: passed
    1  with --verdict: failed
@@ -47,7 +63,8 @@ Exit status:
    9  there is no such exit code
   10  a job's folder could not be looked at or removed
   64  the command line is not understood
-  70  out of memory)";
+  70  out of memory, or a fault of the program
+)";
 
 struct Options {
     std::vector<std::string> results;
@@ -204,63 +221,78 @@ int run(const Options& options) {
     } catch (const Failure& failure) {
         return fail(failure.status, failure.what());
     } catch (const std::bad_alloc&) {
-        return fail(Status::OutOfMemory, "out of memory");
+        return fail(Status::Internal, "out of memory");
+    } catch (const std::exception& failure) {
+        return fail(Status::Internal, failure.what());
     }
 }
 
 void addOptions(CLI::App& program, Options& options) {
-    program.add_option("RESULT", options.results,
-                       "Result files, and folders of them; \"-\" is standard input");
-    program.add_option(
-        "-o,--output", options.output,
-        "Where to write; \"-\" is standard output. Without it a page is kept under a "
-        "name of its own, which is printed");
-    auto* text = program.add_flag("--text", options.text, "A summary for a terminal");
-    auto* csv = program.add_flag("--csv", options.csv, "The patches of one result as CSV");
-    auto* verdict =
-        program.add_flag("--verdict", options.verdict, "Nothing is printed; the exit status tells");
-    csv->excludes(text);
-    verdict->excludes(text)->excludes(csv);
-    program.add_option("--meta", options.meta,
-                       "What is known of one result's job; \"meta.json\" beside an \"output.json\" "
-                       "is found without this");
+    constexpr std::size_t column = 26;
+    program.get_formatter()->column_width(column);
+    program
+        .add_option("RESULT", options.results,
+                    "Result files, and folders of them; \"-\" is\nstandard input")
+        ->type_name("");
+    program
+        .add_option("-o,--output", options.output,
+                    "Where to write; \"-\" is standard output. Without\n"
+                    "it a page gets a name of its own, overwrites\n"
+                    "nothing, and its path is printed")
+        ->type_name("FILE");
+    program.add_flag("--text", options.text, "A summary for a terminal");
+    program.add_flag("--csv", options.csv, "The patches of one result as CSV");
+    program.add_flag("--verdict", options.verdict,
+                     "Print nothing; the exit status tells the verdict\nof one result");
+    program
+        .add_option("--meta", options.meta,
+                    "What is known of one result's job; \"meta.json\"\n"
+                    "beside an \"output.json\" is found without this")
+        ->type_name("FILE");
 
-    const char* const trend = "Trend";
+    const char* const trend = "Trend (of several results, a folder or a store)";
     program.add_flag("--trend", options.trend, "A trend also of one result")->group(trend);
     program
         .add_option("--store", options.store,
-                    "The results that the jobs of this store hold. Without results the store is "
-                    "that of TINTGATE_STORE")
+                    "The results that a store's jobs hold; where no\n"
+                    "result is named, TINTGATE_STORE does the same")
+        ->type_name("ADDRESS")
         ->group(trend);
     program
         .add_option("--since", options.since,
-                    "From this day on: 2026-11-24, or 30d for 30 days ago")
+                    "From this day on: 2026-11-24, or 30d for 30 days\nago")
+        ->type_name("DAY")
         ->group(trend);
-    program.add_option("--until", options.until, "Up to this day and with it")->group(trend);
+    program.add_option("--until", options.until, "Up to this day, and with it")
+        ->type_name("DAY")
+        ->group(trend);
     for (const auto& [name, value, what] :
          {std::tuple{"--paper", &options.filter.paper, "Of papers whose names hold this text"},
           std::tuple{"--preset", &options.filter.preset,
-                     "Of the preset of this number, or of presets whose names hold this text"},
+                     "Of the preset of this number, or of those whose\nnames hold this text"},
           std::tuple{"--instrument", &options.filter.instrument,
                      "Of instruments whose names hold this text"},
           std::tuple{"--workflow", &options.filter.workflow,
-                     "Of the server's workflows whose names hold this text"}})
-        program.add_option(name, *value, what)->group(trend);
+                     "Of workflows whose names hold this text"}})
+        program.add_option(name, *value, what)->type_name("TEXT")->group(trend);
     program
         .add_flag("--no-pages", options.noPages,
-                  "Make no pages of jobs; lead only to those that are there")
+                  "Make no pages of jobs; lead to those that are\nthere")
         ->group(trend);
 
+    const char* const upkeep = "Upkeep";
     program.add_option("--explain", options.code, "What an exit code of Tintgate means")
-        ->group("Upkeep");
+        ->type_name("CODE")
+        ->group(upkeep);
     program
         .add_option("--tidy", options.tidyDays,
-                    "Remove the folders of jobs in the temporary folder in which nothing has "
-                    "changed for so many days and that no process uses")
-        ->check(CLI::Range(1, 36500))
-        ->group("Upkeep");
+                    "Remove the folders of jobs in the temporary\n"
+                    "folder in which nothing has changed for so many\n"
+                    "days and that no process uses")
+        ->type_name("DAYS")
+        ->group(upkeep);
     program.add_flag("--dry-run", options.dryRun, "With --tidy: only say what would go")
-        ->group("Upkeep");
+        ->group(upkeep);
     program.footer(footer);
 }
 
@@ -286,6 +318,11 @@ void settle(Options& options) {
             !options.results.empty() !=
         1)
         throw CLI::RequiredError("One of results, --store, --explain and --tidy");
+    if (options.text + options.csv + options.verdict > 1)
+        throw CLI::ExcludesError("--text, --csv and --verdict", "each other");
+    constexpr int mostDays = 36500;
+    if (options.tidyDays && (*options.tidyDays < 1 || *options.tidyDays > mostDays))
+        throw CLI::ValidationError("--tidy", "takes 1 to 36500 days");
     if (options.dryRun && !options.tidyDays)
         throw CLI::RequiresError("--dry-run", "--tidy");
     if ((options.csv || options.verdict || !options.meta.empty()) && wantsTrend(options))
@@ -297,7 +334,7 @@ void settle(Options& options) {
 int main(int argumentCount, char** arguments) {
     Options options;
     CLI::App program(
-        "Shows the results of colour verifications to people: one result as a page, a "
+        "Shows the results of colour verifications to people: one result as a page, a\n"
         "summary or a table of patches; many results, or those of a store, as a trend.",
         "tintgate-report");
     addOptions(program, options);
