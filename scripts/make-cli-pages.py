@@ -20,6 +20,7 @@ class Command:
     usage: str = ""
     positionals: list = field(default_factory=list)  # Pairs of name and text.
     options: list = field(default_factory=list)
+    groups: list = field(default_factory=list)  # Pairs of a heading and further options.
     names: list = field(default_factory=list)  # Pairs of a command below and its text.
     footer: list = field(default_factory=list)  # Lines.
     below: list = field(default_factory=list)
@@ -46,8 +47,10 @@ def ask(program, words=()):
     command = Command(words)
     sections = {"": []}
     current = ""
-    for line in text.splitlines():
-        if line in ("Positionals:", "Options:", "Subcommands:"):
+    lines = text.splitlines()
+    for line, after in zip(lines, [*lines[1:], ""]):
+        group = re.fullmatch(r"\S.*:", line) and after.startswith("  -")
+        if line in ("Positionals:", "Options:", "Subcommands:") or group:
             current = line[:-1]
             sections[current] = []
         elif current and line and not line.startswith(" "):
@@ -61,6 +64,8 @@ def ask(program, words=()):
     command.summary = " ".join(line for line in head if not line.startswith("Usage: "))
     command.positionals = entries(sections.get("Positionals", []))
     command.options = entries(sections.get("Options", []))
+    command.groups = [(title, entries(rows)) for title, rows in sections.items()
+                      if title not in ("", "Positionals", "Options", "Subcommands", "footer")]
     command.names = entries(sections.get("Subcommands", []))
     command.footer = sections.get("footer", [])
     command.below = [ask(program, (*words, name)) for name, _ in command.names]
@@ -104,6 +109,8 @@ def man(program, version):
              f".B {roff(command.usage)}", ".SH DESCRIPTION", roff(summary + ".")]
     lines += described(command.positionals)
     lines += [".SH OPTIONS", *described(command.options)]
+    for title, rows in command.groups:
+        lines += [f".SS {roff(title)}", *described(rows)]
     if command.below:
         lines += [".SH COMMANDS"]
         for below in command.below:
@@ -116,7 +123,8 @@ def man(program, version):
 
 def words_of(command):
     """What can stand behind a command: its long options, and the names of commands below."""
-    options = re.findall(r"--[a-z][a-z-]*", " ".join(name for name, _ in command.options))
+    rows = sum((rows for _, rows in command.groups), command.options)
+    options = re.findall(r"--[a-z][a-z-]*", " ".join(name for name, _ in rows))
     return sorted(dict.fromkeys(options)) + [name for name, _ in command.names]
 
 

@@ -250,7 +250,7 @@ void addOptions(CLI::App& program, Options& options) {
                     "beside an \"output.json\" is found without this")
         ->type_name("FILE");
 
-    const char* const trend = "Trend (of several results, a folder or a store)";
+    const char* const trend = "Trend of several results, of folders or of a store";
     program.add_flag("--trend", options.trend, "A trend also of one result")->group(trend);
     program
         .add_option("--store", options.store,
@@ -333,10 +333,8 @@ void settle(Options& options) {
 
 int main(int argumentCount, char** arguments) {
     Options options;
-    CLI::App program(
-        "Shows the results of colour verifications to people: one result as a page, a\n"
-        "summary or a table of patches; many results, or those of a store, as a trend.",
-        "tintgate-report");
+    CLI::App program("Shows results of colour verifications: one as a page, many as a trend.",
+                     "tintgate-report");
     addOptions(program, options);
     try {
         program.parse(argumentCount, arguments);
