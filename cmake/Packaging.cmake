@@ -81,11 +81,21 @@ function(install_suite_for component)
     execute_process(COMMAND \"${CMAKE_COMMAND}\" --install \"${PROJECT_BINARY_DIR}\"
       --component companions --prefix \"\${CMAKE_INSTALL_PREFIX}/${TINTGATE_PACKAGE_ROOT}\"
       OUTPUT_QUIET COMMAND_ERROR_IS_FATAL ANY)
-    file(REMOVE_RECURSE \"${_others}\")" COMPONENT ${component})
+    file(REMOVE_RECURSE \"${_others}\")
+    file(GLOB_RECURSE _programs \"\${_root}/ComGUI\" \"\${_root}/Plistbuddy\"
+      \"\${_root}/NerovaMeasure\" \"\${_root}/Nerova Verify\")
+    execute_process(COMMAND \"${CMAKE_STRIP}\" --strip-unneeded \${_programs}
+      COMMAND_ERROR_IS_FATAL ANY)" COMPONENT ${component})
 endfunction()
 install_suite_for(tintgate-comgui Applications Library/Preferences/NerovaMeasure.conf.example
   Library/Preferences/ApplicationsUsingNerovaMeasure_x64.plist)
 install_suite_for(tintgate-companions lib usr Library/Preferences/Qen)
+# A room's settings of the measuring tool belong to its administrator.
+install(CODE "
+  set(_settings \"${TINTGATE_PACKAGE_ROOT}/Library/Preferences/NerovaMeasure.conf\")
+  file(CREATE_LINK /etc/tintgate/measure.conf
+    \"\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/\${_settings}\" SYMBOLIC)"
+  COMPONENT tintgate-companions)
 
 install(TARGETS libTintgate
   LIBRARY COMPONENT libtintgate1 NAMELINK_COMPONENT libtintgate-dev)
@@ -124,8 +134,6 @@ file(STRINGS "${ICU_INCLUDE_DIR}/unicode/uvernum.h" _icu REGEX "^#define U_ICU_V
 string(REGEX MATCH "[0-9]+" _icu "${_icu}")
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_DEPENDS "libtintgate1 (>= ${PROJECT_VERSION}), libicu${_icu}")
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_RECOMMENDS "tintgate-comgui, tintgate-companions")
-# So is libpq, by those whose store is on a server.
-set(CPACK_DEBIAN_TINTGATE_PACKAGE_RECOMMENDS "libpq5 (>= 14)")
 set(CPACK_DEBIAN_TINTGATE_DESCRIPTION "verifies the colour of print jobs
 Compares the colours of a proof, a print or a printing condition with their
 targets under a tolerance preset, and says in a JSON file whether they pass.
@@ -152,15 +160,15 @@ JSON. This package holds the headers.")
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_NAME tintgate-comgui)
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_SECTION graphics)
 # Opened when a store's address names a server.
-set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_RECOMMENDS libpq5)
+set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_RECOMMENDS "libpq5 (>= 14)")
 set(CPACK_DEBIAN_TINTGATE-COMGUI_DESCRIPTION "ticket stores for Tintgate
-The plug-in that connects Tintgate to a print server's jobs: a store in a folder,
-or on a PostgreSQL server.")
+The plug-in that connects Tintgate to a print server's jobs: a store in a
+folder, or on a PostgreSQL server.")
 
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_NAME tintgate-companions)
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_SECTION graphics)
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_DEPENDS
-  "tintgate-comgui (= ${PROJECT_VERSION})")
+  "tintgate-comgui (= ${PROJECT_VERSION}), libtintgate1 (>= ${PROJECT_VERSION})")
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_RECOMMENDS "icc-profiles-free, xdg-utils")
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_DESCRIPTION "programs beside Tintgate
 The measuring tool, the viewer of verified jobs, the administration of ticket

@@ -1,0 +1,58 @@
+#!/usr/bin/env bash
+# Installs the packages of scripts/package.sh in a fresh Debian 12 without a compiler, and verifies a
+# job there: measured by the virtual instrument, then shown. Needs root, debootstrap and a mirror.
+#
+#   try-packages.sh [FOLDER]      a folder for the root, kept; else one that is removed again
+set -euo pipefail
+cd "$(dirname "$0")/.."
+
+packages=(build/package/*.deb)
+[ -e "${packages[0]}" ] || { echo "There are no packages: scripts/package.sh makes them" >&2; exit 1; }
+root=${1:-$(mktemp -d)}
+leave() {
+  umount "$root/proc" 2>/dev/null || true
+  [ $# -gt 0 ] || rm -rf "$root"
+}
+trap 'leave '"${1:+kept}" EXIT
+
+[ -e "$root/bin/sh" ] || debootstrap --variant=minbase bookworm "$root" >/dev/null
+mount -t proc proc "$root/proc"
+cp /etc/resolv.conf "$root/etc/"
+mkdir -p "$root/packages"
+cp "${packages[@]}" "$root/packages/"
+rm -f "$root"/packages/libtintgate-dev_*
+
+chroot "$root" bash -euo pipefail <<'INSIDE'
+export DEBIAN_FRONTEND=noninteractive LANG=C
+apt-get update -q >/dev/null
+apt-get install -y -q --no-install-recommends /packages/*.deb \
+  python3 icc-profiles-free libgs-common >/dev/null
+! command -v gcc g++ c++ cc >/dev/null || { echo "there is a compiler"; exit 1; }
+
+useradd --create-home --shell /bin/bash press
+mkdir -p /etc/tintgate
+profile=$(find /usr/share/color/icc/ghostscript -name default_cmyk.icc)
+printf 'instrument = virtual\nprofile = %s\nerror = 0.4\n' "$profile" >/etc/tintgate/measure.conf
+su press -c "profile='$profile' bash -euo pipefail" <<'PRESS'
+cd
+export TINTGATE_STORE=$HOME/store
+tintgate-store make
+tintgate-store user add anna --password-file - <<<gate
+tintgate-store key set system System/Jdf/Updates int 4
+/usr/share/doc/tintgate/example-job/make-job.py job --unmeasured --references "$profile"
+tintgate-store import job/tickets.json
+tintgate-store file put job/server /server
+code=0
+Tintgate "KEY_KZ_HOST:=:$TINTGATE_STORE" 0 7 en_US 0 gate anna || code=$?
+tintgate-store jobs
+folder=/tmp/tintgate-$(id -u)/Tintgate/JobID_7
+for _ in $(seq 100); do
+  compgen -G "$folder/report-*.html" && break
+  sleep 0.1
+done
+tintgate-report --text "$folder/output.json" | head -n 12
+man -w Tintgate tintgate-store tintgate-report NerovaMeasure NerovaVerify 2>/dev/null || true
+echo "exit code of the job: $code"
+exit "$code"
+PRESS
+INSIDE
