@@ -37,7 +37,7 @@ constexpr Statement raiseHighest = {
     "INSERT INTO tintgate.highest_ids AS highest (type, id) VALUES ($1, $2)"
     " ON CONFLICT (type) DO UPDATE SET id = greatest(highest.id, excluded.id)"
     " RETURNING id"};
-constexpr Statement allHighest = {"SELECT type, id FROM tintgate.highest_ids"};
+constexpr Statement allHighest = {"SELECT type, id FROM tintgate.highest_ids WHERE id > 0"};
 constexpr Statement removeTicket = {"DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2"};
 
 // The value only if it is another one than the caller has: one that this change of that ticket
@@ -89,6 +89,9 @@ constexpr Statement removeOneUser = {"DELETE FROM tintgate.users WHERE name = $1
 
 /// Held by the one who copies to the store. "TGAT" as a number.
 constexpr Statement lockCopy = {"SELECT pg_try_advisory_lock(1413955924)"};
+/// Until it is a store, nothing in it needs to be on the disk.
+constexpr Statement writeLater = {"SELECT set_config('synchronous_commit', 'off', false)"};
+constexpr Statement writeThrough = {"SELECT set_config('synchronous_commit', 'on', false)"};
 
 using Names = std::vector<std::string_view>;
 
@@ -279,7 +282,10 @@ class PostgresEngine : public StoreEngine {
                       std::istream& from) override {
         m_files.placeVersion(path, version, from);
     }
-    void finishCopy() override { postgres::finishCopy(m_connection); }
+    void finishCopy() override {
+        m_connection.run(writeThrough); // What it waits for has all before it in front.
+        postgres::finishCopy(m_connection);
+    }
 
   private:
     /// The key that was fetched last.
@@ -392,6 +398,7 @@ std::unique_ptr<StoreEngine> openPostgresCopy(const std::string& service) {
     if (connection.run(lockCopy).number(0, 0) == 0) {
         throw StoreFailure(Fault::Busy, "somebody else is copying to this store");
     }
+    connection.run(writeLater);
     return std::make_unique<PostgresEngine>(std::move(connection));
 }
 

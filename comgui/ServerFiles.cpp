@@ -213,8 +213,9 @@ Source sourceOf(std::istream& from, const Place& place) {
 /// holds a lock on itself, which tells it from what an interrupted delivery left.
 class Delivery {
   public:
-    Delivery(const Descriptor& folder, std::string what)
-        : m_folder(folder), m_what(std::move(what)) {
+    /// Unless later, all of it is on the disk when it is in place.
+    Delivery(const Descriptor& folder, std::string what, bool later = false)
+        : m_folder(folder), m_what(std::move(what)), m_later(later) {
         static int counter = 0;
         do {
             m_name = std::string(deliveryPrefix) + std::to_string(getpid()) + "-" +
@@ -239,7 +240,9 @@ class Delivery {
         while (const std::size_t count = source(block.data(), block.size())) {
             writeAll(m_file, block.data(), count, m_what);
         }
-        flush(m_file, m_what);
+        if (!m_later) {
+            flush(m_file, m_what);
+        }
     }
 
     void setTime(std::int64_t seconds) {
@@ -254,12 +257,15 @@ class Delivery {
             fail(errno, m_what);
         }
         m_name.clear();
-        flush(m_folder, m_what);
+        if (!m_later) {
+            flush(m_folder, m_what);
+        }
     }
 
   private:
     const Descriptor& m_folder;
     const std::string m_what;
+    const bool m_later;
     std::string m_name; ///< Empty once in place.
     Descriptor m_file;
 };
@@ -403,7 +409,7 @@ int Descriptor::release() {
 
 ServerFiles::ServerFiles(const std::string& storeFolder, bool create) {
     const std::string path = storeFolder + "/files";
-    if (create && mkdir(path.c_str(), 0770) != 0) {
+    if (create && mkdir(path.c_str(), 0770) != 0 && errno != EEXIST) {
         fail(errno, path);
     }
     // A link in this place is the administrator's: the files may lie on a disk of their own.
@@ -532,10 +538,16 @@ void ServerFiles::placeVersion(std::string_view path, const FileVersion& version
     const bool current = version.number == 0;
     const Descriptor folder =
         walk(m_files, current ? place.folders() : place.versions(), true, what);
-    Delivery delivery(folder, what);
+    Delivery delivery(folder, what, true);
     delivery.fill(sourceOf(from, place));
     delivery.setTime(version.time);
     delivery.putInPlace(current ? place.name() : versionName(version.number));
+}
+
+void ServerFiles::flushAll() {
+    if (syncfs(m_files.get()) != 0) {
+        fail(errno, "the store's files");
+    }
 }
 
 } // namespace store

@@ -53,7 +53,9 @@ class ServerFiles {
     void restoreVersion(std::string_view path, int number);
     int pruneVersions(std::string_view path, int keepNewest);
     int removeLeftovers();
+    /// Not on the disk before flushAll.
     void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
+    void flushAll();
 
   private:
     Descriptor m_files;

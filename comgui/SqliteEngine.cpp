@@ -12,6 +12,7 @@
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
+#include <set>
 #include <utility>
 
 #include <fcntl.h>
@@ -297,7 +298,7 @@ class SqliteEngine : public StoreEngine {
     int removeLeftovers() override { return m_files.removeLeftovers(); }
 
     std::map<int, int> highestIds() override {
-        Statement statement(m_database, "SELECT type, id FROM highest_ids");
+        Statement statement(m_database, "SELECT type, id FROM highest_ids WHERE id > 0");
         auto run = statement.run();
         std::map<int, int> ids;
         while (run.step()) {
@@ -315,6 +316,10 @@ class SqliteEngine : public StoreEngine {
         m_files.placeVersion(path, version, from);
     }
     void finishCopy() override { setKind(m_database, applicationId); }
+
+  protected:
+    Database& database() { return m_database; }
+    ServerFiles& serverFiles() { return m_files; }
 
   private:
     /// Settles the connection before a statement is prepared.
@@ -407,7 +412,22 @@ void makeSystemTicket(Database& database, const std::string& serverName) {
     }
 }
 
-void makeEmptyFolder(const std::string& address) {
+/// Whether a folder has nothing in it, or at most what a store that was not made to its end has.
+/// For what that database holds, see makeSqlite.
+bool isFree(const std::string& folder) {
+    namespace fs = std::filesystem;
+    const std::set<std::string> begun = {"files", "tickets.db", "tickets.db-wal", "tickets.db-shm"};
+    std::error_code failure;
+    for (const auto& entry : fs::directory_iterator(folder, failure)) {
+        if (begun.count(entry.path().filename()) == 0) {
+            return false;
+        }
+    }
+    const bool hasFiles = fs::exists(folder + "/files", failure);
+    return !failure && (!hasFiles || fs::is_empty(folder + "/files", failure)) && !failure;
+}
+
+void makeFolder(const std::string& address) {
     if (address.empty() || address.find('\0') != std::string::npos) {
         throw StoreFailure(Fault::BadPath, "a store needs a path");
     }
@@ -415,8 +435,7 @@ void makeEmptyFolder(const std::string& address) {
         return;
     }
     const int error = errno;
-    std::error_code failure;
-    if (error == EEXIST && std::filesystem::is_empty(address, failure) && !failure) {
+    if (error == EEXIST && isFree(address)) {
         return;
     }
     throw StoreFailure(error == EEXIST ? Fault::Exists : Fault::ReadOnly,
@@ -425,7 +444,7 @@ void makeEmptyFolder(const std::string& address) {
 
 /// Without a server's name there is nothing in it.
 void makeSqlite(const std::string& address, const std::string* serverName, std::int64_t kind) {
-    makeEmptyFolder(address);
+    makeFolder(address);
     const std::string folder = realPath(address);
     const ServerFiles files(folder, true);
     Database database(databasePath(folder), true);
@@ -435,6 +454,9 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
     chmod(databasePath(folder).c_str(), 0660 & ~mask);
     database.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = FULL");
     Transaction transaction(database);
+    if (database.number("SELECT count(*) FROM sqlite_schema") != 0) {
+        throw StoreFailure(Fault::Exists, folder + " holds a store");
+    }
     database.run(tables);
     if (serverName != nullptr) {
         makeSystemTicket(database, *serverName);
@@ -453,7 +475,8 @@ void makeSqliteStore(const std::string& address, const std::string& serverName) 
     makeSqlite(address, &serverName, applicationId);
 }
 
-/// The engine of a copy holds the lock on its folder.
+/// The engine of a copy holds the lock on its folder. Until it is a store, nothing in it needs to
+/// be on the disk.
 class SqliteCopy : public SqliteEngine {
   public:
     explicit SqliteCopy(const std::string& folder)
@@ -462,6 +485,13 @@ class SqliteCopy : public SqliteEngine {
         if (flock(m_folder.get(), LOCK_EX | LOCK_NB) != 0) {
             throw StoreFailure(Fault::Busy, "somebody else is copying to " + folder);
         }
+        database().run("PRAGMA synchronous = NORMAL");
+    }
+
+    void finishCopy() override {
+        serverFiles().flushAll();
+        database().run("PRAGMA synchronous = FULL"); // Of what is in the log so far as well.
+        SqliteEngine::finishCopy();
     }
 
   private:
@@ -469,18 +499,15 @@ class SqliteCopy : public SqliteEngine {
 };
 
 std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
-    struct stat status;
-    if (stat(databasePath(address).c_str(), &status) != 0) {
-        makeSqlite(address, nullptr, unfinishedCopyId);
-    }
     try {
         return std::make_unique<SqliteCopy>(realPath(address));
     } catch (const StoreFailure& failure) {
         if (failure.fault != Fault::Missing) {
             throw;
         }
-        throw StoreFailure(Fault::Exists, address + " holds something else than a begun copy");
     }
+    makeSqlite(address, nullptr, unfinishedCopyId);
+    return std::make_unique<SqliteCopy>(realPath(address));
 }
 
 bool upgradeSqlite(const std::string& address) {

@@ -163,15 +163,15 @@ class StoreEngine {
 
     // What a copy needs on top of these.
 
-    /// By type, the highest id that it ever had.
+    /// By type, the highest id that it ever had, if that is above 0.
     virtual std::map<int, int> highestIds() = 0;
     /// Makes createNext go on behind this id at the least.
     virtual void raiseHighestId(int type, int id) = 0;
     /// Puts a content in place with its number and time, and keeps nothing of what it replaces.
-    /// Number 0 is the file itself. The size is not looked at.
+    /// Number 0 is the file itself, which goes first. The size is not looked at.
     virtual void placeVersion(std::string_view path, const FileVersion& version,
                               std::istream& from) = 0;
-    /// Makes a store of what openCopy opened.
+    /// Makes a store of what openCopy opened. Before it, nothing of it has to be on the disk.
     virtual void finishCopy() = 0;
 };
 

@@ -33,6 +33,22 @@ std::unique_ptr<store::StoreEngine> Invocation::open() const {
     return store::openStore(givenAddress());
 }
 
+std::string completeAddress(const std::string& typed) {
+    constexpr std::size_t longestAddress = 127; // What a job can name.
+    std::error_code none;
+    const std::string address =
+        typed.find('/') == std::string::npos
+            ? typed
+            : std::filesystem::absolute(typed, none).lexically_normal().string();
+    if (address.size() > longestAddress) {
+        std::fprintf(stderr,
+                     "tintgate-store: warning: the store's address has %zu bytes; a job can name "
+                     "at most %zu\n",
+                     address.size(), longestAddress);
+    }
+    return address;
+}
+
 CLI::App& addGroup(CLI::App& program, const std::string& name, const std::string& text) {
     auto* group = program.add_subcommand(name, text);
     group->require_subcommand(1);

@@ -25,6 +25,10 @@ struct Invocation {
     const std::string& givenAddress() const;
 };
 
+/// An address as it was typed, as clients give it. People may name a folder as a shell does, by a
+/// path with a slash; what has none is a connection service.
+std::string completeAddress(const std::string& typed);
+
 void addStoreCommands(CLI::App& program, Invocation& invocation);  ///< make, upgrade, info
 void addUserCommands(CLI::App& program, Invocation& invocation);   ///< user ...
 void addTicketCommands(CLI::App& program, Invocation& invocation); ///< ticket ..., import, export
@@ -32,6 +36,7 @@ void addKeyCommands(CLI::App& program, Invocation& invocation);    ///< key ...
 void addFileCommands(CLI::App& program, Invocation& invocation);   ///< file ...
 void addJobCommands(CLI::App& program, Invocation& invocation);    ///< jobs, reset
 void addJdfCommands(CLI::App& program, Invocation& invocation);    ///< jdf ...
+void addCopyCommand(CLI::App& program, Invocation& invocation);    ///< copy
 
 /// A command that needs one of its own below it.
 CLI::App& addGroup(CLI::App& program, const std::string& name, const std::string& text);

@@ -17,9 +17,6 @@ namespace {
 
 using admin::Status;
 
-/// The longest address that a job can name as its server.
-constexpr std::size_t longestAddress = 127;
-
 constexpr const char* footer = R"(
 Examples:
   tintgate-store --store /srv/tintgate make --name "Print room"
@@ -67,21 +64,6 @@ int fail(Status status, const char* text) {
     return end(status);
 }
 
-/// A job and every other client name a folder by its whole path; here people may name it as a shell
-/// does. What has no slash is a connection service.
-void completeAddress(std::string& address) {
-    if (address.find('/') != std::string::npos) {
-        std::error_code none;
-        address = std::filesystem::absolute(address, none).string();
-    }
-    if (address.size() > longestAddress) {
-        std::fprintf(stderr,
-                     "tintgate-store: warning: the store's address has %zu bytes; a job can name "
-                     "at most %zu\n",
-                     address.size(), longestAddress);
-    }
-}
-
 // CLI11 takes "[a,b]" for a list of two values, "-Infinity" for options, and lets an inner command
 // have nothing of what stands behind "--". Such arguments are marked while it parses.
 constexpr char mark = '\x01';
@@ -119,7 +101,7 @@ void unmarkOptions(CLI::App& command) {
 
 int run(admin::Invocation& invocation) {
     try {
-        completeAddress(invocation.address);
+        invocation.address = admin::completeAddress(invocation.address);
         invocation.action();
         admin::finishStandardOutput();
         return end(Status::Done);
@@ -157,6 +139,7 @@ int main(int argumentCount, char** arguments) {
     admin::addFileCommands(program, invocation);
     admin::addJobCommands(program, invocation);
     admin::addJdfCommands(program, invocation);
+    admin::addCopyCommand(program, invocation);
     program.footer(footer);
     unmarkOptions(program);
     auto words = markedArguments(argumentCount, arguments);

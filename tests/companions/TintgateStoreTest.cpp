@@ -18,6 +18,7 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
+#include "Postgres.h"
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 #include "comgui/KeyBytes.h"
@@ -556,6 +557,115 @@ TEST_F(TintgateStore, TheExampleJobGoesIn) {
     EXPECT_EQ(answer({"key", "get", "job/7", "Remote/Measurement/Reference/CMYKValues/CValues",
                       "--position", "5"}),
               "255\n");
+}
+
+/// The fixture's store is a folder, and there is a database for a copy of it.
+class StoreCopy : public TintgateStore {
+  protected:
+    std::string answerOf(const std::string& address, std::vector<std::string> arguments) const {
+        arguments.insert(arguments.begin(), {"--store", address});
+        return answer(arguments);
+    }
+
+    /// All that a store holds, as its own tool shows it.
+    std::string allOf(const std::string& address) const {
+        std::string text = answerOf(address, {"export"}) + answerOf(address, {"user", "list"});
+        const auto engine = store::openStore(address);
+        for (const auto& user : engine->users()) {
+            text += user.name + user.passwordHash + (user.disabled ? "-" : "+") + "\n";
+        }
+        std::ostringstream contents;
+        for (const auto& file : engine->files()) {
+            contents << file.path << ' ' << file.size << ' ' << file.time << '\n';
+            engine->getFile(file.path, contents);
+            for (const auto& version : engine->versions(file.path)) {
+                contents << version.number << ' ' << version.size << ' ' << version.time << '\n';
+                engine->getVersion(file.path, version.number, contents);
+            }
+        }
+        for (const auto& [type, id] : engine->highestIds()) {
+            contents << type << ' ' << id << '\n';
+        }
+        return text + contents.str();
+    }
+
+    void fill(int files) const {
+        makeTicket(3, 7, awkwardContent());
+        makeTicket(49, 0xFFFFFF, {});
+        makeTicket(3, 90, {});
+        answer({"ticket", "delete", "3/90"});
+        const auto engine = open();
+        engine->putUser({"J\xF6rg", store::passwordHash("x"), true});
+        engine->putUser({"anna", store::passwordHash("y"), false});
+        for (int i = 0; i < files; ++i) {
+            // Not by way of the store, where each would wait for the disk.
+            const std::string name = "store/files/" + std::to_string(i % 10) + "-\xFF";
+            m_folder.makeFolder(name);
+            const std::string path =
+                m_folder.write(name + "/" + std::to_string(i),
+                               std::string(static_cast<std::size_t>(i) * 37, 'x') + "\n");
+            std::filesystem::last_write_time(path, std::filesystem::file_time_type::clock::now() -
+                                                       std::chrono::hours(i));
+        }
+        for (const std::string content : {"one", "", "three", "four"}) {
+            std::istringstream from(content);
+            engine->putFile("jobs/7.jdf", from);
+        }
+        engine->pruneVersions("jobs/7.jdf", 2); // So that they do not start at 1.
+        engine->restoreVersion("jobs/7.jdf", 2);
+    }
+
+    const support::PostgresRoom room;
+    const std::string back = m_folder.path("back");
+};
+
+TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
+    fill(1'000);
+    const std::string before = allOf(m_address);
+    EXPECT_THAT(answer({"copy", m_address, "room"}),
+                HasSubstr("3 tickets, 1001 files and 2 users"));
+    EXPECT_TRUE(allOf("room") == before);
+    answer({"copy", "room", back});
+    EXPECT_TRUE(allOf(back) == before);
+    for (const std::string& address : {m_address, std::string("room"), back}) {
+        EXPECT_EQ(answerOf(address, {"ticket", "create", "job"}), "job/91\n");
+    }
+
+    expectRefusal({"copy", m_address, "room"}, 2, "already");
+    expectRefusal({"copy", "room", m_address}, 2, "exists");
+    expectRefusal({"copy", m_folder.path("none"), m_folder.path("new")}, 4, "none");
+    EXPECT_FALSE(support::exists(m_folder.path("new")));
+}
+
+TEST_F(StoreCopy, OneThatWasBrokenOffIsNoStoreAndIsFinishedByTheNext) {
+    fill(200);
+    const std::string before = allOf(m_address);
+    const std::pair<std::string, std::string> ways[] = {{m_address, "room"}, {"room", back}};
+    for (const auto& [from, to] : ways) {
+        int brokenOff = 0;
+        for (int milliseconds = 40; milliseconds < 200 && brokenOff < 3; milliseconds += 20) {
+            support::RunOptions options;
+            options.limit = std::chrono::milliseconds(milliseconds);
+            if (!run({"copy", from, to}, options).timedOut) {
+                break;
+            }
+            ++brokenOff;
+            expectRefusal({"--store", to, "info"}, 4, "");
+            // Something that has gone by the time of the next.
+            try {
+                store::openCopy(to)->create(3, 5);
+            } catch (const store::StoreFailure& failure) {
+                ASSERT_EQ(failure.fault, store::Fault::Busy) << failure.what();
+            }
+        }
+        EXPECT_GT(brokenOff, 0) << from;
+        {
+            const auto other = store::openCopy(to);
+            expectRefusal({"copy", from, to}, 9, "somebody else");
+        }
+        answer({"copy", from, to});
+        EXPECT_TRUE(allOf(to) == before) << to;
+    }
 }
 
 } // namespace

@@ -1,0 +1,193 @@
+#include <cerrno>
+#include <cstring>
+#include <filesystem>
+#include <fstream>
+#include <iostream>
+#include <set>
+
+#include <unistd.h>
+
+#include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/TicketName.h"
+
+namespace admin {
+
+namespace {
+
+using store::StoreEngine;
+
+struct CopyOptions {
+    std::string from;
+    std::string to;
+};
+
+/// A file without a name, between two stores of which one gives and the other one takes.
+class Spool {
+  public:
+    Spool() {
+        std::string path = std::filesystem::temp_directory_path() / "tintgate-store-XXXXXX";
+        const int file = mkstemp(path.data());
+        if (file >= 0) {
+            m_stream.open(path, std::ios::in | std::ios::out | std::ios::binary);
+            unlink(path.c_str());
+            close(file);
+        }
+        if (!m_stream.is_open()) {
+            throw Failure(Status::LocalFile,
+                          path + " can't be written: " + std::string(std::strerror(errno)));
+        }
+    }
+
+    std::ostream& toWrite() { return m_stream; }
+    /// From its start.
+    std::istream& toRead() {
+        if (!m_stream.flush()) {
+            throw Failure(Status::LocalFile, "a temporary file can't be written");
+        }
+        m_stream.seekg(0);
+        return m_stream;
+    }
+
+  private:
+    std::fstream m_stream;
+};
+
+struct ListedFile {
+    store::FileEntry entry;
+    std::vector<store::FileVersion> versions;
+};
+
+class Copy {
+  public:
+    Copy(StoreEngine& from, StoreEngine& to) : m_from(from), m_to(to) {}
+
+    /// What an earlier copy, which was broken off, brought along is written once more.
+    void run() {
+        const std::vector<TicketName> tickets = listTickets();
+        const std::vector<ListedFile> files = listFiles();
+        std::size_t total = tickets.size();
+        for (const auto& file : files) {
+            total += 1 + file.versions.size();
+        }
+        Progress progress(total, "tickets and files");
+        m_progress = &progress;
+        const std::size_t users = copyUsers();
+        copyTickets(tickets);
+        copyFiles(files);
+        m_to.finishCopy();
+        m_told = std::to_string(tickets.size()) + " tickets, " + std::to_string(files.size()) +
+                 " files and " + std::to_string(users) + " users";
+    }
+
+    const std::string& told() const { return m_told; }
+
+  private:
+    std::vector<TicketName> listTickets() {
+        std::vector<TicketName> tickets;
+        for (int type = 0; TICKET_TYPE_Valid(type); ++type) {
+            for (const int id : m_from.ids(type)) {
+                tickets.push_back({type, id});
+            }
+        }
+        return tickets;
+    }
+
+    std::vector<ListedFile> listFiles() {
+        std::vector<ListedFile> files;
+        for (auto& entry : m_from.files()) {
+            auto versions = m_from.versions(entry.path);
+            files.push_back({std::move(entry), std::move(versions)});
+        }
+        return files;
+    }
+
+    std::size_t copyUsers() {
+        const auto users = m_from.users();
+        for (const auto& former : m_to.users()) {
+            m_to.removeUser(former.name);
+        }
+        for (const auto& user : users) {
+            m_to.putUser(user);
+        }
+        return users.size();
+    }
+
+    void copyTickets(const std::vector<TicketName>& tickets) {
+        for (int type = 0; TICKET_TYPE_Valid(type); ++type) {
+            for (const int id : m_to.ids(type)) {
+                if (!m_from.exists(type, id)) {
+                    m_to.remove(type, id);
+                }
+            }
+        }
+        store::Scope everything;
+        everything.everything = true;
+        for (const auto& [type, id] : tickets) {
+            if (const auto content = m_from.content(type, id, store::KeyFilter())) {
+                m_to.create(type, id);
+                m_to.change(type, id, everything,
+                            [&](store::TicketContent& stored) { stored.transfer(*content, true); });
+            }
+            m_progress->done(++m_done);
+        }
+        for (const auto& [type, id] : m_from.highestIds()) {
+            m_to.raiseHighestId(type, id);
+        }
+    }
+
+    void copyFiles(const std::vector<ListedFile>& files) {
+        for (const auto& [entry, versions] : files) {
+            copyVersion(entry.path, {0, entry.size, entry.time});
+            for (const auto& version : versions) {
+                copyVersion(entry.path, version);
+            }
+        }
+    }
+
+    void copyVersion(const std::string& path, const store::FileVersion& version) {
+        Spool spool;
+        if (version.number == 0) {
+            m_from.getFile(path, spool.toWrite());
+        } else {
+            m_from.getVersion(path, version.number, spool.toWrite());
+        }
+        m_to.placeVersion(path, version, spool.toRead());
+        m_progress->done(++m_done);
+    }
+
+    StoreEngine& m_from;
+    StoreEngine& m_to;
+    Progress* m_progress = nullptr;
+    std::size_t m_done = 0;
+    std::string m_told;
+};
+
+void copy(const CopyOptions& options) {
+    const auto from = store::openStore(completeAddress(options.from));
+    const auto to = store::openCopy(completeAddress(options.to));
+    Copy copy(*from, *to);
+    copy.run();
+    std::cout << "Copied " << copy.told() << '\n';
+}
+
+} // namespace
+
+void addCopyCommand(CLI::App& program, Invocation& invocation) {
+    const auto options = std::make_shared<CopyOptions>();
+    auto& command = addCommand<CopyOptions>(program, invocation, "copy",
+                                            "Copy a whole store to a new one", options, copy);
+    command.add_option("from", options->from, "Store to copy: folder or connection service")
+        ->required();
+    command
+        .add_option("to", options->to,
+                    "Where the new one is to be: a folder that is empty or not there, or a "
+                    "connection service whose\ndatabase holds no store")
+        ->required();
+    command.footer("Everything is copied as it is: tickets, users, and files with their versions, "
+                   "times and numbers. Nobody\ncan log in to the new store before it is complete; "
+                   "a copy that was broken off is run again. Nobody\nshould work on the old store "
+                   "meanwhile.");
+}
+
+} // namespace admin
