@@ -26,13 +26,16 @@ const char* STRINGCACHE::operator[](const char* text) {
     if (text == nullptr) {
         return nullptr;
     }
-    // Looked up as it stands, so that a text that is stored already costs no allocation.
-    const std::string_view wanted = text;
-    auto place = m_texts.lower_bound(wanted);
-    if (place == m_texts.end() || *place != wanted) {
-        place = m_texts.emplace_hint(place, wanted);
+    if (m_last == nullptr || *m_last != text) {
+        // Looked up as it stands, so that a text that is stored already costs no allocation.
+        const std::string_view wanted = text;
+        auto place = m_texts.lower_bound(wanted);
+        if (place == m_texts.end() || *place != wanted) {
+            place = m_texts.emplace_hint(place, wanted);
+        }
+        m_last = &*place;
     }
-    return place->c_str();
+    return m_last->c_str();
 }
 
 bool STRINGCACHE::find(const char* text) const {

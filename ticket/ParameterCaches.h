@@ -2,9 +2,14 @@
 // table of pointers outlive the variables of those who filled it, and store what is equal once.
 #pragma once
 
+#include <cstddef>
+#include <cstdint>
+#include <cstring>
+#include <deque>
 #include <functional>
 #include <set>
 #include <string>
+#include <vector>
 
 #include "ticket/ParameterRecords.h"
 
@@ -29,6 +34,10 @@ class BIN_STRING_BUFFER {
 /// Texts.
 class STRINGCACHE {
   public:
+    STRINGCACHE() = default;
+    STRINGCACHE(const STRINGCACHE&) = delete;
+    STRINGCACHE& operator=(const STRINGCACHE&) = delete;
+
     /// Stores a copy of the text, redirects the pointer to it and gives it back. Null stays null.
     const char* operator()(const char*& text);
     /// The same by value.
@@ -36,28 +45,74 @@ class STRINGCACHE {
 
     /// True if the text is stored; null never is.
     bool find(const char* text) const;
-    void clear() { m_texts.clear(); }
+    void clear() {
+        m_texts.clear();
+        m_last = nullptr;
+    }
 
   private:
     std::set<std::string, std::less<>> m_texts;
+    const std::string* m_last = nullptr; ///< The one asked for last: keys come in runs.
 };
 
-/// Numbers. Of a double no NaN may come here, since it has no place in an order; 0.0 and -0.0 are
-/// the same, and the first to come is stored.
+/// Numbers. Of a double no NaN may come here, since it equals nothing; 0.0 and -0.0 are the same,
+/// and the first to come is stored. A hash table: arrays of measured values, no two of which are
+/// alike, go through here, and with a tree that would be most of the time that writing them takes.
 template<class T>
 class VALCACHE {
   public:
+    VALCACHE() = default;
+    VALCACHE(const VALCACHE&) = delete;
+    VALCACHE& operator=(const VALCACHE&) = delete;
+
     /// Stores a copy of the value, redirects the pointer to it and gives it back. Null stays null.
     const T* operator()(const T*& value) {
         if (value != nullptr) {
-            value = &*m_values.insert(*value).first;
+            value = &Stored(*value);
         }
         return value;
     }
-    void clear() { m_values.clear(); }
+    void clear() {
+        m_values.clear();
+        m_places.clear();
+    }
 
   private:
-    std::set<T> m_values;
+    const T& Stored(const T& value) {
+        if (2 * m_values.size() >= m_places.size()) {
+            Grow();
+        }
+        const T*& place = PlaceOf(value);
+        if (place == nullptr) {
+            place = &m_values.emplace_back(value);
+        }
+        return *place;
+    }
+
+    /// Where the value is, or where it is to go: there is always a free place.
+    const T*& PlaceOf(const T& value) {
+        // Equal values have equal bits but for the zeros of a double.
+        std::uint64_t bits = 0;
+        if (value != T(0)) {
+            std::memcpy(&bits, &value, sizeof value);
+        }
+        const std::size_t last = m_places.size() - 1; // The size is a power of two.
+        std::size_t place = (bits * 0x9E3779B97F4A7C15 >> 32) & last;
+        while (m_places[place] != nullptr && *m_places[place] != value) {
+            place = (place + 1) & last;
+        }
+        return m_places[place];
+    }
+
+    void Grow() {
+        m_places.assign(m_places.empty() ? 16 : 4 * m_places.size(), nullptr);
+        for (const T& value : m_values) {
+            PlaceOf(value) = &value;
+        }
+    }
+
+    std::deque<T> m_values;         ///< In order of arrival.
+    std::vector<const T*> m_places; ///< Of the values, by their bits: at most half are taken.
 };
 
 /// Binary values.

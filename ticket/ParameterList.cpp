@@ -48,7 +48,7 @@ SETMULTIPAR* SETMULTIPAR_LIST::Table(bool sort) {
     }
     if (!m_table && m_size != 0) {
         if (sort) {
-            m_list.sort(); // Stable.
+            std::stable_sort(m_list.begin(), m_list.end());
             m_sorted = true;
         }
         m_table = std::make_unique<SETMULTIPAR[]>(m_size + 1);

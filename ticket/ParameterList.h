@@ -2,7 +2,6 @@
 #pragma once
 
 #include <functional>
-#include <list>
 #include <memory>
 #include <string>
 #include <vector>
@@ -83,7 +82,7 @@ class SETMULTIPAR_LIST {
     unsigned long m_size = 0;
     bool m_sorted = false; ///< Since the table was last dropped.
     bool m_deep;
-    std::list<SETMULTIPAR> m_list;
+    std::vector<SETMULTIPAR> m_list;
     std::unique_ptr<SETMULTIPAR[]> m_table; ///< Null when there is none.
     std::function<bool(const char*)> m_filter;
 
