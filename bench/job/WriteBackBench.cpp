@@ -13,6 +13,8 @@
 #include <vector>
 
 #include "ScratchFolder.h"
+#include <malloc.h>
+
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "SuiteRoot.h"
@@ -162,6 +164,10 @@ Tables tablesOf(store::StoreEngine& engine) {
 } // namespace
 
 int main() {
+    // As the program itself does: what is freed stays at hand.
+    mallopt(M_MMAP_THRESHOLD, 32 << 20);
+    mallopt(M_TRIM_THRESHOLD, 32 << 20);
+    mallopt(M_TOP_PAD, 8 << 20);
     const support::SuiteRoot root;
     root.installPlistReader(PLIST_READER);
     root.installCommBundle(COMGUI_BUNDLE);
