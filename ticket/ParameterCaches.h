@@ -2,6 +2,7 @@
 // table of pointers outlive the variables of those who filled it, and store what is equal once.
 #pragma once
 
+#include <bit>
 #include <cstddef>
 #include <cstdint>
 #include <cstring>
@@ -97,7 +98,8 @@ class VALCACHE {
             std::memcpy(&bits, &value, sizeof value);
         }
         const std::size_t last = m_places.size() - 1; // The size is a power of two.
-        std::size_t place = (bits * 0x9E3779B97F4A7C15 >> 32) & last;
+        // The highest bits of the product are those that all bits of the value have a part in.
+        std::size_t place = bits * 0x9E3779B97F4A7C15 >> std::countl_zero(last);
         while (m_places[place] != nullptr && *m_places[place] != value) {
             place = (place + 1) & last;
         }

@@ -236,4 +236,28 @@ TEST(BinStringBuffer, ACopyViewsItsOwnBytes) {
     EXPECT_FALSE(buffer < copy || copy < buffer);
 }
 
+TEST(ParameterCaches, KeepManyNumbersOnceAndInTheirPlaces) {
+    constexpr int count = 10'000;
+    VALCACHE<double> cache;
+    std::vector<const double*> places;
+    const auto stored = [&](double value) {
+        const double* place = &value;
+        return cache(place);
+    };
+    // Numbers that differ in their first bits only, in their last only, and in sign.
+    const auto number = [](int i) { return std::ldexp(i % 2 == 0 ? 1 + i * 1e-15 : -1, i % 997); };
+    for (int i = 0; i < count; ++i) {
+        places.push_back(stored(number(i)));
+    }
+    for (int i = 0; i < count; ++i) {
+        ASSERT_EQ(*places[static_cast<std::size_t>(i)], number(i));
+        ASSERT_EQ(stored(number(i)), places[static_cast<std::size_t>(i)]) << i;
+    }
+    const double* zero = stored(0.0);
+    EXPECT_EQ(stored(-0.0), zero);
+    EXPECT_FALSE(std::signbit(*zero));
+    cache.clear();
+    EXPECT_TRUE(std::signbit(*stored(-0.0)));
+}
+
 } // namespace
