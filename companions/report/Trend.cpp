@@ -230,8 +230,10 @@ std::string recentText(const Series& series, const std::vector<const Sample*>& s
             worst = &criterion;
         }
     }
-    return std::to_string(failed) + " of the last " + std::to_string(recent) + " failed" +
-           (worst != nullptr ? ", most often by " + worst->title : "");
+    return (recent == 1
+                ? "The one job failed"
+                : std::to_string(failed) + " of the last " + std::to_string(recent) + " failed") +
+           (worst != nullptr ? (recent == 1 ? ", by " : ", most often by ") + worst->title : "");
 }
 
 void sayDrifting(Series& series) {
@@ -279,8 +281,9 @@ void sayState(Series& series, const std::vector<const Sample*>& samples) {
         break;
     case Movement::TooFew:
         series.word = "Too few jobs";
-        series.sentence = "A drift can be told from " + std::to_string(fewestForDrift) +
-                          " jobs on; these are " + std::to_string(samples.size()) + ".";
+        series.sentence =
+            "A drift can be told from " + std::to_string(fewestForDrift) + " jobs on; here " +
+            (samples.size() == 1 ? "is 1." : "are " + std::to_string(samples.size()) + ".");
         break;
     case Movement::Unknown:
         series.word = "No colours";

@@ -56,7 +56,8 @@
   // ---- The top of the page
 
   function showHead() {
-    const state = series.movement === "steady" && series.failing ? "failing" : series.movement;
+    const told = series.movement !== "unknown";
+    const state = told && series.failing ? "failing" : series.movement;
     document.title = `${series.word} – colour trend`;
     byId("title").textContent = series.name;
     byId("subtitle").textContent = `${series.jobs.length} ${
@@ -65,14 +66,14 @@
       data.subtitle}`;
     byId("verdict").className = state;
     document.querySelector("#verdict .sign").textContent =
-      state === "failing" ? signs.failed : signs[series.movement];
+      series.movement === "steady" && series.failing ? signs.failed : signs[series.movement];
     byId("word").textContent = series.word;
     byId("sentence").textContent = series.sentence;
     byId("reasons").replaceChildren(...series.reasons.map((reason) => make("li", "", reason)));
   }
 
   function inkCard(ink) {
-    const card = make("div", `ink ${ink.movement}`);
+    const card = make("div", `ink ${ink.movement}${ink.above ? " above" : ""}`);
     card.append(make("h3", "", ink.name));
     if (ink.began) {
       card.append(swatchPair([[`Beginning: ${ink.began}`, ink.beganSwatch],
