@@ -87,22 +87,17 @@ std::string shiftText(const Drift (&drifts)[3]) {
     return listText(parts);
 }
 
-void sayMovement(InkTrend& trend, const Drift (&drifts)[3], std::size_t known) {
+void sayMovement(InkTrend& trend, bool significant, std::size_t known) {
     if (known == 0) {
         trend.word = "No data";
         return;
     }
-    const bool significant =
-        std::any_of(drifts, drifts + 3, [](const Drift& drift) { return drift.significant; });
     trend.movement = known < fewestForDrift                       ? Movement::TooFew
                      : significant && trend.shift > smallestDrift ? Movement::Drifting
                                                                   : Movement::Steady;
     trend.word = trend.movement == Movement::TooFew     ? "Too few jobs"
                  : trend.movement == Movement::Drifting ? "Drifting"
                                                         : "Steady";
-    trend.sentence = fixedText(trend.shift, 2) + " from where it began";
-    if (trend.movement == Movement::Drifting)
-        trend.sentence += ": " + shiftText(drifts);
 }
 
 /// What the latest job that was judged says of the ink.
@@ -121,6 +116,23 @@ void addLatest(InkTrend& trend, const std::vector<const Sample*>& samples) {
     }
 }
 
+/// Without colours the difference from the target has to do, which tells less: where to is unknown.
+void sayByDifference(InkTrend& trend, const std::vector<const Sample*>& samples) {
+    std::vector<double> values;
+    std::size_t known = 0;
+    for (const Sample* sample : samples) {
+        const Criterion* const criterion = criterionOf(*sample, inkCriterion(trend.ink));
+        values.push_back(criterion != nullptr ? judgedValue(*criterion) : none);
+        known += std::isfinite(values.back());
+    }
+    const Drift drift = driftOf(values);
+    trend.shift = std::abs(drift.shift);
+    sayMovement(trend, drift.significant, known);
+    if (known != 0)
+        trend.sentence = "Its difference is " + fixedText(trend.shift, 2) +
+                         (drift.shift < 0 ? " smaller" : " larger") + " than at first";
+}
+
 InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
     InkTrend trend;
     trend.ink = ink;
@@ -132,21 +144,29 @@ InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
         for (std::size_t i = 0; i < 3; ++i)
             values[i].push_back(lab ? axisOf(*lab, i) : none);
     }
+    addLatest(trend, samples);
     const Drift drifts[3] = {driftOf(values[0]), driftOf(values[1]), driftOf(values[2])};
     trend.began = {drifts[0].began, drifts[1].began, drifts[2].began};
     trend.now = {trend.began.L + drifts[0].shift, trend.began.a + drifts[1].shift,
                  trend.began.b + drifts[2].shift};
+    if (known == 0) {
+        sayByDifference(trend, samples);
+        return trend;
+    }
     trend.beganSwatch = swatch(trend.began);
     trend.nowSwatch = swatch(trend.now);
-    trend.shift = known == 0 ? 0 : colour::deltaE76(trend.began, trend.now);
-    for (std::size_t i = 0; known != 0 && i < 3; ++i) {
+    trend.shift = colour::deltaE76(trend.began, trend.now);
+    for (std::size_t i = 0; i < 3; ++i)
         for (std::size_t j = 0; j < samples.size(); ++j) {
             trend.changes[i].push_back(values[i][j] - drifts[i].began);
             trend.averages[i].push_back(drifts[i].averages[j] - drifts[i].began);
         }
-    }
-    sayMovement(trend, drifts, known);
-    addLatest(trend, samples);
+    sayMovement(trend,
+                std::any_of(drifts, drifts + 3, [](const Drift& d) { return d.significant; }),
+                known);
+    trend.sentence = fixedText(trend.shift, 2) + " from where it began";
+    if (trend.movement == Movement::Drifting)
+        trend.sentence += ": " + shiftText(drifts);
     return trend;
 }
 
@@ -208,7 +228,7 @@ std::string nameOf(const Sample& sample) {
                                     std::string(sample.strip == 2 ? "second strip" : "")})
         if (!part.empty())
             name += (name.empty() ? "" : " · ") + part;
-    return name.empty() ? "All results" : name;
+    return name.empty() ? "Without paper, preset and instrument" : name;
 }
 
 std::string recentText(const Series& series, const std::vector<const Sample*>& samples) {
@@ -286,9 +306,9 @@ void sayState(Series& series, const std::vector<const Sample*>& samples) {
             (samples.size() == 1 ? "is 1." : "are " + std::to_string(samples.size()) + ".");
         break;
     case Movement::Unknown:
-        series.word = "No colours";
-        series.sentence = "These results hold no colours of paper or solids, so a drift can't be "
-                          "told.";
+        series.word = "No paper or solids";
+        series.sentence =
+            "These results hold nothing of paper or solids, so a drift can't be told.";
         break;
     }
     if (const std::string recent = recentText(series, samples); !recent.empty())

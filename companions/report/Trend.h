@@ -26,8 +26,9 @@ struct InkTrend {
     colour::Lab now;      ///< Average of the latest jobs.
     Swatch beganSwatch;
     Swatch nowSwatch;
-    double shift = 0; ///< Distance of the two in CIELAB.
-    /// L*, a*, b* of each job less `began`: as measured, and averaged. NaN where nothing is known.
+    double shift = 0; ///< Distance of the two in CIELAB; without colours, change of the difference.
+    /// L*, a*, b* of each job less `began`: as measured, and averaged. NaN where nothing is known;
+    /// empty without any colours.
     std::array<std::vector<double>, 3> changes;
     std::array<std::vector<double>, 3> averages;
     /// The latest difference from the target with its tolerance; empty where not judged.

@@ -311,7 +311,8 @@
     const known = series.inks.filter((ink) => ink.began);
     for (const ink of known) drawInk(ink, range);
     byId("driftNote").textContent = known.length === 0
-      ? "These results hold no colours of paper or solids."
+      ? "These results hold no colours of paper or solids, so that a drift is told by their differences "
+        + "from the targets."
       : `Dots: each job's colour less the mean of the first ${series.beginning} (shaded). Lines: their `
         + "moving average (EWMA, weight 0.2). Drifting: the average has moved by more than three "
         + "standard errors, and by more than 0.5 in L*a*b*.";

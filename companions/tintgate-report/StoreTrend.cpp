@@ -6,6 +6,7 @@
 #include <map>
 #include <set>
 #include <sstream>
+#include <tuple>
 
 #include "analysis/Criteria.h"
 #include "analysis/Judgement.h"
@@ -139,24 +140,34 @@ store::KeyFilter keysOf(const StripKeys& keys) {
 
 struct Verified {
     int job = 0;
+    int parent = 0; ///< Of a job on a sheet with others; 0 for none.
     int strip = 1;
     std::int64_t time = 0;
 };
 
-/// The strips of all jobs that have a result of a time that the filter takes.
+/// The strips of all jobs that have a result of a time that the filter takes; those on a sheet with
+/// others first.
 std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& filter) {
-    const std::vector<std::string> names = {
-        StripKeys(1).measured("Approval"), StripKeys(1).measured("Date"),
-        StripKeys(1).measured("Time"),     StripKeys(2).measured("Approval"),
-        StripKeys(2).measured("Date"),     StripKeys(2).measured("Time")};
+    const std::vector<std::string> names = {StripKeys(1).measured("Approval"),
+                                            StripKeys(1).measured("Date"),
+                                            StripKeys(1).measured("Time"),
+                                            StripKeys(2).measured("Approval"),
+                                            StripKeys(2).measured("Date"),
+                                            StripKeys(2).measured("Time"),
+                                            "General/ParentID"};
     struct Row {
         bool judged = false;
         std::string date;
         std::string time;
     };
     std::map<std::pair<int, int>, Row> rows;
+    std::map<int, int> parents;
     constexpr std::size_t anySize = static_cast<std::size_t>(-1) / 2;
     store.keysOfAll(jobType, names, anySize, [&](int id, std::size_t name, const auto& elements) {
+        if (name == names.size() - 1) {
+            parents[id] = integerOf(elements).value_or(0);
+            return;
+        }
         Row& row = rows[{id, name < 3 ? 1 : 2}];
         if (name % 3 == 0)
             row.judged = integerOf(elements).value_or(-1) >= 0;
@@ -169,8 +180,10 @@ std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& fi
         if (!time)
             time = timeOf(row.date);
         if (row.judged && time && filter.takesTime(*time))
-            verified.push_back({key.first, key.second, *time});
+            verified.push_back({key.first, parents[key.first], key.second, *time});
     }
+    std::stable_sort(verified.begin(), verified.end(),
+                     [](const auto& a, const auto& b) { return (a.parent > 0) > (b.parent > 0); });
     return verified;
 }
 
@@ -204,6 +217,8 @@ class Server {
     const Preset& preset(int id, const std::string& installFolder) {
         const auto [at, fresh] = m_presets.try_emplace({id, installFolder});
         if (!fresh)
+            return at->second;
+        if (id <= 0)
             return at->second;
         at->second.name = textOf(m_store.key(presetType, id, "Name"));
         char name[32];
@@ -387,7 +402,7 @@ class LocalPages {
 };
 
 report::Sample sampleOf(const store::TicketContent& job, const Verified& verified, Server& server,
-                        bool& changed) {
+                        const Preset& preset) {
     const StripKeys keys(verified.strip);
     report::Sample sample;
     sample.time = verified.time;
@@ -399,55 +414,95 @@ report::Sample sampleOf(const store::TicketContent& job, const Verified& verifie
     sample.paper = textOf(job.find("CMM/PaperName"));
     sample.workflow = textOf(job.find("Workflow/Name"));
     sample.instrument = server.instrument(job, keys, verified.strip);
-    const int id = integerOf(job.find(keys.own("Workflow/Verify/ComparisonMethod"))).value_or(0);
-    const Preset& preset = server.preset(id, textOf(job.find("System/InstallFolder")));
     sample.preset = preset.name;
-    sample.presetId = id;
     sample.formula = colour::formulaName(colour::formulaFromNumber(
         integerOf(job.find(keys.own("Workflow/Verify/DeltaEMode"))).value_or(0)));
-    Results results;
-    results.measured = doublesOf(job.find(keys.measured("Values/Measured")));
-    results.approvals = integersOf(
-        job.find(keys.measured(preset.psd() ? "Values/PSDApproval" : "Values/Approval")));
-    changed = addCriteria(sample, results, preset);
-    sample.verdict = verdictOf(sample, integerOf(job.find(keys.measured("Approval"))).value_or(0));
-    sample.inks = inksOf(job, keys);
     return sample;
 }
+
+/// The samples of a store, one by one.
+class Gatherer {
+  public:
+    Gatherer(store::StoreEngine& store, const Filter& filter, const PagePlace& place)
+        : m_store(store), m_filter(filter), m_place(place), m_server(store) {}
+
+    void add(const Verified& verified) {
+        const SharedContent job =
+            m_store.content(jobType, verified.job, m_keys[verified.strip - 1]);
+        if (!job) // Deleted meanwhile.
+            return;
+        const StripKeys keys(verified.strip);
+        const int id =
+            integerOf(job->find(keys.own("Workflow/Verify/ComparisonMethod"))).value_or(0);
+        const Preset& preset = m_server.preset(id, textOf(job->find("System/InstallFolder")));
+        report::Sample sample = sampleOf(*job, verified, m_server, preset);
+        sample.presetId = id;
+        if (!m_place.folder.empty())
+            if (const std::string page = m_pages.of(sample); !page.empty())
+                sample.page = relativeTo(m_place.folder, page);
+        Results results;
+        results.measured = doublesOf(job->find(keys.measured("Values/Measured")));
+        if (!m_filter.takes(sample) || isKnown(verified, results.measured, sample.page))
+            return;
+        results.approvals = integersOf(
+            job->find(keys.measured(preset.psd() ? "Values/PSDApproval" : "Values/Approval")));
+        m_changes += addCriteria(sample, results, preset);
+        sample.verdict =
+            verdictOf(sample, integerOf(job->find(keys.measured("Approval"))).value_or(0));
+        sample.inks = inksOf(*job, keys);
+        m_gathered.samples.push_back(std::move(sample));
+    }
+
+    Gathered gathered() && {
+        for (const int id : m_server.presetsWithoutFile())
+            m_gathered.notes.push_back("The file of preset " + std::to_string(id) +
+                                       " can't be read, so its tolerances are not known.");
+        if (m_changes != 0)
+            m_gathered.notes.push_back(
+                std::to_string(m_changes) + (m_changes == 1 ? " job was" : " jobs were") +
+                " judged by other tolerances than the preset has today. Passed and failed are as "
+                "they were judged; the lines show the tolerances of today.");
+        return std::move(m_gathered);
+    }
+
+  private:
+    /// A run writes the result of a sheet to each of its jobs and to their parent. It counts once,
+    /// for the first job, and leads to the page wherever in the family it is.
+    bool isKnown(const Verified& verified, const std::vector<double>& measured,
+                 const std::string& page) {
+        const int family = verified.parent > 0 ? verified.parent : verified.job;
+        if (measured.empty())
+            return false;
+        // As bytes, since a ticket may hold what is no number and has no order.
+        std::string bytes(reinterpret_cast<const char*>(measured.data()),
+                          measured.size() * sizeof(double));
+        const auto [at, fresh] = m_known.try_emplace({family, verified.strip, std::move(bytes)},
+                                                     m_gathered.samples.size());
+        if (!fresh && m_gathered.samples[at->second].page.empty())
+            m_gathered.samples[at->second].page = page;
+        return !fresh;
+    }
+
+    store::StoreEngine& m_store;
+    const Filter& m_filter;
+    const PagePlace& m_place;
+    Server m_server;
+    const LocalPages m_pages;
+    const store::KeyFilter m_keys[2] = {keysOf(StripKeys(1)), keysOf(StripKeys(2))};
+    std::map<std::tuple<int, int, std::string>, std::size_t> m_known;
+    Gathered m_gathered;
+    std::size_t m_changes = 0;
+};
 
 } // namespace
 
 Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place) {
     try {
         const auto store = store::openStore(address);
-        Server server(*store);
-        const LocalPages pages;
-        Gathered gathered;
-        std::size_t changes = 0;
-        const store::KeyFilter keys[] = {keysOf(StripKeys(1)), keysOf(StripKeys(2))};
-        for (const Verified& verified : verifiedStrips(*store, filter)) {
-            const SharedContent job =
-                store->content(jobType, verified.job, keys[verified.strip == 2]);
-            if (!job) // Deleted meanwhile.
-                continue;
-            bool changed = false;
-            report::Sample sample = sampleOf(*job, verified, server, changed);
-            if (!filter.takes(sample))
-                continue;
-            changes += changed;
-            if (const std::string page = pages.of(sample); !page.empty() && !place.folder.empty())
-                sample.page = relativeTo(place.folder, page);
-            gathered.samples.push_back(std::move(sample));
-        }
-        for (const int id : server.presetsWithoutFile())
-            gathered.notes.push_back("The file of preset " + std::to_string(id) +
-                                     " can't be read, so its tolerances are not known.");
-        if (changes != 0)
-            gathered.notes.push_back(
-                std::to_string(changes) + (changes == 1 ? " job was" : " jobs were") +
-                " judged by other tolerances than the preset has today. Passed and failed are as "
-                "they were judged; the lines show the tolerances of today.");
-        return gathered;
+        Gatherer gatherer(*store, filter, place);
+        for (const Verified& verified : verifiedStrips(*store, filter))
+            gatherer.add(verified);
+        return std::move(gatherer).gathered();
     } catch (const store::StoreFailure& failure) {
         throw Failure(Status::Store, failure.what());
     }

@@ -126,7 +126,8 @@ std::string trendText(const report::TrendModel& trend, const Painter& paint) {
         const Mark mark = bad ? markOf(report::Verdict::Failed) : markOf(series.movement);
         text += (text.empty() ? "" : "\n") + paint(mark.tone, mark.sign + series.word) + "  " +
                 paint(Tone::Bold, series.name) + '\n' +
-                paint(Tone::Soft, std::to_string(series.samples.size()) + " results, " +
+                paint(Tone::Soft, std::to_string(series.samples.size()) +
+                                      (series.samples.size() == 1 ? " result, " : " results, ") +
                                       series.span + ": " + std::to_string(series.passed) +
                                       " passed, " + std::to_string(series.failed) + " failed, " +
                                       std::to_string(series.incomplete) + " incomplete") +

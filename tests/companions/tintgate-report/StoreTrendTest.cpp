@@ -185,6 +185,31 @@ TEST_F(StoreTrend, KnowsPresetsOfThePsdKind) {
     EXPECT_THAT(text(), ContainsRegex("Paper white +0.25 +of 5.00 +ΔE00 +1 of 12 above"));
 }
 
+// A measurement without spectra leaves no colours in a ticket.
+TEST_F(StoreTrend, TellsADriftByDifferencesWhereThereAreNoColours) {
+    for (int job = 1; job <= jobs; ++job)
+        change(jobOf(job), [](json& keys) { keys.erase("Remote/Measurement/LabValues/LValues"); });
+    EXPECT_THAT(text(), AllOf(HasSubstr("Drifting: cyan"),
+                              HasSubstr("Cyan: Its difference is 1.64 larger than at first"),
+                              ContainsRegex("Steady +Black +0.50 +of 3.00")));
+}
+
+TEST_F(StoreTrend, CountsTheResultOfASheetOnce) {
+    std::vector<json> tickets;
+    for (int id : {30, 31, 32}) { // Two jobs on a sheet and their parent.
+        tickets.push_back(jobOf(3));
+        tickets.back()["id"] = id;
+        tickets.back()["keys"]["Input/Title"] = {{"string", "Sheet " + std::to_string(id)}};
+        if (id != 30)
+            tickets.back()["keys"]["General/ParentID"] = {{"int", 30}};
+    }
+    import(tickets);
+    EXPECT_THAT(text(), HasSubstr("13 results"));
+    const std::string page = report({"-o", "-"}).output;
+    EXPECT_THAT(page, AllOf(HasSubstr("\"Sheet 31\""), Not(HasSubstr("\"Sheet 30\"")),
+                            Not(HasSubstr("\"Sheet 32\""))));
+}
+
 TEST_F(StoreTrend, LeadsToThePagesOnThisMachine) {
     m_scratch.makeFolder("Tintgate/JobID_5");
     json meta =

@@ -91,6 +91,43 @@ TEST_F(Trend, ShowsADriftAndLeadsToEachJob) {
     EXPECT_EQ(std::distance(fs::directory_iterator(m_scratch.path("trend-jobs")), {}), jobs);
 }
 
+// A person's hand: a script in the page, which its policy has to let in for once.
+TEST_F(Trend, TurnsToAnotherSeriesAndFindsJobs) {
+    for (int job = 1; job <= 5; ++job) {
+        const std::string meta = m_rooms + "/JobID_" + std::to_string(job) + "/meta.json";
+        fs::permissions(meta, fs::perms(0644));
+        m_scratch.write("rooms/JobID_" + std::to_string(job) + "/meta.json",
+                        replaced(support::contentsOf(meta),
+                                 "\"'\\\"><img src=x onerror=hostile()>\"", "\"Gloss\""));
+    }
+    ASSERT_EQ(report({m_rooms, "-o", m_page, "--no-pages"}).exitCode, 0);
+    std::string page = support::contentsOf(m_page);
+    const std::size_t policy = page.find("<meta http-equiv=\"Content-Security-Policy\"");
+    page.erase(policy, page.find('\n', policy) - policy);
+    page.insert(page.rfind("</body>"), R"(<script>
+        const seen = (name, text) => { document.body.append(`\n[${name}: ${text}]\n`); };
+        const text = (id) => document.getElementById(id).textContent;
+        const find = (words) => {
+            document.getElementById("find").value = words;
+            document.getElementById("find").dispatchEvent(new Event("input"));
+        };
+        seen("first", text("word"));
+        document.querySelectorAll("#series button")[1].click();
+        seen("second", `${text("word")} ${text("range")} ${text("title").slice(0, 5)}`);
+        seen("charts", document.querySelectorAll("#drift canvas").length);
+        find("failed");
+        seen("failed", text("range"));
+        find("no such job");
+        seen("none", text("range"));
+    </script>)");
+    const support::Outcome shown =
+        support::browse(m_scratch.write("handled.html", page), m_scratch.path("browser"));
+    EXPECT_THAT(shown.error, Not(HasSubstr("CONSOLE")));
+    for (const char* part : {"[first: Drifting: cyan]", "[second: Too few jobs 1–5 of 5 Gloss]",
+                             "[charts: 3]", "[failed: 1–5 of 5]", "[none: None found]"})
+        EXPECT_THAT(shown.output, HasSubstr(part));
+}
+
 TEST_F(Trend, TakesWhatTheFiltersLetThrough) {
     m_scratch.write("rooms/other.json", "{\"format\": \"another\"}");
     const struct {
