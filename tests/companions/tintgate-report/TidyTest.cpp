@@ -186,22 +186,23 @@ TEST_F(Tidy, SaysWhatItCantDo) {
         EXPECT_EQ(tidy({"--tidy", days}).exitCode, 64) << days;
     EXPECT_EQ(tidy({"--dry-run"}).exitCode, 64);
 
-    makeJob("JobID_1");
-    fs::permissions(path("JobID_1/inner"), fs::perms(0555));
+    // A number that no tool on this machine has, since those of root tell this user no folder.
+    makeJob("JobID_987001");
+    fs::permissions(path("JobID_987001/inner"), fs::perms(0555));
     fs::permissions(m_scratch.path(), fs::perms(0777));
     for (const auto& entry : fs::recursive_directory_iterator(m_scratch.path()))
         support::giveTo(support::ordinaryUser, entry.path());
-    makeOld(path("JobID_1"), 40);
+    makeOld(path("JobID_987001"), 40);
     const support::Outcome outcome = tidy({"--tidy", "30"}, support::ordinaryUser);
     EXPECT_EQ(outcome.exitCode, 10);
-    EXPECT_THAT(outcome.output, HasSubstr("failed JobID_1: Permission denied"));
-    EXPECT_TRUE(support::exists(path(".tidy-JobID_1/inner/file")));
+    EXPECT_THAT(outcome.output, HasSubstr("failed JobID_987001: Permission denied"));
+    EXPECT_TRUE(support::exists(path(".tidy-JobID_987001/inner/file")));
 
     fs::rename(m_scratch.path("Tintgate"), m_scratch.path("moved"));
     EXPECT_THAT(tidy({"--tidy", "30"}).output, HasSubstr("0 of 0 folders"));
     fs::create_directory_symlink("moved", m_scratch.path("Tintgate"));
     EXPECT_EQ(tidy({"--tidy", "30"}).exitCode, 10);
-    EXPECT_TRUE(support::exists(path(".tidy-JobID_1/inner/file")));
+    EXPECT_TRUE(support::exists(path(".tidy-JobID_987001/inner/file")));
 }
 
 } // namespace
