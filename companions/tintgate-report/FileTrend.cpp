@@ -44,7 +44,7 @@ std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {
         return {};
     const std::string folder = place.folder + "/" + place.name;
     std::error_code failure;
-    fs::create_directories(folder, failure);
+    fs::create_directory(folder, failure);
     const std::string name =
         loaded.meta ? "job-" + std::to_string(loaded.meta->jobId) + "-" + stem.substr(7) : stem;
     std::string problem = failure.message();

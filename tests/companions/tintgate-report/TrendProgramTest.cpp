@@ -177,8 +177,7 @@ TEST_F(Trend, GoesOnWithoutWhatItCantRead) {
     EXPECT_FALSE(support::exists(m_scratch.path("trend-jobs")));
 
     EXPECT_EQ(report({m_scratch.path("cut.json"), m_scratch.path("none.json")}).exitCode, 3);
-    EXPECT_EQ(report({m_rooms, "-o", m_scratch.path("no/such/trend.html"), "--no-pages"}).exitCode,
-              5);
+    EXPECT_EQ(report({m_rooms, "-o", m_scratch.path("no/such/trend.html")}).exitCode, 5);
 }
 
 } // namespace
