@@ -1,32 +1,22 @@
 #include <algorithm>
-#include <cstdio>
-#include <cstdlib>
-#include <cstring>
-#include <limits>
 #include <map>
-#include <set>
-#include <sstream>
 #include <tuple>
 
 #include "analysis/Criteria.h"
 #include "analysis/Judgement.h"
-#include "analysis/Presets.h"
-#include "colour/CgatsText.h"
 #include "colour/Difference.h"
 #include "comgui/StoreEngine.h"
-#include "companions/report/Reports.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
+#include "companions/tintgate-report/LocalPages.h"
+#include "companions/tintgate-report/ServerFiles.h"
+#include "companions/tintgate-report/TicketKeys.h"
 #include "companions/tintgate-report/Trend.h"
-#include "job/AnalysisLibrary.h"
-#include "platform/TemporaryFolder.h"
 
 namespace reporting {
 namespace {
 
 constexpr int jobType = 3;
-constexpr int presetType = 27;
-constexpr std::size_t largestArray = std::size_t{16} << 20; ///< Bytes of a key: a million patches.
 
 /// The criterion whose value and approval stand at each of the server's positions for results; -1
 /// for none. Further positions have none.
@@ -37,67 +27,6 @@ constexpr int criterionAt[] = {6,  7,  8,  9,  4,  0,  1,  5,  12, 10, 13, 3,  -
 constexpr std::size_t spotPosition = 13;
 constexpr int psdSpotMaximum = 21;
 constexpr int psdApprovals = 10; ///< Of a preset of the PSD kind only these are kept, by entry.
-
-// ---- Reading keys
-
-using SharedContent = std::shared_ptr<const store::TicketContent>;
-
-std::optional<int> integerOf(const std::shared_ptr<const store::Elements>& elements) {
-    const auto* value = elements ? elements->first() : nullptr;
-    const auto* number = value != nullptr ? std::get_if<int>(value) : nullptr;
-    return number != nullptr ? std::optional(*number) : std::nullopt;
-}
-
-std::string textOf(const std::shared_ptr<const store::Elements>& elements) {
-    const auto* value = elements ? elements->first() : nullptr;
-    const auto* bytes = value != nullptr ? std::get_if<store::Text>(value) : nullptr;
-    return bytes != nullptr ? bytes->bytes->text : std::string();
-}
-
-/// Holes, and elements that are no doubles, are NaN.
-std::vector<double> doublesOf(const std::shared_ptr<const store::Elements>& elements) {
-    if (!elements || static_cast<std::size_t>(elements->count()) > largestArray / sizeof(double))
-        return {};
-    std::vector<double> values(static_cast<std::size_t>(elements->count()),
-                               std::numeric_limits<double>::quiet_NaN());
-    if (elements->numberType() == PARAM_DOUBLE) {
-        std::memcpy(values.data(), elements->numbers().data(), values.size() * sizeof(double));
-        return values;
-    }
-    elements->visit([&](int position, const store::Value& value) {
-        if (const auto* number = std::get_if<double>(&value))
-            values[static_cast<std::size_t>(position)] = *number;
-        return true;
-    });
-    return values;
-}
-
-std::vector<int> integersOf(const std::shared_ptr<const store::Elements>& elements) {
-    std::vector<int> values;
-    if (elements)
-        elements->visit([&](int position, const store::Value& value) {
-            const auto* number = std::get_if<int>(&value);
-            if (number == nullptr || position != static_cast<int>(values.size()))
-                return false;
-            values.push_back(*number);
-            return true;
-        });
-    return values;
-}
-
-/// A job's keys as one of its strips has them.
-class StripKeys {
-  public:
-    explicit StripKeys(int strip) : m_suffix(strip == 2 ? "2" : "") {}
-
-    std::string measured(const std::string& name) const {
-        return "Remote/Measurement" + m_suffix + "/" + name;
-    }
-    std::string own(const std::string& key) const { return key + m_suffix; }
-
-  private:
-    std::string m_suffix;
-};
 
 /// What a sample is made of, beside the strip's measurement.
 constexpr const char* sharedKeys[] = {"Input/Title",
@@ -135,6 +64,8 @@ store::KeyFilter keysOf(const StripKeys& keys) {
     table.push_back(nullptr);
     return store::KeyFilter(table.data());
 }
+
+using SharedContent = std::shared_ptr<const store::TicketContent>;
 
 // ---- Jobs that have a result
 
@@ -186,87 +117,6 @@ std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& fi
                      [](const auto& a, const auto& b) { return (a.parent > 0) > (b.parent > 0); });
     return verified;
 }
-
-// ---- Presets and instruments of the server
-
-std::string fileOf(store::StoreEngine& store, const std::string& path) {
-    std::ostringstream bytes;
-    try {
-        store.getFile(path, bytes);
-    } catch (const store::StoreFailure& failure) {
-        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath)
-            throw;
-        return {};
-    }
-    return std::move(bytes).str();
-}
-
-struct Preset {
-    std::string name;
-    std::optional<tolerancePresetParameterRecord> values; ///< Of the file; none without it.
-
-    bool psd() const { return values && values->fograPSDPreset > 0; }
-};
-
-/// Presets and instruments, each looked up once.
-class Server {
-  public:
-    explicit Server(store::StoreEngine& store) : m_store(store) {}
-
-    /// The tool judges by the preset's file, so its ticket gives no more than the name.
-    const Preset& preset(int id, const std::string& installFolder) {
-        const auto [at, fresh] = m_presets.try_emplace({id, installFolder});
-        if (!fresh)
-            return at->second;
-        if (id <= 0)
-            return at->second;
-        at->second.name = textOf(m_store.key(presetType, id, "Name"));
-        char name[32];
-        std::snprintf(name, sizeof name, "CVP_%04d.xml", id);
-        const std::string bytes = fileOf(m_store, installFolder + "/tickets/" + name);
-        tolerancePresetParameterRecord values;
-        if (!bytes.empty() && analysis::parsePreset(bytes, true, values) == 0)
-            at->second.values = values;
-        else
-            m_missing.insert(id);
-        return at->second;
-    }
-
-    /// Of the control strip that the job names; empty where it tells none.
-    std::string instrument(const store::TicketContent& job, const StripKeys& keys, int strip) {
-        if (strip == 1 && integerOf(job.find("Footer/Dynstrip/UseDynstrip")) == 1)
-            return nameOf(integerOf(job.find("Footer/Dynstrip/DeviceID")).value_or(0));
-        constexpr std::size_t shortestName = 4;
-        std::string file = textOf(job.find(keys.own("Footer/ControlstripFile")));
-        if (file.size() < shortestName)
-            file = textOf(job.find(keys.own("Footer/Nesting/ControlstripFile")));
-        file.erase(0, file.rfind('/') + 1);
-        file.resize(std::min(file.rfind('.'), file.size()));
-        if (file.empty())
-            return {};
-        const std::string path =
-            textOf(job.find("System/InstallFolder")) + "/ControlCharts/" + file + ".it8";
-        const auto [at, fresh] = m_strips.try_emplace(path);
-        if (fresh)
-            if (const auto device = colour::cgatsKeyword(fileOf(m_store, path), "DEVICE"))
-                at->second = nameOf(std::atoi(device->c_str()));
-        return at->second;
-    }
-
-    const std::set<int>& presetsWithoutFile() const { return m_missing; }
-
-  private:
-    static std::string nameOf(int device) {
-        if (device <= 0)
-            return {};
-        return GetInstrumentNameFromID(static_cast<unsigned>(device)).utf8_string();
-    }
-
-    store::StoreEngine& m_store;
-    std::map<std::pair<int, std::string>, Preset> m_presets;
-    std::map<std::string, std::string> m_strips;
-    std::set<int> m_missing;
-};
 
 // ---- One sample
 
@@ -340,7 +190,7 @@ bool addCriteria(report::Sample& sample, const Results& results, const Preset& p
 report::InkColours inksOf(const store::TicketContent& job, const StripKeys& keys) {
     std::vector<double> lab[3];
     std::vector<double> cmyk[4];
-    std::size_t patches = largestArray;
+    std::size_t patches = mostElements;
     const auto read = [&](std::vector<double>& values, const char* name) {
         values = doublesOf(job.find(keys.measured(name)));
         patches = std::min(patches, values.size());
@@ -370,36 +220,6 @@ report::Verdict verdictOf(const report::Sample& sample, int approval) {
     return used(report::Outcome::Unanswered) ? report::Verdict::Incomplete
                                              : report::Verdict::Failed;
 }
-
-/// The pages of jobs that lie on this machine.
-class LocalPages {
-  public:
-    LocalPages() : m_folder(platform::temporaryFolder() + "/Tintgate") {
-        for (report::Listed& page : report::reportsBelow(m_folder))
-            m_pages[page.path.substr(0, page.path.find('/'))].push_back(std::move(page));
-    }
-
-    /// The page of the run that wrote the sample: the first one since then. Empty for none.
-    std::string of(const report::Sample& sample) const {
-        const std::string folder = "JobID_" + std::to_string(*sample.jobId);
-        const auto found = m_pages.find(folder);
-        if (found == m_pages.end())
-            return {};
-        const std::string start = folder + "/report-strip" + std::to_string(sample.strip) + "-";
-        std::string earliest;
-        for (const report::Listed& page : found->second) { // The latest first.
-            const auto made = timeOf(page.summary.created);
-            if (page.path.starts_with(start) && page.summary.title == sample.title && made &&
-                *made >= sample.time)
-                earliest = m_folder + "/" + page.path;
-        }
-        return earliest;
-    }
-
-  private:
-    std::string m_folder;
-    std::map<std::string, std::vector<report::Listed>> m_pages;
-};
 
 report::Sample sampleOf(const store::TicketContent& job, const Verified& verified, Server& server,
                         const Preset& preset) {

@@ -1,0 +1,26 @@
+// Pages that the viewer has made on this machine.
+#pragma once
+
+#include <map>
+#include <string>
+#include <vector>
+
+#include "companions/report/Page.h"
+#include "companions/report/Sample.h"
+
+namespace reporting {
+
+/// The pages of jobs that lie on this machine.
+class LocalPages {
+  public:
+    LocalPages();
+
+    /// The page of the run that wrote the sample: the first one since then. Empty for none.
+    std::string of(const report::Sample& sample) const;
+
+  private:
+    std::string m_folder;
+    std::map<std::string, std::vector<report::Listed>> m_pages;
+};
+
+} // namespace reporting

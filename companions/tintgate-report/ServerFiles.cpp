@@ -1,0 +1,72 @@
+#include "companions/tintgate-report/ServerFiles.h"
+
+#include <algorithm>
+#include <cstdio>
+#include <cstdlib>
+#include <sstream>
+
+#include "analysis/Presets.h"
+#include "colour/CgatsText.h"
+
+namespace reporting {
+namespace {
+
+constexpr int presetType = 27;
+
+std::string fileOf(store::StoreEngine& store, const std::string& path) {
+    std::ostringstream bytes;
+    try {
+        store.getFile(path, bytes);
+    } catch (const store::StoreFailure& failure) {
+        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath)
+            throw;
+        return {};
+    }
+    return std::move(bytes).str();
+}
+
+std::string nameOf(int device) {
+    if (device <= 0)
+        return {};
+    return GetInstrumentNameFromID(static_cast<unsigned>(device)).utf8_string();
+}
+
+} // namespace
+
+const Preset& Server::preset(int id, const std::string& installFolder) {
+    const auto [at, fresh] = m_presets.try_emplace({id, installFolder});
+    if (!fresh || id <= 0)
+        return at->second;
+    at->second.name = textOf(m_store.key(presetType, id, "Name"));
+    char name[32];
+    std::snprintf(name, sizeof name, "CVP_%04d.xml", id);
+    const std::string bytes = fileOf(m_store, installFolder + "/tickets/" + name);
+    tolerancePresetParameterRecord values;
+    if (!bytes.empty() && analysis::parsePreset(bytes, true, values) == 0)
+        at->second.values = values;
+    else
+        m_missing.insert(id);
+    return at->second;
+}
+
+std::string Server::instrument(const store::TicketContent& job, const StripKeys& keys, int strip) {
+    if (strip == 1 && integerOf(job.find("Footer/Dynstrip/UseDynstrip")) == 1)
+        return nameOf(integerOf(job.find("Footer/Dynstrip/DeviceID")).value_or(0));
+    constexpr std::size_t shortestName = 4;
+    std::string file = textOf(job.find(keys.own("Footer/ControlstripFile")));
+    if (file.size() < shortestName)
+        file = textOf(job.find(keys.own("Footer/Nesting/ControlstripFile")));
+    file.erase(0, file.rfind('/') + 1);
+    file.resize(std::min(file.rfind('.'), file.size()));
+    if (file.empty())
+        return {};
+    const std::string path =
+        textOf(job.find("System/InstallFolder")) + "/ControlCharts/" + file + ".it8";
+    const auto [at, fresh] = m_strips.try_emplace(path);
+    if (fresh)
+        if (const auto device = colour::cgatsKeyword(fileOf(m_store, path), "DEVICE"))
+            at->second = nameOf(std::atoi(device->c_str()));
+    return at->second;
+}
+
+} // namespace reporting

@@ -1,0 +1,43 @@
+// Presets and instruments of a store's jobs, from the server's files.
+#pragma once
+
+#include <map>
+#include <optional>
+#include <set>
+#include <string>
+#include <utility>
+
+#include "comgui/StoreEngine.h"
+#include "companions/tintgate-report/TicketKeys.h"
+#include "job/AnalysisLibrary.h"
+
+namespace reporting {
+
+struct Preset {
+    std::string name;
+    std::optional<tolerancePresetParameterRecord> values; ///< Of the file; none without it.
+
+    bool psd() const { return values && values->fograPSDPreset > 0; }
+};
+
+/// Presets and instruments, each looked up once.
+class Server {
+  public:
+    explicit Server(store::StoreEngine& store) : m_store(store) {}
+
+    /// The tool judges by the preset's file, so its ticket gives no more than the name.
+    const Preset& preset(int id, const std::string& installFolder);
+
+    /// Of the control strip that the job names; empty where it tells none.
+    std::string instrument(const store::TicketContent& job, const StripKeys& keys, int strip);
+
+    const std::set<int>& presetsWithoutFile() const { return m_missing; }
+
+  private:
+    store::StoreEngine& m_store;
+    std::map<std::pair<int, std::string>, Preset> m_presets;
+    std::map<std::string, std::string> m_strips;
+    std::set<int> m_missing;
+};
+
+} // namespace reporting
