@@ -49,12 +49,6 @@ std::string completeAddress(const std::string& typed) {
     return address;
 }
 
-CLI::App& addGroup(CLI::App& program, const std::string& name, const std::string& text) {
-    auto* group = program.add_subcommand(name, text);
-    group->require_subcommand(1);
-    return *group;
-}
-
 Progress::Progress(std::size_t total, std::string what)
     : m_total(total), m_what(std::move(what)), m_shown(isatty(STDERR_FILENO) != 0) {}
 

@@ -6,9 +6,8 @@
 #include <string>
 #include <vector>
 
-#include <CLI/CLI.hpp>
-
 #include "comgui/StoreEngine.h"
+#include "companions/tintgate-store/CommandLine.h"
 
 namespace admin {
 
@@ -29,26 +28,22 @@ struct Invocation {
 /// path with a slash; what has none is a connection service.
 std::string completeAddress(const std::string& typed);
 
-void addStoreCommands(CLI::App& program, Invocation& invocation);  ///< make, upgrade, info
-void addUserCommands(CLI::App& program, Invocation& invocation);   ///< user ...
-void addTicketCommands(CLI::App& program, Invocation& invocation); ///< ticket ..., import, export
-void addKeyCommands(CLI::App& program, Invocation& invocation);    ///< key ...
-void addFileCommands(CLI::App& program, Invocation& invocation);   ///< file ...
-void addJobCommands(CLI::App& program, Invocation& invocation);    ///< jobs, reset
-void addJdfCommands(CLI::App& program, Invocation& invocation);    ///< jdf ...
-void addCopyCommand(CLI::App& program, Invocation& invocation);    ///< copy
-
-/// A command that needs one of its own below it.
-CLI::App& addGroup(CLI::App& program, const std::string& name, const std::string& text);
+void addStoreCommands(Command program, Invocation& invocation);  ///< make, upgrade, info
+void addUserCommands(Command program, Invocation& invocation);   ///< user ...
+void addTicketCommands(Command program, Invocation& invocation); ///< ticket ..., import, export
+void addKeyCommands(Command program, Invocation& invocation);    ///< key ...
+void addFileCommands(Command program, Invocation& invocation);   ///< file ...
+void addJobCommands(Command program, Invocation& invocation);    ///< jobs, reset
+void addJdfCommands(Command program, Invocation& invocation);    ///< jdf ...
+void addCopyCommand(Command program, Invocation& invocation);    ///< copy
 
 /// A command with its options' values, which it is given when it is run.
 template<class Options>
-CLI::App& addCommand(CLI::App& group, Invocation& invocation, const std::string& name,
-                     const std::string& text, std::shared_ptr<Options> options,
-                     std::function<void(const Options&)> run) {
-    auto* command = group.add_subcommand(name, text);
-    command->callback([&invocation, options, run] { invocation.action = [=] { run(*options); }; });
-    return *command;
+Command addCommand(Command group, Invocation& invocation, const std::string& name,
+                   const std::string& text, std::shared_ptr<Options> options,
+                   std::function<void(const Options&)> run) {
+    return group.command(
+        name, text, [&invocation, options, run] { invocation.action = [=] { run(*options); }; });
 }
 
 /// A line on standard error for whoever waits: only on a terminal, and at most ten times a second.

@@ -173,17 +173,16 @@ void copy(const CopyOptions& options) {
 
 } // namespace
 
-void addCopyCommand(CLI::App& program, Invocation& invocation) {
+void addCopyCommand(Command program, Invocation& invocation) {
     const auto options = std::make_shared<CopyOptions>();
-    auto& command = addCommand<CopyOptions>(program, invocation, "copy",
-                                            "Copy a whole store to a new one", options, copy);
-    command.add_option("from", options->from, "Store to copy: folder or connection service")
-        ->required();
+    auto command = addCommand<CopyOptions>(program, invocation, "copy",
+                                           "Copy a whole store to a new one", options, copy);
+    command.option("from", options->from, "Store to copy: folder or connection service").required();
     command
-        .add_option("to", options->to,
-                    "Where the new one is to be: a folder that is empty or not there, or a "
-                    "connection service whose\ndatabase holds no store")
-        ->required();
+        .option("to", options->to,
+                "Where the new one is to be: a folder that is empty or not there, or a "
+                "connection service whose\ndatabase holds no store")
+        .required();
     command.footer("Everything is copied as it is: tickets, users, and files with their versions, "
                    "times and numbers. Nobody\ncan log in to the new store before it is complete; "
                    "a copy that was broken off is run again. Nobody\nshould work on the old store "

@@ -204,44 +204,44 @@ void clean(const Invocation& invocation) {
 
 } // namespace
 
-void addFileCommands(CLI::App& program, Invocation& invocation) {
-    auto& group = addGroup(program, "file", "Files of the server, and what they were before");
+void addFileCommands(Command program, Invocation& invocation) {
+    auto group = program.group("file", "Files of the server, and what they were before");
     const auto options = std::make_shared<FileOptions>();
-    const auto command = [&](const char* word, const char* text, auto run) -> CLI::App& {
+    const auto command = [&](const char* word, const char* text, auto run) -> Command {
         return addCommand<FileOptions>(
             group, invocation, word, text, options,
             [&invocation, run](const FileOptions& given) { run(invocation, given); });
     };
-    const auto withPath = [&](CLI::App& added) {
-        added.add_option("path", options->path, "Server path, such as /jobs/7/job.jdf")->required();
+    const auto withPath = [&](Command added) {
+        added.option("path", options->path, "Server path, such as /jobs/7/job.jdf").required();
     };
 
-    auto& putting = command("put", "Deliver a file, or all files of a folder", put);
-    putting.add_option("local", options->local, "File or folder; - for standard input")->required();
+    auto putting = command("put", "Deliver a file, or all files of a folder", put);
+    putting.option("local", options->local, "File or folder; - for standard input").required();
     withPath(putting);
     putting.footer(
         "A file that is replaced is kept as a version. A name that ends in .jdf is a JDF, "
         "which is made ready for\nits updates where the store says so: see jdf --help.");
 
-    auto& getting = command("get", "Fetch a file", get);
+    auto getting = command("get", "Fetch a file", get);
     withPath(getting);
-    getting.add_option("local", options->local, "Where to; - for standard output")->required();
-    getting.add_option("--version", options->version, "An older version, by its number");
+    getting.option("local", options->local, "Where to; - for standard output").required();
+    getting.option("--version", options->version, "An older version, by its number");
 
     command("list", "List files, and whether each XML file is well-formed", list)
-        .add_option("prefix", options->path, "Only paths that start so");
+        .option("prefix", options->path, "Only paths that start so");
     withPath(command("versions", "List versions of a file, and whether each is well-formed XML",
                      versions));
 
-    auto& restoring = command("restore", "Put an older version in place again", restore);
+    auto restoring = command("restore", "Put an older version in place again", restore);
     withPath(restoring);
-    restoring.add_option("version", options->version, "Its number")->required();
+    restoring.option("version", options->version, "Its number").required();
     restoring.footer("What it replaces is kept as a version in turn.");
 
-    auto& pruning = command("prune", "Remove older versions", prune);
-    pruning.add_option("path", options->path, "Server path");
-    pruning.add_flag("--all", options->all, "Of all files");
-    pruning.add_option("--keep", options->keep, "How many of the newest versions stay")->required();
+    auto pruning = command("prune", "Remove older versions", prune);
+    pruning.option("path", options->path, "Server path");
+    pruning.flag("--all", options->all, "Of all files");
+    pruning.option("--keep", options->keep, "How many of the newest versions stay").required();
 
     command("clean", "Remove what interrupted deliveries left behind",
             [](const auto& invoked, const auto&) { clean(invoked); });

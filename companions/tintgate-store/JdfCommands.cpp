@@ -76,30 +76,29 @@ void rebuild(const Invocation& invocation, const JdfOptions& options) {
 
 } // namespace
 
-void addJdfCommands(CLI::App& program, Invocation& invocation) {
-    auto& group = addGroup(program, "jdf", "Keep the JDF of a job whole through its updates");
+void addJdfCommands(Command program, Invocation& invocation) {
+    auto group = program.group("jdf", "Keep the JDF of a job whole through its updates");
     group.footer("The update of a JDF may cut its end off; docs/jdf.md tells when. The integer "
                  "System/Jdf/Updates of the\nsystem ticket has each JDF made ready for so many "
                  "updates when \"file put\" delivers it:\n"
                  "  tintgate-store key set system System/Jdf/Updates int 8");
     const auto options = std::make_shared<JdfOptions>();
-    const auto command = [&](const char* word, const char* text, auto run) -> CLI::App& {
-        auto& added = addCommand<JdfOptions>(
+    const auto command = [&](const char* word, const char* text, auto run) -> Command {
+        auto added = addCommand<JdfOptions>(
             group, invocation, word, text, options,
             [&invocation, run](const JdfOptions& given) { run(invocation, given); });
-        added.add_option("job", options->job, "Number of the job")->required();
-        added.add_option("--updates", options->updates,
-                         "For how many, 1 to 16; else as the store says, else 8");
+        added.option("job", options->job, "Number of the job").required();
+        added.option("--updates", options->updates,
+                     "For how many, 1 to 16; else as the store says, else 8");
         return added;
     };
     command("ready", "Prepare the JDF so that updates lose nothing of it", ready)
         .footer("Empties the print dates, sees to the element that holds measurements, and puts "
                 "blanks behind the end\nfor the updates to lose. What the file was is kept as a "
                 "version.");
-    auto& rebuilding = command(
+    auto rebuilding = command(
         "rebuild", "Put the measurements of all versions into the oldest sound one", rebuild);
-    rebuilding.add_option("--from", options->from, "Leave out versions below this one")
-        ->capture_default_str();
+    rebuilding.option("--from", options->from, "Leave out versions below this one").showDefault();
     rebuilding.footer("For a JDF that updates have damaged. The result is made ready, and what it "
                       "replaces is kept as a\nversion.");
 }

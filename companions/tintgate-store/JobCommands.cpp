@@ -98,7 +98,7 @@ void reset(const Invocation& invocation, const ResetOptions& options) {
 
 } // namespace
 
-void addJobCommands(CLI::App& program, Invocation& invocation) {
+void addJobCommands(Command program, Invocation& invocation) {
     addCommand<NoOptions>(
         program, invocation, "jobs", "List jobs and how far their verification is",
         std::make_shared<NoOptions>(), [&](const NoOptions&) { list(invocation); })
@@ -107,12 +107,12 @@ void addJobCommands(CLI::App& program, Invocation& invocation) {
                 "without a result was cut off.");
 
     const auto options = std::make_shared<ResetOptions>();
-    auto& command = addCommand<ResetOptions>(
+    auto command = addCommand<ResetOptions>(
         program, invocation, "reset", "Let a job be measured again", options,
         [&](const ResetOptions& given) { reset(invocation, given); });
-    command.add_option("job", options->job, "Number of the job")->required();
-    command.add_option("--strip", options->strip, "1 or 2; both where this is left out");
-    command.add_flag("--family", options->family, "The jobs of the same parent and the parent too");
+    command.option("job", options->job, "Number of the job").required();
+    command.option("--strip", options->strip, "1 or 2; both where this is left out");
+    command.flag("--family", options->family, "The jobs of the same parent and the parent too");
     command.footer(
         "For a job whose results were written in part only. Takes away the strip's count "
         "of measurements and\nits approval, and offers the job to the verifier again if "

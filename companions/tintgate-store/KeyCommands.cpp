@@ -222,45 +222,44 @@ void remove(const Invocation& invocation, const KeyOptions& options) {
 
 } // namespace
 
-void addKeyCommands(CLI::App& program, Invocation& invocation) {
-    auto& group = addGroup(program, "key", "Keys of a ticket: read, set, delete");
+void addKeyCommands(Command program, Invocation& invocation) {
+    auto group = program.group("key", "Keys of a ticket: read, set, delete");
     const auto options = std::make_shared<KeyOptions>();
-    const auto command = [&](const char* word, const char* text, auto run) -> CLI::App& {
-        auto& added = addCommand<KeyOptions>(
+    const auto command = [&](const char* word, const char* text, auto run) -> Command {
+        auto added = addCommand<KeyOptions>(
             group, invocation, word, text, options,
             [&invocation, run](const KeyOptions& given) { run(invocation, given); });
-        added.add_option("ticket", options->ticket, "Ticket, such as job/7")->required();
+        added.option("ticket", options->ticket, "Ticket, such as job/7").required();
         return added;
     };
-    const auto withPosition = [&](CLI::App& added) {
-        added.add_option("key", options->key, "Key, such as Input/Title")->required();
-        added.add_option("--position", options->position, "This element alone, from 0");
+    const auto withPosition = [&](Command added) {
+        added.option("key", options->key, "Key, such as Input/Title").required();
+        added.option("--position", options->position, "This element alone, from 0");
     };
 
-    command("list", "List keys", list)
-        .add_option("prefix", options->key, "Only keys that start so");
+    command("list", "List keys", list).option("prefix", options->key, "Only keys that start so");
 
-    auto& getting = command("get", "Print what a key holds, an element a line", get);
+    auto getting = command("get", "Print what a key holds, an element a line", get);
     withPosition(getting);
-    getting.add_flag("--raw", options->raw, "The bytes of one element, and nothing else");
+    getting.flag("--raw", options->raw, "The bytes of one element, and nothing else");
     getting.footer("Binaries are printed as base64. With --json, types and holes show.");
 
-    auto& setting = command("set", "Set a key", set);
+    auto setting = command("set", "Set a key", set);
     withPosition(setting);
     setting
-        .add_option("type", options->type,
-                    "int, uint, int64, uint64, double, string, binary (base64) or pointer")
-        ->required();
-    setting.add_option("values", options->values, "One value, or several for a vector");
-    setting.add_option("--from", options->from,
-                       "The value is the content of this file; - for standard input");
-    setting.add_flag("--append", options->append, "Behind what is there")->excludes("--position");
+        .option("type", options->type,
+                "int, uint, int64, uint64, double, string, binary (base64) or pointer")
+        .required();
+    setting.option("values", options->values, "One value, or several for a vector");
+    setting.option("--from", options->from,
+                   "The value is the content of this file; - for standard input");
+    setting.flag("--append", options->append, "Behind what is there").excludes("--position");
     setting.footer("Without --position and --append the values take the place of the whole key.\n"
                    "Doubles may be NaN, Infinity and -Infinity. Texts that start with a dash stand "
                    "behind --.\n"
                    "Example: tintgate-store key set job/7 Workflow/Verify/Active int 1");
 
-    auto& deleting = command("delete", "Delete a key, or one element of it", remove);
+    auto deleting = command("delete", "Delete a key, or one element of it", remove);
     withPosition(deleting);
     deleting.footer("Elements behind a deleted one move up.");
 }

@@ -53,13 +53,13 @@ void info(const Invocation& invocation) {
 
 } // namespace
 
-void addStoreCommands(CLI::App& program, Invocation& invocation) {
+void addStoreCommands(Command program, Invocation& invocation) {
     const auto options = std::make_shared<MakeOptions>();
-    auto& command =
+    auto command =
         addCommand<MakeOptions>(program, invocation, "make", "Make a new store", options,
                                 [&](const MakeOptions& given) { make(invocation, given); });
-    command.add_option("--name", options->serverName, "Name that the server gives itself")
-        ->capture_default_str();
+    command.option("--name", options->serverName, "Name that the server gives itself")
+        .showDefault();
     command.footer("The folder must not be there yet, or be empty.");
 
     addCommand<NoOptions>(

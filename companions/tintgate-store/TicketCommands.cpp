@@ -176,56 +176,52 @@ void exportAll(const Invocation& invocation, const ExportOptions& options) {
     });
 }
 
-void addTicketGroup(CLI::App& program, Invocation& invocation) {
-    auto& group = addGroup(program, "ticket", "Tickets: jobs, presets and the system's own");
+void addTicketGroup(Command program, Invocation& invocation) {
+    auto group = program.group("ticket", "Tickets: jobs, presets and the system's own");
     const auto type = std::make_shared<TypeOption>();
     addCommand<TypeOption>(group, invocation, "list", "List tickets", type,
                            [&](const TypeOption& given) { list(invocation, given); })
-        .add_option("--type", type->type, "Of this type only: job, preset, system or 0 to 49");
+        .option("--type", type->type, "Of this type only: job, preset, system or 0 to 49");
 
     const auto ticket = std::make_shared<TicketOption>();
-    auto& created = addCommand<TicketOption>(
+    auto created = addCommand<TicketOption>(
         group, invocation, "create", "Make an empty ticket, and say its name", ticket,
         [&](const TicketOption& given) { create(invocation, given); });
-    created.add_option("ticket", ticket->ticket, "Ticket, or a type alone for the next free id")
-        ->required();
-    auto& removed = addCommand<TicketOption>(
+    created.option("ticket", ticket->ticket, "Ticket, or a type alone for the next free id")
+        .required();
+    auto removed = addCommand<TicketOption>(
         group, invocation, "delete", "Delete a ticket with all its keys", ticket,
         [&](const TicketOption& given) { remove(invocation, given); });
-    removed.add_option("ticket", ticket->ticket, "Ticket")->required();
+    removed.option("ticket", ticket->ticket, "Ticket").required();
     group.footer("A ticket is named job/7, preset/1, system, or TYPE/ID such as 12/3.");
 }
 
 } // namespace
 
-void addTicketCommands(CLI::App& program, Invocation& invocation) {
+void addTicketCommands(Command program, Invocation& invocation) {
     addTicketGroup(program, invocation);
 
     const auto imported = std::make_shared<ImportOptions>();
-    auto& import = addCommand<ImportOptions>(
+    auto import = addCommand<ImportOptions>(
         program, invocation, "import", "Put tickets from JSON files in place", imported,
         [&](const ImportOptions& given) { importAll(invocation, given); });
-    import.add_option("files", imported->files, "JSON files; - for standard input")->required();
-    import.add_flag(
-        "--merge", imported->merge,
-        "Keep keys that the file does not name; else each ticket becomes as in the file");
+    import.option("files", imported->files, "JSON files; - for standard input").required();
+    import.flag("--merge", imported->merge,
+                "Keep keys that the file does not name; else each ticket becomes as in the file");
     import.footer(
         "All files are checked to their end before anything is written. Each ticket is one "
         "step, and an\nimport that was cut off can be repeated. docs/stores.md tells the "
         "format.");
 
     const auto exported = std::make_shared<ExportOptions>();
-    auto& command = addCommand<ExportOptions>(
+    auto command = addCommand<ExportOptions>(
         program, invocation, "export", "Write tickets as JSON", exported,
         [&](const ExportOptions& given) { exportAll(invocation, given); });
-    command.add_option("tickets", exported->tickets,
-                       "Tickets such as job/7; all where none is named");
+    command.option("tickets", exported->tickets, "Tickets such as job/7; all where none is named");
     command
-        .add_option("--type", exported->type.type,
-                    "All of this type: job, preset, system or 0 to 49")
-        ->excludes("tickets");
-    command.add_option("-o,--output", exported->output, "File; - for standard output")
-        ->capture_default_str();
+        .option("--type", exported->type.type, "All of this type: job, preset, system or 0 to 49")
+        .excludes("tickets");
+    command.option("-o,--output", exported->output, "File; - for standard output").showDefault();
 }
 
 } // namespace admin

@@ -73,19 +73,19 @@ void list(const Invocation& invocation) {
 
 } // namespace
 
-void addUserCommands(CLI::App& program, Invocation& invocation) {
-    auto& group = addGroup(program, "user", "Users, who can log in and see all of the store");
+void addUserCommands(Command program, Invocation& invocation) {
+    auto group = program.group("user", "Users, who can log in and see all of the store");
     const auto options = std::make_shared<UserOptions>();
-    const auto command = [&](const char* word, const char* text, auto run) -> CLI::App& {
-        auto& added = addCommand<UserOptions>(
+    const auto command = [&](const char* word, const char* text, auto run) -> Command {
+        auto added = addCommand<UserOptions>(
             group, invocation, word, text, options,
             [&invocation, run](const UserOptions& given) { run(invocation, given); });
-        added.add_option("name", options->name, "The user's name")->required();
+        added.option("name", options->name, "The user's name").required();
         return added;
     };
-    const auto withPassword = [&](CLI::App& added) {
-        added.add_option("--password-file", options->passwordFile,
-                         "File whose first line is the password; - for standard input");
+    const auto withPassword = [&](Command added) {
+        added.option("--password-file", options->passwordFile,
+                     "File whose first line is the password; - for standard input");
         added.footer("Without --password-file the password is asked for, without echo. It never "
                      "stands on the\ncommand line, where everybody could see it.");
     };

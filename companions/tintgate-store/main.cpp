@@ -8,6 +8,8 @@
 #include <utility>
 #include <vector>
 
+#include <CLI/CLI.hpp>
+
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Failure.h"
@@ -132,14 +134,15 @@ int main(int argumentCount, char** arguments) {
                     "PostgreSQL server")
         ->envname("TINTGATE_STORE");
     program.add_flag("--json", invocation.json, "Lists and values as JSON, for scripts");
-    admin::addStoreCommands(program, invocation);
-    admin::addUserCommands(program, invocation);
-    admin::addTicketCommands(program, invocation);
-    admin::addKeyCommands(program, invocation);
-    admin::addFileCommands(program, invocation);
-    admin::addJobCommands(program, invocation);
-    admin::addJdfCommands(program, invocation);
-    admin::addCopyCommand(program, invocation);
+    const admin::Command commands(&program);
+    admin::addStoreCommands(commands, invocation);
+    admin::addUserCommands(commands, invocation);
+    admin::addTicketCommands(commands, invocation);
+    admin::addKeyCommands(commands, invocation);
+    admin::addFileCommands(commands, invocation);
+    admin::addJobCommands(commands, invocation);
+    admin::addJdfCommands(commands, invocation);
+    admin::addCopyCommand(commands, invocation);
     program.footer(footer);
     unmarkOptions(program);
     auto words = markedArguments(argumentCount, arguments);
