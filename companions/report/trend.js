@@ -183,6 +183,25 @@
     },
   });
 
+  // Small marks of very many points, which as points of a chart would take their time.
+  const crowd = 300;
+  const dots = (lists) => ({
+    id: "dots",
+    afterDatasetsDraw(chart) {
+      const { ctx: pen, scales: { x, y } } = chart;
+      pen.save();
+      for (const { points: all, colour, size } of lists) {
+        pen.fillStyle = colour;
+        for (const point of all) {
+          if (Number.isNaN(point.y)) continue;
+          pen.fillRect(x.getPixelForValue(point.x) - size / 2,
+            y.getPixelForValue(point.y) - size / 2, size, size);
+        }
+      }
+      pen.restore();
+    },
+  });
+
   function criterionText(criterion) {
     if (criterion.answered === 0) return "no data";
     const limit = criterion.tolerance ? ` of ${criterion.tolerance}` : "";
@@ -197,16 +216,18 @@
     const only = (wanted) => all.map((point, i) =>
       ((criterion.outcomes[i] === "f") === wanted ? point : { x: point.x, y: NaN }));
     const limits = criterion.tolerances.map(([, tolerance]) => tolerance || 0);
-    const many = all.length > 300;
+    const many = all.length > crowd;
+    const passed = { data: only(false), showLine: false, pointRadius: 3,
+      pointBackgroundColor: colourOf("--passed"), pointBorderWidth: 0 };
+    const marks = { points: passed.data, colour: colourOf("--passed"), size: 2.5 };
     charts.push(new Chart(canvas, {
       type: "line",
       data: { datasets: [
         { data: only(true), showLine: false, pointStyle: "crossRot", pointRadius: many ? 4 : 5.5,
           pointBorderColor: colourOf("--failed"), pointBorderWidth: many ? 1.5 : 2.5 },
-        { data: only(false), showLine: false, pointRadius: many ? 1.5 : 3,
-          pointBackgroundColor: colourOf("--passed"), pointBorderWidth: 0 },
-        { data: all, borderColor: colourOf("--soft"), borderWidth: many ? 0.5 : 1, pointRadius: 0,
-          pointHitRadius: 0 },
+        { data: all, showLine: !many, borderColor: colourOf("--soft"), borderWidth: 1,
+          pointRadius: 0, pointHitRadius: many ? 6 : 0 },
+        ...(many ? [] : [passed]),
       ] },
       options: {
         parsing: false, normalized: true, spanGaps: true,
@@ -215,7 +236,7 @@
         scales: { x: timeScale(), y: { type: "linear", min: 0,
           suggestedMax: 1.25 * Math.max(...limits, 0.1), ticks: { maxTicksLimit: 6 } } },
       },
-      plugins: [toleranceLine(criterion)],
+      plugins: [toleranceLine(criterion), ...(many ? [dots([marks])] : [])],
     }));
   }
 
@@ -273,15 +294,18 @@
     const canvas = addFigure(byId("drift"), ink.name,
       `${ink.word}${ink.now ? ` · L*a*b* ${ink.began} → ${ink.now}` : ""}`);
     const signed = (value) => (value > 0 ? "+" : "") + (value ?? NaN).toFixed(2);
-    const dots = axes.map((axis, i) => ({
-      data: points(ink[axis.change]), showLine: false, pointRadius: ink.changeL.length > 300 ? 0.7 : 1.8,
-      pointStyle: ["circle", "rect", "triangle"][i], pointBorderWidth: 0,
+    const many = ink.changeL.length > crowd;
+    const measured = axes.map((axis, i) => ({
+      data: points(ink[axis.change]), showLine: false, pointRadius: 1.8, pointBorderWidth: 0,
+      pointStyle: ["circle", "rect", "triangle"][i],
       pointBackgroundColor: `${colourOf(axis.colour)}66` }));
+    const marks = measured.map((set) =>
+      ({ points: set.data, colour: set.pointBackgroundColor, size: 1.4 }));
     charts.push(new Chart(canvas, {
       type: "line",
       data: { datasets: [...axes.map((axis) => ({
         data: points(ink[axis.average]), borderColor: colourOf(axis.colour), borderDash: axis.dash,
-        borderWidth: axis.width, pointRadius: 0, pointHitRadius: 6 })), ...dots] },
+        borderWidth: axis.width, pointRadius: 0, pointHitRadius: 6 })), ...(many ? [] : measured)] },
       options: {
         parsing: false, normalized: true, spanGaps: true,
         layout: { padding: { right: 26 } },
@@ -291,7 +315,7 @@
           ticks: { maxTicksLimit: 7 },
           grid: { color: ({ tick }) => colourOf(tick && tick.value === 0 ? "--ink" : "--faint") } } },
       },
-      plugins: [beginAndNames],
+      plugins: [beginAndNames, ...(many ? [dots(marks)] : [])],
     }));
   }
 
