@@ -4,14 +4,20 @@
 job_run.py BUILD SOURCE
 
 The job has 1,617 stored patches (FOGRA40L), each with 36 spectral values, and is compared with a
-file of characterisation data (FOGRA39L). The login, of whose time most goes into the password's
-hash, and the pause of a third of it are left out: a run with a job that is not on the server's list
-ends right after the login, and what it takes beyond `-version` is the login. The sides take turns
-and the medians of processor time are compared; time on the clock is printed beside it.
+file of characterisation data (FOGRA39L). The login and the pause of a third of it are left out: a
+run with a job that is not on the server's list ends right after the login, and what it takes beyond
+`-version` is the login. Nearly all of it would be the hash of the password, ten times as long as
+what is to be measured and of a length that changes with all that the machine does; so the store
+gets the cheapest hash of the password that there is. The sides take turns and the medians of
+processor time are compared; time on the clock is printed beside it.
 """
 
+import contextlib
+import ctypes
+import ctypes.util
 import json
 import os
+import sqlite3
 import statistics
 import subprocess
 import sys
@@ -21,7 +27,8 @@ from pathlib import Path
 
 ICC = Path("/usr/share/color/icc")
 REFERENCES, MEASURED = ICC / "FOGRA39L.ti3", ICC / "FOGRA40L.ti3"
-RUNS = 15
+RUNS = 61
+PASSWORD = b"gate"
 LIMIT = 3.0
 BANDS = 36
 
@@ -75,14 +82,27 @@ def fill_store(store, folder, source):
     for words in (["make"], ["user", "add", "anna", "--password-file", "-"],
                   ["import", folder / "job/tickets.json"],
                   ["file", "put", folder / "job/server", "/server"]):
-        subprocess.run([*store, *words], input="gate\n", text=True, check=True,
+        subprocess.run([*store, *words], input=PASSWORD + b"\n", check=True,
                        stdout=subprocess.DEVNULL)
+
+
+def make_login_cheap(tickets):
+    """Replaces the hash of the password by one with the least memory and work that is allowed."""
+    sodium = ctypes.CDLL(ctypes.util.find_library("sodium"))
+    text = ctypes.create_string_buffer(sodium.crypto_pwhash_strbytes())
+    if sodium.sodium_init() < 0 or sodium.crypto_pwhash_str(
+            text, PASSWORD, ctypes.c_ulonglong(len(PASSWORD)), ctypes.c_ulonglong(1),
+            ctypes.c_size_t(8192)) != 0:
+        sys.exit("no cheap hash of the password")
+    with contextlib.closing(sqlite3.connect(tickets)) as connection, connection as database:
+        database.execute("UPDATE users SET hash = ?", (text.value,))
 
 
 def main(build, source):
     with tempfile.TemporaryDirectory() as name:
         folder = Path(name)
         fill_store([f"{build}/bin/tintgate-store", "--store", folder / "store"], folder, source)
+        make_login_cheap(folder / "store/tickets.db")
         subprocess.run(["cmake", "--install", build, "--component", "companions", "--prefix",
                         folder / "root"], check=True, stdout=subprocess.DEVNULL)
         # No viewer: its start is its own affair, and it would run beside what is timed.
@@ -96,7 +116,7 @@ def main(build, source):
 
         def job(number):
             return [tool, f"KEY_KZ_HOST:=:{folder / 'store'}", "0", str(number), "en_US", "0",
-                    "gate", "anna"]
+                    PASSWORD.decode(), "anna"]
 
         files = folder / "tmp/Tintgate/JobID_7"
         sides = {"job": (job(7), 0), "login": (job(999), 108), "nothing": ([tool, "-version"], 0),
