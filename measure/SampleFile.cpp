@@ -12,6 +12,7 @@
 //     BEGIN_DATA
 //     1 0 0 0 100 16.25 0.25 -0.5
 //     END_DATA
+#include <array>
 #include <charconv>
 #include <cstdint>
 #include <fstream>
@@ -20,6 +21,7 @@
 #include <string_view>
 
 #include "job/KZVerifyJobProcessor.h"
+#include "measure/NumberText.h"
 
 namespace {
 
@@ -60,28 +62,29 @@ Fields fieldsOf(const measurementDataRecord& measurement) {
 /// Rows of data, one after the other.
 class Row {
   public:
-    Row() { m_text.reserve(1024); }
-
-    void start(int number) { m_text.assign(std::to_string(number)); }
+    void start(int number) { m_end = std::to_chars(m_text.begin(), m_text.end(), number).ptr; }
 
     /// Significant digits from here on, in the rows to come as well.
     void setPrecision(int digits) { m_precision = digits; }
 
     void add(std::span<const double> values) {
         for (const double value : values) {
-            // What a C++ stream writes by default in the "C" locale, without its price.
-            char text[32];
-            const auto [end, fault] = std::to_chars(text, text + sizeof text, value,
-                                                    std::chars_format::general, m_precision);
-            m_text += '\t';
-            m_text.append(text, end);
+            *m_end++ = '\t';
+            m_end = writeNumberText(m_end, value, m_precision);
         }
     }
 
-    const std::string& finish() { return m_text += '\n'; }
+    std::string_view finish() {
+        *m_end++ = '\n';
+        return {m_text.data(), m_end};
+    }
 
   private:
-    std::string m_text;
+    static constexpr int mostValues = 4 + 3 + 3 + spectralValueCount;
+
+    // The number of a patch takes no more than a value does.
+    std::array<char, (1 + mostValues) * (1 + longestNumberText)> m_text;
+    char* m_end = m_text.data();
     int m_precision = 6;
 };
 

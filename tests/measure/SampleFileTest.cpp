@@ -121,7 +121,8 @@ TEST_F(SampleFile, HasTheColumnsThatAreThere) {
     }
 }
 
-/// The requirement as it is put: one stream for all rows, emptied between them.
+/// The requirement as it is put: one stream for all rows, emptied between them. Device values
+/// alone, or all groups.
 std::string streamedRows(const Samples& samples) {
     std::ostringstream stream;
     std::string rows;
@@ -134,11 +135,13 @@ std::string streamedRows(const Samples& samples) {
         stream.str("");
         stream << i + 1;
         put(&samples.cmyk[4 * i], 4);
-        put(&samples.lab[3 * i], 3);
-        stream << std::setprecision(7);
-        put(&samples.xyz[3 * i], 3);
-        stream << std::setprecision(8);
-        put(samples.spectra[i].values, 36);
+        if (samples.record.lab != nullptr) {
+            put(&samples.lab[3 * i], 3);
+            stream << std::setprecision(7);
+            put(&samples.xyz[3 * i], 3);
+            stream << std::setprecision(8);
+            put(samples.spectra[i].values, 36);
+        }
         rows += stream.str() + "\n";
     }
     return rows;
@@ -147,10 +150,11 @@ std::string streamedRows(const Samples& samples) {
 TEST_F(SampleFile, WritesNumbersAsAStreamDoes) {
     std::mt19937_64 random(20251125);
     using Limits = std::numeric_limits<double>;
-    const double special[] = {0.0,          -0.0,          infinity,      -infinity,
-                              std::nan(""), -std::nan(""), Limits::max(), Limits::denorm_min(),
-                              999999.5,     9999999.5,     99999999.5,    0.00009999999995,
-                              2.5e-5};
+    const double special[] = {0.0,          -0.0,          infinity,          -infinity,
+                              std::nan(""), -std::nan(""), Limits::max(),     Limits::denorm_min(),
+                              999999.5,     9999999.5,     99999999.5,        0.00009999999995,
+                              2.5e-5,       9.9999995,     99999.995,         0.09999999499999999,
+                              0.0001,       100000,        1.9073486328125e-6};
     const auto any = [&]() -> double {
         switch (random() % 3) {
         case 0:
@@ -161,24 +165,30 @@ TEST_F(SampleFile, WritesNumbersAsAStreamDoes) {
             std::memcpy(&value, &bits, sizeof value);
             return value;
         }
-        default: // Few digits, as instruments give, and many that lie between two texts.
-            return static_cast<double>(random() % 20'000'000) / 1024 - 100;
+        default: { // Few digits, as instruments give, and many that lie between two texts.
+            const double value = static_cast<double>(random() % (1u << random() % 28));
+            return std::ldexp(random() % 2 == 0 ? value : -value, -static_cast<int>(random() % 20));
+        }
         }
     };
     Samples samples(1617);
-    samples.record.lab = samples.lab.data();
-    samples.record.xyz = samples.xyz.data();
-    samples.addSpectra(380, 10, 36);
     for (auto* values : {&samples.cmyk, &samples.lab, &samples.xyz}) {
         std::generate(values->begin(), values->end(), any);
     }
     for (spectralRow& row : samples.spectra) {
         std::generate(row.values, row.values + 36, any);
     }
-    const std::string text = written(samples);
-    const std::string start = "\nBEGIN_DATA\n";
-    EXPECT_TRUE(text.substr(text.find(start) + start.size()) ==
-                streamedRows(samples) + "END_DATA\n");
+    const auto rows = [&] {
+        const std::string text = written(samples);
+        const std::string start = "\nBEGIN_DATA\n";
+        return text.substr(text.find(start) + start.size());
+    };
+    EXPECT_TRUE(rows() == streamedRows(samples) + "END_DATA\n") << "6 digits";
+    samples.record.lab = samples.lab.data();
+    samples.record.xyz = samples.xyz.data();
+    samples.addSpectra(380, 10, 36);
+    EXPECT_TRUE(rows() == streamedRows(samples) + "END_DATA\n") << "7 and 8 digits";
+    const std::string text = support::contentsOf(m_sample);
     EXPECT_NE(text.find("\nNUMBER_OF_FIELDS 47\n"), text.npos);
     EXPECT_NE(text.find("\tSPECTRAL_730\nEND_DATA_FORMAT\n"), text.npos);
 }
