@@ -17,5 +17,7 @@ for bench in "${benches[@]}"; do
 done
 echo "== the whole program"
 cmake --build --preset release --target bench_tool
+echo "== a whole run of the job form"
+cmake --build --preset release --target bench_job
 echo "== the pages of reports"
 cmake --build --preset release --target bench_report
