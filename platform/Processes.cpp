@@ -73,23 +73,31 @@ std::optional<std::string> executable(std::uint32_t number) {
     return result;
 }
 
-// The executable's path below the system root, or nothing if this is no running application.
-std::optional<std::string> pathOfApplication(std::uint32_t number) {
-    if (number == 0 || number > INT_MAX || !isOfThisUser(number)) {
-        return std::nullopt;
-    }
-    std::optional<std::string> path = executable(number);
+// What the paths of applications begin with: nothing without a system root, and no value where the
+// root is no folder, so that there are no applications.
+std::optional<std::string> folderOfApplications() {
     const std::string root = platform::systemRoot();
-    if (!path || root.empty()) {
-        return path;
+    if (root.empty()) {
+        return root;
     }
     // Paths of executables are free of links, so the root has to be too.
     std::error_code failure;
     const std::string folder = std::filesystem::canonical(root, failure).string() + "/";
-    if (failure || !startsWith(*path, folder)) {
+    return failure ? std::nullopt : std::optional(folder);
+}
+
+// The executable's path below that folder, or nothing if this is no running application. The owner
+// is asked for last: nearly all processes lie elsewhere.
+std::optional<std::string> pathOfApplication(std::uint32_t number,
+                                             const std::optional<std::string>& folder) {
+    if (number == 0 || number > INT_MAX || !folder) {
         return std::nullopt;
     }
-    return path->substr(folder.size());
+    const std::optional<std::string> path = executable(number);
+    if (!path || !startsWith(*path, *folder) || !isOfThisUser(number)) {
+        return std::nullopt;
+    }
+    return path->substr(folder->size());
 }
 
 std::string nameOfApplication(std::string_view path) {
@@ -109,13 +117,15 @@ std::string nameOfApplication(std::string_view path) {
 } // namespace
 
 OSErr GetNextProcess(ProcessSerialNumber* cursor) {
-    // One look at the list of processes serves a whole walk.
+    // One look at the list of processes and at the root serves a whole walk.
     thread_local std::vector<std::uint32_t> numbers;
+    thread_local std::optional<std::string> folder;
     if (cursor->lowLongOfPSN == 0) {
         numbers = allProcesses();
+        folder = folderOfApplications();
     }
     auto next = std::upper_bound(numbers.begin(), numbers.end(), cursor->lowLongOfPSN);
-    while (next != numbers.end() && !pathOfApplication(*next)) {
+    while (next != numbers.end() && !pathOfApplication(*next, folder)) {
         ++next;
     }
     if (next == numbers.end()) {
@@ -126,7 +136,8 @@ OSErr GetNextProcess(ProcessSerialNumber* cursor) {
 }
 
 OSStatus CopyProcessName(const ProcessSerialNumber* process, CFStringRef* name) {
-    const std::optional<std::string> path = pathOfApplication(process->lowLongOfPSN);
+    const std::optional<std::string> path =
+        pathOfApplication(process->lowLongOfPSN, folderOfApplications());
     *name = path ? CFStringCreateWithCString(kCFAllocatorDefault, nameOfApplication(*path).c_str(),
                                              kCFStringEncodingUTF8)
                  : nullptr;
@@ -135,7 +146,7 @@ OSStatus CopyProcessName(const ProcessSerialNumber* process, CFStringRef* name) 
 
 OSErr KillProcess(const ProcessSerialNumber* process) {
     const pid_t number = static_cast<pid_t>(process->lowLongOfPSN);
-    const bool ended = pathOfApplication(process->lowLongOfPSN) && number != getpid() &&
-                       kill(number, SIGTERM) == 0;
+    const bool ended = pathOfApplication(process->lowLongOfPSN, folderOfApplications()) &&
+                       number != getpid() && kill(number, SIGTERM) == 0;
     return ended ? noErr : procNotFound;
 }
