@@ -93,11 +93,12 @@ int lookUpEskoReferences(const JobLoad& load) {
     return 0;
 }
 
+/// A path that is no UTF-8 leads nowhere, but is one: another profile must not take its place.
 int lookUpProfile(const JobLoad& load) {
     if (load.job->measurementStatus > 0) {
         load.job->jobType = 3;
     }
-    wxString path;
+    std::string path;
     load.ticket.read(stripKey(load.strip, "Footer/ControlstripInputProfile"), &path);
     if (path.empty()) {
         load.ticket.read("Remote/UsedICCProfile", &path);
@@ -105,7 +106,7 @@ int lookUpProfile(const JobLoad& load) {
     if (path.empty()) {
         return noReference;
     }
-    fetchFile(load, path, profileWait, &load.job->referenceFile);
+    fetchFile(load, wxString::FromUTF8(path), profileWait, &load.job->referenceFile);
     return 0;
 }
 
@@ -130,12 +131,13 @@ wxString characterisationPath(const JobLoad& load, const wxString& value) {
 }
 
 int lookUpCharacterisation(const JobLoad& load) {
-    wxString value;
+    std::string value;
     load.ticket.read(stripKey(load.strip, "Workflow/Verify/CharacterizationData"), &value);
     if (value.empty()) {
         return noReference;
     }
-    fetchFile(load, characterisationPath(load, value), usualWait, &load.job->referenceFile);
+    fetchFile(load, characterisationPath(load, wxString::FromUTF8(value)), usualWait,
+              &load.job->referenceFile);
     return 0;
 }
 

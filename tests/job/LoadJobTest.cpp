@@ -284,6 +284,8 @@ TEST_F(LoadJob, FindsReferences) {
          "reference=/profile.icc</s/profile.icc workflow=1"},
         {workflow + "1 Footer/ControlstripInputProfile=' Remote/UsedICCProfile='/s/profile2.icc",
          "reference=/profile2.icc</s/profile2.icc workflow=1"},
+        {workflow + "1 Footer/ControlstripInputProfile='\xff Remote/UsedICCProfile='/s/profile.icc",
+         "reference= workflow=1"},
         {workflow + "1 Remote/UsedICCProfile='/s/profile.icc Remote/Measurement/Status=1",
          "reference=/profile.icc</s/profile.icc status=1 type=2 workflow=1"},
         {workflow +
