@@ -271,13 +271,13 @@ int KZVerifyJobProcessor::GetJobJDFFileName(KZJobDataStruct* job) {
         return code;
     }
     if (job->jobType == 0 || job->jobType == 2 || job->jobType == 3) {
-        wxString folder;
+        std::string folder; // One that is no UTF-8 is still not missing: nothing takes its place.
         code = ticket.read("System/Folders/Temp", &folder);
         if (folder.empty()) {
             code = ticket.read("Workflow/RemoteOutFolder", &folder);
         }
         if (!folder.empty()) {
-            job->jdfServerFile = folder + "/" + name;
+            job->jdfServerFile = wxString::FromUTF8(folder) + "/" + name;
         }
         return code;
     }

@@ -482,6 +482,7 @@ TEST_F(LoadJob, FetchesTheJdf) {
         {"System/Folders/Temp=-", "code=-1 jdf= jdfServer="},
         {"System/Folders/Temp=- Workflow/RemoteOutFolder='/s//jdf", "jdfServer=/s//jdf/job.jdf"},
         {"System/Folders/Temp=' Workflow/RemoteOutFolder='/s/jdf", ""},
+        {"System/Folders/Temp='\xff Workflow/RemoteOutFolder='/s/jdf", "code=111 jdf= jdfServer="},
         {"System/Folders/Temp=' Workflow/RemoteOutFolder='", "code=111 jdf= jdfServer="},
         {"System/Folders/Temp=' Workflow/RemoteOutFolder=' Job/FromEsko=1", "jdf= jdfServer="},
     };
