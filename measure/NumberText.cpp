@@ -1,5 +1,5 @@
 // The values of instruments lie in a few powers of ten, where 128 bits hold all that rounding has
-// to know. That takes a third of the time of the C++ library's conversion, which does all the
+// to know. That takes less than half the time of the C++ library's conversion, which does all the
 // others.
 #include "measure/NumberText.h"
 
