@@ -153,6 +153,7 @@ int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std:
         result = VerifyLoadedJob(&job, remeasure);
     }
     CLogger::GetLogger()->Log("Overall result = %d", result);
+    FreeMeasurementData(job);
     return result;
 }
 
@@ -177,18 +178,16 @@ int KZVerifyJobProcessor::VerifyLoadedJob(KZJobDataStruct* job, bool remeasure) 
     std::wstring json;
     if (!remeasure && isMeasured(*job)) {
         result = CompareStoredData(job, &json);
-        FreeMeasurementData(*job);
-    } else {
-        analyseResultsRecord results;
-        result = MeasureJob(job, &results, &json);
-        if (result == exitDone) {
-            WriteBackResults(job->jobID, *job, results, remeasure);
-        } else {
-            FreeMeasurementData(*job);
-        }
+        return result == exitDone ? showResult(*job, json) : result;
     }
-    // The arrays of the job's measurement are gone from here on.
-    return result == exitDone ? showResult(*job, json) : result;
+    analyseResultsRecord results;
+    result = MeasureJob(job, &results, &json);
+    if (result == exitDone) {
+        WriteBackResults(job->jobID, *job, results, remeasure);
+        result = showResult(*job, json);
+        job->measurement = measurementDataRecord(); // Its arrays went with the write-back.
+    }
+    return result;
 }
 
 // A missing reference file is logged and does not end this road: the analysis says what is wrong.
