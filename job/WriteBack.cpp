@@ -5,9 +5,11 @@
 #include <cmath>
 #include <cstdint>
 #include <cstring>
+#include <functional>
 #include <iterator>
 #include <memory>
 #include <new>
+#include <span>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -17,14 +19,14 @@
 #include "jdf/JdfHandler.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
+#include "job/PatchArrays.h"
 #include "job/StripKeys.h"
 #include "text/CharSets.h"
 #include "text/MathLib.h"
 
 namespace {
 
-constexpr int workflowWithJdf = 3;     ///< Of KZJobDataStruct::measurementWorkflow.
-constexpr int mostPatches = 1'000'000; ///< Arrays of more count as memory that is not there.
+constexpr int workflowWithJdf = 3; ///< Of KZJobDataStruct::measurementWorkflow.
 
 constexpr int paperWhite = 4;    ///< Of analyseResultsRecord::approvals.
 constexpr int averageDeltaE = 5; ///< Of analyseResultsRecord::values.
@@ -75,27 +77,6 @@ constexpr ResultPosition positions[] = {
 // clang-format on
 constexpr int positionCount = std::size(positions);
 constexpr int psdPositionCount = 10; ///< Verdicts of a PSD preset stand in their own order.
-
-/// An array of the ticket, one element for each patch.
-struct Column {
-    const char* name;
-    double* measurementDataRecord::*rows;
-    int width; ///< Values of a row.
-    int index; ///< Of the value that is taken.
-};
-
-constexpr Column columns[] = {
-    {"XYZValues/XValues", &measurementDataRecord::xyz, 3, 0},
-    {"XYZValues/YValues", &measurementDataRecord::xyz, 3, 1},
-    {"XYZValues/ZValues", &measurementDataRecord::xyz, 3, 2},
-    {"LabValues/LValues", &measurementDataRecord::lab, 3, 0},
-    {"LabValues/AValues", &measurementDataRecord::lab, 3, 1},
-    {"LabValues/BValues", &measurementDataRecord::lab, 3, 2},
-    {"CMYKValues/CValues", &measurementDataRecord::cmyk, 4, 0},
-    {"CMYKValues/MValues", &measurementDataRecord::cmyk, 4, 1},
-    {"CMYKValues/YValues", &measurementDataRecord::cmyk, 4, 2},
-    {"CMYKValues/KValues", &measurementDataRecord::cmyk, 4, 3},
-};
 
 /// A job's ticket, below the root of one of its strips.
 class StripTicket {
@@ -208,19 +189,20 @@ bool hasSpectra(const measurementDataRecord& measurement) {
            measurement.spectral->length >= 0 && measurement.spectral->length <= spectralValueCount;
 }
 
-void writeColumns(const StripTicket& ticket, const measurementDataRecord& measurement,
-                  double* values) {
-    for (const auto& [name, rows, width, index] : columns) {
-        const double* value = measurement.*rows;
-        if (value == nullptr) {
-            continue;
+/// The columns of one of the record's arrays, each value as `convert` gives it; `values` has room
+/// for one column.
+template<class Convert>
+void writeColumns(const StripTicket& ticket, std::span<const char* const> names, const double* rows,
+                  int patches, double* values, Convert convert) {
+    if (rows == nullptr) {
+        return;
+    }
+    for (std::size_t column = 0; column < names.size(); ++column) {
+        const double* value = rows + column;
+        for (int i = 0; i < patches; ++i, value += names.size()) {
+            values[i] = convert(*value);
         }
-        const bool isDevice = rows == &measurementDataRecord::cmyk;
-        value += index;
-        for (int i = 0; i < measurement.numPatches; ++i, value += width) {
-            values[i] = isDevice ? percentOf(*value, ticket.strip()) : *value;
-        }
-        ticket.writeArray(name, measurement.numPatches, values);
+        ticket.writeArray(names[column], patches, values);
     }
 }
 
@@ -245,8 +227,15 @@ void writePatches(const StripTicket& ticket, const measurementDataRecord& measur
     for (int i = 0; i < patches; ++i) {
         end = std::copy_n(measurement.spectral[i].values, first.length, end);
     }
-    ticket.writeArray("SpectralValues/DValues", static_cast<int>(end - values.get()), values.get());
-    writeColumns(ticket, measurement, values.get());
+    ticket.writeArray(spectralArray, static_cast<int>(end - values.get()), values.get());
+
+    const auto write = [&](std::span<const char* const> names, const double* rows, auto convert) {
+        writeColumns(ticket, names, rows, patches, values.get(), convert);
+    };
+    write(xyzArrays, measurement.xyz, std::identity());
+    write(labArrays, measurement.lab, std::identity());
+    write(cmykArrays, measurement.cmyk,
+          [&](double value) { return percentOf(value, ticket.strip()); });
 }
 
 void writeMeasured(const StripTicket& ticket, const tolerancePresetParameterRecord& tolerance,

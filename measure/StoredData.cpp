@@ -13,20 +13,12 @@
 
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
+#include "job/PatchArrays.h"
 #include "job/StripKeys.h"
 
 namespace {
 
-constexpr int mostPatches = 1'000'000; ///< Arrays of more count as memory that is not there.
-
 using Columns = std::span<const char* const>;
-
-constexpr const char* xyzColumns[] = {"XYZValues/XValues", "XYZValues/YValues",
-                                      "XYZValues/ZValues"};
-constexpr const char* labColumns[] = {"LabValues/LValues", "LabValues/AValues",
-                                      "LabValues/BValues"};
-constexpr const char* cmykColumns[] = {"CMYKValues/CValues", "CMYKValues/MValues",
-                                       "CMYKValues/YValues", "CMYKValues/KValues"};
 
 struct Freed {
     void operator()(void* block) const { std::free(block); }
@@ -89,8 +81,7 @@ bool fillSpectra(const StoredSet& stored, int patches, spectralRow* rows) {
     const spectralRow& first = rows[0];
     const int count = patches * first.length;
     const auto values = makeRows<double>(patches, static_cast<std::size_t>(first.length));
-    if (values == nullptr ||
-        stored.readArray("SpectralValues/DValues", count, values.get()) != count) {
+    if (values == nullptr || stored.readArray(spectralArray, count, values.get()) != count) {
         return false;
     }
     const double* next = values.get();
@@ -162,9 +153,9 @@ double* loadRows(const StoredSet& stored, Columns columns, int patches, bool may
 template<class StoredDevice>
 void loadColumns(const StoredSet& stored, measurementDataRecord* record, bool mayRead) {
     const int patches = record->numPatches;
-    record->xyz = loadRows<double>(stored, xyzColumns, patches, mayRead);
-    record->lab = loadRows<double>(stored, labColumns, patches, mayRead);
-    record->cmyk = loadRows<StoredDevice>(stored, cmykColumns, patches, mayRead);
+    record->xyz = loadRows<double>(stored, xyzArrays, patches, mayRead);
+    record->lab = loadRows<double>(stored, labArrays, patches, mayRead);
+    record->cmyk = loadRows<StoredDevice>(stored, cmykArrays, patches, mayRead);
 }
 
 } // namespace
