@@ -31,7 +31,9 @@ wxString makeWorkingDir() {
 } // namespace
 
 KZVerifyJobProcessor::KZVerifyJobProcessor() : m_workingDir(SetWorkingDir()) {
-    CLogger::InitLogger(GetNerovaKZJobDataDir() + "/TintgateKZ.log");
+    // A second processor of a process has no folder, by requirement.
+    CLogger::InitLogger((m_workingDir.empty() ? nowhere : GetNerovaKZJobDataDir()) +
+                        "/TintgateKZ.log");
 }
 
 KZVerifyJobProcessor::~KZVerifyJobProcessor() {
