@@ -1,17 +1,8 @@
 // The store through the real bundle and the manager, against bare SQLite and bare loops.
-//
-// The two sides of a ratio run by turns, each at its best of several, so that a machine that is
-// busy with something else slows both.
-#include <algorithm>
-#include <chrono>
-#include <cstdio>
 #include <cstdlib>
 #include <cstring>
 #include <filesystem>
-#include <functional>
-#include <limits>
 #include <memory>
-#include <random>
 #include <set>
 #include <string>
 #include <vector>
@@ -21,6 +12,7 @@
 #include "ScratchFolder.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
+#include "StoreBench.h"
 #include "SuiteRoot.h"
 #include "comgui/StoreEngine.h"
 #include "comgui/StoreKeep.h"
@@ -29,43 +21,7 @@
 
 namespace {
 
-constexpr int elements = 58'212; // 1,617 patches of 36 spectral samples.
-constexpr int jobs = 10'000;
-constexpr const char* arrayKey = "Remote/Measurement/Spectral";
-constexpr const char* overviewKeys[] = {"Input/SubType", "Job/Display/Status",
-                                        "Remote/ShowInVerifier", "Input/FileType",
-                                        "Workflow/Verify/Active"};
-
-double secondsOf(const std::function<void()>& work) {
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
-
-/// Before is not timed.
-void compare(const char* name, double limit, int rounds, const std::function<void()>& before,
-             const std::function<void()>& ours, const std::function<void()>& bare) {
-    double best = std::numeric_limits<double>::max();
-    double bareBest = best;
-    for (int round = 0; round < rounds; ++round) {
-        before();
-        best = std::min(best, secondsOf(ours));
-        before();
-        bareBest = std::min(bareBest, secondsOf(bare));
-    }
-    std::printf("%-48s %7.2f ms, %.2f times the bare %.2f ms (at most %.0f)\n", name, best * 1e3,
-                best / bareBest, bareBest * 1e3, limit);
-}
-
-void check(bool done, const char* what) {
-    if (!done) {
-        std::fprintf(stderr, "%s failed\n", what);
-        std::exit(1);
-    }
-}
-
-/// Keeps a result from being optimised away.
-volatile double g_sink;
+using namespace bench;
 
 class BareDatabase {
   public:
@@ -90,24 +46,6 @@ class BareDatabase {
   private:
     sqlite3* m_database = nullptr;
 };
-
-struct Call {
-    const double* values;
-    std::size_t count;
-};
-
-/// What a slot has to do at the least: tell by type, id and key whether this is the one.
-int bareGet(const Call* call, int type, int id, const char* key, int position, double* out) {
-    if (type != 3 || id != 1 || std::strcmp(key, arrayKey) != 0 ||
-        static_cast<std::size_t>(position) >= call->count) {
-        return 0;
-    }
-    *out = call->values[position];
-    return 1;
-}
-
-using BareSlot = int (*)(const Call*, int, int, const char*, int, double*);
-volatile BareSlot g_slot = bareGet; // Asked for at each call, as a slot of a table is.
 
 } // namespace
 
@@ -152,12 +90,7 @@ int main() {
     check(connector.IsLoggedIn(), "the login");
     ComGUIManager& manager = *connector.getComGUIMngrInstance();
 
-    // Reflectances, as measured: no two alike, in no order.
-    std::mt19937 random(3); // NOLINT: the same each time
-    std::vector<double> values(elements);
-    for (double& value : values) {
-        value = std::uniform_real_distribution<double>(0, 1)(random);
-    }
+    std::vector<double> values = measuredValues(elements);
     BareDatabase bare(address + "/tickets.db");
     bare.run("CREATE TABLE bench (id INTEGER PRIMARY KEY, value BLOB)");
     bare.run("INSERT INTO bench VALUES (1, x'00')");
@@ -200,14 +133,7 @@ int main() {
             check(sqlite3_step(read) == SQLITE_ROW, "the bare read");
             std::memcpy(copy.data(), sqlite3_column_blob(read, 0), static_cast<std::size_t>(bytes));
             sqlite3_reset(read);
-            const Call call = {copy.data(), copy.size()};
-            double sum = 0;
-            for (int i = 0; i < elements; ++i) {
-                double value = 0;
-                g_slot(&call, 3, 1, arrayKey, i, &value);
-                sum += value;
-            }
-            g_sink = sum;
+            readBare(copy);
         });
 
     std::string list;

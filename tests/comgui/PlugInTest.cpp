@@ -7,10 +7,9 @@
 
 #include <dlfcn.h>
 
-#include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "StoreTest.h"
-#include "SuiteRoot.h"
+#include "Suite.h"
 #include "comgui/Users.h"
 #include "platform/WideBytes.h"
 #include "ticket/TicketFactory.h"
@@ -22,12 +21,6 @@ constexpr int application = 0x5071103;
 class ComGUIPlugIn : public StoreTest {
   protected:
     explicit ComGUIPlugIn(Engine kind = GetParam()) : StoreTest(kind) {
-        root.installPlistReader(PLIST_READER);
-        root.writePreferences("Qen/com.qen.packageversion.plist",
-                              {{"Nerova Hue Workbench/library_path", root.path("suite")}});
-        std::filesystem::create_directories(root.path("suite/lib"));
-        std::filesystem::create_directory_symlink(COMGUI_BUNDLE,
-                                                  root.path("suite/lib/ComGUI.Bundle"));
         const auto engine = open();
         engine->putUser({"press", hash, false});
         engine->putUser({"gone", hash, true});
@@ -36,7 +29,7 @@ class ComGUIPlugIn : public StoreTest {
     static std::unique_ptr<CKZConnector> connect(const std::wstring& server,
                                                  const std::wstring& user = L"press",
                                                  const std::wstring& password = L"room") {
-        return std::make_unique<CKZConnector>(server, user, password, application, false, false);
+        return Suite::connect(server, user, password);
     }
     std::unique_ptr<CKZConnector> connect() const {
         return connect(platform::wideFromBytes(address));
@@ -65,7 +58,7 @@ class ComGUIPlugIn : public StoreTest {
 
     /// Hashing is slow by intent.
     inline static const std::string hash = store::passwordHash("room");
-    const support::SuiteRoot root;
+    const Suite suite;
 };
 ON_BOTH_ENGINES(ComGUIPlugIn);
 

@@ -63,12 +63,13 @@ class StoreTest : public testing::TestWithParam<Engine> {
 
     std::unique_ptr<store::StoreEngine> open() const { return store::openStore(address); }
 
+  public:
     /// Sends a table as a session would; what became of it and of its records.
     static std::string send(store::StoreEngine& engine, int type, int id,
                             const std::string& records) {
         // The keep is gone before the engine is.
         store::StoreKeep keep(std::shared_ptr<store::StoreEngine>(&engine, [](auto*) {}));
-        RecordTable table(records);
+        support::RecordTable table(records);
         const bool taken = keep.apply(type, id, table.records());
         return (taken ? "taken " : "refused ") + support::resultText(table.records());
     }
@@ -113,6 +114,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
         return std::nullopt;
     }
 
+  protected:
     using RecordTable = support::RecordTable;
 
     /// Runs SQL behind the store's back: the first text where it is a folder, else the second.
