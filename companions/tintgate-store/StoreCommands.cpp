@@ -60,12 +60,13 @@ void addStoreCommands(Command program, Invocation& invocation) {
                                 [&](const MakeOptions& given) { make(invocation, given); });
     command.option("--name", options->serverName, "Name that the server gives itself")
         .showDefault();
-    command.footer("The folder must not be there yet, or be empty.");
+    command.footer(
+        "The folder must not be there yet, or be empty; a server's database must hold no store.");
 
     addCommand<NoOptions>(
         program, invocation, "upgrade", "Bring a store of an older format up to date",
         std::make_shared<NoOptions>(), [&](const NoOptions&) { upgrade(invocation); })
-        .footer("Make a copy of the folder first; there is no way back.");
+        .footer("Back the store up first; there is no way back.");
     addCommand<NoOptions>(program, invocation, "info", "Show what is in the store",
                           std::make_shared<NoOptions>(),
                           [&](const NoOptions&) { info(invocation); });

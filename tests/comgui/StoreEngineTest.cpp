@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <csignal>
+#include <cstring>
 #include <fstream>
 
 #include <sys/resource.h>
@@ -79,6 +80,35 @@ TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
                                }),
                  std::runtime_error);
     EXPECT_EQ(ticket(*second, 3, 1), "b[0]='new b2[0]=1 b2[1]=2 é[0]=7");
+}
+
+TEST_P(StoreEngine, ShowsSomeKeysOfAllTicketsAsFarAsTheyAreNotTooLarge) {
+    const auto engine = open();
+    for (const int id : {4, 2, 9}) {
+        engine->create(3, id);
+        send(*engine, 3, id, "b=" + std::to_string(id) + " a='same c=1");
+    }
+    send(*engine, 3, 4, "a=1,2,3,4,5,6,7,8,9");
+    const auto shown = [&](std::size_t largest) {
+        std::string text;
+        engine->keysOfAll(3, {"b", "a"}, largest, [&](int id, std::size_t name, auto elements) {
+            text += std::to_string(id) + (name == 0 ? "b" : "a") +
+                    (elements ? std::to_string(elements->count()) : "-") + " ";
+        });
+        return text;
+    };
+    const auto sorted = [](std::string text) {
+        for (const auto& [wrong, right] :
+             {std::pair("2a1 2b1 ", "2b1 2a1 "), std::pair("4a- 4b1 ", "4b1 4a- "),
+              std::pair("4a9 4b1 ", "4b1 4a9 "), std::pair("9a1 9b1 ", "9b1 9a1 ")}) {
+            if (const auto at = text.find(wrong); at != std::string::npos) {
+                text.replace(at, std::strlen(wrong), right);
+            }
+        }
+        return text; // The keys of one ticket come in any order.
+    };
+    EXPECT_EQ(sorted(shown(40)), "2b1 2a1 4b1 4a- 9b1 9a1 ");
+    EXPECT_EQ(sorted(shown(std::size_t{1} << 40)), "2b1 2a1 4b1 4a9 9b1 9a1 ");
 }
 
 TEST_P(StoreEngine, CommitsAreNoticedWhoeverMakesThem) {
