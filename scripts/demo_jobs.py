@@ -89,10 +89,11 @@ def meanings():
 class Room:
     """A print room: its store, and the programs beside it."""
 
-    def __init__(self, build, folder):
+    def __init__(self, build, folder, store=None):
+        """In the folder; the store in it too, or at another address."""
         self.build = build
         self.folder = folder
-        self.store = folder / "store"
+        self.store = store or str((folder / "store").resolve())
         shutil.rmtree(folder, ignore_errors=True)
         folder.mkdir(parents=True)
         self.administer("make", "--name", "Print room")
@@ -115,11 +116,18 @@ class Room:
         self.administer("import", parts / "tickets.json")
         self.administer("file", "put", parts / "server", "/server")
 
-    def start(self, run):
-        place = self.folder / f"run-{run.job}-{run.strip}{'-again' if run.remeasure else ''}"
+    def make_place(self, name):
+        """A system root and a temporary folder, for one run at a time."""
+        place = self.folder / name
         (place / "tmp").mkdir(parents=True)
         subprocess.run(["cmake", "--install", self.build, "--component", "companions", "--prefix",
                         place / "root"], check=True, stdout=subprocess.DEVNULL)
+        return place
+
+    def start(self, run, place=None):
+        """The tool's process on a run, and the job's folder."""
+        again = "-again" if run.remeasure else ""
+        place = place or self.make_place(f"run-{run.job}-{run.strip}{again}")
         environment = {name: value for name, value in os.environ.items()
                        if name not in ("DISPLAY", "WAYLAND_DISPLAY")}  # No browser for each.
         environment |= {"TINTGATE_ROOT": str((place / "root").resolve()),
@@ -127,7 +135,7 @@ class Room:
         if run.instrument:
             (place / "measure.conf").write_text(run.instrument, encoding="ascii")
             environment["TINTGATE_MEASURE"] = str((place / "measure.conf").resolve())
-        arguments = [f"KEY_KZ_HOST:=:{self.store.resolve()}", f"KEY_KZ_STRIP:=:{run.strip - 1}",
+        arguments = [f"KEY_KZ_HOST:=:{self.store}", f"KEY_KZ_STRIP:=:{run.strip - 1}",
                      f"KEY_KZ_JOBID:=:{run.job}", "KEY_KZ_LANGUAGE:=:en_US", "KEY_KZ_MODE:=:0",
                      f"KEY_KZ_PASSWORD:=:{PASSWORD}", f"KEY_KZ_USER:=:{USER}"]
         if run.remeasure:

@@ -22,6 +22,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "Postgres.h"
 #include "RunProgram.h"
 #include "RunningProgram.h"
 #include "SuiteRoot.h"
@@ -100,9 +101,12 @@ int endOf(pid_t process) {
     return code;
 }
 
+/// A store in a folder, or in a database of the tests' server.
 class MeasuredJobs : public testing::Test {
   protected:
-    MeasuredJobs() {
+    explicit MeasuredJobs(bool onServer = false)
+        : server(onServer ? std::make_unique<support::PostgresRoom>() : nullptr),
+          address(onServer ? "room" : folder.path("store")) {
         store::makeStore(address, "Press room");
         engine = store::openStore(address);
         engine->putUser({"press", hash, false});
@@ -197,13 +201,23 @@ class MeasuredJobs : public testing::Test {
     }
 
     const support::ScratchFolder folder;
-    const std::string address = folder.path("store");
+    const std::unique_ptr<support::PostgresRoom> server;
+    const std::string address;
     std::shared_ptr<store::StoreEngine> engine;
 
   private:
     /// Hashing is slow by intent.
     inline static const std::string hash = store::passwordHash("room");
 };
+
+class MeasuredJobsOfEachStore : public MeasuredJobs, public testing::WithParamInterface<bool> {
+  protected:
+    MeasuredJobsOfEachStore() : MeasuredJobs(GetParam()) {}
+};
+
+INSTANTIATE_TEST_SUITE_P(, MeasuredJobsOfEachStore, testing::Bool(), [](const auto& info) {
+    return std::string(info.param ? "Postgres" : "Sqlite");
+});
 
 TEST_F(MeasuredJobs, EndWithTheCodeOfWhatWentWrong) {
     deliver(1, {"--references", profile});
@@ -279,7 +293,7 @@ TEST_F(MeasuredJobs, EndWithTheCodeOfWhatWentWrong) {
     }
 }
 
-TEST_F(MeasuredJobs, OfTwoStripsAreClosedWhenBothHaveAResult) {
+TEST_P(MeasuredJobsOfEachStore, OfTwoStripsAreClosedWhenBothHaveAResult) {
     constexpr int batch = 10; // Pairs that run at once.
     const int pairs = roundsOr(5);
     deliver(1, {"--references", profile, "--two-strips"});
@@ -321,7 +335,7 @@ TEST_F(MeasuredJobs, OfTwoStripsAreClosedWhenBothHaveAResult) {
     }
 }
 
-TEST_F(MeasuredJobs, GiveTheirResultToTheirParentsJobs) {
+TEST_P(MeasuredJobsOfEachStore, GiveTheirResultToTheirParentsJobs) {
     deliver(1, {"--references", profile, "--parent", "9"});
     deliverAgain(2, 1);
     deliver(3, {"--references", profile});
@@ -336,7 +350,7 @@ TEST_F(MeasuredJobs, GiveTheirResultToTheirParentsJobs) {
     EXPECT_FALSE(isClosed(*ticket(3)));
 }
 
-TEST_F(MeasuredJobs, KilledWhileTheyWriteLeaveAllWholeAndCanBeRunAgain) {
+TEST_P(MeasuredJobsOfEachStore, KilledWhileTheyWriteLeaveAllWholeAndCanBeRunAgain) {
     const int runs = roundsOr(8);
     constexpr int batch = 8;
     deliver(10, {"--references", profile}); // Numbers of two digits, for JDFs of one length.
