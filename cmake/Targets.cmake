@@ -83,8 +83,11 @@ function(tintgate_test target)
   target_link_libraries(${target} PRIVATE ${T_LINKS} GTest::gmock GTest::gtest_main tintgate_options)
   target_compile_definitions(${target} PRIVATE
     TINTGATE_SOURCE_DIR="${PROJECT_SOURCE_DIR}" TINTGATE_BINARY_DIR="${PROJECT_BINARY_DIR}")
-  # Only what is tested is worth optimising: this halves the time that tests take to compile.
-  target_compile_options(${target} PRIVATE -O0)
+  # Only what is tested is worth optimising: this halves the time that tests take to compile. The
+  # headers of the test framework are read once for all (tests/support), which takes options that
+  # agree with those of wx.
+  target_compile_options(${target} PRIVATE -O0 -pthread -D_FILE_OFFSET_BITS=64)
+  target_precompile_headers(${target} REUSE_FROM test_headers)
   add_test(NAME ${target} COMMAND ${target})
   set_tests_properties(${target} PROPERTIES TIMEOUT ${T_TIMEOUT} ENVIRONMENT "${T_ENVIRONMENT}")
 endfunction()

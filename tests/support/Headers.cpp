@@ -1,0 +1,2 @@
+// Nothing but a place for the headers that tests share in precompiled form.
+int main() {}
