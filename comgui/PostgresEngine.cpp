@@ -111,13 +111,10 @@ class PostgresEngine : public StoreEngine {
 
     std::uint64_t commits(std::chrono::milliseconds age) override {
         const auto now = std::chrono::steady_clock::now();
-        // In milliseconds, of which any age can be counted: the clock's own unit is too small.
-        const bool tooOld =
-            std::chrono::duration_cast<std::chrono::milliseconds>(now - m_asked) > age;
         if (m_snapshot.empty() ||
-            (tooOld && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
+            (now - m_asked > age && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
             noteChange();
-        } else if (tooOld) {
+        } else if (now - m_asked > age) {
             m_asked = now;
         }
         return m_commits;

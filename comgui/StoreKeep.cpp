@@ -110,11 +110,8 @@ std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_vie
         const bool again = id == m_fetched.id && type == m_fetched.type && key == m_fetched.key;
         const bool listing = index != overviewKeys && goesOn(id, index);
         // Asked before the store is: what is committed in between makes the next read fetch again.
-        // So for a key that is fetched anyway, any earlier number will do.
         const std::uint64_t commits =
-            m_engine->commits(listing                          ? oldestListed
-                              : again || index != overviewKeys ? std::chrono::milliseconds(0)
-                                                               : std::chrono::milliseconds::max());
+            m_engine->commits(listing ? oldestListed : std::chrono::milliseconds(0));
         if (again && commits == m_fetched.commits) {
             return m_fetched.elements;
         }
