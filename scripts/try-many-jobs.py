@@ -9,16 +9,25 @@ with-postgres.sh gives, whose name there is "tintgate". Of ten jobs, four are st
 three are to be measured, one of two strips, which two runs measure, and two are nested and have a
 parent: one run measures them for all three. Tickets are judged, and watched while the runs go on.
 
-With --stops the PostgreSQL server of with-postgres.sh's FOLDER is stopped as by a crash so many times,
-at random moments. Then each run must end in a documented code within its time, each array of a ticket
-must be whole or not there, and a job whose results were cut off must be complete after a reset and
-another run.
+Each process runs at a place of its own. No two places measure alike, and every other one prints so
+that its jobs fail, but a place measures all its jobs alike. So a ticket tells whether the whole of
+a result comes from the run that it is to come from.
+
+With --stops the PostgreSQL server of with-postgres.sh's FOLDER (that of the command it runs, where
+none is given) is stopped as by a crash so many times, at random moments. Then each run must end in
+a documented code within its time, each array of a ticket and each file must be whole or not there,
+what a run wrote must end where the server went away, and a job whose results were cut off must be
+complete after a reset and another run.
 """
 
 import argparse
 import collections
 import csv
+import dataclasses
+import hashlib
+import itertools
 import json
+import os
 import queue
 import random
 import subprocess
@@ -27,14 +36,25 @@ import threading
 import time
 from pathlib import Path
 
-from demo_jobs import PRINTED, TO_MEASURE, Job, Room, Run
+from demo_jobs import PRINTED, TINTED, TO_MEASURE, Job, Room, Run
 
+# Keys that differ from run to run, or from strip to strip: CMYK is rounded in two ways.
+OF_A_RUN = ("Date", "Time", "Comment", "CMYKValues/")
 PATCHES = 48  # Of the example job.
 TIME_LIMIT = 120  # Seconds that a run may take, whatever becomes of its server.
-MEASURED = PRINTED + "spectra = yes\n"
+ROOTS = {1: "Remote/Measurement", 2: "Remote/Measurement2"}
+VERDICTS = {0: (212, "Verification Failed"), 1: (211, "Verified")}  # By approval.
+# Keys of a strip in the order in which a run writes them, each by a change of its own.
+WRITTEN = ["Status", "Approval", "Comment", "Date", "Time", "SpectralValues/Length", "Numpatches",
+           "SpectralValues/DValues", "XYZValues/XValues", "LabValues/BValues",
+           "CMYKValues/KValues", "Values/Measured", "Values/Approval", "Values/Decimal"]
 KINDS = {"stored": [], "single": TO_MEASURE, "two": [*TO_MEASURE, "--two-strips"],
          "nested": [*TO_MEASURE, "--parent", "100000"]}
 PATTERN = ["stored", "single", "nested", "stored", "two", "single", "stored", "single", "stored"]
+
+
+def strips_of(kind):
+    return (1, 2) if kind == "two" else (1,)
 
 
 def keys_of(room, kind, number):
@@ -45,7 +65,7 @@ def keys_of(room, kind, number):
 
 
 def fill(room, count):
-    """Tickets of so many jobs. Returns the runs that they take, and each job's kind."""
+    """Tickets of so many jobs. Returns the runs that they take, each job's kind and its keys."""
     models = {kind: keys_of(room, kind, 1 + index) for index, kind in enumerate(KINDS)}
     jdf = room.folder / "job.jdf"
     room.administer("file", "get", "/server/temp/job-1.jdf", jdf)
@@ -72,8 +92,7 @@ def fill(room, count):
         for kind in PATTERN:
             if kind != "nested":
                 job = add(kind)
-                runs += [Run(job, kind, strip, instrument=MEASURED)
-                         for strip in ((1, 2) if kind == "two" else (1,))]
+                runs += [Run(job, kind, strip) for strip in strips_of(kind)]
                 continue
             parent = 100000 + number
             tickets.append({"type": 3, "id": parent, "keys": {
@@ -82,24 +101,24 @@ def fill(room, count):
             kinds[parent] = "parent"
             first = add(kind, **{"General/ParentID": {"int": parent}})
             add(kind, **{"General/ParentID": {"int": parent}})
-            runs.append(Run(first, kind, instrument=MEASURED))
+            runs.append(Run(first, kind))
     path = room.folder / "tickets.json"
     path.write_text(json.dumps({"format": "tintgate tickets", "version": 1, "tickets": tickets}),
                     encoding="ascii")
     room.administer("import", path)
     room.administer("file", "put", room.folder / "server", "/server")
-    return runs, kinds
+    return runs, kinds, {ticket["id"]: ticket["keys"] for ticket in tickets}
 
 
 def ask(room, *words):
-    """What tintgate-store answers; asked again while the server is away."""
+    """What tintgate-store answers, as bytes; asked again while the server is away."""
     for _ in range(100):
         done = subprocess.run([room.build / "bin/tintgate-store", "--store", room.store, *words],
-                              capture_output=True, text=True, check=False)
+                              capture_output=True, check=False)
         if done.returncode == 0:
             return done.stdout
         time.sleep(0.3)
-    raise RuntimeError(f"tintgate-store {' '.join(words)}: {done.stderr}")
+    raise RuntimeError(f"tintgate-store {' '.join(words)}: {done.stderr.decode()}")
 
 
 def ticket_of(room, number):
@@ -111,43 +130,65 @@ ARRAYS = {"XYZValues/XValues": PATCHES, "CMYKValues/KValues": PATCHES,
 
 
 def strip_fault(keys, root):
-    """What is wrong with the measurement of a strip; nothing where it is whole, and of one run."""
-    expected = {"Status": {"int": 1}, "Approval": {"int": 1}, "Numpatches": {"int": PATCHES}}
-    for name, value in expected.items():
+    """What is wrong with the measurement of a strip; nothing where it is whole and counted once."""
+    for name, value in {"Status": {"int": 1}, "Numpatches": {"int": PATCHES}}.items():
         if keys.get(f"{root}/{name}") != value:
             return f"{root}/{name} is {keys.get(f'{root}/{name}')}"
     for name, count in ARRAYS.items():
         values = keys.get(f"{root}/{name}", {}).get("double", [])
         if len(values) != count:
             return f"{root}/{name} has {len(values)} values"
-    return None
+    return None if f"{root}/{WRITTEN[-1]}" in keys else f"{root}/{WRITTEN[-1]} is not there"
 
 
 def torn_arrays(keys):
-    return [f"{root}/{name}" for root in ("Remote/Measurement", "Remote/Measurement2")
+    return [f"{root}/{name}" for root in ROOTS.values()
             for name, count in ARRAYS.items()
             if f"{root}/{name}" in keys and len(keys[f"{root}/{name}"]["double"]) != count]
 
 
+def has_gap(keys, root):
+    """Whether something was written behind something that was not."""
+    there = [f"{root}/{name}" in keys for name in WRITTEN]
+    return there != sorted(there, reverse=True)
+
+
+def is_closed(keys):
+    return keys["Job/Display/Status"]["int"] in (211, 212)
+
+
 def fault_of(kind, keys):
-    status = keys["Job/Display/Status"]["int"]
-    if kind == "stored":  # The comparison of stored values changes no ticket.
-        return None if status == 208 and keys["Remote/Measurement/Status"]["int"] == 1 else "changed"
-    if status != 211 or keys.get("Process/InfoMessage") != {"string": "Verified"}:
-        return f"status {status}"
-    return strip_fault(keys, "Remote/Measurement") or (
-        strip_fault(keys, "Remote/Measurement2") if kind == "two" else None)
+    """What is wrong with the ticket of a job that is to be closed."""
+    roots = [ROOTS[strip] for strip in strips_of(kind)]
+    for fault in (strip_fault(keys, root) for root in roots):
+        if fault:
+            return fault
+    # The verdict is that of the strip that came second, and when both come at once, of either.
+    verdicts = [VERDICTS.get(keys.get(f"{root}/Approval", {}).get("int")) for root in roots]
+    if None in verdicts:
+        return "a strip has no verdict"
+    statuses = [keys.get(f"Job/{name}/Status", {}).get("int")
+                for name in ("Display", "Identification")]
+    message = keys.get("Process/InfoMessage", {}).get("string")
+    if (not set(statuses) <= {code for code, _ in verdicts}
+            or message not in [text for _, text in verdicts]
+            or keys.get("Remote/ShowInVerifier") != {"int": 0}):
+        return f"status {statuses}, {message}, for {verdicts}"
+    return None
 
 
-def watch(room, jobs, ended, faults):
-    """A job of two strips must never be closed while a strip has no result."""
+def watch(room, kinds, ended, faults):
+    """A job must never be closed while a strip has no result, and one that is compared never."""
     while not ended.wait(0.5):
-        for job in jobs:
-            keys = ticket_of(room, job)
-            if keys["Job/Display/Status"]["int"] != 208 and not all(
-                    f"{root}/Approval" in keys
-                    for root in ("Remote/Measurement", "Remote/Measurement2")):
-                faults.append(f"job {job} was closed before both strips had a result")
+        for row in json.loads(ask(room, "jobs", "--json")):
+            kind = kinds[row["job"]]
+            if row["displayStatus"] in (211, 212) and (kind == "stored" or any(
+                    row[f"strip{strip}"]["passed"] is None for strip in strips_of(kind))):
+                faults.append(f"{kind} job {row['job']} was closed too early")
+
+
+def hash_of(content):
+    return hashlib.sha256(content).hexdigest()
 
 
 def documented_codes():
@@ -160,20 +201,27 @@ class Workers:
 
     def __init__(self, room, runs, kinds, stopping):
         self.room, self.kinds, self.stopping = room, kinds, stopping
+        self.fresh = hash_of((room.folder / "job.jdf").read_bytes())
+        self.lock = threading.Lock()
+        self.stopping_ended = threading.Event()
+        self.compared = [run for run in runs if kinds[run.job] == "stored"]
+        self.left = collections.Counter(run.job for run in runs)  # Runs to come, by job.
+        self.places = {}  # The one that measured a strip of a job last.
+        self.updated = collections.defaultdict(list)  # JDFs that runs made of a job's, as hashes.
+        self.repeated = set()
         self.waiting = queue.SimpleQueue()
         for run in runs:
             self.waiting.put(run)
         self.documented = documented_codes()
         self.faults, self.codes, self.seconds = [], collections.Counter(), []
 
-    def work(self, place):
-        while True:
-            try:
-                run = self.waiting.get_nowait()
-            except queue.Empty:
-                return
+    def work(self, number):
+        place = self.room.make_place(f"place-{number}")
+        instrument = (TINTED if number % 2 else PRINTED) + f"spectra = yes\nseed = {number}\n"
+        while run := self.next_run():
             start = time.monotonic()
-            process, _ = self.room.start(run, place)
+            process, folder = self.room.start(dataclasses.replace(run, instrument=instrument),
+                                              place)
             try:
                 code = process.wait(TIME_LIMIT)
             except subprocess.TimeoutExpired:
@@ -183,15 +231,39 @@ class Workers:
             self.codes[code] += 1
             if code not in self.documented or (code != 0 and not self.stopping):
                 self.faults.append(f"job {run.job}, strip {run.strip}: exit code {code}")
+            self.note(run, number, folder / f"job-{run.job}.jdf")
             if self.stopping:
                 self.look_after(run, code)
+
+    def next_run(self):
+        """None when all is done. While the server is still to be stopped, a run is always at work:
+        a comparison can be repeated at will."""
+        try:
+            return self.waiting.get_nowait()
+        except queue.Empty:
+            at_work = self.stopping and not self.stopping_ended.is_set()
+            return random.choice(self.compared) if at_work else None
+
+    def note(self, run, number, jdf):
+        with self.lock:
+            self.left[run.job] -= 1
+            is_last = self.left[run.job] == 0
+            self.places[run.job, run.strip] = number
+            if self.kinds[run.job] != "stored" and jdf.is_file():
+                self.updated[run.job].append(hash_of(jdf.read_bytes()))
+        if (is_last and not self.stopping and self.kinds[run.job] != "stored"
+                and not is_closed(ticket_of(self.room, run.job))):
+            self.faults.append(f"job {run.job} was not closed by its last run")
 
     def look_after(self, run, code):
         """What an operator does after a server's crash: has cut-off jobs measured again."""
         keys = ticket_of(self.room, run.job)
         self.faults += [f"job {run.job}: {name} is torn" for name in torn_arrays(keys)]
         kind = self.kinds[run.job]
-        root = "Remote/Measurement" if run.strip == 1 else "Remote/Measurement2"
+        root = ROOTS[run.strip]
+        if (kind != "stored" and (run.job, run.strip) not in self.repeated
+                and has_gap(keys, root)):
+            self.faults.append(f"job {run.job}: {root} was written on after a loss")
         if kind == "stored":
             again = code != 0
         elif kind == "nested":
@@ -200,28 +272,75 @@ class Workers:
             if again:
                 ask(self.room, "reset", str(run.job), "--family")
         else:
-            closed = keys["Job/Display/Status"]["int"] == 211
-            other = strip_fault(keys, "Remote/Measurement2" if run.strip == 1 else
-                                "Remote/Measurement") if kind == "two" else None
-            again = strip_fault(keys, root) is not None or (not closed and other is None)
+            other = strip_fault(keys, ROOTS[3 - run.strip]) if kind == "two" else None
+            again = strip_fault(keys, root) is not None or (not is_closed(keys) and other is None)
             if again:
                 ask(self.room, "reset", str(run.job), "--strip", str(run.strip))
         if again:
+            self.repeated.add((run.job, run.strip))
             self.waiting.put(run)
 
+    def judge(self, delivered):
+        """All tickets and JDFs, now that nothing runs any more."""
+        results = {}  # By place.
+        for job, kind in self.kinds.items():
+            keys = ticket_of(self.room, job)
+            if kind == "stored":  # The comparison of stored values changes no ticket.
+                fault = None if keys == delivered[job] else "was changed"
+            else:
+                fault = fault_of(kind, keys) or self.origin_fault(job, kind, keys, results)
+            fault = fault or (None if kind == "parent" else self.jdf_fault(job, kind))
+            if fault:
+                self.faults.append(f"{kind} job {job}: {fault}")
+        for one, other in itertools.combinations(results, 2):
+            if results[one] == results[other]:
+                self.faults.append(f"places {one} and {other} measure alike")
 
-def stop_servers(server, count, ended):
-    """Lets the server crash now and then. Returns when it has, or when the runs have ended."""
+    def origin_fault(self, job, kind, keys, results):
+        """Whether a result is all that the place measures that it is from."""
+        measured = job - 100000 + 1 if kind == "parent" else job
+        if (measured, 1) not in self.places:
+            measured -= 1  # The second of two nested jobs.
+        for strip in strips_of(kind):
+            root = ROOTS[strip] + "/"
+            result = {key.removeprefix(root): value for key, value in keys.items()
+                      if key.startswith(root) and not key.removeprefix(root).startswith(OF_A_RUN)}
+            place = self.places[measured, strip]
+            if results.setdefault(place, result) != result:
+                return f"strip {strip} is not all from place {place}"
+        return None
+
+    def jdf_fault(self, job, kind):
+        path = f"/server/temp/job-{job}.jdf"
+        versions = json.loads(ask(self.room, "file", "versions", path, "--json"))
+        kept = [hash_of(ask(self.room, "file", "get", path, "-", "--version", str(row["version"])))
+                for row in versions[:-1]]
+        kept.append(hash_of(ask(self.room, "file", "get", path, "-")))
+        made = [self.fresh, *self.updated[job]]
+        if kind == "nested" and self.updated[job]:
+            # A run updates it for each of its three jobs, and only the last is left at the place.
+            return None if kept[0] == self.fresh and (self.stopping or (
+                len(kept) == 4 and kept[-1] == made[-1])) else f"{len(kept)} versions of the JDF"
+        if self.stopping:
+            return None if set(kept) <= set(made) else "a JDF is not what a run made"
+        return None if sorted(kept) == sorted(made) else "a JDF was lost or delivered twice"
+
+
+def stop_server(server, count, all_work):
+    """Lets the server crash so many times."""
     script = [Path(__file__).with_name("with-postgres.sh")]
-    for _ in range(count):
-        if ended.wait(random.uniform(0.5, 4)):
-            return
-        subprocess.run([*script, "stop", server, "immediate"], check=True)
-        time.sleep(random.uniform(0, 1))
-        subprocess.run([*script, "again", server], check=True)
+    try:
+        for _ in range(count):
+            time.sleep(random.uniform(0.5, 4))
+            subprocess.run([*script, "stop", server, "immediate"], check=True)
+            time.sleep(random.uniform(0, 1))
+            subprocess.run([*script, "again", server], check=True)
+    except subprocess.CalledProcessError as failure:
+        all_work.faults.append(f"the server can't be stopped and started: {failure}")
+    all_work.stopping_ended.set()
 
 
-def main():
+def parse_arguments():
     parser = argparse.ArgumentParser(description=__doc__,
                                      formatter_class=argparse.RawDescriptionHelpFormatter)
     parser.add_argument("build", type=Path)
@@ -230,34 +349,33 @@ def main():
     parser.add_argument("--jobs", type=int, default=400)
     parser.add_argument("--processes", type=int, default=8)
     parser.add_argument("--stops", type=int, default=0)
-    parser.add_argument("--server")
-    arguments = parser.parse_args()
+    parser.add_argument("--server", default=os.path.dirname(os.environ.get("PGSERVICEFILE", "")))
+    return parser.parse_args()
 
+
+def main():
+    arguments = parse_arguments()
     room = Room(arguments.build, arguments.folder, arguments.store)
-    runs, kinds = fill(room, arguments.jobs)
+    runs, kinds, delivered = fill(room, arguments.jobs)
     all_work = Workers(room, runs, kinds, arguments.stops > 0)
     ended = threading.Event()
-    two_strips = [job for job, kind in kinds.items() if kind == "two"][:8]
-    besides = [threading.Thread(target=watch, args=(room, two_strips, ended, all_work.faults))]
     if arguments.stops:
-        besides.append(threading.Thread(target=stop_servers,
-                                        args=(arguments.server, arguments.stops, ended)))
-    workers = [threading.Thread(target=all_work.work, args=(room.make_place(f"place-{i}"),))
-               for i in range(arguments.processes)]
+        beside = threading.Thread(target=stop_server,
+                                  args=(arguments.server, arguments.stops, all_work))
+    else:
+        beside = threading.Thread(target=watch, args=(room, kinds, ended, all_work.faults))
+    workers = [threading.Thread(target=all_work.work, args=(number,))
+               for number in range(1, arguments.processes + 1)]
     start = time.monotonic()
-    for thread in (*besides, *workers):
+    for thread in (beside, *workers):
         thread.start()
     for worker in workers:
         worker.join()
     seconds = time.monotonic() - start
     ended.set()
-    for thread in besides:
-        thread.join()
+    beside.join()
 
-    for job, kind in kinds.items():
-        fault = fault_of(kind, ticket_of(room, job))
-        if fault:
-            all_work.faults.append(f"{kind} job {job}: {fault}")
+    all_work.judge(delivered)
     print(f"{len(kinds)} jobs, {len(all_work.seconds)} runs by {arguments.processes} processes in "
           f"{seconds:.0f} s, the longest {max(all_work.seconds):.1f} s")
     print("exit codes: " + ", ".join(f"{code} {times} times" for code, times in
