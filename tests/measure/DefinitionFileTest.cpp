@@ -1,6 +1,8 @@
-// Definitions to the byte. "|" stands for the end of a line in what is expected.
+// Definitions to the byte. "|" stands for the end of a line: "\r\n" in what is expected.
 #include <filesystem>
+#include <set>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include <gtest/gtest.h>
@@ -12,11 +14,10 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// With "\r\n" for each "|".
-std::string lines(const std::string& text) {
+std::string lines(const std::string& text, const std::string& end = "\r\n") {
     std::string ended;
     for (const char character : text) {
-        ended += character == '|' ? "\r\n" : std::string(1, character);
+        ended += character == '|' ? end : std::string(1, character);
     }
     return ended;
 }
@@ -73,24 +74,13 @@ TEST_F(DefinitionFile, TakesTheRowsOfAFixedStrip) {
     m_job.secondStrip = 1;
     m_job.useDynstrip = 1; // Of the first strip alone.
     m_job.deviceID = 21;
-    const std::string body = "ORIGINATOR \"me\"\t\n"
-                             "KEYWORD \"DEVICE\"\n"
-                             "DEVICE 21 \t\n"
-                             "NUMBER_OF_FIELDS 11\n"
-                             "NUMBER_OF_STRIPS 3\n"
-                             "BORDER_PATCHES 1\n"
-                             "VERTICAL_MEAS 0\n"
-                             "NUMBER_OF_SETS 100\n"
-                             "BEGIN_DATA_FORMAT\n" +
-                             cmykFields +
-                             "\n"
-                             "END_DATA_FORMAT\n"
-                             "\n"
-                             "BEGIN_DATA\n"
-                             "1\t0\t0\t0\t0\n"
-                             "2\t\xc3\xa4\t0\n" // One byte too long, so that it loses its end.
-                             "END_DATA\n"
-                             "behind\t\n";
+    // The second row has one byte too many, so that it loses its end.
+    const std::string body = lines(
+        "ORIGINATOR \"me\"\t|KEYWORD \"DEVICE\"|DEVICE 21 \t|NUMBER_OF_FIELDS 11|"
+        "NUMBER_OF_STRIPS 3|BORDER_PATCHES 1|VERTICAL_MEAS 0|NUMBER_OF_SETS 100|"
+        "BEGIN_DATA_FORMAT|" +
+            cmykFields + "|END_DATA_FORMAT||BEGIN_DATA|1\t0\t0\t0\t0|2\tä\t0|END_DATA|behind\t|",
+        "\n");
     const auto definition = [](const std::string& size) {
         return head + "NUMBER_OF_FIELDS 11|BEGIN_DATA_FORMAT|" + cmykFields +
                "|END_DATA_FORMAT|KEYWORD\tDEVICE|DEVICE 21 |"
@@ -111,25 +101,14 @@ TEST_F(DefinitionFile, TellsEachInstrumentWhatItNeeds) {
                              "KEYWORD MEASURINGTYPE|MEASURINGTYPE 2|";
     const std::string aperture = "KEYWORD APERTURESIZE|APERTURESIZE ";
     const std::string zebra = "KEYWORD ZEBRA_RULER_MODE|ZEBRA_RULER_MODE 1|";
+    const std::pair<std::string, std::set<int>> needs[] = {
+        {mode + aperture + "6|", {33}},
+        {mode + aperture + "2|", {28, 29, 31, 32, 43}},
+        {zebra, {21, 22, 48, 49, 50}}};
     for (int device = -1; device <= 60; ++device) {
         std::string wanted;
-        switch (device) {
-        case 33:
-            wanted = mode + aperture + "6|";
-            break;
-        case 28:
-        case 29:
-        case 31:
-        case 32:
-        case 43:
-            wanted = mode + aperture + "2|";
-            break;
-        case 21:
-        case 22:
-        case 48:
-        case 49:
-        case 50:
-            wanted = zebra;
+        for (const auto& [lines, devices] : needs) {
+            wanted += devices.contains(device) ? lines : "";
         }
         m_job.deviceID = device;
         expect("NUMBER_OF_COLS", head + "END_DATA_FORMAT|DEVICE " + std::to_string(device) + "|" +
@@ -253,18 +232,12 @@ TEST_F(DefinitionFile, GivesSomeInstrumentsAHeadOfItsOwn) {
 
 TEST_F(DefinitionFile, ReadsWhatThereIsAndWritesUtf8) {
     const std::string size = "KEYWORD NUMBER_OF_COLS|NUMBER_OF_COLS 1|";
-    const std::string euro = noDevice +
-                             "KEYWORD BORDER_PATCHES|"
-                             "\xe2\x82\xac BORDER_PATCHES|" +
-                             size;
-    expect("\xef\xbb\xbf\xe2\x82\xac BORDER_PATCHES 1\rNUMBER_OF_COLS 1\r", euro); // By two bytes.
-    std::string utf16 = "\xff\xfe\xac\x20";
-    for (const char character : std::string(" BORDER_PATCHES 1\r\nNUMBER_OF_COLS 1\r\n")) {
-        utf16 += {character, '\0'};
-    }
-    expect(utf16, euro);
+    const std::string euro = noDevice + "KEYWORD BORDER_PATCHES|€ BORDER_PATCHES|" + size;
+    expect("\xef\xbb\xbf€ BORDER_PATCHES 1\rNUMBER_OF_COLS 1\r", euro); // Short by two bytes.
+    const std::u16string utf16 = u"\ufeff€ BORDER_PATCHES 1\r\nNUMBER_OF_COLS 1\r\n";
+    expect({reinterpret_cast<const char*>(utf16.data()), 2 * utf16.size()}, euro);
     expect("\xe4 BORDER_PATCHES\nNUMBER_OF_COLS 1",
-           noDevice + "KEYWORD BORDER_PATCHES|\xc3\xa4 BORDER_PATCHE|" + size);
+           noDevice + "KEYWORD BORDER_PATCHES|ä BORDER_PATCHE|" + size);
 }
 
 TEST_F(DefinitionFile, StandsBesideItsStrip) {
@@ -277,12 +250,9 @@ TEST_F(DefinitionFile, StandsBesideItsStrip) {
                 .ToStdWstring());
     };
     // Without a folder, and in one whose name is not valid UTF-8.
-    const std::string folder = m_folder.makeFolder("J\xf6"
-                                                   "b.d");
+    const std::string folder = m_folder.makeFolder("J\xf6rg.d");
     fs::current_path(folder);
-    m_folder.write("J\xf6"
-                   "b.d/strip",
-                   strip);
+    m_folder.write("J\xf6rg.d/strip", strip);
     EXPECT_EQ(define("strip"), "NMPatchSetDefinition.it8");
     EXPECT_EQ(support::contentsOf("NMPatchSetDefinition.it8"), expected);
     fs::remove("NMPatchSetDefinition.it8");

@@ -56,8 +56,7 @@ class SampleFile : public testing::Test {
 
     const support::ScratchFolder m_folder;
     const std::string m_sample = m_folder.path("sample");
-    const std::string m_reference = m_folder.path("J\xf6"
-                                                  "b"); // Not valid UTF-8.
+    const std::string m_reference = m_folder.path("J\xf6rg"); // Not valid UTF-8.
     KZJobDataStruct m_job;
 };
 
@@ -66,15 +65,14 @@ TEST_F(SampleFile, GivesTheFirstRowFewerDigits) {
     samples.record.lab = samples.lab.data();
     samples.record.xyz = samples.xyz.data();
     samples.addSpectra(380, 10, 2);
+    const auto put = [](double* place, std::initializer_list<double> values) {
+        std::copy(values.begin(), values.end(), place);
+    };
     for (std::size_t i = 0; i < 3; ++i) {
-        const double cmyk[] = {12.3456789, 100, 0, -0.0};
-        std::memcpy(&samples.cmyk[4 * i], cmyk, sizeof cmyk);
-        const double lab[] = {95.123456789, -0.00001234567, 1234567.8};
-        std::memcpy(&samples.lab[3 * i], lab, sizeof lab);
-        const double xyz[] = {84.123456789, 1e-7, infinity};
-        std::memcpy(&samples.xyz[3 * i], xyz, sizeof xyz);
-        samples.spectra[i].values[0] = 0.0123456789012;
-        samples.spectra[i].values[1] = 1;
+        put(&samples.cmyk[4 * i], {12.3456789, 100., 0., -0.0});
+        put(&samples.lab[3 * i], {95.123456789, -0.00001234567, 1234567.8});
+        put(&samples.xyz[3 * i], {84.123456789, 1e-7, infinity});
+        put(samples.spectra[i].values, {0.0123456789012, 1.});
     }
     const std::string rest = "\t84.12346\t1e-07\tinf\t0.012345679\t1\n";
     const std::string later = "12.345679\t100\t0\t-0\t95.123457\t-1.234567e-05\t1234567.8" + rest;
@@ -92,9 +90,7 @@ TEST_F(SampleFile, HasTheColumnsThatAreThere) {
     const struct {
         bool lab, xyz;
         int base, stepsize, length;
-        const char* fields;
-        const char* names;
-        const char* secondRow;
+        const char *fields, *names, *secondRow;
     } cases[] = {
         {false, false, 0, 0, none, "5", "", "1.23457"},
         {true, false, 0, 0, none, "8", "\tLAB_L\tLAB_A\tLAB_B", "1.23457"},
@@ -195,9 +191,7 @@ TEST_F(SampleFile, WritesNumbersAsAStreamDoes) {
 
 TEST_F(SampleFile, ReplacesOneFileOrTheOther) {
     m_folder.write("sample", "old sample");
-    m_folder.write("J\xf6"
-                   "b",
-                   std::string(1000, 'x'));
+    m_folder.write("J\xf6rg", std::string(1000, 'x'));
     EXPECT_EQ(write(Samples(0), true), -1) << "a null array of device values";
     EXPECT_EQ(support::contentsOf(m_reference), "");
 
