@@ -171,7 +171,7 @@ std::string valueOf(const char* variable) {
     return value == nullptr ? std::string() : std::string(value);
 }
 
-/// The XDG base directory specification: a path that is not absolute does not count.
+/// As XDG has it: a folder whose path is not absolute does not count.
 std::string configurationFolder() {
     const std::string folder = valueOf("XDG_CONFIG_HOME");
     return folder.starts_with('/') ? folder : valueOf("HOME") + "/.config";
