@@ -3,8 +3,9 @@
 
 embed.py FOLDER CHART_JS OUTPUT
 
-A page names what it is made of in double braces: {{style}}, {{script NAME}} and {{policy}} are
-filled in here, and {{data}} is where the program puts data in, which cuts the page in pieces.
+A page names what it is made of in double braces: {{part NAME}}, {{style NAME}}, {{script NAME}}
+and {{policy}} are filled in here, and {{data}} is where the program puts data in, which cuts the
+page in pieces.
 The policy lets nothing run or style but what stands in the page now, by its hash.
 """
 
@@ -47,6 +48,7 @@ def assemble(folder, name, chart):
         return f"<script>{text}</script>"
 
     page = (folder / name).read_text()
+    page = re.sub(r"\{\{part (\S+)\}\}\n", lambda match: (folder / match[1]).read_text(), page)
     page = re.sub(r"\{\{style (\S+)\}\}", style, page)
     page = re.sub(r"\{\{script (\S+)\}\}", script, page)
     return page.replace("{{policy}}", policy(scripts, styles)).split("{{data}}")
