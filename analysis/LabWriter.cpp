@@ -12,20 +12,6 @@
 namespace analysis {
 namespace {
 
-/// Of a set only what the new file takes from it: ids, names and device values.
-colour::DataSet chartOf(colour::DataSet set) {
-    colour::DataSet chart;
-    chart.patchCount = set.patchCount;
-    chart.ids = std::move(set.ids);
-    chart.names = std::move(set.names);
-    chart.deviceSpace = set.deviceSpace;
-    chart.channels = std::move(set.channels);
-    chart.device = std::move(set.device);
-    chart.originator = "Tintgate";
-    chart.conditions = {.illuminant = "D50", .observer = "2", .measurement = {}};
-    return chart;
-}
-
 /// Six decimals: more than a profile's floating road can mean, and short enough to read.
 double sixDecimals(double value) {
     return std::round(value * 1e6) / 1e6;
@@ -42,7 +28,9 @@ int writeLab(const std::string& reference, const std::string& profile, const std
         return exitPatchSetNotText;
     if (!file.set->hasCmyk())
         return exitNoDeviceValues;
-    colour::DataSet chart = chartOf(std::move(*file.set));
+    colour::DataSet chart = colour::chartOf(std::move(*file.set));
+    chart.originator = "Tintgate";
+    chart.conditions = {.illuminant = "D50", .observer = "2", .measurement = {}};
 
     colour::ColourFile profileFile;
     if (const int status = statusOf(colour::loadColourFile(profile, wants, profileFile)))

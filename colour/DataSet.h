@@ -73,4 +73,7 @@ struct DataSet {
     bool hasCmyk() const { return deviceSpace == DeviceSpace::Cmyk; }
 };
 
+/// Of a set only what tells its patches apart: ids, names and device values.
+DataSet chartOf(DataSet set);
+
 } // namespace colour

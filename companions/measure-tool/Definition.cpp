@@ -201,18 +201,6 @@ std::string textOf(const Lines& lines, const std::string& original) {
     return text;
 }
 
-/// Only what tells the patches apart.
-colour::DataSet chartOf(colour::DataSet set) {
-    colour::DataSet chart;
-    chart.patchCount = set.patchCount;
-    chart.ids = std::move(set.ids);
-    chart.names = std::move(set.names);
-    chart.deviceSpace = set.deviceSpace;
-    chart.channels = std::move(set.channels);
-    chart.device = std::move(set.device);
-    return chart;
-}
-
 void addPaper(colour::DataSet& chart, const Lines& numbers) {
     const double white = chart.deviceSpace == colour::DeviceSpace::Rgb ? 100 : 0;
     for (const std::string& number : numbers) {
@@ -239,7 +227,7 @@ colour::DataSet readDefinition(const std::string& path) {
     if (failure == colour::Failure::NoColourValues && numbers.empty())
         failure = colour::readCgats(bytes, wants, set);
     expectUsable(failure, Status::BadDefinition, path);
-    colour::DataSet chart = chartOf(std::move(set));
+    colour::DataSet chart = colour::chartOf(std::move(set));
     addPaper(chart, numbers);
     return chart;
 }

@@ -20,7 +20,7 @@ struct Settings {
 
     // The virtual instrument.
     std::string profile;    ///< Of the printing condition.
-    double error = 0;       ///< Mean CIELAB difference (CIE76) that the random part makes.
+    double error = 0;       ///< Mean CIELAB difference (CIE76) that the random error makes.
     colour::Lab bias;       ///< What every patch is off by.
     std::uint64_t seed = 1; ///< The same seed gives the same errors.
     bool spectra = false;   ///< Whether spectra are measured too.
