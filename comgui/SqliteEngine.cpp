@@ -416,7 +416,9 @@ void makeSystemTicket(Database& database, const std::string& serverName) {
 /// For what that database holds, see makeSqlite.
 bool isFree(const std::string& folder) {
     namespace fs = std::filesystem;
-    const std::set<std::string> begun = {"files", "tickets.db", "tickets.db-wal", "tickets.db-shm"};
+    // The journal is there while the log is being turned on.
+    const std::set<std::string> begun = {"files", "tickets.db", "tickets.db-journal",
+                                         "tickets.db-wal", "tickets.db-shm"};
     std::error_code failure;
     for (const auto& entry : fs::directory_iterator(folder, failure)) {
         if (begun.count(entry.path().filename()) == 0) {
