@@ -206,6 +206,9 @@ TEST_F(FolderStore, OpensOnlyFoldersWithAStore) {
     EXPECT_EQ(faultOf([&] { store::openStore(folder.path("other")); }), Fault::Missing);
     folder.write("other/tickets.db", std::string(5000, 'x'));
     EXPECT_EQ(faultOf([&] { store::openStore(folder.path("other")); }), Fault::Damaged);
+    folder.makeFolder("begun/files"); // By a making that was killed as it turned the log on.
+    folder.write("begun/tickets.db-journal", "");
+    EXPECT_NO_THROW(store::makeStore(folder.path("begun"), "press"));
 }
 
 TEST_P(StoreEngine, OpensOnlyStoresOfItsFormat) {
