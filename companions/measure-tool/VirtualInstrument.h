@@ -11,8 +11,9 @@
 
 namespace measuring {
 
-/// A print without any error is what the profile says, absolute colorimetric; then each patch is
-/// off by the bias and by a random error, which only the seed and the patch's row decide.
+/// Prints what the profile says, absolute colorimetric, and adds Settings::bias and an error to each
+/// patch. Errors follow a fixed sequence, a row after the other, so that equal settings measure
+/// equal values.
 class VirtualInstrument : public Instrument {
   public:
     /// `name` is that of the instrument that it stands for; may be empty. The chart outlives it.
@@ -30,7 +31,7 @@ class VirtualInstrument : public Instrument {
     const colour::DataSet& m_chart;
     const std::string m_path; ///< Of the profile.
     const std::string m_name;
-    const double m_deviation; ///< Of the random error, for each of L*, a* and b*.
+    const double m_deviation; ///< Of an error, for each of L*, a* and b*.
     const colour::Lab m_bias;
     const bool m_spectra;
     colour::Profile m_profile;
