@@ -16,25 +16,15 @@ class Element : public testing::Test {
   protected:
     Element() {
         std::fill_n(spectral[0].values, 36, 0.5);
-        spectral[1].length = 99; // not looked at
         record.numPatches = 2;
         record.hasSpectral = 1;
         record.xyz = xyz;
         record.cmyk = cmyk;
         record.spectral = spectral;
-        std::strcpy(header.measureDate, "2024-05-31");
-        std::strcpy(header.measureTime, "13:37:00");
-        std::strcpy(header.deltaEType, "CIELAB");
-        std::strcpy(header.cmmVersion, "1.1.2.3");
-        header.approval = header.paperWhitePass = header.writePatchDefinitions = true;
-        header.maxTolerance = 5;
-        header.maxDeltaE = 3.1234567;
-        header.averageTolerance = -0.0000019;
-        header.averageDeltaE = 1.0000009;
     }
 
     /// What is written into `abc`, behind its first byte.
-    std::string written(const wxString& comment = "Proof 100%s", long capacity = 10'000) {
+    std::string written(long capacity = 10'000, const wxString& comment = "Proof 100%s") {
         std::string buffer = "abc" + std::string(10'000, '.');
         long length = 3;
         code = WriteJDFMeasureData(buffer.data() + 1, buffer.data(), buffer.data() + capacity,
@@ -44,9 +34,19 @@ class Element : public testing::Test {
 
     double xyz[6] = {1.239, 20.0, -0.019, 95.05, 100.0, 1e30};
     double cmyk[8] = {255, 0, 1.274, 1.276, -2.55, 127.5, 254.9, 1e30};
-    spectralRow spectral[2] = {{}, {{-0.0000125, 1e9, NAN}, 400, 20, 0}};
+    spectralRow spectral[2] = {{{}, 0, 0, 99}, {{-0.0000125, 1e9, NAN}, 400, 20, 0}};
     measurementDataRecord record;
-    JDFMeasurementHeader header;
+    JDFMeasurementHeader header{.measureDate = "2024-05-31",
+                                .measureTime = "13:37:00",
+                                .deltaEType = "CIELAB",
+                                .cmmVersion = "1.1.2.3",
+                                .approval = true,
+                                .paperWhitePass = true,
+                                .maxTolerance = 5,
+                                .maxDeltaE = 3.1234567,
+                                .averageTolerance = -0.0000019,
+                                .averageDeltaE = 1.0000009,
+                                .writePatchDefinitions = true};
     int code = 1;
 };
 
@@ -55,12 +55,10 @@ TEST_F(Element, IsThatOfItsStrip) {
         support::contentsOf(TINTGATE_SOURCE_DIR "/tests/data/jdf/measurement.txt");
     EXPECT_EQ(written(), "a" + first + "bc");
     EXPECT_EQ(code, 0);
-
-    header.secondStrip = 1;
     std::string second = first;
     second.insert(second.rfind('>'), "2").insert(second.find(' '), "2");
+    header.secondStrip = 1;
     EXPECT_EQ(written(), "a" + second + "bc");
-
     header.secondStrip = 2; // no strip, and so no tags of its own
     const auto inside = first.find("Approval");
     EXPECT_EQ(written(), "a" + first.substr(inside, first.rfind("</") - inside) + "bc");
@@ -72,14 +70,12 @@ TEST_F(Element, LeavesOutWhatIsNotThereAndCutsWhatIsTooLong) {
     std::memset(header.cmmVersion, '9', sizeof header.cmmVersion);
     std::memset(header.profileName, 'p', sizeof header.profileName);
     header.measureDate[0] = '\0'; // the time alone is enough
-    const std::string text = written(wxString('c', 181));
-    const std::string parts[] = {
-        "Date=\"\" Time=\"13:37:00\" Comment=\"" + std::string(180, 'c') + "\"",
-        "cid:" + std::string(180, 'p') + "\"",
-        "CMMVersion=\"9999999999999999\" MaxTol",
-        "Name\"/>\n</tazo:Measurement>\nbc",
-    };
-    for (const std::string& part : parts) {
+    const std::string text = written(10'000, wxString('c', 181));
+    for (const std::string& part :
+         {"Date=\"\" Time=\"13:37:00\" Comment=\"" + std::string(180, 'c') + "\"",
+          "cid:" + std::string(180, 'p') + "\"",
+          std::string("CMMVersion=\"9999999999999999\" MaxTol"),
+          std::string("Name\"/>\n</tazo:Measurement>\nbc")}) {
         EXPECT_NE(text.find(part), std::string::npos) << part;
     }
     header.measureTime[0] = '\0'; // now
@@ -89,23 +85,19 @@ TEST_F(Element, LeavesOutWhatIsNotThereAndCutsWhatIsTooLong) {
 TEST_F(Element, CountsEachPieceAgainstTheLimit) {
     const std::string whole = written();
     const auto size = static_cast<long>(whole.size());
-    EXPECT_EQ(written("Proof 100%s", size + 1), whole);
-
+    EXPECT_EQ(written(size + 1), whole);
     // One byte less: the closing tag has no room.
-    EXPECT_EQ(written("Proof 100%s", size), whole.substr(0, whole.find("</tazo:M")) + "bc");
+    EXPECT_EQ(written(size), whole.substr(0, whole.find("</tazo:M")) + "bc");
     EXPECT_EQ(code, -30);
-
     // Of the last spectrum the last piece has no room; those of more than 200 bytes before it stay.
-    const std::string cut = written("Proof 100%s", size - 20);
+    const std::string cut = written(size - 20);
     EXPECT_EQ(cut, whole.substr(0, cut.size() - 2) + "bc");
-    EXPECT_GT(cut.size() - 2 - cut.rfind("<tazo:SpectralData1"), 400U);
-    EXPECT_EQ(code, -30);
-
+    EXPECT_GT(cut.size() - 2, whole.find("<tazo:SpectralData1") + 400);
     // Up to FileSpec a piece is tried though those before it had no room.
     const auto third = whole.find("Spectral");
     const std::string some = whole.substr(0, whole.find("Approval")) +
                              whole.substr(third, whole.find("<FileSpec") - third) + "bc";
-    EXPECT_EQ(written("Proof 100%s", static_cast<long>(some.size()) + 1), some);
+    EXPECT_EQ(written(static_cast<long>(some.size()) + 1), some);
     EXPECT_EQ(code, -30);
 }
 
