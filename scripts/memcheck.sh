@@ -4,7 +4,7 @@
 set -eu
 cd "$(dirname "$0")/.."
 
-for test in ticket_test ticket_update_test TicketEngineTest; do
+for test in ticket_test TicketEngineTest; do
   echo "memcheck: $test"
   # Thousands of random edits take minutes under valgrind and reach no code that the others miss.
   valgrind --quiet --error-exitcode=1 --leak-check=full --show-leak-kinds=definite,indirect,possible \

@@ -2,13 +2,10 @@
 
 #include <gtest/gtest.h>
 
-#include "RealTickets.h"
-#include "TicketText.h"
-#include "UpdateLog.h"
+#include "Server.h"
 
 namespace {
 
-constexpr int jobs = 3;
 constexpr int id = 12;
 
 class UpdateList : public testing::Test {

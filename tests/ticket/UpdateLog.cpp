@@ -1,12 +1,18 @@
 // The sink of this test program: it listens.
-#include "UpdateLog.h"
+#include "ticket/TicketUpdateLog.h"
 
 #include <cstdarg>
 #include <cstdio>
+#include <string>
+#include <utility>
 
-#include "ticket/TicketUpdateLog.h"
+#include "Server.h"
 
-std::string updateLog;
+namespace {
+
+std::string written;
+
+} // namespace
 
 clTICKET_UPDATE_LOG::clTICKET_UPDATE_LOG(const char*) {}
 
@@ -16,13 +22,11 @@ void clTICKET_UPDATE_LOG::printf(const char* format, ...) {
     va_start(arguments, format);
     std::vsnprintf(text, sizeof text, format, arguments);
     va_end(arguments);
-    updateLog += text;
+    written += text;
 }
 
 void clTICKET_UPDATE_LOG::close() {}
 
 std::string takeUpdateLog() {
-    std::string text;
-    text.swap(updateLog);
-    return text;
+    return std::exchange(written, "");
 }
