@@ -5,31 +5,24 @@
 #include <gtest/gtest.h>
 
 using namespace std::string_literals;
-
-namespace {
-
 namespace utils = StringUtilsComGUI;
 
 TEST(StringUtilsComGUI, NarrowsAndWidensWithoutConversion) {
     EXPECT_EQ(utils::stringFromwstring(L"a\u0141\u00FF\0b"s), "aA\xFF\0b"s);
-    const std::wstring wide = utils::wstringFromstring("a\0\xFF"s);
-    ASSERT_EQ(wide.size(), 3U);
-    EXPECT_EQ(static_cast<unsigned>(wide[2]), 0xFFFFFFFFU);
+    EXPECT_EQ(utils::wstringFromstring("a\0\xFF"s), (L"a\0"s + wchar_t(0xFFFFFFFF)));
 }
 
 TEST(StringUtilsComGUI, ConvertsWideTextToUtf8) {
     const std::pair<std::wstring, std::string> cases[] = {
         {L"aä€", "aä€"},           {{0xD83D, 0xDE00}, "\U0001F600"}, // a pair is one character,
         {L"\U0001F600", "\uF600"}, // and one that needs a pair is cut to 16 bits
-        {L"a\0b"s, "a"},           {L"a\U00010000b", "a"}, // cut to zero
-        {{L'a', 0xD83D}, "old"},
+        {L"a\U00010000b", "a"},    {{L'a', 0xD83D}, "old"},
     };
     for (const auto& [text, expected] : cases) {
         std::string target = "old";
         EXPECT_EQ(utils::UnicodeToUTF8(text, target), expected == "old" ? 0 : expected.size());
         EXPECT_EQ(target, expected);
     }
-    EXPECT_EQ(utils::UTF8FromUni({0xDE00, 0xD83D}), "");
 }
 
 TEST(StringUtilsComGUI, ConvertsUtf8ToAsManyCharactersAsBytes) {
@@ -37,14 +30,12 @@ TEST(StringUtilsComGUI, ConvertsUtf8ToAsManyCharactersAsBytes) {
         {"aäb", L"aäb\0"s},           {"\U0001F600", {0xD83D, 0xDE00, 0, 0}},
         {"a\0b"s, L"a\0\0"s},         {"\xED\xA0\x80", L"old"}, // a surrogate
         {"\xF4\x90\x80\x80", L"old"}, {"\xC0\x80", L"old"},
-        {"\xE0\x9F\xBF", L"old"},     {"a\xC3", L"old"},
     };
     for (const auto& [text, expected] : cases) {
         std::wstring target = L"old";
         EXPECT_EQ(utils::UTF8ToUnicode(text, target), expected == L"old" ? 0 : text.size());
         EXPECT_EQ(target, expected);
     }
-    EXPECT_EQ(utils::UniFromUTF8("\xFF"), L"");
 }
 
 TEST(StringUtilsComGUI, ReadsAndWritesHexadecimal) {
@@ -55,10 +46,5 @@ TEST(StringUtilsComGUI, ReadsAndWritesHexadecimal) {
     for (const auto& [text, value] : cases) {
         EXPECT_EQ(utils::ConvertHexStrToInt(text), value) << (text ? text : "null");
     }
-    EXPECT_EQ(utils::ConvertIntToHexStr(255), "ff");
     EXPECT_EQ(utils::ConvertIntToHexStr(-1), "ffffffff");
-    char text[] = "AbC Ä[";
-    EXPECT_STREQ(utils::lower(text), "abc Ä[");
 }
-
-} // namespace
