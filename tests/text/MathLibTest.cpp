@@ -58,8 +58,8 @@ TEST(MathLib, RoundsToGranularitiesAndWithinTolerances) {
     EXPECT_EQ(RoundToBigGranularity(-7.5, 5), -10.0);
     EXPECT_EQ(RoundToSmallGranularity(1.26, 10), 1.3);
 
-    EXPECT_EQ(EpsilonFloor(2.9999999, 1e-6), 3.0);
-    EXPECT_EQ(EpsilonCeilToInt(3.0000001, 1e-6), 3);
+    EXPECT_EQ(EpsilonFloor(999999.5, 1e-6), 1000000.0);
+    EXPECT_EQ(EpsilonCeilToInt(1000000.5, 1e-6), 1000000);
     EXPECT_TRUE(EpsilonEqual(90.0, 100.0, 0.1));  // 10 within a tenth of 100,
     EXPECT_FALSE(EpsilonEqual(100.0, 90.0, 0.1)); // but not of 90
     EXPECT_EQ(MagneticInt(1e-9, 1e-6), 0.0);
