@@ -19,10 +19,8 @@ TEST_F(JobStatus, IsClosedOnceAllStripsHaveAResult) {
         std::string log;
     } cases[] = {
         {"Workflow/Verify/Active=1", true, 0, 211, single},
-        {"Workflow/Verify/Active=1", false, 0, 212, single},
         {"other=1", true, -1, 211, single},
         {"Workflow/Verify/Active=3.0", false, -1, 212, single}, // Of another type: not there.
-        {two, true, 0, 0, twoLine + "Read Approvals1, err=-1, iTmp==-1\n"},
         {two + second, true, 0, 0, twoLine + "Read Approvals1, err=-1, iTmp==-1\n"},
         {two + "Remote/Measurement/Approval=-2 " + second, true, 0, 0,
          twoLine + "Read Approvals1, err=0, iTmp==-2\n"},
