@@ -7,6 +7,7 @@
 #include <optional>
 #include <sstream>
 #include <string>
+#include <vector>
 
 #include <sys/wait.h>
 #include <unistd.h>
@@ -43,26 +44,29 @@ inline int endOf(pid_t child) {
     return WIFEXITED(status) ? WEXITSTATUS(status) : 1000 + WTERMSIG(status);
 }
 
-enum class Engine { Sqlite, Postgres };
-
-inline std::string engineName(const testing::TestParamInfo<Engine>& info) {
-    return info.param == Engine::Sqlite ? "Sqlite" : "Postgres";
+/// All that is in a ticket, in the words of TicketText.h.
+inline std::string contentText(const store::TicketContent& content) {
+    std::string text;
+    content.walk(
+        [](void* to, const char* key, PARAM_TYPE type, const void* value, int position) {
+            auto& text = *static_cast<std::string*>(to);
+            text += (text.empty() ? "" : " ") + support::recordText(key, type, value, position);
+            return true;
+        },
+        &text);
+    return text;
 }
+
+enum class Engine { Sqlite, Postgres };
 
 /// For a suite of tests that hold wherever a store is.
 #define ON_BOTH_ENGINES(Suite)                                                                     \
-    INSTANTIATE_TEST_SUITE_P(, Suite, testing::Values(Engine::Sqlite, Engine::Postgres), engineName)
+    INSTANTIATE_TEST_SUITE_P(                                                                      \
+        , Suite, testing::Values(Engine::Sqlite, Engine::Postgres), [](const auto& info) {         \
+            return std::string(info.param == Engine::Sqlite ? "Sqlite" : "Postgres");              \
+        })
 
 class StoreTest : public testing::TestWithParam<Engine> {
-  protected:
-    explicit StoreTest(Engine kind = GetParam())
-        : room(kind == Engine::Postgres ? std::make_unique<support::PostgresRoom>() : nullptr),
-          address(room ? "room" : folder.path("store")) {
-        store::makeStore(address, "Press room");
-    }
-
-    std::unique_ptr<store::StoreEngine> open() const { return store::openStore(address); }
-
   public:
     /// Sends a table as a session would; what became of it and of its records.
     static std::string send(store::StoreEngine& engine, int type, int id,
@@ -77,19 +81,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
     /// All keys of a ticket, or "none".
     static std::string ticket(store::StoreEngine& engine, int type, int id) {
         const auto content = engine.content(type, id, store::KeyFilter());
-        if (content == nullptr) {
-            return "none";
-        }
-        std::string text;
-        content->walk(
-            [](void* to, const char* key, PARAM_TYPE ptype, const void* value, int position) {
-                auto& text = *static_cast<std::string*>(to);
-                text +=
-                    (text.empty() ? "" : " ") + support::recordText(key, ptype, value, position);
-                return true;
-            },
-            &text);
-        return text;
+        return content == nullptr ? "none" : contentText(*content);
     }
 
     static void putFile(store::StoreEngine& engine, const std::string& path,
@@ -104,6 +96,18 @@ class StoreTest : public testing::TestWithParam<Engine> {
         return to.str();
     }
 
+    /// What a file held before, the oldest first.
+    static std::vector<std::string> versions(store::StoreEngine& engine, const std::string& path) {
+        std::vector<std::string> texts;
+        for (const auto& version : engine.versions(path)) {
+            std::ostringstream to;
+            engine.getVersion(path, version.number, to);
+            EXPECT_EQ(to.str().size(), version.size);
+            texts.push_back(to.str());
+        }
+        return texts;
+    }
+
     /// The fault that work ends with; nothing where it does not fail.
     static std::optional<store::Fault> faultOf(const std::function<void()>& work) {
         try {
@@ -115,7 +119,13 @@ class StoreTest : public testing::TestWithParam<Engine> {
     }
 
   protected:
-    using RecordTable = support::RecordTable;
+    explicit StoreTest(Engine kind = GetParam())
+        : room(kind == Engine::Postgres ? std::make_unique<support::PostgresRoom>() : nullptr),
+          address(room ? "room" : folder.path("store")) {
+        store::makeStore(address, "Press room");
+    }
+
+    std::unique_ptr<store::StoreEngine> open() const { return store::openStore(address); }
 
     /// Runs SQL behind the store's back: the first text where it is a folder, else the second.
     void sql(const std::string& sqlite, const std::string& postgres) const {

@@ -1,7 +1,6 @@
 // A suite with the real bundle in it, and connections through it.
 #pragma once
 
-#include <filesystem>
 #include <memory>
 #include <string>
 
@@ -13,18 +12,13 @@ class Suite {
   public:
     Suite() {
         m_root.installPlistReader(PLIST_READER);
-        m_root.writePreferences("Qen/com.qen.packageversion.plist",
-                                {{"Nerova Hue Workbench/library_path", m_root.path("suite")}});
-        std::filesystem::create_directories(m_root.path("suite/lib"));
-        std::filesystem::create_directory_symlink(COMGUI_BUNDLE,
-                                                  m_root.path("suite/lib/ComGUI.Bundle"));
+        m_root.installCommBundle(COMGUI_BUNDLE);
     }
 
     static std::unique_ptr<CKZConnector> connect(const std::wstring& server,
                                                  const std::wstring& user = L"press",
                                                  const std::wstring& password = L"room") {
-        constexpr int application = 0x5071103;
-        return std::make_unique<CKZConnector>(server, user, password, application, false, false);
+        return std::make_unique<CKZConnector>(server, user, password, 0x5071103, false, false);
     }
 
   private:
