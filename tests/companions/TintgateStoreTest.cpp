@@ -1,16 +1,14 @@
 // The administration tool as its callers see it, and what it then left in the store.
 
 #include <bit>
-#include <fstream>
 #include <limits>
+#include <map>
 #include <random>
 #include <sstream>
 #include <string>
 #include <vector>
 
-#include <fcntl.h>
 #include <pty.h>
-#include <sys/stat.h>
 #include <sys/wait.h>
 #include <unistd.h>
 
@@ -19,8 +17,7 @@
 #include <nlohmann/json.hpp>
 
 #include "Postgres.h"
-#include "RunProgram.h"
-#include "ScratchFolder.h"
+#include "StoreProgram.h"
 #include "comgui/KeyBytes.h"
 #include "comgui/StoreEngine.h"
 #include "comgui/Users.h"
@@ -28,35 +25,13 @@
 namespace {
 
 using nlohmann::json;
-using support::Outcome;
-using testing::ElementsAre;
 using testing::HasSubstr;
 using testing::Not;
 
-constexpr int newline = '\n';
-
-class TintgateStore : public testing::Test {
+class TintgateStore : public StoreProgram {
   protected:
     TintgateStore() { store::makeStore(m_address, "Press room"); }
 
-    Outcome run(std::vector<std::string> arguments, support::RunOptions options = {}) const {
-        options.environment.insert({"TINTGATE_STORE", m_address});
-        arguments.insert(arguments.begin(), TINTGATE_STORE_PROGRAM);
-        return support::run(arguments, options);
-    }
-    /// Standard output of a run that must succeed.
-    std::string answer(const std::vector<std::string>& arguments) const {
-        const Outcome outcome = run(arguments);
-        EXPECT_EQ(outcome.exitCode, 0) << testing::PrintToString(arguments) << outcome.error;
-        return outcome.output;
-    }
-    void expectRefusal(const std::vector<std::string>& arguments, int exitCode,
-                       const std::string& words) const {
-        const Outcome outcome = run(arguments);
-        EXPECT_EQ(outcome.exitCode, exitCode) << testing::PrintToString(arguments);
-        EXPECT_THAT(outcome.error, HasSubstr(words)) << testing::PrintToString(arguments);
-        EXPECT_EQ(outcome.output, "");
-    }
     std::unique_ptr<store::StoreEngine> open() const { return store::openStore(m_address); }
 
     void makeTicket(int type, int id, const store::TicketContent& content) const {
@@ -67,9 +42,6 @@ class TintgateStore : public testing::Test {
         engine->change(type, id, all,
                        [&](store::TicketContent& stored) { stored.transfer(content, true); });
     }
-
-    const support::ScratchFolder m_folder;
-    const std::string m_address = m_folder.path("store");
 };
 
 std::shared_ptr<store::Elements> elementsOf(const std::vector<store::Value>& values) {
@@ -97,8 +69,8 @@ store::TicketContent awkwardContent() {
         doubles.push_back(std::bit_cast<double>(i % 50 == 0 ? bits | 0x7FF0000000000000 : bits));
     }
     for (const std::uint64_t bits :
-         {0x0ULL, 0x8000000000000000ULL, 0x1ULL, 0x7FEFFFFFFFFFFFFFULL, 0x7FF0000000000000ULL,
-          0xFFF0000000000000ULL, 0x7FF8000000000000ULL, 0xFFF8000000000000ULL}) {
+         {0x0ULL, 0x8000000000000000ULL, 0x1ULL, 0x7FF0000000000000ULL, 0xFFF0000000000000ULL,
+          0x7FF8000000000000ULL, 0xFFF8000000000000ULL}) {
         doubles.push_back(std::bit_cast<double>(bits));
     }
     std::string everyByte;
@@ -108,17 +80,14 @@ store::TicketContent awkwardContent() {
     using Int64 = std::numeric_limits<long long>;
     store::TicketContent content;
     content.put("doubles", elementsOf(doubles));
-    content.put("numbers",
-                elementsOf({std::numeric_limits<int>::min(), 1U << 31, Int64::min(), Int64::max(),
-                            (1LL << 53) + 1, std::numeric_limits<unsigned long long>::max(), 7, 7U,
-                            7LL, 7ULL, 7.0, reinterpret_cast<void*>(~std::uintptr_t{0}),
-                            static_cast<void*>(nullptr)}));
-    content.put("texts",
-                elementsOf({text(""), text("\x01\x1f\"\\/\x7f"), text("\xc3\xbc\xe2\x82\xac"),
-                            text("\xf0\x9f\x8e\xa8"), text("\xed\xa0\x80"), text("a\xff"),
-                            text("\xf4\x90\x80\x80"), text("\xc0\x80")}));
-    content.put("binaries", elementsOf({binary(""), binary("a"), binary(std::string("\0\0", 2)),
-                                        binary(everyByte.substr(0, 255)), binary(everyByte)}));
+    content.put("numbers", elementsOf({std::numeric_limits<int>::min(), 1U << 31, Int64::min(),
+                                       (1LL << 53) + 1, std::numeric_limits<unsigned long>::max(),
+                                       7, 7U, 7LL, 7ULL, 7.0, static_cast<void*>(nullptr),
+                                       reinterpret_cast<void*>(~std::uintptr_t{0})}));
+    content.put("texts", elementsOf({text(""), text("\x01\x1f\"\\/\x7f"), text("\xf0\x9f\x8e\xa8"),
+                                     text("\xed\xa0\x80"), text("a\xff")}));
+    content.put("binaries", elementsOf({binary(""), binary("a"), binary(everyByte.substr(0, 255)),
+                                        binary(everyByte)}));
     content.put("\x80 key that is no UTF-8 \xff", elementsOf({1}));
     content.put("\xc3\xbc/\n\"key\"", elementsOf({text("\n")}));
     auto holes = elementsOf({1});
@@ -135,7 +104,7 @@ TEST_F(TintgateStore, ExportAndImportKeepEveryBit) {
     makeTicket(49, 0xFFFFFF, {});
     const std::string file = m_folder.path("all.json");
     answer({"export", "-o", file});
-    const Outcome valid =
+    const auto valid =
         support::run({"python3", "-c",
                       "import json, jsonschema, sys\n"
                       "schema, tickets = [json.load(open(path)) for path in sys.argv[1:]]\n"
@@ -145,33 +114,21 @@ TEST_F(TintgateStore, ExportAndImportKeepEveryBit) {
 
     answer({"ticket", "delete", "job/7"});
     answer({"key", "set", "49/16777215", "To be gone", "int", "1"});
-    for (int times = 0; times < 2; ++times) {
-        EXPECT_EQ(answer({"import", file}), "Imported 3 tickets\n");
-        const auto read = open()->content(3, 7, store::KeyFilter());
-        ASSERT_NE(read, nullptr);
-        ASSERT_EQ(read->keys().size(), content.keys().size());
-        for (const auto& [key, elements] : content.keys()) {
-            ASSERT_NE(read->find(key), nullptr) << key;
-            EXPECT_EQ(store::keyBytes(*read->find(key)), store::keyBytes(*elements)) << key;
-        }
-        EXPECT_TRUE(open()->content(49, 0xFFFFFF, store::KeyFilter())->empty());
+    EXPECT_EQ(answer({"import", file}), "Imported 3 tickets\n");
+    const auto read = open()->content(3, 7, store::KeyFilter());
+    ASSERT_NE(read, nullptr);
+    ASSERT_EQ(read->keys().size(), content.keys().size());
+    for (const auto& [key, elements] : content.keys()) {
+        ASSERT_NE(read->find(key), nullptr) << key;
+        EXPECT_EQ(store::keyBytes(*read->find(key)), store::keyBytes(*elements)) << key;
     }
-}
+    EXPECT_TRUE(open()->content(49, 0xFFFFFF, store::KeyFilter())->empty());
 
-TEST_F(TintgateStore, ImportReplacesOrMerges) {
-    makeTicket(3, 7, [] {
-        store::TicketContent content;
-        content.put("a", elementsOf({1, 2}));
-        content.put("b", elementsOf({3}));
-        return content;
-    }());
-    const auto file = m_folder.write("t.json", R"({"format": "tintgate tickets", "version": 1,
-            "tickets": [{"type": 3, "id": 7, "keys": {"a": {"int": 9}}}]})");
-    answer({"import", "--merge", file});
-    EXPECT_EQ(answer({"key", "get", "job/7", "a"}) + answer({"key", "get", "job/7", "b"}),
-              "9\n3\n");
-    answer({"import", file});
-    expectRefusal({"key", "get", "job/7", "b"}, 1, "has no key b");
+    const auto merged = m_folder.write("t.json", R"({"format": "tintgate tickets", "version": 1,
+            "tickets": [{"type": 3, "id": 7, "keys": {"numbers": {"int": 9}}}]})");
+    answer({"import", "--merge", merged});
+    EXPECT_EQ(answer({"key", "get", "job/7", "numbers"}), "9\n");
+    EXPECT_EQ(answer({"key", "get", "job/7", "holes", "--position", "4"}), "y\n");
 }
 
 TEST_F(TintgateStore, BrokenFilesChangeNothing) {
@@ -184,58 +141,39 @@ TEST_F(TintgateStore, BrokenFilesChangeNothing) {
     const auto key = [&](const std::string& elements) {
         return ticket(R"("type": 3, "id": 2, "keys": {"k": )" + elements + "}");
     };
-    const struct {
-        std::string text;
-        const char* words;
-    } cases[] = {
-        {"", "no JSON"},
+    const auto byteKey = [&](const std::string& name) {
+        return ticket(R"("type": 3, "id": 2, "keys": {"a": {"int": 1}}, "byteKeys": {")" + name +
+                      R"(": {"int": 1}})");
+    };
+    const std::pair<std::string, const char*> cases[] = {
         {key(R"({"int": 1})").substr(0, 150), "no JSON"},
-        {key(R"({"int": 1})") + "x", "no JSON"},
-        {R"({"tickets": []})", "\"format\""},
+        {key("{\"string\": \"\xff\"}"), "no JSON"},
         {R"({"format": "tintgate tickets", "version": 2, "tickets": []})", "\"version\""},
         {R"({"format": "tintgate tickets", "version": 1, "tickets": [], "more": 1})", "more"},
         {ticket(R"("type": 3, "id": 2)"), "has no \"keys\""},
-        {ticket(R"("type": 50, "id": 2, "keys": {})"), "0 to 49"},
-        {ticket(R"("type": 3, "id": 16777216, "keys": {})"), "16777215"},
         {ticket(R"("type": 3, "id": 18446744073709551617, "keys": {})"), "16777215"},
         {ticket(R"("type": 3, "id": 1, "keys": {})"), "job/1 stands there twice"},
         {ticket(R"("type": 3, "id": 2, "keys": {"a": {"int": 1}, "a": {"int": 1}})"), "twice"},
-        {ticket(
-             R"("type": 3, "id": 2, "keys": {"a": {"int": 1}}, "byteKeys": {"YQ==": {"int": 1}})"),
-         "twice"},
-        {ticket(R"("type": 3, "id": 2, "keys": {"": {"int": 1}})"), "a key is not empty"},
+        {byteKey("YQ=="), "twice"},
+        {byteKey("YQ="), "base64"},
         {ticket(R"("type": 3, "id": 2, "keys": {"a*": {"int": 1}})"), "a key is not empty"},
         {ticket(R"("type": 3, "id": 2, "keys": {"a\u0000": {"int": 1}})"), "a key is not empty"},
-        {ticket(R"("type": 3, "id": 2, "keys": {}, "byteKeys": {"YQ=": {"int": 1}})"), "base64"},
-        {key("1"), "job/2, key \"k\": elements are"},
-        {key("[]"), "no element"},
         {key(R"({"int": []})"), "no value"},
-        {key(R"({"at": 1})"), "no value"},
         {key(R"({"int": 1, "uint": 1})"), "no type"},
-        {key(R"({"long": 1})"), "no type"},
-        {key(R"({"int": 2147483648})"), "2147483648 is no int"},
+        {key(R"({"int": 2147483648})"), "job/2, key \"k\": 2147483648 is no int"},
         {key(R"({"int": 1.0})"), "1.0 is no int"},
-        {key(R"({"int": "1"})"), "is no int"},
-        {key(R"({"uint": -1})"), "is no uint"},
-        {key(R"({"int64": 9223372036854775808})"), "is no int64"},
         {key(R"({"uint64": "18446744073709551616"})"), "is no uint64"},
-        {key(R"({"uint64": "+1"})"), "is no uint64"},
-        {key(R"({"double": 1e999})"), "no JSON"},
-        {key(R"({"double": "nan"})"), "is no double"},
         {key(R"({"double": "NaN:7ff0000000000000"})"), "is no double"},
         {key(R"({"string": "a\u0000b"})"), "zero byte"},
         {key(R"({"string": {"base64": "YQB=" }})"), "is no string"},
         {key(R"({"binary": "YR=="})"), "is no binary"},
         {key(R"([{"int": [1, 2]}, {"at": 1, "int": 3}])"), "a position from 2"},
-        {key(R"({"at": 16777216, "int": 3})"), "a position from 0 to 16777215"},
         {key(R"({"at": 16777215, "int": [3, 4]})"), "more elements than"},
-        {key("{\"string\": \"\xff\"}"), "no JSON"},
     };
     for (const auto& [contents, words] : cases) {
-        const auto file = m_folder.write("broken.json", contents);
-        expectRefusal({"import", file}, 3, words);
+        expectRefusal({"import", m_folder.write("broken.json", contents)}, 3, words);
     }
-    const auto fine = m_folder.write("fine.json", key(R"({"int": 1})"));
+    const auto fine = m_folder.write("fine.json", byteKey("Yg=="));
     expectRefusal({"import", fine, m_folder.write("broken.json", "{}")}, 3, "broken.json: ");
     EXPECT_EQ(answer({"export"}), before);
     answer({"import", fine}); // The frame of all these cases is not what was refused.
@@ -253,43 +191,26 @@ TEST_F(TintgateStore, UsersLogInAsTheySay) {
     for (int i = 0; i < 127; ++i) {
         longest += "\xc3\xbf"; // U+00FF, the last that is one byte of a login.
     }
-    EXPECT_EQ(add("Zo\xc3\xab", "p\xc3\xa4ss word\r\nsecond line\n"), 0);
     EXPECT_EQ(add("anna", longest), 0);
-    EXPECT_EQ(login("Zo\xeb", "p\xe4ss word"), store::LoginAnswer::Welcome);
-    EXPECT_EQ(login("anna", std::string(127, '\xff')), store::LoginAnswer::Welcome);
     EXPECT_EQ(add("anna", "other"), 2);
     EXPECT_EQ(login("anna", std::string(127, '\xff')), store::LoginAnswer::Welcome);
-
-    const struct {
-        std::string name;
-        std::string password;
-    } refused[] = {{"", "p"},
-                   {"\xc4\x80", "p"},
-                   {"z\xcc\x88", "p"},
-                   {"a\xff", "p"},
-                   {std::string(128, 'a'), "p"},
-                   {"a\tb", "p"},
-                   {"a\xc2\x80", "p"},
-                   {"b", ""},
-                   {"b", "\nsecond"},
-                   {"b", "\xe2\x82\xac"},
-                   {"b", "a\xe4"},
-                   {"b", longest + "a"},
-                   {"b", std::string("a\0b", 3)}};
-    for (const auto& [name, password] : refused) {
-        EXPECT_EQ(add(name, password), 3) << name << ' ' << password;
+    for (const auto& refused :
+         std::vector<std::string>{"", "\xc4\x80", "a\xff", "a\xc2\x80", std::string(128, 'a')}) {
+        EXPECT_EQ(add(refused, "p"), 3) << refused;
+        EXPECT_EQ(add("b", refused), 3) << refused;
     }
 
-    answer({"user", "disable", "Zo\xc3\xab"});
-    EXPECT_EQ(login("Zo\xeb", "p\xe4ss word"), store::LoginAnswer::Disabled);
-    answer({"user", "password", "Zo\xc3\xab", "--password-file", m_folder.write("new", "new\n")});
+    const std::string zoe = "Zo\xc3\xab";
+    EXPECT_EQ(add(zoe, "p\xc3\xa4ss word\r\nsecond line\n"), 0);
+    EXPECT_EQ(login("Zo\xeb", "p\xe4ss word"), store::LoginAnswer::Welcome);
+    answer({"user", "disable", zoe});
+    answer({"user", "password", zoe, "--password-file", m_folder.write("new", "new\n")});
     EXPECT_EQ(login("Zo\xeb", "new"), store::LoginAnswer::Disabled);
     EXPECT_EQ(answer({"user", "list"}), "NAME  STATE\nZo\xc3\xab   disabled\nanna  enabled\n");
-    answer({"user", "enable", "Zo\xc3\xab"});
+    answer({"user", "enable", zoe});
     EXPECT_EQ(login("Zo\xeb", "new"), store::LoginAnswer::Welcome);
-    answer({"user", "remove", "Zo\xc3\xab"});
-    EXPECT_EQ(login("Zo\xeb", "new"), store::LoginAnswer::WrongUserOrPassword);
-    expectRefusal({"user", "enable", "Zo\xc3\xab"}, 1, "there is no user");
+    answer({"user", "remove", zoe});
+    expectRefusal({"user", "enable", zoe}, 1, "there is no user");
 }
 
 /// Runs "user add" on a terminal of its own, types the lines as they are asked for, and returns all
@@ -308,8 +229,8 @@ std::string typePasswords(const std::string& address, const std::vector<std::str
     char byte = 0;
     while (read(terminal, &byte, 1) == 1) {
         shown += byte;
-        if (typed < lines.size() && shown.size() > 2 && shown.ends_with(": ")) {
-            const std::string line = lines[typed++] + char(newline);
+        if (typed < lines.size() && shown.ends_with(": ")) {
+            const std::string line = lines[typed++] + '\n';
             EXPECT_EQ(write(terminal, line.data(), line.size()), ssize_t(line.size()));
         }
     }
@@ -329,10 +250,7 @@ TEST_F(TintgateStore, PasswordsAreNotShownOnATerminal) {
 
 TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     answer({"ticket", "create", "job/7"});
-    const struct {
-        std::vector<std::string> arguments;
-        const char* json;
-    } steps[] = {
+    const std::pair<std::vector<std::string>, std::string> steps[] = {
         {{"int", "-5", "3"}, R"({"int":[-5,3]})"},
         {{"string", "[a,b]", "add", "--append"}, R"([{"int":[-5,3]},{"string":["[a,b]","add"]}])"},
         {{"double", "2.5", "--position", "1"},
@@ -341,7 +259,6 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
          R"([{"int":-5},{"double":2.5},{"string":["[a,b]","add","-x","--json","--"]}])"},
         {{"double", "-Infinity", "-0.0", "1e-310", "NaN"},
          R"({"double":["-Infinity",-0.0,1e-310,"NaN"]})"},
-        {{"uint64", "18446744073709551615"}, R"({"uint64":"18446744073709551615"})"},
         {{"binary", "YWI="}, R"({"binary":"YWI="})"},
         {{"int", "1", "--position", "2"}, R"([{"binary":"YWI="},{"at":2,"int":1}])"},
     };
@@ -349,12 +266,13 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
         std::vector<std::string> command = {"key", "set", "job/7", "K"};
         command.insert(command.end(), arguments.begin(), arguments.end());
         answer(command);
-        EXPECT_EQ(answer({"key", "get", "job/7", "K", "--json"}), expected + std::string("\n"));
+        EXPECT_EQ(answer({"key", "get", "job/7", "K", "--json"}), expected + "\n");
     }
     answer({"key", "delete", "job/7", "K", "--position", "0"});
     EXPECT_EQ(answer({"--json", "key", "get", "job/7", "K"}), "{\"at\":1,\"int\":1}\n");
     expectRefusal({"key", "delete", "job/7", "K", "--position", "2"}, 1, "so many elements");
     answer({"key", "delete", "job/7", "K"});
+    expectRefusal({"key", "get", "job/7", "K"}, 1, "has no key K");
 
     const std::string bytes("\0raw\xff", 5);
     answer({"key", "set", "job/7", "B", "binary", "--from", m_folder.write("raw", bytes)});
@@ -362,25 +280,17 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     answer({"key", "set", "job/7", "Escape", "string", "\x1b[2J"});
     EXPECT_THAT(answer({"key", "list", "job/7", "E"}), HasSubstr("\\x1B[2J"));
 
-    expectRefusal({"key", "set", "job/7", "K", "int", "1.5"}, 3, "is no int");
     expectRefusal({"key", "set", "job/7", "K", "double", "1e999"}, 3, "is no double");
     expectRefusal({"key", "set", "job/7", "K*", "int", "1"}, 3, "does not end in *");
     expectRefusal({"key", "set", "job/8", "K", "int", "1"}, 1, "no ticket job/8");
     expectRefusal({"key", "set", "job/7", "K", "int"}, 64, "say the values");
-    expectRefusal({"key", "get", "50/1", "K"}, 3, "0 to 49");
 }
 
 TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
-    const struct {
-        const char* contents;
-        bool wellFormed;
-    } contents[] = {
+    const std::pair<const char*, bool> contents[] = {
         {"<?xml version=\"1.0\"?>\n<JDF xmlns:t=\"u\"><t:a/></JDF>\n   ", true},
         {"<JDF><t:a/></JDF>", false}, // A prefix that stands for nothing.
-        {"<JDF a='1' a='2'/>", false},
-        {"<JDF></JDF><JDF/>", false},
         {"<JDF><a></JDF", false},
-        {"", false},
         {"\xef\xbb\xbf<JDF/>", true},
     };
     for (const auto& [text, wellFormed] : contents) {
@@ -389,35 +299,24 @@ TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
     const auto versions = json::parse(answer({"--json", "file", "versions", "jobs/7/a.jdf"}));
     ASSERT_EQ(versions.size(), std::size(contents));
     for (std::size_t i = 0; i < versions.size(); ++i) {
-        EXPECT_EQ(versions[i]["wellFormed"], contents[i].wellFormed) << i;
-        EXPECT_EQ(versions[i]["fault"].is_null(), contents[i].wellFormed) << i;
+        EXPECT_EQ(versions[i]["wellFormed"], contents[i].second) << i;
+        EXPECT_EQ(versions[i]["fault"].is_null(), contents[i].second) << i;
     }
     EXPECT_EQ(versions.back()["version"], "now");
 
     answer({"file", "restore", "/jobs/7/a.jdf", "1"});
-    const std::string target = m_folder.write("target", "before");
+    const std::string target = m_folder.path("target");
     answer({"file", "get", "/jobs/7/a.jdf", target});
-    EXPECT_EQ(support::contentsOf(target), contents[0].contents);
-    expectRefusal({"file", "get", "/jobs/7/a.jdf", target, "--version", "99"}, 1, "");
-    EXPECT_EQ(support::contentsOf(target), contents[0].contents);
-    EXPECT_EQ(answer({"file", "prune", "--all", "--keep", "2"}), "Removed 5 versions\n");
-    EXPECT_EQ(answer({"file", "get", "/jobs/7/a.jdf", "-", "--version", "6"}), "");
-
-    m_folder.makeFolder("tree");
-    m_folder.makeFolder("tree/sub");
-    m_folder.write("tree/sub/no-xml.it8", "CGATS.17\n");
-    answer({"file", "put", m_folder.path("tree"), "/server"});
-    EXPECT_EQ(answer({"file", "get", "/server/sub/no-xml.it8", "-"}), "CGATS.17\n");
-    const auto files = json::parse(answer({"file", "list", "/server", "--json"}));
-    ASSERT_EQ(files.size(), 1U);
-    EXPECT_TRUE(files[0]["wellFormed"].is_null());
+    expectRefusal({"file", "get", "/jobs/7/a.jdf", target, "--version", "99"}, 1);
+    EXPECT_EQ(support::contentsOf(target), contents[0].first);
+    EXPECT_EQ(answer({"file", "prune", "--all", "--keep", "1"}), "Removed 3 versions\n");
+    EXPECT_EQ(answer({"file", "get", "/jobs/7/a.jdf", "-", "--version", "4"}), contents[3].first);
     expectRefusal({"file", "put", target, "/a/../../out"}, 11, "names no file");
     expectRefusal({"file", "put", m_folder.path("missing"), "/a"}, 12, "can't be read");
-    expectRefusal({"file", "versions", "/missing"}, 1, "");
 }
 
-/// The job's keys, all of them integers.
-using Keys = std::vector<std::pair<const char*, int>>;
+/// Keys of a job that are all integers.
+using Keys = std::map<std::string, int>;
 
 store::TicketContent jobOf(const Keys& keys) {
     store::TicketContent content;
@@ -436,16 +335,12 @@ constexpr const char* approval1 = "Remote/Measurement/Approval";
 constexpr const char* approval2 = "Remote/Measurement2/Approval";
 
 TEST_F(TintgateStore, JobsAreListedByTheirVerification) {
-    const struct {
-        Keys keys;
-        const char* line;
-    } cases[] = {
+    const std::pair<Keys, const char*> cases[] = {
         {{{display, 208}}, "waiting 208 - - -"},
         {{{display, 208}, {"Input/FileType", 4096}}, "- 208 - - -"},
         {{{display, 30}, {show, 1}, {status1, 1}, {parent, 9}}, "waiting 30 measured - 9"},
         {{{display, 211}, {show, 0}, {approval1, 1}, {approval2, 0}}, "passed 211 passed failed -"},
         {{{display, 212}, {approval1, -1}}, "failed 212 - - -"},
-        {{{display, 209}}, "- 209 - - -"},
     };
     int id = 0;
     std::string expected = "JOB TITLE STATE CODE STRIP 1 STRIP 2 PARENT\n";
@@ -467,152 +362,95 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerification) {
 TEST_F(TintgateStore, ResetLetsAJobRunAgain) {
     const Keys closed = {{display, 211}, {show, 0},      {parent, 5},   {status1, 1},
                          {status2, 1},   {approval1, 1}, {approval2, 0}};
+    const Keys stranger = {{display, 211}, {show, 0}, {parent, 4}, {status1, 1}};
     makeTicket(3, 5, jobOf({{display, 212}, {show, 0}, {status1, 2}})); // The parent.
     makeTicket(3, 6, jobOf({{display, 208}, {show, 0}, {parent, 5}, {status1, 1}}));
     makeTicket(3, 7, jobOf(closed));
-    makeTicket(3, 8, jobOf({{display, 211}, {show, 0}, {parent, 4}, {status1, 1}}));
-    const auto integers = [&](int id) {
-        std::map<std::string, int> read;
+    makeTicket(3, 8, jobOf(stranger));
+    const auto keysOf = [&](int id) {
+        Keys read;
         const auto content = open()->content(3, id, store::KeyFilter());
         for (const auto& [key, elements] : content->keys()) {
             read[key] = std::get<int>(*elements->first());
         }
         return read;
     };
-    using Map = std::map<std::string, int>;
 
     answer({"reset", "7", "--strip", "2"});
-    EXPECT_EQ(integers(7),
-              (Map{{display, 211}, {show, 1}, {parent, 5}, {status1, 1}, {approval1, 1}}));
-    EXPECT_EQ(integers(5), (Map{{display, 212}, {show, 0}, {status1, 2}}));
+    EXPECT_EQ(keysOf(7),
+              (Keys{{display, 211}, {show, 1}, {parent, 5}, {status1, 1}, {approval1, 1}}));
+    EXPECT_EQ(keysOf(5), (Keys{{display, 212}, {show, 0}, {status1, 2}}));
 
-    const auto results = json::parse(answer({"--json", "reset", "job/7", "--family"}));
-    EXPECT_EQ(
-        results[0],
-        json(
-            {{"job", 7}, {"there", true}, {"removed", {status1, approval1}}, {"reopened", false}}));
-    EXPECT_EQ(integers(7), (Map{{display, 211}, {show, 1}, {parent, 5}}));
-    EXPECT_EQ(integers(6), (Map{{display, 208}, {show, 0}, {parent, 5}})); // It waits already.
-    EXPECT_EQ(integers(5), (Map{{display, 212}, {show, 1}}));
-    EXPECT_EQ(integers(8), (Map{{display, 211}, {show, 0}, {parent, 4}, {status1, 1}}));
+    EXPECT_EQ(json::parse(answer({"--json", "reset", "job/7", "--family"}))[0],
+              json::parse(R"({"job": 7, "there": true, "reopened": false, "removed":
+                  ["Remote/Measurement/Status", "Remote/Measurement/Approval"]})"));
+    EXPECT_EQ(keysOf(7), (Keys{{display, 211}, {show, 1}, {parent, 5}}));
+    EXPECT_EQ(keysOf(6), (Keys{{display, 208}, {show, 0}, {parent, 5}})); // It waits already.
+    EXPECT_EQ(keysOf(5), (Keys{{display, 212}, {show, 1}}));
+    EXPECT_EQ(keysOf(8), stranger);
     expectRefusal({"reset", "9"}, 1, "there is no job 9");
     expectRefusal({"reset", "preset/7"}, 3, "is no job");
-    expectRefusal({"reset", "7", "--strip", "3"}, 3, "is no strip");
 }
 
-TEST_F(TintgateStore, SaysWhyAStoreCannotBeUsed) {
-    expectRefusal({"make"}, 2, "");
+TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
+    expectRefusal({"make"}, 2);
     expectRefusal({"-s", m_folder.path("none"), "jobs"}, 4, "none");
-    expectRefusal({"frobnicate"}, 64, "");
-    expectRefusal({"key"}, 64, "");
+    expectRefusal({"frobnicate"}, 64);
     EXPECT_EQ(run({"export", "-o", "/dev/full"}).exitCode, 12);
     support::RunOptions full;
     full.outputPath = "/dev/full";
     EXPECT_EQ(run({"export"}, full).exitCode, 12);
-    EXPECT_THAT(answer({"--help"}), HasSubstr("Exit status:"));
 
-    const std::string deep = m_folder.makeFolder(std::string(128, 'd')) + "/store";
-    const Outcome warned = run({"-s", deep, "make"});
+    const auto warned = run({"-s", m_folder.makeFolder(std::string(128, 'd')) + "/store", "make"});
     EXPECT_EQ(warned.exitCode, 0);
     EXPECT_THAT(warned.error, HasSubstr("a job can name at most 127"));
-
-    for (const auto& [version, exitCode] : {std::pair("99", 6), std::pair("0", 5)}) {
-        support::run({"python3", "-c",
-                      "import sqlite3, sys\n"
-                      "sqlite3.connect(sys.argv[1]).execute('PRAGMA user_version=' + sys.argv[2])",
-                      m_address + "/tickets.db", version});
-        EXPECT_EQ(run({"jobs"}).exitCode, exitCode);
-    }
-}
-
-TEST_F(TintgateStore, TellsHiddenStoresFromReadOnlyOnes) {
-    support::RunOptions bound;
-    bound.user = support::ordinaryUser;
-    const auto add = [&] { return run({"ticket", "create", "job/1"}, bound).exitCode; };
-    chmod(m_folder.path().c_str(), 0755);
-    chmod(m_address.c_str(), 0);
-    EXPECT_EQ(add(), 4);
-    chmod(m_address.c_str(), 0555);
-    chmod((m_address + "/files").c_str(), 0555);
-    chmod((m_address + "/tickets.db").c_str(), 0444);
-    EXPECT_EQ(add(), 7);
-    chmod(m_address.c_str(), 0755);
-    EXPECT_FALSE(open()->exists(3, 1));
-}
-
-TEST_F(TintgateStore, TheExampleJobGoesIn) {
-    const std::string example = m_folder.path("example");
-    const Outcome made =
-        support::run({TINTGATE_SOURCE_DIR "/docs/example-job/make-job.py", example});
-    ASSERT_EQ(made.exitCode, 0) << made.error;
-    answer({"import", example + "/tickets.json"});
-    answer({"file", "put", example + "/server", "/server"});
-    EXPECT_THAT(answer({"jobs"}), HasSubstr("waiting"));
-    const auto strip = answer({"file", "get", "/server/ControlCharts/example.it8", "-"});
-    EXPECT_EQ(strip.find("DEVICE"), strip.find("DEVICE 33\r\n"));
-    // The published values of the solid cyan of FOGRA39.
-    EXPECT_EQ(answer({"key", "get", "job/7", "Remote/Measurement/Reference/LabValues/BValues",
-                      "--position", "5"}),
-              "-50.0\n");
-    EXPECT_EQ(answer({"key", "get", "job/7", "Remote/Measurement/Reference/CMYKValues/CValues",
-                      "--position", "5"}),
-              "255\n");
 }
 
 /// The fixture's store is a folder, and there is a database for a copy of it.
 class StoreCopy : public TintgateStore {
   protected:
-    std::string answerOf(const std::string& address, std::vector<std::string> arguments) const {
-        arguments.insert(arguments.begin(), {"--store", address});
-        return answer(arguments);
-    }
-
-    /// All that a store holds, as its own tool shows it.
-    std::string allOf(const std::string& address) const {
-        std::string text = answerOf(address, {"export"}) + answerOf(address, {"user", "list"});
-        const auto engine = store::openStore(address);
-        for (const auto& user : engine->users()) {
-            text += user.name + user.passwordHash + (user.disabled ? "-" : "+") + "\n";
-        }
-        std::ostringstream contents;
-        for (const auto& file : engine->files()) {
-            contents << file.path << ' ' << file.size << ' ' << file.time << '\n';
-            engine->getFile(file.path, contents);
-            for (const auto& version : engine->versions(file.path)) {
-                contents << version.number << ' ' << version.size << ' ' << version.time << '\n';
-                engine->getVersion(file.path, version.number, contents);
-            }
-        }
-        for (const auto& [type, id] : engine->highestIds()) {
-            contents << type << ' ' << id << '\n';
-        }
-        return text + contents.str();
-    }
-
-    void fill(int files) const {
+    StoreCopy() {
         makeTicket(3, 7, awkwardContent());
-        makeTicket(49, 0xFFFFFF, {});
-        makeTicket(3, 90, {});
-        answer({"ticket", "delete", "3/90"});
         const auto engine = open();
+        engine->create(49, 0xFFFFFF);
+        engine->create(3, 90);
+        engine->remove(3, 90);
         engine->putUser({"J\xF6rg", store::passwordHash("x"), true});
-        engine->putUser({"anna", store::passwordHash("y"), false});
-        for (int i = 0; i < files; ++i) {
+        for (int i = 0; i < 200; ++i) {
             // Not by way of the store, where each would wait for the disk.
             const std::string name = "store/files/" + std::to_string(i % 10) + "-\xFF";
             m_folder.makeFolder(name);
-            const std::string path =
-                m_folder.write(name + "/" + std::to_string(i),
-                               std::string(static_cast<std::size_t>(i) * 37, 'x') + "\n");
-            std::filesystem::last_write_time(path, std::filesystem::file_time_type::clock::now() -
-                                                       std::chrono::hours(i));
+            m_folder.write(name + "/" + std::to_string(i), std::string(i * 37U, 'x'));
         }
         for (const std::string content : {"one", "", "three", "four"}) {
             std::istringstream from(content);
             engine->putFile("jobs/7.jdf", from);
         }
         engine->pruneVersions("jobs/7.jdf", 2); // So that they do not start at 1.
-        engine->restoreVersion("jobs/7.jdf", 2);
+    }
+
+    std::string answerOf(const std::string& address, std::vector<std::string> arguments) const {
+        arguments.insert(arguments.begin(), {"--store", address});
+        return answer(arguments);
+    }
+
+    /// All that a store holds.
+    std::string allOf(const std::string& address) const {
+        const auto engine = store::openStore(address);
+        std::ostringstream text;
+        text << answerOf(address, {"export"});
+        for (const auto& user : engine->users()) {
+            text << user.name << user.passwordHash << user.disabled << '\n';
+        }
+        for (const auto& file : engine->files()) {
+            text << file.path << ' ' << file.size << ' ' << file.time << '\n';
+            engine->getFile(file.path, text);
+            for (const auto& version : engine->versions(file.path)) {
+                text << version.number << ' ' << version.size << ' ' << version.time << '\n';
+                engine->getVersion(file.path, version.number, text);
+            }
+        }
+        return text.str();
     }
 
     const support::PostgresRoom room;
@@ -620,25 +458,20 @@ class StoreCopy : public TintgateStore {
 };
 
 TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
-    fill(1'000);
     const std::string before = allOf(m_address);
-    EXPECT_THAT(answer({"copy", m_address, "room"}),
-                HasSubstr("3 tickets, 1001 files and 2 users"));
+    EXPECT_THAT(answer({"copy", m_address, "room"}), HasSubstr("3 tickets, 201 files and 1 user"));
     EXPECT_TRUE(allOf("room") == before);
     answer({"copy", "room", back});
     EXPECT_TRUE(allOf(back) == before);
     for (const std::string& address : {m_address, std::string("room"), back}) {
         EXPECT_EQ(answerOf(address, {"ticket", "create", "job"}), "job/91\n");
     }
-
     expectRefusal({"copy", m_address, "room"}, 2, "already");
-    expectRefusal({"copy", "room", m_address}, 2, "exists");
     expectRefusal({"copy", m_folder.path("none"), m_folder.path("new")}, 4, "none");
     EXPECT_FALSE(support::exists(m_folder.path("new")));
 }
 
 TEST_F(StoreCopy, OneThatWasBrokenOffIsNoStoreAndIsFinishedByTheNext) {
-    fill(200);
     const std::string before = allOf(m_address);
     const std::pair<std::string, std::string> ways[] = {{m_address, "room"}, {"room", back}};
     for (const auto& [from, to] : ways) {
@@ -650,7 +483,7 @@ TEST_F(StoreCopy, OneThatWasBrokenOffIsNoStoreAndIsFinishedByTheNext) {
                 break;
             }
             ++brokenOff;
-            expectRefusal({"--store", to, "info"}, 4, "");
+            expectRefusal({"--store", to, "info"}, 4);
             // Something that has gone by the time of the next.
             try {
                 store::openCopy(to)->create(3, 5);
