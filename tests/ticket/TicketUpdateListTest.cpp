@@ -1,5 +1,3 @@
-#include "ticket/TicketUpdateList.h"
-
 #include <gtest/gtest.h>
 
 #include "Server.h"
@@ -8,36 +6,26 @@ namespace {
 
 constexpr int id = 12;
 
+using Entries = std::map<TICKET_TYPE_ID, TICKET_UPDATE_LIST::ENTRY>;
+
+/// What a list has for a ticket, as a walk shows it.
+std::string entryText(const Entries& entries, int type, int ticket) {
+    const auto found = entries.find(TICKET_TYPE_ID(type, ticket));
+    return found == entries.end() ? "none" : support::ticketText(found->second.ticket);
+}
+
 class UpdateList : public testing::Test {
   protected:
-    UpdateList()
-        : m_engine(std::make_shared<store::MemoryKeep>()), record(*m_engine.access()),
-          list(&record) {
-        hSTicketInstance = store::ticketFactory();
-        m_engine.createWithKeys(jobs, id, nullptr);
-        support::RecordTable table("a=1,2,3,4 s[-1]='old s[1]='older d[-1]=0.5 u[-1]=u9");
-        m_engine.apply(jobs, id, table.records());
-        TICKET_UPDATE_LIST::nextID = -9999;
+    UpdateList() : list(&server.record) {
+        server.create(id, "a=1,2,3,4 s[-1]='old s[1]='older d[-1]=0.5 u[-1]=u9");
         takeUpdateLog();
     }
-    ~UpdateList() override { TICKET_UPDATE_LIST::nextID = -9999; }
 
-    bool set(const char* key, int value, int position = POSITION_WHOLE) {
-        return list.xSetParameter(jobs, id, key, PARAM_INT, &value, position, true);
-    }
-    template<class T>
-    std::vector<T> deleted(const char* key) {
-        std::vector<T> values;
-        list.xGetDeletedVectorParameter(jobs, id, key, values);
-        return values;
-    }
-
-    store::TicketContainer m_engine;
-    MTICKET_ACCESS record;
+    Server server;
     TICKET_UPDATE_LIST list;
 };
 
-TEST_F(UpdateList, TakesRealVirtualAndLocalAddresses) {
+TEST(UpdateListAddress, IsRealVirtualOrLocal) {
     struct Case {
         int type, id;
         bool valid;
@@ -45,7 +33,7 @@ TEST_F(UpdateList, TakesRealVirtualAndLocalAddresses) {
     };
     const Case cases[] = {
         {49, 16777215, true, 49}, {50, 0, false, 50},      {1000, 0, true, 1000},
-        {51, 0, false, 51},       {3, 16777216, false, 3}, {3, -1, false, 3},
+        {-1, 0, false, -1},       {3, 16777216, false, 3}, {3, -1, false, 3},
         {3, -4, true, 3},         {3, -2000, true, 3},     {50, -9999, true, -1},
         {1000, -2000, true, -1},  {3, -1999, false, 3},    {3, -10000, false, 3},
     };
@@ -55,164 +43,131 @@ TEST_F(UpdateList, TakesRealVirtualAndLocalAddresses) {
         EXPECT_EQ(TICKET_UPDATE_LIST::TicketValid(type, c.id), c.valid);
         EXPECT_EQ(type, c.filedUnder);
     }
-
-    EXPECT_EQ(TICKET_UPDATE_LIST::NextTicketID(), -9999);
     TICKET_UPDATE_LIST::nextID = -2001;
-    EXPECT_EQ(TICKET_UPDATE_LIST::NextTicketID(), -2001);
-    EXPECT_EQ(TICKET_UPDATE_LIST::NextTicketID(), -2000);
-    EXPECT_EQ(TICKET_UPDATE_LIST::NextTicketID(), -9999);
-
-    list.DelParameter(50, -9000, "k", -1, false);
-    set("a", 1);
-    std::vector<TICKET_TYPE_ID> tickets(1, TICKET_TYPE_ID(0, 0));
-    list.GetChangedTickets(tickets);
-    ASSERT_EQ(tickets.size(), 3u);
-    EXPECT_EQ(tickets[1].type, -1);
-    EXPECT_EQ(tickets[2].id, id);
+    for (const int next : {-2001, -2000, -9999}) {
+        EXPECT_EQ(TICKET_UPDATE_LIST::NextTicketID(), next);
+    }
 }
 
 TEST_F(UpdateList, OverlaysTheServersValues) {
-    int value = 7;
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, -1), 0);
-    EXPECT_TRUE(list.IsEmpty(jobs, id));
-
-    EXPECT_TRUE(set("a", 9));
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, -1), 1);
-    EXPECT_EQ(value, 9);
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, -1), 0);
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, 1), 0);
-    EXPECT_TRUE(list.ParameterExists(jobs, id, "a"));
-    EXPECT_FALSE(list.ParameterExists(jobs, id, nullptr));
-
-    EXPECT_TRUE(list.DelParameter(jobs, id, "a", -1, false));
-    std::vector<int> values(1, 5);
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, -1), 2);
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, -1), 2);
+    struct Case {
+        const char* edits;
+        int position;
+        int found, value;
+        bool changed;
+    };
+    const Case cases[] = {
+        {"", -1, 0, 7, false},
+        {"a[-1]=9", -1, 1, 9, true},
+        {"a[-1]=9", 1, 0, 7, true},
+        {"a[-1]=-", -1, 2, 7, true},
+        {"a[-1]=- a[-1]=3", -1, 1, 3, true},
+        {"a[-1]=- a[-1]=3", 1, 0, 7, true}, // No longer deleted.
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(std::string(c.edits) + " " + std::to_string(c.position));
+        list.Clear();
+        edit(list, jobs, id, c.edits);
+        int value = 7;
+        EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, c.position), c.found);
+        EXPECT_EQ(value, c.value);
+        // Without a place nothing is found, but a deletion is told of.
+        EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, c.position),
+                  c.found == 2 ? 2 : 0);
+        EXPECT_EQ(list.ParameterExists(jobs, id, "a"), c.changed && c.found != 2);
+        EXPECT_EQ(list.ParameterChanged(jobs, id, "a"), c.changed);
+        std::set<std::string> keys;
+        EXPECT_EQ(list.GetChangedKeysList(jobs, id, keys), c.changed);
+        EXPECT_EQ(keys.count("a"), c.changed ? 1u : 0u);
+    }
+    list.Clear();
+    edit(list, jobs, id, "a[-1]=-");
+    std::vector<int> values{5};
     EXPECT_EQ(list.xGetVectorParameter(jobs, id, "a", values), 1); // And nothing was read.
-    EXPECT_EQ(values, std::vector<int>(1, 5));
-    EXPECT_TRUE(list.ParameterChanged(jobs, id, "a"));
-
-    EXPECT_TRUE(set("a", 3));
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, -1), 1);
-    EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, 1), 0); // No longer deleted.
-    std::set<std::string> keys;
-    EXPECT_TRUE(list.GetChangedKeysList(jobs, id, keys));
-    EXPECT_EQ(keys, std::set<std::string>{"a"});
-    EXPECT_FALSE(list.GetChangedKeysList(jobs, 13, keys));
-    EXPECT_EQ(keys.size(), 1u);
+    EXPECT_EQ(values, std::vector<int>{5});
 }
 
-TEST_F(UpdateList, FetchesTheOriginalVectorOnce) {
-    set("d", 1); // The key as a whole needs no original.
-    EXPECT_EQ(takeUpdateLog(), "(3, 12) d[-1] <1>\n");
-    set("a", 9, 3);
-    EXPECT_EQ(takeUpdateLog(), "(3, 12) a[3] <9> (got original vector)\n");
-    set("a", 8, 4);
-    EXPECT_EQ(takeUpdateLog(), "(3, 12) a[4] <8>\n");
+TEST_F(UpdateList, PutsAnElementAmongTheOriginalOnesAndKeepsWhatIsDeleted) {
+    TICKET_UPDATE_LIST lone(nullptr);
+    struct Case {
+        TICKET_UPDATE_LIST& list;
+        int type, id;
+        const char *edits, *pending, *kept;
+    };
+    const Case cases[] = {
+        {list, jobs, id, "a[-1]=9", "a[0]=9", "none"}, // Whole, it needs no original.
+        {list, jobs, id, "a[3]=9 a[4]=8", "a[0]=1 a[1]=2 a[2]=3 a[3]=9 a[4]=8", "none"},
+        {list, jobs, id, "a[2]=- a[1]=-", "a[0]=1 a[1]=4", "a[0]=3 a[1]=2"},
+        {list, jobs, id, "a[2]=- a[-1]=-", "", "a[0]=1"}, // In place of what was kept.
+        {list, jobs, id, "s[-1]=- d[-1]=- u[-1]=-", "", "d[0]=0.5 s[0]='old"},
+        // Nowhere else there is an original.
+        {list, jobs, 13, "a[0]=9 a[-1]=-", "", ""},
+        {list, jobs, -9000, "a[0]=9", "a[0]=9", "none"},
+        {list, TICKET_TYPE_LOCAL, id, "a[0]=9", "a[0]=9", "none"},
+        {lone, jobs, id, "a[0]=9 s[-1]=-", "a[0]=9", ""},
+    };
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.edits);
+        c.list.Clear();
+        EXPECT_TRUE(edit(c.list, c.type, c.id, c.edits));
+        EXPECT_EQ(entryText(c.list.m_changed, c.type, c.id), c.pending);
+        EXPECT_EQ(entryText(c.list.m_toDelete, c.type, c.id), c.kept);
+    }
+    edit(list, jobs, id, "a[0]=-");
     std::vector<int> values;
-    EXPECT_EQ(list.xGetVectorParameter(jobs, id, "a", values), 1);
-    EXPECT_EQ(values, (std::vector<int>{1, 2, 3, 9, 8}));
-    // Virtual ids and local tickets have no original.
-    const int value = 1;
-    EXPECT_TRUE(list.xSetParameter(jobs, -9000, "a", PARAM_INT, &value, 0, false));
-    EXPECT_TRUE(list.xSetParameter(1000, id, "a", PARAM_INT, &value, 0, false));
-    EXPECT_EQ(takeUpdateLog(), "(3, -9000) a[0] <1>\n(1000, 12) a[0] <1>\n");
+    EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "a", values), 1);
+    EXPECT_EQ(values, std::vector<int>{1});
+    EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "other", values), 1);
+    EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, 13, "a", values), 0);
 }
 
-TEST_F(UpdateList, KeepsWhatDeletionsTakeAway) {
-    list.DelParameter(jobs, id, "a", 2, false);
-    list.DelParameter(jobs, id, "a", 1, false);
-    list.DelParameter(jobs, id, "s", -1, false);
-    list.DelParameter(jobs, id, "d", -1, false);
-    list.DelParameter(jobs, id, "u", -1, false);
-    EXPECT_EQ(deleted<int>("a"), (std::vector<int>{3, 2}));
-    EXPECT_EQ(deleted<std::string>("s"), std::vector<std::string>{"old"});
-    EXPECT_EQ(deleted<double>("d"), std::vector<double>{0.5});
-
-    std::vector<int> none;
-    EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "u", none), 1); // Of another type.
-    EXPECT_TRUE(none.empty());
-    EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, 13, "a", none), 0);
-    list.DelParameter(jobs, id, "a", -1, false); // As a whole, in place of what was kept.
-    EXPECT_EQ(deleted<int>("a"), std::vector<int>{1});
-
-    // Both maps had the ticket, so the flag follows the kept values alone.
-    const int value = 1;
-    list.xSetParameter(jobs, 13, "k", PARAM_INT, &value, -1, false);
+TEST_F(UpdateList, CountsAsEmptyByKeptValuesAlone) {
+    edit(list, jobs, id, "a[-1]=-");
+    edit(list, jobs, 13, "k[-1]=1");
     EXPECT_TRUE(list.Clear(jobs, id));
-    EXPECT_TRUE(list.m_empty);
-    EXPECT_FALSE(list.IsEmpty(jobs, 13));
-    list.xSetParameter(jobs, 14, "k", PARAM_INT, &value, -1, false);
-    EXPECT_FALSE(list.Clear(jobs, 13));
+    EXPECT_TRUE(list.m_empty && !list.IsEmpty(jobs, 13));
+    edit(list, jobs, 14, "k[-1]=1");
+    EXPECT_FALSE(list.Clear(jobs, 13)); // Nothing was kept for it, so that changes count.
     EXPECT_FALSE(list.m_empty);
     EXPECT_FALSE(list.Clear(jobs, 14));
     EXPECT_TRUE(list.m_empty);
-    list.DelParameter(jobs, id, "a", -1, false);
-    list.Clear();
-    EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "a", none), 0);
-}
-
-TEST_F(UpdateList, ToleratesAMissingContainer) {
-    TICKET_UPDATE_LIST lone(nullptr);
-    EXPECT_TRUE(lone.DelParameter(jobs, id, "a", -1, false));
-    const int value = 1;
-    EXPECT_TRUE(lone.xSetParameter(jobs, id, "a", PARAM_INT, &value, 0, false));
-    std::vector<int> values;
-    EXPECT_EQ(lone.xGetDeletedVectorParameter(jobs, id, "a", values), 1);
-    EXPECT_TRUE(values.empty());
 }
 
 TEST_F(UpdateList, TellsOfEachChange) {
-    list.AddParameter(jobs, id, "n", "replaced", false);
     std::string told;
     list.RegisterSetParamCallback(
         [&](int type, int ticket, const char* key, PARAM_TYPE ptype, const void* value) {
             told += std::to_string(type) + "/" + std::to_string(ticket) + " " + key + " " +
                     std::to_string(ptype) + " " + support::valueText(ptype, value) + ";";
         });
-    set("a", 1);
-    list.AddParameter(jobs, id, "s", "\x80", true);          // MacRoman: told as UTF-8.
+    list.AddParameter(jobs, id, "m", "\x80", true);          // MacRoman: told as UTF-8.
     EXPECT_FALSE(list.DelParameter(jobs, id, "a", 7, true)); // Refused, and told of.
-    const std::string log = takeUpdateLog();
-    EXPECT_NE(log.find("a[7] <DEL> FAILED\n"), std::string::npos) << log;
-    list.SetFilenameVectorParameter(jobs, id, "n", {"a\\b", "c"}); // Once, not for its parts.
-    list.SetVectorParameter(jobs, id, "s", std::vector<std::string>());
-    EXPECT_EQ(told, "3/12 a 2 1;3/12 s 4 '\xC3\x84;3/12 a 0 -;3/12 n 6 null;3/12 s 6 null;");
-    std::vector<std::string> names;
-    EXPECT_EQ(list.xGetVectorParameter(jobs, id, "n", names), 1);
-    EXPECT_EQ(names, (std::vector<std::string>{"a/b", "c"}));
+    EXPECT_NE(takeUpdateLog().find("a[7] <DEL> (got original vector) FAILED\n"), std::string::npos);
+    list.SetFilenameVectorParameter(jobs, id, "n", {"a\\b", "\x80"}); // Once, not for its parts.
+    EXPECT_EQ(told, "3/12 m 4 '\xC3\x84;3/12 a 0 -;3/12 n 6 null;");
+    EXPECT_EQ(entryText(list.m_changed, jobs, id).substr(28),
+              "m[0]='\xC3\x84 n[0]='a/b n[1]='\xC3\x84");
 
-    // A converted text that was handed out stays at its place.
-    const char* first = nullptr;
-    const char* again = nullptr;
-    list.xGetParameter(jobs, id, "n", PARAM_STRING, &first, 1);
-    list.AddParameter(jobs, id, "m", "c", false);
-    list.xGetParameter(jobs, id, "m", PARAM_STRING, &again, -1);
-    EXPECT_EQ(first, again);
-    EXPECT_TRUE(list.m_stringCache.find("c"));
+    // A text that was handed out lives as long as the list.
+    const char* text = nullptr;
+    EXPECT_EQ(list.xGetParameter(jobs, id, "n", PARAM_STRING, &text, 1), 1);
+    list.Clear();
+    EXPECT_STREQ(text, "\xC3\x84");
 }
 
 TEST_F(UpdateList, RefusesWithoutATrace) {
-    const auto untranslatable = [](void*, std::string&, const char*) { return 2; };
-    list.m_translate = untranslatable;
-    EXPECT_FALSE(list.xSetParameter(jobs, id, "s", PARAM_STRING, "x", -1, false));
-    EXPECT_EQ(takeUpdateLog(), "(3, 12) s[-1] <x> UNTRANSLATEABLE\n");
-    EXPECT_TRUE(list.m_changed.empty());
-    list.m_translate = nullptr;
-    EXPECT_TRUE(list.xSetParameter(jobs, id, "s", PARAM_STRING, "x", -1, false));
-    takeUpdateLog();
-
-    const int value = 1;
-    EXPECT_FALSE(list.xSetParameter(51, id, "a", PARAM_INT, &value, -1, false));
-    EXPECT_FALSE(list.xSetParameter(jobs, 13, nullptr, PARAM_INT, &value, 0, false));
-    EXPECT_EQ(takeUpdateLog(), "(51, 12) a[-1] <1> INVALID\n(3, 13) (NULL)[0] <1> INVALID\n");
-    EXPECT_EQ(list.m_changed.count(TICKET_TYPE_ID(jobs, 13)), 1u); // The entry is there, and empty.
-    EXPECT_TRUE(list.IsEmpty(jobs, 13));
-
+    list.m_translate = [](void*, std::string&, const char*) { return 2; };
+    EXPECT_FALSE(edit(list, jobs, id, "s[-1]='x"));
+    EXPECT_FALSE(edit(list, 51, id, "a[-1]=1"));
+    EXPECT_FALSE(list.xSetParameter(1000, id, nullptr, PARAM_DELETE, nullptr, 0, false));
+    EXPECT_EQ(takeUpdateLog(), "(3, 12) s[-1] <x> UNTRANSLATEABLE\n"
+                               "(51, 12) a[-1] <1> INVALID\n"
+                               "(1000, 12) (NULL)[0] <DEL> INVALID\n");
     const auto* factory = std::exchange(hSTicketInstance, nullptr);
-    EXPECT_FALSE(list.xSetParameter(jobs, 14, "a", PARAM_INT, &value, -1, false));
+    EXPECT_FALSE(edit(list, jobs, 14, "a[-1]=1"));
     hSTicketInstance = factory;
-    EXPECT_EQ(list.m_changed.count(TICKET_TYPE_ID(jobs, 14)), 0u);
+    EXPECT_TRUE(list.IsEmpty(1000, id));
+    EXPECT_EQ(list.m_changed.size(), 1u); // That of the null key, which is empty.
     // A numeric type without a value is a deletion, which the work ticket refuses as such.
     EXPECT_FALSE(list.xSetParameter(jobs, id, "a", PARAM_INT, nullptr, -1, false));
     EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, -1), 2);
@@ -220,36 +175,21 @@ TEST_F(UpdateList, RefusesWithoutATrace) {
 
 TEST_F(UpdateList, MergesATicketAsItIsWalked) {
     const WorkTicket source;
-    for (const char* key : {"ab", "abc", "b"}) {
-        const int value = 1;
-        source.view().xSetParameter(key, PARAM_INT, &value, -1);
-    }
-    struct Case {
-        std::vector<const char*> keys;
-        std::set<std::string> taken;
-    };
-    const Case cases[] = {
-        {{nullptr}, {"ab", "abc", "b"}},
-        {{"ab*", nullptr}, {"ab", "abc"}},
-        {{"b", nullptr}, {"b"}},
-        {{"", nullptr}, {}},
-    };
-    for (const Case& c : cases) {
-        list.Clear();
-        list.Merge(jobs, 13, source.real(), c.keys.data());
-        std::set<std::string> taken;
-        list.GetChangedKeysList(jobs, 13, taken);
-        EXPECT_EQ(taken, c.taken) << c.keys[0];
-    }
-    list.Clear();
+    source.view().SetMultiParameter(support::RecordTable("ab[-1]=1 abc[-1]=2 b[-1]=3").records());
+    const std::string all = "ab[0]=1 abc[0]=2 b[0]=3";
+    const std::pair<std::vector<const char*>, std::string> cases[] = {
+        {{nullptr}, all}, {{"ab*", nullptr}, "ab[0]=1 abc[0]=2"}, {{"", nullptr}, "none"}};
     int told = 0;
     list.RegisterSetParamCallback([&](int, int, const char*, PARAM_TYPE, const void*) { ++told; });
+    for (const auto& [keys, taken] : cases) {
+        list.Clear();
+        list.Merge(jobs, 13, source.real(), keys.data());
+        list.Merge(jobs, 13, nullptr, keys.data());
+        EXPECT_EQ(entryText(list.m_changed, jobs, 13), taken);
+    }
+    EXPECT_EQ(told, 5);
     list.Merge(jobs, 13, source.real(), PARTIAL_MODE());
-    EXPECT_EQ(told, 3);
-    list.Merge(jobs, 13, nullptr, PARTIAL_MODE());
-    std::set<std::string> taken;
-    list.GetChangedKeysList(jobs, 13, taken);
-    EXPECT_EQ(taken.size(), 3u);
+    EXPECT_EQ(entryText(list.m_changed, jobs, 13), all);
 }
 
 } // namespace
