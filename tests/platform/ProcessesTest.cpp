@@ -54,9 +54,9 @@ TEST(Processes, AreNamedAfterTheirBundle) {
 
 TEST(Processes, AreThoseThatRunBelowTheRoot) {
     const support::SuiteRoot root;
-    const RunningProgram first(root.copyProgram("/bin/sleep", "First.app/run"));
+    const RunningProgram first(root.copyProgram("/bin/sleep", "bin/First"));
     const RunningProgram second(root.copyProgram("/bin/sleep", "Second.app/run"));
-    std::filesystem::remove(root.path("First.app/run")); // Replaced while it runs.
+    std::filesystem::remove(root.path("bin/First")); // Replaced while it runs.
     EXPECT_EQ(runningNames(), (Names{u"First", u"Second"}));
     std::filesystem::create_directory_symlink(root.path(), root.path("link"));
     setenv("TINTGATE_ROOT", root.path("link/").c_str(), 1);
