@@ -28,25 +28,17 @@ std::string tableOf(const PARTIAL_MODE& mode) {
 
 TEST(PartialMode, KeepsOnePrefixOfAFamilyAndFiltersByIt) {
     struct Case {
-        const char* script;
-        const char* table;
-        const char* hits;
-        const char* misses;
+        const char *script, *table, *hits, *misses;
     };
     const Case cases[] = {
-        {"", "null", "", "a"},
-        {"+ab* +abc*", "ab*", "ab abc abd", "a aB AB b"},
-        {"+abc* +ab*", "ab*", "ab abc abd", "a"},
+        {"+abc* +ab* +abd*", "ab*", "ab abc abd", "a aB AB b"},
         {"+abc* +abd* +ab*", "abd*", "abd abdx", "ab abc"}, // the first alone gives way
-        {"+abc* +abd* +*", "abd*", "abd", "abc x"},
         {"+x* +*", "*", "x anything", ""},
-        {"+* +x*", "*", "x anything", ""},
         {"+* -x*", "null", "", "x"}, // the empty prefix is what `x` begins with
         {"+ab* -abc*", "null", "", "ab"},
         {"+ab* -a* -ab", "ab*", "ab abc", "a"},
         {"+abc +ab* -ab*", "abc", "abc", "ab abcd"},
-        {"+ab**", "ab**", "ab* ab*c", "ab abc"},
-        {"+a*b", "a*b", "a*b", "ab a*bc axb"},
+        {"+ab** +a*b", "a*b ab**", "a*b ab* ab*c", "ab a*bc axb"},
         {"+ab* +A +c* +abc", "A ab* abc c*", "A abc cd", "B Ab"},
         {"+\xC3\xA4* +z*", "z* \xC3\xA4*", "\xC3\xA4x z", "\xC3"}, // bytes order unsigned
     };
@@ -55,14 +47,12 @@ TEST(PartialMode, KeepsOnePrefixOfAFamilyAndFiltersByIt) {
         const PARTIAL_MODE mode = modeOf(c.script);
         EXPECT_EQ(tableOf(mode), c.table);
         EXPECT_EQ(mode.partial(), std::string(c.table) != "null");
-        std::string key;
-        for (std::istringstream hits(c.hits); hits >> key;) {
-            EXPECT_TRUE(mode.multi_contains(key)) << key;
+        for (const bool hit : {true, false}) {
+            std::istringstream keys(hit ? c.hits : c.misses);
+            for (std::string key; keys >> key;) {
+                EXPECT_EQ(mode.multi_contains(key), hit) << key;
+            }
         }
-        for (std::istringstream misses(c.misses); misses >> key;) {
-            EXPECT_FALSE(mode.multi_contains(key)) << key;
-        }
-        EXPECT_EQ(mode.multi_contains(""), std::string(c.table) == "*");
     }
 }
 
@@ -80,12 +70,9 @@ TEST(PartialMode, TakesTablesAndSetsOfKeys) {
     EXPECT_EQ(after(less), "y");
     EXPECT_EQ(after(nothing), "ab* x y");
     EXPECT_EQ(after(nullptr), "null");
-    EXPECT_EQ(after(keys, false), "ab* x y");
     EXPECT_EQ(after(keys, true), "y");
-    EXPECT_EQ(after(std::set<std::string>(), false), "null");
     EXPECT_EQ(after(std::set<std::string>(), true), "null");
     EXPECT_EQ(tableOf(PARTIAL_MODE(nullptr)), "null");
-    EXPECT_EQ(tableOf(PARTIAL_MODE(more)), "c d*");
 }
 
 } // namespace
