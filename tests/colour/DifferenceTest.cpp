@@ -25,20 +25,22 @@ TEST(Difference, Ciede2000GivesThePublishedPairsBothWays) {
 }
 
 TEST(Difference, OtherFormulasGiveThePublishedFigures) {
-    const Lab target{0.9, 16.3, -2.22};
-    const Lab measured{0.7, 14.2, -1.80};
+    const Lab near[] = {{0.9, 16.3, -2.22}, {0.7, 14.2, -1.80}};
+    const Lab far[] = {{100, 21.57210357, 272.22819350}, {100, 426.67945353, 72.39590835}};
     const struct {
         int number;
         const char* name;
+        const Lab* pair;
         double expected;
     } cases[] = {
-        {0, "CIE76", 2.151},      {1, "CIE76", 2.151},  {6, "CIE76", 2.151}, {-1, "CIE76", 2.151},
-        {5, "CIECMC_2_1", 1.443}, {2, "CIECMC", 1.482}, {3, "CIE94", 1.249},
+        {0, "CIE76", near, 2.151},      {1, "CIE76", near, 2.151},  {6, "CIE76", near, 2.151},
+        {-1, "CIE76", near, 2.151},     {2, "CIECMC", near, 1.482}, {3, "CIE94", near, 1.249},
+        {5, "CIECMC_2_1", near, 1.443}, {3, "CIE94", far, 83.7792},
     };
-    for (const auto& [number, name, expected] : cases) {
+    for (const auto& [number, name, pair, expected] : cases) {
         const Formula formula = formulaFromNumber(number);
         EXPECT_STREQ(formulaName(formula), name);
-        EXPECT_NEAR(difference(formula, target, measured), expected, 0.0005) << number;
+        EXPECT_NEAR(difference(formula, pair[0], pair[1]), expected, 0.0005) << number;
     }
     EXPECT_STREQ(formulaName(formulaFromNumber(4)), "CIE2000");
 }
