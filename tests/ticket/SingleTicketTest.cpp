@@ -1,31 +1,24 @@
 #include "ticket/SingleTicket.h"
 
+#include <climits>
+
 #include <gtest/gtest.h>
 
 #include "RealTickets.h"
+#include "TicketText.h"
 
 namespace {
 
-TEST(TicketFactory, WithoutAPlugInThereAreNoTickets) {
-    hSTicketInstance = nullptr;
-    EXPECT_EQ(CreateTicket(nullptr), nullptr);
-    STICKET_ACCESS record{};
-    const STICKET_ACCESS* pointer = &record;
-    DestroyTicket(pointer);
-    EXPECT_EQ(pointer, &record);
+void fill(const WorkTicket& ticket, const std::string& content) {
+    EXPECT_TRUE(ticket.view().SetMultiParameter(support::RecordTable(content).records()));
 }
 
 TEST(SingleTicket, FindsTheFirstEqualElement) {
     const WorkTicket work;
     const STICKET_MODIFY& view = work.view();
-    const int scalar = 9;
-    const double gap = 0;
-    view.SetVectorParameter("numbers", std::vector<int>{4, 5, 5, 6});
-    view.xSetParameter("numbers", PARAM_DOUBLE, &gap, 2); // ends the search
-    view.xSetParameter("scalar", PARAM_INT, &scalar, POSITION_WHOLE);
-    view.SetVectorParameter("texts", std::vector<std::string>{"a", "ab", "b"});
+    fill(work, "numbers=4,5,5,0.5,6 scalar[-1]=9 texts='a,'ab,'b");
     EXPECT_EQ(view.FindParameterPosition<int>("numbers", 5), 1);
-    EXPECT_EQ(view.FindParameterPosition<int>("numbers", 6), -1);
+    EXPECT_EQ(view.FindParameterPosition<int>("numbers", 6), -1); // Behind what is no integer.
     EXPECT_EQ(view.FindParameterPosition<int>("scalar", 9), 0);
     EXPECT_EQ(view.FindParameterPosition<std::string>("texts", "ab"), 1);
     EXPECT_EQ(view.FindParameterPosition<std::string>("texts", ""), -1);
@@ -35,28 +28,73 @@ TEST(SingleTicket, FindsTheFirstEqualElement) {
 TEST(SingleTicket, TransfersReplaceOrOverlay) {
     const WorkTicket source;
     const WorkTicket target;
-    source.view().SetVectorParameter("a/1", std::vector<int>{1});
-    source.view().SetVectorParameter("b", std::vector<int>{2});
-    target.view().SetVectorParameter("old", std::vector<int>{0});
+    fill(source, "a/1[-1]=1 b[-1]=2");
+    fill(target, "old[-1]=0");
     const char* const keys[] = {"a*", nullptr};
-    const auto has = [&](const char* key) { return target.view().ParameterExists(key, 0); };
     EXPECT_TRUE(target.view().Merge(source.real(), keys));
-    EXPECT_TRUE(has("old") && has("a/1") && !has("b"));
+    EXPECT_EQ(support::ticketText(target.real()), "a/1[0]=1 old[0]=0");
     EXPECT_TRUE(target.view().Assign(source.real(), nullptr));
-    EXPECT_TRUE(!has("old") && has("a/1") && has("b"));
-    EXPECT_TRUE(target.view().Assign(source.real(), keys));
-    EXPECT_TRUE(has("a/1") && !has("b"));
+    EXPECT_EQ(support::ticketText(target.real()), "a/1[0]=1 b[0]=2");
 }
 
 TEST(SingleTicket, SaysWhereItComesFromOrNothing) {
     STICKET_OPTION_WHOAMI record{&record, 5, 6};
-    const WorkTicket work;
-    EXPECT_FALSE(work.view().WhoAmI(record));
+    EXPECT_FALSE(WorkTicket().view().WhoAmI(record));
     EXPECT_TRUE(record.pointer == nullptr && record.number1 == -1 && record.number2 == -1);
     const TicketInside inside;
     const STICKET_ACCESS* opened = inside.view().OpenTicket(TicketInside::type, TicketInside::id);
     EXPECT_TRUE(ticket::as<STICKET_READ>(*opened).WhoAmI(record));
     EXPECT_EQ(record.number2, TicketInside::id);
+}
+
+TEST(SingleTicket, BearsAFaultyPlugIn) {
+    static int calls;
+    static int answer;
+    static unsigned long count;
+    WorkTicket work;
+    ticket::single::GetParameter::put(
+        work.record, +[](void*, const char*, PARAM_TYPE type, void* out, int) {
+            ++calls;
+            if (type == PARAM_INT) {
+                *static_cast<int*>(out) = 7;
+            } else if (type == PARAM_COUNT) {
+                *static_cast<unsigned long*>(out) = count;
+            }
+            return answer;
+        });
+    // Nothing is put there, and each record says that something was.
+    ticket::single::GetMultiParameter::put(
+        work.record, +[](void*, GETMULTIPAR* table) {
+            ++calls;
+            for (; table->key != nullptr; ++table) {
+                table->result = 0xFF;
+            }
+            return 0;
+        });
+    const STICKET_MODIFY& view = work.view();
+
+    // Of an answer bit 0 counts. A text that is said to be there and is null is missing.
+    answer = 0xFE;
+    EXPECT_EQ(view.GetIntParameter("key", 1), 1);
+    answer = 0x101;
+    EXPECT_EQ(view.GetIntParameter("key", 1), 7);
+    EXPECT_EQ(view.GetStringParameter("key", "fallback"), "fallback");
+
+    // A vector costs two calls, and null texts fall out of it.
+    std::vector<std::string> texts{"former"};
+    count = 1000;
+    calls = 0;
+    EXPECT_FALSE(view.GetVectorParameter("key", texts));
+    EXPECT_TRUE(texts.empty());
+    EXPECT_EQ(calls, 2);
+
+    // Counts that can't be allocate nothing.
+    for (const unsigned long damage : {ULONG_MAX, ULONG_MAX / sizeof(GETMULTIPAR), 1UL << 33}) {
+        count = damage;
+        std::vector<double> vector{0.5};
+        EXPECT_FALSE(view.GetVectorParameter("key", vector));
+        EXPECT_EQ(vector, std::vector<double>{0.5});
+    }
 }
 
 } // namespace
