@@ -70,7 +70,7 @@ class PostgresStop : public testing::Test {
 } // namespace
 
 TEST_F(PostgresStop, EachClientEndsAndAllIsWhole) {
-    const int rounds = roundsOr(8);
+    const int rounds = roundsOr(5);
     store::makeStore("tintgate", "Press room");
     {
         const auto engine = store::openStore("tintgate");

@@ -117,10 +117,11 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
     keep.apply(3, 3, own.records());
     EXPECT_EQ(read(3, status), 9) << "its own writes show in a listing, too";
     for (int i = 0; i < 200; ++i) { // Across overviews that fall due.
-        write(2, i);
+        write(2, i, "Other=" + std::to_string(i));
         if (i % 50 == 0) {
             sql("PRAGMA wal_checkpoint(TRUNCATE)", "SELECT 1");
         }
+        EXPECT_EQ(read(2, "Other"), i);
         EXPECT_EQ(read(2, status), i);
         EXPECT_EQ(read(3, status), 9);
     }
