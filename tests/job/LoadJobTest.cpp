@@ -11,6 +11,7 @@
 
 namespace {
 
+/// What a load gives, by name. Files stand as the server's path that their copy is from.
 using Members = std::map<std::string, std::string>;
 
 /// Every file of the server holds its own path, so that a copy tells where it came from.
@@ -19,7 +20,6 @@ constexpr const char* serverFiles[] = {
     "ControlCharts/abc.it8",
     "ControlCharts/nest.it8",
     "ControlCharts/strip.it8",
-    "ControlCharts/strip2.it8",
     "IT8_CharacterizationData/Fogra_MKCheck10/x_MKCheck10_MKCheck11.it8",
     "IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8",
     "IT8_CharacterizationData/chart.it8",
@@ -39,22 +39,15 @@ constexpr const char* serverFiles[] = {
 constexpr char usualTicket[] =
     "System/InstallFolder='/s Input/Title='Title CMM/PaperName='Paper Workflow/Name='Flow "
     "Footer/Dynstrip/UseDynstrip=0 Footer/ControlstripFile='strip.it8 "
-    "Footer/ControlstripFile2='strip2.it8 Workflow/Verify/MeasurementWorkflow=2 "
-    "Workflow/Verify/CharacterizationData='chart.it8 Workflow/Verify/DeltaEMode=4 "
-    "Workflow/Verify/ComparisonMethod=7 Remote/Measurement/Illumination/Mode=2 "
-    "Remote/Measurement/Status=0 Input/SubType=0 Output/Jdf/FileName='job.jdf "
-    "System/Folders/Temp='/s/jdf Remote/JDFName='/s/jdf//whole.jdf "
+    "Workflow/Verify/MeasurementWorkflow=2 Workflow/Verify/CharacterizationData='chart.it8 "
+    "Workflow/Verify/DeltaEMode=4 Workflow/Verify/ComparisonMethod=7 "
+    "Remote/Measurement/Illumination/Mode=2 Remote/Measurement/Status=0 Input/SubType=0 "
+    "Output/Jdf/FileName='job.jdf System/Folders/Temp='/s/jdf Remote/JDFName='/s/jdf//whole.jdf "
     "Job/Display/Status=0 Remote/ShowInVerifier=0 ";
 
 constexpr char usualPreset[] =
     "Name='Proof Editable=1 ShowInClient=1 UsedForDynamicWedge=1 IlluminationCondition=3 "
     "FograPSDPreset=1 Values/UsedForResult=1,0,1 Values/Preset=1.5,2.5 Values/DecimalPlaces=2";
-
-/// How the outcome of a load that never came to the preset differs.
-constexpr char withoutPreset[] =
-    "tolerance.decimals=0,0 tolerance.file= tolerance.fileName= tolerance.flags=0,0,0 "
-    "tolerance.formula=0 tolerance.id=0 tolerance.illumination=0 tolerance.job=0 tolerance.local= "
-    "tolerance.name= tolerance.used=0,0,0,0 tolerance.values=0,0,0";
 
 class LoadJob : public JobOnStore {
   protected:
@@ -69,80 +62,74 @@ class LoadJob : public JobOnStore {
         m_usual = load(usualTicket);
     }
 
-    void setPreset(const std::string& records) const {
-        engine->remove(27, 7);
-        engine->create(27, 7);
+    void setPreset(const std::string& records, int id = 7) const {
+        engine->remove(27, id);
+        engine->create(27, id);
         store::StoreKeep keep(engine);
-        ASSERT_TRUE(keep.apply(27, 7, support::RecordTable(records).records()));
+        ASSERT_TRUE(keep.apply(27, id, support::RecordTable(records).records()));
     }
 
-    /// A path without the job's folder, which every job has of its own, and where its file is from.
-    std::string shown(const KZJobDataStruct& job, const wxString& path) const {
-        std::string text = path.utf8_string();
-        if (!support::exists(text)) {
-            return path.StartsWith(job.tempDir) ? text.substr(job.tempDir.length()) + "?" : text;
+    /// Where the file at a path of the job's folder is from; for one of our own its name.
+    static std::string shown(const KZJobDataStruct& job, const wxString& path) {
+        if (path.empty() || !path.StartsWith(job.tempDir)) {
+            return path.utf8_string();
         }
-        const std::string contents = support::contentsOf(text);
-        return text.substr(job.tempDir.length()) + "<" + contents.substr(contents.rfind('\n') + 1);
+        const std::string name = path.utf8_string().substr(job.tempDir.length());
+        if (!support::exists(path.utf8_string())) {
+            return name + "?";
+        }
+        const std::string contents = support::contentsOf(path.utf8_string());
+        const std::string source = contents.substr(contents.rfind('\n') + 1);
+        return source.ends_with(name) ? source : name + source;
     }
 
-    Members membersOf(const KZJobDataStruct& job, int code) const {
-        const auto& tolerance = job.tolerance;
-        const auto list = [](const auto& values, int count) {
-            std::string text;
-            for (int i = 0; i < count; ++i) {
-                std::ostringstream value;
-                value << values[i];
-                text += (i == 0 ? "" : ",") + value.str();
-            }
-            return text;
-        };
-        Members members;
-        const auto add = [&](const char* name, const auto& value) {
-            std::ostringstream text;
-            text << value;
-            members[name] = text.str();
-        };
-        add("code", code);
-        add("inline", job.inlineVerifyJob);
-        add("type", job.jobType);
-        add("parent", job.parentID);
-        add("dynstrip", job.useDynstrip);
-        add("device", job.deviceID);
-        add("nested", job.nestedStrip);
-        add("children", list(job.childJobIDs, job.childJobCount));
-        add("tolerance.job", job.presetID);
-        add("workflow", job.measurementWorkflow);
-        add("status", job.measurementStatus);
-        add("illumination", job.illuminationMode);
-        add("title", job.title.utf8_string());
-        add("flow", job.workflowName.utf8_string());
-        add("instrument", job.instrumentName.utf8_string());
-        add("strip", shown(job, job.controlStripFile));
-        add("dynfile", shown(job, job.dynstripFile));
-        add("tolerance.fileName", job.presetFile.utf8_string());
-        add("tolerance.local", shown(job, job.presetLocalFile));
-        add("reference", shown(job, job.referenceFile));
-        add("sample", shown(job, job.sampleFile));
-        add("psd", job.psdAssessment.utf8_string());
-        add("paper", job.paperName.utf8_string());
-        add("jdf", shown(job, job.jdfLocalFile));
-        add("jdfServer", job.jdfServerFile.utf8_string());
-        add("patches", job.measurement.numPatches);
-        add("measured", list(job.measuredValues, 3));
-        add("tolerance.file", shown(job, tolerance.filePath));
-        add("tolerance.id", tolerance.presetID);
-        add("tolerance.name", tolerance.name.utf8_string());
-        add("tolerance.flags", list(std::vector{tolerance.editable, tolerance.showInClient,
-                                                tolerance.usedForDynamicWedge},
-                                    3));
-        add("tolerance.formula", tolerance.deltaEMode);
-        add("tolerance.illumination", tolerance.illuminationCondition);
-        add("tolerance.psd", tolerance.fograPSDPreset);
-        add("tolerance.used", list(tolerance.usedForResult, 4));
-        add("tolerance.values", list(tolerance.presetValues, 3));
-        add("tolerance.decimals", list(tolerance.decimalPlaces, 2));
-        return members;
+    template<class Values>
+    static std::string list(const Values& values, int count) {
+        std::ostringstream text;
+        for (int i = 0; i < count; ++i) {
+            text << (i == 0 ? "" : ",") << values[i];
+        }
+        return text.str();
+    }
+
+    /// Id, name, file, the ticket's four numbers, which entries are used, limits and decimals;
+    /// whether it is of the PSD kind.
+    static std::string presetOf(const KZJobDataStruct& job) {
+        const tolerancePresetParameterRecord& preset = job.tolerance;
+        const int flags[] = {preset.editable, preset.showInClient, preset.usedForDynamicWedge,
+                             preset.illuminationCondition};
+        return std::to_string(job.presetID) + " " + preset.name.utf8_string() + " " +
+               shown(job, preset.filePath) + " " + list(flags, 4) + " " +
+               list(preset.usedForResult, 3) + " " + list(preset.presetValues, 3) + " " +
+               list(preset.decimalPlaces, 2) + " " + std::to_string(preset.fograPSDPreset);
+    }
+
+    static Members membersOf(const KZJobDataStruct& job, int code) {
+        const std::string preset = presetOf(job);
+        return {{"code", std::to_string(code)},
+                {"inline", std::to_string(job.inlineVerifyJob)},
+                {"type", std::to_string(job.jobType)},
+                {"parent", std::to_string(job.parentID)},
+                {"dynstrip", std::to_string(job.useDynstrip)},
+                {"device", std::to_string(job.deviceID)},
+                {"nested", std::to_string(job.nestedStrip)},
+                {"children", list(job.childJobIDs, job.childJobCount)},
+                {"workflow", std::to_string(job.measurementWorkflow)},
+                {"status", std::to_string(job.measurementStatus)},
+                {"mode", std::to_string(job.illuminationMode)},
+                {"title", job.title.utf8_string()},
+                {"flow", job.workflowName.utf8_string()},
+                {"paper", job.paperName.utf8_string()},
+                {"strip", shown(job, job.controlStripFile)},
+                {"dynfile", shown(job, job.dynstripFile)},
+                {"reference", shown(job, job.referenceFile)},
+                {"psd", job.psdAssessment.utf8_string()},
+                {"jdf", shown(job, job.jdfLocalFile)},
+                {"jdfServer", job.jdfServerFile.utf8_string()},
+                {"patches", std::to_string(job.measurement.numPatches)},
+                {"measured", list(job.measuredValues, 3)},
+                {"formula", std::to_string(job.tolerance.deltaEMode)},
+                {"preset", preset == presetOf({}) ? "none" : preset}};
     }
 
     /// Loads a new job with this ticket.
@@ -155,23 +142,30 @@ class LoadJob : public JobOnStore {
         const int code = processor->LoadKZJobData(id, &job);
         EXPECT_EQ(job.jobID, id);
         EXPECT_EQ(job.tempDir.utf8_string(), root.path("work/JobID_" + std::to_string(id)));
+        EXPECT_EQ(job.sampleFile, job.tempDir + "/Measured sample.txt");
+        EXPECT_EQ(job.instrumentName, "Instrument " + std::to_string(job.deviceID));
+        EXPECT_EQ(job.presetLocalFile,
+                  job.presetFile.empty() ? wxString() : job.tempDir + "/" + job.presetFile);
+        EXPECT_TRUE(job.tolerance.presetID == job.presetID || job.presetFile.empty());
         const Members members = membersOf(job, code);
         processor->FreeMeasurementData(job);
         std::free(job.childJobIDs);
         return members;
     }
 
-    /// What a change of the usual ticket changes in the outcome.
-    std::string outcomeOf(const std::string& changes, int secondStrip = 0) {
+    static std::string differences(const Members& before, const Members& members) {
         std::string text;
-        for (const auto& [name, value] : load(usualTicket + changes, secondStrip)) {
-            if (value != m_usual.at(name)) {
+        for (const auto& [name, value] : members) {
+            if (value != before.at(name)) {
                 text += (text.empty() ? "" : " ") + name + "=" + value;
             }
         }
-        const std::size_t at = text.find(withoutPreset);
-        return at == std::string::npos ? text
-                                       : text.replace(at, sizeof withoutPreset - 1, "no preset");
+        return text;
+    }
+
+    /// The members that a change of the usual ticket changes.
+    std::string outcomeOf(const std::string& changes, int secondStrip = 0) {
+        return differences(m_usual, load(usualTicket + changes, secondStrip));
     }
 
     int m_lastJob = 100;
@@ -180,7 +174,7 @@ class LoadJob : public JobOnStore {
 
 struct Case {
     std::string changes;
-    std::string outcome; ///< Members that differ from those of the usual ticket, by name.
+    std::string outcome;
 };
 
 #define EXPECT_OUTCOMES(cases)                                                                     \
@@ -189,217 +183,129 @@ struct Case {
     }
 
 TEST_F(LoadJob, AnUsualJob) {
-    const Members expected = {{"children", ""},
-                              {"code", "0"},
-                              {"device", "33"},
-                              {"dynfile", ""},
-                              {"dynstrip", "0"},
-                              {"flow", "Flow"},
-                              {"illumination", "2"},
-                              {"inline", "0"},
-                              {"instrument", "Instrument 33"},
-                              {"jdf", "/job.jdf</s/jdf/job.jdf"},
-                              {"jdfServer", "/s/jdf/job.jdf"},
-                              {"measured", "0,0,0"},
-                              {"nested", "0"},
-                              {"paper", "Paper"},
-                              {"parent", "0"},
-                              {"patches", "0"},
-                              {"tolerance.fileName", "CVP_0007.xml"},
-                              {"tolerance.job", "7"},
-                              {"tolerance.local", "/CVP_0007.xml</s/tickets/CVP_0007.xml"},
-                              {"psd", ""},
-                              {"reference", "/chart.it8</s/IT8_CharacterizationData/chart.it8"},
-                              {"sample", "/Measured sample.txt?"},
-                              {"status", "0"},
-                              {"strip", "/strip.it8</s/ControlCharts/strip.it8"},
-                              {"title", "Title"},
-                              {"tolerance.decimals", "2,0"},
-                              {"tolerance.file", "/CVP_0007.xml</s/tickets/CVP_0007.xml"},
-                              {"tolerance.flags", "1,1,1"},
-                              {"tolerance.formula", "4"},
-                              {"tolerance.id", "7"},
-                              {"tolerance.illumination", "3"},
-                              {"tolerance.name", "Proof"},
-                              {"tolerance.psd", "0"}, // Whatever the ticket says.
-                              {"tolerance.used", "1,0,1,0"},
-                              {"tolerance.values", "1.5,2.5,0"},
-                              {"type", "0"},
-                              {"workflow", "2"}};
-    EXPECT_EQ(m_usual, expected);
+    // The preset is not of the PSD kind, whatever its ticket says.
+    EXPECT_EQ(differences(membersOf({}, 0), m_usual),
+              "device=33 flow=Flow formula=4 jdf=/s/jdf/job.jdf jdfServer=/s/jdf/job.jdf mode=2 "
+              "paper=Paper preset=7 Proof /s/tickets/CVP_0007.xml 1,1,1,3 1,0,1 1.5,2.5,0 2,0 0 "
+              "reference=/s/IT8_CharacterizationData/chart.it8 strip=/s/ControlCharts/strip.it8 "
+              "title=Title workflow=2");
 }
 
 TEST_F(LoadJob, FindsTheControlStrip) {
+    const std::string name = "Footer/ControlstripFile=";
+    const std::string nested = " Footer/Nesting/ControlstripFile='nest.it8";
+    const std::string dynamic = "Footer/Dynstrip/UseDynstrip=1 ";
     const Case cases[] = {
-        {"", ""},
-        // Without an install folder nothing is found below it, and the key behind it is not read.
-        // A key that is there with the wrong type is not there.
-        {"Footer/ControlstripFile='/any/where/abc.ti3", "strip=/abc.it8</s/ControlCharts/abc.it8"},
-        {"Footer/ControlstripFile='abc Footer/Nesting/ControlstripFile='nest",
-         "strip=/nest.it8</s/ControlCharts/nest.it8"},
-        {"Footer/ControlstripFile='abc.", "strip=/abc.it8</s/ControlCharts/abc.it8"},
-        {"Footer/ControlstripFile=- Footer/Nesting/ControlstripFile='abc",
-         "strip=/abc.it8</s/ControlCharts/abc.it8"},
+        {name + "'/any/where/abc.ti3" + nested, "strip=/s/ControlCharts/abc.it8"},
+        {name + "'abc" + nested, "strip=/s/ControlCharts/nest.it8"},
+        {name + "5" + nested, "strip=/s/ControlCharts/nest.it8"}, // Not a text: not there.
         // Without a strip there is no workflow, and so no references and no preset.
-        {"Footer/ControlstripFile='abc",
-         "device=0 instrument=Instrument 0 reference= strip= no preset workflow=0"},
-        {"Footer/ControlstripFile=- Footer/Nesting/ControlstripFile=5",
-         "device=0 instrument=Instrument 0 reference= strip= no preset workflow=0"},
-        {"Footer/ControlstripFile='none.it8", "device=0 instrument=Instrument 0 strip="},
-        {"Footer/Dynstrip/UseDynstrip=-", ""},
+        {name + "'abc", "device=0 formula=0 preset=none reference= strip= workflow=0"},
+        {name + "'none.it8", "device=0 strip="},
         {"Footer/Dynstrip/UseDynstrip=2", "dynstrip=2"},
-        {"Footer/Dynstrip/UseDynstrip=1",
-         "device=0 dynstrip=1 instrument=Instrument 0 reference= strip= workflow=0"},
-        {"Footer/Dynstrip/UseDynstrip=1 Footer/Dynstrip/DeviceID=13 "
-         "Footer/Dynstrip/IT8='/s//dyn/dyn.it8 "
-         "Footer/Dynstrip/File='/s/dyn/dyn.pdf",
-         "device=13 dynfile=/dyn.pdf</s/dyn/dyn.pdf dynstrip=1 illumination=0 "
-         "instrument=Instrument 13 reference=/dyn.it8</s/dyn/dyn.it8 "
-         "strip=/dyn.it8</s/dyn/dyn.it8"},
-        {"Footer/Dynstrip/UseDynstrip=1 Footer/Dynstrip/DeviceID=13 "
-         "Footer/Dynstrip/IT8='/s//dyn/dyn.it8",
-         "device=13 dynstrip=1 illumination=0 instrument=Instrument 13 "
-         "reference=/dyn.it8</s/dyn/dyn.it8 strip=/dyn.it8</s/dyn/dyn.it8 workflow=0"},
+        {dynamic, "device=0 dynstrip=1 reference= strip= workflow=0"},
+        {dynamic + "Footer/Dynstrip/DeviceID=13 Footer/Dynstrip/IT8='/s//dyn/dyn.it8 "
+                   "Footer/Dynstrip/File='/s/dyn/dyn.pdf",
+         "device=13 dynfile=/s/dyn/dyn.pdf dynstrip=1 mode=0 reference=/s/dyn/dyn.it8 "
+         "strip=/s/dyn/dyn.it8"},
+        {dynamic + "Footer/Dynstrip/DeviceID=14 Footer/Dynstrip/IT8='/s//dyn/dyn.it8",
+         "device=14 dynstrip=1 reference=/s/dyn/dyn.it8 strip=/s/dyn/dyn.it8 workflow=0"},
     };
     EXPECT_OUTCOMES(cases);
+    EXPECT_EQ(support::contentsOf(root.path("work/JobID_" + std::to_string(m_lastJob) +
+                                            "/NMPatchSetDefinition.dcf")),
+              "/s/dyn/dyn.dcf");
 }
 
 TEST_F(LoadJob, FindsReferences) {
     const std::string workflow = "Workflow/Verify/MeasurementWorkflow=";
     const std::string chart = "Workflow/Verify/CharacterizationData=";
+    const std::string first = " Footer/ControlstripInputProfile=";
+    const std::string other = " Remote/UsedICCProfile='/s/profile2.icc";
+    const std::string stored = workflow + "3 Remote/Measurement/Reference/Numpatches=";
+    const std::string esko = workflow + "4 Job/FromEsko=1 ";
     const Case cases[] = {
         {chart + "'MKCheck11.it8",
-         "reference=/MKCheck11.it8</s/IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8"},
+         "reference=/s/IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8"},
         {chart + "'x_MKCheck10_MKCheck11.it8",
-         "reference=/x_MKCheck10_MKCheck11.it8</s/IT8_CharacterizationData/Fogra_MKCheck10/"
-         "x_MKCheck10_MKCheck11.it8"},
-        {chart + "'/s/a(TEMP)//MKCheck10.it8", "reference=/MKCheck10.it8</s/a(TEMP)/MKCheck10.it8"},
-        {chart + "'", "reference= no preset"},
-        {chart + "-", "reference= no preset"},
-        {chart + "'../chart.it8", "reference="},
-        {workflow + "0", "reference= no preset workflow=0"},
-        {workflow + "4", "reference= no preset workflow=4"},
-        {workflow + "1", "reference= no preset workflow=1"},
-        {workflow + "1 Footer/ControlstripInputProfile='/s/profile.icc",
-         "reference=/profile.icc</s/profile.icc workflow=1"},
-        {workflow + "1 Footer/ControlstripInputProfile=' Remote/UsedICCProfile='/s/profile2.icc",
-         "reference=/profile2.icc</s/profile2.icc workflow=1"},
-        {workflow + "1 Footer/ControlstripInputProfile='\xff Remote/UsedICCProfile='/s/profile.icc",
-         "reference= workflow=1"},
-        {workflow + "1 Remote/UsedICCProfile='/s/profile.icc Remote/Measurement/Status=1",
-         "reference=/profile.icc</s/profile.icc status=1 type=2 workflow=1"},
-        {workflow +
-             "1 Remote/UsedICCProfile='/s/profile.icc Remote/Measurement/Status=1 Input/SubType=80",
-         "reference=/profile.icc</s/profile.icc status=1 type=2 workflow=1"},
-        {workflow + "3 Remote/UsedICCProfile='/s/profile.icc",
-         "reference=/profile.icc</s/profile.icc workflow=3"},
-        {workflow + "3 Remote/UsedICCProfile='/s/profile.icc Remote/Measurement/Status=1",
-         "reference=/profile.icc</s/profile.icc status=1 type=2 workflow=3"},
-        {workflow +
-             "3 Remote/UsedICCProfile='/s/profile.icc Remote/Measurement/Reference/Numpatches=2",
-         "reference=/profile.icc</s/profile.icc workflow=3"},
-        {workflow + "3 Remote/Measurement/Status=2 Remote/Measurement/Reference/Numpatches=2 "
-                    "Remote/Measurement/Reference/CMYKValues/CValues=255,0",
-         "patches=2 reference=/Measured reference.txt< status=2 type=3 workflow=3"},
-        {workflow +
-             "3 Remote/Measurement/Status=1 Remote/Measurement/Reference/Numpatches=2000000000",
-         "patches=2000000000 reference=/Measured reference.txt< status=1 no preset type=2 "
-         "workflow=3"},
-        {workflow + "4 Job/FromEsko=1", "jdf= reference= no preset workflow=4"},
-        {workflow + "4 Job/FromEsko=1 Footer/ControlstripIT8='/s/in/esko.it8",
-         "jdf= reference= strip=/esko.it8</s/in/esko.it8 workflow=4"},
-        {workflow + "4 Job/FromEsko=1 Footer/ControlstripIT8='/s/in/esko.it8 " + chart + "-",
-         "jdf= reference=/strip.it8</s/ControlCharts/strip.it8 strip=/esko.it8</s/in/esko.it8 "
-         "workflow=4"},
-        {workflow + "4 Job/FromEsko=1 Footer/ControlstripIT8='/s/in/esko.it8 " + chart +
-             "'/s/profile.icc",
-         "jdf= reference=/profile.icc</s/profile.icc strip=/esko.it8</s/in/esko.it8 workflow=4"},
-        {workflow + "4 Job/FromEsko=1 Footer/ControlstripIT8=' " + chart + "'/s/profile.icc",
-         "jdf= reference=/profile.icc</s/profile.icc no preset workflow=4"},
-        {workflow + "4 Job/FromEsko=2", "jdf= reference= no preset workflow=4"},
+         "reference=/s/IT8_CharacterizationData/Fogra_MKCheck10/x_MKCheck10_MKCheck11.it8"},
+        {chart + "'/s/a(TEMP)//MKCheck10.it8", "reference=/s/a(TEMP)/MKCheck10.it8"},
+        {chart + "-", "formula=0 preset=none reference="},
+        {workflow + "4", "formula=0 preset=none reference= workflow=4"},
+        {workflow + "1", "formula=0 preset=none reference= workflow=1"},
+        {workflow + "1" + first + "'/s/profile.icc" + other, "reference=/s/profile.icc workflow=1"},
+        {workflow + "1" + first + "'" + other, "reference=/s/profile2.icc workflow=1"},
+        {workflow + "1" + first + "'\xff" + other, "reference= workflow=1"},
+        // Of type 3 only for jobs of sub types 80, 81 and 86.
+        {workflow + "1 Remote/Measurement/Status=1 Input/SubType=80" + other,
+         "reference=/s/profile2.icc status=1 type=2 workflow=1"},
+        {stored + "2" + other, "reference=/s/profile2.icc workflow=3"}, // Not measured so far.
+        {stored + "2 Remote/Measurement/Status=2",
+         "patches=2 reference=/Measured reference.txt status=2 type=3 workflow=3"},
+        {stored + "2000000000 Remote/Measurement/Status=1",
+         "formula=0 patches=2000000000 preset=none reference=/Measured reference.txt status=1 "
+         "type=2 workflow=3"},
+        {esko, "formula=0 jdf= preset=none reference= workflow=4"},
+        {esko + "Footer/ControlstripIT8='/s/in/esko.it8",
+         "jdf= reference= strip=/s/in/esko.it8 workflow=4"},
+        {esko + "Footer/ControlstripIT8='/s/in/esko.it8 " + chart + "-",
+         "jdf= reference=/s/ControlCharts/strip.it8 strip=/s/in/esko.it8 workflow=4"},
+        {esko + "Footer/ControlstripIT8=' " + chart + "'/s/profile.icc",
+         "formula=0 jdf= preset=none reference=/s/profile.icc workflow=4"},
     };
     EXPECT_OUTCOMES(cases);
 }
 
-// Device 13 and its like are read without illumination, whatever the ticket says.
-TEST_F(LoadJob, ReadsTheKeysOfTheMeasurement) {
+TEST_F(LoadJob, GoesOnWithoutWhatIsMissing) {
     const Case cases[] = {
-        {"Remote/Measurement/Illumination/Mode=-", "illumination=1"},
-        {"Remote/Measurement/Illumination/Mode='two", "illumination=1"},
-        {"CMM/PaperName=- Workflow/Name=7 Input/Title=-", "flow= paper= title="},
-        {"Remote/Measurement/Status=- Input/SubType=-", ""},
-        {"Remote/Measurement/Status='many", ""},
-        {"Job/FromEsko=1 Output/Jdf/FileName='none.jdf", "jdf= jdfServer=/s/jdf/none.jdf"},
+        {"Remote/Measurement/Illumination/Mode='two Remote/Measurement/Status='many "
+         "CMM/PaperName=- Workflow/Name=7 Input/Title=-",
+         "flow= mode=1 paper= title="},
         // Without an install folder the switch behind it is not read, and a lookup still made.
         {"System/InstallFolder=- Footer/Dynstrip/UseDynstrip=1 "
          "Workflow/Verify/CharacterizationData='/s/a(TEMP)/MKCheck10.it8",
-         "device=0 instrument=Instrument 0 reference=/MKCheck10.it8</s/a(TEMP)/MKCheck10.it8 "
-         "strip= tolerance.file= tolerance.local=/CVP_0007.xml?"},
+         "device=0 preset=7 Proof  1,1,1,3 1,0,1 1.5,2.5,0 2,0 0 "
+         "reference=/s/a(TEMP)/MKCheck10.it8 strip="},
     };
     EXPECT_OUTCOMES(cases);
 }
 
-TEST_F(LoadJob, ChoosesThePreset) {
+TEST_F(LoadJob, ReadsThePresetUpToWhatIsMissing) {
+    const std::string other = "Workflow/Verify/ComparisonMethod=";
     const struct {
         std::string preset;
         std::string changes;
         std::string outcome;
     } cases[] = {
-        {"Name='Proof", "",
-         "tolerance.decimals=0,0 tolerance.flags=0,0,0 tolerance.illumination=0 "
-         "tolerance.used=0,0,0,0 tolerance.values=0,0,0"},
-        {"Name=' Editable=1", "",
-         "tolerance.decimals=0,0 tolerance.file= tolerance.fileName= tolerance.flags=0,0,0 "
-         "tolerance.illumination=0 tolerance.local= tolerance.name= tolerance.used=0,0,0,0 "
-         "tolerance.values=0,0,0"},
-        {"Editable=1", "Input/SubType=80",
-         "tolerance.decimals=0,0 tolerance.file= tolerance.fileName= tolerance.flags=0,0,0 "
-         "tolerance.illumination=0 tolerance.local= tolerance.name= tolerance.used=0,0,0,0 "
-         "tolerance.values=0,0,0"},
-        {usualPreset, "Workflow/Verify/DeltaEMode=-", "no preset"},
-        {usualPreset, "Workflow/Verify/ComparisonMethod=-",
-         "tolerance.decimals=0,0 tolerance.file= tolerance.fileName= tolerance.flags=0,0,0 "
-         "tolerance.id=0 tolerance.illumination=0 tolerance.job=0 tolerance.local= tolerance.name= "
-         "tolerance.used=0,0,0,0 tolerance.values=0,0,0"},
-        {usualPreset, "Workflow/Verify/ComparisonMethod=8",
-         "tolerance.decimals=0,0 tolerance.file= tolerance.fileName= tolerance.flags=0,0,0 "
-         "tolerance.id=8 tolerance.illumination=0 tolerance.job=8 tolerance.local= tolerance.name= "
-         "tolerance.used=0,0,0,0 tolerance.values=0,0,0"},
-        {"Name='Proof Editable=1 UsedForDynamicWedge=1 Values/Preset=1.5,2.5,3.5 "
-         "Values/UsedForResult=1.0 Values/DecimalPlaces='two",
-         "",
-         "tolerance.decimals=0,0 tolerance.flags=1,0,0 tolerance.illumination=0 "
-         "tolerance.used=0,0,0,0 tolerance.values=1.5,2.5,3.5"},
+        {"Name='Proof UsedForDynamicWedge=1 Values/UsedForResult=1.0 Values/Preset=1.5,2.5,3.5 "
+         "Values/DecimalPlaces='two",
+         "", "preset=7 Proof /s/tickets/CVP_0007.xml 0,0,0,0 0,0,0 1.5,2.5,3.5 0,0 0"},
+        {"Name=' Editable=1", "Input/SubType=80", "preset=7   0,0,0,0 0,0,0 0,0,0 0,0 0"},
+        {usualPreset, "Workflow/Verify/DeltaEMode=-", "formula=0 preset=none"},
+        {usualPreset, other + "-", "preset=none"},
+        {usualPreset, other + "8", "preset=8   0,0,0,0 0,0,0 0,0,0 0,0 0"},
     };
     for (const auto& [preset, changes, outcome] : cases) {
         setPreset(preset);
         EXPECT_EQ(outcomeOf(changes), outcome) << preset << " " << changes;
     }
-}
-
-TEST_F(LoadJob, NamesThePresetsFileByFourDigits) {
-    const std::pair<int, const char*> names[] = {
-        {-5, "CVP_000-5.xml"}, {9, "CVP_0009.xml"},   {10, "CVP_0010.xml"},  {99, "CVP_0099.xml"},
-        {100, "CVP_0100.xml"}, {999, "CVP_0999.xml"}, {1000, "CVP_1000.xml"}};
-    for (const auto& [id, name] : names) {
-        if (id >= 0) {
-            engine->create(27, id);
-            store::StoreKeep keep(engine);
-            keep.apply(27, id, support::RecordTable("Name='Proof").records());
-        }
-        std::istringstream text("x");
-        engine->putFile(std::string("/s/tickets/") + name, text);
-        const std::string outcome =
-            outcomeOf("Workflow/Verify/ComparisonMethod=" + std::to_string(id));
-        EXPECT_EQ(outcome.find(std::string("tolerance.fileName=") + name) != std::string::npos,
-                  id >= 0)
-            << outcome;
+    for (const auto& [id, file] : {std::pair{9, "CVP_0009.xml"},
+                                   {10, "CVP_0010.xml"},
+                                   {100, "CVP_0100.xml"},
+                                   {1000, "CVP_1000.xml"}}) {
+        setPreset("Name='Proof", id);
+        const std::string path = std::string("/s/tickets/") + file;
+        std::istringstream text(path);
+        engine->putFile(path, text);
+        EXPECT_EQ(outcomeOf(other + std::to_string(id)),
+                  "preset=" + std::to_string(id) + " Proof " + path + " 0,0,0,0 0,0,0 0,0,0 0,0 0");
     }
 }
 
 TEST_F(LoadJob, TakesAParentsStrip) {
     const std::string nested = "General/ParentID=5 Footer/Nesting/PSDAssessment='p "
-                               "Footer/Nesting/ControlstripFile='nest.it8 ";
+                               "Footer/Nesting/ControlstripFile='nest.it8 "
+                               "Footer/Nesting/ControlstripMode=";
     for (const auto& [id, ticket] : std::map<int, std::string>{
              {50, "General/ParentID=5 Job/Display/Status=208"},
              {51, "General/ParentID=6 Job/Display/Status=208"},
@@ -410,114 +316,104 @@ TEST_F(LoadJob, TakesAParentsStrip) {
         set(ticket, id);
     }
     const Case cases[] = {
-        {nested, "parent=5 psd=p"},
-        {nested + "Footer/Nesting/ControlstripMode=2", "parent=5 psd=p"},
-        {nested + "Footer/Nesting/ControlstripMode=1",
-         "children=50,53 nested=1 parent=5 psd=p strip=/nest.it8</s/ControlCharts/nest.it8"},
-        {nested + "Footer/Nesting/ControlstripMode=1 General/ParentID=-1", "parent=-1"},
-        {nested + "Footer/Nesting/ControlstripMode=1 Footer/Nesting/PSDAssessment=-", "parent=5"},
-        {nested + "Footer/Nesting/ControlstripMode=1 Footer/Nesting/ControlstripFile='none.it8",
-         "parent=5 psd=p"},
+        {nested + "2", "parent=5 psd=p"},
+        {nested + "1", "children=50,53 nested=1 parent=5 psd=p strip=/s/ControlCharts/nest.it8"},
+        {nested + "1 General/ParentID=-1", "parent=-1"},
+        {nested + "1 Footer/Nesting/PSDAssessment=-", "parent=5"},
+        {nested + "1 Footer/Nesting/ControlstripFile='none.it8", "parent=5 psd=p"},
     };
     EXPECT_OUTCOMES(cases);
 }
 
 TEST_F(LoadJob, DecidesTheType) {
-    const std::string stored = "Workflow/Verify/MeasurementWorkflow=3 "
-                               "Remote/Measurement/Reference/Numpatches=1 ";
-    const std::string dynamic = "Footer/Dynstrip/UseDynstrip=1 Footer/Dynstrip/IT8='/s/dyn/dyn.it8 "
-                                "Footer/Dynstrip/File='/s/dyn/dyn.pdf Input/SubType=96 ";
-    const std::string values = "Remote/Measurement/Values/Measured=1.5,2.5 ";
-    const std::string mode = "Output/Prn/Specific/Measurement/VerifyMode=6 ";
-    const auto device = [](int number) {
-        return "Footer/Dynstrip/DeviceID=" + std::to_string(number) + " ";
-    };
-    const auto status = [](int number) {
-        return "Remote/Measurement/Status=" + std::to_string(number) + " ";
-    };
+    const std::string sub = "Input/SubType=";
+    const std::string status = " Remote/Measurement/Status=";
+    const std::string stored = " Workflow/Verify/MeasurementWorkflow=3 "
+                               "Remote/Measurement/Reference/Numpatches=1";
+    const std::string whole = "jdf=/s/jdf/whole.jdf jdfServer=/s/jdf//whole.jdf ";
     const Case cases[] = {
-        {status(1), "status=1 type=2"},
-        {status(2), "status=2 type=3"},
-        {status(-1), "status=-1"},
-        {"Input/SubType=80", "jdf=/whole.jdf</s/jdf/whole.jdf jdfServer=/s/jdf//whole.jdf type=1"},
-        {"Input/SubType=81 " + status(5),
-         "jdf=/whole.jdf</s/jdf/whole.jdf jdfServer=/s/jdf//whole.jdf status=5 type=1"},
-        {"Input/SubType=86 Remote/JDFName=-", "code=-1 jdf= jdfServer= type=1"},
-        {"Input/SubType=86 Remote/JDFName='", "code=111 jdf= jdfServer= type=1"},
-        {"Input/SubType=82 " + status(1), "status=1 type=2"},
-        {"Input/SubType=81 " + stored + status(2),
-         "patches=1 reference=/Measured reference.txt< status=2 type=3 workflow=3"},
-        {"Input/SubType=81 " + stored + status(1),
-         "jdf=/whole.jdf</s/jdf/whole.jdf jdfServer=/s/jdf//whole.jdf patches=1 "
-         "reference=/Measured reference.txt< status=1 type=1 workflow=3"},
-        {"Input/SubType=96 ", ""},
-        {"Input/SubType=96 " + status(1), "status=1 type=2"},
-        {"Input/SubType=96 " + status(2), "status=2 type=3"},
-        {"Input/SubType=96 " + status(-3), "status=-3"},
-        {dynamic + device(0), "device=0 dynfile=/dyn.pdf</s/dyn/dyn.pdf dynstrip=1 illumination=-1 "
-                              "inline=1 instrument=Instrument 0 reference=/dyn.it8</s/dyn/dyn.it8 "
-                              "strip=/dyn.it8</s/dyn/dyn.it8 type=2"},
-        {dynamic + device(39) + values + mode,
-         "device=39 dynfile=/dyn.pdf</s/dyn/dyn.pdf dynstrip=1 instrument=Instrument 39 "
-         "reference=/dyn.it8</s/dyn/dyn.it8 strip=/dyn.it8</s/dyn/dyn.it8"},
-        {dynamic + device(40) + values + mode,
-         "device=40 dynfile=/dyn.pdf</s/dyn/dyn.pdf dynstrip=1 illumination=6 inline=1 "
-         "instrument=Instrument 40 measured=1.5,2.5,0 reference=/dyn.it8</s/dyn/dyn.it8 "
-         "strip=/dyn.it8</s/dyn/dyn.it8 type=2"},
-        {dynamic + device(47) + mode + status(2),
-         "device=47 dynfile=/dyn.pdf</s/dyn/dyn.pdf dynstrip=1 illumination=6 inline=1 "
-         "instrument=Instrument 47 reference=/dyn.it8</s/dyn/dyn.it8 status=2 "
-         "strip=/dyn.it8</s/dyn/dyn.it8 type=3"},
-        {dynamic + device(48) + values + mode,
-         "device=48 dynfile=/dyn.pdf</s/dyn/dyn.pdf dynstrip=1 instrument=Instrument 48 "
-         "reference=/dyn.it8</s/dyn/dyn.it8 strip=/dyn.it8</s/dyn/dyn.it8"},
+        {status + "-1", "status=-1"},
+        {status + "1", "status=1 type=2"},
+        {sub + "80", whole + "type=1"},
+        {sub + "81" + status + "5", whole + "status=5 type=1"},
+        {sub + "82" + status + "2", "status=2 type=3"},
+        {sub + "81" + stored + status + "2",
+         "patches=1 reference=/Measured reference.txt status=2 type=3 workflow=3"},
+        {sub + "81" + stored + status + "1",
+         whole + "patches=1 reference=/Measured reference.txt status=1 type=1 workflow=3"},
+        {sub + "96", ""},
+        {sub + "96" + status + "1", "status=1 type=2"},
+        {sub + "96" + status + "-3", "status=-3"},
     };
     EXPECT_OUTCOMES(cases);
 }
 
+// Measured while printing: values and mode come from the ticket, and there is nothing to measure.
+TEST_F(LoadJob, KnowsInlineInstruments) {
+    const std::string strip = "dynfile=/s/dyn/dyn.pdf dynstrip=1 ";
+    const std::string files = "reference=/s/dyn/dyn.it8 strip=/s/dyn/dyn.it8";
+    const std::string values = "Remote/Measurement/Values/Measured=1.5,2.5 "
+                               "Output/Prn/Specific/Measurement/VerifyMode=6";
+    const struct {
+        int device;
+        std::string changes, outcome;
+    } cases[] = {
+        {0, "", strip + "inline=1 mode=-1 " + files + " type=2"},
+        {39, values, strip + files},
+        {40, values, strip + "inline=1 measured=1.5,2.5,0 mode=6 " + files + " type=2"},
+        {47, "Remote/Measurement/Status=2",
+         strip + "inline=1 mode=-1 reference=/s/dyn/dyn.it8 status=2 strip=/s/dyn/dyn.it8 type=3"},
+        {48, values, strip + files},
+    };
+    for (const auto& [device, changes, outcome] : cases) {
+        const std::string number = std::to_string(device);
+        EXPECT_EQ(outcomeOf("Input/SubType=96 Footer/Dynstrip/UseDynstrip=1 "
+                            "Footer/Dynstrip/IT8='/s/dyn/dyn.it8 "
+                            "Footer/Dynstrip/File='/s/dyn/dyn.pdf Footer/Dynstrip/DeviceID=" +
+                            number + " " + changes),
+                  "device=" + number + " " + outcome);
+    }
+}
+
 TEST_F(LoadJob, FetchesTheJdf) {
+    const std::string other = " Workflow/RemoteOutFolder=";
     const Case cases[] = {
         {"Output/Jdf/FileName=-", "code=-1 jdf= jdfServer="},
         {"Output/Jdf/FileName='none.jdf", "code=111 jdf= jdfServer="},
+        {"Output/Jdf/FileName='none.jdf Job/FromEsko=1", "jdf= jdfServer=/s/jdf/none.jdf"},
+        {"Input/SubType=86 Remote/JDFName=-", "code=-1 jdf= jdfServer= type=1"},
         {"System/Folders/Temp=-", "code=-1 jdf= jdfServer="},
-        {"System/Folders/Temp=- Workflow/RemoteOutFolder='/s//jdf", "jdfServer=/s//jdf/job.jdf"},
-        {"System/Folders/Temp=' Workflow/RemoteOutFolder='/s/jdf", ""},
-        {"System/Folders/Temp='\xff Workflow/RemoteOutFolder='/s/jdf", "code=111 jdf= jdfServer="},
-        {"System/Folders/Temp=' Workflow/RemoteOutFolder='", "code=111 jdf= jdfServer="},
-        {"System/Folders/Temp=' Workflow/RemoteOutFolder=' Job/FromEsko=1", "jdf= jdfServer="},
+        {"System/Folders/Temp='" + other + "'/s//jdf", "jdfServer=/s//jdf/job.jdf"},
+        {"System/Folders/Temp='\xff" + other + "'/s/jdf", "code=111 jdf= jdfServer="},
+        {"System/Folders/Temp='" + other + "'", "code=111 jdf= jdfServer="},
     };
     EXPECT_OUTCOMES(cases);
 }
 
 TEST_F(LoadJob, TheSecondStripHasKeysOfItsOwn) {
-    const std::string second =
-        "Footer/ControlstripFile2='abc.it8 Workflow/Verify/MeasurementWorkflow2=1 "
-        "Footer/ControlstripInputProfile2='/s/profile2.icc Workflow/Verify/DeltaEMode2=5 "
-        "Workflow/Verify/ComparisonMethod2=7 Remote/Measurement2/Illumination/Mode=4 "
-        "Remote/Measurement2/Status=2 Footer/Dynstrip/UseDynstrip=1 General/ParentID=5 "
-        "Footer/Nesting/ControlstripMode=1 Footer/Nesting/PSDAssessment='p "
-        "Footer/Nesting/ControlstripFile2='nest.it8 ";
-    for (const int strip : {1, 2, -1}) {
-        EXPECT_EQ(outcomeOf(second, strip),
-                  "dynstrip=1 illumination=4 nested=1 parent=5 psd=p "
-                  "reference=/profile2.icc</s/profile2.icc status=2 "
-                  "strip=/nest.it8</s/ControlCharts/nest.it8 tolerance.formula=5 type=3 workflow=1")
-            << strip;
+    const std::string second = "Footer/ControlstripFile2='abc.it8 Workflow/Verify/DeltaEMode2=5 "
+                               "Workflow/Verify/ComparisonMethod2=7 ";
+    const Case cases[] = {
+        {"Workflow/Verify/MeasurementWorkflow2=1 Footer/Dynstrip/UseDynstrip=1 "
+         "Footer/ControlstripInputProfile2='/s/profile2.icc General/ParentID=5 "
+         "Remote/Measurement2/Illumination/Mode=4 Remote/Measurement2/Status=2 "
+         "Footer/Nesting/ControlstripMode=1 Footer/Nesting/PSDAssessment='p "
+         "Footer/Nesting/ControlstripFile2='nest.it8",
+         "dynstrip=1 formula=5 mode=4 nested=1 parent=5 psd=p reference=/s/profile2.icc status=2 "
+         "strip=/s/ControlCharts/nest.it8 type=3 workflow=1"},
+        {"Workflow/Verify/MeasurementWorkflow2=2 "
+         "Workflow/Verify/CharacterizationData2='MKCheck11.it8",
+         "formula=5 mode=1 reference=/s/IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8 "
+         "strip=/s/ControlCharts/abc.it8"},
+        {"Workflow/Verify/MeasurementWorkflow2=3 Remote/Measurement2/Status=1 "
+         "Remote/Measurement2/Reference/Numpatches=2",
+         "formula=5 mode=1 patches=2 reference=/Measured reference.txt status=1 "
+         "strip=/s/ControlCharts/abc.it8 type=2 workflow=3"},
+    };
+    for (const auto& [changes, outcome] : cases) {
+        EXPECT_EQ(outcomeOf(second + changes, 1), outcome);
     }
-    EXPECT_EQ(outcomeOf("Workflow/Verify/MeasurementWorkflow2=2 Workflow/Verify/DeltaEMode2=5 "
-                        "Workflow/Verify/ComparisonMethod2=7 "
-                        "Workflow/Verify/CharacterizationData2='MKCheck11.it8",
-                        1),
-              "illumination=1 "
-              "reference=/MKCheck11.it8</s/IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8 "
-              "strip=/strip2.it8</s/ControlCharts/strip2.it8 tolerance.formula=5");
-    EXPECT_EQ(
-        outcomeOf("Workflow/Verify/MeasurementWorkflow2=3 Workflow/Verify/DeltaEMode2=5 "
-                  "Workflow/Verify/ComparisonMethod2=7 Remote/Measurement2/Status=1 "
-                  "Remote/Measurement2/Reference/Numpatches=2",
-                  1),
-        "illumination=1 patches=2 reference=/Measured reference.txt< status=1 "
-        "strip=/strip2.it8</s/ControlCharts/strip2.it8 tolerance.formula=5 type=2 workflow=3");
+    EXPECT_EQ(outcomeOf(second + cases[0].changes, -1), cases[0].outcome);
 }
 
 // By requirement: the fixture's own has asked before.
