@@ -240,6 +240,8 @@ TEST_F(LoadJob, FindsReferences) {
         {workflow + "1 Remote/Measurement/Status=1 Input/SubType=80" + other,
          "reference=/s/profile2.icc status=1 type=2 workflow=1"},
         {stored + "2" + other, "reference=/s/profile2.icc workflow=3"}, // Not measured so far.
+        {workflow + "3 Remote/Measurement/Status=1" + other,
+         "reference=/s/profile2.icc status=1 type=2 workflow=3"},
         {stored + "2 Remote/Measurement/Status=2",
          "patches=2 reference=/Measured reference.txt status=2 type=3 workflow=3"},
         {stored + "2000000000 Remote/Measurement/Status=1",
