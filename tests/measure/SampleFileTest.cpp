@@ -1,6 +1,6 @@
 #include <algorithm>
+#include <bit>
 #include <cmath>
-#include <cstring>
 #include <iomanip>
 #include <limits>
 #include <random>
@@ -11,6 +11,7 @@
 
 #include "ScratchFolder.h"
 #include "job/KZVerifyJobProcessor.h"
+#include "measure/NumberText.h"
 
 namespace {
 
@@ -65,14 +66,12 @@ TEST_F(SampleFile, GivesTheFirstRowFewerDigits) {
     samples.record.lab = samples.lab.data();
     samples.record.xyz = samples.xyz.data();
     samples.addSpectra(380, 10, 2);
-    const auto put = [](double* place, std::initializer_list<double> values) {
-        std::copy(values.begin(), values.end(), place);
-    };
     for (std::size_t i = 0; i < 3; ++i) {
-        put(&samples.cmyk[4 * i], {12.3456789, 100., 0., -0.0});
-        put(&samples.lab[3 * i], {95.123456789, -0.00001234567, 1234567.8});
-        put(&samples.xyz[3 * i], {84.123456789, 1e-7, infinity});
-        put(samples.spectra[i].values, {0.0123456789012, 1.});
+        std::ranges::copy(std::vector{12.3456789, 100., 0., -0.0}, &samples.cmyk[4 * i]);
+        std::ranges::copy(std::vector{95.123456789, -0.00001234567, 1234567.8},
+                          &samples.lab[3 * i]);
+        std::ranges::copy(std::vector{84.123456789, 1e-7, infinity}, &samples.xyz[3 * i]);
+        std::ranges::copy(std::vector{0.0123456789012, 1.}, samples.spectra[i].values);
     }
     const std::string rest = "\t84.12346\t1e-07\tinf\t0.012345679\t1\n";
     const std::string later = "12.345679\t100\t0\t-0\t95.123457\t-1.234567e-05\t1234567.8" + rest;
@@ -86,107 +85,70 @@ TEST_F(SampleFile, GivesTheFirstRowFewerDigits) {
 }
 
 TEST_F(SampleFile, HasTheColumnsThatAreThere) {
-    constexpr int none = -2;
-    const struct {
+    std::string wavelengths;
+    for (int nm = 380; nm <= 730; nm += 10) {
+        wavelengths += "\tSPECTRAL_" + std::to_string(nm);
+    }
+    const std::string labNames = "\tLAB_L\tLAB_A\tLAB_B";
+    const std::string xyzNames = "\tXYZ_X\tXYZ_Y\tXYZ_Z";
+    struct Case {
         bool lab, xyz;
         int base, stepsize, length;
-        const char *fields, *names, *secondRow;
-    } cases[] = {
-        {false, false, 0, 0, none, "5", "", "1.23457"},
-        {true, false, 0, 0, none, "8", "\tLAB_L\tLAB_A\tLAB_B", "1.23457"},
-        {false, true, 0, 0, none, "8", "\tXYZ_X\tXYZ_Y\tXYZ_Z", "1.234568"},
-        {false, false, 400, -5, 2, "7", "\tSPECTRAL_400\tSPECTRAL_395", "1.2345679"},
+        std::string fields, names, value;
+    };
+    const Case cases[] = {
+        {false, false, 380, 10, -1, "5", "", "-1.23457e-300"},
+        {false, false, 380, 10, 37, "5", "", "-1.23457e-300"},
+        {true, false, 380, 10, -1, "8", labNames, "-1.23457e-300"},
+        {false, true, 380, 10, 0, "8", xyzNames, "-1.234568e-300"},
+        {true, false, 380, 10, 36, "44", labNames + wavelengths, "-1.2345679e-300"},
+        {false, false, 400, -5, 2, "7", "\tSPECTRAL_400\tSPECTRAL_395", "-1.2345679e-300"},
         {false, false, 2147483647, 2147483647, 2, "7", "\tSPECTRAL_2147483647\tSPECTRAL_4294967294",
-         "1.2345679"},
-        {false, true, 380, 10, 0, "8", "\tXYZ_X\tXYZ_Y\tXYZ_Z", "1.234568"},
-        {false, false, 380, 10, 37, "5", "", "1.23457"},
-        {false, false, 380, 10, -1, "5", "", "1.23457"},
+         "-1.2345679e-300"},
     };
-    for (const auto& [lab, xyz, base, stepsize, length, fields, names, secondRow] : cases) {
+    for (const Case& c : cases) {
+        SCOPED_TRACE(c.names);
         Samples samples(2);
-        samples.cmyk[4] = 1.23456789;
-        samples.record.lab = lab ? samples.lab.data() : nullptr;
-        samples.record.xyz = xyz ? samples.xyz.data() : nullptr;
-        if (length != none) {
-            samples.addSpectra(base, stepsize, length);
+        for (auto* values : {&samples.cmyk, &samples.lab, &samples.xyz}) {
+            values->assign(values->size(), -1.23456789e-300);
+        }
+        std::fill_n(samples.spectra[1].values, 36, -1.23456789e-300);
+        samples.record.lab = c.lab ? samples.lab.data() : nullptr;
+        samples.record.xyz = c.xyz ? samples.xyz.data() : nullptr;
+        samples.addSpectra(c.base, c.stepsize, c.length);
+        std::string lastRow = "\n2";
+        for (int i = 1; i < std::stoi(c.fields); ++i) {
+            lastRow += "\t" + c.value;
         }
         const std::string text = written(samples);
-        EXPECT_NE(text.find(std::string("\nNUMBER_OF_FIELDS ") + fields + "\n"), text.npos) << text;
-        EXPECT_NE(text.find(std::string("\tCMYK_K") + names + "\n"), text.npos) << text;
-        EXPECT_NE(text.find(std::string("\n2\t") + secondRow + "\t0\t"), text.npos) << text;
+        EXPECT_NE(text.find("\nNUMBER_OF_FIELDS " + c.fields + "\n"), text.npos) << text;
+        EXPECT_NE(text.find("\tCMYK_K" + c.names + "\n"), text.npos) << text;
+        EXPECT_NE(text.find(lastRow + "\nEND_DATA\n"), text.npos) << text;
     }
 }
 
-/// The requirement as it is put: one stream for all rows, emptied between them. Device values
-/// alone, or all groups.
-std::string streamedRows(const Samples& samples) {
-    std::ostringstream stream;
-    std::string rows;
-    const auto put = [&stream](const double* values, int count) {
-        for (int i = 0; i < count; ++i) {
-            stream << '\t' << values[i];
-        }
-    };
-    for (std::size_t i = 0; i < samples.spectra.size(); ++i) {
-        stream.str("");
-        stream << i + 1;
-        put(&samples.cmyk[4 * i], 4);
-        if (samples.record.lab != nullptr) {
-            put(&samples.lab[3 * i], 3);
-            stream << std::setprecision(7);
-            put(&samples.xyz[3 * i], 3);
-            stream << std::setprecision(8);
-            put(samples.spectra[i].values, 36);
-        }
-        rows += stream.str() + "\n";
-    }
-    return rows;
-}
-
-TEST_F(SampleFile, WritesNumbersAsAStreamDoes) {
+TEST(NumberText, IsThatOfAStream) {
     std::mt19937_64 random(20251125);
-    using Limits = std::numeric_limits<double>;
-    const double special[] = {0.0,          -0.0,          infinity,          -infinity,
-                              std::nan(""), -std::nan(""), Limits::max(),     Limits::denorm_min(),
-                              999999.5,     9999999.5,     99999999.5,        0.00009999999995,
-                              2.5e-5,       9.9999995,     99999.995,         0.09999999499999999,
-                              0.0001,       100000,        1.9073486328125e-6};
-    const auto any = [&]() -> double {
-        switch (random() % 3) {
-        case 0:
-            return special[random() % std::size(special)];
-        case 1: { // Any bits at all.
-            const std::uint64_t bits = random();
-            double value;
-            std::memcpy(&value, &bits, sizeof value);
-            return value;
-        }
-        default: { // Few digits, as instruments give, and many that lie between two texts.
-            const double value = static_cast<double>(random() % (1u << random() % 28));
-            return std::ldexp(random() % 2 == 0 ? value : -value, -static_cast<int>(random() % 20));
-        }
-        }
-    };
-    Samples samples(1617);
-    for (auto* values : {&samples.cmyk, &samples.lab, &samples.xyz}) {
-        std::generate(values->begin(), values->end(), any);
+    std::vector<double> values = {
+        0.0,       -0.0,       infinity,       -infinity, std::nan(""),        -std::nan(""),
+        999999.5,  9999999.5,  99999999.5,     2.5e-5,    0.00009999999995,    9.9999995,
+        99999.995, 1.9073e-06, std::exp2(-19), 100000,    0.09999999499999999, 0.0001};
+    for (int i = 0; i < 50'000; ++i) {
+        values.push_back(std::bit_cast<double>(random())); // Any bits at all.
+        // Few digits, as instruments give, and many that lie between two texts.
+        const double few = static_cast<double>(random() % (1u << random() % 28));
+        values.push_back(std::ldexp(i % 2 == 0 ? few : -few, -static_cast<int>(random() % 20)));
     }
-    for (spectralRow& row : samples.spectra) {
-        std::generate(row.values, row.values + 36, any);
+    std::ostringstream stream;
+    for (const double value : values) {
+        for (const int digits : {6, 7, 8}) {
+            stream.str("");
+            stream << std::setprecision(digits) << value;
+            char text[longestNumberText];
+            ASSERT_EQ(std::string(text, writeNumberText(text, value, digits)), stream.str())
+                << digits;
+        }
     }
-    const auto rows = [&] {
-        const std::string text = written(samples);
-        const std::string start = "\nBEGIN_DATA\n";
-        return text.substr(text.find(start) + start.size());
-    };
-    EXPECT_TRUE(rows() == streamedRows(samples) + "END_DATA\n") << "6 digits";
-    samples.record.lab = samples.lab.data();
-    samples.record.xyz = samples.xyz.data();
-    samples.addSpectra(380, 10, 36);
-    EXPECT_TRUE(rows() == streamedRows(samples) + "END_DATA\n") << "7 and 8 digits";
-    const std::string text = support::contentsOf(m_sample);
-    EXPECT_NE(text.find("\nNUMBER_OF_FIELDS 47\n"), text.npos);
-    EXPECT_NE(text.find("\tSPECTRAL_730\nEND_DATA_FORMAT\n"), text.npos);
 }
 
 TEST_F(SampleFile, ReplacesOneFileOrTheOther) {

@@ -154,6 +154,13 @@ TEST(ParameterList, WorksBehindAnOpaquePointer) {
     EXPECT_FALSE(MultiParListSetParameter(list, "a", PARAM_DELETE, nullptr, 0));
 }
 
+TEST(BinStringBuffer, ACopyViewsItsOwnBytes) {
+    const BIN_STRING_BUFFER buffer(BIN_STRING(std::string("bytes")));
+    const BIN_STRING_BUFFER copy(buffer);
+    EXPECT_NE(copy.BinString()->begin(), buffer.BinString()->begin());
+    EXPECT_EQ(std::string(copy.BinString()->begin(), copy.BinString()->end()), "bytes");
+}
+
 TEST(ParameterCaches, KeepManyNumbersOnceAndInTheirPlaces) {
     VALCACHE<double> cache;
     std::vector<const double*> places;
