@@ -246,6 +246,8 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
         {pooled(full + "</tazo:MeasurementData\n>"), pooled(holder())},
         {pooled("<tazo:MeasurementData ID='a'/>"),
          pooled("<tazo:MeasurementData ID='a'></tazo:MeasurementData>")},
+        {pooled(holder(), "<Sender printdate=\"\" printtime='1'/>"),
+         pooled(holder(), "<Sender printdate=\"\" printtime=\"\"/>")},
         // A date that only looks like the sender's.
         {pooled(holder(), "<SenderId/><Sender aprintdate=\"2020\" printtime='1' printdate=\"\"/>"),
          pooled(holder(),
@@ -297,6 +299,7 @@ TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     EXPECT_EQ(lastVersion(), kept);
     runJob({{1, 1}});
     runJob({{1, 1}});
+    answer({"jdf", "rebuild", "7", "--from", std::to_string(lastVersion())});
     EXPECT_EQ(measurements(stored()).size(), 6U);
     EXPECT_EQ(rest(stored()), whole);
 

@@ -1,18 +1,15 @@
 // Runs of the measuring tool on definitions as the writer makes them.
 #include <algorithm>
 #include <cmath>
-#include <cstdio>
 #include <filesystem>
 #include <fstream>
+#include <regex>
 #include <sstream>
 #include <string>
 #include <thread>
 #include <vector>
 
 #include <signal.h>
-#include <spawn.h>
-#include <sys/wait.h>
-#include <unistd.h>
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
@@ -24,7 +21,6 @@
 #include "colour/CgatsText.h"
 #include "colour/Difference.h"
 #include "colour/Spectra.h"
-#include "job/AnalysisLibrary.h"
 #include "measure/Helper.h"
 
 namespace {
@@ -46,10 +42,7 @@ std::string format(const std::string& names) {
 
 /// The lines of a definition end in CR LF.
 std::string crlf(const std::string& text) {
-    std::string result;
-    for (const char c : text)
-        result += c == '\n' ? "\r\n" : std::string(1, c);
-    return result;
+    return std::regex_replace(text, std::regex("\n"), "\r\n");
 }
 
 /// A definition of these rows of C, M, Y, K.
@@ -61,16 +54,6 @@ std::string definitionOf(const std::vector<double>& inks) {
         text << (i % 4 == 0 ? std::to_string(i / 4 + 1) : "") << '\t' << inks[i]
              << (i % 4 == 3 ? "\n" : "");
     return crlf(text.str() + "END_DATA\n");
-}
-
-std::vector<double> grid(std::initializer_list<double> steps) {
-    std::vector<double> inks;
-    for (const double c : steps)
-        for (const double m : steps)
-            for (const double y : steps)
-                for (const double k : steps)
-                    inks.insert(inks.end(), {c, m, y, k});
-    return inks;
 }
 
 /// "1: 100 0 0 0; 2: 40 27 27 0; "
@@ -90,10 +73,9 @@ class MeasureTool : public testing::Test {
   protected:
     MeasureTool() { m_folder.makeFolder("out"); }
 
-    support::Outcome measure(const std::string& definition, const std::string& settings,
-                             const std::string& program = MEASURE_TOOL) const {
+    support::Outcome measure(const std::string& definition, const std::string& settings) const {
         m_folder.write("definition.it8", definition);
-        return support::run({program, writeOptions()}, environmentWith(settings));
+        return support::run({MEASURE_TOOL, writeOptions()}, environmentWith(settings));
     }
 
     std::string writeOptions() const {
@@ -142,151 +124,117 @@ class MeasureTool : public testing::Test {
     const std::string m_output = m_folder.path("out/Measured sample.txt");
 };
 
-// The tool's own reader and that of the analysis library, on what the writer makes of strips.
 TEST_F(MeasureTool, ReadsEveryDefinition) {
-    const std::string start = head + format(cmyk);
-    const std::string device = "KEYWORD\tDEVICE\nDEVICE 33\n";
-    const std::string colours = "\tLAB_L\tLAB_A\tLAB_B\tXYZ_X\tXYZ_Y\tXYZ_Z";
+    const auto table = [](const std::string& names, const std::string& lines) {
+        return head + format(names) + "KEYWORD\tDEVICE\nDEVICE 33\n" + begin + lines;
+    };
+    const std::string lab = "\tLAB_L\tLAB_A\tLAB_B";
+    const std::string colours = lab + "\tXYZ_X\tXYZ_Y\tXYZ_Z";
     const std::string simple = "1: 100 0 0 0; 2: 40 27 27 0; ";
     const std::string white = "\t0.00\t0.00\t0.00\t0.00\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\n";
     const std::string whiteRgb = "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\n";
-    std::string spectra;
+    std::string longNames = cmyk;
     std::string values;
     for (int nm = 380; nm <= 730; nm += 10) {
-        spectra += "\tSPECTRAL_NM_" + std::to_string(nm);
+        longNames += "\tSPECTRAL_NM_" + std::to_string(nm);
         values += "\t0.123456789012";
     }
-    const std::string longNames = ("SAMPLE_ID\t" + cmyk + spectra).substr(0, 511);
+    longNames.resize(511 - std::string("SAMPLE_ID\t").size());
 
     const struct {
         const char* what;
         std::string text;
         std::string patches;
-        const char* instrument = "Instrument 33";
     } cases[] = {
-        {"plain", start + device + "NUMBER_OF_SETS 2\n" + rows + end, simple},
-        {"no keyword", start + "DEVICE 28\n" + rows + end, simple, "Instrument 28"},
-        {"value behind a tab", start + "DEVICE\t28\n" + rows + end, simple, "Instrument 28"},
-        {"no device", start + rows + end, simple, ""},
-        {"low count", start + device + "NUMBER_OF_SETS 1\n" + rows + end + "\n\n", simple},
-        {"no count, no end of the line", start + device + rows + "END_DATA", simple},
-        {"no end, but the count", start + device + "NUMBER_OF_SETS 2\n" + rows + "\n", simple},
+        {"low count", head + format(cmyk) + "NUMBER_OF_SETS 1\n" + rows + end + "\n\n", simple},
+        {"no end of the line", head + format(cmyk) + rows + "END_DATA", simple},
         {"another table behind",
-         start + device + rows + end + "BEGIN_DATA_FORMAT\nINDEX\tD_VIS\nEND_DATA_FORMAT\n" +
-             begin + "1\t2\n" + end,
-         simple},
+         head + format(cmyk) + rows + end + format("D_VIS") + begin + "1\t2\n" + end, simple},
         {"names of several bytes, whose rows are cut off",
-         head + format("SAMPLE_NAME\t" + cmyk + colours) + device + begin +
-             "1\tGröße a\t100\t0\t0\t0\t55\t-36\t-50\t1\t2\t74.\n"
-             "2\t白い 紙\t40\t27\t27\t0\t95.00\t0.00\t0.00\t84.00\n"
-             "3\t\t0\t0\t0\t50\t95\t0\t0\t84\t87\t74\n" +
-             end,
+         table("SAMPLE_NAME\t" + cmyk + colours,
+               "1\tGröße a\t100\t0\t0\t0\t55\t-36\t-50\t1\t2\t74.\n"
+               "2\t白い 紙\t40\t27\t27\t0\t95.00\t0.00\t0.00\t84.00\n"
+               "3\t\t0\t0\t0\t50\t95\t0\t0\t84\t87\t74\n" +
+                   end),
          simple + "3: 0 0 0 50; "},
         {"names cut off behind the values",
-         head + format(cmyk + "\tSAMPLE_NAME") + device + begin +
-             "1\t100\t0\t0\t0\tGr\n2\t40\t27\t27\t0\t\n" + end,
-         simple},
+         table(cmyk + "\tSAMPLE_NAME", "1\t100\t0\t0\t0\tGr\n2\t40\t27\t27\t0\t\n" + end), simple},
         {"rows and names cut off at 511 bytes",
-         head + "NUMBER_OF_FIELDS 41\nBEGIN_DATA_FORMAT\n" + longNames + "\nEND_DATA_FORMAT\n" +
-             device + begin + ("1\t100\t0\t0\t0" + values).substr(0, 511) + "\n" +
-             ("2\t40\t27\t27\t0" + values).substr(0, 511) + "\n" + end,
+         table(longNames, ("1\t100\t0\t0\t0" + values).substr(0, 511) + "\n" +
+                              ("2\t40\t27\t27\t0" + values).substr(0, 511) + "\n" + end),
+         simple},
+        {"wavelengths alone, cut off",
+         table(cmyk + "\tNM_380\tNM_390",
+               "1\t100\t0\t0\t0\t0.5\n2\t40\t27\t27\t0\t0.1\t0.2\n" + end),
          simple},
         {"blanks between the cells",
-         head +
-             "BEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B\n"
-             "END_DATA_FORMAT\n" +
-             device + begin + "1 100 0 0 0 55 -36 -50\n2  40 27 27 0\t60 0 0\n" + end,
+         table(cmyk + " LAB_L LAB_A LAB_B",
+               "1 100 0 0 0 55 -36 -50\n2  40 27 27 0\t60 0 0\n" + end),
          simple},
-        {"filling rows",
-         head + format(cmyk + colours) + device + "NUMBER_OF_SETS\t3\n" + begin +
-             "1\t100\t0\t0\t0\t55\t-36\t-50\t1\t2\t3\n2" + white + "3" + white + "END_DATA",
-         "1: 100 0 0 0; 2: 0 0 0 0; 3: 0 0 0 0; "},
-        {"filling rows with columns of their own",
-         head + format("SAMPLE_NAME\tCMYK_K\tCMYK_C\tCMYK_M\tCMYK_Y\tSPOT_1") + device + begin +
-             "1\tA1\t5\t100\t0\t0\t0\n2" + white + "END_DATA",
-         "1: 100 0 0 5 0; 2: 0 0 0 0 0; "},
+        {"filling rows, beyond the count, with columns of their own",
+         table("SAMPLE_NAME\tCMYK_K\tCMYK_C\tCMYK_M\tCMYK_Y\tSPOT_1",
+               "1\tA1\t5\t100\t0\t0\t0\n2" + white + "3" + white + "END_DATA"),
+         "1: 100 0 0 5 0; 2: 0 0 0 0 0; 3: 0 0 0 0 0; "},
         {"RGB",
-         head + format("RGB_R\tRGB_G\tRGB_B" + colours) + device + begin +
-             "1\t0\t51\t255\t3\t0\t0\t1\t1\t1\n2" + whiteRgb + "END_DATA",
+         table("RGB_R\tRGB_G\tRGB_B" + colours,
+               "1\t0\t51\t255\t3\t0\t0\t1\t1\t1\n2" + whiteRgb + "END_DATA"),
          "1: 0 20 100; 2: 100 100 100; "},
         {"RGB in percent",
-         head + format("RGB_R\tRGB_G\tRGB_B\tLAB_L\tLAB_A\tLAB_B") + device + begin +
-             "1\t0\t20\t100\t3\t0\t0\n2" + whiteRgb + "END_DATA",
+         table("RGB_R\tRGB_G\tRGB_B" + lab, "1\t0\t20\t100\t3\t0\t0\n2" + whiteRgb + "END_DATA"),
          "1: 0 20 100; 2: 100 100 100; "},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         EXPECT_EQ(patchesText(measured(crlf(c.text), virtualPrint)), c.patches);
-        wxString name;
-        const int status = getDeviceNameFromIt8ControlStripFile(
-            stringToWstring(m_folder.path("definition.it8")), &name);
-        EXPECT_EQ(name, c.instrument);
-        EXPECT_EQ(status == 0, !name.empty());
     }
-}
 
-TEST_F(MeasureTool, RefusesOtherDefinitions) {
     const std::string start = head + format(cmyk);
-    const std::string lab = "LAB_L\tLAB_A\tLAB_B";
     const struct {
         std::string text;
         int exitCode;
         const char* words;
-    } cases[] = {
+    } refused[] = {
         {"", 4, "is neither"},
-        {start + "NUMBER_OF_SETS 2\n" + rows.substr(0, rows.size() - 9), 4,
-         "is damaged or cut off"},
-        {head + "END_DATA_FORMAT\n" + rows + end, 4, "is damaged or cut off"},
+        {start + rows.substr(0, rows.size() - 9), 4, "is damaged or cut off"},
         {start + begin + end, 4, "has no patches"},
-        {start + begin + "1\t100\t\n2\t40\t27\t27\t0\n" + end, 4, "is damaged"},
-        {head + format("SAMPLE_NAME\t" + cmyk) + begin + "1\tGrün\t0\t0\t0\t10\n" + end, 4,
-         "row 1 of the definition has lost"},
         {start + begin + "1\t100\tx\t0\t0\n" + end, 4, "has a text"},
-        {head + format(lab) + begin + "1\t50\t0\t0\n" + end, 5, "other colorants"},
-        {head + format(cmyk + "\tSPOT_1") + begin + "1\t0\t0\t0\t0\t9\n" + end, 5,
-         "other colorants"},
+        {table("SAMPLE_NAME\t" + cmyk, "1\tGrün\t0\t0\t0\t10\n" + end), 4,
+         "row 1 of the definition has lost"},
+        {table("SAMPLE_NAME\t" + cmyk + "\tSPOT_1", "1\tGrün\t0\t0\t0\t0\t10\n" + end), 4,
+         "row 1 of the definition has lost"},
+        {table("LAB_L\tLAB_A\tLAB_B", "1\t50\t0\t0\n" + end), 5, "other colorants"},
+        {table(cmyk + "\tSPOT_1", "1\t0\t0\t0\t0\t9\n" + end), 5, "other colorants"},
     };
-    for (const auto& c : cases)
+    for (const auto& c : refused)
         expectFailure(measure(crlf(c.text), virtualPrint), c.exitCode, c.words);
-    std::filesystem::remove(m_folder.path("definition.it8"));
-    expectFailure(support::run({MEASURE_TOOL, writeOptions()}, environmentWith(virtualPrint)), 4,
-                  "is not there");
 }
 
-// The library takes the measurement, finds every patch and, against the profile itself, no error.
-TEST_F(MeasureTool, IsReadByTheLibrary) {
-    ASSERT_EQ(measure(definitionOf(grid({0, 40, 100})), virtualPrint + "spectra = yes\n").exitCode,
-              0);
-    tolerancePresetParameterRecord preset;
-    ASSERT_EQ(parsePresetParameterXMLFile(
-                  stringToWstring(TINTGATE_SOURCE_DIR "/presets/CVP_0001.xml"), &preset, false),
-              0);
-    analyseResultsRecord results;
-    std::wstring json;
-    ASSERT_EQ(analyzeMeasurements(stringToWstring(profile), stringToWstring(m_output), L"", preset,
-                                  &results, &json, nullptr),
-              0);
-    EXPECT_LE(results.values[6], 1e-5); // the largest difference
-    EXPECT_EQ(json.find(L"patchesUnpaired"), json.npos);
-    EXPECT_EQ(json.find(L"readerNote"), json.npos);
-    const colour::DataSet set = takeResult();
-    EXPECT_THAT(set.instrumentation, HasSubstr("Virtual"));
-    EXPECT_EQ(set.descriptor, "strip.it8");
-}
-
-// Spectra hold their colour.
 TEST_F(MeasureTool, SpectraHaveTheColourMeasured) {
-    const colour::DataSet set =
-        measured(definitionOf(grid({0, 40, 100})), virtualPrint + "spectra = yes\nerror = 1\n");
-    ASSERT_EQ(set.axis.base, 380);
-    ASSERT_EQ(set.axis.step, 10);
-    ASSERT_EQ(set.axis.length, 36);
-    const colour::SpectralWeights weights(set.axis);
-    for (std::size_t i = 0; i < set.lab.size(); ++i) {
-        const double* const spectrum = &set.spectra[36 * i];
-        EXPECT_LE(colour::deltaE76(colour::labFromXyz(weights.xyz(spectrum)), set.lab[i]), 0.001);
-        EXPECT_GT(*std::min_element(spectrum, spectrum + 36), 0);
-        EXPECT_LT(*std::max_element(spectrum, spectrum + 36), 1);
+    std::vector<double> steps;
+    for (int i = 0; i < 81; ++i)
+        for (const int place : {1, 3, 9, 27})
+            steps.push_back(i / place % 3 * 50);
+    const struct {
+        std::vector<double> inks;
+        std::string settings;
+        double least, most;
+    } cases[] = {{steps, "error = 1\n", 0, 1},
+                 {{0, 0, 0, 0}, "bias = 12 0 0\n", 1, 1.5}}; // Brighter than white, as brighteners.
+    for (const auto& [inks, settings, least, most] : cases) {
+        const colour::DataSet set =
+            measured(definitionOf(inks), virtualPrint + "spectra = yes\n" + settings);
+        ASSERT_EQ(set.axis.base, 380);
+        ASSERT_EQ(set.axis.step, 10);
+        ASSERT_EQ(set.axis.length, 36);
+        const colour::SpectralWeights weights(set.axis);
+        for (std::size_t i = 0; i < set.lab.size(); ++i) {
+            const double* const spectrum = &set.spectra[36 * i];
+            EXPECT_LE(colour::deltaE76(colour::labFromXyz(weights.xyz(spectrum)), set.lab[i]),
+                      0.001);
+            EXPECT_GT(*std::min_element(spectrum, spectrum + 36), 0);
+            EXPECT_GE(*std::max_element(spectrum, spectrum + 36), least);
+            EXPECT_LT(*std::max_element(spectrum, spectrum + 36), most);
+        }
     }
 }
 
@@ -309,6 +257,7 @@ TEST_F(MeasureTool, ErrorsHaveTheirSizeAndCanBeRepeated) {
     }
     EXPECT_LT(std::hypot(mean.L, mean.a, mean.b), 0.1); // four times its own deviation
     EXPECT_NEAR(size, 2, 0.06);
+    EXPECT_THAT(set.instrumentation, HasSubstr("Virtual")); // Nobody is to take it for real.
 
     const auto labOfLast = [](const colour::DataSet& s) { return s.lab.back().a; };
     EXPECT_EQ(labOfLast(measured(definition, settings)), labOfLast(set));
@@ -323,41 +272,36 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
              "1\t100\t0\t0\t0\tA1\n2\t40\t27\t27\t0\tA2\n3\t0\t0\t0\t0\tA3\n"
              "4\t0\t0\t0\t0\tA4\n" +
              end);
-    const std::string r1 = "1 100 0 0 0 55 -37 -50\n";
-    const std::string r2 = "2 40 27 27 0 60 1 2\n";
-    const std::string r3 = "3 0 0 0 0 95 0 -2\n";
-    const std::string r4 = "4 0 0 0 0 95 0 -3\n";
     const std::string lab = "LAB_L\tLAB_A\tLAB_B";
+    const std::string labels = "CGATS.17\n" + format(lab) + begin;
     const std::string made = "CGATS.17\nINSTRUMENTATION \"i9\"\nMEASUREMENT_CONDITION \"M1\"\n" +
                              format(cmyk + "\t" + lab) + begin;
-    const std::string labels = "CGATS.17\n" + format(lab) + begin;
+    const std::string two = "1 100 0 0 0 55 -37 -50\n2 40 27 27 0 60 1 2\n";
+    const std::string paper = "3 0 0 0 0 95 0 -2\n4 0 0 0 0 95 0 -3\n";
     const struct {
         const char* what;
         std::string text;
         int exitCode = 0;
         const char* words = "";
     } cases[] = {
-        {"as asked", made + r1 + r2 + r3 + r4 + end},
-        {"in another order", made + r3 + r2 + r4 + r1 + end},
+        {"in another order", made + paper + two + end},
         {"numbered anew, rounded", made +
                                        "11 100 0 0 0 55 -37 -50\n12 39.6 27.4 27 0 60 1 2\n"
                                        "13 0 0 0 0 95 0 -2\n14 0 0 0 0 95 0 -3\n" +
                                        end},
-        {"by ids", labels + "4 95 0 -3\n1 55 -37 -50\n2 60 1 2\n3 95 0 -2\n" + end},
         {"ids that are names here",
          labels + "A4 95 0 -3\nA1 55 -37 -50\nA2 60 1 2\nA3 95 0 -2\n" + end},
-        {"one too few", made + r1 + r2 + r3 + end, 8, "3 patches where 4"},
-        {"one too many", made + r1 + r2 + r3 + r4 + r4 + end, 8, "5 patches where 4"},
-        {"another patch", made + r1 + "2 40 27 29 0 60 1 2\n" + r3 + r4 + end, 8,
+        {"two too few", made + two + end, 8, "2 patches where 4"},
+        {"another patch", made + "1 100 0 0 0 55 -37 -50\n2 40 27 29 0 60 1 2\n" + paper + end, 8,
          "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
-        {"a patch twice", made + r1 + r2 + r3 + r2 + end, 8, "patch 4 should be 0 0 0 0"},
+        {"patches twice", made + two + two + end, 8, "patch 3 should be 0 0 0 0"},
         {"other ids", labels + "4 95 0 -3\n1 55 -37 -50\n2 60 1 2\n5 95 0 -2\n" + end, 8,
          "there is no patch 3"},
         {"no ids",
          "CGATS.17\nBEGIN_DATA_FORMAT\n" + lab + "\nEND_DATA_FORMAT\n" + begin +
              "1 2 3\n1 2 3\n1 2 3\n1 2 3\n" + end,
          8, "neither device values nor ids"},
-        {"cut off", made + r1 + r2, 7, "is damaged"},
+        {"cut off", made + two, 7, "is damaged"},
         {"no colours", head + format(cmyk) + rows + end, 7, "holds no measured colours"},
     };
     for (const auto& c : cases) {
@@ -378,8 +322,6 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         EXPECT_EQ(set.lab[3].b, -3);
         EXPECT_EQ(set.conditions.measurement, c.text.starts_with(made) ? "M1" : "");
     }
-    expectFailure(measure(definition, "instrument = file\nfile = " + profile + "\n"), 7,
-                  "no measured");
     expectFailure(measure(definition, "instrument = file\nfile = missing\n"), 7, "is not there");
 }
 
@@ -390,10 +332,10 @@ TEST_F(MeasureTool, WaitsForANewExport) {
     expectFailure(measure(definition, "instrument = file\nfile = export.txt\nwait = 1\n"), 7,
                   "was not exported in time");
     std::thread software([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(400));
+        std::this_thread::sleep_for(std::chrono::milliseconds(200));
         std::ofstream file(path);
         file << names << std::flush; // a slow one: it rests before it is done
-        std::this_thread::sleep_for(std::chrono::milliseconds(1200));
+        std::this_thread::sleep_for(std::chrono::milliseconds(700));
         file << "1 100 0 0 0 22 0 0\nEND_DATA\n";
     });
     const colour::DataSet set =
@@ -402,30 +344,12 @@ TEST_F(MeasureTool, WaitsForANewExport) {
     EXPECT_EQ(set.lab.at(0).L, 22);
 }
 
-TEST_F(MeasureTool, MishapsLeaveNoFile) {
-    const std::string definition = definitionOf(grid({0, 100}));
-    expectFailure(measure(definition, virtualPrint + "mishap = fail\n"), 10, "failed at patch 8,");
-    expectFailure(measure(definition, virtualPrint + "mishap = cancel\nmishap-at = 99\n"), 11,
-                  "cancelled at patch 16,");
-    const support::Outcome crashed = measure(definition, virtualPrint + "mishap = crash\n");
-    EXPECT_EQ(crashed.signal, SIGABRT);
-    EXPECT_EQ(takeResult().patchCount, 0u);
-    support::RunOptions impatient = environmentWith(virtualPrint + "mishap = hang\n");
-    impatient.limit = std::chrono::milliseconds(500);
-    EXPECT_TRUE(support::run({MEASURE_TOOL, writeOptions()}, impatient).timedOut);
-    EXPECT_EQ(takeResult().patchCount, 0u);
-
-    // 16 patches take at least their time.
-    const auto start = std::chrono::steady_clock::now();
-    measured(definition, virtualPrint + "delay = 10\n");
-    EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(160));
-
-    for (const std::string slow : {"mishap = hang\n", "delay = 60000\n"}) {
-        const support::Outcome ended = support::run(
-            {"timeout", "--signal=TERM", "--preserve-status", "1", MEASURE_TOOL, writeOptions()},
-            environmentWith(virtualPrint + slow));
-        expectFailure(ended, 11, "cancelled");
-    }
+TEST_F(MeasureTool, IsCancelledBySignals) {
+    m_folder.write("definition.it8", definitionOf({0, 0, 0, 0}));
+    expectFailure(
+        support::run({"timeout", "--preserve-status", "0.5", MEASURE_TOOL, writeOptions()},
+                     environmentWith(virtualPrint + "mishap = hang\n")),
+        11, "cancelled");
 }
 
 TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
@@ -441,7 +365,6 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
         int exitCode;
         const char* words;
     } cases[] = {
-        {"", virtualPrint, 2, "has no -m"},
         {replaced("measure\n", "chart\n"), virtualPrint, 2, "something else than to measure"},
         {replaced("-patch\n", "-parch\n"), virtualPrint, 2, "has no -patch"},
         {replaced("Instrument 33", "Instrument\n33"), virtualPrint, 2, "has \"33\" for"},
@@ -451,23 +374,13 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
          "would replace"},
         {replaced("-o\n" + m_output, "-o\n" + m_folder.path("out")), virtualPrint, 9,
          "is no ordinary file"},
-        {replaced("-o\n" + m_output, "-o\n" + m_folder.path("nowhere/x")), virtualPrint, 9,
-         "nothing can be written"},
         {options, "# nothing\n", 3, "has no instrument"},
-        {options, "instrument = virtual\n", 3, "has no profile"},
-        {options, "instrument = file\n", 3, "has no file"},
         {options, virtualPrint + "\nerror = 51", 3, "line 4 wants a number from 0 to 50 for error"},
-        {options, virtualPrint + "error = nan", 3, "wants a number"},
-        {options, virtualPrint + "bias = 1 2", 3, "wants three numbers"},
         {options, virtualPrint + "bias = 1 2 3 4", 3, "wants three numbers"},
-        {options, virtualPrint + "seed = -1", 3, "wants a whole number"},
-        {options, virtualPrint + "mishap = explode", 3, "wants none, fail"},
         {options, virtualPrint + "mishap-at = 0", 3, "wants the number of a patch"},
         {options, virtualPrint + "profile = x", 3, "has profile a second time"},
         {options, virtualPrint + "\x1b[2J = yes", 3, "\"?[2J\", which"},
-        {options, virtualPrint + "colour = yes", 3, "\"colour\", which is no setting"},
         {options, virtualPrint + "spectra", 3, "has no ="},
-        {options, "instrument = virtual\nprofile = missing", 6, "missing is not there"},
         {options, "instrument = virtual\nprofile = /usr/share/color/icc/sRGB.icc", 6, "for CMYK"},
         {options, "instrument = virtual\nprofile = definition.it8", 6, "is no ICC profile"},
         {options, virtualPrint + "spectra = yes\nbias = 50 0 0", 5, "no spectrum has the colour"},
@@ -479,8 +392,6 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
     }
     EXPECT_EQ(support::contentsOf(m_folder.path("definition.it8")), definitionOf({0, 0, 0, 0}));
     EXPECT_EQ(support::run({MEASURE_TOOL}).exitCode, 64);
-    EXPECT_EQ(support::run({MEASURE_TOOL, "a", "b"}).exitCode, 64);
-    EXPECT_EQ(support::run({MEASURE_TOOL, m_folder.path("missing")}).exitCode, 2);
 }
 
 TEST_F(MeasureTool, ShowsProgressOnATerminalOnly) {
@@ -507,29 +418,7 @@ TEST_F(MeasureTool, IsInstalledWithItsSuite) {
     EXPECT_EQ(manager.RegisterPlugIn(&plugIn), 0);
     EXPECT_EQ(manager.CreateComGUIModuleInterface(plugIn, &interface), 0);
     EXPECT_TRUE(Helper::GetNerovaVerifyPath().FileExists());
-    const std::string program = Helper::GetNerovaMeasurePath(true).ToStdString();
-    ASSERT_TRUE(program.starts_with(root.path()));
-
-    // The settings of the root count where nothing else names any.
-    m_folder.write("definition.it8", definitionOf({0, 0, 0, 0}));
-    std::ofstream(root.path("Library/Preferences/NerovaMeasure.conf"))
-        << virtualPrint << "mishap = hang\n";
-    EXPECT_FALSE(Helper::IsNMRunning());
-    support::RunOptions options;
-    options.environment["TINTGATE_MEASURE"] = std::nullopt;
-    std::thread running([&] {
-        expectFailure(
-            support::run({"timeout", "--preserve-status", "3", program, writeOptions()}, options),
-            11, "cancelled");
-    });
-    bool seen = false;
-    for (int i = 0; i < 200 && !seen; ++i) {
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-        seen = Helper::IsNMRunning();
-    }
-    EXPECT_TRUE(seen);
-    running.join();
-    EXPECT_FALSE(Helper::IsNMRunning());
+    EXPECT_TRUE(Helper::GetNerovaMeasurePath(true).StartsWith(root.path()));
 }
 
 } // namespace

@@ -150,6 +150,7 @@ TEST_F(TintgateStore, BrokenFilesChangeNothing) {
         {key("{\"string\": \"\xff\"}"), "no JSON"},
         {R"({"format": "tintgate tickets", "version": 2, "tickets": []})", "\"version\""},
         {R"({"format": "tintgate tickets", "version": 1, "tickets": [], "more": 1})", "more"},
+        {R"({"format": "tintgate tickets", "version": 1})", "\"tickets\" is no list"},
         {ticket(R"("type": 3, "id": 2)"), "has no \"keys\""},
         {ticket(R"("type": 3, "id": 18446744073709551617, "keys": {})"), "16777215"},
         {ticket(R"("type": 3, "id": 1, "keys": {})"), "job/1 stands there twice"},
