@@ -1,5 +1,4 @@
-#include <filesystem>
-#include <functional>
+#include <map>
 #include <string>
 #include <vector>
 
@@ -7,8 +6,7 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
-#include "RunProgram.h"
-#include "ScratchFolder.h"
+#include "StoreProgram.h"
 
 namespace {
 
@@ -18,11 +16,7 @@ using testing::ContainsRegex;
 using testing::HasSubstr;
 using testing::Not;
 
-namespace fs = std::filesystem;
-
-std::string dateOf(int job) {
-    return "2026-11-" + std::string(job < 10 ? "0" : "") + std::to_string(job);
-}
+constexpr const char* source = TINTGATE_SOURCE_DIR;
 
 /// Values by the server's position for results.
 json measuredOf(double cyan) {
@@ -44,6 +38,7 @@ json approvalsOf(bool cyan) {
 json jobOf(int job, const std::string& root = "Remote/Measurement", const std::string& two = "") {
     const double cyan = 0.3 * job;
     const bool passes = cyan <= 3;
+    const std::string day = (job < 10 ? "0" : "") + std::to_string(job);
     json keys = {{"Input/Title", {{"string", "Order " + std::to_string(job)}}},
                  {"CMM/PaperName", {{"string", "Matt <b>"}}},
                  {"Workflow/Name", {{"string", "Press 2"}}},
@@ -53,7 +48,7 @@ json jobOf(int job, const std::string& root = "Remote/Measurement", const std::s
                  {"Footer/ControlstripFile" + two, {{"string", "/x/y/example.tif"}}},
                  {root + "/Status", {{"int", 1}}},
                  {root + "/Approval", {{"int", passes ? 1 : 0}}},
-                 {root + "/Date", {{"string", dateOf(job)}}},
+                 {root + "/Date", {{"string", "2026-11-" + day}}},
                  {root + "/Time", {{"string", "21:53:07"}}},
                  {root + "/Values/Measured", {{"double", measuredOf(cyan)}}},
                  {root + "/Values/Approval", {{"int", approvalsOf(passes)}}},
@@ -67,54 +62,46 @@ json jobOf(int job, const std::string& root = "Remote/Measurement", const std::s
     return {{"type", 3}, {"id", job}, {"keys", keys}};
 }
 
-class StoreTrend : public testing::Test {
+class StoreTrend : public StoreProgram {
   protected:
     static constexpr int jobs = 12;
 
     StoreTrend() {
-        administer({"make"});
-        putFile("/server/tickets/CVP_0001.xml",
-                support::contentsOf(TINTGATE_SOURCE_DIR "/presets/CVP_0001.xml"));
-        putFile("/server/ControlCharts/example.it8", "IT8.7/2\nDEVICE 33\n");
-        std::vector<json> tickets = {presetTicket(1)};
-        for (int job = 1; job <= jobs; ++job)
-            tickets.push_back(jobOf(job));
-        import(tickets);
-        m_scratch.makeFolder("Tintgate");
+        answer({"make"});
+        for (const std::string preset : {"1", "7"})
+            answer({"file", "put", source + ("/presets/CVP_000" + preset + ".xml"),
+                    "/server/tickets/CVP_000" + preset + ".xml"});
+        answer({"file", "put", m_folder.write("strip", "IT8.7/2\nDEVICE 33\n"),
+                "/server/ControlCharts/example.it8"});
+        importJobs();
     }
 
-    static json presetTicket(int id) {
-        return {{"type", 27}, {"id", id}, {"keys", {{"Name", {{"string", "Contract proof"}}}}}};
-    }
-
-    void administer(std::vector<std::string> words) const {
-        words.insert(words.begin(), {TINTGATE_STORE_PROGRAM, "--store", m_store});
-        const support::Outcome outcome = support::run(words);
-        EXPECT_EQ(outcome.exitCode, 0) << outcome.error;
-    }
-    void putFile(const std::string& path, const std::string& text) const {
-        administer({"file", "put", m_scratch.write("file", text), path});
-    }
     void import(const std::vector<json>& tickets) const {
         const json file = {{"format", "tintgate tickets"}, {"version", 1}, {"tickets", tickets}};
-        administer({"import", m_scratch.write("tickets.json", file.dump())});
+        answer({"import", m_folder.write("tickets.json", file.dump())});
     }
-    void change(json ticket, const std::function<void(json& keys)>& work) const {
-        work(ticket["keys"]);
-        import({ticket});
+    /// All jobs; the changes of a job are merged into its keys.
+    void importJobs(const std::map<int, json>& changes = {}) const {
+        const json name = {{"Name", {{"string", "Contract proof"}}}};
+        std::vector<json> tickets = {{{"type", 27}, {"id", 1}, {"keys", name}},
+                                     {{"type", 27}, {"id", 7}, {"keys", name}}};
+        for (int job = 1; job <= jobs; ++job) {
+            tickets.push_back(jobOf(job));
+            if (changes.count(job) > 0)
+                tickets.back()["keys"].merge_patch(changes.at(job));
+        }
+        import(tickets);
     }
 
     support::Outcome report(std::vector<std::string> words) const {
         support::RunOptions options;
-        options.environment["TMPDIR"] = m_scratch.path();
-        options.environment["TINTGATE_INSTRUMENTS"] = m_scratch.write("names", "33 = Bench 3\n");
-        words.insert(words.begin(), {TINTGATE_REPORT, "--store", m_store});
+        options.environment = {{"TMPDIR", m_folder.path()},
+                               {"TINTGATE_STORE", m_address},
+                               {"TINTGATE_INSTRUMENTS", m_folder.write("names", "33 = Bench 3\n")}};
+        words.insert(words.begin(), TINTGATE_REPORT);
         return support::run(words, options);
     }
     std::string text() const { return report({"--text"}).output; }
-
-    const support::ScratchFolder m_scratch;
-    const std::string m_store = m_scratch.path("store");
 };
 
 TEST_F(StoreTrend, ReadsTheResultsOfJobs) {
@@ -131,29 +118,28 @@ TEST_F(StoreTrend, ReadsTheResultsOfJobs) {
     EXPECT_THAT(report({"--text", "--since", "2026-11-11"}).output, HasSubstr("2 results"));
     EXPECT_THAT(report({"--text", "--instrument", "bench"}).output, HasSubstr("12 results"));
     EXPECT_EQ(report({"--text", "--paper", "gloss"}).exitCode, 7);
+    EXPECT_EQ(report({"--store", m_folder.path("nowhere")}).exitCode, 8);
 
     // Both patches of full cyan count, and the page holds the same numbers.
-    const std::string page = m_scratch.path("trend.html");
-    ASSERT_EQ(report({"-o", page}).exitCode, 0);
-    EXPECT_THAT(support::contentsOf(page),
+    EXPECT_THAT(report({"-o", "-"}).output,
                 AllOf(HasSubstr("\"began\":\"55.9 -37.0 -50.0\""),
                       HasSubstr("[0.3,0.6,0.9,1.2,1.5"), Not(HasSubstr("Matt <b>"))));
 }
 
 TEST_F(StoreTrend, LeavesOutWhatIsNoResultAndSaysWhatItCantKnow) {
-    change(jobOf(1), [](json& keys) { keys["Remote/Measurement/Approval"] = {{"int", -1}}; });
-    change(jobOf(2), [](json& keys) { keys.erase("Remote/Measurement/Date"); });
-    change(jobOf(3), [](json& keys) { keys["Remote/Measurement/Approval"] = {{"double", 1.0}}; });
-    change(jobOf(4),
-           [](json& keys) { keys["Remote/Measurement/LabValues/LValues"]["double"] = {95}; });
-    // Judged when the tolerance was lower.
-    change(jobOf(5), [](json& keys) {
-        keys["Remote/Measurement/Values/Approval"]["int"] = approvalsOf(false);
-        keys["Remote/Measurement/Approval"]["int"] = 0;
-    });
-    change(jobOf(6), [](json& keys) {
-        keys["Remote/Measurement/Values/Measured"]["double"][5] = -1.0;
-        keys["Remote/Measurement/Approval"]["int"] = 0;
+    const std::string root = "Remote/Measurement/";
+    const json failed = {{"int", 0}};
+    json unanswered = measuredOf(1.8);
+    unanswered[5] = -1.0;
+    importJobs({
+        {1, {{root + "Approval", {{"int", -1}}}}},
+        {2, {{root + "Date", nullptr}}},
+        {3, {{root + "Approval", {{"int", nullptr}, {"double", 1.0}}}}},
+        {4, {{root + "LabValues/LValues", {{"double", {95}}}}}},
+        // Judged when the tolerance was lower.
+        {5,
+         {{root + "Values/Approval", {{"int", approvalsOf(false)}}}, {root + "Approval", failed}}},
+        {6, {{root + "Values/Measured", {{"double", unanswered}}}, {root + "Approval", failed}}},
     });
     import({jobOf(20, "Remote/Measurement2", "2")});
     EXPECT_THAT(text(), AllOf(HasSubstr("9 results, 4 November 2026 to 12 November 2026: 5 passed, "
@@ -162,36 +148,23 @@ TEST_F(StoreTrend, LeavesOutWhatIsNoResultAndSaysWhatItCantKnow) {
                               ContainsRegex("Solid cyan +3.60 +of 3.00 +ΔE00 +3 of 9 above"),
                               ContainsRegex("All patches, average +1.13 +of 2.50 +ΔE00 +0 of 8"),
                               HasSubstr("Press 2 · second strip")));
-
-    change(jobOf(7), [](json& keys) { keys["Workflow/Verify/ComparisonMethod"]["int"] = 2; });
-    EXPECT_THAT(text(), HasSubstr("The file of preset 2 can't be read"));
 }
 
-// The PSD kind keeps ten approvals by the criterion's own entry, and its tolerances apart.
-TEST_F(StoreTrend, KnowsPresetsOfThePsdKind) {
-    putFile("/server/tickets/CVP_0007.xml",
-            support::contentsOf(TINTGATE_SOURCE_DIR "/presets/CVP_0007.xml"));
-    std::vector<json> tickets = {presetTicket(7)};
+TEST_F(StoreTrend, KnowsPresetsOfThePsdKindAndJobsWithoutColours) {
+    // The PSD kind keeps ten approvals by the criterion's own entry, and its tolerances apart. A
+    // measurement without spectra leaves no colours in a ticket.
+    std::map<int, json> changes;
     for (int job = 1; job <= jobs; ++job) {
-        json ticket = jobOf(job);
-        json& keys = ticket["keys"];
-        keys["Workflow/Verify/ComparisonMethod"]["int"] = 7;
-        json approvals = std::vector<int>(10, 1);
+        std::vector<int> approvals(10, 1);
         approvals[4] = job == 12 ? 0 : 1; // Paper white.
-        keys["Remote/Measurement/Values/PSDApproval"] = {{"int", approvals}};
-        tickets.push_back(ticket);
+        changes[job] = {{"Workflow/Verify/ComparisonMethod", {{"int", job == 1 ? 2 : 7}}},
+                        {"Remote/Measurement/Values/PSDApproval", {{"int", approvals}}},
+                        {"Remote/Measurement/LabValues/LValues", nullptr}};
     }
-    import(tickets);
-    EXPECT_THAT(text(), ContainsRegex("Paper white +0.25 +of 5.00 +ΔE00 +1 of 12 above"));
-}
-
-// A measurement without spectra leaves no colours in a ticket.
-TEST_F(StoreTrend, TellsADriftByDifferencesWhereThereAreNoColours) {
-    for (int job = 1; job <= jobs; ++job)
-        change(jobOf(job), [](json& keys) { keys.erase("Remote/Measurement/LabValues/LValues"); });
-    EXPECT_THAT(text(), AllOf(HasSubstr("Drifting: cyan"),
-                              HasSubstr("Cyan: Its difference is 1.64 larger than at first"),
-                              ContainsRegex("Steady +Black +0.50 +of 3.00")));
+    importJobs(changes);
+    EXPECT_THAT(text(), AllOf(ContainsRegex("Paper white +0.25 +of 5.00 +ΔE00 +1 of 11 above"),
+                              HasSubstr("Drifting: cyan"), HasSubstr("Cyan: Its difference is "),
+                              HasSubstr("The file of preset 2 can't be read")));
 }
 
 TEST_F(StoreTrend, CountsTheResultOfASheetOnce) {
@@ -205,47 +178,31 @@ TEST_F(StoreTrend, CountsTheResultOfASheetOnce) {
     }
     import(tickets);
     EXPECT_THAT(text(), HasSubstr("13 results"));
-    const std::string page = report({"-o", "-"}).output;
-    EXPECT_THAT(page, AllOf(HasSubstr("\"Sheet 31\""), Not(HasSubstr("\"Sheet 30\"")),
-                            Not(HasSubstr("\"Sheet 32\""))));
+    EXPECT_THAT(report({"-o", "-"}).output,
+                AllOf(HasSubstr("\"Sheet 31\""), Not(HasSubstr("\"Sheet 30\"")),
+                      Not(HasSubstr("\"Sheet 32\""))));
 }
 
 TEST_F(StoreTrend, LeadsToThePagesOnThisMachine) {
-    m_scratch.makeFolder("Tintgate/JobID_5");
-    json meta =
-        json::parse(support::contentsOf(TINTGATE_SOURCE_DIR "/tests/data/report/meta.json"));
+    const std::string data = source + std::string("/tests/data/report/");
+    m_folder.makeFolder("Tintgate/JobID_5");
+    m_folder.write("Tintgate/JobID_5/output.json", support::contentsOf(data + "output.json"));
+    json meta = json::parse(support::contentsOf(data + "meta.json"));
     meta["job"]["id"] = 5;
     meta["job"]["strip"] = 1;
     meta["job"]["title"] = "Order 5";
-    fs::copy_file(TINTGATE_SOURCE_DIR "/tests/data/report/output.json",
-                  m_scratch.path("Tintgate/JobID_5/output.json"));
-    const auto view = [&](const std::string& created) {
+    for (const char* created : {"2026-11-05T21:53:00+01:00",    // Of the run before.
+                                "2026-11-05T21:53:09+01:00",    // That of the ticket.
+                                "2026-11-06T10:00:00+01:00"}) { // Compared again.
         meta["created"] = created;
-        m_scratch.write("Tintgate/JobID_5/meta.json", meta.dump());
-        EXPECT_EQ(
-            support::run({VIEWER, "-meta", m_scratch.path("Tintgate/JobID_5/meta.json")}).exitCode,
-            0);
-    };
-    view("2026-11-05T21:53:00+01:00"); // Of the run before.
-    view("2026-11-05T21:53:09+01:00");
-    view("2026-11-06T10:00:00+01:00"); // Compared again.
-    m_scratch.makeFolder("pages");
-    ASSERT_EQ(report({"-o", m_scratch.path("pages/trend.html")}).exitCode, 0);
-    const std::string page = support::contentsOf(m_scratch.path("pages/trend.html"));
+        const auto path = m_folder.write("Tintgate/JobID_5/meta.json", meta.dump());
+        EXPECT_EQ(support::run({VIEWER, "-meta", path}).exitCode, 0);
+    }
+    m_folder.makeFolder("pages");
+    ASSERT_EQ(report({"-o", m_folder.path("pages/trend.html")}).exitCode, 0);
+    const std::string page = support::contentsOf(m_folder.path("pages/trend.html"));
     EXPECT_THAT(page, HasSubstr("./../Tintgate/JobID_5/report-strip1-2026-11-05-215309.html"));
     EXPECT_EQ(page.find("report-strip1-"), page.rfind("report-strip1-"));
-}
-
-TEST_F(StoreTrend, EndsInAStatusOfItsOwnWithoutAStore) {
-    const support::Outcome outcome =
-        support::run({TINTGATE_REPORT, "--store", m_scratch.path("nowhere")});
-    EXPECT_EQ(outcome.exitCode, 8);
-    EXPECT_NE(outcome.error, "");
-    EXPECT_EQ(outcome.output, "");
-
-    support::RunOptions options;
-    options.environment["TINTGATE_STORE"] = m_store;
-    EXPECT_THAT(support::run({TINTGATE_REPORT, "--text"}, options).output, HasSubstr("12 results"));
 }
 
 } // namespace
