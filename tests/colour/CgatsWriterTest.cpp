@@ -15,60 +15,56 @@ using testing::HasSubstr;
 
 namespace {
 
-void expectSame(const DataSet& left, const DataSet& right) {
-    EXPECT_EQ(left.patchCount, right.patchCount);
-    EXPECT_EQ(left.ids, right.ids);
-    EXPECT_EQ(left.names, right.names);
-    EXPECT_EQ(left.deviceSpace, right.deviceSpace);
-    EXPECT_EQ(left.channels, right.channels);
-    EXPECT_EQ(left.device, right.device);
-    EXPECT_EQ(left.spectra, right.spectra);
-    EXPECT_EQ(left.axis.base, right.axis.base);
-    EXPECT_EQ(left.axis.step, right.axis.step);
-    EXPECT_EQ(left.axis.length, right.axis.length);
-    EXPECT_EQ(left.originator, right.originator);
-    EXPECT_EQ(left.descriptor, right.descriptor);
-    EXPECT_EQ(left.created, right.created);
-    EXPECT_EQ(left.instrumentation, right.instrumentation);
-    EXPECT_EQ(left.conditions, right.conditions);
-    ASSERT_EQ(left.lab.size(), right.lab.size());
-    ASSERT_EQ(left.xyz.size(), right.xyz.size());
-    for (std::size_t i = 0; i < left.lab.size(); ++i) {
-        EXPECT_EQ(left.lab[i].L, right.lab[i].L);
-        EXPECT_EQ(left.lab[i].a, right.lab[i].a);
-        EXPECT_EQ(left.lab[i].b, right.lab[i].b);
-        EXPECT_EQ(left.xyz[i].X, right.xyz[i].X);
-        EXPECT_EQ(left.xyz[i].Y, right.xyz[i].Y);
-        EXPECT_EQ(left.xyz[i].Z, right.xyz[i].Z);
-    }
+std::vector<std::string> textsOf(const DataSet& set) {
+    std::vector<std::string> all = {set.originator,
+                                    set.descriptor,
+                                    set.created,
+                                    set.instrumentation,
+                                    set.conditions.illuminant,
+                                    set.conditions.observer,
+                                    set.conditions.measurement};
+    for (const auto* more : {&set.ids, &set.names, &set.channels})
+        all.insert(all.end(), more->begin(), more->end());
+    return all;
 }
 
-DataSet readBack(const DataSet& set) {
+std::vector<double> numbersOf(const DataSet& set) {
+    std::vector<double> all = set.device;
+    all.insert(all.end(), set.spectra.begin(), set.spectra.end());
+    for (const Lab& lab : set.lab)
+        all.insert(all.end(), {lab.L, lab.a, lab.b});
+    for (const Xyz& xyz : set.xyz)
+        all.insert(all.end(), {xyz.X, xyz.Y, xyz.Z});
+    for (const int number : {set.axis.base, set.axis.step, set.axis.length})
+        all.push_back(number);
+    return all;
+}
+
+void expectReadBack(const DataSet& set) {
     DataSet back;
-    EXPECT_EQ(readCgats(writeCgats(set), {}, back), Failure::None) << writeCgats(set);
-    for (const std::string& note : back.notes)
-        EXPECT_THAT(note,
-                    HasSubstr("other conditions than D50")); // nothing assumed, nothing mended
-    return back;
+    ASSERT_EQ(readCgats(writeCgats(set), {}, back), Failure::None) << writeCgats(set);
+    EXPECT_EQ(textsOf(back), textsOf(set));
+    EXPECT_EQ(numbersOf(back), numbersOf(set));
+    for (const std::string& note : back.notes) // nothing assumed, nothing mended
+        EXPECT_THAT(note, HasSubstr("other conditions than D50"));
 }
 
 /// Patches with values of full length.
-DataSet randomSet(std::size_t patches, bool withSpectra) {
+DataSet randomSet(std::size_t patches) {
     std::mt19937_64 engine(11);
     std::uniform_real_distribution<double> unit(0, 1);
     DataSet set;
     set.patchCount = patches;
     set.deviceSpace = DeviceSpace::Cmyk;
     set.channels = {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
-    if (withSpectra)
-        set.axis = {380, 10, 36};
+    set.axis = {380, 10, 36};
     for (std::size_t i = 0; i < patches; ++i) {
         set.ids.push_back(std::to_string(i + 1));
         for (int k = 0; k < 4; ++k)
             set.device.push_back(100 * unit(engine));
         set.lab.push_back({100 * unit(engine), 120 * unit(engine) - 60, 120 * unit(engine) - 60});
         set.xyz.push_back(xyzFromLab(set.lab.back()));
-        for (int k = 0; k < set.axis.length; ++k)
+        for (int k = 0; k < 36; ++k)
             set.spectra.push_back(unit(engine));
     }
     return set;
@@ -77,7 +73,7 @@ DataSet randomSet(std::size_t patches, bool withSpectra) {
 } // namespace
 
 TEST(CgatsWriter, IsReadBackToTheLastBit) {
-    DataSet set = randomSet(200, true);
+    DataSet set = randomSet(200);
     set.originator = "Müller \"& Co\"";
     set.descriptor = "a\ttab, a # and 5\"";
     set.created = "2024-05-03T10:11:12+02:00";
@@ -91,10 +87,10 @@ TEST(CgatsWriter, IsReadBackToTheLastBit) {
     set.ids[5] = "END_DATA";
     set.ids[6] = set.ids[7];
     set.ids[8] = "a,b;c";
-    expectSame(readBack(set), set);
+    expectReadBack(set);
 }
 
-// Sets that don't show their own scale.
+// A set that does not show its own scales.
 TEST(CgatsWriter, StatesItsScales) {
     DataSet dark;
     dark.patchCount = 1;
@@ -106,43 +102,27 @@ TEST(CgatsWriter, StatesItsScales) {
     dark.spectra.assign(31, 3.5);
     dark.xyz = {{0.5, 0.25, 0.125}};
     dark.lab = {labFromXyz(dark.xyz[0])};
-    expectSame(readBack(dark), dark);
-
-    DataSet device = dark;
-    device.spectra.clear();
-    device.axis = {};
-    device.xyz.clear();
-    device.lab.clear();
-    device.deviceSpace = DeviceSpace::Rgb;
-    device.channels = {"RGB_R", "RGB_G", "RGB_B"};
-    device.device = {0.5, 1, 0};
-    expectSame(readBack(device), device);
+    expectReadBack(dark);
 }
 
 // ArgyllCMS as a second reader: it finds no difference between a text of ours and one of its own,
 // and makes a profile's input of it.
 TEST(CgatsWriter, IsReadByArgyll) {
     const support::ScratchFolder folder;
-    DataSet fogra;
-    ASSERT_EQ(readCgats(support::contentsOf("/usr/share/color/icc/FOGRA39L.ti3"), {}, fogra),
-              Failure::None);
-    const std::string ours = folder.write("ours.txt", writeCgats(fogra));
+    const std::string fogra = "/usr/share/color/icc/FOGRA39L.ti3";
+    DataSet set;
+    ASSERT_EQ(readCgats(support::contentsOf(fogra), {}, set), Failure::None);
     const support::Outcome compared =
-        support::run({"colverify", "-v", "/usr/share/color/icc/FOGRA39L.ti3", ours});
-    EXPECT_EQ(compared.exitCode, 0) << compared.error;
-    EXPECT_THAT(compared.output, HasSubstr("No of test patches = 1617"));
+        support::run({"colverify", "-v", fogra, folder.write("ours.txt", writeCgats(set))});
+    EXPECT_THAT(compared.output, HasSubstr("No of test patches = 1617")) << compared.error;
     EXPECT_THAT(compared.output, HasSubstr("peak = 0.000000, avg = 0.000000"));
 
-    const std::string measured = folder.write("measured.txt", writeCgats(randomSet(50, true)));
+    set = randomSet(50);
+    const std::string measured = folder.write("measured.txt", writeCgats(set));
     const support::Outcome converted = support::run({"txt2ti3", measured, folder.path("measured")});
     EXPECT_EQ(converted.exitCode, 0) << converted.error;
     DataSet back;
     ASSERT_EQ(readCgats(support::contentsOf(folder.path("measured.ti3")), {}, back), Failure::None);
-    EXPECT_EQ(back.patchCount, 50U);
-    EXPECT_EQ(back.axis.length, 36);
-    const DataSet set = randomSet(50, true);
-    for (std::size_t i = 0; i < 50; ++i) {
-        EXPECT_NEAR(back.device[4 * i], set.device[4 * i], 1e-3);
-        EXPECT_NEAR(back.spectra[36 * i + 7], set.spectra[36 * i + 7], 1e-5);
-    }
+    EXPECT_THAT(back.device, testing::Pointwise(testing::DoubleNear(1e-3), set.device));
+    EXPECT_THAT(back.spectra, testing::Pointwise(testing::DoubleNear(1e-5), set.spectra));
 }
