@@ -2,8 +2,7 @@
 //
 // What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction of two
 // round trips: it locks the ticket's row and fetches what it needs, then writes and commits.
-#include <algorithm>
-#include <climits>
+#include <ctime>
 #include <map>
 #include <utility>
 
@@ -11,6 +10,7 @@
 #include "comgui/KeyBytes.h"
 #include "comgui/Postgres.h"
 #include "comgui/PostgresFiles.h"
+#include "comgui/PostgresListing.h"
 #include "comgui/PostgresSchema.h"
 
 namespace store {
@@ -56,14 +56,6 @@ constexpr Statement someKeys = {
     " EXISTS (SELECT FROM unnest($4::bytea[]) AS prefix"
     " WHERE substring(name FOR length(prefix)) = prefix))"
     " WHERE type = $1 AND id = $2"};
-// Such keys hold few different values: a row for each of them, with all the ids, costs half of what
-// a row for each key does.
-constexpr Statement keysOfType = {
-    "SELECT name, value, array_agg(id) FROM (SELECT name, id,"
-    " CASE WHEN length(value) <= $3 THEN value END AS value"
-    " FROM tintgate.tickets JOIN tintgate.keys ON ticket = number WHERE type = $1"
-    " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($2::bytea[]) AS name))) AS found"
-    " GROUP BY name, value"};
 /// Which transactions have come to their end. While this is the same, nobody has committed
 /// anything.
 constexpr Statement snapshot = {"SELECT pg_current_snapshot()::text"};
@@ -103,6 +95,24 @@ User userIn(const Result& rows, int row) {
     return {rows.text(row, 0), rows.text(row, 1), rows.number(row, 2) != 0};
 }
 
+/// For ages. It is looked at for each read of a listing, of which the exact clock would be a third.
+struct CoarseClock {
+    using duration = std::chrono::nanoseconds;
+    using rep = duration::rep;
+    using period = duration::period;
+    using time_point = std::chrono::time_point<CoarseClock>;
+    static constexpr bool is_steady = true;
+
+    /// A tick of the system, by which it is late at most.
+    static constexpr std::chrono::milliseconds coarseness{10};
+
+    static time_point now() {
+        timespec now{};
+        clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+        return time_point(std::chrono::seconds(now.tv_sec) + duration(now.tv_nsec));
+    }
+};
+
 class PostgresEngine : public StoreEngine {
   public:
     explicit PostgresEngine(Connection connection) : m_connection(std::move(connection)) {}
@@ -110,22 +120,30 @@ class PostgresEngine : public StoreEngine {
     bool alive() override { return !m_connection.lost(); }
 
     std::uint64_t commits(std::chrono::milliseconds age) override {
-        const auto now = std::chrono::steady_clock::now();
-        if (m_snapshot.empty() ||
-            (now - m_asked > age && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
+        const auto now = CoarseClock::now();
+        const bool asks = now - m_asked > age - CoarseClock::coarseness;
+        if (m_snapshot.empty() || (asks && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
             noteChange();
-        } else if (now - m_asked > age) {
+        } else if (asks) {
             m_asked = now;
         }
         return m_commits;
     }
 
     std::vector<int> ids(int type) override {
-        const Result row = m_connection.run(idsOf, type);
+        // Clients ask for their number, and then for the ids.
+        if (type == m_ids.type && m_connection.run(snapshot).bytes(0, 0) == m_ids.snapshot) {
+            return m_ids.ids;
+        }
+        // The snapshot first: what is committed between the two only has them fetched again.
+        m_connection.send(snapshot);
+        m_connection.send(idsOf, type);
+        const auto results = m_connection.finish();
         std::vector<int> ids;
-        for (ArrayReader array(row.bytes(0, 0)); array.left() != 0;) {
+        for (ArrayReader array(results[1].bytes(0, 0)); array.left() != 0;) {
             ids.push_back(static_cast<int>(postgres::numberOf(array.next())));
         }
+        m_ids = {type, results[0].text(0, 0), ids};
         return ids;
     }
 
@@ -191,12 +209,11 @@ class PostgresEngine : public StoreEngine {
     void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
                    const ShowKey& show) override {
         // The snapshot first: what is committed between the two only has it all fetched again.
-        m_asked = std::chrono::steady_clock::now();
+        m_asked = CoarseClock::now();
         m_connection.send(snapshot);
-        m_connection.send(keysOfType, type, Names(names.begin(), names.end()),
-                          static_cast<int>(std::min<std::size_t>(largestBytes, INT_MAX)));
+        postgres::askForKeys(m_connection, type, names, largestBytes);
         const auto results = m_connection.finish();
-        showKeys(results[1], names, show);
+        postgres::showKeys(results[1], names, show);
         m_snapshot = results[0].text(0, 0);
     }
 
@@ -302,6 +319,13 @@ class PostgresEngine : public StoreEngine {
         std::shared_ptr<const Elements> elements;
     };
 
+    /// The ids that were asked for last.
+    struct Ids {
+        int type = -1;
+        std::string snapshot; ///< Of when they were fetched, or before.
+        std::vector<int> ids;
+    };
+
     void noteChange() {
         m_snapshot.clear();
         ++m_commits;
@@ -316,27 +340,6 @@ class PostgresEngine : public StoreEngine {
             }
         }
         return content;
-    }
-
-    /// Of rows of a name, a value and the ids of all tickets that have it.
-    static void showKeys(const Result& rows, const std::vector<std::string>& names,
-                         const ShowKey& show) {
-        std::vector<std::pair<int, int>> keys; // Id and row.
-        std::vector<std::size_t> nameOf;
-        std::vector<std::shared_ptr<const Elements>> elementsOf;
-        for (int row = 0; row < rows.rows(); ++row) {
-            const auto name = std::find(names.begin(), names.end(), rows.bytes(row, 0));
-            nameOf.push_back(static_cast<std::size_t>(name - names.begin()));
-            elementsOf.push_back(rows.isNull(row, 1) ? nullptr : decoded(rows.bytes(row, 1)));
-            for (ArrayReader ids(rows.bytes(row, 2)); ids.left() != 0;) {
-                keys.emplace_back(static_cast<int>(postgres::numberOf(ids.next())), row);
-            }
-        }
-        std::sort(keys.begin(), keys.end());
-        for (const auto& [id, row] : keys) {
-            const auto index = static_cast<std::size_t>(row);
-            show(id, nameOf[index], elementsOf[index]);
-        }
     }
 
     /// Sends what makes the ticket's keys those of after. False when there is nothing to write.
@@ -381,7 +384,8 @@ class PostgresEngine : public StoreEngine {
     Fetched m_last;
     std::uint64_t m_commits = 0;
     std::string m_snapshot; ///< Of the last keysOfAll; empty once somebody has committed since.
-    std::chrono::steady_clock::time_point m_asked; ///< When that was still the server's.
+    CoarseClock::time_point m_asked; ///< When that was still the server's.
+    Ids m_ids;
 };
 
 std::unique_ptr<StoreEngine> openPostgres(const std::string& service) {

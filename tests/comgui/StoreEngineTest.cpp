@@ -84,10 +84,12 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
     const auto write = [&](int id, int value, const std::string& more = {}) {
         send(*other, 3, id, status + "=" + std::to_string(value) + " " + more);
     };
-    for (const int id : {1, 2, 3}) {
+    for (const int id : {3, 1, 2}) {
         other->create(3, id);
         write(id, 200 + id);
     }
+    other->create(27, 2); // Of another type.
+    send(*other, 27, 2, status + "=1");
     // From here on the keep holds the status of all jobs; no read may show what is no longer there.
     EXPECT_EQ(keep.ids(3), (std::vector<int>{1, 2, 3}));
     EXPECT_EQ(read(1, status), 201);
@@ -106,7 +108,7 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
     EXPECT_EQ(read(1, status), 201);
     other->remove(3, 1);
     EXPECT_EQ(read(1, status), -1);
-    keep.ids(3);
+    EXPECT_EQ(keep.ids(3), (std::vector<int>{2, 3}));
     EXPECT_EQ(read(2, status), 209);
     write(3, 8);
     keep.ids(3);
