@@ -14,7 +14,6 @@ namespace {
 
 using namespace report;
 using testing::ElementsAre;
-using testing::HasSubstr;
 
 constexpr double none = std::numeric_limits<double>::quiet_NaN();
 
@@ -56,7 +55,6 @@ TEST(Drift, SeesASlowMoveAndRarelyAnythingElse) {
 
     EXPECT_FALSE(driftOf({0, 0, 0, 0, 0, 5, 5, 5, 5}).significant); // Too few to say.
     EXPECT_TRUE(driftOf({0, 0, 0, 0, 0, 5, 5, 5, 5, 5}).significant);
-    EXPECT_FALSE(driftOf(std::vector<double>(50, 3.25)).significant);
     EXPECT_TRUE(std::isnan(driftOf({none, none}).began));
 }
 
@@ -64,17 +62,10 @@ TEST(Ink, IsToldByDeviceValues) {
     const struct {
         std::vector<double> device;
         std::optional<Ink> ink;
-    } cases[] = {{{0, 0, 0, 0}, Ink::Paper},
-                 {{99.6, 0.4, 0, 0}, Ink::Cyan},
-                 {{0, 100, 0, 0}, Ink::Magenta},
-                 {{0, 0, 100, 0}, Ink::Yellow},
-                 {{0, 0, 0, 100, 0}, Ink::Black},
-                 {{99, 0, 0, 0}, {}},
-                 {{100, 100, 0, 0}, {}},
-                 {{100, 1, 0, 0}, {}},
-                 {{0, 0, 0, 0, 100}, {}},
-                 {{0, 0, 0}, {}},
-                 {{none, 0, 0, 0}, {}}};
+    } cases[] = {
+        {{0, 0, 0, 0}, Ink::Paper}, {{99.6, 0.4, 0, 0}, Ink::Cyan}, {{0, 0, 0, 100, 0}, Ink::Black},
+        {{99, 0, 0, 0}, {}},        {{100, 1, 0, 0}, {}},           {{0, 0, 0, 0, 100}, {}},
+        {{none, 0, 0, 0}, {}}};
     for (const auto& [device, ink] : cases)
         EXPECT_EQ(inkOf(device.data(), device.size()), ink) << device[0] << ' ' << device.size();
 }
@@ -106,7 +97,11 @@ TEST(Trend, SaysWhichInkDriftsAndComparesLikeWithLike) {
     for (int day = 39; day >= 0; --day) // In no order of time.
         samples.push_back(sampleAt(day, day < 20 ? 0.5 : 0.5 + 0.15 * (day - 19), 3));
     for (int day = 0; day < 50; ++day)
-        samples.push_back(sampleAt(day, 1, 3, "Gloss"));
+        samples.push_back(sampleAt(day, 2.5, day < 6 ? 3 : 2.25, "Gloss"));
+    Criterion& unanswered = samples.back().criteria[0];
+    unanswered.value.reset();
+    unanswered.rounded.reset();
+    unanswered.outcome = Outcome::Unanswered;
     samples.push_back(sampleAt(3, 1, 3, "Newsprint"));
     const TrendModel trend = makeTrend(samples, "files", {});
     ASSERT_EQ(trend.series.size(), 3u);
@@ -116,37 +111,24 @@ TEST(Trend, SaysWhichInkDriftsAndComparesLikeWithLike) {
     EXPECT_EQ(drifting.word, "Drifting: cyan");
     EXPECT_EQ(trend.samples[drifting.samples[0]].title, "Job 0");
     const InkTrend& cyan = drifting.inks[static_cast<std::size_t>(Ink::Cyan)];
-    EXPECT_EQ(cyan.movement, Movement::Drifting);
     EXPECT_NEAR(cyan.began.L, 55.5, 1e-9);
-    EXPECT_THAT(cyan.sentence, HasSubstr("lighter (L* +"));
     EXPECT_EQ(cyan.value, "3.50");
     EXPECT_TRUE(cyan.above);
     EXPECT_THAT(drifting.reasons, ElementsAre("Cyan: " + cyan.sentence,
                                               "4 of the last 20 failed, most often by Solid cyan"));
-    EXPECT_EQ(drifting.inks[0].movement, Movement::Steady);
+    EXPECT_EQ(drifting.inks[0].word, "Steady");
     EXPECT_EQ(drifting.inks[2].word, "No data");
     EXPECT_EQ(drifting.span, "2 February 2026 to 13 March 2026");
 
-    EXPECT_EQ(trend.series[1].word, "Steady");
-    EXPECT_THAT(trend.series[1].sentence, HasSubstr("Nearest to its limit: cyan, 1.00 of 3.00."));
+    // Each job keeps the tolerance that it was judged by.
+    EXPECT_EQ(trend.series[1].word, "Steady, but the latest job failed");
+    const CriterionTrend& gloss = trend.series[1].criteria[0];
+    EXPECT_THAT(gloss.tolerances, ElementsAre(std::pair(0u, 3.0), std::pair(6u, 2.25)));
+    EXPECT_EQ(gloss.failed, 43u);
+    EXPECT_EQ(gloss.answered, 49u);
+    EXPECT_TRUE(std::isnan(gloss.values[49]));
+    EXPECT_EQ(gloss.latest, "2.50");
     EXPECT_EQ(trend.series[2].word, "Too few jobs");
-    EXPECT_EQ(nearestText(trend.samples[0]), "Solid cyan 0.50 of 3.00");
-}
-
-TEST(Trend, KeepsTheToleranceThatEachJobWasJudgedBy) {
-    std::vector<Sample> samples;
-    for (int day = 0; day < 12; ++day)
-        samples.push_back(sampleAt(day, 2.5, day < 6 ? 3 : 2.25));
-    samples[11].criteria[0].value.reset();
-    samples[11].criteria[0].rounded.reset();
-    samples[11].criteria[0].outcome = Outcome::Unanswered;
-    const TrendModel trend = makeTrend(samples, "files", {});
-    const CriterionTrend& cyan = trend.series[0].criteria[0];
-    EXPECT_THAT(cyan.tolerances, ElementsAre(std::pair(0u, 3.0), std::pair(6u, 2.25)));
-    EXPECT_EQ(cyan.failed, 5u);
-    EXPECT_EQ(cyan.answered, 11u);
-    EXPECT_TRUE(std::isnan(cyan.values[11]));
-    EXPECT_EQ(cyan.latest, "2.50");
 }
 
 } // namespace

@@ -1,4 +1,5 @@
 #include <map>
+#include <regex>
 #include <string>
 #include <vector>
 
@@ -16,7 +17,7 @@ using testing::ContainsRegex;
 using testing::HasSubstr;
 using testing::Not;
 
-constexpr const char* source = TINTGATE_SOURCE_DIR;
+const std::string source = TINTGATE_SOURCE_DIR;
 
 /// Values by the server's position for results.
 json measuredOf(double cyan) {
@@ -68,9 +69,11 @@ class StoreTrend : public StoreProgram {
 
     StoreTrend() {
         answer({"make"});
-        for (const std::string preset : {"1", "7"})
-            answer({"file", "put", source + ("/presets/CVP_000" + preset + ".xml"),
-                    "/server/tickets/CVP_000" + preset + ".xml"});
+        answer({"file", "put", source + "/presets/CVP_0001.xml", "/server/tickets/CVP_0001.xml"});
+        const std::string psd =
+            std::regex_replace(support::contentsOf(source + "/presets/CVP_0007.xml"),
+                               std::regex("psdTolerance=\"5.0\""), "psdTolerance=\"4.5\"");
+        answer({"file", "put", m_folder.write("psd", psd), "/server/tickets/CVP_0007.xml"});
         answer({"file", "put", m_folder.write("strip", "IT8.7/2\nDEVICE 33\n"),
                 "/server/ControlCharts/example.it8"});
         importJobs();
@@ -156,13 +159,13 @@ TEST_F(StoreTrend, KnowsPresetsOfThePsdKindAndJobsWithoutColours) {
     std::map<int, json> changes;
     for (int job = 1; job <= jobs; ++job) {
         std::vector<int> approvals(10, 1);
-        approvals[4] = job == 12 ? 0 : 1; // Paper white.
+        approvals[0] = job == 12 ? 0 : 1; // The average.
         changes[job] = {{"Workflow/Verify/ComparisonMethod", {{"int", job == 1 ? 2 : 7}}},
                         {"Remote/Measurement/Values/PSDApproval", {{"int", approvals}}},
                         {"Remote/Measurement/LabValues/LValues", nullptr}};
     }
     importJobs(changes);
-    EXPECT_THAT(text(), AllOf(ContainsRegex("Paper white +0.25 +of 5.00 +ΔE00 +1 of 11 above"),
+    EXPECT_THAT(text(), AllOf(ContainsRegex("patches, average +1.13 +of 4.50 +ΔE00 +1 of 11 above"),
                               HasSubstr("Drifting: cyan"), HasSubstr("Cyan: Its difference is "),
                               HasSubstr("The file of preset 2 can't be read")));
 }
@@ -184,7 +187,7 @@ TEST_F(StoreTrend, CountsTheResultOfASheetOnce) {
 }
 
 TEST_F(StoreTrend, LeadsToThePagesOnThisMachine) {
-    const std::string data = source + std::string("/tests/data/report/");
+    const std::string data = source + "/tests/data/report/";
     m_folder.makeFolder("Tintgate/JobID_5");
     m_folder.write("Tintgate/JobID_5/output.json", support::contentsOf(data + "output.json"));
     json meta = json::parse(support::contentsOf(data + "meta.json"));
