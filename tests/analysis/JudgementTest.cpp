@@ -1,15 +1,15 @@
 #include "analysis/Judgement.h"
 
 #include <cmath>
-#include <fstream>
 #include <map>
 #include <regex>
 #include <string>
 
 #include <gtest/gtest.h>
 
+#include "ScratchFolder.h"
+
 using analysis::Comparison;
-using analysis::Finding;
 using analysis::Judgement;
 using analysis::Verdict;
 
@@ -53,14 +53,6 @@ tolerancePresetParameterRecord presetOf(const std::map<std::string, double>& tol
     return preset;
 }
 
-double valueOf(const Judgement& judgement, std::string_view name) {
-    for (const Finding& finding : judgement.findings)
-        if (finding.criterion->name == name)
-            return finding.value;
-    ADD_FAILURE() << name;
-    return 0;
-}
-
 // The offsets are such that every kind of patch has a figure of its own.
 const std::vector<Patch> strip = {
     {{0, 0, 0, 0, 0}, 1, 0, 0},      {{0, 0.4, 0, 0, 0}, 2, 0, 0},   // paper, twice
@@ -78,8 +70,7 @@ TEST(Judgement, EachCriterionLooksAtItsPatches) {
     Comparison c;
     compareAs(strip, c);
     const Judgement judgement = judge(c, {});
-    const double hue =
-        std::sqrt(2 * (40 * std::hypot(3, 40) - 1600)); // CIE 15: sqrt(2(C1 C2 - ...))
+    const double hue = std::sqrt(2 * (40 * std::hypot(3, 40) - 1600)); // CIE 15
     const std::map<std::string, double> expected = {
         {"paperWhite", 2},        {"solidCyan", 3},
         {"solidMagenta", 3},      {"solidYellow", 5},
@@ -90,65 +81,27 @@ TEST(Judgement, EachCriterionLooksAtItsPatches) {
         {"greyAverage", 3},       {"spotAverage", 10},
         {"spotMaximum", 10},      {"outerGamutAverage", (3 + 3 + 5 + 7 + 8 + 12) / 6.0},
         {"outerGamutMaximum", 12}};
-    for (const auto& [name, value] : expected)
-        EXPECT_NEAR(valueOf(judgement, name), value, 1e-12) << name;
-    EXPECT_GT(valueOf(judgement, "greyHueAverage"), 0);
-
-    analyseResultsRecord results;
-    fillResults(judgement, {}, results);
-    EXPECT_EQ(results.values[3], 9);   // black
-    EXPECT_EQ(results.values[17], -1); // no blue
-    EXPECT_EQ(results.values[106], -1);
-    EXPECT_FALSE(results.overallPassed);
+    std::size_t found = 0;
+    for (const analysis::Finding& finding : judgement.findings)
+        if (const auto at = expected.find(finding.criterion->name); at != expected.end()) {
+            EXPECT_NEAR(finding.value, at->second, 1e-12) << at->first;
+            ++found;
+        }
+    EXPECT_EQ(found, expected.size());
 }
 
-TEST(Criteria, GoWithTheServersTableAndTheDocs) {
-    // The server shows these values (first) beside these approvals (second).
-    const std::map<int, int> shown = {
-        {0, 6},   {1, 7},   {2, 8},   {3, 9},   {4, 4},   {5, 0},   {6, 1},   {7, 5},   {14, 12},
-        {12, 10}, {19, 13}, {20, 3},  {27, 19}, {13, 11}, {28, 20}, {29, 21}, {32, 24}, {33, 25},
-        {30, 22}, {31, 23}, {36, 28}, {34, 26}, {37, 27}, {38, 30}, {39, 31}, {26, 18}};
+TEST(Criteria, AreThoseOfTheDocs) {
     std::string table;
-    for (const analysis::Criterion& criterion : analysis::criteria) {
-        if (const auto at = shown.find(criterion.value); at != shown.end()) {
-            EXPECT_EQ(at->second, criterion.index) << criterion.name;
-        }
+    for (const analysis::Criterion& criterion : analysis::criteria)
         table += "| " + std::to_string(criterion.index) + " | `" + criterion.name + "` | " +
                  std::to_string(criterion.value) + " | " + std::to_string(criterion.psdEntry) +
                  " | " + unit(criterion.quantity) + " |\n";
-    }
     std::string documented;
     const std::regex row("\\| [0-9]+ \\| `\\w+` \\| [0-9]+ \\| [0-9]+ \\| \\w+ \\|");
-    std::ifstream docs(TINTGATE_SOURCE_DIR "/docs/criteria.md");
-    for (std::string line; std::getline(docs, line);)
-        if (std::smatch match; std::regex_search(line, match, row))
-            documented += match.str() + "\n";
+    const std::string docs = support::contentsOf(TINTGATE_SOURCE_DIR "/docs/criteria.md");
+    for (std::sregex_iterator it(docs.begin(), docs.end(), row), end; it != end; ++it)
+        documented += it->str() + "\n";
     EXPECT_EQ(table, documented);
-}
-
-TEST(Judgement, StatisticsByNearestRank) {
-    const struct {
-        std::size_t count;
-        double percentile95, median, deviation;
-    } cases[] = {{1, 1, 1, 0},
-                 {2, 2, 1.5, 0.5},
-                 {19, 19, 10, std::sqrt(30)}, // (n^2 - 1) / 12
-                 {20, 19, 10.5, std::sqrt(33.25)},
-                 {21, 20, 11, std::sqrt(110 / 3.0)},
-                 {100, 95, 50.5, std::sqrt(833.25)}};
-    for (const auto& expected : cases) {
-        std::vector<Patch> patches;
-        for (std::size_t i = expected.count; i > 0; --i)
-            patches.push_back({{0, 0, 0, 0}, static_cast<double>(i), 0, 0});
-        Comparison c;
-        compareAs(patches, c);
-        const analysis::Statistics s = judge(c, {}).statistics;
-        EXPECT_EQ(s.percentile95, expected.percentile95) << expected.count;
-        EXPECT_EQ(s.median, expected.median) << expected.count;
-        EXPECT_NEAR(s.standardDeviation, expected.deviation, 1e-12) << expected.count;
-        EXPECT_EQ(s.mean, (static_cast<double>(expected.count) + 1) / 2);
-        EXPECT_EQ(s.maximum, static_cast<double>(expected.count));
-    }
 }
 
 TEST(Judgement, TheVerdictNeverPassesBySilence) {
@@ -166,21 +119,34 @@ TEST(Judgement, TheVerdictNeverPassesBySilence) {
     };
     Comparison c;
     compareAs(strip, c);
-    for (const auto& expected : cases) {
-        const tolerancePresetParameterRecord preset = presetOf(expected.tolerances);
+    analyseResultsRecord results;
+    for (const auto& [what, tolerances, verdict] : cases) {
+        const tolerancePresetParameterRecord preset = presetOf(tolerances);
         const Judgement judgement = judge(c, preset);
-        EXPECT_EQ(judgement.verdict, expected.verdict) << expected.what;
-        analyseResultsRecord results;
+        EXPECT_EQ(judgement.verdict, verdict) << what;
         fillResults(judgement, preset, results);
-        EXPECT_EQ(results.overallPassed, expected.verdict == Verdict::Passed) << expected.what;
+        EXPECT_EQ(results.overallPassed, verdict == Verdict::Passed) << what;
     }
+    EXPECT_EQ(results.values[3], 9);   // black
+    EXPECT_EQ(results.values[17], -1); // no blue
+    EXPECT_EQ(results.values[106], -1);
 
     tolerancePresetParameterRecord preset = presetOf({{"solidCyan", 3}});
     preset.usedForResult[2] = 1; // an entry without a meaning
-    const Judgement judgement = judge(c, preset);
+    Judgement judgement = judge(c, preset);
     EXPECT_EQ(judgement.verdict, Verdict::Passed);
     ASSERT_EQ(judgement.warnings.size(), 1u);
     EXPECT_STREQ(judgement.warnings[0].code, "criterionUnknown");
+
+    // PSD presets have arrays of their own.
+    preset = presetOf({{"solidCyan", 1}});
+    preset.fograPSDPreset = 1;
+    preset.psdPresetValues[6] = 3;
+    preset.usedForPSDResult[6] = 1;
+    EXPECT_EQ(judge(c, preset).verdict, Verdict::Passed);
+    preset.psdPresetValues[21] = 9; // the largest spot colour
+    preset.usedForPSDResult[21] = 1;
+    EXPECT_EQ(judge(c, preset).verdict, Verdict::Failed);
 }
 
 TEST(Judgement, RoundsTheValueBeforeItIsHeldAgainstTheTolerance) {
@@ -190,34 +156,19 @@ TEST(Judgement, RoundsTheValueBeforeItIsHeldAgainstTheTolerance) {
         double tolerance;
         bool passed;
     } cases[] = {{2.54, 1, 2.5, true},  {2.75, 1, 2.7, false}, {2.549, 2, 2.5, false},
-                 {3.49, 0, 3, true},    {3.5, 0, 3, false},    {2.6, 0, 2.5, false},
-                 {2.504, 2, 2.5, true}, {2.5, 15, 2.5, true},  {2.5000001, 99, 2.5, false},
-                 {2.4, -3, 2.5, true}};
+                 {3.49, 0, 3, true},    {3.5, 0, 3, false},    {2.5000001, 99, 2.5, false},
+                 {2.504, 2, 2.5, true}, {2.4, -3, 2.5, true}};
     for (const auto& expected : cases) {
         Comparison c;
         compareAs({{{100, 0, 0, 0}, expected.value, 0, 0}}, c);
         tolerancePresetParameterRecord preset = presetOf({{"solidCyan", expected.tolerance}});
         preset.decimalPlaces[6] = expected.decimals;
-        const Judgement judgement = judge(c, preset);
         analyseResultsRecord results;
-        fillResults(judgement, preset, results);
+        fillResults(judge(c, preset), preset, results);
         EXPECT_EQ(results.approvals[6], expected.passed) << expected.value;
         EXPECT_NEAR(results.values[0], expected.value, 1e-12); // stays unrounded
         EXPECT_EQ(results.decimals[6], expected.decimals > 0);
     }
-}
-
-TEST(Judgement, PsdPresetsAreReadFromTheirOwnArrays) {
-    Comparison c;
-    compareAs(strip, c);
-    tolerancePresetParameterRecord preset = presetOf({{"solidCyan", 1}});
-    preset.fograPSDPreset = 1;
-    preset.psdPresetValues[6] = 3;
-    preset.usedForPSDResult[6] = 1;
-    EXPECT_EQ(judge(c, preset).verdict, Verdict::Passed);
-    preset.psdPresetValues[21] = 9; // the largest spot colour
-    preset.usedForPSDResult[21] = 1;
-    EXPECT_EQ(judge(c, preset).verdict, Verdict::Failed);
 }
 
 } // namespace

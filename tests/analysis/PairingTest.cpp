@@ -1,6 +1,5 @@
 #include "analysis/Pairing.h"
 
-#include <algorithm>
 #include <sstream>
 
 #include <gtest/gtest.h>
@@ -48,12 +47,10 @@ TEST(Pairing, GoesFromTheSurestToTheWeakest) {
         std::string left, right, pairing;
         std::size_t rounded = 0;
     } cases[] = {
-        {"one order", ramp, ramp, "deviceValues 0 1 2"},
         {"other ids and order", ramp, "cmyk 3:50,0,0,0 2:0,7,0,0 1:0,0,0,0", "deviceValues 2 0 1"},
         {"duplicates in their order", "cmyk 1:0,0,0,0 2:9,0,0,0 3:0,0,0,0",
          "cmyk 7:9,0,0,0 8:0,0,0,0 9:0,0,0,0 10:0,0,0,0", "deviceValues 1 0 2"},
         {"an id for two patches", ramp, "cmyk 1:60,0,0,0 2:0,7,0,0", "deviceValues - - 1"},
-        {"two decimals", "cmyk 1:12.3444,0,0,0", "cmyk 1:12.34,0,0,0", "deviceValues 0"},
         {"the nearest first, then whole percents", "cmyk 1:3,2.24,2.24,0 2:3.1,2.2,2.2,0",
          "cmyk 1:3.1,2.2,2.2,0 2:3,2,2,0", "deviceValues 1 0", 1},
         {"spots", ramp, "cmyk 1:50,0,0,0,0 2:0,0,0,0,100", "deviceValues - 0 -"},
@@ -61,18 +58,12 @@ TEST(Pairing, GoesFromTheSurestToTheWeakest) {
         {"ids across spaces", ramp, "rgb 3:0,0,0 2:0,0,0 9:0,0,0", "labels - 1 0"},
         {"no ids", ramp, "none : :", "order 0 1 -"},
         {"ids of another kind, one size", ramp, "none A1: A2: A3:", "order 0 1 2"},
-        {"ids of another kind, another size", ramp, "none A1:", "order - - -"},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
-        const DataSet right = setOf(c.right);
-        const analysis::Pairing pairing = pairSets(setOf(c.left), right);
+        const analysis::Pairing pairing = pairSets(setOf(c.left), setOf(c.right));
         EXPECT_EQ(said(pairing), c.pairing);
         EXPECT_EQ(pairing.rounded, c.rounded);
-        const auto alone =
-            std::count(pairing.partner.begin(), pairing.partner.end(), analysis::noRow);
-        EXPECT_EQ(pairing.paired + static_cast<std::size_t>(alone), pairing.partner.size());
-        EXPECT_EQ(rowsLeft(pairing, right.patchCount).size(), right.patchCount - pairing.paired);
     }
 }
 
