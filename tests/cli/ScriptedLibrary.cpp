@@ -5,6 +5,7 @@
 #include <cstdlib>
 #include <fstream>
 #include <string>
+#include <vector>
 
 #include "job/AnalysisLibrary.h"
 
@@ -15,13 +16,15 @@ std::string setting(const char* name) {
     return value == nullptr ? "" : value;
 }
 
-int answer(const char* name, const std::string& call) {
-    std::ofstream(setting("CALLS"), std::ios::app) << call << "\n";
+int answer(const char* name, const std::string& call, const std::vector<std::wstring>& paths,
+           const std::string& more = {}) {
+    std::ofstream calls(setting("CALLS"), std::ios::app);
+    calls << call;
+    for (const std::wstring& path : paths) {
+        calls << " [" << wstringToString(path) << "]";
+    }
+    calls << more << "\n";
     return std::atoi(setting(name).c_str());
-}
-
-std::string bytes(const std::wstring& text) {
-    return wstringToString(text);
 }
 
 } // namespace
@@ -29,26 +32,25 @@ std::string bytes(const std::wstring& text) {
 int analyzeMeasurements(std::wstring target, std::wstring measurement, std::wstring patchSet,
                         tolerancePresetParameterRecord tolerance, analyseResultsRecord* results,
                         std::wstring* json, KZJobDataStruct* job) {
-    *json = stringToWstring(setting("JSON"));
-    return answer("ANALYZE", "analyze [" + bytes(target) + "] [" + bytes(measurement) + "] [" +
-                                 bytes(patchSet) + "] under " + tolerance.name.ToStdString() +
-                                 (results == nullptr && job == nullptr ? "" : ", with a record"));
+    *json = wxString::FromUTF8(setting("JSON")).ToStdWstring();
+    return answer("ANALYZE", "analyze", {target, measurement, patchSet},
+                  " under " + tolerance.name.ToStdString() +
+                      (results == nullptr && job == nullptr ? "" : ", with a record"));
 }
 
 int parsePresetParameterXMLFile(std::wstring path, tolerancePresetParameterRecord* tolerance,
                                 bool keepJobChoice) {
     tolerance->name = "parsed";
-    return answer("PARSE", "parse [" + bytes(path) + "] " + (keepJobChoice ? "true" : "false"));
+    return answer("PARSE", "parse", {path}, keepJobChoice ? " true" : " false");
 }
 
 int validateInputFile(std::wstring path) {
-    return answer("VALIDATE", "validate [" + bytes(path) + "]");
+    return answer("VALIDATE", "validate", {path});
 }
 
 int writeLabFromReferencesAndICCProfile(std::wstring reference, std::wstring profile,
                                         std::wstring output) {
-    return answer("LAB", "lab [" + bytes(reference) + "] [" + bytes(profile) + "] [" +
-                             bytes(output) + "]");
+    return answer("LAB", "lab", {reference, profile, output});
 }
 
 std::wstring getJsonMetaFileString(KZJobDataStruct*) {
@@ -69,26 +71,11 @@ void getLibVersion(unsigned int& major, unsigned int& minor, unsigned int& patch
     patch = 9;
 }
 
-// UTF-8 becomes characters, as it must; any other byte is set apart in a way of this library's own.
+// A character for each byte: what the tool does with these texts in between must not matter.
 std::wstring stringToWstring(const std::string& text) {
-    const wxString valid = wxString::FromUTF8(text.data(), text.size());
-    if (!valid.empty() || text.empty()) {
-        return valid.ToStdWstring();
-    }
-    std::wstring wide;
-    for (const unsigned char byte : text) {
-        wide += static_cast<wchar_t>(0xE000 + byte);
-    }
-    return wide;
+    return wxString::From8BitData(text.data(), text.size()).ToStdWstring();
 }
 
 std::string wstringToString(const std::wstring& text) {
-    if (text.empty() || text[0] < 0xE000 || text[0] > 0xE0FF) {
-        return wxString(text).utf8_string();
-    }
-    std::string narrow;
-    for (const wchar_t unit : text) {
-        narrow += static_cast<char>(unit - 0xE000);
-    }
-    return narrow;
+    return {text.begin(), text.end()};
 }

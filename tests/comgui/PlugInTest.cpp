@@ -141,6 +141,7 @@ TEST_F(ComGUISlots, RefusesHandlesThatAreNone) {
         expectNone(at, handle);
     }
     EXPECT_EQ(slots.Logout(instance, session), 0);
+    EXPECT_EQ(slots.Login(instance, &record), 0);
     expectNone(instance, session);
 }
 
@@ -149,7 +150,7 @@ TEST_F(ComGUISlots, RefusesArgumentsThatMeanNothing) {
     int negative = -4;
     int buffer[100] = {};
     void* found = buffer;
-    ComSessionRecord wrongSize;
+    ComSessionRecord wrongSize = record;
     wrongSize.size = 4;
     ComSessionRecord unending; // Not one text of it ends.
     for (auto* const text : {&unending.user, &unending.password, &unending.server}) {

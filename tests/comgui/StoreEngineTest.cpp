@@ -169,23 +169,6 @@ TEST_P(StoreEngine, NeitherOverwritesAStoreNorReadsADamagedKey) {
     EXPECT_EQ(send(*engine, 0, 0, "a=1"), "taken 1") << "replacing it mends it";
 }
 
-TEST_F(FolderStore, FilesThatMayNotBeWrittenKeepNoTicketFromIt) {
-    for (const auto& [place, mode] : {std::pair("", 0777), {"/tickets.db", 0666}}) {
-        chmod((address + place).c_str(), mode);
-    }
-    chmod(folder.path().c_str(), 0755);
-    chmod((address + "/files").c_str(), 0555);
-    const pid_t child = startProcess([&] {
-        const bool became = support::becomeUser(support::ordinaryUser);
-        const auto engine = open();
-        const auto fault = faultOf([&] { putFile(*engine, "a/b", "x"); });
-        const std::string table = send(*engine, 0, 0, "b=2");
-        return became && fault == Fault::ReadOnly && table == "taken 1" ? 0 : 1;
-    });
-    EXPECT_EQ(endOf(child), 0);
-    EXPECT_TRUE(open()->files().empty());
-}
-
 TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
     const std::string much(300'000, 'x');
     open()->create(3, 1);

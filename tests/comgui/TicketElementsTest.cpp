@@ -90,12 +90,3 @@ TEST(TicketElements, LoneElementsFarOutCostNoRoom) {
         ASSERT_EQ(std::get<int>(*key->first()), 7);
     }
 }
-
-TEST(TicketElements, AMillionElementsMayComeFromBehind) {
-    std::shared_ptr<Elements> key; // Quadratic work would run into the time limit of the tests.
-    for (int position = 999'999; position >= 0; --position) {
-        ASSERT_TRUE(setElement(key, PARAM_INT, &position, position));
-    }
-    EXPECT_EQ(key->count(), 1'000'000);
-    EXPECT_EQ(std::get<int>(*key->at(765'432)), 765'432);
-}

@@ -21,20 +21,15 @@ class CommTest : public testing::Test {
 
     CommTest() {
         m_root.installPlistReader(PLIST_READER);
-        installSuite();
         const std::string bundle = m_root.makeBundle(
-            "suite/lib/ComGUI.Bundle", SCRIPTED_PLUGIN,
+            "Scripted.Bundle", SCRIPTED_PLUGIN,
             support::plugInEntries(SCRIPTED_PLUGIN_NAME, comGUIPlugInType,
                                    "00112233-4455-6677-8899-AABBCCDDEEFF", "makeScriptedPlugIn"));
+        m_root.installCommBundle(bundle);
         const std::string path = bundle + "/Contents/MacOS/" SCRIPTED_PLUGIN_NAME;
         plugIn = reinterpret_cast<ScriptedPlugIn* (*)()>(
             dlsym(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL), "scriptedPlugIn"))();
         plugIn->tickets().CreateOrOpenTicket(3, job, nullptr);
-    }
-
-    void installSuite() const {
-        m_root.writePreferences("Qen/com.qen.packageversion.plist",
-                                {{"Nerova Hue Workbench/library_path", m_root.path("suite")}});
     }
 
     /// The calls since the last time.
