@@ -114,14 +114,15 @@ TEST(Model, SaysFirstWhatFailedAndByHowMuch) {
     result.patches[1].difference = none;
     result.verdict = Verdict::Failed;
     result.criteria = {
-        criterion("near", 3, 2.9, Outcome::Pass), criterion("little", 3, 3.1, Outcome::Fail),
+        criterion("near", 3, 2.9, Outcome::Pass), criterion("little", 10, 20, Outcome::Fail),
         criterion("unused", 1, 9, Outcome::Fail), criterion("much", 2.125, 6, Outcome::Fail),
         criterion("zero", 0, 0.5, Outcome::Fail), criterion("far", 3, 0.5, Outcome::Pass)};
     Model model = makeModel(result, nullptr);
     EXPECT_EQ(model.sentence, "3 of 5 criteria are above tolerance.");
-    EXPECT_THAT(model.reasons, ElementsAre("zero: 0.50 ΔE00, 0.50 above the tolerance of 0.00",
-                                           "much: 6.00 ΔE00, 3.875 above the tolerance of 2.125",
-                                           "little: 3.10 ΔE00, 0.10 above the tolerance of 3.00"));
+    EXPECT_THAT(model.reasons,
+                ElementsAre("zero: 0.50 ΔE00, 0.50 above the tolerance of 0.00",
+                            "much: 6.00 ΔE00, 3.875 above the tolerance of 2.125",
+                            "little: 20.00 ΔE00, 10.00 above the tolerance of 10.00"));
     EXPECT_EQ(model.judged[3].title, "near");
     EXPECT_EQ(model.judged[3].distance, "0.10 below");
     EXPECT_EQ(model.rows[0].patch, 2u); // No number comes last.
