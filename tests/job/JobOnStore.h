@@ -28,25 +28,14 @@ class JobOnStore : public testing::Test {
         root.installPlistReader(PLIST_READER);
         root.installCommBundle(COMGUI_BUNDLE);
         store::makeStore(address, "Press room");
-        const auto made = store::openStore(address);
-        made->putUser({"press", hash, false});
-        made->create(3, job);
-        connect();
-    }
-
-    void connect() {
         engine = store::openStore(address);
+        engine->putUser({"press", hash, false});
+        engine->create(3, job);
         CLogger::InitLogger(logPath()); // Once one is open, the processor opens none of its own.
         processor.emplace();
         processor->m_connector = new CKZConnector(std::wstring(address.begin(), address.end()),
                                                   L"press", L"room", 0x5071103, false, false);
         EXPECT_TRUE(processor->m_connector->IsLoggedIn());
-    }
-
-    /// Before a process is forked, which must not go on with our connections.
-    void disconnect() {
-        processor.reset();
-        engine.reset();
     }
 
     /// Sends a table, in the words of TicketText.h.

@@ -232,7 +232,6 @@ TEST_F(LoadJob, FindsReferences) {
         {chart + "'/s/a(TEMP)//MKCheck10.it8", "reference=/s/a(TEMP)/MKCheck10.it8"},
         {chart + "-", "formula=0 preset=none reference="},
         {workflow + "4", "formula=0 preset=none reference= workflow=4"},
-        {workflow + "1", "formula=0 preset=none reference= workflow=1"},
         {workflow + "1" + first + "'/s/profile.icc" + other, "reference=/s/profile.icc workflow=1"},
         {workflow + "1" + first + "'" + other, "reference=/s/profile2.icc workflow=1"},
         {workflow + "1" + first + "'\xff" + other, "reference= workflow=1"},
@@ -343,7 +342,6 @@ TEST_F(LoadJob, DecidesTheType) {
          "patches=1 reference=/Measured reference.txt status=2 type=3 workflow=3"},
         {sub + "81" + stored + status + "1",
          whole + "patches=1 reference=/Measured reference.txt status=1 type=1 workflow=3"},
-        {sub + "96", ""},
         {sub + "96" + status + "1", "status=1 type=2"},
         {sub + "96" + status + "-3", "status=-3"},
     };
@@ -380,8 +378,6 @@ TEST_F(LoadJob, KnowsInlineInstruments) {
 TEST_F(LoadJob, FetchesTheJdf) {
     const std::string other = " Workflow/RemoteOutFolder=";
     const Case cases[] = {
-        {"Output/Jdf/FileName=-", "code=-1 jdf= jdfServer="},
-        {"Output/Jdf/FileName='none.jdf", "code=111 jdf= jdfServer="},
         {"Output/Jdf/FileName='none.jdf Job/FromEsko=1", "jdf= jdfServer=/s/jdf/none.jdf"},
         {"Input/SubType=86 Remote/JDFName=-", "code=-1 jdf= jdfServer= type=1"},
         {"System/Folders/Temp=-", "code=-1 jdf= jdfServer="},

@@ -1,0 +1,542 @@
+// Runs of the real program on jobs, as a client starts it: arguments and a store in; the exit code,
+// the log, the job's folder and the tickets out.
+#include <atomic>
+#include <chrono>
+#include <filesystem>
+#include <fstream>
+#include <functional>
+#include <map>
+#include <memory>
+#include <regex>
+#include <sstream>
+#include <string>
+#include <thread>
+#include <vector>
+
+#include <csignal>
+#include <sys/stat.h>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
+
+#include "RunProgram.h"
+#include "RunningProgram.h"
+#include "SuiteRoot.h"
+#include "TicketText.h"
+#include "comgui/StoreEngine.h"
+#include "comgui/StoreKeep.h"
+#include "comgui/Users.h"
+
+namespace {
+
+namespace fs = std::filesystem;
+using testing::HasSubstr;
+
+constexpr const char* viewer = "Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify";
+constexpr const char* profile = "/usr/share/color/icc/ghostscript/default_cmyk.icc";
+
+constexpr char makeExample[] = R"sh(
+    for job in "--job 7" "--job 8 --unmeasured --references $4"; do
+        python3 "$1/docs/example-job/make-job.py" "$2/made" $job
+        "$3" -s "$2/store" import "$2/made/tickets.json"
+    done
+    "$3" -s "$2/store" file put "$2/made/server" /server)sh";
+
+/// The arguments of a job form that are not the usual ones.
+struct Call {
+    std::string job = "7";
+    std::string strip = "0";
+    std::string password = "room";
+    std::string user = "press";
+    std::string host = {};      ///< Empty: the store's.
+    std::string remeasure = {}; ///< Empty: none.
+};
+
+using Environment = std::map<std::string, std::optional<std::string>>;
+
+/// A system root with the viewer, a temporary folder, and a store with the example job 7, which
+/// holds its measurement, and 8, which is to be measured.
+class Place {
+  public:
+    Place() {
+        fs::copy(example().path("store"), address, fs::copy_options::recursive);
+        m_root.installPlistReader(PLIST_READER);
+        m_root.installCommBundle(COMGUI_BUNDLE);
+        write(viewer, "#!/bin/sh\nprintf '[%s]' \"$@\" > \"$TINTGATE_ROOT/part\"\n"
+                      "mv \"$TINTGATE_ROOT/part\" \"$TINTGATE_ROOT/shown\"\n");
+        chmod(path(viewer).c_str(), 0755);
+        fs::create_directories(temporary);
+    }
+
+    std::string path(const std::string& name) const { return m_root.path(name); }
+
+    void write(const std::string& name, const std::string& text) const {
+        fs::create_directories(fs::path(path(name)).parent_path());
+        std::ofstream(path(name)) << text;
+    }
+
+    /// Puts a measuring tool in its place, by default ours with its virtual instrument. Returns its
+    /// path.
+    std::string installTool(const std::string& settings = {},
+                            const std::string& program = MEASURING_TOOL) const {
+        m_root.writePreferences("ApplicationsUsingNerovaMeasure_x64.plist",
+                                {{"installed_path", path("Applications/Nerova")}});
+        write("Library/Preferences/NerovaMeasure.conf",
+              std::string("instrument = virtual\nspectra = yes\nprofile = ") + profile + "\n" +
+                  settings);
+        return m_root.copyProgram(
+            program, "Applications/Nerova/NerovaMeasure.app/Contents/MacOS/NerovaMeasure");
+    }
+
+    std::string jobFile(const std::string& name, const std::string& job = "7") const {
+        return temporary + "/Tintgate/JobID_" + job + "/" + name;
+    }
+
+    std::vector<std::string> words(const Call& call = {}) const {
+        std::vector<std::string> words = {TINTGATE_PROGRAM,
+                                          "KEY_KZ_HOST:=:" +
+                                              (call.host.empty() ? address : call.host),
+                                          "KEY_KZ_STRIP:=:" + call.strip,
+                                          "KEY_KZ_JOBID:=:" + call.job,
+                                          "KEY_KZ_LANGUAGE:=:en_US",
+                                          "KEY_KZ_UNUSED:=:",
+                                          "KEY_KZ_PASSWORD:=:" + call.password,
+                                          "KEY_KZ_USER:=:" + call.user};
+        if (!call.remeasure.empty()) {
+            words.push_back(call.remeasure);
+        }
+        return words;
+    }
+
+    support::Outcome run(std::vector<std::string> words, Environment environment = {}) const {
+#ifndef __SANITIZE_ADDRESS__
+        words.insert(words.begin(), {"prlimit", "--as=1500000000"});
+#endif
+        environment.insert({{"TMPDIR", temporary}, {"TINTGATE_ROOT", m_root.path()}});
+        support::RunOptions options;
+        options.environment = std::move(environment);
+        return support::run(words, options);
+    }
+
+    support::Outcome run(const Call& call = {}) const {
+        return run(words(call));
+    }
+
+    /// The messages of the job's log, with marks for the folders; empty where there is none.
+    std::string log() const {
+        const std::string file = temporary + "/Tintgate/TintgateKZ.log";
+        std::string text = support::exists(file) ? support::contentsOf(file) : "";
+        text = std::regex_replace(text, std::regex("(^|\n)[^\n]*?:\t"), "$1");
+        text = std::regex_replace(text, std::regex(temporary + "/Tintgate/JobID_[78]"), "JOB");
+        return std::regex_replace(text, std::regex(address), "STORE");
+    }
+
+    std::shared_ptr<store::StoreEngine> engine() const {
+        return store::openStore(address);
+    }
+
+    /// Changes a ticket, in the words of TicketText.h.
+    void set(const std::string& records, int id = 7, int type = 3) const {
+        store::StoreKeep keep(engine());
+        ASSERT_TRUE(keep.apply(type, id, support::RecordTable(records).records())) << records;
+    }
+
+    std::string administer(std::vector<std::string> words) const {
+        words.insert(words.begin(), {TINTGATE_STORE_PROGRAM, "-s", address});
+        const support::Outcome outcome = support::run(words);
+        EXPECT_EQ(outcome.exitCode, 0) << words[3] << outcome.error;
+        return outcome.output;
+    }
+
+    /// The keys of a job, each with its number of elements.
+    std::map<std::string, int> counts(int job) const {
+        std::map<std::string, int> all;
+        const auto content = engine()->content(3, job, store::KeyFilter());
+        for (const auto& [key, elements] : content->keys()) {
+            all[key] = elements->count();
+        }
+        return all;
+    }
+
+    /// What the server shows of a job: 208 to be verified, 211 passed, 212 failed.
+    int status(const std::string& job) const {
+        const auto content = engine()->content(3, std::stoi(job), store::KeyFilter());
+        return std::get<int>(*content->find("Job/Display/Status")->first());
+    }
+
+    /// What the viewer was started with. It is not waited for, so it may be late.
+    std::string shown() const {
+        for (int i = 0; i < 200 && !support::exists(path("shown")); ++i) {
+            std::this_thread::sleep_for(std::chrono::milliseconds(20));
+        }
+        return support::contentsOf(path("shown"));
+    }
+
+  private:
+    /// Made once; a store is copied like any folder.
+    static const support::ScratchFolder& example() {
+        static const support::ScratchFolder folder;
+        static const support::Outcome outcome = [] {
+            store::makeStore(folder.path("store"), "Press room");
+            store::openStore(folder.path("store"))
+                ->putUser({"press", store::passwordHash("room"), false});
+            return support::run({"sh", "-ec", makeExample, "sh", TINTGATE_SOURCE_DIR, folder.path(),
+                                 TINTGATE_STORE_PROGRAM, profile});
+        }();
+        EXPECT_EQ(outcome.exitCode, 0) << outcome.error;
+        return folder;
+    }
+
+    const support::SuiteRoot m_root;
+
+  public:
+    const std::string address = m_root.path("store");
+    std::string temporary = m_root.path("tmp");
+    std::unique_ptr<support::RunningProgram> beside; ///< A program that runs for as long.
+};
+
+/// Most of a run is waiting, so several go side by side.
+template<class Work>
+void sideBySide(std::size_t count, Work work) {
+    std::atomic<std::size_t> next = 0;
+    std::vector<std::jthread> threads;
+    for (int i = 0; i < 8; ++i) {
+        threads.emplace_back([&] {
+            for (std::size_t number; (number = next++) < count;) {
+                work(number);
+            }
+        });
+    }
+}
+
+struct Case {
+    std::string what;
+    int code;
+    std::string log; ///< Is in it.
+    std::function<void(Place&)> prepare = {};
+    Call call = {};
+};
+
+/// The log of a run that comes to its job ends in its code. A job to be measured whose run fails
+/// stays one, and the viewer gets JSON of every run that does not.
+void expectRuns(const std::vector<Case>& cases) {
+    std::vector<Place> places(cases.size());
+    std::vector<support::Outcome> outcomes(cases.size());
+    for (std::size_t i = 0; i < cases.size(); ++i) {
+        if (cases[i].prepare) {
+            cases[i].prepare(places[i]);
+        }
+    }
+    sideBySide(cases.size(), [&](std::size_t i) { outcomes[i] = places[i].run(cases[i].call); });
+    for (std::size_t i = 0; i < cases.size(); ++i) {
+        const auto& [what, code, inLog, prepare, call] = cases[i];
+        const std::string log = places[i].log();
+        SCOPED_TRACE(what + "\n" + log);
+        EXPECT_EQ(outcomes[i].exitCode, code);
+        EXPECT_EQ(outcomes[i].output + outcomes[i].error, "");
+        EXPECT_THAT(log, HasSubstr(inLog));
+        const int result = code == 255 ? -1 : code;
+        EXPECT_EQ(log.ends_with("Overall result = " + std::to_string(result) + "\n"),
+                  log.find("Veryfing Job ID = ") != std::string::npos);
+        if (code == 0) {
+            for (const char* file : {"output.json", "meta.json"}) {
+                const std::string path = places[i].jobFile(file, call.job);
+                EXPECT_TRUE(nlohmann::json::accept(support::contentsOf(path)));
+            }
+        }
+        EXPECT_TRUE(call.job != "8" || (places[i].status("8") == 208) == (code != 0));
+    }
+}
+
+/// Preparations.
+auto setting(const std::string& records) {
+    return [=](const Place& place) { place.set(records); };
+}
+auto file(const std::string& serverPath, const std::string& contents) {
+    return [=](const Place& place) {
+        std::istringstream stream(contents);
+        place.engine()->putFile(serverPath, stream);
+    };
+}
+auto blocked(const char* jobFile) {
+    return [=](const Place& place) { fs::create_directories(place.jobFile(jobFile)); };
+}
+auto storeFormat(const std::string& version) {
+    return [=](const Place& place) {
+        support::run({"python3", "-c",
+                      "import sqlite3, sys\n"
+                      "sqlite3.connect(sys.argv[1]).execute('PRAGMA user_version=' + sys.argv[2])",
+                      place.address + "/tickets.db", version});
+    };
+}
+
+constexpr char loginLines[] = "Tintgate.exe verion = 1.6.20\nTintgateLib.dll verion = 1.0.0\n";
+constexpr char loggedIn[] = "Logged in to = STORE\n";
+constexpr char analysisLines[] = "Reference file = JOB/Measured reference.txt\n"
+                                 "Measurement file = JOB/Measured sample.txt\n"
+                                 "analyzeMeasurements returns = 0\n";
+
+TEST(Verification, ComparesStoredValuesAndShowsThem) {
+    const Place place;
+    const std::string before = place.administer({"export"});
+    const support::Outcome outcome = place.run();
+    EXPECT_EQ(outcome.exitCode, 0);
+    EXPECT_EQ(outcome.output + outcome.error, "");
+    EXPECT_EQ(place.log(), std::string(loginLines) + loggedIn +
+                               "Veryfing Job ID = 7\nLoadKZJobReferences returns = 0\n"
+                               "LoadKZJobData returns = 0\n"
+                               "parsePresetParameterXMLFile returns = 0\nm_jobType is = 2\n"
+                               "Comparing existing data\nLoadKZJobMeasurements returns = 0\n" +
+                               analysisLines + "LaunchNerovaVerify\nOverall result = 0\n");
+    EXPECT_EQ(place.shown(), "[-detail][-meta][" + place.jobFile("meta.json") + "]");
+    EXPECT_THAT(support::contentsOf(place.jobFile("output.json")),
+                HasSubstr("\"verdict\": \"failed\""));
+    EXPECT_THAT(support::contentsOf(place.jobFile("meta.json")), HasSubstr("\"user\": \"press\""));
+    EXPECT_EQ(place.administer({"export"}), before);
+    EXPECT_EQ(support::modeOf(place.temporary + "/Tintgate/TintgateKZ.log"), 0600u);
+
+    // The file forms say the same of the two files.
+    const std::string result = place.path("files.json");
+    const support::Outcome files = place.run(std::vector<std::string>{
+        TINTGATE_PROGRAM, place.jobFile("Measured reference.txt"),
+        place.jobFile("Measured sample.txt"), place.jobFile("CVP_0001.xml"), result});
+    EXPECT_EQ(files.exitCode, 0);
+    const std::regex time("\"created\": \"[^\"]*\"");
+    EXPECT_EQ(std::regex_replace(support::contentsOf(result), time, ""),
+              std::regex_replace(support::contentsOf(place.jobFile("output.json")), time, ""));
+}
+
+TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
+    const std::string refused = "Not able to connect to = STORE last ComGui error = ";
+    const std::string noSample = "Measurement file not found = JOB/Measured sample.txt";
+    const std::string noViewer = "LaunchNerovaVerify\nNerova Verify.exe allready running";
+    const auto disableUser = [](const Place& place) {
+        place.engine()->putUser({"press", store::passwordHash("room"), true});
+    };
+    expectRuns({
+        {"no job", 5, loginLines, {}, {.job = ""}},
+        {"no strip", 5, loginLines, {}, {.strip = ""}},
+        {"a strip beyond all numbers", 5, loginLines, {}, {.strip = "4294967296"}},
+        {"no store", 150, "to = /no/store last ComGui error = 150", {}, {.host = "/no/store"}},
+        {"another user", 151, refused + "151", {}, {.user = "proof"}},
+        {"a disabled user", 152, refused + "152", disableUser},
+        {"a newer store", 153, refused + "153", storeFormat("99")},
+        {"an older store", 154, refused + "154", storeFormat("0")},
+        {"another job", 108, loggedIn, {}, {.job = "99"}},
+        {"a closed job", 108, loggedIn, setting("Job/Display/Status=211 Remote/ShowInVerifier=0")},
+        {"no name of a JDF", 255, "LoadKZJobData returns = -1", setting("Output/Jdf/FileName=-")},
+        {"no JDF", 111, "LoadKZJobData returns = 111", setting("Output/Jdf/FileName='none.jdf")},
+        {"a damaged preset", 103, "parsePresetParameterXMLFile returns = 103",
+         file("/server/tickets/CVP_0001.xml", "<preset")},
+        {"no number of patches", 107, "LoadKZJobMeasurements returns = -1",
+         setting("Remote/Measurement/Numpatches=-")},
+        {"no patches", 105, noSample, setting("Remote/Measurement/Numpatches=0")},
+        {"a sample that can't be written", 105, noSample, blocked("Measured sample.txt")},
+        // On this road a missing reference is left to the analysis.
+        {"no references", 20,
+         "Reference file not found = \nReference file = \n"
+         "Measurement file = JOB/Measured sample.txt\nanalyzeMeasurements returns = 20\n",
+         setting("Workflow/Verify/MeasurementWorkflow=2 "
+                 "Workflow/Verify/CharacterizationData='none")},
+        {"no result", 71, "json file not found = JOB/output.json", blocked("output.json")},
+        {"no meta file", 72, "json meta file not found = JOB/meta.json", blocked("meta.json")},
+        {"no viewer", 109, noViewer, [](auto& place) { fs::remove(place.path(viewer)); }},
+        {"a viewer that can't be started", 109, noViewer,
+         [](auto& place) { chmod(place.path(viewer).c_str(), 0644); }},
+    });
+}
+
+TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
+    const Call call = {.job = "8"};
+    const auto tool = [](const std::string& settings, bool withReferences = true) {
+        return [=](const Place& place) {
+            place.installTool(settings);
+            // An old measurement, which must not be taken for a new one.
+            place.write("tmp/Tintgate/JobID_8/Measured sample.txt", "old");
+            if (!withReferences) {
+                fs::remove(place.address + "/files/server/default_cmyk.icc");
+            }
+        };
+    };
+    const auto closedJob = [](const Place& place) {
+        place.installTool();
+        place.set("Job/Display/Status=211");
+    };
+    const auto runningTool = [](Place& place) {
+        const std::string path = place.installTool("", "/bin/sleep");
+        place.beside = std::make_unique<support::RunningProgram>(path);
+    };
+    // An instrument that measures the second strip while it prints: there is nothing to measure.
+    const Call second = {.strip = "1"};
+    const auto inlineStrip = [](const std::string& device) {
+        return [=](const Place& place) {
+            place.set("Workflow/Verify/MeasurementWorkflow2=2 Workflow/Verify/DeltaEMode2=4 "
+                      "Workflow/Verify/CharacterizationData2='none "
+                      "Workflow/Verify/ComparisonMethod2=1 Footer/ControlstripFile2='inline");
+            file("/server/ControlCharts/inline.it8", "DEVICE " + device + "\n")(place);
+        };
+    };
+    const std::string launched = "ConfigureAndLaunchNerovaMeasure returns = ";
+    const std::string compared = "m_jobType is = 0\nComparing existing data\n";
+    expectRuns({
+        {"measured", 0, "Copying resulting data to job ticket\n", tool(""), call},
+        {"measured again",
+         0,
+         "Copying resulting data to job ticket\n",
+         closedJob,
+         {.remeasure = "KEY_KZ_REMEASURE:=:true"}},
+        {"almost so", 0, "Comparing existing data\n", {}, {.remeasure = "KEY_KZ_REMEASURE:=:True"}},
+        {"no tool", 106, launched + "-2", {}, call},
+        {"a tool that runs already", 106, launched + "-1", runningTool, call},
+        {"a tool that can't be executed", 105, launched + "0",
+         [](auto& place) { fs::permissions(place.installTool(), fs::perms(0600)); }, call},
+        {"a tool that ends at once", 105, launched + "0",
+         [](auto& place) { place.installTool("", "/bin/true"); }, call},
+        {"a tool that crashes", 105, launched + "0", tool("mishap = crash\n"), call},
+        {"no references", 10, "Reference file not found = \nOverall", tool("", false), call},
+        {"neither", 105, "Measurement file not found", tool("mishap = crash\n", false), call},
+        {"inline 40", 107, compared, inlineStrip("40"), second},
+        {"inline 44", 106, "existing measurement job", inlineStrip("44"), second},
+        {"inline 47", 107, compared, inlineStrip("47"), second},
+    });
+}
+
+// Whatever a ticket holds, a run ends with a code and without much memory.
+TEST(Verification, BearsHostileTickets) {
+    const std::string root = "Remote/Measurement/";
+    const std::string samples = root + "SpectralValues/Length=";
+    const std::string wavelengths = "2147483647 " + root + "SpectralValues/Stepsize=2147483647 ";
+    const std::pair<std::string, int> tickets[] = {
+        {root + "Numpatches=2147483647 " + samples + "36", 105},
+        {root + "Numpatches=100000", 0},
+        {samples + "2147483647", 0},
+        {samples + "36 " + root + "SpectralValues/Base=" + wavelengths, 0},
+        {root + "LabValues/LValues=nan", 28},
+        {root + "Reference/Numpatches=2000000000", 103},
+        {root + "Status=-2147483648 Workflow/Verify/ComparisonMethod=-5", 103},
+        {root + "Status=2147483647 Workflow/Verify/DeltaEMode=-2147483648", 0},
+        {"General/ParentID=2147483647 Footer/Nesting/PSDAssessment=' "
+         "Footer/Nesting/ControlstripMode=1 Footer/Nesting/ControlstripFile='.",
+         0},
+        {"Footer/Dynstrip/UseDynstrip=1 Footer/Dynstrip/DeviceID=-2147483648 "
+         "Footer/Dynstrip/IT8='/ Footer/Dynstrip/File='..",
+         20},
+        {"Output/Jdf/FileName='../../../../../etc/passwd", 111},
+        {"Output/Jdf/FileName='\xff\xfe", 111},
+        {"Input/Title='a\"</script>%s\\\x01-\xc3\xa9" + std::string(100'000, 'x'), 0},
+        {"Input/Title='caf\xe9", 0},
+        {"Footer/ControlstripFile='" + std::string(5'000, 'x'), 0},
+    };
+    std::vector<Case> cases;
+    for (const auto& [records, code] : tickets) {
+        cases.push_back({records.substr(0, 60), code, "", setting(records)});
+    }
+    expectRuns(cases);
+}
+
+// Names outside ASCII in a locale that has no such characters.
+TEST(Verification, KeepsEveryCharacterInEveryLocale) {
+    Place place;
+    place.temporary = place.path("d\xc3\xa9p\xc3\xb4t \xe5\x88\xb7");
+    fs::create_directories(place.temporary);
+    place.set("Input/Title='\xc3\x89preuve-\xf0\x9f\x8e\xa8");
+    place.engine()->putUser({"J\xf6rg", store::passwordHash("\xe9t\xe9"), false});
+    const support::Outcome outcome =
+        place.run(place.words({.password = "\xc3\xa9t\xc3\xa9", .user = "J\xc3\xb6rg"}),
+                  {{"LC_ALL", "C"}, {"LANG", "C"}});
+    EXPECT_EQ(outcome.exitCode, 0);
+    EXPECT_THAT(place.log(), HasSubstr(analysisLines));
+    const std::string meta = support::contentsOf(place.jobFile("meta.json"));
+    EXPECT_THAT(meta, HasSubstr("\\u00c9preuve-\\ud83c\\udfa8"));
+    EXPECT_THAT(meta, HasSubstr("J\\u00f6rg"));
+    EXPECT_THAT(support::contentsOf(place.jobFile("output.json")),
+                HasSubstr("\"verdict\": \"failed\""));
+}
+
+TEST(Verification, ReadsItsArgumentsByPlace) {
+    const Place place;
+    const struct {
+        std::string host, job;
+        int code;
+    } cases[] = {
+        {"x KEY_KZ_HOST y:" + place.address, "7", 0},
+        {"KEY_KZ_HOST", "7", 150}, // A host of this name.
+        {"KEY_KZ_HOST:a:" + place.address, "K::7 and more", 0},
+        {"KEY_KZ_HOST:", "7", 5},
+        {place.address, "7", 255},
+        {"KEY_KZ_HOST:", "-1", 0}, // The viewer alone.
+        {"KEY_KZ_HOST:" + place.address, "seven", -1},
+    };
+    for (const auto& [host, job, code] : cases) {
+        const support::Outcome outcome =
+            place.run({TINTGATE_PROGRAM, host, "0", job, "en_US", "", "room", "a:b:press"});
+        EXPECT_EQ(outcome.exitCode, code) << host;
+        EXPECT_EQ(outcome.signal, code == -1 ? SIGABRT : 0);
+    }
+}
+
+TEST(Verification, StartsTheViewerWithoutAJob) {
+    const Place place;
+    EXPECT_EQ(place.run({.job = "-1", .strip = "x", .user = "nobody"}).exitCode, 0);
+    EXPECT_EQ(place.shown(), "[]");
+    EXPECT_EQ(place.log(), loginLines);
+    fs::remove(place.path(viewer));
+    EXPECT_EQ(place.run({.job = "-1"}).exitCode, 255);
+}
+
+// What a job writes holds passwords, and in a shared folder anybody may make names.
+TEST(Verification, UsesNoFolderOfOthers) {
+    const Place place;
+    fs::create_directories(place.path("theirs"));
+    fs::create_directory_symlink(place.path("theirs"), place.temporary + "/Tintgate");
+    EXPECT_EQ(place.run().exitCode, 111);
+    EXPECT_TRUE(fs::is_empty(place.path("theirs")));
+}
+
+// Kills a run some milliseconds after its JDF has changed, so while it writes the job's keys.
+constexpr char killWhileItWrites[] = R"sh(
+    jdf=$1; delay=$2; shift 2
+    "$@" & run=$!
+    until [ "$(wc -c < "$jdf")" -gt 8192 ] || [ ! -e /proc/$run/exe ]; do :; done 2>/dev/null
+    sleep "$delay"
+    kill -9 $run)sh";
+
+TEST(Verification, KilledWhileItWritesLeavesAllWholeAndCanBeRunAgain) {
+    const char* const delays[] = {"0", "0", "0.005", "0.01", "0.02", "0.03"};
+    std::vector<Place> places(std::size(delays));
+    std::vector<std::map<std::string, int>> left;
+    const std::size_t fresh = places[0].counts(8).size();
+    for (const Place& place : places) {
+        place.installTool();
+    }
+    sideBySide(places.size(), [&](std::size_t i) {
+        std::vector<std::string> words = places[i].words({.job = "8"});
+        words.insert(words.begin(), {"sh", "-c", killWhileItWrites, "sh",
+                                     places[i].jobFile("job-8.jdf", "8"), delays[i]});
+        places[i].run(words);
+    });
+    for (const Place& place : places) {
+        std::ostringstream delivered;
+        place.engine()->getFile("server/temp/job-8.jdf", delivered);
+        EXPECT_TRUE(delivered.str().size() == 8192 ||
+                    delivered.str() == support::contentsOf(place.jobFile("job-8.jdf", "8")));
+        left.push_back(place.counts(8));
+        place.administer({"reset", "8"});
+    }
+    sideBySide(places.size(),
+               [&](std::size_t i) { EXPECT_EQ(places[i].run({.job = "8"}).exitCode, 0); });
+    int cutOff = 0;
+    for (std::size_t i = 0; i < places.size(); ++i) {
+        EXPECT_NE(places[i].status("8"), 208);
+        const auto whole = places[i].counts(8);
+        EXPECT_EQ(whole.at("Remote/Measurement/SpectralValues/DValues"), 48 * 36);
+        for (const auto& [key, count] : left[i]) {
+            EXPECT_EQ(count, whole.at(key)) << key;
+        }
+        cutOff += left[i].size() > fresh && left[i].size() < whole.size() ? 1 : 0;
+    }
+    EXPECT_GT(cutOff, 0) << "all were killed before or after they wrote";
+}
+
+} // namespace
