@@ -1,17 +1,12 @@
-// The library through its ten functions, on real data and against other programs.
-#include "job/AnalysisLibrary.h"
+#include "LibraryTest.h"
 
 #include <cmath>
-#include <cstdlib>
 #include <filesystem>
 
 #include <gmock/gmock.h>
-#include <gtest/gtest.h>
 
 #include "ExitCodes.h"
 #include "RunProgram.h"
-#include "ScratchFolder.h"
-#include "job/JobRecords.h"
 
 namespace {
 
@@ -22,46 +17,17 @@ using testing::Not;
 
 const std::string sets = "/usr/share/color/icc/";
 const std::string fogra = sets + "FOGRA39L.ti3";
-const std::string tr002 = sets + "TR002.ti3";
 const std::string profile = sets + "ghostscript/default_cmyk.icc";
 const std::string labNames = "LAB_L LAB_A LAB_B";
 const std::string inksAndLab = "SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B";
 
-tolerancePresetParameterRecord presetOf(int formula) {
-    tolerancePresetParameterRecord preset;
-    preset.deltaEMode = formula;
-    preset.presetValues[0] = 4;
-    preset.usedForResult[0] = 1;
-    preset.decimalPlaces[0] = 1;
-    preset.name = wxString(L"Paper \u00e4 \"7\"");
-    return preset;
-}
-
-class Library : public testing::Test {
+class Library : public LibraryTest {
   protected:
-    /// Compares; what comes of it is in the members.
-    int analyse(const std::string& target, const std::string& measurement,
-                const std::string& patchSet = "", int formula = 0) {
-        std::wstring text = stringToWstring(json);
-        const int status = analyzeMeasurements(
-            stringToWstring(target), stringToWstring(measurement), stringToWstring(patchSet),
-            presetOf(formula), &results, &text, &job);
-        json = wstringToString(text);
-        return status;
-    }
-
-    ~Library() override {
-        for (double* array : {record.xyz, record.lab, record.cmyk})
-            std::free(array);
-        std::free(record.spectral);
-    }
-
-    /// Writes a CGATS text of columns and rows.
-    std::string chart(const std::string& columns, const std::string& rows,
-                      const std::string& header = "CGATS.17\n") {
-        return scratch.write(std::to_string(++charts), header + "BEGIN_DATA_FORMAT\n" + columns +
-                                                           "\nEND_DATA_FORMAT\nBEGIN_DATA\n" +
-                                                           rows + "END_DATA\n");
+    Library() {
+        preset.presetValues[0] = 4;
+        preset.usedForResult[0] = 1;
+        preset.decimalPlaces[0] = 1;
+        preset.name = wxString(L"Paper \u00e4 \"7\"");
     }
 
     void expectSound(const std::string& schema, const std::vector<std::string>& texts) const {
@@ -73,13 +39,6 @@ class Library : public testing::Test {
         const support::Outcome outcome = support::run(command);
         EXPECT_EQ(outcome.exitCode, 0) << outcome.error;
     }
-
-    const support::ScratchFolder scratch;
-    int charts = 0;
-    std::string json;
-    analyseResultsRecord results;
-    KZJobDataStruct job;
-    measurementDataRecord& record = job.measurement;
 };
 
 TEST_F(Library, ShowsTenFunctionsAndNoMore) {
@@ -100,7 +59,8 @@ TEST_F(Library, AgreesWithColverifyToSixDecimals) {
         for (const int formula : {0, 4}) {
             const support::Outcome peer = support::run(
                 {"colverify", formula == 4 ? "-k" : "-v", sets + target, sets + measurement});
-            ASSERT_EQ(analyse(sets + target, sets + measurement, "", formula), 0);
+            preset.deltaEMode = formula;
+            ASSERT_EQ(analyse(sets + target, sets + measurement), 0);
             char figures[80];
             std::snprintf(figures, sizeof figures, "peak = %.6f, avg = %.6f\n", results.values[6],
                           results.values[5]);
@@ -122,23 +82,26 @@ TEST_F(Library, WritesSoundResults) {
     const std::string source = "CGATS.17\nMEASUREMENT_SOURCE \"MeasurementCondition=";
     const std::string m0 = chart(labNames, zeros, source + "M0\"\n");
     const std::string m1 = chart(labNames, ones, source + "M1\"\n");
+    const std::string few =
+        chart(inksAndLab, "1 100 0 0 0 55 -36 -50\n2 40 27 27 0 60 0 0\n3 0 0 0 0 95 0 -2\n");
     const struct {
         std::string target, measurement, patchSet;
         int formula;
         const char* shows;
     } cases[] = {
-        {fogra, tr002, "", 5, "\"patchesUnpaired\""},
-        {profile, tr002, "", 2, "\"selection\": \"measurement\""},
-        {tr002, profile, "", 3, "\"measurement\": \"profile\""},
+        {fogra, sets + "TR002.ti3", "", 5, "\"patchesUnpaired\""},
+        {profile, few, "", 2, "\"selection\": \"measurement\""},
+        {few, profile, "", 3, "\"measurement\": \"profile\""},
         {profile, profile, strip, 4, "\"Gr\\u00e4y\""},
-        {fogra, profile, strip, 0, "\"unpairedPatchSet\": 1"},
+        {few, profile, strip, 0, "\"unpairedPatchSet\": 1"},
         {m0, m1, "", 0, "\"pairedByOrder\""},
         {m0, m1, "", 0, "measurement conditions: M0 and M1."},
-        {m0, tr002, "", 0, "\"deviceChannels\": [\"CMYK_C\","},
+        {m0, few, "", 0, "\"deviceChannels\": [\"CMYK_C\","},
     };
     std::vector<std::string> texts;
     for (const auto& c : cases) {
-        EXPECT_EQ(analyse(c.target, c.measurement, c.patchSet, c.formula), 0);
+        preset.deltaEMode = c.formula;
+        EXPECT_EQ(analyse(c.target, c.measurement, c.patchSet), 0);
         EXPECT_THAT(json, HasSubstr(c.shows));
         texts.push_back(json);
     }
@@ -188,8 +151,8 @@ TEST_F(Library, GivesOneCodeForOneCause) {
             << c.target << " " << c.measurement << " " << c.patchSet;
         EXPECT_TRUE(results.values[0] == 7 && json == "before" && record.numPatches == 7);
     }
-    EXPECT_EQ(analyzeMeasurements(stringToWstring(lab), stringToWstring(lab), L"", presetOf(0),
-                                  nullptr, nullptr, nullptr),
+    EXPECT_EQ(analyzeMeasurements(stringToWstring(lab), stringToWstring(lab), L"", preset, nullptr,
+                                  nullptr, nullptr),
               0);
     const std::string rgb = chart("RGB_R RGB_G RGB_B", "1 2 3\n");
     for (const std::string& path : {lab, inks, profile})
@@ -205,7 +168,8 @@ TEST_F(Library, StoresTheMeasurementIntoTheJob) {
         chart("SAMPLE_ID XYZ_X XYZ_Y XYZ_Z LAB_L LAB_A LAB_B",
               "2 30 35 28 66 0 0\n9 80 84 70 94 0 -2\n1 16 23 52 55 -36 -50\n");
     record.reservedValues = static_cast<double*>(std::malloc(8)); // to be freed
-    ASSERT_EQ(analyse(target, byId, "", 5), 0);
+    preset.deltaEMode = 5;
+    ASSERT_EQ(analyse(target, byId), 0);
     EXPECT_EQ(record.numPatches, 3);
     EXPECT_EQ(record.deltaEType, 5);
     EXPECT_EQ(record.spectral, nullptr);
