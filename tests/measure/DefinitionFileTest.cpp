@@ -102,7 +102,7 @@ TEST_F(DefinitionFile, TellsEachInstrumentWhatItNeeds) {
         {mode + "6|", {33}},
         {mode + "2|", {28, 29, 31, 32, 43}},
         {"KEYWORD ZEBRA_RULER_MODE|ZEBRA_RULER_MODE 1|", {21, 22, 48, 49, 50}}};
-    for (int device = -1; device <= 60; ++device) {
+    for (int device = 20; device <= 51; ++device) {
         std::string wanted;
         for (const auto& [lines, devices] : needs) {
             wanted += devices.contains(device) ? lines : "";
@@ -111,7 +111,7 @@ TEST_F(DefinitionFile, TellsEachInstrumentWhatItNeeds) {
         expect("NUMBER_OF_COLS 1", head + "END_DATA_FORMAT|DEVICE " + std::to_string(device) + "|" +
                                        wanted + lowRes + oneColumn);
     }
-    expectInstrument(60); // Without a KEYWORD line the analysis still finds it.
+    expectInstrument(51); // Without a KEYWORD line the analysis still finds it.
 }
 
 TEST_F(DefinitionFile, FillsADynamicStrip) {

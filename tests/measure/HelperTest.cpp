@@ -29,12 +29,6 @@ std::string bytes(const wxString& text) {
     return text.utf8_string();
 }
 
-double secondsOf(const auto& work) {
-    const auto start = Clock::now();
-    work();
-    return std::chrono::duration<double>(Clock::now() - start).count();
-}
-
 class HelperTest : public testing::Test {
   protected:
     // A name that an unquoted command would fall apart on.
@@ -73,16 +67,17 @@ TEST_F(HelperTest, ReadsValuesThatAreOnlyValues) {
                                            {"blanks", "  /x \t "},
                                            {"lines", "first\nsecond"},
                                            {"long", std::string(300, 'x')},
-                                           {"empty", ""},
                                            {"dict/in:side", "nested"}});
-    EXPECT_EQ(value("hostile"), hostile);
+    const std::pair<std::string, std::string> values[] = {{"hostile", hostile},
+                                                          {"blanks", "  /x"},
+                                                          {"lines", "first"},
+                                                          {"long", std::string(255, 'x')},
+                                                          {"'dict':'in:side'", "nested"},
+                                                          {"missing", ""}};
+    for (const auto& [key, expected] : values) {
+        EXPECT_EQ(value(key), expected);
+    }
     EXPECT_FALSE(support::exists(m_root.path("ran")));
-    EXPECT_EQ(value("blanks"), "  /x");
-    EXPECT_EQ(value("lines"), "first");
-    EXPECT_EQ(value("long"), std::string(255, 'x'));
-    EXPECT_EQ(value("empty"), "");
-    EXPECT_EQ(value("missing"), "");
-    EXPECT_EQ(value("'dict':'in:side'"), "nested");
 }
 
 TEST_F(HelperTest, RunsTheCommandForExistingFilesOnly) {
@@ -103,25 +98,19 @@ TEST_F(HelperTest, FindsTheSuite) {
         EXPECT_EQ(bytes(Helper::GetHWBInstallationPath()), folder);
     };
     expect("");
-    // Bundles are folders, and the fixed places ask for files.
-    const std::string workbench = makeFolder("Applications/Nerova/Hue Workbench 4");
-    makeFolder("Applications/Nerova/Hue Workbench 4/NerovaMeasure.app");
-    expect("");
-    fs::remove(workbench + "/NerovaMeasure.app");
     makeFile("Applications/Nerova/Hue Workbench 4/NerovaMeasure.app");
-    expect(workbench);
+    expect(m_root.path("Applications/Nerova/Hue Workbench 4"));
     makeFile("Applications/Nerova/Nerova Hue Workbench.app");
     expect(m_root.path("Applications/Nerova"));
-
-    const std::string installed = makeFolder("installed");
-    m_root.writePreferences(suitePlist, {{"Nerova Hue Workbench/installed_path", installed}});
-    expect(installed);
-    const std::string library = makeFolder("library");
-    m_root.writePreferences(suitePlist, {{"Nerova Hue Workbench/library_path", library}});
-    expect(library);
-    // Values are paths of their own: this one is not looked for below the root.
-    m_root.writePreferences(suitePlist, {{"Nerova Hue Workbench/library_path", "/library"}});
-    expect(m_root.path("Applications/Nerova"));
+    for (const std::string name : {"installed", "library"}) {
+        const std::string key = "Nerova Hue Workbench/" + name + "_path";
+        const std::string folder = makeFolder(name);
+        m_root.writePreferences(suitePlist, {{key, folder}});
+        expect(folder);
+        // Values are paths of their own: this one is not looked for below the root.
+        m_root.writePreferences(suitePlist, {{key, "/" + name}});
+        expect(m_root.path("Applications/Nerova"));
+    }
 }
 
 TEST_F(HelperTest, FindsTheMeasuringTool) {
@@ -130,39 +119,38 @@ TEST_F(HelperTest, FindsTheMeasuringTool) {
         EXPECT_EQ(bytes(Helper::GetNerovaMeasurePath(true)),
                   folder.empty() ? "" : folder + "/NerovaMeasure.app/Contents/MacOS/NerovaMeasure");
     };
+    // Bundles are folders, and the fixed places ask for files.
+    makeFolder("Applications/Nerova/NerovaMeasure.app");
     expect("");
     makeFile("Applications/Nerova/NerovaMeasure/NerovaMeasure.app");
     expect(m_root.path("Applications/Nerova/NerovaMeasure"));
+    fs::remove(m_root.path("Applications/Nerova/NerovaMeasure.app"));
     makeFile("Applications/Nerova/NerovaMeasure.app");
     expect(m_root.path("Applications/Nerova"));
-    const std::string second = makeFolder("second");
-    m_root.writePreferences(measurePlist, {{"installed_path", second}});
-    expect(second);
-    const std::string first = makeFolder("first");
-    m_root.writePreferences(measurePlist64, {{"installed_path", first}});
-    expect(first);
-    fs::remove(first);
-    expect(second);
+    for (const char* plist : {measurePlist, measurePlist64}) {
+        const std::string folder = makeFolder(plist);
+        m_root.writePreferences(plist, {{"installed_path", folder}});
+        expect(folder);
+    }
+    fs::remove(m_root.path(measurePlist64));
+    expect(m_root.path(measurePlist));
 }
 
 TEST_F(HelperTest, LooksThreeTimesForARunningApplication) {
-    EXPECT_LT(secondsOf([] { EXPECT_FALSE(Helper::IsNMRunning()); }), 0.9);
-
+    const auto secondsOf = [](const wxString& name, bool kill, bool found) {
+        const auto start = Clock::now();
+        EXPECT_EQ(Helper::IsHWBAppsRunning(name, kill), found);
+        return std::chrono::duration<double>(Clock::now() - start).count();
+    };
+    EXPECT_LT(secondsOf("", true, false), 0.9);
     const support::RunningProgram tool(
         m_root.copyProgram("/bin/sleep", "NerovaMeasure.app/MacOS/x"));
-    const double watching = secondsOf([] { EXPECT_TRUE(Helper::IsNMRunning()); });
-    EXPECT_GE(watching, 2.0);
-    EXPECT_LT(watching, 2.9);
-    EXPECT_FALSE(Helper::IsHWBAppsRunning("nerovameasure", false));
-    EXPECT_FALSE(Helper::IsHWBAppsRunning("NerovaMeasure.app", false));
+    EXPECT_LT(secondsOf("nerovameasure", true, false), 0.9);
     // The empty name stands for the suite, and ends nothing.
-    EXPECT_TRUE(Helper::IsHWBAppsRunning("", true));
-
+    EXPECT_GE(secondsOf("", true, true), 2.0);
     // Seen and ended by the first look, gone at the second.
-    const double ending =
-        secondsOf([] { EXPECT_TRUE(Helper::IsHWBAppsRunning("NerovaMeasure", true)); });
-    EXPECT_GE(ending, 1.0);
-    EXPECT_LT(ending, 1.9);
+    const double ending = secondsOf("NerovaMeasure", true, true);
+    EXPECT_TRUE(ending >= 1.0 && ending < 1.9) << ending;
     EXPECT_EQ(tool.endingSignal(), SIGTERM);
 }
 
