@@ -1,4 +1,4 @@
-// The real bundle, loaded by the real loader and used through the manager and the connector.
+// The real bundle, loaded by the real loader and used through the connector.
 #include <cstring>
 #include <filesystem>
 #include <memory>
@@ -8,12 +8,12 @@
 
 #include <gmock/gmock.h>
 
-#include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
+#include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
 #include "StoreTest.h"
-#include "Suite.h"
+#include "SuiteRoot.h"
 #include "comgui/Users.h"
 #include "platform/WideBytes.h"
-#include "ticket/TicketFactory.h"
 
 namespace {
 
@@ -21,11 +21,19 @@ class ComGUIPlugIn : public StoreTest {
   protected:
     explicit ComGUIPlugIn(Engine kind = GetParam()) : StoreTest(kind) {
         open()->putUser({"press", hash, false});
+        root.installPlistReader(PLIST_READER);
+        root.installCommBundle(COMGUI_BUNDLE);
+    }
+
+    static std::unique_ptr<CKZConnector> connect(const std::wstring& server,
+                                                 const std::wstring& user = L"press",
+                                                 const std::wstring& password = L"room") {
+        return std::make_unique<CKZConnector>(server, user, password, 0x5071103, false, false);
     }
 
     /// Hashing is slow by intent.
     inline static const std::string hash = store::passwordHash("room");
-    const Suite suite;
+    const support::SuiteRoot root;
     const std::wstring here = platform::wideFromBytes(address);
 };
 ON_BOTH_ENGINES(ComGUIPlugIn);
@@ -57,7 +65,7 @@ class ComGUISlots : public ComGUIPlugIn {
 } // namespace
 
 TEST_P(ComGUIPlugIn, MovesFilesWholeAndLeavesNoParts) {
-    const auto connector = Suite::connect(here);
+    const auto connector = connect(here);
     ASSERT_TRUE(connector->IsLoggedIn()) << connector->getLastRetCode();
     const auto chart = wxString::FromUTF8("/srv/ControlCharts/ä.it8");
     const std::string local = folder.write("local", "chart");
@@ -92,13 +100,13 @@ TEST_P(ComGUIPlugIn, EndsEachLoginInItsCode) {
         {L"localhost", L"press", L"room", -2005},
     };
     for (const auto& [server, user, password, code] : logins) {
-        const auto connector = Suite::connect(server, user, password);
+        const auto connector = connect(server, user, password);
         EXPECT_EQ(connector->getLastRetCode(), code) << wxString(user + L" " + password);
         EXPECT_EQ(connector->IsLoggedIn(), code == 0);
     }
     for (const auto& [format, code] : {std::pair(9, -2031), std::pair(0, -2033)}) {
         setFormat(format);
-        EXPECT_EQ(Suite::connect(here)->getLastRetCode(), code);
+        EXPECT_EQ(connect(here)->getLastRetCode(), code);
     }
 }
 
@@ -114,7 +122,7 @@ TEST_F(ComGUISlots, AddressesArriveOneByteACharacterAndAreLimited) {
     std::string last = address;
     for (const auto& [path, given, isReached] : addresses) {
         std::filesystem::rename(std::exchange(last, path), path);
-        EXPECT_EQ(Suite::connect(given)->IsLoggedIn(), isReached) << path;
+        EXPECT_EQ(connect(given)->IsLoggedIn(), isReached) << path;
     }
 }
 
@@ -204,15 +212,4 @@ TEST_F(ComGUISlots, GivesTicketDataInWholeIds) {
         EXPECT_EQ(size, std::min(given / 4, 3) * 4);
         EXPECT_EQ(ids, expected);
     }
-}
-
-TEST_F(ComGUISlots, NumbersTheReceiverOfNotifications) {
-    const std::unique_ptr<ComGUIManager> manager(ComGUIManager::GetInstance(true));
-    manager->Initialize("press", "room", address.c_str(), 50005, 0x5071103);
-    ASSERT_EQ(manager->Login(nullptr, nullptr, nullptr, -1), 0);
-    EXPECT_EQ(manager->SetCallback(this), 0);
-    const STICKET_ACCESS* work = CreateTicket(nullptr);
-    EXPECT_EQ(manager->SendCommand("local.set.callback", 0, const_cast<STICKET_ACCESS*>(work)), 0);
-    EXPECT_THAT(support::ticketText(work), testing::StartsWith("iGUINotificationID[0]="));
-    DestroyTicket(work);
 }

@@ -90,13 +90,12 @@ TEST_F(Postgres, AServerThatFallsSilentIsGivenUp) {
         }
         EXPECT_EQ(faultInTime([&] { engine->ids(3); }), Fault::Lost);
         EXPECT_FALSE(engine->alive());
-        // At once, however often it is asked.
-        const auto start = std::chrono::steady_clock::now();
-        for (int i = 0; i < 100; ++i) {
-            EXPECT_EQ(faultOf([&] { putFile(*engine, "a/b", "x"); }), Fault::Lost);
-            EXPECT_EQ(send(*engine, 3, 1, "a=2"), "refused 0");
-        }
-        EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(1));
+        faultInTime([&] { // At once, however often it is asked.
+            for (int i = 0; i < 100; ++i) {
+                EXPECT_EQ(faultOf([&] { putFile(*engine, "a/b", "x"); }), Fault::Lost);
+                EXPECT_EQ(send(*engine, 3, 1, "a=2"), "refused 0");
+            }
+        });
         if (stopped) {
             kill(std::stoi(pid), SIGCONT);
         }
