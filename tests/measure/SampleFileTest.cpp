@@ -17,26 +17,7 @@ namespace {
 
 constexpr double infinity = std::numeric_limits<double>::infinity();
 
-/// A record whose arrays are the test's: device values at first.
-struct Samples {
-    explicit Samples(std::size_t patches)
-        : cmyk(4 * patches), lab(3 * patches), xyz(3 * patches), spectra(patches) {
-        record.numPatches = static_cast<int>(patches);
-        record.cmyk = cmyk.data();
-    }
-
-    void addSpectra(int base, int stepsize, int length) {
-        record.spectral = spectra.data();
-        record.spectral->base = base; // The first row's range is that of all.
-        record.spectral->stepsize = stepsize;
-        record.spectral->length = length;
-    }
-
-    std::vector<double> cmyk, lab, xyz;
-    std::vector<spectralRow> spectra;
-    measurementDataRecord record;
-};
-
+/// A record of three equal patches, with device values alone at first.
 class SampleFile : public testing::Test {
   protected:
     SampleFile() {
@@ -44,38 +25,43 @@ class SampleFile : public testing::Test {
         m_job.illuminationMode = -3;
         m_job.referenceFile = stringToWstring(m_reference);
         m_job.sampleFile = m_sample;
+        m_job.measurement.numPatches = 3;
+        m_job.measurement.cmyk = m_cmyk;
+        for (int i = 0; i < 3; ++i) {
+            std::ranges::copy(std::vector{12.3456789, 100., 0., -0.0}, m_cmyk + 4 * i);
+            std::ranges::copy(std::vector{95.123456789, -1.234567e-5, 1234567.8}, m_lab + 3 * i);
+            std::ranges::copy(std::vector{84.123456789, 1e-7, infinity}, m_xyz + 3 * i);
+            std::ranges::fill(m_spectra[i].values, -1.23456789e-300);
+        }
     }
 
-    int write(const Samples& samples, bool reference) {
-        m_job.measurement = samples.record;
-        return KZVerifyJobProcessor().WriteTemporarySampleFile(m_job, reference);
+    void addSpectra(int base, int stepsize, int length) {
+        m_job.measurement.spectral = m_spectra;
+        m_spectra[0].base = base; // The first row's range is that of all.
+        m_spectra[0].stepsize = stepsize;
+        m_spectra[0].length = length;
     }
-    std::string written(const Samples& samples) {
-        EXPECT_EQ(write(samples, false), 0);
-        return support::contentsOf(m_sample);
+
+    int write(bool reference) {
+        return KZVerifyJobProcessor().WriteTemporarySampleFile(m_job, reference);
     }
 
     const support::ScratchFolder m_folder;
     const std::string m_sample = m_folder.path("sample");
     const std::string m_reference = m_folder.path("J\xf6rg"); // Not valid UTF-8.
+    double m_cmyk[12], m_lab[9], m_xyz[9];
+    spectralRow m_spectra[3];
     KZJobDataStruct m_job;
 };
 
 TEST_F(SampleFile, GivesTheFirstRowFewerDigits) {
-    Samples samples(3);
-    samples.record.lab = samples.lab.data();
-    samples.record.xyz = samples.xyz.data();
-    samples.addSpectra(380, 10, 2);
-    for (std::size_t i = 0; i < 3; ++i) {
-        std::ranges::copy(std::vector{12.3456789, 100., 0., -0.0}, &samples.cmyk[4 * i]);
-        std::ranges::copy(std::vector{95.123456789, -0.00001234567, 1234567.8},
-                          &samples.lab[3 * i]);
-        std::ranges::copy(std::vector{84.123456789, 1e-7, infinity}, &samples.xyz[3 * i]);
-        std::ranges::copy(std::vector{0.0123456789012, 1.}, samples.spectra[i].values);
-    }
-    const std::string rest = "\t84.12346\t1e-07\tinf\t0.012345679\t1\n";
+    m_job.measurement.lab = m_lab;
+    m_job.measurement.xyz = m_xyz;
+    addSpectra(380, 10, 2);
+    EXPECT_EQ(write(false), 0);
+    const std::string rest = "\t84.12346\t1e-07\tinf\t-1.2345679e-300\t-1.2345679e-300\n";
     const std::string later = "12.345679\t100\t0\t-0\t95.123457\t-1.234567e-05\t1234567.8" + rest;
-    EXPECT_EQ(written(samples),
+    EXPECT_EQ(support::contentsOf(m_sample),
               "CGATS.17\nKEYWORD ILLUMINATION_CONDITION\nILLUMINATION_CONDITION -3\n"
               "NUMBER_OF_FIELDS 13\nBEGIN_DATA_FORMAT\nSAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\t"
               "LAB_L\tLAB_A\tLAB_B\tXYZ_X\tXYZ_Y\tXYZ_Z\tSPECTRAL_380\tSPECTRAL_390\n"
@@ -85,45 +71,37 @@ TEST_F(SampleFile, GivesTheFirstRowFewerDigits) {
 }
 
 TEST_F(SampleFile, HasTheColumnsThatAreThere) {
+    const std::string labText = "\t95.1235\t-1.23457e-05\t1.23457e+06";
     std::string wavelengths;
+    std::string reflectances;
     for (int nm = 380; nm <= 730; nm += 10) {
         wavelengths += "\tSPECTRAL_" + std::to_string(nm);
+        reflectances += "\t-1.2345679e-300";
     }
-    const std::string labNames = "\tLAB_L\tLAB_A\tLAB_B";
-    const std::string xyzNames = "\tXYZ_X\tXYZ_Y\tXYZ_Z";
     struct Case {
         bool lab, xyz;
         int base, stepsize, length;
-        std::string fields, names, value;
+        std::string fields, names, values; ///< Names and values behind the device values.
     };
     const Case cases[] = {
-        {false, false, 380, 10, -1, "5", "", "-1.23457e-300"},
-        {false, false, 380, 10, 37, "5", "", "-1.23457e-300"},
-        {true, false, 380, 10, -1, "8", labNames, "-1.23457e-300"},
-        {false, true, 380, 10, 0, "8", xyzNames, "-1.234568e-300"},
-        {true, false, 380, 10, 36, "44", labNames + wavelengths, "-1.2345679e-300"},
-        {false, false, 400, -5, 2, "7", "\tSPECTRAL_400\tSPECTRAL_395", "-1.2345679e-300"},
+        {false, false, 380, 10, -1, "5", "", ""},
+        {false, false, 380, 10, 37, "5", "", ""},
+        {true, false, 380, 10, -1, "8", "\tLAB_L\tLAB_A\tLAB_B", labText},
+        {false, true, 380, 10, 0, "8", "\tXYZ_X\tXYZ_Y\tXYZ_Z", "\t84.12346\t1e-07\tinf"},
+        {false, false, 380, 10, 36, "41", wavelengths, reflectances},
+        {false, false, 400, -5, 1, "6", "\tSPECTRAL_400", "\t-1.2345679e-300"},
         {false, false, 2147483647, 2147483647, 2, "7", "\tSPECTRAL_2147483647\tSPECTRAL_4294967294",
-         "-1.2345679e-300"},
+         "\t-1.2345679e-300\t-1.2345679e-300"},
     };
     for (const Case& c : cases) {
-        SCOPED_TRACE(c.names);
-        Samples samples(2);
-        for (auto* values : {&samples.cmyk, &samples.lab, &samples.xyz}) {
-            values->assign(values->size(), -1.23456789e-300);
-        }
-        std::fill_n(samples.spectra[1].values, 36, -1.23456789e-300);
-        samples.record.lab = c.lab ? samples.lab.data() : nullptr;
-        samples.record.xyz = c.xyz ? samples.xyz.data() : nullptr;
-        samples.addSpectra(c.base, c.stepsize, c.length);
-        std::string lastRow = "\n2";
-        for (int i = 1; i < std::stoi(c.fields); ++i) {
-            lastRow += "\t" + c.value;
-        }
-        const std::string text = written(samples);
+        m_job.measurement.lab = c.lab ? m_lab : nullptr;
+        m_job.measurement.xyz = c.xyz ? m_xyz : nullptr;
+        addSpectra(c.base, c.stepsize, c.length);
+        EXPECT_EQ(write(false), 0);
+        const std::string text = support::contentsOf(m_sample);
         EXPECT_NE(text.find("\nNUMBER_OF_FIELDS " + c.fields + "\n"), text.npos) << text;
         EXPECT_NE(text.find("\tCMYK_K" + c.names + "\n"), text.npos) << text;
-        EXPECT_NE(text.find(lastRow + "\nEND_DATA\n"), text.npos) << text;
+        EXPECT_NE(text.find("\n1\t12.3457\t100\t0\t-0" + c.values + "\n2\t"), text.npos) << text;
     }
 }
 
@@ -154,13 +132,14 @@ TEST(NumberText, IsThatOfAStream) {
 TEST_F(SampleFile, ReplacesOneFileOrTheOther) {
     m_folder.write("sample", "old sample");
     m_folder.write("J\xf6rg", std::string(1000, 'x'));
-    EXPECT_EQ(write(Samples(0), true), -1) << "a null array of device values";
+    m_job.measurement.cmyk = nullptr;
+    EXPECT_EQ(write(true), -1);
     EXPECT_EQ(support::contentsOf(m_reference), "");
 
-    Samples samples(1);
-    samples.addSpectra(380, 10, 36);
-    samples.record.numPatches = 0;
-    EXPECT_EQ(write(samples, true), 0);
+    m_job.measurement.cmyk = m_cmyk;
+    m_job.measurement.numPatches = 0; // So no row of spectra is looked at.
+    addSpectra(380, 10, 36);
+    EXPECT_EQ(write(true), 0);
     EXPECT_EQ(support::contentsOf(m_reference),
               "CGATS.17\nKEYWORD ILLUMINATION_CONDITION\nILLUMINATION_CONDITION -3\n"
               "NUMBER_OF_FIELDS 5\nBEGIN_DATA_FORMAT\n"
@@ -168,7 +147,7 @@ TEST_F(SampleFile, ReplacesOneFileOrTheOther) {
               "NUMBER_OF_SETS 0\nBEGIN_DATA\nEND_DATA\n");
     EXPECT_EQ(support::contentsOf(m_sample), "old sample");
     m_job.sampleFile = m_folder.path("no such folder/sample");
-    EXPECT_EQ(write(samples, false), 0) << "what can't be written is not reported";
+    EXPECT_EQ(write(false), 0) << "what can't be written is not reported";
 }
 
 } // namespace
