@@ -78,7 +78,6 @@ TEST(Presets, EverythingOfTheRecordComesFromTheFile) {
 TEST(Presets, OneCodeForOneCause) {
     const std::tuple<std::string, std::string, int> edits[] = {
         {"</tolerancePreset>", "", exitPresetNotXml},
-        {"<tolerancePreset v", "<t:tolerancePreset v", exitPresetNotXml},
         {"</tolerancePreset>", "</tolerancePreset>more", exitPresetNotXml},
         {"</tolerancePreset>", "</tolerancePreset><a/>", exitPresetNotXml},
         {"<psd>", std::string("\0<psd>", 6), exitPresetNotXml},
@@ -87,7 +86,6 @@ TEST(Presets, OneCodeForOneCause) {
         {" version=\"1\"", "", exitPresetValueMissing},
         {"<id>12</id>", "", exitPresetValueMissing},
         {"Haus &amp; Hof ü", "", exitPresetValueMissing},
-        {"\"2.5\"", "\"\"", exitPresetValueMissing},
         {"used=\"yes\"", "", exitPresetValueMissing},
         {" psdUsed=\"yes\"", "", exitPresetValueMissing},
         {"<psd>no", "<psd>yes", exitPresetValueMissing},
@@ -102,10 +100,8 @@ TEST(Presets, OneCodeForOneCause) {
         {"2.5", "nan(0)", exitPresetOutOfRange},
         {"\"1000\"", "\"1000.0001\"", exitPresetOutOfRange},
         {"\"10\"", "\"11\"", exitPresetOutOfRange},
-        {">12<", ">2147483648<", exitPresetOutOfRange},
         {"version=\"1\"", "version=\"2\"", exitPresetOutOfRange},
         {"CIECMC_2_1", "CIE2001", exitPresetOutOfRange},
-        {"used=\"yes\"", "used=\"true\"", exitPresetOutOfRange},
         {"<psd>", "<colour/><psd>", exitPresetUnknownEntry},
         {"<average", "<avarage", exitPresetUnknownEntry},
         {"decimals", "unit=\"dE\" decimals", exitPresetUnknownEntry},
