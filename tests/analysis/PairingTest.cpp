@@ -51,6 +51,7 @@ TEST(Pairing, GoesFromTheSurestToTheWeakest) {
         {"duplicates in their order", "cmyk 1:0,0,0,0 2:9,0,0,0 3:0,0,0,0",
          "cmyk 7:9,0,0,0 8:0,0,0,0 9:0,0,0,0 10:0,0,0,0", "deviceValues 1 0 2"},
         {"an id for two patches", ramp, "cmyk 1:60,0,0,0 2:0,7,0,0", "deviceValues - - 1"},
+        {"two decimals", "cmyk 1:12.3444,0,0,0", "cmyk 1:12.34,0,0,0", "deviceValues 0"},
         {"the nearest first, then whole percents", "cmyk 1:3,2.24,2.24,0 2:3.1,2.2,2.2,0",
          "cmyk 1:3.1,2.2,2.2,0 2:3,2,2,0", "deviceValues 1 0", 1},
         {"spots", ramp, "cmyk 1:50,0,0,0,0 2:0,0,0,0,100", "deviceValues - 0 -"},
