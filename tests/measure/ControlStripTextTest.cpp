@@ -11,6 +11,10 @@ namespace {
 
 TEST(StringConditioning, EndsALineAnew) {
     const std::string a500(500, 'a');
+    std::string umlauts;
+    while (umlauts.size() < 600) {
+        umlauts += "ä";
+    }
     const std::pair<std::string, std::string> cases[] = {
         {"a \t\r\n", "a "},
         {"\ta\tb\t", "\ta\tb"},
@@ -21,7 +25,8 @@ TEST(StringConditioning, EndsALineAnew) {
         {"abcä", "abc"},
         {"€ 1 €!", "€ 1 "},
         // 511 bytes stay, and no half character.
-        {a500 + "aaaaaaaaaaäzz", a500 + "aaaaaaaaaa"},
+        {a500 + "aaaaaaaaaaaa", a500 + "aaaaaaaaaaa"},
+        {umlauts, umlauts.substr(0, 510)},
         {a500 + std::string(100, '\t') + "b", a500},
     };
     for (const auto& [line, expected] : cases) {

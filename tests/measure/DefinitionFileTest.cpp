@@ -29,10 +29,8 @@ const std::string noDevice = head + "END_DATA_FORMAT|DEVICE 5|" + lowRes;
 const std::string dynamic = "KEYWORD FORCE_LAB_CALCULATION|FORCE_LAB_CALCULATION 1|";
 const std::string oneColumn = "KEYWORD NUMBER_OF_COLS|NUMBER_OF_COLS 1|";
 
-const std::string cmykFields =
-    "SAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tLAB_L\tLAB_A\tLAB_B\tXYZ_X\tXYZ_Y\tXYZ_Z";
-const std::string rgbFields =
-    "SAMPLE_ID\tRGB_R\tRGB_G\tRGB_B\tLAB_L\tLAB_A\tLAB_B\tXYZ_X\tXYZ_Y\tXYZ_Z";
+const std::string cmykFields = "SAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tLAB_L\tLAB_A\tLAB_B";
+const std::string rgbFields = "SAMPLE_ID\tRGB_R\tRGB_G\tRGB_B\tLAB_L\tLAB_A\tLAB_B";
 const std::string cmykWhite = "\t0.00\t0.00\t0.00\t0.00\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00|";
 const std::string rgbWhite = "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00|";
 
@@ -77,12 +75,12 @@ TEST_F(DefinitionFile, TakesTheRowsOfAFixedStrip) {
     m_job.deviceID = 21;
     // The second row has one byte too many, so that it loses its end.
     const std::string body =
-        "ORIGINATOR \"me\"\t|KEYWORD \"DEVICE\"|DEVICE 21 \t|NUMBER_OF_FIELDS 11|"
+        "ORIGINATOR \"me\"\t|KEYWORD \"DEVICE\"|DEVICE 21 \t|NUMBER_OF_FIELDS 8|"
         "NUMBER_OF_STRIPS 3|BORDER_PATCHES 1|VERTICAL_MEAS 0|NUMBER_OF_SETS 100|"
         "BEGIN_DATA_FORMAT|" +
         cmykFields + "|END_DATA_FORMAT||BEGIN_DATA|1\t0\t0\t0\t0|2\tä\t0|END_DATA|behind\t|";
     const std::string definition =
-        head + "NUMBER_OF_FIELDS 11|BEGIN_DATA_FORMAT|" + cmykFields +
+        head + "NUMBER_OF_FIELDS 8|BEGIN_DATA_FORMAT|" + cmykFields +
         "|END_DATA_FORMAT|KEYWORD\tDEVICE|DEVICE 21 |KEYWORD ZEBRA_RULER_MODE|ZEBRA_RULER_MODE 1|" +
         lowRes +
         "KEYWORD VERTICAL_MEAS|VERTICAL_MEAS 0|KEYWORD BORDER_PATCHES|BORDER_PATCHES 1|"

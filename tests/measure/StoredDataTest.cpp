@@ -85,14 +85,12 @@ TEST_F(StoredData, GoesOnWithoutWhatIsMissing) {
     const std::string empty = "spectra xyz lab cmyk";
     const std::pair<const char*, std::string> cases[] = {
         {"Numpatches=-", "-1 0 0 " + empty},
-        {"Numpatches=-2", "0 0 0 " + empty},
         {"Numpatches=1000001", "0 1000001 0 " + empty},
         {"SpectralValues/Base=-", "-1 2 0 spectra 0/0/0 : 0/0/0 :" + zeros},
         {"SpectralValues/Length='2", "-1 2 0 spectra 380/0/0 : 0/0/0 :" + zeros},
         {"SpectralValues/Length=37", "0 2 0 spectra" + rest},
         {"SpectralValues/Length=0", "0 2 1 spectra 380/10/0 : 380/10/0 :" + rest},
         {"SpectralValues/DValues=1.0,2.0,3.0", "0 2 0 spectra 380/10/2 : 0,0 0/0/0 :" + rest},
-        {"SpectralValues/DValues=1.0,2.0,3.0,4.0,5.0", spectra + rest},
         {"XYZValues/XValues=-", spectra + " xyz 0,7,9,0,8,10" + rest.substr(xyz.size())},
         {"LabValues/AValues=1.5,2.5,3.5",
          spectra + xyz + " lab 11,1.5,15,12,2.5,16 cmyk 17,19,21,23,18,20,22,24"},
