@@ -15,7 +15,6 @@ class Recorder : public Server {
         s_recorder = this;
         ticket::container::SetMultiParameter::put(record, take);
         create(12, "a[-1]=1");
-        takeUpdateLog();
     }
 
     std::string sent;          ///< Tables as "type/id records;".
@@ -158,18 +157,12 @@ TEST(Flush, CreatesVirtualTicketsFirst) {
     edit(list, jobs, -9998, "a=1,2");
     edit(list, 50, -9997, "a[-1]=1"); // Filed under type -1, for which there is no fallback.
     edit(list, TICKET_TYPE_LOCAL, 7, "a[-1]=1");
-    takeUpdateLog();
-
     std::string substitutions;
     unsigned long count = 0;
     EXPECT_TRUE(list.FlushToContainer(&server.record, &count, writeTo(substitutions)));
     EXPECT_EQ(server.sent, "3/13 a[-1]=1 a[1]=2;3/12 a[-1]=2;");
     EXPECT_EQ(count, 3u);
     EXPECT_EQ(substitutions, "type -1>-1;id -9998>13;");
-    EXPECT_EQ(takeUpdateLog(), "FlushToContainer() (-1, -9997) ticketType=-1 INVALID\n"
-                               "FlushToContainer() (3, -9998) ticketID=13 OK\n"
-                               "FlushToContainer() (3, 12) OK\n"
-                               "Clear()\n");
     EXPECT_EQ(given(list, -9998), 13);
     EXPECT_EQ(given(list, -9997), 0);
     EXPECT_TRUE(list.IsEmpty(TICKET_TYPE_LOCAL, 7));
@@ -211,29 +204,19 @@ TEST(Flush, OfOneTicketLeavesTheOthers) {
     EXPECT_FALSE(list.IsEmpty(TICKET_TYPE_LOCAL, 7));
 }
 
-TEST(Flush, TellsRefusalsApart) {
+TEST(Flush, SucceedsWhereAnyRecordDid) {
     struct Case {
-        std::optional<int> answer;
+        int answer;
         std::uint8_t firstResult;
-        const char* log;
         bool ok;
     };
-    const Case cases[] = {
-        {std::nullopt, 0, " OK\n", true},
-        {1, 3, " OK\n", true},
-        {1, 2, " FAILED PARAMETERS\n", false}, // Bit 0 alone is the result.
-        {2, 1, " FAILED\n", false},
-    };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(c.log);
+    for (const Case& c : {Case{1, 3, true}, {1, 2, false}, {2, 1, false}}) { // Bit 0 counts.
         Recorder server;
         server.answer = c.answer;
         server.firstResult = c.firstResult;
         TICKET_UPDATE_LIST list(&server.record);
         edit(list, jobs, 12, "a[-1]=2 b[-1]=3");
-        takeUpdateLog();
         EXPECT_EQ(list.FlushToContainer(&server.record, nullptr, {}), c.ok);
-        EXPECT_EQ(takeUpdateLog(), std::string("FlushToContainer() (3, 12)") + c.log + "Clear()\n");
         EXPECT_TRUE(list.IsEmpty(jobs, 12)); // Nothing is tried again.
         EXPECT_EQ(server.sent, "3/12 a[-1]=2 b[-1]=3;");
     }

@@ -1,4 +1,4 @@
-// A server of the real engine for the tests of update lists, and what the lists log.
+// A server of the real engine for the tests of update lists.
 #pragma once
 
 #include "RealTickets.h"
@@ -33,6 +33,3 @@ inline bool edit(TICKET_UPDATE_LIST& list, int type, int id, const std::string& 
     }
     return r->key == nullptr;
 }
-
-/// What update lists have written since the last look.
-std::string takeUpdateLog();

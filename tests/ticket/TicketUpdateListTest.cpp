@@ -18,7 +18,6 @@ class UpdateList : public testing::Test {
   protected:
     UpdateList() : list(&server.record) {
         server.create(id, "a=1,2,3,4 s[-1]='old s[1]='older d[-1]=0.5 u[-1]=u9");
-        takeUpdateLog();
     }
 
     Server server;
@@ -140,9 +139,8 @@ TEST_F(UpdateList, TellsOfEachChange) {
             told += std::to_string(type) + "/" + std::to_string(ticket) + " " + key + " " +
                     std::to_string(ptype) + " " + support::valueText(ptype, value) + ";";
         });
-    list.AddParameter(jobs, id, "m", "\x80", true);          // MacRoman: told as UTF-8.
-    EXPECT_FALSE(list.DelParameter(jobs, id, "a", 7, true)); // Refused, and told of.
-    EXPECT_NE(takeUpdateLog().find("a[7] <DEL> (got original vector) FAILED\n"), std::string::npos);
+    list.AddParameter(jobs, id, "m", "\x80", true);                   // MacRoman: told as UTF-8.
+    EXPECT_FALSE(list.DelParameter(jobs, id, "a", 7, true));          // Refused, and told of.
     list.SetFilenameVectorParameter(jobs, id, "n", {"a\\b", "\x80"}); // Once, not for its parts.
     EXPECT_EQ(told, "3/12 m 4 '\xC3\x84;3/12 a 0 -;3/12 n 6 null;");
     EXPECT_EQ(entryText(list.m_changed, jobs, id).substr(28),
@@ -160,9 +158,6 @@ TEST_F(UpdateList, RefusesWithoutATrace) {
     EXPECT_FALSE(edit(list, jobs, id, "s[-1]='x"));
     EXPECT_FALSE(edit(list, 51, id, "a[-1]=1"));
     EXPECT_FALSE(list.xSetParameter(1000, id, nullptr, PARAM_DELETE, nullptr, 0, false));
-    EXPECT_EQ(takeUpdateLog(), "(3, 12) s[-1] <x> UNTRANSLATEABLE\n"
-                               "(51, 12) a[-1] <1> INVALID\n"
-                               "(1000, 12) (NULL)[0] <DEL> INVALID\n");
     const auto* factory = std::exchange(hSTicketInstance, nullptr);
     EXPECT_FALSE(edit(list, jobs, 14, "a[-1]=1"));
     hSTicketInstance = factory;
