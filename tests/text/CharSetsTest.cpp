@@ -40,8 +40,6 @@ TEST(CharSets, CopiesWithinBounds) {
     CharSets::Win2Utf8(field, "abcdefgh", 4);
     CharSets::Utf82Win(field, "X", 0);
     EXPECT_EQ(std::string(field, 8), "abc\0\0ZZ\0"s);
-    CharSets::Win2Utf8Decomposed(field, nullptr, 7);
-    EXPECT_EQ(std::string(field, 8), std::string(8, '\0'));
 
     // Any method but the first is new[], which a sanitizer tells from malloc.
     const std::unique_ptr<char[]> copy(
