@@ -1,7 +1,6 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 
 #include <clocale>
-#include <cstring>
 #include <filesystem>
 #include <sstream>
 
@@ -23,15 +22,6 @@ class ManagerTest : public CommTest {
         manager->Initialize("user", "secret", "host", 50005, 1);
         manager->Login(nullptr, nullptr, nullptr, -1);
         takeCalls();
-    }
-
-    std::string textAt(int offset) const {
-        return reinterpret_cast<const char*>(&plugIn->record) + offset;
-    }
-    int numberAt(int offset) const {
-        int value = 0;
-        std::memcpy(&value, reinterpret_cast<const char*>(&plugIn->record) + offset, sizeof value);
-        return value;
     }
 
     const std::unique_ptr<ComGUIManager> manager;
@@ -66,18 +56,19 @@ TEST_F(CommTest, AFailedLoadIsToldAndEndsTheLoginOnly) {
 
 TEST_F(ManagerTest, FillsTheSessionRecord) {
     const std::string name(130, 'u');
-    int lastPort = numberAt(388);
+    const ComSessionRecord& record = plugIn->record;
+    int lastPort = record.localPort;
     for (int i = 0; i < 22; ++i) {
         manager->Initialize(name.c_str(), nullptr, "10.0.0.1", 1234, i == 0 ? 0x5071103 : i);
-        EXPECT_EQ(numberAt(828), i == 0 ? 7 : 5);
-        EXPECT_EQ(numberAt(388), lastPort == 50026 ? 50006 : lastPort + 1);
-        lastPort = numberAt(388);
+        EXPECT_EQ(record.clientLevel, i == 0 ? 7 : 5);
+        EXPECT_EQ(record.localPort, lastPort == 50026 ? 50006 : lastPort + 1);
+        lastPort = record.localPort;
     }
-    EXPECT_EQ(textAt(4), name.substr(0, 127));
-    EXPECT_EQ(textAt(132), "");
-    EXPECT_EQ(textAt(520), "10.0.0.1");
-    EXPECT_THAT((std::vector{numberAt(0), numberAt(648), numberAt(792), numberAt(832)}),
-                ElementsAre(2632, 1234, 21, 1));
+    EXPECT_STREQ(record.user, name.substr(0, 127).c_str());
+    EXPECT_STREQ(record.password, "");
+    EXPECT_STREQ(record.server, "10.0.0.1");
+    EXPECT_THAT((std::vector{record.serverPort, record.applicationID, record.clientLevelCompanion}),
+                ElementsAre(1234, 21, 1));
 }
 
 TEST_F(ManagerTest, LogsInWithWhatIsGiven) {
@@ -86,9 +77,9 @@ TEST_F(ManagerTest, LogsInWithWhatIsGiven) {
     EXPECT_EQ(manager->IsAlive("other", 9), 0);
     // In MacRoman 0x80 is a capital A with diaeresis; only the user's name is converted.
     EXPECT_EQ(manager->Login("\x80", "\x80", "other", 7), 0);
-    EXPECT_EQ(textAt(4), "\xc3\x84");
-    EXPECT_EQ(textAt(132), "\x80");
-    EXPECT_EQ(numberAt(648), 7);
+    EXPECT_STREQ(plugIn->record.user, "\xc3\x84");
+    EXPECT_STREQ(plugIn->record.password, "\x80");
+    EXPECT_EQ(plugIn->record.serverPort, 7);
     EXPECT_EQ(manager->GetServerName(), (std::wstring{L'N', wchar_t(0xFFFFFFE4), L'm', L'e'}));
     EXPECT_EQ(takeCalls(), (Calls{"26 other 9", "9", "12"}));
 
