@@ -142,13 +142,7 @@ TICKET_UPDATE_CALLBACK writeTo(std::string& text) {
     return {append, &text};
 }
 
-/// The id that a flush gave the virtual one; 0 where it gave none.
-int given(const TICKET_UPDATE_LIST& list, int virtualId) {
-    int real = 0;
-    const bool found = list.GetActualTicketID(real, virtualId);
-    EXPECT_TRUE(found || real == -1);
-    return found ? real : 0;
-}
+using Ids = std::map<int, int>; ///< Real ones by the virtual ones that a flush replaced.
 
 TEST(Flush, CreatesVirtualTicketsFirst) {
     Recorder server;
@@ -163,11 +157,13 @@ TEST(Flush, CreatesVirtualTicketsFirst) {
     EXPECT_EQ(server.sent, "3/13 a[-1]=1 a[1]=2;3/12 a[-1]=2;");
     EXPECT_EQ(count, 3u);
     EXPECT_EQ(substitutions, "type -1>-1;id -9998>13;");
-    EXPECT_EQ(given(list, -9998), 13);
-    EXPECT_EQ(given(list, -9997), 0);
+    EXPECT_EQ(list.m_idMap, (Ids{{-9998, 13}}));
+    int real = 0;
+    EXPECT_TRUE(list.GetActualTicketID(real, -9998) && real == 13);
+    EXPECT_FALSE(list.GetActualTicketID(real, -9997) || real != -1);
     EXPECT_TRUE(list.IsEmpty(TICKET_TYPE_LOCAL, 7));
     EXPECT_TRUE(list.FlushToContainer(&server.record, nullptr, {}));
-    EXPECT_EQ(given(list, -9998), 0);
+    EXPECT_TRUE(list.m_idMap.empty());
 }
 
 TEST(Flush, OfOneTicketLeavesTheOthers) {
@@ -190,18 +186,15 @@ TEST(Flush, OfOneTicketLeavesTheOthers) {
     edit(list, jobs, -9998, "a[-1]=3");
     edit(list, jobs, 14, "a[-1]=4");
     edit(list, TICKET_TYPE_LOCAL, 7, "a[-1]=1");
-    for (const Case& c : cases) {
-        SCOPED_TRACE(std::to_string(c.type) + ", " + std::to_string(c.id));
-        int type = c.type;
-        int id = c.id;
-        EXPECT_FALSE(c.type == jobs && list.FlushToContainer(nullptr, type, id, nullptr, {}));
-        EXPECT_EQ(list.FlushToContainer(&server.record, type, id, nullptr, {}), c.ok);
-        EXPECT_EQ(id, c.sentTo);
-        EXPECT_EQ(server.sent, c.sent);
-        EXPECT_EQ(given(list, -9998), c.sentTo == 13 ? 13 : 0);
+    for (auto [type, id, ok, sentTo, sent] : cases) {
+        SCOPED_TRACE(std::to_string(type) + ", " + std::to_string(id));
+        EXPECT_FALSE(type == jobs && list.FlushToContainer(nullptr, type, id, nullptr, {}));
+        EXPECT_EQ(list.FlushToContainer(&server.record, type, id, nullptr, {}), ok);
+        EXPECT_EQ(id, sentTo);
+        EXPECT_EQ(server.sent, sent);
+        EXPECT_EQ(list.m_idMap, sentTo == 13 ? (Ids{{-9998, 13}}) : Ids());
     }
-    EXPECT_FALSE(list.IsEmpty(jobs, 14));
-    EXPECT_FALSE(list.IsEmpty(TICKET_TYPE_LOCAL, 7));
+    EXPECT_FALSE(list.IsEmpty(jobs, 14) || list.IsEmpty(TICKET_TYPE_LOCAL, 7));
 }
 
 TEST(Flush, SucceedsWhereAnyRecordDid) {
@@ -241,7 +234,7 @@ TEST(Flush, FailsWithoutTicketsOfItsOwn) {
     EXPECT_TRUE(list.FlushToContainer(&server.record, nullptr, writeTo(substitutions)));
     EXPECT_EQ(substitutions, "id -9998>-1;");
     EXPECT_EQ(server.sent, "3/12 a[-1]=2;");
-    EXPECT_EQ(given(list, -9998), -1);
+    EXPECT_EQ(list.m_idMap, (Ids{{-9998, -1}}));
 }
 
 } // namespace

@@ -53,31 +53,29 @@ TEST_F(UpdateList, OverlaysTheServersValues) {
         const char* edits;
         int position;
         int found, value;
-        bool changed;
     };
     const Case cases[] = {
-        {"", -1, 0, 7, false},
-        {"a[-1]=9", -1, 1, 9, true},
-        {"a[-1]=9", 1, 0, 7, true},
-        {"a[-1]=-", -1, 2, 7, true},
-        {"a[-1]=- a[-1]=3", -1, 1, 3, true},
-        {"a[-1]=- a[-1]=3", 1, 0, 7, true}, // No longer deleted.
+        {"", -1, 0, 7},
+        {"a[-1]=9", -1, 1, 9},
+        {"a[-1]=9", 1, 0, 7},
+        {"a[-1]=-", -1, 2, 7},
+        {"a[-1]=- a[-1]=3", -1, 1, 3},
+        {"a[-1]=- a[-1]=3", 1, 0, 7}, // No longer deleted.
     };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(std::string(c.edits) + " " + std::to_string(c.position));
+    for (const auto& [edits, position, found, expected] : cases) {
+        SCOPED_TRACE(std::string(edits) + " " + std::to_string(position));
         list.Clear();
-        edit(list, jobs, id, c.edits);
+        edit(list, jobs, id, edits);
         int value = 7;
-        EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, c.position), c.found);
-        EXPECT_EQ(value, c.value);
+        EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, position), found);
+        EXPECT_EQ(value, expected);
         // Without a place nothing is found, but a deletion is told of.
-        EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, c.position),
-                  c.found == 2 ? 2 : 0);
-        EXPECT_EQ(list.ParameterExists(jobs, id, "a"), c.changed && c.found != 2);
-        EXPECT_EQ(list.ParameterChanged(jobs, id, "a"), c.changed);
+        EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, position),
+                  found == 2 ? 2 : 0);
         std::set<std::string> keys;
-        EXPECT_EQ(list.GetChangedKeysList(jobs, id, keys), c.changed);
-        EXPECT_EQ(keys.count("a"), c.changed ? 1u : 0u);
+        EXPECT_EQ(list.GetChangedKeysList(jobs, id, keys), edits[0] != '\0');
+        EXPECT_EQ(list.ParameterChanged(jobs, id, "a"), keys.contains("a"));
+        EXPECT_EQ(list.ParameterExists(jobs, id, "a"), keys.contains("a") && found != 2);
     }
     list.Clear();
     edit(list, jobs, id, "a[-1]=-");
