@@ -40,23 +40,7 @@ std::size_t entriesIn(const std::string& folder) {
     return static_cast<std::size_t>(std::distance(begin(entries), end(entries)));
 }
 
-TEST(OutputFile, ReplacesWholeAndKeepsModeAndLinks) {
-    const support::ScratchFolder scratch;
-    const std::string path = scratch.write("lab.txt", "longer");
-    chmod(path.c_str(), 0640);
-    EXPECT_EQ(analysis::writeOutputFile(path, "2"), exitDone);
-    EXPECT_EQ(support::contentsOf(path), "2");
-    EXPECT_EQ(support::modeOf(path), 0640u);
-
-    const std::string link = scratch.path("link");
-    std::filesystem::create_symlink(path, link);
-    EXPECT_EQ(analysis::writeOutputFile(link, ""), exitDone);
-    EXPECT_TRUE(std::filesystem::is_symlink(link));
-    EXPECT_EQ(support::contentsOf(path), "");
-    EXPECT_EQ(entriesIn(scratch.path()), 2u);
-}
-
-TEST(OutputFile, SurvivesEveryFailure) {
+TEST(OutputFile, IsReplacedWholeOrStaysAsItWas) {
     constexpr unsigned other = support::ordinaryUser;
     const struct {
         const char* what;
@@ -65,6 +49,7 @@ TEST(OutputFile, SurvivesEveryFailure) {
         bool diskFull;
         int status;
     } cases[] = {
+        {"another mode", 0755, 0640, 0, false, exitDone},
         {"full disk", 0755, 0644, 0, true, exitOutputIncomplete},
         {"read-only file", 0777, 0444, other, false, exitOutputNotWritable},
         {"read-only folder, own file", 0555, 0666, other, false, exitDone},
@@ -81,16 +66,27 @@ TEST(OutputFile, SurvivesEveryFailure) {
         EXPECT_EQ(statusInChild(path, c.user, c.diskFull), c.status);
         EXPECT_EQ(support::contentsOf(path),
                   c.status == exitDone ? "new" : "a longer text that was there");
+        EXPECT_EQ(support::modeOf(path), c.fileMode);
         EXPECT_EQ(entriesIn(folder), 1u);
     }
 }
 
+TEST(OutputFile, IsWrittenThroughLinks) {
+    const support::ScratchFolder scratch;
+    const std::string path = scratch.write("lab.txt", "longer");
+    const std::string link = scratch.path("link");
+    std::filesystem::create_symlink(path, link);
+    EXPECT_EQ(analysis::writeOutputFile(link, ""), exitDone);
+    EXPECT_TRUE(std::filesystem::is_symlink(link));
+    EXPECT_EQ(support::contentsOf(path), "");
+    // A device is never named itself here: tests may run as root, and a fault replace it.
+    std::filesystem::remove(link);
+    std::filesystem::create_symlink("/dev/full", link);
+    EXPECT_EQ(analysis::writeOutputFile(link, "x"), exitOutputIncomplete);
+}
+
 TEST(OutputFile, SaysWhatIsWrongWithThePath) {
     const support::ScratchFolder scratch;
-    // Through a link, so that a fault could replace no more than this: tests may run as root.
-    const std::string device = scratch.path("device");
-    std::filesystem::create_symlink("/dev/full", device);
-    EXPECT_EQ(analysis::writeOutputFile(device, "x"), exitOutputIncomplete);
     for (const std::string& path : {scratch.path(), scratch.path("no/such"), std::string()})
         EXPECT_EQ(analysis::writeOutputFile(path, "x"), exitOutputNotWritable) << path;
     EXPECT_EQ(analysis::writeOutputFile(scratch.path(std::string(255, 'n')), "x"), exitDone);
