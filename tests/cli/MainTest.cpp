@@ -89,17 +89,10 @@ TEST_F(MainTest, TheArgumentCountDecides) {
 }
 
 TEST_F(MainTest, HelpHasItsLines) {
-    const std::string bar = std::string(86, '*') + "\n";
     const std::string text = run({"-help"}).output;
     EXPECT_EQ(std::count(text.begin(), text.end(), '\n'), 35);
-    std::string frame; // Bars and empty lines, with a letter for any other.
-    std::size_t at = 0;
-    for (std::size_t end = 0; (end = text.find('\n', at)) != std::string::npos; at = end + 1) {
-        const std::string line = text.substr(at, end + 1 - at);
-        frame += line == bar ? '*' : line == "\n" ? '_' : 't';
-    }
-    EXPECT_EQ(frame, "t_ttt_*tttttttttt*_*tttt*_*tttttt*_");
-    EXPECT_THAT(text, testing::HasSubstr("icc profile: \n"));
+    EXPECT_THAT(text, testing::HasSubstr("icc profile: \n")); // With a blank at its end.
+    EXPECT_THAT(text, EndsWith("\n" + std::string(86, '*') + "\n\n"));
 }
 
 // A caller that starts the program anew must not lose the result that it has.
