@@ -144,11 +144,11 @@ TEST_F(UpdateList, TellsOfEachChange) {
     EXPECT_EQ(entryText(list.m_changed, jobs, id).substr(28),
               "m[0]='\xC3\x84 n[0]='a/b n[1]='\xC3\x84");
 
-    // A text that was handed out lives as long as the list.
+    // A text that is handed out is the list's own, and lives as long.
     const char* text = nullptr;
-    EXPECT_EQ(list.xGetParameter(jobs, id, "n", PARAM_STRING, &text, 1), 1);
-    list.Clear();
-    EXPECT_STREQ(text, "\xC3\x84");
+    EXPECT_EQ(list.xGetParameter(jobs, id, "n", PARAM_STRING, &text, 0), 1);
+    EXPECT_STREQ(text, "a/b");
+    EXPECT_EQ(text, list.m_stringCache["a/b"]);
 }
 
 TEST_F(UpdateList, RefusesWithoutATrace) {
