@@ -1,6 +1,5 @@
 #include "RunProgram.h"
 
-#include <array>
 #include <cerrno>
 #include <cstring>
 #include <stdexcept>
@@ -9,33 +8,43 @@
 #include <grp.h>
 #include <poll.h>
 #include <signal.h>
+#include <sys/mman.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+extern "C" { // Which this header does not say itself.
+#include <sys/pidfd.h>
+}
 
 namespace support {
 
 namespace {
 
-using Clock = std::chrono::steady_clock;
+/// A file in memory for what a program prints. Unlike a pipe it never fills up, and does not stay
+/// open for a child that the program leaves behind.
+class Printed {
+  public:
+    Printed() : descriptor(memfd_create("printed", MFD_CLOEXEC)) {
+        if (descriptor < 0) {
+            throw std::runtime_error("no file in memory");
+        }
+    }
+    ~Printed() { close(descriptor); }
+    Printed(const Printed&) = delete;
 
-struct Pipe {
-    int ends[2] = {-1, -1};
-    Pipe() {
-        if (pipe2(ends, O_CLOEXEC) != 0) {
-            throw std::runtime_error("no pipe");
-        }
+    std::string text() const {
+        std::string text(static_cast<std::size_t>(lseek(descriptor, 0, SEEK_END)), '\0');
+        text.resize(static_cast<std::size_t>(pread(descriptor, text.data(), text.size(), 0)));
+        return text;
     }
-    ~Pipe() {
-        closeEnd(0);
-        closeEnd(1);
-    }
-    void closeEnd(int which) {
-        if (ends[which] >= 0) {
-            close(ends[which]);
-        }
-        ends[which] = -1;
-    }
+
+    const int descriptor;
 };
+
+[[noreturn]] void refuse(const char* what) {
+    dprintf(STDERR_FILENO, "%s: %s\n", what, strerror(errno));
+    _exit(127);
+}
 
 std::vector<std::string>
 environmentWith(const std::map<std::string, std::optional<std::string>>& changes) {
@@ -63,17 +72,11 @@ std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     return pointers;
 }
 
-[[noreturn]] void refuse(const char* what) {
-    dprintf(STDERR_FILENO, "%s: %s\n", what, strerror(errno));
-    _exit(127);
-}
-
 // In the child. Its group is its own, so that a time limit ends its children too.
 [[noreturn]] void become(char* const* arguments, char* const* environment, int output, int error,
                          const RunOptions& options) {
     setpgid(0, 0);
-    const int nothing = open("/dev/null", O_RDONLY);
-    dup2(nothing, STDIN_FILENO);
+    dup2(open("/dev/null", O_RDONLY), STDIN_FILENO);
     dup2(error, STDERR_FILENO);
     // An ordinary user may not be able to reach the build tree, so the program is opened before.
     int program = -1;
@@ -100,66 +103,26 @@ std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     refuse(arguments[0]);
 }
 
-bool hasEnded(pid_t child) {
-    siginfo_t info = {};
-    waitid(P_PID, static_cast<id_t>(child), &info, WEXITED | WNOHANG | WNOWAIT);
-    return info.si_pid == child;
-}
-
-// Takes in what the program prints until it has ended, whether or not a child that it left behind
-// still holds the pipes. False if that takes too long.
-bool collect(pid_t child, Pipe& output, Pipe& error, Outcome& outcome, Clock::time_point end) {
-    std::array<pollfd, 2> open = {{{output.ends[0], POLLIN, 0}, {error.ends[0], POLLIN, 0}}};
-    std::array<std::string*, 2> texts = {&outcome.output, &outcome.error};
-    while (Clock::now() < end) {
-        // Asked before the pipes are, so that its last words are not missed.
-        const bool ended = hasEnded(child);
-        const bool closed = open[0].fd < 0 && open[1].fd < 0;
-        const int ready = poll(open.data(), open.size(), ended ? 0 : closed ? 1 : 20);
-        if (ended && ready == 0) {
-            return true;
-        }
-        for (std::size_t i = 0; i < open.size(); ++i) {
-            if (open[i].fd < 0 || open[i].revents == 0) {
-                continue;
-            }
-            char bytes[65536];
-            const ssize_t count = read(open[i].fd, bytes, sizeof bytes);
-            if (count > 0) {
-                texts[i]->append(bytes, static_cast<std::size_t>(count));
-            } else {
-                open[i].fd = -1;
-            }
-        }
-    }
-    return false;
-}
-
 } // namespace
 
 Outcome run(const std::vector<std::string>& command, const RunOptions& options) {
-    std::vector<std::string> arguments = command;
+    std::vector<std::string> words = command;
     std::vector<std::string> environment = environmentWith(options.environment);
-    const std::vector<char*> argumentPointers = pointersTo(arguments);
-    const std::vector<char*> environmentPointers = pointersTo(environment);
-    Pipe output;
-    Pipe error;
-
-    const Clock::time_point end = Clock::now() + options.limit;
+    const std::vector<char*> arguments = pointersTo(words);
+    const std::vector<char*> variables = pointersTo(environment);
+    const Printed output;
+    const Printed error;
     const pid_t child = fork();
     if (child < 0) {
         throw std::runtime_error("no process");
     }
     if (child == 0) {
-        become(argumentPointers.data(), environmentPointers.data(), output.ends[1], error.ends[1],
-               options);
+        become(arguments.data(), variables.data(), output.descriptor, error.descriptor, options);
     }
     setpgid(child, child); // Here as well, so that it is done whoever comes first.
-    output.closeEnd(1);
-    error.closeEnd(1);
 
     Outcome outcome;
-    outcome.timedOut = !collect(child, output, error, outcome, end);
+    outcome.timedOut = !awaitEnd(child, options.limit);
     if (outcome.timedOut) {
         kill(-child, SIGKILL);
     }
@@ -167,10 +130,20 @@ Outcome run(const std::vector<std::string>& command, const RunOptions& options) 
     waitpid(child, &status, 0);
     if (WIFEXITED(status)) {
         outcome.exitCode = WEXITSTATUS(status);
-    } else if (WIFSIGNALED(status)) {
+    } else {
         outcome.signal = WTERMSIG(status);
     }
+    outcome.output = output.text();
+    outcome.error = error.text();
     return outcome;
+}
+
+bool awaitEnd(pid_t process, std::chrono::milliseconds limit) {
+    const int descriptor = pidfd_open(process, 0);
+    pollfd ended = {descriptor, POLLIN, 0};
+    const int ready = poll(&ended, 1, static_cast<int>(limit.count()));
+    close(descriptor);
+    return ready == 1;
 }
 
 bool becomeUser(unsigned user) {

@@ -7,6 +7,8 @@
 #include <string>
 #include <vector>
 
+#include <sys/types.h>
+
 namespace support {
 
 /// A user whom permissions bind.
@@ -32,6 +34,9 @@ struct Outcome {
 /// Runs command[0], which is looked for on PATH where it has no slash, and waits for its end. Exit
 /// code 127 where it can't be started. Standard input is empty.
 Outcome run(const std::vector<std::string>& command, const RunOptions& options = {});
+
+/// Whether a process, or one that nobody has waited for, ends in time.
+bool awaitEnd(pid_t process, std::chrono::milliseconds limit);
 
 /// Makes root's process one of this user; there is no way back. For anybody but root does nothing.
 /// False if that fails.

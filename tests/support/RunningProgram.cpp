@@ -1,13 +1,13 @@
 #include "RunningProgram.h"
 
-#include <chrono>
 #include <stdexcept>
-#include <thread>
 
 #include <signal.h>
 #include <spawn.h>
 #include <sys/wait.h>
 #include <unistd.h>
+
+#include "RunProgram.h"
 
 namespace support {
 
@@ -27,15 +27,10 @@ RunningProgram::~RunningProgram() {
 }
 
 int RunningProgram::endingSignal() const {
-    for (int i = 0; i < 50; ++i) {
-        siginfo_t info = {};
-        waitid(P_PID, static_cast<id_t>(m_number), &info, WEXITED | WNOHANG | WNOWAIT);
-        if (info.si_pid == m_number) {
-            return info.si_code == CLD_EXITED ? 0 : info.si_status;
-        }
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-    }
-    return 0;
+    awaitEnd(m_number, std::chrono::milliseconds(500));
+    siginfo_t info = {};
+    waitid(P_PID, static_cast<id_t>(m_number), &info, WEXITED | WNOHANG | WNOWAIT);
+    return info.si_pid == m_number && info.si_code != CLD_EXITED ? info.si_status : 0;
 }
 
 } // namespace support

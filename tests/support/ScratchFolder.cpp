@@ -25,6 +25,7 @@ ScratchFolder::~ScratchFolder() {
 }
 
 std::string ScratchFolder::write(const std::string& name, const std::string& contents) const {
+    std::filesystem::create_directories(std::filesystem::path(path(name)).parent_path());
     std::ofstream(path(name)) << contents;
     return path(name);
 }

@@ -17,7 +17,7 @@ class ScratchFolder {
     const std::string& path() const { return m_path; }
     std::string path(const std::string& name) const { return m_path + "/" + name; }
 
-    /// Writes a file of this name and returns its path.
+    /// Writes a file of this name, makes the folders above it, and returns its path.
     std::string write(const std::string& name, const std::string& contents) const;
 
     /// Makes a folder of this name and returns its path.

@@ -2,7 +2,6 @@
 
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
 
 namespace fs = std::filesystem;
 
@@ -27,19 +26,23 @@ std::string entry(const std::string& key, const std::string& value) {
            "</dict>";
 }
 
-void writeFile(const fs::path& path, const std::string& text) {
-    fs::create_directories(path.parent_path());
-    std::ofstream(path) << text;
+std::string plistText(const std::string& entries) {
+    return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\"><dict>" + entries +
+           "</dict></plist>\n";
 }
 
 } // namespace
 
-SuiteRoot::SuiteRoot(const std::string& name) : m_path(m_folder.makeFolder(name)) {
+SuiteRoot::SuiteRoot(const std::string& name) : m_name(name), m_path(m_folder.makeFolder(name)) {
     setenv("TINTGATE_ROOT", m_path.c_str(), 1);
 }
 
 SuiteRoot::~SuiteRoot() {
     unsetenv("TINTGATE_ROOT");
+}
+
+std::string SuiteRoot::write(const std::string& name, const std::string& text) const {
+    return m_folder.write(m_name + "/" + name, text);
 }
 
 void SuiteRoot::installPlistReader(const std::string& program) const {
@@ -53,12 +56,12 @@ void SuiteRoot::writePreferences(
     for (const auto& [key, value] : values) {
         entries += entry(key, value);
     }
-    writeFile(path("Library/Preferences/" + name), plistText(entries));
+    write("Library/Preferences/" + name, plistText(entries));
 }
 
 std::string SuiteRoot::makeBundle(const std::string& name, const std::string& sharedObject,
                                   const std::string& entries) const {
-    writeFile(path(name) + "/Contents/Info.plist", plistText(entries));
+    write(name + "/Contents/Info.plist", plistText(entries));
     const fs::path folder = path(name) + "/Contents/MacOS";
     fs::create_directories(folder);
     if (!sharedObject.empty()) {
@@ -78,11 +81,6 @@ std::string SuiteRoot::copyProgram(const std::string& program, const std::string
     fs::create_directories(fs::path(path(name)).parent_path());
     fs::copy_file(program, path(name), fs::copy_options::overwrite_existing);
     return path(name);
-}
-
-std::string plistText(const std::string& entries) {
-    return "<?xml version=\"1.0\" encoding=\"UTF-8\"?>\n<plist version=\"1.0\"><dict>" + entries +
-           "</dict></plist>\n";
 }
 
 std::string plugInEntries(const std::string& executable, const std::string& type,

@@ -20,6 +20,9 @@ class SuiteRoot {
     const std::string& path() const { return m_path; }
     std::string path(const std::string& name) const { return m_path + "/" + name; }
 
+    /// Writes a file of this name, makes the folders above it, and returns its path.
+    std::string write(const std::string& name, const std::string& text) const;
+
     /// Puts the property-list reader where the tool looks for it.
     void installPlistReader(const std::string& program) const;
 
@@ -41,11 +44,9 @@ class SuiteRoot {
 
   private:
     const ScratchFolder m_folder;
+    const std::string m_name;
     const std::string m_path;
 };
-
-/// The text of a property list with these XML entries in its dictionary.
-std::string plistText(const std::string& entries);
 
 /// The entry of a plug-in bundle's shared object, types and factories.
 std::string plugInEntries(const std::string& executable, const std::string& type,

@@ -16,12 +16,11 @@
 #include <cstdint>
 #include <cstdio>
 #include <cstring>
-#include <deque>
 #include <memory>
 #include <sstream>
 #include <stdexcept>
 #include <string>
-#include <variant>
+#include <utility>
 #include <vector>
 
 #include "ticket/TicketRecords.h"
@@ -125,8 +124,6 @@ class RecordTable {
     SETMULTIPAR* records() { return m_records.data(); }
 
   private:
-    using Owned = std::variant<int, unsigned, long long, unsigned long long, double>;
-
     void addWord(const std::string& word) {
         const auto equals = word.find('=');
         if (equals == std::string::npos) {
@@ -150,65 +147,59 @@ class RecordTable {
 
     void add(const std::string& key, const std::string& value, int position) {
         SETMULTIPAR record;
-        record.key = own(key);
+        record.key = own(key)->c_str();
         record.position = position;
         const std::string rest = value.substr(value.empty() ? 0 : 1);
+        const auto set = [&](PARAM_TYPE type, const void* of) {
+            record.type = type;
+            record.value = of;
+        };
         switch (value.empty() ? '\0' : value.front()) {
         case '\'':
-            set(record, PARAM_STRING, own(rest));
+            set(PARAM_STRING, own(rest)->c_str());
             break;
         case '#':
-            set(record, PARAM_BINARY, ownBinary(rest));
+            set(PARAM_BINARY, own(BIN_STRING(*own(bytesOf(rest)))));
             break;
         case 'p':
-            set(record, PARAM_POINTER, reinterpret_cast<const void*>(std::stoull(rest)));
+            set(PARAM_POINTER, reinterpret_cast<const void*>(std::stoull(rest)));
             break;
         case 'u':
-            set(record, PARAM_UINT, own(static_cast<unsigned>(std::stoul(rest))));
+            set(PARAM_UINT, own(static_cast<unsigned>(std::stoul(rest))));
             break;
         case 'l':
-            set(record, PARAM_INT64, own(std::stoll(rest)));
+            set(PARAM_INT64, own(std::stoll(rest)));
             break;
         case 'U':
-            set(record, PARAM_UINT64, own(std::stoull(rest)));
+            set(PARAM_UINT64, own(std::stoull(rest)));
             break;
         default:
-            if (value == "-") {
-                break;
-            }
             if (value.find_first_of(".en") != std::string::npos) {
-                set(record, PARAM_DOUBLE, own(std::stod(value)));
-            } else {
-                set(record, PARAM_INT, own(std::stoi(value)));
+                set(PARAM_DOUBLE, own(std::stod(value)));
+            } else if (value != "-") {
+                set(PARAM_INT, own(std::stoi(value)));
             }
         }
         m_records.push_back(record);
     }
 
-    static void set(SETMULTIPAR& record, PARAM_TYPE type, const void* value) {
-        record.type = type;
-        record.value = value;
-    }
-
-    const char* own(const std::string& text) { return m_texts.emplace_back(text).c_str(); }
-
     template<class T>
     const T* own(T value) {
-        return &std::get<T>(m_numbers.emplace_back(value));
+        const auto owned = std::make_shared<const T>(std::move(value));
+        m_owned.push_back(owned);
+        return owned.get();
     }
 
-    const BIN_STRING* ownBinary(const std::string& digits) {
+    static std::string bytesOf(const std::string& digits) {
         std::string bytes;
         for (std::size_t i = 0; i + 1 < digits.size(); i += 2) {
             bytes += static_cast<char>(std::stoi(digits.substr(i, 2), nullptr, 16));
         }
-        return &m_binaries.emplace_back(m_texts.emplace_back(bytes));
+        return bytes;
     }
 
     std::vector<SETMULTIPAR> m_records;
-    std::deque<std::string> m_texts;
-    std::deque<Owned> m_numbers;
-    std::deque<BIN_STRING> m_binaries;
+    std::vector<std::shared_ptr<const void>> m_owned;
 };
 
 } // namespace support
