@@ -163,24 +163,21 @@ class LoadJob : public JobOnStore {
         return text;
     }
 
-    /// The members that a change of the usual ticket changes.
-    std::string outcomeOf(const std::string& changes, int secondStrip = 0) {
-        return differences(m_usual, load(usualTicket + changes, secondStrip));
+    struct Case {
+        std::string changes; ///< Of the usual ticket.
+        std::string outcome; ///< The members that they change.
+    };
+
+    void expectOutcomes(const std::vector<Case>& cases, int secondStrip = 0) {
+        for (const auto& [changes, outcome] : cases) {
+            EXPECT_EQ(differences(m_usual, load(usualTicket + changes, secondStrip)), outcome)
+                << changes;
+        }
     }
 
     int m_lastJob = 100;
     Members m_usual;
 };
-
-struct Case {
-    std::string changes;
-    std::string outcome;
-};
-
-#define EXPECT_OUTCOMES(cases)                                                                     \
-    for (const auto& [changes, outcome] : cases) {                                                 \
-        EXPECT_EQ(outcomeOf(changes), outcome) << changes;                                         \
-    }
 
 TEST_F(LoadJob, AnUsualJob) {
     // The preset is not of the PSD kind, whatever its ticket says.
@@ -195,7 +192,7 @@ TEST_F(LoadJob, FindsTheControlStrip) {
     const std::string name = "Footer/ControlstripFile=";
     const std::string nested = " Footer/Nesting/ControlstripFile='nest.it8";
     const std::string dynamic = "Footer/Dynstrip/UseDynstrip=1 ";
-    const Case cases[] = {
+    expectOutcomes({
         {name + "'/any/where/abc.ti3" + nested, "strip=/s/ControlCharts/abc.it8"},
         {name + "'abc" + nested, "strip=/s/ControlCharts/nest.it8"},
         {name + "5" + nested, "strip=/s/ControlCharts/nest.it8"}, // Not a text: not there.
@@ -210,8 +207,7 @@ TEST_F(LoadJob, FindsTheControlStrip) {
          "strip=/s/dyn/dyn.it8"},
         {dynamic + "Footer/Dynstrip/DeviceID=14 Footer/Dynstrip/IT8='/s//dyn/dyn.it8",
          "device=14 dynstrip=1 reference=/s/dyn/dyn.it8 strip=/s/dyn/dyn.it8 workflow=0"},
-    };
-    EXPECT_OUTCOMES(cases);
+    });
     EXPECT_EQ(support::contentsOf(root.path("work/JobID_" + std::to_string(m_lastJob) +
                                             "/NMPatchSetDefinition.dcf")),
               "/s/dyn/dyn.dcf");
@@ -224,7 +220,7 @@ TEST_F(LoadJob, FindsReferences) {
     const std::string other = " Remote/UsedICCProfile='/s/profile2.icc";
     const std::string stored = workflow + "3 Remote/Measurement/Reference/Numpatches=";
     const std::string esko = workflow + "4 Job/FromEsko=1 ";
-    const Case cases[] = {
+    expectOutcomes({
         {chart + "'MKCheck11.it8",
          "reference=/s/IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8"},
         {chart + "'x_MKCheck10_MKCheck11.it8",
@@ -253,12 +249,11 @@ TEST_F(LoadJob, FindsReferences) {
          "jdf= reference=/s/ControlCharts/strip.it8 strip=/s/in/esko.it8 workflow=4"},
         {esko + "Footer/ControlstripIT8=' " + chart + "'/s/profile.icc",
          "formula=0 jdf= preset=none reference=/s/profile.icc workflow=4"},
-    };
-    EXPECT_OUTCOMES(cases);
+    });
 }
 
 TEST_F(LoadJob, GoesOnWithoutWhatIsMissing) {
-    const Case cases[] = {
+    expectOutcomes({
         {"Remote/Measurement/Illumination/Mode='two Remote/Measurement/Status='many "
          "CMM/PaperName=- Workflow/Name=7 Input/Title=-",
          "flow= mode=1 paper= title="},
@@ -267,8 +262,7 @@ TEST_F(LoadJob, GoesOnWithoutWhatIsMissing) {
          "Workflow/Verify/CharacterizationData='/s/a(TEMP)/MKCheck10.it8",
          "device=0 preset=7 Proof  1,1,1,3 1,0,1 1.5,2.5,0 2,0 0 "
          "reference=/s/a(TEMP)/MKCheck10.it8 strip="},
-    };
-    EXPECT_OUTCOMES(cases);
+    });
 }
 
 TEST_F(LoadJob, ReadsThePresetUpToWhatIsMissing) {
@@ -288,7 +282,7 @@ TEST_F(LoadJob, ReadsThePresetUpToWhatIsMissing) {
     };
     for (const auto& [preset, changes, outcome] : cases) {
         setPreset(preset);
-        EXPECT_EQ(outcomeOf(changes), outcome) << preset << " " << changes;
+        expectOutcomes({{changes, outcome}});
     }
     for (const auto& [id, file] : {std::pair{9, "CVP_0009.xml"},
                                    {10, "CVP_0010.xml"},
@@ -298,8 +292,9 @@ TEST_F(LoadJob, ReadsThePresetUpToWhatIsMissing) {
         const std::string path = std::string("/s/tickets/") + file;
         std::istringstream text(path);
         engine->putFile(path, text);
-        EXPECT_EQ(outcomeOf(other + std::to_string(id)),
-                  "preset=" + std::to_string(id) + " Proof " + path + " 0,0,0,0 0,0,0 0,0,0 0,0 0");
+        const std::string number = std::to_string(id);
+        expectOutcomes({{other + number,
+                         "preset=" + number + " Proof " + path + " 0,0,0,0 0,0,0 0,0,0 0,0 0"}});
     }
 }
 
@@ -316,14 +311,13 @@ TEST_F(LoadJob, TakesAParentsStrip) {
         engine->create(3, id);
         set(ticket, id);
     }
-    const Case cases[] = {
+    expectOutcomes({
         {nested + "2", "parent=5 psd=p"},
         {nested + "1", "children=50,53 nested=1 parent=5 psd=p strip=/s/ControlCharts/nest.it8"},
         {nested + "1 General/ParentID=-1", "parent=-1"},
         {nested + "1 Footer/Nesting/PSDAssessment=-", "parent=5"},
         {nested + "1 Footer/Nesting/ControlstripFile='none.it8", "parent=5 psd=p"},
-    };
-    EXPECT_OUTCOMES(cases);
+    });
 }
 
 TEST_F(LoadJob, DecidesTheType) {
@@ -332,7 +326,7 @@ TEST_F(LoadJob, DecidesTheType) {
     const std::string stored = " Workflow/Verify/MeasurementWorkflow=3 "
                                "Remote/Measurement/Reference/Numpatches=1";
     const std::string whole = "jdf=/s/jdf/whole.jdf jdfServer=/s/jdf//whole.jdf ";
-    const Case cases[] = {
+    expectOutcomes({
         {status + "-1", "status=-1"},
         {status + "1", "status=1 type=2"},
         {sub + "80", whole + "type=1"},
@@ -344,74 +338,65 @@ TEST_F(LoadJob, DecidesTheType) {
          whole + "patches=1 reference=/Measured reference.txt status=1 type=1 workflow=3"},
         {sub + "96" + status + "1", "status=1 type=2"},
         {sub + "96" + status + "-3", "status=-3"},
-    };
-    EXPECT_OUTCOMES(cases);
+    });
 }
 
 // Measured while printing: values and mode come from the ticket, and there is nothing to measure.
 TEST_F(LoadJob, KnowsInlineInstruments) {
-    const std::string strip = "dynfile=/s/dyn/dyn.pdf dynstrip=1 ";
-    const std::string files = "reference=/s/dyn/dyn.it8 strip=/s/dyn/dyn.it8";
-    const std::string values = "Remote/Measurement/Values/Measured=1.5,2.5 "
+    const std::string device = "Input/SubType=96 Footer/Dynstrip/UseDynstrip=1 "
+                               "Footer/Dynstrip/IT8='/s/dyn/dyn.it8 "
+                               "Footer/Dynstrip/File='/s/dyn/dyn.pdf Footer/Dynstrip/DeviceID=";
+    const std::string values = " Remote/Measurement/Values/Measured=1.5,2.5 "
                                "Output/Prn/Specific/Measurement/VerifyMode=6";
-    const struct {
-        int device;
-        std::string changes, outcome;
-    } cases[] = {
-        {0, "", strip + "inline=1 mode=-1 " + files + " type=2"},
-        {39, values, strip + files},
-        {40, values, strip + "inline=1 measured=1.5,2.5,0 mode=6 " + files + " type=2"},
-        {47, "Remote/Measurement/Status=2",
-         strip + "inline=1 mode=-1 reference=/s/dyn/dyn.it8 status=2 strip=/s/dyn/dyn.it8 type=3"},
-        {48, values, strip + files},
-    };
-    for (const auto& [device, changes, outcome] : cases) {
-        const std::string number = std::to_string(device);
-        EXPECT_EQ(outcomeOf("Input/SubType=96 Footer/Dynstrip/UseDynstrip=1 "
-                            "Footer/Dynstrip/IT8='/s/dyn/dyn.it8 "
-                            "Footer/Dynstrip/File='/s/dyn/dyn.pdf Footer/Dynstrip/DeviceID=" +
-                            number + " " + changes),
-                  "device=" + number + " " + outcome);
-    }
+    const std::string dynamic = " dynfile=/s/dyn/dyn.pdf dynstrip=1 ";
+    const std::string files = "reference=/s/dyn/dyn.it8 strip=/s/dyn/dyn.it8";
+    expectOutcomes({
+        {device + "0", "device=0" + dynamic + "inline=1 mode=-1 " + files + " type=2"},
+        {device + "39" + values, "device=39" + dynamic + files},
+        {device + "40" + values,
+         "device=40" + dynamic + "inline=1 measured=1.5,2.5,0 mode=6 " + files + " type=2"},
+        {device + "47 Remote/Measurement/Status=2",
+         "device=47" + dynamic +
+             "inline=1 mode=-1 reference=/s/dyn/dyn.it8 status=2 "
+             "strip=/s/dyn/dyn.it8 type=3"},
+        {device + "48" + values, "device=48" + dynamic + files},
+    });
 }
 
 TEST_F(LoadJob, FetchesTheJdf) {
     const std::string other = " Workflow/RemoteOutFolder=";
-    const Case cases[] = {
+    expectOutcomes({
         {"Output/Jdf/FileName='none.jdf Job/FromEsko=1", "jdf= jdfServer=/s/jdf/none.jdf"},
         {"Input/SubType=86 Remote/JDFName=-", "code=-1 jdf= jdfServer= type=1"},
         {"System/Folders/Temp=-", "code=-1 jdf= jdfServer="},
         {"System/Folders/Temp='" + other + "'/s//jdf", "jdfServer=/s//jdf/job.jdf"},
         {"System/Folders/Temp='\xff" + other + "'/s/jdf", "code=111 jdf= jdfServer="},
         {"System/Folders/Temp='" + other + "'", "code=111 jdf= jdfServer="},
-    };
-    EXPECT_OUTCOMES(cases);
+    });
 }
 
 TEST_F(LoadJob, TheSecondStripHasKeysOfItsOwn) {
     const std::string second = "Footer/ControlstripFile2='abc.it8 Workflow/Verify/DeltaEMode2=5 "
                                "Workflow/Verify/ComparisonMethod2=7 ";
-    const Case cases[] = {
-        {"Workflow/Verify/MeasurementWorkflow2=1 Footer/Dynstrip/UseDynstrip=1 "
-         "Footer/ControlstripInputProfile2='/s/profile2.icc General/ParentID=5 "
-         "Remote/Measurement2/Illumination/Mode=4 Remote/Measurement2/Status=2 "
-         "Footer/Nesting/ControlstripMode=1 Footer/Nesting/PSDAssessment='p "
-         "Footer/Nesting/ControlstripFile2='nest.it8",
+    const std::vector<Case> cases = {
+        {second + "Workflow/Verify/MeasurementWorkflow2=1 Footer/Dynstrip/UseDynstrip=1 "
+                  "Footer/ControlstripInputProfile2='/s/profile2.icc General/ParentID=5 "
+                  "Remote/Measurement2/Illumination/Mode=4 Remote/Measurement2/Status=2 "
+                  "Footer/Nesting/ControlstripMode=1 Footer/Nesting/PSDAssessment='p "
+                  "Footer/Nesting/ControlstripFile2='nest.it8",
          "dynstrip=1 formula=5 mode=4 nested=1 parent=5 psd=p reference=/s/profile2.icc status=2 "
          "strip=/s/ControlCharts/nest.it8 type=3 workflow=1"},
-        {"Workflow/Verify/MeasurementWorkflow2=2 "
-         "Workflow/Verify/CharacterizationData2='MKCheck11.it8",
+        {second + "Workflow/Verify/MeasurementWorkflow2=2 "
+                  "Workflow/Verify/CharacterizationData2='MKCheck11.it8",
          "formula=5 mode=1 reference=/s/IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8 "
          "strip=/s/ControlCharts/abc.it8"},
-        {"Workflow/Verify/MeasurementWorkflow2=3 Remote/Measurement2/Status=1 "
-         "Remote/Measurement2/Reference/Numpatches=2",
+        {second + "Workflow/Verify/MeasurementWorkflow2=3 Remote/Measurement2/Status=1 "
+                  "Remote/Measurement2/Reference/Numpatches=2",
          "formula=5 mode=1 patches=2 reference=/Measured reference.txt status=1 "
          "strip=/s/ControlCharts/abc.it8 type=2 workflow=3"},
     };
-    for (const auto& [changes, outcome] : cases) {
-        EXPECT_EQ(outcomeOf(second + changes, 1), outcome);
-    }
-    EXPECT_EQ(outcomeOf(second + cases[0].changes, -1), cases[0].outcome);
+    expectOutcomes(cases, 1);
+    expectOutcomes({cases[0]}, -1);
 }
 
 // By requirement: the fixture's own has asked before.

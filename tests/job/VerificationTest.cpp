@@ -3,7 +3,6 @@
 #include <atomic>
 #include <chrono>
 #include <filesystem>
-#include <fstream>
 #include <functional>
 #include <map>
 #include <memory>
@@ -63,17 +62,17 @@ class Place {
         fs::copy(example().path("store"), address, fs::copy_options::recursive);
         m_root.installPlistReader(PLIST_READER);
         m_root.installCommBundle(COMGUI_BUNDLE);
-        write(viewer, "#!/bin/sh\nprintf '[%s]' \"$@\" > \"$TINTGATE_ROOT/part\"\n"
-                      "mv \"$TINTGATE_ROOT/part\" \"$TINTGATE_ROOT/shown\"\n");
-        chmod(path(viewer).c_str(), 0755);
+        const std::string program =
+            write(viewer, "#!/bin/sh\nprintf '[%s]' \"$@\" > \"$TINTGATE_ROOT/part\"\n"
+                          "mv \"$TINTGATE_ROOT/part\" \"$TINTGATE_ROOT/shown\"\n");
+        chmod(program.c_str(), 0755);
         fs::create_directories(temporary);
     }
 
     std::string path(const std::string& name) const { return m_root.path(name); }
 
-    void write(const std::string& name, const std::string& text) const {
-        fs::create_directories(fs::path(path(name)).parent_path());
-        std::ofstream(path(name)) << text;
+    std::string write(const std::string& name, const std::string& text) const {
+        return m_root.write(name, text);
     }
 
     /// Puts a measuring tool in its place, by default ours with its virtual instrument. Returns its

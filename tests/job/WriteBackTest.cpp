@@ -301,7 +301,6 @@ TEST_F(WriteBackToJdf, TellsThePartiesWhatWasMeasured) {
                       formula +
                       "\" AverageDeltaE=\"105500000\" SpectralCount=\"2\" PaperWhitePass=\"" +
                       yes(paperWhite) + "\" AverageToleranc=\"1750000\">"));
-        EXPECT_THAT(text, HasSubstr("<FileSpec URL=\"cid:\""));
         EXPECT_THAT(text, HasSubstr("<tazo:PatchDefinitionData1 "));
         EXPECT_THAT(text, HasSubstr("<" + party + " printdate=\"2"));
         EXPECT_EQ(text, support::contentsOf(print.jdfLocalFile.utf8_string()));
