@@ -5,7 +5,6 @@
 
 #include <endian.h>
 #include <libpq-fe.h>
-#include <malloc.h>
 
 #include "Postgres.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
@@ -79,10 +78,7 @@ std::vector<Key> measurementKeys() {
 } // namespace
 
 int main() {
-    // As the program itself does: what is freed stays at hand.
-    mallopt(M_MMAP_THRESHOLD, 32 << 20);
-    mallopt(M_TRIM_THRESHOLD, 32 << 20);
-    mallopt(M_TOP_PAD, 8 << 20);
+    bench::keepFreedMemory();
     const support::PostgresRoom room;
     const support::SuiteRoot root;
     root.installPlistReader(PLIST_READER);
@@ -136,8 +132,8 @@ int main() {
             check(PQntuples(rows.get()) == 5 * bench::jobs, "the bare select");
             long long sum = 0;
             for (int row = 0; row < PQntuples(rows.get()); ++row) {
-                sum += bigEndian(PQgetvalue(rows.get(), row, 0)) +
-                       *PQgetvalue(rows.get(), row, 1) + PQgetvalue(rows.get(), row, 2)[6];
+                sum += bigEndian(PQgetvalue(rows.get(), row, 0)) + *PQgetvalue(rows.get(), row, 1) +
+                       PQgetvalue(rows.get(), row, 2)[6];
             }
             bench::g_sink = static_cast<double>(sum);
         });

@@ -5,14 +5,14 @@
 #pragma once
 
 #include <algorithm>
-#include <chrono>
 #include <cstdio>
-#include <cstdlib>
 #include <cstring>
 #include <functional>
 #include <limits>
 #include <random>
 #include <vector>
+
+#include "Timing.h"
 
 namespace bench {
 
@@ -22,12 +22,6 @@ constexpr const char* arrayKey = "Remote/Measurement/Spectral";
 constexpr const char* overviewKeys[] = {"Input/SubType", "Job/Display/Status",
                                         "Remote/ShowInVerifier", "Input/FileType",
                                         "Workflow/Verify/Active"};
-
-inline double secondsOf(const std::function<void()>& work) {
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
 
 /// Before is not timed.
 inline void compare(const char* name, double limit, int rounds, const std::function<void()>& before,
@@ -42,13 +36,6 @@ inline void compare(const char* name, double limit, int rounds, const std::funct
     }
     std::printf("%-48s %7.2f ms, %.2f times the bare %.2f ms (at most %g)\n", name, best * 1e3,
                 best / bareBest, bareBest * 1e3, limit);
-}
-
-inline void check(bool done, const char* what) {
-    if (!done) {
-        std::fprintf(stderr, "%s failed\n", what);
-        std::exit(1);
-    }
 }
 
 /// Reflectances, as measured: no two alike, in no order.

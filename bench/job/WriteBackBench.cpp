@@ -1,7 +1,6 @@
 // Writing a measurement back, against the same tables made beforehand and sent straight to the
 // plug-in's tickets: 1,617 patches with spectra, through the real bundle and into a real store.
 #include <algorithm>
-#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <functional>
@@ -12,12 +11,10 @@
 #include <variant>
 #include <vector>
 
-#include "ScratchFolder.h"
-#include <malloc.h>
-
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "SuiteRoot.h"
+#include "Timing.h"
 #include "comgui/StoreEngine.h"
 #include "comgui/Users.h"
 #include "job/KZVerifyJobProcessor.h"
@@ -25,22 +22,12 @@
 
 namespace {
 
+using bench::check;
+using bench::secondsOf;
+
 constexpr int patches = 1617;
 constexpr int job = 1;
 constexpr int rounds = 25;
-
-void check(bool done, const char* what) {
-    if (!done) {
-        std::fprintf(stderr, "%s failed\n", what);
-        std::exit(1);
-    }
-}
-
-double secondsOf(const std::function<void()>& work) {
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
 
 /// As measured: no two values alike, in no order.
 struct Measurement {
@@ -164,10 +151,7 @@ Tables tablesOf(store::StoreEngine& engine) {
 } // namespace
 
 int main() {
-    // As the program itself does: what is freed stays at hand.
-    mallopt(M_MMAP_THRESHOLD, 32 << 20);
-    mallopt(M_TRIM_THRESHOLD, 32 << 20);
-    mallopt(M_TOP_PAD, 8 << 20);
+    bench::keepFreedMemory();
     const support::SuiteRoot root;
     root.installPlistReader(PLIST_READER);
     root.installCommBundle(COMGUI_BUNDLE);

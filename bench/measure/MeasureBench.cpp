@@ -1,7 +1,6 @@
 // The text files of a job. The sample file, against a C++ stream that writes the same text; the
 // definition, against a bare walk over the strip's lines that writes each one anew.
 #include <algorithm>
-#include <chrono>
 #include <cstdio>
 #include <cstdlib>
 #include <filesystem>
@@ -18,15 +17,12 @@
 #include <wx/textfile.h>
 
 #include "ScratchFolder.h"
+#include "Timing.h"
 #include "job/KZVerifyJobProcessor.h"
 
 namespace {
 
-double secondsOf(const std::function<void()>& work) {
-    const auto start = std::chrono::steady_clock::now();
-    work();
-    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
-}
+using bench::secondsOf;
 
 /// By turns, each at its best of several.
 void compare(const std::string& name, const std::function<void()>& ours,

@@ -1,0 +1,35 @@
+// What benchmarks of any folder share.
+#pragma once
+
+#include <chrono>
+#include <cstdio>
+#include <cstdlib>
+#include <functional>
+
+#include <malloc.h>
+
+namespace bench {
+
+inline double secondsOf(const std::function<void()>& work) {
+    const auto start = std::chrono::steady_clock::now();
+    work();
+    return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+}
+
+/// A benchmark whose work fails says nothing.
+inline void check(bool done, const char* what) {
+    if (!done) {
+        std::fprintf(stderr, "%s failed\n", what);
+        std::exit(1);
+    }
+}
+
+/// As the program itself does: what is freed stays at hand.
+inline void keepFreedMemory() {
+    constexpr int piece = 32 << 20;
+    mallopt(M_MMAP_THRESHOLD, piece);
+    mallopt(M_TRIM_THRESHOLD, piece);
+    mallopt(M_TOP_PAD, piece / 4);
+}
+
+} // namespace bench
