@@ -5,7 +5,7 @@
 #include <map>
 #include <memory>
 #include <optional>
-#include <sstream>
+#include <regex>
 #include <string>
 #include <utility>
 
@@ -62,11 +62,8 @@ class JobOnStore : public testing::Test {
     /// The log's messages since the last time.
     std::string takeLog() const {
         CLogger::DeleteLogger();
-        std::istringstream lines(support::contentsOf(logPath()));
-        std::string text;
-        for (std::string line; std::getline(lines, line);) {
-            text += line.substr(line.find(":\t") + 2) + "\n";
-        }
+        const std::string text = std::regex_replace(support::contentsOf(logPath()),
+                                                    std::regex("(^|\n)[^\n]*?:\t"), "$1");
         CLogger::InitLogger(logPath());
         return text;
     }

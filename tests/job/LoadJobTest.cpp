@@ -15,25 +15,12 @@ namespace {
 using Members = std::map<std::string, std::string>;
 
 /// Every file of the server holds its own path, so that a copy tells where it came from.
-constexpr const char* serverFiles[] = {
-    "ControlCharts/.it8",
-    "ControlCharts/abc.it8",
-    "ControlCharts/nest.it8",
-    "ControlCharts/strip.it8",
-    "IT8_CharacterizationData/Fogra_MKCheck10/x_MKCheck10_MKCheck11.it8",
-    "IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8",
-    "IT8_CharacterizationData/chart.it8",
-    "a(TEMP)/MKCheck10.it8",
-    "dyn/dyn.it8",
-    "dyn/dyn.dcf",
-    "dyn/dyn.pdf",
-    "in/esko.it8",
-    "jdf/job.jdf",
-    "jdf/whole.jdf",
-    "profile.icc",
-    "profile2.icc",
-    "tickets/CVP_0007.xml",
-};
+constexpr char serverFiles[] =
+    "ControlCharts/.it8 ControlCharts/abc.it8 ControlCharts/nest.it8 ControlCharts/strip.it8 "
+    "IT8_CharacterizationData/Fogra_MKCheck10/x_MKCheck10_MKCheck11.it8 "
+    "IT8_CharacterizationData/Fogra_MKCheck11/MKCheck11.it8 IT8_CharacterizationData/chart.it8 "
+    "a(TEMP)/MKCheck10.it8 dyn/dyn.it8 dyn/dyn.dcf dyn/dyn.pdf in/esko.it8 jdf/job.jdf "
+    "jdf/whole.jdf profile.icc profile2.icc tickets/CVP_0007.xml";
 
 // An ordinary job, not measured so far, with characterisation data as its references.
 constexpr char usualTicket[] =
@@ -52,7 +39,8 @@ constexpr char usualPreset[] =
 class LoadJob : public JobOnStore {
   protected:
     LoadJob() {
-        for (const std::string name : serverFiles) {
+        std::istringstream names(serverFiles);
+        for (std::string name; names >> name;) {
             const bool isStrip = name.find("ControlCharts/") == 0;
             std::istringstream text((isStrip ? "DEVICE 33\n/s/" : "/s/") + name);
             engine->putFile("/s/" + name, text);

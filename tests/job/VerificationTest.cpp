@@ -308,8 +308,6 @@ TEST(Verification, ComparesStoredValuesAndShowsThem) {
 
 TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
     const std::string refused = "Not able to connect to = STORE last ComGui error = ";
-    const std::string noSample = "Measurement file not found = JOB/Measured sample.txt";
-    const std::string noViewer = "LaunchNerovaVerify\nNerova Verify.exe allready running";
     const auto disableUser = [](const Place& place) {
         place.engine()->putUser({"press", store::passwordHash("room"), true});
     };
@@ -330,8 +328,8 @@ TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
          file("/server/tickets/CVP_0001.xml", "<preset")},
         {"no number of patches", 107, "LoadKZJobMeasurements returns = -1",
          setting("Remote/Measurement/Numpatches=-")},
-        {"no patches", 105, noSample, setting("Remote/Measurement/Numpatches=0")},
-        {"a sample that can't be written", 105, noSample, blocked("Measured sample.txt")},
+        {"no sample", 105, "Measurement file not found = JOB/Measured sample.txt",
+         blocked("Measured sample.txt")},
         // On this road a missing reference is left to the analysis.
         {"no references", 20,
          "Reference file not found = \nReference file = \n"
@@ -340,9 +338,8 @@ TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
                  "Workflow/Verify/CharacterizationData='none")},
         {"no result", 71, "json file not found = JOB/output.json", blocked("output.json")},
         {"no meta file", 72, "json meta file not found = JOB/meta.json", blocked("meta.json")},
-        {"no viewer", 109, noViewer, [](auto& place) { fs::remove(place.path(viewer)); }},
-        {"a viewer that can't be started", 109, noViewer,
-         [](auto& place) { chmod(place.path(viewer).c_str(), 0644); }},
+        {"no viewer", 109, "LaunchNerovaVerify\nNerova Verify.exe allready running",
+         [](auto& place) { fs::remove(place.path(viewer)); }},
     });
 }
 
@@ -464,7 +461,6 @@ TEST(Verification, ReadsItsArgumentsByPlace) {
         {"KEY_KZ_HOST:a:" + place.address, "K::7 and more", 0},
         {"KEY_KZ_HOST:", "7", 5},
         {place.address, "7", 255},
-        {"KEY_KZ_HOST:", "-1", 0}, // The viewer alone.
         {"KEY_KZ_HOST:" + place.address, "seven", -1},
     };
     for (const auto& [host, job, code] : cases) {

@@ -4,7 +4,6 @@
 #include <numeric>
 #include <sstream>
 #include <string>
-#include <vector>
 
 #include <gmock/gmock.h>
 
@@ -16,14 +15,6 @@ namespace {
 
 using Keys = std::map<std::string, std::string>;
 using testing::HasSubstr;
-
-std::string joined(const std::vector<std::string>& words) {
-    std::string text;
-    for (const std::string& word : words) {
-        text += (text.empty() ? "" : ",") + word;
-    }
-    return text;
-}
 
 /// A print of two patches, with numbers that differ wherever one could stand for another.
 class WriteBack : public JobOnStore {
@@ -169,21 +160,22 @@ TEST_F(WriteBack, PutsResultsInTheServersOrder) {
         SCOPED_TRACE(std::to_string(psd) + " " + std::to_string(used));
         print.tolerance.fograPSDPreset = psd;
         print.tolerance.usedForPSDResult[21] = used;
-        std::vector<std::string> measured, approved, decimal;
+        std::string measured, approved, decimal;
         for (int i = 0; i < 27; ++i) {
+            const std::string comma = i == 0 ? "" : ",";
             const int value = i == 13 ? value13 : values[i];
-            measured.push_back(value < 0 ? "-1.0" : std::to_string(100 + value) + ".5");
+            measured += comma + (value < 0 ? "-1.0" : std::to_string(100 + value) + ".5");
             if (psd == 0 || i < 10) {
                 const int verdict = psd == 0 ? verdicts[i] : i;
-                approved.push_back(std::to_string(100 + verdict));
-                decimal.push_back(std::to_string(200 + verdict));
+                approved += comma + std::to_string(100 + verdict);
+                decimal += comma + std::to_string(200 + verdict);
             }
         }
         Keys found = freshKeys();
         const std::string root = "Remote/Measurement/Values/";
-        EXPECT_EQ(found[root + "Measured"], joined(measured));
-        EXPECT_EQ(found[root + (psd == 0 ? "Approval" : "PSDApproval")], joined(approved));
-        EXPECT_EQ(found[root + (psd == 0 ? "Decimal" : "PSDDecimal")], joined(decimal));
+        EXPECT_EQ(found[root + "Measured"], measured);
+        EXPECT_EQ(found[root + (psd == 0 ? "Approval" : "PSDApproval")], approved);
+        EXPECT_EQ(found[root + (psd == 0 ? "Decimal" : "PSDDecimal")], decimal);
     }
 }
 
