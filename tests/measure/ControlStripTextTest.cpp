@@ -34,23 +34,6 @@ TEST(StringConditioning, EndsALineAnew) {
     }
 }
 
-TEST(ControlStripText, IsSearchedFromItsStart) {
-    const support::ScratchFolder folder;
-    wxTextFile file;
-    ASSERT_TRUE(measure::readLines(folder.write("strip", "one\r\nKEYWORD two\rtwo\nthree"), &file));
-    wxString line = "before";
-    EXPECT_FALSE(findStringInFile(&file, "Two", &line));
-    EXPECT_EQ(line, "before");
-    EXPECT_TRUE(file.Eof());
-    EXPECT_TRUE(findStringInFile(&file, "two", &line));
-    EXPECT_EQ(line, "KEYWORD two");
-    EXPECT_EQ(file.GetCurrentLine(), 1U);
-    EXPECT_FALSE(measure::readLines(folder.path(), &file)) << "a folder";
-    wxTextFile empty;
-    EXPECT_TRUE(measure::readLines(folder.write("empty", ""), &empty));
-    EXPECT_FALSE(findStringInFile(&empty, "", &line));
-}
-
 TEST(ControlStripText, NamesItsInstrument) {
     const support::ScratchFolder folder;
     setenv("TMPDIR", folder.path().c_str(), 1);

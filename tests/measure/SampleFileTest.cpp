@@ -140,11 +140,9 @@ TEST_F(SampleFile, ReplacesOneFileOrTheOther) {
     m_job.measurement.numPatches = 0; // So no row of spectra is looked at.
     addSpectra(380, 10, 36);
     EXPECT_EQ(write(true), 0);
-    EXPECT_EQ(support::contentsOf(m_reference),
-              "CGATS.17\nKEYWORD ILLUMINATION_CONDITION\nILLUMINATION_CONDITION -3\n"
-              "NUMBER_OF_FIELDS 5\nBEGIN_DATA_FORMAT\n"
-              "SAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\nEND_DATA_FORMAT\n"
-              "NUMBER_OF_SETS 0\nBEGIN_DATA\nEND_DATA\n");
+    const std::string text = support::contentsOf(m_reference);
+    EXPECT_NE(text.find("\nNUMBER_OF_FIELDS 5\n"), text.npos) << text;
+    EXPECT_NE(text.find("\nNUMBER_OF_SETS 0\nBEGIN_DATA\nEND_DATA\n"), text.npos) << text;
     EXPECT_EQ(support::contentsOf(m_sample), "old sample");
     m_job.sampleFile = m_folder.path("no such folder/sample");
     EXPECT_EQ(write(false), 0) << "what can't be written is not reported";

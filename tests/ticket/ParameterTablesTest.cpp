@@ -38,15 +38,11 @@ TEST(ParameterTables, ResultsAreCopiedUpToTheShorterEnd) {
     EXPECT_TRUE(longer[0].result == 1 && longer[1].result == 0 && longer[2].result == 0xFF);
     MultiParameterResultCpy(shorter.data(), longer.data());
     EXPECT_TRUE(shorter[0].result == 1 && shorter[2].result == 1);
-    MultiParameterResultCpy(nullptr, longer.data());
-    MultiParameterResultCpy(longer.data(), nullptr);
 }
 
-TEST(ParameterTables, ACopyHasTheSameBytes) {
-    const SETMULTIPAR table[] = {{.key = "a", .type = PARAM_INT, .value = "b", .result = 1}, {}};
-    const ticket::Block<SETMULTIPAR> copy(MultiParameterDup(table));
-    EXPECT_EQ(std::memcmp(copy.get(), table, sizeof table), 0);
-    EXPECT_EQ(MultiParameterDup(nullptr), nullptr);
+TEST(ParameterTables, ACopyEndsAsItsSourceDoes) {
+    const ticket::Block<SETMULTIPAR> copy(MultiParameterDup(tableOf({5}).data()));
+    EXPECT_TRUE(copy[0].result == 5 && copy[1].key == nullptr);
 }
 
 } // namespace
