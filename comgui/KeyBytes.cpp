@@ -209,12 +209,21 @@ std::optional<Elements> packed(std::string_view bytes) {
 
 std::string keyBytes(const Elements& elements) {
     std::string bytes(1, version);
-    bytes.reserve(16 + 8 * static_cast<std::size_t>(elements.filled()));
-    Writer writer(bytes);
-    elements.visit([&](int position, const Value& value) {
-        writer.add(position, value);
-        return true;
-    });
+    const auto count = static_cast<std::size_t>(elements.filled());
+    bytes.reserve(16 + 8 * count);
+    if (std::endian::native == std::endian::little && elements.numberType() != PARAM_DELETE) {
+        bytes += static_cast<char>(elements.numberType());
+        append(bytes, static_cast<std::uint32_t>(count));
+        bytes += elements.numbers();
+        return bytes;
+    }
+    {
+        Writer writer(bytes); // It fills in a length when it goes.
+        elements.visit([&](int position, const Value& value) {
+            writer.add(position, value);
+            return true;
+        });
+    }
     return bytes;
 }
 

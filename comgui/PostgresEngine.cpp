@@ -1,7 +1,8 @@
 // A store in the database of a PostgreSQL server; PostgresSchema.cpp has its tables.
 //
-// What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction of two
-// round trips: it locks the ticket's row and fetches what it needs, then writes and commits.
+// What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction: it locks
+// the ticket's row, fetches what it needs, writes, and commits. Where it needs nothing of what the
+// keys held, that is one round trip, else two.
 #include <ctime>
 #include <map>
 #include <utility>
@@ -62,19 +63,27 @@ constexpr Statement snapshot = {"SELECT pg_current_snapshot()::text"};
 
 constexpr Statement lockTicket = {
     "UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = $1 AND id = $2"
-    " RETURNING number, changes"};
+    " RETURNING number"};
 constexpr Statement neededKeys = {
     "SELECT name, value FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
     " WHERE type = $1 AND id = $2"
     " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
+constexpr Statement putOneKey = {
+    "INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, $3, $4, changes"
+    " FROM tintgate.tickets WHERE type = $1 AND id = $2"
+    " ON CONFLICT (ticket, hash) DO UPDATE SET value = excluded.value, change = excluded.change"};
 constexpr Statement putKeys = {
     "INSERT INTO tintgate.keys (ticket, name, value, change)"
-    " SELECT $1, name, value, $2 FROM unnest($3::bytea[], $4::bytea[]) AS new (name, value)"
+    " SELECT number, name, value, changes FROM tintgate.tickets,"
+    " unnest($3::bytea[], $4::bytea[]) AS new (name, value) WHERE type = $1 AND id = $2"
     " ON CONFLICT (ticket, hash) DO UPDATE SET value = excluded.value, change = excluded.change"};
 constexpr Statement deleteKeys = {
-    "DELETE FROM tintgate.keys WHERE ticket = $1"
-    " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($2::bytea[]) AS name))"};
-constexpr Statement emptyTicket = {"DELETE FROM tintgate.keys WHERE ticket = $1"};
+    "DELETE FROM tintgate.keys USING tintgate.tickets"
+    " WHERE ticket = number AND type = $1 AND id = $2"
+    " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
+constexpr Statement emptyTicket = {
+    "DELETE FROM tintgate.keys USING tintgate.tickets"
+    " WHERE ticket = number AND type = $1 AND id = $2"};
 
 constexpr Statement allUsers = {"SELECT name, hash, disabled FROM tintgate.users ORDER BY name"};
 constexpr Statement oneUser = {"SELECT name, hash, disabled FROM tintgate.users WHERE name = $1"};
@@ -222,6 +231,7 @@ class PostgresEngine : public StoreEngine {
         noteChange();
         Transaction transaction(m_connection);
         m_connection.send(lockTicket, type, id);
+        TicketContent content;
         Names needed;
         for (const auto& [name, isNeeded] : scope.keys) {
             if (isNeeded && !scope.everything) {
@@ -230,18 +240,23 @@ class PostgresEngine : public StoreEngine {
         }
         if (!needed.empty()) {
             m_connection.send(neededKeys, type, id, needed);
+            const auto results = transaction.finish();
+            if (results[0].rows() == 0) {
+                return false;
+            }
+            content = contentOf(results[1]);
         }
-        const auto results = transaction.finish();
-        if (results[0].rows() == 0) {
-            return false;
-        }
-        TicketContent content = results.size() == 1 ? TicketContent() : contentOf(results[1]);
         const TicketContent before = content; // Shares the elements: a change makes others.
         work(content);
-        if (write(results[0].number(0, 0), results[0].number(0, 1), scope, before, content)) {
-            transaction.commit();
+        const bool writes = write(type, id, scope, before, content);
+        if (!needed.empty()) {
+            if (writes) {
+                transaction.commit();
+            }
+            return true;
         }
-        return true;
+        const auto results = writes ? transaction.commit() : transaction.finish();
+        return results[0].rows() != 0;
     }
 
     std::vector<User> users() override {
@@ -343,8 +358,8 @@ class PostgresEngine : public StoreEngine {
     }
 
     /// Sends what makes the ticket's keys those of after. False when there is nothing to write.
-    bool write(std::int64_t ticket, std::int64_t change, const Scope& scope,
-               const TicketContent& before, const TicketContent& after) {
+    bool write(int type, int id, const Scope& scope, const TicketContent& before,
+               const TicketContent& after) {
         Names put;
         Names deleted;
         std::vector<std::string> bytes;
@@ -353,7 +368,7 @@ class PostgresEngine : public StoreEngine {
             bytes.push_back(keyBytes(elements));
         };
         if (scope.everything) {
-            m_connection.send(emptyTicket, ticket);
+            m_connection.send(emptyTicket, type, id);
             for (const auto& [name, elements] : after.keys()) {
                 putKey(name, *elements);
             }
@@ -371,10 +386,12 @@ class PostgresEngine : public StoreEngine {
             }
         }
         if (!deleted.empty()) {
-            m_connection.send(deleteKeys, ticket, deleted);
+            m_connection.send(deleteKeys, type, id, deleted);
         }
-        if (!put.empty()) {
-            m_connection.send(putKeys, ticket, change, put, Names(bytes.begin(), bytes.end()));
+        if (put.size() == 1) { // Mostly: a list of the server's costs more than what is in it.
+            m_connection.send(putOneKey, type, id, put[0], bytes[0]);
+        } else if (!put.empty()) {
+            m_connection.send(putKeys, type, id, put, Names(bytes.begin(), bytes.end()));
         }
         return scope.everything || !deleted.empty() || !put.empty();
     }

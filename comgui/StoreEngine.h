@@ -128,7 +128,8 @@ class StoreEngine {
 
     /// One transaction, which locks the ticket first: fetches the keys that the scope needs, has
     /// them changed by work, and writes what differs then. Work touches no key outside the scope.
-    /// False, and work is not called, when there is no such ticket. What work throws undoes it.
+    /// False when there is no such ticket, which is not looked for before work is called unless
+    /// something is needed. What work throws undoes it.
     virtual bool change(int type, int id, const Scope& scope,
                         const std::function<void(TicketContent&)>& work) = 0;
 

@@ -206,8 +206,12 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
         return exists(type, id);
     }
     try {
-        return m_engine->change(type, id, scopeOf(table),
-                                [&](TicketContent& content) { content.apply(table); });
+        if (m_engine->change(type, id, scopeOf(table),
+                             [&](TicketContent& content) { content.apply(table); })) {
+            return true;
+        }
+        clearResults(table);
+        return false;
     } catch (const StoreFailure&) {
         clearResults(table);
         return false;

@@ -1,6 +1,9 @@
 #include "comgui/TicketContent.h"
 
 #include <algorithm>
+#include <cstring>
+#include <span>
+#include <type_traits>
 #include <unordered_set>
 #include <vector>
 
@@ -20,6 +23,41 @@ void clearResults(SETMULTIPAR* table) {
     for (; table->key != nullptr; ++table) {
         table->result = 0;
     }
+}
+
+/// The records from this one on that fill positions 0, 1, 2, ... of one key with numbers of one
+/// type, as a measured array comes.
+std::span<SETMULTIPAR> arrayAt(SETMULTIPAR* first) {
+    std::size_t length = 0;
+    if (numberSize(first->type) != 0) {
+        const auto goesOn = [&](const SETMULTIPAR& record) {
+            return record.key == first->key && record.type == first->type &&
+                   record.value != nullptr && record.position == static_cast<int>(length);
+        };
+        while (length <= highestPosition && goesOn(first[length])) {
+            ++length;
+        }
+    }
+    return {first, length};
+}
+
+/// What setElement would make of the records, one after the other, without a Value for each.
+std::shared_ptr<Elements> elementsOf(std::span<SETMULTIPAR> array) {
+    std::string bytes;
+    const auto gather = [&](auto size) {
+        bytes.resize(array.size() * size);
+        char* to = bytes.data();
+        for (SETMULTIPAR& record : array) {
+            std::memcpy(to, record.value, size);
+            to += size;
+        }
+    };
+    if (numberSize(array.front().type) == 8) {
+        gather(std::integral_constant<std::size_t, 8>());
+    } else {
+        gather(std::integral_constant<std::size_t, 4>());
+    }
+    return std::make_shared<Elements>(Elements::ofNumbers(array.front().type, std::move(bytes)));
 }
 
 } // namespace
@@ -118,11 +156,20 @@ void TicketContent::apply(SETMULTIPAR* table) {
     Application application(m_keys, table[1].key == nullptr);
     try {
         for (auto* record = table; record->key != nullptr; ++record) {
-            if (keyAllowed(record->key)) {
-                record->result = setElement(application.at(record->key), record->type,
-                                            record->value, record->position)
-                                     ? 1
-                                     : 0;
+            if (!keyAllowed(record->key)) {
+                continue;
+            }
+            auto& elements = application.at(record->key);
+            const auto array = arrayAt(record);
+            if (array.size() > 1 && !elements) {
+                elements = elementsOf(array);
+                for (SETMULTIPAR& each : array) {
+                    each.result = 1;
+                }
+                record = &array.back();
+            } else {
+                record->result =
+                    setElement(elements, record->type, record->value, record->position) ? 1 : 0;
             }
         }
         application.finish();

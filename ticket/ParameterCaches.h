@@ -77,11 +77,18 @@ class VALCACHE {
         m_values.clear();
         m_places.clear();
     }
+    /// Makes room for that many more values.
+    void reserve(std::size_t more) {
+        const std::size_t places = std::bit_ceil(2 * (m_values.size() + more) + 1);
+        if (places > m_places.size()) {
+            Grow(places);
+        }
+    }
 
   private:
     const T& Stored(const T& value) {
         if (2 * m_values.size() >= m_places.size()) {
-            Grow();
+            Grow(m_places.empty() ? 16 : 4 * m_places.size());
         }
         const T*& place = PlaceOf(value);
         if (place == nullptr) {
@@ -106,8 +113,8 @@ class VALCACHE {
         return m_places[place];
     }
 
-    void Grow() {
-        m_places.assign(m_places.empty() ? 16 : 4 * m_places.size(), nullptr);
+    void Grow(std::size_t places) {
+        m_places.assign(places, nullptr);
         for (const T& value : m_values) {
             PlaceOf(value) = &value;
         }

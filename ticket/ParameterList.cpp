@@ -105,6 +105,34 @@ bool SETMULTIPAR_LIST::xSetParameter(const char* key, PARAM_TYPE type, const voi
     return true;
 }
 
+bool SETMULTIPAR_LIST::xSetNumbers(const char* key, PARAM_TYPE type, const void* values,
+                                   int count) {
+    if (type != PARAM_INT && type != PARAM_DOUBLE) {
+        return false;
+    }
+    const auto more = static_cast<std::size_t>(std::max(count, 0));
+    if (m_list.size() + more > m_list.capacity()) {
+        m_list.reserve(std::max(m_list.size() + more, 2 * m_list.capacity()));
+    }
+    const char* const ownKey = m_keys[key];
+    const auto add = [&](const auto* numbers, auto& cache, auto own) {
+        cache.reserve(more);
+        for (int i = 0; i < count; ++i) {
+            m_list.push_back(makeRecord(ownKey, type, own(numbers + i), i));
+        }
+    };
+    if (type == PARAM_INT) {
+        add(static_cast<const int*>(values), m_ints,
+            [&](const void* value) { return own<int>(m_ints, value); });
+    } else {
+        add(static_cast<const double*>(values), m_doubles,
+            [&](const void* value) { return OwnDouble(value); });
+    }
+    m_size += more;
+    DropTable();
+    return true;
+}
+
 bool SETMULTIPAR_LIST::ySetParameter(const char* key, PARAM_TYPE type, const void* value,
                                      int position) {
     // Position 0 of a walk starts a key, and a table that starts a key replaces it.
@@ -241,4 +269,10 @@ bool MultiParListSetParameter(void* list, const char* key, PARAM_TYPE type, cons
                               int position) {
     return list != nullptr &&
            static_cast<SETMULTIPAR_LIST*>(list)->xSetParameter(key, type, value, position);
+}
+
+bool MultiParListSetNumbers(void* list, const char* key, PARAM_TYPE type, const void* values,
+                            int count) {
+    return list != nullptr &&
+           static_cast<SETMULTIPAR_LIST*>(list)->xSetNumbers(key, type, values, count);
 }

@@ -147,7 +147,9 @@ class RecordTable {
 
     void add(const std::string& key, const std::string& value, int position) {
         SETMULTIPAR record;
-        record.key = own(key)->c_str();
+        const bool again = !m_records.empty() && key == m_records.back().key;
+        // One address, as a list gives it.
+        record.key = again ? m_records.back().key : own(key)->c_str();
         record.position = position;
         const std::string rest = value.substr(value.empty() ? 0 : 1);
         const auto set = [&](PARAM_TYPE type, const void* of) {

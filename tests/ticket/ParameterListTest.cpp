@@ -58,6 +58,16 @@ TEST(ParameterList, EqualOnesAreStoredOnceAndNoNumbersAreOneConstant) {
     for (int i = 3; i < 6; ++i) {
         EXPECT_EQ(table[i].value, &MathLib::NOT_A_DOUBLE_NUMBER) << i;
     }
+
+    const double array[] = {0.0, -0.0, NAN, 0.5};
+    EXPECT_TRUE(list.xSetNumbers("array", PARAM_DOUBLE, array, 4));
+    EXPECT_FALSE(list.xSetNumbers("array", PARAM_UINT, array, 4));
+    table = list.Table(false) + 6;
+    EXPECT_EQ(table[0].value, table[1].value);
+    EXPECT_EQ(table[2].value, &MathLib::NOT_A_DOUBLE_NUMBER);
+    EXPECT_EQ(table[3].position, 3);
+    EXPECT_EQ(*static_cast<const double*>(table[3].value), 0.5);
+    EXPECT_EQ(list.Size(), 10u);
 }
 
 TEST(ParameterList, TableSortsByKeyAndKeepsTheOrderWithinAKey) {

@@ -51,22 +51,12 @@ wxString decoded(const std::string& text) {
 // Enters a key's deletion and then its new elements. False if one was refused.
 bool enterArray(void* list, const char* key, PARAM_TYPE ptype, int count, void* values) {
     bool done = MultiParListSetParameter(list, key, PARAM_DELETE, nullptr, POSITION_WHOLE);
-    for (int i = 0; i < count; ++i) {
-        const void* value = nullptr;
-        switch (ptype) {
-        case PARAM_INT:
-            value = static_cast<const int*>(values) + i;
-            break;
-        case PARAM_DOUBLE:
-            value = static_cast<const double*>(values) + i;
-            break;
-        case PARAM_STRING:
-            value = static_cast<const char* const*>(values)[i];
-            break;
-        default:
-            return done;
-        }
-        done = MultiParListSetParameter(list, key, ptype, value, i) && done;
+    if (ptype == PARAM_INT || ptype == PARAM_DOUBLE) {
+        return MultiParListSetNumbers(list, key, ptype, values, count) && done;
+    }
+    for (int i = 0; ptype == PARAM_STRING && i < count; ++i) {
+        const char* const text = static_cast<const char* const*>(values)[i];
+        done = MultiParListSetParameter(list, key, ptype, text, i) && done;
     }
     return done;
 }
