@@ -60,11 +60,6 @@ std::string enlarged(std::string text) {
     return text.insert(head.size(), "<!--" + std::string(9000, '.') + "-->");
 }
 
-struct Written {
-    int party; ///< 1 the sender, 2 the receiver: that of a remeasure.
-    int strip;
-};
-
 /// A job's JDF in a store.
 class JdfUpdates : public StoreProgram {
   protected:
@@ -94,18 +89,16 @@ class JdfUpdates : public StoreProgram {
     int lastVersion() { return m_store->versions(jdfPath).back().number; }
     /// What the last delivery replaced.
     std::string replaced() {
-        std::ostringstream to;
-        m_store->getVersion(jdfPath, lastVersion(), to);
-        return to.str();
+        return answer({"file", "get", jdfPath, "-", "--version", std::to_string(lastVersion())});
     }
 
     /// Updates the local copy as a result is written back, and uploads it. Each is of a day of its
     /// own, and those of odd days have spectra.
-    void update(const Written& written) {
+    void update(char party, char strip) {
         JDFMeasurementHeader header;
         JdfHandler::SetJDFMeasurementHeaderDefaults(&header);
-        header.party = static_cast<unsigned char>(written.party);
-        header.secondStrip = written.strip == 2 ? 1 : 0;
+        header.party = party == 's' ? 1 : 2;
+        header.secondStrip = strip == '2' ? 1 : 0;
         header.writePatchDefinitions = true;
         std::snprintf(header.measureDate, sizeof header.measureDate, "2024-05-%02d", ++m_day);
         KZJobDataStruct job;
@@ -119,39 +112,38 @@ class JdfUpdates : public StoreProgram {
         ASSERT_EQ(JdfHandler::AppendJDFFileData(job, "Remote confirmation M1", &header, true), 0);
         put(support::contentsOf(m_folder.path("local.jdf")));
     }
-    /// A run: it downloads the JDF, and writes to it once, or for each job of a sheet.
-    void runJob(const std::vector<Written>& results) {
-        m_folder.write("local.jdf", stored());
-        for (const auto& written : results) {
-            update(written);
+    /// Runs in a row, each a word. A run downloads the JDF, and writes to it once, or for each job
+    /// of a sheet: s is for the sender, r for the receiver, that of a remeasure, with the strip
+    /// behind.
+    void runJobs(const std::string& runs) {
+        std::istringstream words(runs);
+        for (std::string run; words >> run;) {
+            m_folder.write("local.jdf", stored());
+            for (std::size_t i = 0; i < run.size(); i += 2) {
+                update(run[i], run[i + 1]);
+            }
         }
     }
 
-    static pugi::xml_parse_result read(const std::string& text, pugi::xml_document& document) {
+    /// "1:01 2:02" and so on: strip and day of each measurement, read by the XML library, or
+    /// "damaged".
+    static std::string measurements(const std::string& text) {
         // The update leaves out the blank between two spectral values.
-        const std::regex missing("\"dvalue");
-        return document.load_string(std::regex_replace(text, missing, "\" dvalue").c_str());
-    }
-    static bool isDamaged(const std::string& text) {
+        const auto readable = std::regex_replace(text, std::regex("\"dvalue"), "\" dvalue");
         pugi::xml_document document;
-        return !read(text, document);
-    }
-    /// "1:2024-05-01" and so on: strip and date of each measurement, read by the XML library.
-    static std::vector<std::string> measurements(const std::string& text) {
-        pugi::xml_document document;
-        const auto result = read(text, document);
-        EXPECT_TRUE(result) << result.description() << " at " << result.offset;
-        std::vector<std::string> found;
-        const auto all = document.select_nodes("/*/*[local-name()='ResourcePool']"
-                                               "/tazo:MeasurementData/*");
-        for (const auto& node : all) {
+        if (!document.load_string(readable.c_str())) {
+            return "damaged";
+        }
+        std::string found;
+        for (const auto& node : document.select_nodes("/*/*[local-name()='ResourcePool']"
+                                                      "/tazo:MeasurementData/*")) {
             const auto element = node.node();
-            const std::string name = element.name();
             const std::string date = element.attribute("Date").value();
-            found.push_back((name == "tazo:Measurement2" ? "2:" : "1:") + date);
+            found += (found.empty() ? "" : " ") +
+                     std::string(element.name() == std::string("tazo:Measurement2") ? "2:" : "1:") +
+                     date.substr(date.size() - 2);
             EXPECT_EQ(element.select_nodes("tazo:PatchData").size(), 3U);
             EXPECT_EQ(element.select_nodes("*/@dvalue35").size(), date.back() % 2 == 1 ? 3U : 0U);
-            EXPECT_NE(element.attribute("TotalPass"), nullptr);
         }
         return found;
     }
@@ -163,7 +155,7 @@ class JdfUpdates : public StoreProgram {
         result = std::regex_replace(result, date, "$1");
         return std::regex_replace(result, date, "$1");
     }
-    void expectWhole(const std::string& text, const std::vector<std::string>& expected) {
+    void expectWhole(const std::string& text, const std::string& expected) {
         EXPECT_EQ(measurements(stored()), expected);
         EXPECT_EQ(rest(stored()), text);
     }
@@ -177,24 +169,16 @@ class JdfUpdates : public StoreProgram {
 
 TEST_F(JdfUpdates, LoseNothingOfAPreparedJdf) {
     const struct {
-        const char* name;
-        std::vector<std::vector<Written>> runs;
-        std::vector<std::string> expected;
+        const char* runs;
+        const char* measurements;
         std::size_t blanks; ///< That are left of those for six.
     } cases[] = {
-        {"remeasured", {{{1, 1}}, {{2, 1}}}, {"1:2024-05-01", "1:2024-05-02"}, 2052},
-        {"nested",
-         {{{1, 2}, {1, 2}, {1, 2}}},
-         {"2:2024-05-01", "2:2024-05-02", "2:2024-05-03"},
-         2052 - 4 * 36},
-        {"six",
-         {{{1, 1}}, {{1, 2}}, {{1, 1}}, {{1, 2}}, {{1, 1}, {1, 1}}},
-         {"1:2024-05-01", "2:2024-05-02", "1:2024-05-03", "2:2024-05-04", "1:2024-05-05",
-          "1:2024-05-06"},
-         0},
+        {"s1 r1", "1:01 1:02", 2052},
+        {"s2s2s2", "2:01 2:02 2:03", 2052 - 4 * 36},
+        {"s1 s2 s1 s2 s1s1", "1:01 2:02 1:03 2:04 1:05 1:06", 0},
     };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.name);
+    for (const auto& [runs, expected, blanks] : cases) {
+        SCOPED_TRACE(runs);
         m_day = 0;
         put(delivered);
         EXPECT_THAT(answer({"jdf", "ready", "7", "--updates", "6"}),
@@ -206,23 +190,18 @@ TEST_F(JdfUpdates, LoseNothingOfAPreparedJdf) {
         EXPECT_EQ(answer({"jdf", "ready", "job/7", "--updates", "6"}), jdfPath + ": was ready\n");
         EXPECT_EQ(lastVersion(), kept);
 
-        for (const auto& results : c.runs) {
-            runJob(results);
-        }
-        expectWhole(prepared, c.expected);
+        runJobs(runs);
+        expectWhole(prepared, expected);
         const std::size_t padding = 5000 - prepared.size(); // Updates want that many bytes.
-        EXPECT_EQ(stored().size() - withoutBlanks(stored()).size(), padding + c.blanks);
+        EXPECT_EQ(stored().size() - withoutBlanks(stored()).size(), padding + blanks);
     }
     // Made ready again it bears more of them; a JDF that isn't is damaged by the second.
     answer({"jdf", "ready", "7"});
-    for (int i = 0; i < 8; ++i) {
-        runJob({{1, 1}});
-    }
-    EXPECT_EQ(measurements(stored()).size(), 14U);
-    EXPECT_EQ(rest(stored()), prepared);
+    runJobs("s1 s1 s1");
+    expectWhole(prepared, "1:01 2:02 1:03 2:04 1:05 1:06 1:07 1:08 1:09");
     put(enlarged(delivered));
-    runJob({{1, 1}, {1, 1}});
-    EXPECT_TRUE(isDamaged(stored()));
+    runJobs("s1s1");
+    EXPECT_EQ(measurements(stored()), "damaged");
 }
 
 TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
@@ -259,9 +238,8 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
         put(before);
         answer({"jdf", "ready", "7"});
         EXPECT_EQ(withoutBlanks(stored()), after);
-        runJob({{1, 1}});
-        runJob({{1, 2}});
-        expectWhole(after, {"1:2024-05-01", "2:2024-05-02"});
+        runJobs("s1 s2");
+        expectWhole(after, "1:01 2:02");
     }
 
     const std::pair<std::string, const char*> refused[] = {
@@ -282,39 +260,34 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
 
 TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     put(enlarged(delivered));
-    runJob({{1, 1}});
-    runJob({{1, 2}, {1, 2}});
-    runJob({{2, 1}});
+    runJobs("s1 s2s2 r1");
     const std::string damaged = stored();
-    ASSERT_TRUE(isDamaged(damaged));
+    ASSERT_EQ(measurements(damaged), "damaged");
     const auto rebuilt = json::parse(answer({"jdf", "rebuild", "7", "--json"}));
     EXPECT_EQ(rebuilt[0]["base"], 1);
     EXPECT_EQ(rebuilt[0]["measurements"], 4);
     EXPECT_EQ(replaced(), damaged);
     const std::string whole = enlarged(prepared);
-    expectWhole(whole, {"1:2024-05-01", "2:2024-05-02", "2:2024-05-03", "1:2024-05-04"});
+    expectWhole(whole, "1:01 2:02 2:03 1:04");
 
     const int kept = lastVersion();
     EXPECT_EQ(json::parse(answer({"jdf", "rebuild", "7", "--json"}))[0]["changed"], false);
     EXPECT_EQ(lastVersion(), kept);
-    runJob({{1, 1}});
-    runJob({{1, 1}});
+    runJobs("s1 s1");
     answer({"jdf", "rebuild", "7", "--from", std::to_string(lastVersion())});
-    EXPECT_EQ(measurements(stored()).size(), 6U);
-    EXPECT_EQ(rest(stored()), whole);
+    expectWhole(whole, "1:01 2:02 2:03 1:04 1:05 1:06");
 
     // Another document under the same name has nothing to do with what was before.
     put("<JDF><new/></JDF>");
     answer({"jdf", "rebuild", "7", "--from", std::to_string(lastVersion() + 1)});
     EXPECT_THAT(stored(), HasSubstr("<JDF><new/>"));
-    EXPECT_TRUE(measurements(stored()).empty());
+    EXPECT_EQ(measurements(stored()), "");
     put("<JDF>");
     expectRefusal({"jdf", "rebuild", "7", "--from", "99"}, 15);
     EXPECT_EQ(stored(), "<JDF>");
 }
 
 TEST_F(JdfUpdates, AreOfTheJdfsThatAJobNames) {
-    expectRefusal({"jdf", "ready", "8"}, 1, "no job/8");
     expectRefusal({"jdf", "ready", "7"}, 1, "not there: " + jdfPath);
     put(delivered);
     expectRefusal({"jdf", "ready", "7", "--updates", "17"}, 16, "too many");
