@@ -136,14 +136,6 @@ TEST_F(ManagerTest, HandsTextsOut) {
         plugIn->set(3, job, "text", stored);
         EXPECT_EQ(manager->GetStringParameter(3, job, "text"), wide) << stored;
     }
-    // What could be converted comes from a cache of the manager's own.
-    const char* theirs = nullptr;
-    const char* ours = nullptr;
-    plugIn->set(3, job, "text", "plain");
-    ticket::Contained(plugIn->access, 3, job).get("text", PARAM_STRING, &theirs, -1);
-    EXPECT_EQ(manager->GetParameter(3, job, "text", PARAM_STRING, &ours, -1), 1);
-    EXPECT_STREQ(ours, "plain");
-    EXPECT_NE(ours, theirs);
     const double half = 0.5; // Required: a double is read as an int.
     plugIn->set(3, job, "double", PARAM_DOUBLE, &half);
     EXPECT_EQ(manager->GetDoubleParameter(3, job, "double"), -1.0);
