@@ -29,10 +29,6 @@ class WorkTicket {
     /// The engine's own record, which is what a transfer takes as a source.
     const STICKET_ACCESS* real() const { return m_real; }
 
-    using Get = ticket::single::GetParameter;
-    using Set = ticket::single::SetParameter;
-    using GetTable = ticket::single::GetMultiParameter;
-
     template<class Call>
     auto with(Call call) const {
         return call(view());
@@ -55,10 +51,6 @@ class TicketInside {
     }
 
     const MTICKET_ADMIN& view() const { return ticket::as<MTICKET_ADMIN>(record); }
-
-    using Get = ticket::container::GetParameter;
-    using Set = ticket::container::SetParameter;
-    using GetTable = ticket::container::GetMultiParameter;
 
     /// Calls with the view, and type and id behind it.
     template<class Call>

@@ -44,13 +44,11 @@ TEST(SingleTicket, SaysWhereItComesFromOrNothing) {
 }
 
 TEST(SingleTicket, BearsAFaultyPlugIn) {
-    static int calls;
     static int answer;
     static unsigned long count;
     WorkTicket work;
     ticket::single::GetParameter::put(
         work.record, +[](void*, const char*, PARAM_TYPE type, void* out, int) {
-            ++calls;
             if (type == PARAM_INT) {
                 *static_cast<int*>(out) = 7;
             } else if (type == PARAM_COUNT) {
@@ -61,7 +59,6 @@ TEST(SingleTicket, BearsAFaultyPlugIn) {
     // Nothing is put there, and each record says that something was.
     ticket::single::GetMultiParameter::put(
         work.record, +[](void*, GETMULTIPAR* table) {
-            ++calls;
             for (; table->key != nullptr; ++table) {
                 table->result = 0xFF;
             }
@@ -76,13 +73,11 @@ TEST(SingleTicket, BearsAFaultyPlugIn) {
     EXPECT_EQ(view.GetIntParameter("key", 1), 7);
     EXPECT_EQ(view.GetStringParameter("key", "fallback"), "fallback");
 
-    // A vector costs two calls, and null texts fall out of it.
+    // Null texts fall out of a vector.
     std::vector<std::string> texts{"former"};
     count = 1000;
-    calls = 0;
     EXPECT_FALSE(view.GetVectorParameter("key", texts));
     EXPECT_TRUE(texts.empty());
-    EXPECT_EQ(calls, 2);
 
     // Counts that can't be allocate nothing.
     for (const unsigned long damage : {ULONG_MAX, ULONG_MAX / sizeof(GETMULTIPAR), 1UL << 33}) {

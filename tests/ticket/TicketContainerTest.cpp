@@ -33,7 +33,7 @@ TEST(TicketContainer, FindsMakesAndDeletesTickets) {
 }
 
 TEST(TicketContainer, ReadsATicketsValues) {
-    const TicketInside inside;
+    TicketInside inside;
     const MTICKET_ADMIN& view = inside.view();
     EXPECT_TRUE(view.SetMultiParameter(
         type, id, support::RecordTable("numbers=6,7 text[-1]='cyan").records()));
@@ -41,6 +41,12 @@ TEST(TicketContainer, ReadsATicketsValues) {
     EXPECT_EQ(view.GetIntParameter(type, id, 2, "numbers", -1), -1);
     EXPECT_STREQ(view.GetPszParameter(type, id, "text", "fallback"), "cyan");
     EXPECT_STREQ(view.GetPszParameter(type, id, "none", "fallback"), "fallback");
+    ticket::container::GetParameter::put(
+        inside.record, +[](void*, int, int, const char*, PARAM_TYPE, void* out, int) {
+            *static_cast<int*>(out) = 7;
+            return 2; // Of an answer bit 0 counts.
+        });
+    EXPECT_EQ(view.GetIntParameter(type, id, "numbers", -1), -1);
 }
 
 TEST(TicketContainer, PassesFiltersAndNotificationsOn) {
