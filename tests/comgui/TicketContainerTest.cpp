@@ -15,17 +15,6 @@ using support::ticketText;
 
 namespace {
 
-/// Counts what is asked of the place that the tickets are kept in.
-class CountingKeep : public store::MemoryKeep {
-  public:
-    int keyReads = 0;
-
-    std::shared_ptr<const store::Elements> key(int type, int id, std::string_view key) override {
-        ++keyReads;
-        return MemoryKeep::key(type, id, key);
-    }
-};
-
 class TicketContainer : public testing::Test {
   protected:
     TicketContainer() {
@@ -52,7 +41,7 @@ class TicketContainer : public testing::Test {
         return value;
     }
 
-    std::shared_ptr<CountingKeep> keep = std::make_shared<CountingKeep>();
+    std::shared_ptr<store::MemoryKeep> keep = std::make_shared<store::MemoryKeep>();
     store::TicketContainer session{keep};
     store::TicketContainer other{keep}; ///< Another session.
     MTICKET_ACCESS access = *session.access();
@@ -127,16 +116,6 @@ TEST_F(TicketContainer, ReadsSeeOthersAndArraysAreWhole) {
     EXPECT_EQ(readInt(3, 1, "v", 2), 31) << "the first read of another key";
     send(session, 3, 1, "v[1]=21");
     EXPECT_EQ(readInt(3, 1, "v", 1), 21) << "what this session wrote";
-
-    keep->keyReads = 0;
-    int values[3] = {};
-    GETMULTIPAR table[4] = {};
-    for (int i = 0; i < 3; ++i) {
-        table[i] = {.key = "v", .type = PARAM_INT, .value = &values[i], .position = i};
-    }
-    container::GetMultiParameter::call(access, 3, 1, table);
-    EXPECT_EQ((std::vector<int>{values[0], values[1], values[2]}), (std::vector<int>{10, 21, 31}));
-    EXPECT_EQ(keep->keyReads, 1);
 }
 
 TEST_F(TicketContainer, PointersOfAWalkStayGoodUntilTheTicketChanges) {
