@@ -56,12 +56,6 @@ class DefinitionFile : public testing::Test {
         EXPECT_EQ(support::contentsOf(m_definition), lines(definition));
     }
 
-    void expectInstrument(int number) const {
-        wxString name;
-        EXPECT_EQ(getDeviceNameFromIt8ControlStripFile(m_definition, &name), 0);
-        EXPECT_EQ(name, GetInstrumentNameFromID(number));
-    }
-
     const support::ScratchFolder m_folder;
     const std::string m_definition = m_folder.path("NMPatchSetDefinition.it8");
     const std::string m_dcf = m_folder.path("NMPatchSetDefinition.dcf");
@@ -89,7 +83,6 @@ TEST_F(DefinitionFile, TakesTheRowsOfAFixedStrip) {
     const std::string rows = "|BEGIN_DATA|1\t0\t0\t0\t0|2|END_DATA|behind||";
     expect(body, definition + "\t33" + rows);
     expect("NUMBER_OF_COLS 40 |" + body, definition + " 40 " + rows);
-    expectInstrument(21);
 }
 
 TEST_F(DefinitionFile, TellsEachInstrumentWhatItNeeds) {
@@ -109,7 +102,9 @@ TEST_F(DefinitionFile, TellsEachInstrumentWhatItNeeds) {
         expect("NUMBER_OF_COLS 1", head + "END_DATA_FORMAT|DEVICE " + std::to_string(device) + "|" +
                                        wanted + lowRes + oneColumn);
     }
-    expectInstrument(51); // Without a KEYWORD line the analysis still finds it.
+    wxString name; // Without a KEYWORD line the analysis still finds it.
+    EXPECT_EQ(getDeviceNameFromIt8ControlStripFile(m_definition, &name), 0);
+    EXPECT_EQ(name, GetInstrumentNameFromID(51));
 }
 
 TEST_F(DefinitionFile, FillsADynamicStrip) {
