@@ -345,6 +345,8 @@ TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
 
 TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
     const Call call = {.job = "8"};
+    const Call again = {.remeasure = "KEY_KZ_REMEASURE:=:true"};
+    const Call almost = {.remeasure = "KEY_KZ_REMEASURE:=:True"};
     const auto tool = [](const std::string& settings, bool withReferences = true) {
         return [=](const Place& place) {
             place.installTool(settings);
@@ -377,12 +379,8 @@ TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
     const std::string compared = "m_jobType is = 0\nComparing existing data\n";
     expectRuns({
         {"measured", 0, "Copying resulting data to job ticket\n", tool(""), call},
-        {"measured again",
-         0,
-         "Copying resulting data to job ticket\n",
-         closedJob,
-         {.remeasure = "KEY_KZ_REMEASURE:=:true"}},
-        {"almost so", 0, "Comparing existing data\n", {}, {.remeasure = "KEY_KZ_REMEASURE:=:True"}},
+        {"measured again", 0, "Copying resulting data to job ticket\n", closedJob, again},
+        {"almost measured again", 0, "Comparing existing data\n", {}, almost},
         {"no tool", 106, launched + "-2", {}, call},
         {"a tool that runs already", 106, launched + "-1", runningTool, call},
         {"a tool that can't be executed", 105, launched + "0",
@@ -498,10 +496,9 @@ constexpr char killWhileItWrites[] = R"sh(
     kill -9 $run)sh";
 
 TEST(Verification, KilledWhileItWritesLeavesAllWholeAndCanBeRunAgain) {
-    const char* const delays[] = {"0", "0", "0.005", "0.01", "0.02", "0.03"};
+    const char* const delays[] = {"0", "0.002", "0.005", "0.01", "0.02", "0.04"};
     std::vector<Place> places(std::size(delays));
     std::vector<std::map<std::string, int>> left;
-    const std::size_t fresh = places[0].counts(8).size();
     for (const Place& place : places) {
         place.installTool();
     }
@@ -529,9 +526,9 @@ TEST(Verification, KilledWhileItWritesLeavesAllWholeAndCanBeRunAgain) {
         for (const auto& [key, count] : left[i]) {
             EXPECT_EQ(count, whole.at(key)) << key;
         }
-        cutOff += left[i].size() > fresh && left[i].size() < whole.size() ? 1 : 0;
+        cutOff += left[i].size() < whole.size() ? 1 : 0;
     }
-    EXPECT_GT(cutOff, 0) << "all were killed before or after they wrote";
+    EXPECT_GT(cutOff, 0) << "all were killed after they had written everything";
 }
 
 } // namespace
