@@ -84,38 +84,28 @@ TEST_F(UpdateList, OverlaysTheServersValues) {
     EXPECT_EQ(values, std::vector<int>{5});
 }
 
-TEST_F(UpdateList, PutsAnElementAmongTheOriginalOnesAndKeepsWhatIsDeleted) {
-    TICKET_UPDATE_LIST lone(nullptr);
-    struct Case {
-        TICKET_UPDATE_LIST& list;
-        int type, id;
-        const char *edits, *pending, *kept;
+TEST_F(UpdateList, KeepsWhatDeletionsTakeAway) {
+    const std::pair<const char*, const char*> cases[] = {
+        {"a[2]=- a[1]=-", "a[0]=3 a[1]=2"},
+        {"a[2]=- a[-1]=-", "a[0]=1"}, // In place of what was kept.
+        {"s[-1]=- d[-1]=- u[-1]=-", "d[0]=0.5 s[0]='old"},
+        {"a[0]=9", "none"},
     };
-    const Case cases[] = {
-        {list, jobs, id, "a[-1]=9", "a[0]=9", "none"}, // Whole, it needs no original.
-        {list, jobs, id, "a[3]=9 a[4]=8", "a[0]=1 a[1]=2 a[2]=3 a[3]=9 a[4]=8", "none"},
-        {list, jobs, id, "a[2]=- a[1]=-", "a[0]=1 a[1]=4", "a[0]=3 a[1]=2"},
-        {list, jobs, id, "a[2]=- a[-1]=-", "", "a[0]=1"}, // In place of what was kept.
-        {list, jobs, id, "s[-1]=- d[-1]=- u[-1]=-", "", "d[0]=0.5 s[0]='old"},
-        // Nowhere else there is an original.
-        {list, jobs, 13, "a[0]=9 a[-1]=-", "", ""},
-        {list, jobs, -9000, "a[0]=9", "a[0]=9", "none"},
-        {list, TICKET_TYPE_LOCAL, id, "a[0]=9", "a[0]=9", "none"},
-        {lone, jobs, id, "a[0]=9 s[-1]=-", "a[0]=9", ""},
-    };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(c.edits);
-        c.list.Clear();
-        EXPECT_TRUE(edit(c.list, c.type, c.id, c.edits));
-        EXPECT_EQ(entryText(c.list.m_changed, c.type, c.id), c.pending);
-        EXPECT_EQ(entryText(c.list.m_toDelete, c.type, c.id), c.kept);
+    for (const auto& [edits, kept] : cases) {
+        list.Clear();
+        EXPECT_TRUE(edit(list, jobs, id, edits));
+        EXPECT_EQ(entryText(list.m_toDelete, jobs, id), kept) << edits;
     }
     edit(list, jobs, id, "a[0]=-");
     std::vector<int> values;
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "a", values), 1);
-    EXPECT_EQ(values, std::vector<int>{1});
+    EXPECT_EQ(values, std::vector<int>{1}); // As the server has it.
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "other", values), 1);
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, 13, "a", values), 0);
+
+    TICKET_UPDATE_LIST lone(nullptr); // There is no original.
+    EXPECT_TRUE(edit(lone, jobs, id, "a[0]=9 s[-1]=-"));
+    EXPECT_EQ(entryText(lone.m_changed, jobs, id), "a[0]=9");
 }
 
 TEST_F(UpdateList, CountsAsEmptyByKeptValuesAlone) {
