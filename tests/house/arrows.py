@@ -120,7 +120,7 @@ def check_arrows(compiler, binary_dir, targets):
 def check_includes(source_dir):
     """Yields a sentence for each include that goes around the arrows: not written from the root.
 
-    Tests and benchmarks, which no target sees, may have helpers beside them.
+    Tests and benchmarks, which no target sees, may have helpers beside them or atop their tree.
     """
     shared = {path.name for path in (source_dir / "tests" / "support").glob("*.h")} | FOR_ALL
     for path in sorted(source_dir.rglob("*")):
@@ -128,7 +128,9 @@ def check_includes(source_dir):
         if path.suffix not in (".h", ".cpp") or inside.parts[0] in ("build", "out"):
             continue
         for name in re.findall(r'^\s*#\s*include\s*"([^"]*)"', path.read_text(), re.MULTILINE):
-            beside = inside.parts[0] in ("tests", "bench") and (path.parent / name).is_file()
+            beside = inside.parts[0] in ("tests", "bench") and any(
+                (folder / name).is_file() for folder in (path.parent, source_dir / inside.parts[0])
+            )
             if name in shared or (beside and ".." not in name):
                 continue
             if ".." in name.split("/") or not (source_dir / name).is_file():

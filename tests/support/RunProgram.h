@@ -35,7 +35,7 @@ struct Outcome {
 /// code 127 where it can't be started. Standard input is empty.
 Outcome run(const std::vector<std::string>& command, const RunOptions& options = {});
 
-/// Whether a process, or one that nobody has waited for, ends in time.
+/// Whether a child ends in time. It stays one that is to be waited for.
 bool awaitEnd(pid_t process, std::chrono::milliseconds limit);
 
 /// Makes root's process one of this user; there is no way back. For anybody but root does nothing.
