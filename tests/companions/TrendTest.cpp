@@ -58,18 +58,6 @@ TEST(Drift, SeesASlowMoveAndRarelyAnythingElse) {
     EXPECT_TRUE(std::isnan(driftOf({none, none}).began));
 }
 
-TEST(Ink, IsToldByDeviceValues) {
-    const struct {
-        std::vector<double> device;
-        std::optional<Ink> ink;
-    } cases[] = {
-        {{0, 0, 0, 0}, Ink::Paper}, {{99.6, 0.4, 0, 0}, Ink::Cyan}, {{0, 0, 0, 100, 0}, Ink::Black},
-        {{99, 0, 0, 0}, {}},        {{100, 1, 0, 0}, {}},           {{0, 0, 0, 0, 100}, {}},
-        {{none, 0, 0, 0}, {}}};
-    for (const auto& [device, ink] : cases)
-        EXPECT_EQ(inkOf(device.data(), device.size()), ink) << device[0] << ' ' << device.size();
-}
-
 Sample sampleAt(int day, double value, double tolerance, const std::string& paper = "Matt") {
     Sample sample;
     sample.time = 1'770'000'000 + 86400 * day;
