@@ -29,8 +29,6 @@ const std::string noDevice = head + "END_DATA_FORMAT|DEVICE 5|" + lowRes;
 const std::string dynamic = "KEYWORD FORCE_LAB_CALCULATION|FORCE_LAB_CALCULATION 1|";
 const std::string oneColumn = "KEYWORD NUMBER_OF_COLS|NUMBER_OF_COLS 1|";
 
-const std::string cmykFields = "SAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\tLAB_L\tLAB_A\tLAB_B";
-const std::string rgbFields = "SAMPLE_ID\tRGB_R\tRGB_G\tRGB_B\tLAB_L\tLAB_A\tLAB_B";
 const std::string cmykWhite = "\t0.00\t0.00\t0.00\t0.00\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00|";
 const std::string rgbWhite = "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00|";
 
@@ -71,10 +69,11 @@ TEST_F(DefinitionFile, TakesTheRowsOfAFixedStrip) {
     const std::string body =
         "ORIGINATOR \"me\"\t|KEYWORD \"DEVICE\"|DEVICE 21 \t|NUMBER_OF_FIELDS 8|"
         "NUMBER_OF_STRIPS 3|BORDER_PATCHES 1|VERTICAL_MEAS 0|NUMBER_OF_SETS 100|"
-        "BEGIN_DATA_FORMAT|" +
-        cmykFields + "|END_DATA_FORMAT||BEGIN_DATA|1\t0\t0\t0\t0|2\tä\t0|END_DATA|behind\t|";
+        "BEGIN_DATA_FORMAT|"
+        "SAMPLE_ID\tCMYK_C|END_DATA_FORMAT||BEGIN_DATA|1\t0\t0\t0\t0|2\tä\t0|END_DATA|behind\t|";
     const std::string definition =
-        head + "NUMBER_OF_FIELDS 8|BEGIN_DATA_FORMAT|" + cmykFields +
+        head +
+        "NUMBER_OF_FIELDS 8|BEGIN_DATA_FORMAT|SAMPLE_ID\tCMYK_C"
         "|END_DATA_FORMAT|KEYWORD\tDEVICE|DEVICE 21 |KEYWORD ZEBRA_RULER_MODE|ZEBRA_RULER_MODE 1|" +
         lowRes +
         "KEYWORD VERTICAL_MEAS|VERTICAL_MEAS 0|KEYWORD BORDER_PATCHES|BORDER_PATCHES 1|"
@@ -117,11 +116,12 @@ TEST_F(DefinitionFile, FillsADynamicStrip) {
         std::string white;
     };
     const Case cases[] = {
-        {cmykFields, 83, "END_DATA|behind|", 84, cmykWhite},
-        {rgbFields, 98, "END_DATA|", 99, rgbWhite},
+        {"CMYK_C", 83, "END_DATA|behind|", 84, cmykWhite},
+        {"RGB_R\tRGB_G\tRGB_B", 98, "END_DATA|", 99, rgbWhite},
         {"RGB_R RGB_B", 99, "END_DATA|", 100, cmykWhite},
-        {rgbFields, 101, "END_DATA|", 101, ""},
-        {rgbFields, 98, "", 100, rgbWhite}, // The empty line behind the last counts as a row.
+        {"RGB_R\tRGB_G\tRGB_B", 101, "END_DATA|", 101, ""},
+        {"RGB_R\tRGB_G\tRGB_B", 98, "", 100,
+         rgbWhite}, // The empty line behind the last counts as a row.
     };
     for (const Case& c : cases) {
         std::string rows;
