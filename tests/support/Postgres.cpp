@@ -66,13 +66,9 @@ std::string BarePostgres::run(const std::string& statements) const {
 PostgresRoom::PostgresRoom() {
     setenv(serviceFile, sharedServiceFile().c_str(), 1);
     const std::string database = databaseOfProcess();
-    std::string line;
-    for (std::ifstream file(sharedServiceFile()); std::getline(file, line);) {
-        if (line.starts_with("host=") || line.starts_with("user=")) {
-            m_lines += line + "\n";
-        }
-    }
-    m_lines += "dbname=" + database + "\n";
+    // Of lines for the same thing, the first counts.
+    const std::string shared = contentsOf(sharedServiceFile());
+    m_lines = "dbname=" + database + shared.substr(shared.find('\n'));
     setenv(serviceFile, m_folder.write("pg_service.conf", "[room]\n" + m_lines).c_str(), 1);
     BarePostgres("room").run("DROP SCHEMA IF EXISTS tintgate CASCADE");
 }
@@ -82,7 +78,6 @@ PostgresRoom::~PostgresRoom() {
 }
 
 void PostgresRoom::addService(const std::string& name, const std::string& lines) const {
-    // Of lines for the same thing, the first counts.
     std::ofstream(m_folder.path("pg_service.conf"), std::ios::app) << "[" << name << "]\n"
                                                                    << lines << "\n"
                                                                    << m_lines;
