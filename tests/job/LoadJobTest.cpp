@@ -105,9 +105,7 @@ class LoadJob : public JobOnStore {
                 {"workflow", std::to_string(job.measurementWorkflow)},
                 {"status", std::to_string(job.measurementStatus)},
                 {"mode", std::to_string(job.illuminationMode)},
-                {"title", job.title.utf8_string()},
-                {"flow", job.workflowName.utf8_string()},
-                {"paper", job.paperName.utf8_string()},
+                {"texts", (job.title + "," + job.workflowName + "," + job.paperName).utf8_string()},
                 {"strip", shown(job, job.controlStripFile)},
                 {"dynfile", shown(job, job.dynstripFile)},
                 {"reference", shown(job, job.referenceFile)},
@@ -170,10 +168,10 @@ class LoadJob : public JobOnStore {
 TEST_F(LoadJob, AnUsualJob) {
     // The preset is not of the PSD kind, whatever its ticket says.
     EXPECT_EQ(differences(membersOf({}, 0), m_usual),
-              "device=33 flow=Flow formula=4 jdf=/s/jdf/job.jdf jdfServer=/s/jdf/job.jdf mode=2 "
-              "paper=Paper preset=7 Proof /s/tickets/CVP_0007.xml 1,1,1,3 1,0,1 1.5,2.5,0 2,0 0 "
+              "device=33 formula=4 jdf=/s/jdf/job.jdf jdfServer=/s/jdf/job.jdf mode=2 "
+              "preset=7 Proof /s/tickets/CVP_0007.xml 1,1,1,3 1,0,1 1.5,2.5,0 2,0 0 "
               "reference=/s/IT8_CharacterizationData/chart.it8 strip=/s/ControlCharts/strip.it8 "
-              "title=Title workflow=2");
+              "texts=Title,Flow,Paper workflow=2");
 }
 
 TEST_F(LoadJob, FindsTheControlStrip) {
@@ -244,7 +242,7 @@ TEST_F(LoadJob, GoesOnWithoutWhatIsMissing) {
     expectOutcomes({
         {"Remote/Measurement/Illumination/Mode='two Remote/Measurement/Status='many "
          "CMM/PaperName=- Workflow/Name=7 Input/Title=-",
-         "flow= mode=1 paper= title="},
+         "mode=1 texts=,,"},
         // Without an install folder the switch behind it is not read, and a lookup still made.
         {"System/InstallFolder=- Footer/Dynstrip/UseDynstrip=1 "
          "Workflow/Verify/CharacterizationData='/s/a(TEMP)/MKCheck10.it8",

@@ -20,13 +20,7 @@ using testing::HasSubstr;
 class WriteBack : public JobOnStore {
   protected:
     WriteBack() {
-        for (int i = 0; i < spectralValueCount; ++i) {
-            spectral[0].values[i] = 0.1 + i;
-            spectral[1].values[i] = 0.2 + i;
-        }
-        spectral[0].base = 380;
-        spectral[0].stepsize = 20;
-        spectral[0].length = 3;
+        spectral[0] = {.values = {0.1, 1.1, 2.1, 3.1}, .base = 380, .stepsize = 20, .length = 3};
         spectral[1] = {.values = {1.5, 2.5, 3.5, 4.5}, .base = 400, .stepsize = 10, .length = 4};
         print.measurement.numPatches = 2;
         print.measurement.xyz = xyz;
