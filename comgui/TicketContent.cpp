@@ -1,9 +1,6 @@
 #include "comgui/TicketContent.h"
 
 #include <algorithm>
-#include <cstring>
-#include <span>
-#include <type_traits>
 #include <unordered_set>
 #include <vector>
 
@@ -25,39 +22,28 @@ void clearResults(SETMULTIPAR* table) {
     }
 }
 
-/// The records from this one on that fill positions 0, 1, 2, ... of one key with numbers of one
-/// type, as a measured array comes.
-std::span<SETMULTIPAR> arrayAt(SETMULTIPAR* first) {
-    std::size_t length = 0;
-    if (numberSize(first->type) != 0) {
-        const auto goesOn = [&](const SETMULTIPAR& record) {
-            return record.key == first->key && record.type == first->type &&
-                   record.value != nullptr && record.position == static_cast<int>(length);
-        };
-        while (length <= highestPosition && goesOn(first[length])) {
-            ++length;
-        }
-    }
-    return {first, length};
+/// Whether a record and the next one begin an array of numbers.
+bool beginsArray(const SETMULTIPAR* record) {
+    return numberSize(record->type) != 0 && record->position == 0 && record[1].position == 1 &&
+           record[1].key == record->key && record[1].type == record->type;
 }
 
-/// What setElement would make of the records, one after the other, without a Value for each.
-std::shared_ptr<Elements> elementsOf(std::span<SETMULTIPAR> array) {
+/// What setElement would make of records, one after the other, that fill positions 0, 1, 2, ... of
+/// a key that isn't there with numbers of one type, as a measured array comes; without a Value for
+/// each. Sets their results, and leaves the record at the last of them.
+template<std::size_t Size>
+std::shared_ptr<Elements> takeArray(SETMULTIPAR*& record) {
+    const SETMULTIPAR first = *record;
     std::string bytes;
-    const auto gather = [&](auto size) {
-        bytes.resize(array.size() * size);
-        char* to = bytes.data();
-        for (SETMULTIPAR& record : array) {
-            std::memcpy(to, record.value, size);
-            to += size;
-        }
-    };
-    if (numberSize(array.front().type) == 8) {
-        gather(std::integral_constant<std::size_t, 8>());
-    } else {
-        gather(std::integral_constant<std::size_t, 4>());
+    int count = 0;
+    for (; count <= highestPosition && record->key == first.key && record->type == first.type &&
+           record->position == count && record->value != nullptr;
+         ++record, ++count) {
+        bytes.append(static_cast<const char*>(record->value), Size);
+        record->result = 1;
     }
-    return std::make_shared<Elements>(Elements::ofNumbers(array.front().type, std::move(bytes)));
+    --record;
+    return std::make_shared<Elements>(Elements::ofNumbers(first.type, std::move(bytes)));
 }
 
 } // namespace
@@ -152,21 +138,17 @@ void TicketContent::apply(SETMULTIPAR* table) {
     if (table == nullptr || table->key == nullptr) {
         return;
     }
-    clearResults(table);
     Application application(m_keys, table[1].key == nullptr);
     try {
         for (auto* record = table; record->key != nullptr; ++record) {
+            record->result = 0;
             if (!keyAllowed(record->key)) {
                 continue;
             }
             auto& elements = application.at(record->key);
-            const auto array = arrayAt(record);
-            if (array.size() > 1 && !elements) {
-                elements = elementsOf(array);
-                for (SETMULTIPAR& each : array) {
-                    each.result = 1;
-                }
-                record = &array.back();
+            if (!elements && record->value != nullptr && beginsArray(record)) {
+                elements = numberSize(record->type) == 8 ? takeArray<8>(record)
+                                                         : takeArray<4>(record);
             } else {
                 record->result =
                     setElement(elements, record->type, record->value, record->position) ? 1 : 0;

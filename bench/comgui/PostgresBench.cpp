@@ -85,29 +85,31 @@ int main() {
     root.installCommBundle(COMGUI_BUNDLE);
     store::makeStore("room", "Bench");
     store::openStore("room")->putUser({"bench", store::passwordHash("bench"), false});
-    const support::BarePostgres bare("room");
-    PGconn* const connection = bare.get();
-    bare.run("INSERT INTO tintgate.tickets (type, id) SELECT 3, generate_series(1, " +
-             std::to_string(bench::jobs) + ")");
+    // Also commits in between, so that neither side can use what it fetched before.
+    const support::BarePostgres somebody("room");
+    somebody.run("INSERT INTO tintgate.tickets (type, id) SELECT 3, generate_series(1, " +
+                 std::to_string(bench::jobs) + ")");
     std::string list;
     for (const std::string key : bench::overviewKeys) {
         // Version 1, one int: 208 throughout for the status, and some small number elsewhere.
-        bare.run("INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, '" + key +
+        somebody.run("INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, '" + key +
                  "', '\\x010201000000' || set_byte('\\x00000000', 0, " +
                  (key == "Job/Display/Status" ? "208" : "id * 7919 % 100") +
                  "), 0 FROM tintgate.tickets WHERE type = 3");
         list += (list.empty() ? "'" : ", '") + key + "'";
     }
-    bare.run("CREATE TABLE bench (id int PRIMARY KEY, name bytea, value bytea);"
-             "ALTER TABLE bench ALTER value SET STORAGE EXTERNAL");
-    bare.run("ANALYZE");
+    somebody.run("CREATE TABLE bench (id int PRIMARY KEY, name bytea, value bytea);"
+                 "ALTER TABLE bench ALTER value SET STORAGE EXTERNAL");
+    somebody.run("ANALYZE");
 
+    // Which has done nothing so far, as the store's: a server process keeps memory at hand by what
+    // it has done before.
+    const support::BarePostgres bare("room");
+    PGconn* const connection = bare.get();
     CKZConnector connector(L"room", L"bench", L"bench", 0x5071103, false, false);
     check(connector.IsLoggedIn(), "the login");
     ComGUIManager& manager = *connector.getComGUIMngrInstance();
     const std::vector<double> values = bench::measuredValues(bench::elements);
-    // Somebody else commits, so that neither side can use what it fetched before.
-    const support::BarePostgres somebody("room");
     const auto touch = [&] {
         somebody.run("UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = 3 AND id = 5");
     };
