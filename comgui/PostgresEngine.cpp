@@ -68,22 +68,29 @@ constexpr Statement neededKeys = {
     "SELECT name, value FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
     " WHERE type = $1 AND id = $2"
     " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
+
+// What follows is sent before it is known whether there was a ticket to lock. It touches one only if
+// this very transaction has, so that it leaves alone one that somebody makes in between.
 constexpr Statement putOneKey = {
     "INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, $3, $4, changes"
     " FROM tintgate.tickets WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
     " ON CONFLICT (ticket, hash) DO UPDATE SET value = excluded.value, change = excluded.change"};
 constexpr Statement putKeys = {
     "INSERT INTO tintgate.keys (ticket, name, value, change)"
     " SELECT number, name, value, changes FROM tintgate.tickets,"
     " unnest($3::bytea[], $4::bytea[]) AS new (name, value) WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
     " ON CONFLICT (ticket, hash) DO UPDATE SET value = excluded.value, change = excluded.change"};
 constexpr Statement deleteKeys = {
     "DELETE FROM tintgate.keys USING tintgate.tickets"
     " WHERE ticket = number AND type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
     " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
 constexpr Statement emptyTicket = {
     "DELETE FROM tintgate.keys USING tintgate.tickets"
-    " WHERE ticket = number AND type = $1 AND id = $2"};
+    " WHERE ticket = number AND type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"};
 
 constexpr Statement allUsers = {"SELECT name, hash, disabled FROM tintgate.users ORDER BY name"};
 constexpr Statement oneUser = {"SELECT name, hash, disabled FROM tintgate.users WHERE name = $1"};
