@@ -261,6 +261,7 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
 TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     put(enlarged(delivered));
     runJobs("s1 s2s2 r1");
+    put(stored() + "<tazo:Measurement a='1'><b></tazo:Measurement>"); // Nothing to rebuild from.
     const std::string damaged = stored();
     ASSERT_EQ(measurements(damaged), "damaged");
     const auto rebuilt = json::parse(answer({"jdf", "rebuild", "7", "--json"}));

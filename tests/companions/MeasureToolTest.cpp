@@ -34,6 +34,7 @@ const std::string head = "CGATS.17\nORIGINATOR \"Nerova Verify\"\n";
 const std::string cmyk = "CMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K";
 const std::string begin = "BEGIN_DATA\n";
 const std::string end = "END_DATA\n";
+const std::string paper = "0\t0\t0\t0";
 const std::string rows = begin + "1\t100\t0\t0\t0\n2\t40\t27\t27\t0\n";
 
 std::string format(const std::string& names) {
@@ -45,15 +46,12 @@ std::string crlf(const std::string& text) {
     return std::regex_replace(text, std::regex("\n"), "\r\n");
 }
 
-/// A definition of these rows of C, M, Y, K.
-std::string definitionOf(const std::vector<double>& inks) {
-    std::ostringstream text;
-    text << head << format(cmyk) << "KEYWORD\tDEVICE\nDEVICE 33\nNUMBER_OF_SETS\t"
-         << inks.size() / 4 << "\nBEGIN_DATA\n";
-    for (std::size_t i = 0; i < inks.size(); ++i)
-        text << (i % 4 == 0 ? std::to_string(i / 4 + 1) : "") << '\t' << inks[i]
-             << (i % 4 == 3 ? "\n" : "");
-    return crlf(text.str() + "END_DATA\n");
+/// A definition of these patches, such as "100\t0\t0\t0".
+std::string definitionOf(const std::vector<std::string>& patches) {
+    std::string lines;
+    for (std::size_t i = 0; i < patches.size(); ++i)
+        lines += std::to_string(i + 1) + "\t" + patches[i] + "\n";
+    return crlf(head + format(cmyk) + "DEVICE 33\n" + begin + lines + end);
 }
 
 /// "1: 100 0 0 0; 2: 40 27 27 0; "
@@ -208,19 +206,20 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
 }
 
 TEST_F(MeasureTool, SpectraHaveTheColourMeasured) {
-    std::vector<double> steps;
+    const std::string steps[] = {"0", "50", "100"};
+    std::vector<std::string> grid;
     for (int i = 0; i < 81; ++i)
-        for (const int place : {1, 3, 9, 27})
-            steps.push_back(i / place % 3 * 50);
+        grid.push_back(steps[i / 27] + "\t" + steps[i / 9 % 3] + "\t" + steps[i / 3 % 3] + "\t" +
+                       steps[i % 3]);
     const struct {
-        std::vector<double> inks;
+        std::vector<std::string> patches;
         std::string settings;
         double least, most;
-    } cases[] = {{steps, "error = 1\n", 0, 1},
-                 {{0, 0, 0, 0}, "bias = 12 0 0\n", 1, 1.5}}; // Brighter than white, as brighteners.
-    for (const auto& [inks, settings, least, most] : cases) {
+    } cases[] = {{grid, "error = 1\n", 0, 1},
+                 {{paper}, "bias = 12 0 0\n", 1, 1.5}}; // Brighter than white, as brighteners.
+    for (const auto& [patches, settings, least, most] : cases) {
         const colour::DataSet set =
-            measured(definitionOf(inks), virtualPrint + "spectra = yes\n" + settings);
+            measured(definitionOf(patches), virtualPrint + "spectra = yes\n" + settings);
         ASSERT_EQ(set.axis.base, 380);
         ASSERT_EQ(set.axis.step, 10);
         ASSERT_EQ(set.axis.length, 36);
@@ -237,10 +236,7 @@ TEST_F(MeasureTool, SpectraHaveTheColourMeasured) {
 }
 
 TEST_F(MeasureTool, ErrorsHaveTheirSizeAndCanBeRepeated) {
-    std::vector<double> inks;
-    for (int i = 0; i < 4000; ++i)
-        inks.insert(inks.end(), {20, 15, 15, 0});
-    const std::string definition = definitionOf(inks);
+    const std::string definition = definitionOf(std::vector<std::string>(4000, "20\t15\t15\t0"));
     const colour::Lab printed = measured(definition, virtualPrint).lab[0];
     const std::string settings = virtualPrint + "error = 2\nbias = 1 -2 0.5\n";
     const colour::DataSet set = measured(definition, settings);
@@ -268,20 +264,20 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
     const std::string made = "CGATS.17\nINSTRUMENTATION \"i9\"\nMEASUREMENT_CONDITION \"M1\"\n" +
                              format(cmyk + "\t" + lab) + begin;
     const std::string two = "1 100 0 0 0 55 -37 -50\n2 40 27 27 0 60 1 2\n";
-    const std::string paper = "3 0 0 0 0 95 0 -2\n4 0 0 0 0 95 0 -3\n";
+    const std::string whites = "3 0 0 0 0 95 0 -2\n4 0 0 0 0 95 0 -3\n";
     const struct {
         const char* what;
         std::string text;
         int exitCode = 0;
         const char* words = "";
     } cases[] = {
-        {"in another order", made + paper + two + end},
+        {"in another order", made + whites + two + end},
         {"numbered anew, rounded",
-         made + "11 100 0 0 0 55 -37 -50\n12 39.6 27.4 27 0 60 1 2\n" + paper + end},
+         made + "11 100 0 0 0 55 -37 -50\n12 39.6 27.4 27 0 60 1 2\n" + whites + end},
         {"ids that are names here",
          labels + "A4 95 0 -3\nA1 55 -37 -50\nA2 60 1 2\nA3 95 0 -2\n" + end},
         {"two too few", made + two + end, 8, "2 patches where 4"},
-        {"another patch", made + "1 100 0 0 0 55 -37 -50\n2 40 27 29 0 60 1 2\n" + paper + end, 8,
+        {"another patch", made + "1 100 0 0 0 55 -37 -50\n2 40 27 29 0 60 1 2\n" + whites + end, 8,
          "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
         {"patches twice", made + two + two + end, 8, "patch 3 should be 0 0 0 0"},
         {"other ids", labels + "4 95 0 -3\n1 55 -37 -50\n2 60 1 2\n5 95 0 -2\n" + end, 8,
@@ -309,7 +305,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
 }
 
 TEST_F(MeasureTool, WaitsForANewExport) {
-    const std::string definition = definitionOf({100, 0, 0, 0});
+    const std::string definition = definitionOf({"100\t0\t0\t0"});
     const std::string names = "CGATS.17\n" + format(cmyk + "\tLAB_L\tLAB_A\tLAB_B") + begin;
     const std::string path = m_folder.write("export.txt", names + "1 100 0 0 0 11 0 0\nEND_DATA\n");
     expectFailure(measure(definition, "instrument = file\nfile = export.txt\nwait = 1\n"), 7,
@@ -328,7 +324,7 @@ TEST_F(MeasureTool, WaitsForANewExport) {
 }
 
 TEST_F(MeasureTool, IsCancelledBySignals) {
-    m_folder.write("definition.it8", definitionOf({0, 0, 0, 0}));
+    m_folder.write("definition.it8", definitionOf({paper}));
     expectFailure(
         support::run({"timeout", "--preserve-status", "0.5", MEASURE_TOOL, writeOptions()},
                      environmentWith(virtualPrint + "mishap = hang\n")),
@@ -336,7 +332,7 @@ TEST_F(MeasureTool, IsCancelledBySignals) {
 }
 
 TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
-    m_folder.write("definition.it8", definitionOf({0, 0, 0, 0}));
+    m_folder.write("definition.it8", definitionOf({paper}));
     const std::string options = support::contentsOf(writeOptions());
     const auto replaced = [&](const std::string& from, const std::string& to) {
         std::string text = options;
@@ -368,11 +364,11 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
         expectFailure(support::run({MEASURE_TOOL, path}, environmentWith(c.settings)), c.exitCode,
                       c.words);
     }
-    EXPECT_EQ(support::contentsOf(m_folder.path("definition.it8")), definitionOf({0, 0, 0, 0}));
+    EXPECT_EQ(support::contentsOf(m_folder.path("definition.it8")), definitionOf({paper}));
 }
 
 TEST_F(MeasureTool, ShowsProgressOnATerminalOnly) {
-    m_folder.write("definition.it8", definitionOf({100, 0, 0, 0, 0, 0, 0, 100}));
+    m_folder.write("definition.it8", definitionOf({"100\t0\t0\t0", "0\t0\t0\t100"}));
     const std::string command = std::string(MEASURE_TOOL) + " " + writeOptions();
     const support::Outcome outcome = support::run({"script", "-qec", command, "/dev/null"},
                                                   environmentWith(virtualPrint + "delay = 60\n"));

@@ -119,8 +119,6 @@ TEST_F(StoreTrend, ReadsTheResultsOfJobs) {
                       HasSubstr("12 November 2026, 21:53  Order 12  Solid cyan 3.60 of 3.00"),
                       Not(HasSubstr("!"))));
     EXPECT_THAT(report({"--text", "--since", "2026-11-11"}).output, HasSubstr("2 results"));
-    EXPECT_THAT(report({"--text", "--instrument", "bench"}).output, HasSubstr("12 results"));
-    EXPECT_EQ(report({"--text", "--paper", "gloss"}).exitCode, 7);
     EXPECT_EQ(report({"--store", m_folder.path("nowhere")}).exitCode, 8);
 
     // Both patches of full cyan count, and the page holds the same numbers.
