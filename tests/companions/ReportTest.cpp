@@ -1,6 +1,5 @@
 #include <algorithm>
 #include <cmath>
-#include <filesystem>
 #include <functional>
 #include <limits>
 #include <string>
@@ -12,7 +11,6 @@
 
 #include "ScratchFolder.h"
 #include "companions/report/Model.h"
-#include "companions/report/PageFile.h"
 
 namespace {
 
@@ -172,25 +170,6 @@ TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
     EXPECT_EQ(dateText(readMeta(meta, problem)->created), "1 May 2024, 12:34 (UTC+02:00)");
     for (const char* other : {"../../../../etc/cron.d/xxx", "2024-05-01T12:34:56Z", ""})
         EXPECT_FALSE(readMeta(with(meta, time, other), problem)) << other;
-}
-
-TEST(KeepPage, OverwritesNothingAndLeavesNothingBehind) {
-    const support::ScratchFolder folder;
-    std::string problem;
-    const std::string first = keepPage(folder.path(), "page", "one", problem);
-    EXPECT_EQ(first, folder.path("page.html"));
-    EXPECT_EQ(keepPage(folder.path(), "page", "two", problem), folder.path("page-2.html"));
-    EXPECT_EQ(keepPage(folder.path(), "page", "one", problem), first);
-    EXPECT_EQ(support::contentsOf(first), "one");
-    EXPECT_EQ(support::modeOf(first) & 0444, 0444u);
-
-    folder.makeFolder("taken.html");
-    EXPECT_FALSE(replacePage(folder.path("taken.html"), "x", problem));
-    EXPECT_TRUE(replacePage(first, "three", problem));
-    EXPECT_EQ(support::contentsOf(first), "three");
-    EXPECT_EQ(keepPage(folder.path("missing"), "page", "x", problem), "");
-    EXPECT_THAT(problem, HasSubstr("No such file"));
-    EXPECT_EQ(std::distance(std::filesystem::directory_iterator(folder.path()), {}), 3);
 }
 
 } // namespace

@@ -40,6 +40,7 @@ class ReportProgram : public testing::Test {
 TEST_F(ReportProgram, MakesTheVeryPageOfTheViewer) {
     const std::string page = m_scratch.path("report-strip2-2024-05-01-123456.html");
     EXPECT_EQ(report({m_result}).output, page + "\n");
+    EXPECT_EQ(support::modeOf(page) & 0444, 0444u);
     const std::string text = support::contentsOf(page);
     fs::remove(page);
     ASSERT_EQ(support::run({VIEWER, "-meta", m_meta}).exitCode, 0);
