@@ -69,8 +69,8 @@ constexpr Statement neededKeys = {
     " WHERE type = $1 AND id = $2"
     " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
 
-// What follows is sent before it is known whether there was a ticket to lock. It touches one only if
-// this very transaction has, so that it leaves alone one that somebody makes in between.
+// What follows is sent before it is known whether there was a ticket to lock. It touches one only
+// if this very transaction has, so that it leaves alone one that somebody makes in between.
 constexpr Statement putOneKey = {
     "INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, $3, $4, changes"
     " FROM tintgate.tickets WHERE type = $1 AND id = $2"
@@ -87,10 +87,9 @@ constexpr Statement deleteKeys = {
     " WHERE ticket = number AND type = $1 AND id = $2"
     " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
     " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
-constexpr Statement emptyTicket = {
-    "DELETE FROM tintgate.keys USING tintgate.tickets"
-    " WHERE ticket = number AND type = $1 AND id = $2"
-    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"};
+constexpr Statement emptyTicket = {"DELETE FROM tintgate.keys USING tintgate.tickets"
+                                   " WHERE ticket = number AND type = $1 AND id = $2"
+                                   " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"};
 
 constexpr Statement allUsers = {"SELECT name, hash, disabled FROM tintgate.users ORDER BY name"};
 constexpr Statement oneUser = {"SELECT name, hash, disabled FROM tintgate.users WHERE name = $1"};
@@ -262,8 +261,8 @@ class PostgresEngine : public StoreEngine {
             }
             return true;
         }
-        const auto results = writes ? transaction.commit() : transaction.finish();
-        return results[0].rows() != 0;
+        const auto locked = writes ? transaction.commit() : transaction.finish();
+        return locked[0].rows() != 0;
     }
 
     std::vector<User> users() override {

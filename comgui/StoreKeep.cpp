@@ -206,15 +206,14 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
         return exists(type, id);
     }
     try {
-        if (m_engine->change(type, id, scopeOf(table),
-                             [&](TicketContent& content) { content.apply(table); })) {
-            return true;
+        const bool done = orElse(false, [&] {
+            return m_engine->change(type, id, scopeOf(table),
+                                    [&](TicketContent& content) { content.apply(table); });
+        });
+        if (!done) {
+            clearResults(table);
         }
-        clearResults(table);
-        return false;
-    } catch (const StoreFailure&) {
-        clearResults(table);
-        return false;
+        return done;
     } catch (...) {
         clearResults(table);
         throw;

@@ -147,8 +147,8 @@ void TicketContent::apply(SETMULTIPAR* table) {
             }
             auto& elements = application.at(record->key);
             if (!elements && record->value != nullptr && beginsArray(record)) {
-                elements = numberSize(record->type) == 8 ? takeArray<8>(record)
-                                                         : takeArray<4>(record);
+                elements =
+                    numberSize(record->type) == 8 ? takeArray<8>(record) : takeArray<4>(record);
             } else {
                 record->result =
                     setElement(elements, record->type, record->value, record->position) ? 1 : 0;

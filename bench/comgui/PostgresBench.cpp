@@ -92,10 +92,10 @@ int main() {
     std::string list;
     for (const std::string key : bench::overviewKeys) {
         // Version 1, one int: 208 throughout for the status, and some small number elsewhere.
-        somebody.run("INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, '" + key +
-                 "', '\\x010201000000' || set_byte('\\x00000000', 0, " +
-                 (key == "Job/Display/Status" ? "208" : "id * 7919 % 100") +
-                 "), 0 FROM tintgate.tickets WHERE type = 3");
+        somebody.run("INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, '" +
+                     key + "', '\\x010201000000' || set_byte('\\x00000000', 0, " +
+                     (key == "Job/Display/Status" ? "208" : "id * 7919 % 100") +
+                     "), 0 FROM tintgate.tickets WHERE type = 3");
         list += (list.empty() ? "'" : ", '") + key + "'";
     }
     somebody.run("CREATE TABLE bench (id int PRIMARY KEY, name bytea, value bytea);"
