@@ -46,15 +46,10 @@ inline int endOf(pid_t child) {
 
 /// All that is in a ticket, in the words of TicketText.h.
 inline std::string contentText(const store::TicketContent& content) {
-    std::string text;
-    content.walk(
-        [](void* to, const char* key, PARAM_TYPE type, const void* value, int position) {
-            auto& text = *static_cast<std::string*>(to);
-            text += (text.empty() ? "" : " ") + support::recordText(key, type, value, position);
-            return true;
-        },
-        &text);
-    return text;
+    std::vector<SETMULTIPAR> table;
+    content.walk(support::collect, &table);
+    table.emplace_back();
+    return support::tableText(table.data());
 }
 
 enum class Engine { Sqlite, Postgres };

@@ -6,28 +6,45 @@
 #include <string>
 #include <vector>
 
+#include <gtest/gtest.h>
+
+#include "TicketText.h"
 #include "comgui/MemoryKeep.h"
 #include "comgui/TicketContainer.h"
 #include "comgui/WorkTickets.h"
 #include "ticket/SingleTicket.h"
 #include "ticket/TicketContainer.h"
 #include "ticket/TicketFactory.h"
+#include "ticket/TicketUpdateList.h"
+
+constexpr int jobs = 3; ///< The type of a server's tickets.
 
 /// A work ticket, addressed by its own record.
 class WorkTicket {
   public:
-    WorkTicket() {
+    explicit WorkTicket(const std::string& content = "") {
         hSTicketInstance = store::ticketFactory();
         m_real = CreateTicket(nullptr);
         record = *m_real;
+        EXPECT_EQ(send(content).find('0'), std::string::npos) << content;
     }
-    ~WorkTicket() { DestroyTicket(m_real); }
+    ~WorkTicket() { destroy(); }
+    void destroy() { DestroyTicket(m_real); }
     WorkTicket(const WorkTicket&) = delete;
     WorkTicket& operator=(const WorkTicket&) = delete;
 
     const STICKET_MODIFY& view() const { return ticket::as<STICKET_MODIFY>(record); }
     /// The engine's own record, which is what a transfer takes as a source.
     const STICKET_ACCESS* real() const { return m_real; }
+
+    /// Sends a table; its records' results.
+    std::string send(const std::string& records) const {
+        support::RecordTable table(records);
+        table.records()->result = 1;
+        view().SetMultiParameter(table.records());
+        return support::resultText(table.records());
+    }
+    std::string content() const { return support::ticketText(m_real); }
 
     template<class Call>
     auto with(Call call) const {
@@ -40,24 +57,56 @@ class WorkTicket {
     const STICKET_ACCESS* m_real;
 };
 
-/// A container with an empty ticket 12 of type 3, addressed through the container.
-class TicketInside {
+/// A session with a server.
+class Server {
   public:
-    static constexpr int type = 3;
-    static constexpr int id = 12;
-
-    TicketInside() : engine(std::make_shared<store::MemoryKeep>()), record(*engine.access()) {
-        engine.createWithKeys(type, id, nullptr);
+    explicit Server(std::shared_ptr<store::TicketKeep> keep = std::make_shared<store::MemoryKeep>())
+        : engine(std::move(keep)), record(*engine.access()) {
+        hSTicketInstance = store::ticketFactory();
     }
 
     const MTICKET_ADMIN& view() const { return ticket::as<MTICKET_ADMIN>(record); }
 
-    /// Calls with the view, and type and id behind it.
-    template<class Call>
-    auto with(Call call) const {
-        return call(view(), type, id);
+    void create(int id, const std::string& content = "") {
+        engine.createWithKeys(jobs, id, nullptr);
+        engine.apply(jobs, id, support::RecordTable(content).records());
     }
+    std::string send(int id, const std::string& records, int type = jobs) const {
+        support::RecordTable table(records);
+        table.records()->result = 1;
+        const bool taken = view().SetMultiParameter(type, id, table.records());
+        return (taken ? "taken " : "refused ") + support::resultText(table.records());
+    }
+    std::string content(int id) { return support::ticketText(engine.open(jobs, id)); }
 
     store::TicketContainer engine;
     MTICKET_ACCESS record;
 };
+
+/// An empty ticket 12 of a server, addressed through its container.
+class TicketInside : public Server {
+  public:
+    static constexpr int id = 12;
+
+    TicketInside() { create(id); }
+
+    std::string send(const std::string& records) const { return Server::send(id, records); }
+    std::string content() { return Server::content(id); }
+
+    /// Calls with the view, and type and id behind it.
+    template<class Call>
+    auto with(Call call) const {
+        return call(view(), jobs, id);
+    }
+};
+
+/// Sets and deletions as RecordTable reads them; false as soon as one is refused.
+inline bool edit(TICKET_UPDATE_LIST& list, int type, int id, const std::string& edits) {
+    support::RecordTable table(edits);
+    const SETMULTIPAR* r = table.records();
+    while (r->key != nullptr &&
+           list.xSetParameter(type, id, r->key, r->type, r->value, r->position, false)) {
+        ++r;
+    }
+    return r->key == nullptr;
+}

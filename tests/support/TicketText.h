@@ -71,15 +71,11 @@ inline std::string valueText(PARAM_TYPE type, const void* value) {
     }
 }
 
-inline std::string recordText(const char* key, PARAM_TYPE type, const void* value, int position) {
-    return std::string(key) + "[" + std::to_string(position) + "]=" + valueText(type, value);
-}
-
 inline std::string tableText(const SETMULTIPAR* table) {
     std::string text;
     for (; table != nullptr && table->key != nullptr; ++table) {
-        text += (text.empty() ? "" : " ") +
-                recordText(table->key, table->type, table->value, table->position);
+        text += (text.empty() ? "" : " ") + std::string(table->key) + "[" +
+                std::to_string(table->position) + "]=" + valueText(table->type, table->value);
     }
     return text;
 }
@@ -93,20 +89,25 @@ inline std::string resultText(const SETMULTIPAR* table) {
     return text;
 }
 
-/// All that a walk shows of a ticket; "null" for none.
+/// The callback of a walk whose context is a vector of records.
+inline bool collect(void* records, const char* key, PARAM_TYPE type, const void* value,
+                    int position) {
+    static_cast<std::vector<SETMULTIPAR>*>(records)->push_back(
+        {.key = key, .type = type, .value = value, .position = position});
+    return true;
+}
+
+/// What a walk shows of a ticket, as a table.
+inline std::vector<SETMULTIPAR> walked(const STICKET_ACCESS& access) {
+    std::vector<SETMULTIPAR> table;
+    ticket::single::Walk::call(access, collect, static_cast<void*>(&table), "", 8000);
+    table.emplace_back();
+    return table;
+}
+
+/// The same in words; "null" for none.
 inline std::string ticketText(const STICKET_ACCESS* access) {
-    if (access == nullptr) {
-        return "null";
-    }
-    std::string text;
-    const SCollect collect = [](void* context, const char* key, PARAM_TYPE type, const void* value,
-                                int position) {
-        auto& out = *static_cast<std::string*>(context);
-        out += (out.empty() ? "" : " ") + recordText(key, type, value, position);
-        return true;
-    };
-    ticket::single::Walk::call(*access, collect, static_cast<void*>(&text), "", 8000);
-    return text;
+    return access == nullptr ? "null" : tableText(walked(*access).data());
 }
 
 /// A table made of text, with all that it points to.

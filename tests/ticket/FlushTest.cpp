@@ -1,9 +1,7 @@
 #include <optional>
 #include <random>
 
-#include <gtest/gtest.h>
-
-#include "Server.h"
+#include "RealTickets.h"
 #include "ticket/TicketDifference.h"
 
 namespace {

@@ -4,10 +4,7 @@
 #include <climits>
 #include <cmath>
 
-#include <gtest/gtest.h>
-
 #include "RealTickets.h"
-#include "TicketText.h"
 
 namespace {
 
@@ -19,20 +16,8 @@ using Texts = std::vector<std::string>;
         return view.NAME(address... __VA_OPT__(, ) __VA_ARGS__);                                   \
     })
 
-std::string content(const WorkTicket& ticket) {
-    return support::ticketText(ticket.real());
-}
-std::string content(const TicketInside& ticket) {
-    return support::ticketText(ticket.view().OpenTicket(TicketInside::type, TicketInside::id));
-}
-
 template<class Place>
-class TicketFamilies : public testing::Test {
-  protected:
-    void fill(const std::string& content) {
-        EXPECT_TRUE(ON(place, SetMultiParameter, support::RecordTable(content).records()));
-    }
-
+struct TicketFamilies : testing::Test {
     Place place;
 };
 using Places = testing::Types<WorkTicket, TicketInside>;
@@ -43,7 +28,7 @@ template<class T, class Place>
 void roundTrip(Place& place, const std::vector<T>& values, const std::string& text) {
     std::vector<T> read;
     EXPECT_TRUE(ON(place, SetVectorParameter, "k", values));
-    EXPECT_EQ(content(place), text);
+    EXPECT_EQ(place.content(), text);
     EXPECT_TRUE(ON(place, GetVectorParameter, "k", read));
     EXPECT_EQ(read, values);
     if constexpr (!std::is_same_v<T, std::string>) {
@@ -52,7 +37,7 @@ void roundTrip(Place& place, const std::vector<T>& values, const std::string& te
         EXPECT_TRUE(std::equal(values.begin(), values.end(), array));
         EXPECT_TRUE(ON(place, DelParameter, "k", POSITION_WHOLE));
         EXPECT_TRUE(ON(place, SetArrayParameter, "k", array, values.size()));
-        EXPECT_EQ(content(place), text);
+        EXPECT_EQ(place.content(), text);
     }
 }
 
@@ -69,12 +54,12 @@ TYPED_TEST(TicketFamilies, EveryTypeComesBackAsItWent) {
 
     // A null text is refused alone.
     EXPECT_FALSE(ON(place, SetVectorParameter, "k", std::vector<const char*>{"c", nullptr, "k"}));
-    EXPECT_EQ(content(place), "k[0]='c k[2]='k");
+    EXPECT_EQ(place.content(), "k[0]='c k[2]='k");
     // A bool is sent as its bit 0, and any integer but 0 is true.
     const unsigned char bytes[] = {3, 2};
     EXPECT_TRUE(ON(place, SetArrayParameter, "k", reinterpret_cast<const bool*>(bytes), 2UL));
-    EXPECT_EQ(content(place), "k[0]=1 k[1]=0");
-    this->fill("k=2,0,-1");
+    EXPECT_EQ(place.content(), "k[0]=1 k[1]=0");
+    place.send("k=2,0,-1");
     std::vector<bool> flags;
     EXPECT_TRUE(ON(place, GetVectorParameter, "k", flags));
     EXPECT_EQ(flags, (std::vector<bool>{true, false, true}));
@@ -82,7 +67,7 @@ TYPED_TEST(TicketFamilies, EveryTypeComesBackAsItWent) {
 
 TYPED_TEST(TicketFamilies, HolesCloseUpInAVectorAndFailAnArray) {
     TypeParam& place = this->place;
-    this->fill("key=10,0.5,12");
+    place.send("key=10,0.5,12");
     std::vector<int> vector;
     EXPECT_TRUE(ON(place, GetVectorParameter, "key", vector));
     EXPECT_EQ(vector, (std::vector<int>{10, 12}));
@@ -117,11 +102,11 @@ TYPED_TEST(TicketFamilies, AMissingKeyLeavesNumbersAndEmptiesTexts) {
 
 TYPED_TEST(TicketFamilies, NoElementsDeleteTheKeyButForBooleanArrays) {
     TypeParam& place = this->place;
-    this->fill("a[-1]=1 b[-1]=2 c[-1]=3");
+    place.send("a[-1]=1 b[-1]=2 c[-1]=3");
     EXPECT_TRUE(ON(place, SetVectorParameter, "a", Texts()));
     EXPECT_TRUE(ON(place, SetArrayParameter, "b", static_cast<const int*>(nullptr), 0UL));
     EXPECT_TRUE(ON(place, SetArrayParameter, "c", static_cast<const bool*>(nullptr), 0UL));
-    EXPECT_EQ(content(place), "c[0]=3");
+    EXPECT_EQ(place.content(), "c[0]=3");
     // A refused deletion is not looked at. Keys that end in * are refused by the engine.
     EXPECT_TRUE(ON(place, SetVectorParameter, "refused*", Texts()));
     EXPECT_FALSE(ON(place, SetVectorParameter, "refused*", std::vector<int>{1}));
@@ -130,8 +115,8 @@ TYPED_TEST(TicketFamilies, NoElementsDeleteTheKeyButForBooleanArrays) {
 TYPED_TEST(TicketFamilies, FileNamesHaveForwardSlashesOnBothWays) {
     TypeParam& place = this->place;
     EXPECT_TRUE(ON(place, SetFilenameVectorParameter, "sent", Texts{"C:\\a.tif", "/b.tif"}));
-    EXPECT_EQ(content(place), "sent[0]='C:/a.tif sent[1]='/b.tif");
-    this->fill("raw[-1]='C:\\a.tif raw[1]='/b.tif");
+    EXPECT_EQ(place.content(), "sent[0]='C:/a.tif sent[1]='/b.tif");
+    place.send("raw[-1]='C:\\a.tif raw[1]='/b.tif");
     Texts read;
     std::string name;
     EXPECT_TRUE(ON(place, GetFilenameVectorParameter_C, "raw", read));

@@ -1,6 +1,4 @@
-#include <gtest/gtest.h>
-
-#include "Server.h"
+#include "RealTickets.h"
 
 namespace {
 
