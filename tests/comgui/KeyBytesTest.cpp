@@ -1,11 +1,6 @@
 #include "comgui/KeyBytes.h"
 
-#include <gtest/gtest.h>
-
-#include <cstdint>
-#include <string>
-
-#include "TicketText.h"
+#include "StoreTest.h"
 #include "comgui/TicketContent.h"
 
 namespace {
@@ -17,7 +12,7 @@ std::shared_ptr<const store::Elements> made(const std::string& records) {
     return content.find("k");
 }
 
-/// All elements, and behind them what each type and position reads.
+/// What each type and position reads, and behind that all elements.
 std::string shown(const store::Elements& elements) {
     store::HandedOut handedOut;
     std::string all;
@@ -30,22 +25,9 @@ std::string shown(const store::Elements& elements) {
             all += !found ? "x" : isNumber ? std::to_string(place[0]) : "text";
         }
     }
-    elements.visit([&](int position, const store::Value& value) {
-        all += " " +
-               support::recordText("k", store::typeOf(value), store::valuePointer(value), position);
-        return true;
-    });
-    return all;
-}
-
-std::string bytes(const std::string& hexadecimal) {
-    std::string result;
-    for (std::size_t i = 0; i + 1 < hexadecimal.size(); i += hexadecimal[i] == ' ' ? 1 : 2) {
-        if (hexadecimal[i] != ' ') {
-            result += static_cast<char>(std::stoi(hexadecimal.substr(i, 2), nullptr, 16));
-        }
-    }
-    return result;
+    store::TicketContent content;
+    content.put("k", std::make_shared<store::Elements>(elements));
+    return all + contentText(content);
 }
 
 } // namespace
@@ -65,8 +47,8 @@ TEST(KeyBytes, BringsBackEveryTypeAndHole) {
 
 TEST(KeyBytes, AreTheDocumentedOnes) {
     EXPECT_EQ(store::keyBytes(*made("k=1,258,-1 k[5]='hi")),
-              bytes("01 02 03000000 01000000 02010000 ffffffff 00 02000000"
-                    "04 01000000 0200000000000000 6869"));
+              support::bytesOf("01 02 03000000 01000000 02010000 ffffffff 00 02000000"
+                               "04 01000000 0200000000000000 6869"));
 }
 
 TEST(KeyBytes, RefusesWhatItWouldNotHaveWritten) {
@@ -85,6 +67,6 @@ TEST(KeyBytes, RefusesWhatItWouldNotHaveWritten) {
              "01 04 01000000 0300000000000000 610062",       // a text with a zero byte
              "01 02 01000000 01000000 ff",                   // something behind
          }) {
-        EXPECT_EQ(store::elementsFromBytes(bytes(hexadecimal)), nullptr) << hexadecimal;
+        EXPECT_EQ(store::elementsFromBytes(support::bytesOf(hexadecimal)), nullptr) << hexadecimal;
     }
 }

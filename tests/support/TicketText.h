@@ -27,6 +27,17 @@
 
 namespace support {
 
+/// Of hexadecimal digits, two a byte; blanks between bytes are passed over.
+inline std::string bytesOf(const std::string& digits) {
+    std::string bytes;
+    for (std::size_t i = 0; i + 1 < digits.size(); i += digits[i] == ' ' ? 1 : 2) {
+        if (digits[i] != ' ') {
+            bytes += static_cast<char>(std::stoi(digits.substr(i, 2), nullptr, 16));
+        }
+    }
+    return bytes;
+}
+
 inline std::string valueText(PARAM_TYPE type, const void* value) {
     if (type == PARAM_DELETE) {
         return "-";
@@ -191,14 +202,6 @@ class RecordTable {
         const auto owned = std::make_shared<const T>(std::move(value));
         m_owned.push_back(owned);
         return owned.get();
-    }
-
-    static std::string bytesOf(const std::string& digits) {
-        std::string bytes;
-        for (std::size_t i = 0; i + 1 < digits.size(); i += 2) {
-            bytes += static_cast<char>(std::stoi(digits.substr(i, 2), nullptr, 16));
-        }
-        return bytes;
     }
 
     std::vector<SETMULTIPAR> m_records;
