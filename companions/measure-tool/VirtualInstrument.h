@@ -11,9 +11,9 @@
 
 namespace measuring {
 
-/// Prints what the profile says, absolute colorimetric, and adds Settings::bias and an error to each
-/// patch. Errors follow a fixed sequence, a row after the other, so that equal settings measure
-/// equal values.
+/// Prints what the profile says, absolute colorimetric, and adds Settings::bias and an error to
+/// each patch. Errors follow a fixed sequence, a row after the other, so that equal settings
+/// measure equal values.
 class VirtualInstrument : public Instrument {
   public:
     /// `name` is that of the instrument that it stands for; may be empty. The chart outlives it.
