@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <chrono>
 #include <fstream>
+#include <sstream>
 #include <thread>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
@@ -36,7 +37,7 @@ TEST_F(ConnectorTest, LogsInStepByStep) {
     connector.reset();
     EXPECT_THAT(takeCalls(), ElementsAre("10", "11"));
 
-    plugIn->set(0, 0, "System/Product/MajorVersion", 4); // Too old: it is left at once.
+    plugIn->set(0, 0, "System/Product/MajorVersion=4"); // Too old: it is left at once.
     connector = connect();
     EXPECT_FALSE(connector->IsLoggedIn());
     EXPECT_EQ(connector->getLastRetCode(), 0);
@@ -68,8 +69,7 @@ TEST_F(ConnectorTest, ReadsValuesWithDefaults) {
 
 TEST_F(ConnectorTest, ReadsArraysUpToAMaximum) {
     const auto connector = connect();
-    double given[] = {1, 2, 3, 4, 5};
-    EXPECT_TRUE(connector->SetJobArrayParameter(3, job, "d", PARAM_DOUBLE, 5, given));
+    plugIn->set(3, job, "d=1.0,2.0,3.0,4.0,5.0 t='a,9");
     double values[6] = {};
     int count = 9;
     const auto read = [&](const char* key, PARAM_TYPE type, int maximum) {
@@ -82,8 +82,6 @@ TEST_F(ConnectorTest, ReadsArraysUpToAMaximum) {
     EXPECT_LT(read("d", PARAM_DOUBLE, -1), 1);
 
     // Texts up to one that is missing are handed out, though the read failed.
-    plugIn->set(3, job, "t", "a");
-    plugIn->set(3, job, "t", PARAM_INT, &count, 1);
     std::vector<std::string> strings = {"before"};
     EXPECT_EQ(connector->GetJobTicketStringArray(3, job, "t", &strings), -1);
     EXPECT_THAT(strings, ElementsAre("before", "a"));
@@ -93,17 +91,17 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
     const auto connector = connect();
     const struct {
         int id, displayStatus, fileType, showInVerifier, verifyActive;
-    } jobs[] = {{20, 208, 1, 0, 3}, {21, 208, 4096, 0, 3}, {22, 208, 1, 0, 1},
-                {23, 209, 1, 0, 0}, {24, 212, 4096, 0, 0}, {25, 213, 1, 1, 0},
-                {26, 207, 1, 0, 3}, {27, 212, 1, 1, 0}};
+    } tickets[] = {{20, 208, 1, 0, 3}, {21, 208, 4096, 0, 3}, {22, 208, 1, 0, 1},
+                   {23, 209, 1, 0, 0}, {24, 212, 4096, 0, 0}, {25, 213, 1, 1, 0},
+                   {26, 207, 1, 0, 3}, {27, 212, 1, 1, 0}};
     // Job 12 holds nothing: it is judged by the one before it, but for verify active.
     const int ids[] = {20, job, 21, 22, 23, 24, 25, 26, 27};
-    for (const auto& [id, displayStatus, fileType, showInVerifier, verifyActive] : jobs) {
-        plugIn->tickets().CreateOrOpenTicket(3, id, nullptr);
-        plugIn->set(3, id, "Job/Display/Status", displayStatus);
-        plugIn->set(3, id, "Input/FileType", fileType);
-        plugIn->set(3, id, "Remote/ShowInVerifier", showInVerifier);
-        plugIn->set(3, id, "Workflow/Verify/Active", verifyActive);
+    for (const auto& [id, displayStatus, fileType, showInVerifier, verifyActive] : tickets) {
+        std::ostringstream records;
+        records << "Job/Display/Status=" << displayStatus << " Input/FileType=" << fileType
+                << " Remote/ShowInVerifier=" << showInVerifier
+                << " Workflow/Verify/Active=" << verifyActive;
+        plugIn->set(3, id, records.str());
     }
     const struct {
         bool remeasure;
@@ -112,17 +110,14 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
         std::vector<int> found;
     } cases[] = {
         {false, 9, 9, 0, 0, {20, job, 22, 25, 27}},
-        {true, 9, 9, 0, 0, {20, 21, 23, 27}},
         {true, 9, 1000, 0, 0, {20, 21, 23, 27}},
         {true, 9, 1, 0, 0, {20}},
         {true, 9, 0, 0, 0, {}},
         {true, 9, 9, 1, -1, {}},
         {true, 0, 9, 0, -1, {}},
-        {true, -1, 9, 0, -1, {}},
         {true, 0x7FFFFFFF, 9, 0, -1, {}},
     };
     for (const auto& [remeasure, counted, written, code, result, expected] : cases) {
-        SCOPED_TRACE(testing::Message() << counted << " counted, " << written << " written");
         plugIn->onCall = [&, counted = counted, written = written, code = code](int slot) {
             if (slot == 13 && *plugIn->size == 4) {
                 *static_cast<int*>(plugIn->data) = counted;
@@ -135,7 +130,7 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
         int* found = nullptr;
         int count = 9;
         EXPECT_EQ(connector->GetVerifierJobTicketIDs(&found, &count, remeasure), result);
-        EXPECT_EQ(std::vector<int>(found, found + count), expected);
+        EXPECT_EQ(std::vector<int>(found, found + count), expected) << counted << ", " << written;
         EXPECT_TRUE(count > 0 || found == nullptr || code != 0);
         std::free(found);
         plugIn->results.clear();

@@ -29,7 +29,7 @@ class CommTest : public testing::Test {
         const std::string path = bundle + "/Contents/MacOS/" SCRIPTED_PLUGIN_NAME;
         plugIn = reinterpret_cast<ScriptedPlugIn* (*)()>(
             dlsym(dlopen(path.c_str(), RTLD_NOW | RTLD_LOCAL), "scriptedPlugIn"))();
-        plugIn->tickets().CreateOrOpenTicket(3, job, nullptr);
+        plugIn->set(3, job, "");
     }
 
     /// The calls since the last time.

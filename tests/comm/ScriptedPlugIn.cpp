@@ -11,8 +11,7 @@
 ScriptedPlugIn::ScriptedPlugIn() {
     static store::TicketContainer engine(std::make_shared<store::MemoryKeep>());
     access = *engine.access();
-    engine.createWithKeys(0, 0, nullptr);
-    set(0, 0, "System/Product/MajorVersion", 5);
+    set(0, 0, "System/Product/MajorVersion=5");
 }
 
 EXPORTED ScriptedPlugIn* scriptedPlugIn() {
@@ -25,29 +24,25 @@ namespace {
 constexpr std::uint64_t handle = 0x8877665544332211;
 int instanceWord = 0;
 
-std::string shown(int number) {
-    return " " + std::to_string(number);
-}
-std::string shown(const char* text) {
-    return std::string(" ") + (text == nullptr ? "(null)" : text);
-}
-std::string shown(std::uint64_t session) {
-    return session == handle ? "" : " ?";
-}
-std::string shown(ComSessionRecord* record) {
-    scriptedPlugIn()->record = *record;
-    record->session = handle;
-    return "";
-}
-std::string shown(int* size) {
-    scriptedPlugIn()->size = size;
-    return size == nullptr ? "" : shown(*size);
-}
-std::string shown(void* data) {
-    scriptedPlugIn()->data = data;
-    return "";
-}
-std::string shown(TJobIdentification*) {
+/// An argument as a call shows it. The last record, size and data are kept.
+template<class Argument>
+std::string shown(Argument argument) {
+    ScriptedPlugIn& plugIn = *scriptedPlugIn();
+    if constexpr (std::is_same_v<Argument, std::uint64_t>) {
+        return argument == handle ? "" : " ?";
+    } else if constexpr (std::is_same_v<Argument, int>) {
+        return " " + std::to_string(argument);
+    } else if constexpr (std::is_same_v<Argument, const char*>) {
+        return std::string(" ") + (argument == nullptr ? "(null)" : argument);
+    } else if constexpr (std::is_same_v<Argument, int*>) {
+        plugIn.size = argument;
+        return argument == nullptr ? "" : shown(*argument);
+    } else if constexpr (std::is_same_v<Argument, ComSessionRecord*>) {
+        plugIn.record = *argument;
+        argument->session = handle;
+    } else if constexpr (std::is_same_v<Argument, void*>) {
+        plugIn.data = argument;
+    }
     return "";
 }
 

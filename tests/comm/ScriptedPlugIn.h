@@ -8,8 +8,8 @@
 #include <vector>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
+#include "TicketText.h"
 #include "ticket/TicketContainer.h"
-#include "ticket/TicketSlots.h"
 
 struct ScriptedPlugIn {
     /// Each with its texts and integers: "26 host 50005". Instance and session are not shown if
@@ -29,14 +29,9 @@ struct ScriptedPlugIn {
 
     ScriptedPlugIn();
     const MTICKET_ADMIN& tickets() const { return ticket::as<MTICKET_ADMIN>(access); }
-    void set(int type, int id, const char* key, PARAM_TYPE ptype, const void* value,
-             int position = POSITION_WHOLE) const {
-        ticket::Contained(access, type, id).set(key, ptype, value, position);
-    }
-    void set(int type, int id, const char* key, int value) const {
-        set(type, id, key, PARAM_INT, &value);
-    }
-    void set(int type, int id, const char* key, const char* value) const {
-        set(type, id, key, PARAM_STRING, value);
+    /// Sends a table, in the words of TicketText.h, to a ticket that is made where there is none.
+    void set(int type, int id, const std::string& records) const {
+        tickets().CreateOrOpenTicket(type, id, nullptr);
+        tickets().SetMultiParameter(type, id, support::RecordTable(records).records());
     }
 };
