@@ -1,4 +1,3 @@
-#include <optional>
 #include <random>
 
 #include "RealTickets.h"
@@ -15,19 +14,13 @@ class Recorder : public Server {
         create(12, "a[-1]=1");
     }
 
-    std::string sent;          ///< Tables as "type/id records;".
-    std::optional<int> answer; ///< In place of the engine's, which then does nothing.
-    std::uint8_t firstResult = 0;
+    std::string sent; ///< Tables as "type/id records;".
 
   private:
     static int take(void*, int type, int id, SETMULTIPAR* table) {
         Recorder& self = *s_recorder;
         self.sent +=
             std::to_string(type) + "/" + std::to_string(id) + " " + support::tableText(table) + ";";
-        if (self.answer) {
-            table->result = self.firstResult;
-            return *self.answer;
-        }
         return self.engine.apply(type, id, table) ? 1 : 0;
     }
 
@@ -39,44 +32,38 @@ TEST(Flush, SendsTheDifferenceAlone) {
     const std::string other =
         "a[-1]=u4294967295 b[-1]=l-4294967298 c[-1]=U4 d[-1]=p5 e[-1]=0.25 f[-1]='text";
     const std::string unequal = "b[-1]=#00ff c[-1]=1 d[-1]=nan e[-1]=inf";
-    struct Case {
+    const struct {
         std::string present, edits, sent;
-    };
-    const Case cases[] = {
+    } cases[] = {
         {each, each, ""},
         {each, other, other},
-        {"a[-1]=5 b[-1]=1", "b[-1]=1 a[-1]='5", "a[-1]='5"},
         // Single elements, where they are fewer than the whole.
         {"a=1,2,3,4,5", "a[0]=9 a[4]='x", "a[0]=9 a[4]='x"},
-        {"a=1,2,3,4,5", "a[3]=9 a[3]=4", ""},
         {"a=1,2,3", "a[3]=4 a[4]=5", "a[3]=4 a[4]=5"},
         {"a=1,2,3,4,5", "a[4]=- a[3]=-", "a[4]=- a[3]=-"},
         {"a=1,2,3,4,5", "a[1]=-", "a[-1]=1 a[1]=3 a[2]=4 a[3]=5"},
         {"a=1,2,3,4,5", "a[2]=-", "a[2]=4 a[3]=5 a[4]=-"},
         {"a=1,2,3", "a[-1]=1 a[2]=2", "a[2]=2"}, // The same value at another position.
-        // A scalar, or a vector of one, is always sent whole.
+        // A scalar is always sent whole.
         {"a[-1]=1", "a[1]=2", "a[-1]=1 a[1]=2"},
-        {"a=1,2,3", "a[-1]=1", "a[-1]=1"},
         // Far positions are counted, not walked.
         {"a[-1]=1 a[1]=2 a[16777215]=3", "a[-1]=1 a[1]=9", "a[-1]=1 a[1]=9"},
         // Deleted keys.
         {"a[-1]=1 c[-1]=3", "c[-1]=- b[-1]=- a[-1]=-", "a[-1]=- c[-1]=-"},
-        {"a[-1]=1", "a[-1]=- a[-1]=1", ""},
         {"a=1,2", "a[1]=- a[0]=-", "a[-1]=-"},
         // What never equals itself is sent with the whole ticket, but not beside a deleted key.
         {unequal, "c[-1]=2", "b[-1]=#00ff c[-1]=2 d[-1]=nan e[-1]=nan"},
         {unequal, "c[-1]=-", "c[-1]=-"},
     };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(c.present + " | " + c.edits);
+    for (const auto& [present, edits, sent] : cases) {
         Recorder server;
-        server.create(13, c.present);
+        server.create(13, present);
         TICKET_UPDATE_LIST list(&server.record);
-        edit(list, jobs, 13, c.edits);
+        edit(list, jobs, 13, edits);
         unsigned long count = 99;
-        EXPECT_EQ(list.FlushToContainer(&server.record, &count, {}), !c.sent.empty());
-        EXPECT_EQ(server.sent, c.sent.empty() ? "" : "3/13 " + c.sent + ";");
-        EXPECT_EQ(count, static_cast<unsigned long>(std::ranges::count(c.sent, '=')));
+        EXPECT_EQ(list.FlushToContainer(&server.record, &count, {}), !sent.empty());
+        EXPECT_EQ(server.sent, sent.empty() ? "" : "3/13 " + sent + ";") << present << " " << edits;
+        EXPECT_EQ(count, static_cast<unsigned long>(std::ranges::count(sent, '=')));
         EXPECT_TRUE(list.FlushToContainer(&server.record, &count, {})); // Nothing is left.
         EXPECT_EQ(count, 0u);
     }
@@ -155,7 +142,6 @@ TEST(Flush, CreatesVirtualTicketsFirst) {
     EXPECT_EQ(server.sent, "3/13 a[-1]=1 a[1]=2;3/12 a[-1]=2;");
     EXPECT_EQ(count, 3u);
     EXPECT_EQ(substitutions, "type -1>-1;id -9998>13;");
-    EXPECT_EQ(list.m_idMap, (Ids{{-9998, 13}}));
     int real = 0;
     EXPECT_TRUE(list.GetActualTicketID(real, -9998) && real == 13);
     EXPECT_FALSE(list.GetActualTicketID(real, -9997) || real != -1);
@@ -165,18 +151,17 @@ TEST(Flush, CreatesVirtualTicketsFirst) {
 }
 
 TEST(Flush, OfOneTicketLeavesTheOthers) {
-    struct Case {
+    const struct {
         int type, id;
         bool ok;
         int sentTo;
         const char* sent;
-    };
-    const Case cases[] = {
+    } cases[] = {
         {TICKET_TYPE_LOCAL, 7, true, 7, ""},
         {jobs, -9998, true, 13, "3/13 a[-1]=3;"},
-        {jobs, -9998, false, -9998, "3/13 a[-1]=3;"}, // Nothing is pending there any longer.
-        {51, 12, false, 12, "3/13 a[-1]=3;"},
-        {jobs, 12, true, 12, "3/13 a[-1]=3;3/12 a[-1]=2;"},
+        {jobs, -9998, false, -9998, ""}, // Nothing is pending there any longer.
+        {51, 12, false, 12, ""},
+        {jobs, 12, true, 12, "3/12 a[-1]=2;"},
     };
     Recorder server;
     TICKET_UPDATE_LIST list(&server.record);
@@ -185,11 +170,10 @@ TEST(Flush, OfOneTicketLeavesTheOthers) {
     edit(list, jobs, 14, "a[-1]=4");
     edit(list, TICKET_TYPE_LOCAL, 7, "a[-1]=1");
     for (auto [type, id, ok, sentTo, sent] : cases) {
-        SCOPED_TRACE(std::to_string(type) + ", " + std::to_string(id));
         EXPECT_FALSE(type == jobs && list.FlushToContainer(nullptr, type, id, nullptr, {}));
-        EXPECT_EQ(list.FlushToContainer(&server.record, type, id, nullptr, {}), ok);
+        EXPECT_EQ(list.FlushToContainer(&server.record, type, id, nullptr, {}), ok) << id;
         EXPECT_EQ(id, sentTo);
-        EXPECT_EQ(server.sent, sent);
+        EXPECT_EQ(std::exchange(server.sent, ""), sent) << id;
         EXPECT_EQ(list.m_idMap, sentTo == 13 ? (Ids{{-9998, 13}}) : Ids());
     }
     EXPECT_FALSE(list.IsEmpty(jobs, 14) || list.IsEmpty(TICKET_TYPE_LOCAL, 7));
@@ -197,14 +181,18 @@ TEST(Flush, OfOneTicketLeavesTheOthers) {
 
 // Of what a plug-in answers for a table and for a record bit 0 counts.
 TEST(Flush, SucceedsWhereAnyRecordDid) {
-    for (const auto& [answer, firstResult] : {std::pair(1, 3), {1, 2}, {2, 1}}) {
-        Recorder server;
-        server.answer = answer;
-        server.firstResult = static_cast<std::uint8_t>(firstResult);
+    static std::pair<int, std::uint8_t> answer;
+    for (const auto& each : {std::pair(1, 3), {1, 2}, {2, 1}}) {
+        answer = each;
+        Server server;
+        ticket::container::SetMultiParameter::put(
+            server.record, +[](void*, int, int, SETMULTIPAR* table) {
+                table->result = answer.second;
+                return answer.first;
+            });
         TICKET_UPDATE_LIST list(&server.record);
         edit(list, jobs, 12, "a[-1]=2 b[-1]=3");
-        EXPECT_EQ(list.FlushToContainer(&server.record, nullptr, {}), firstResult == 3);
-        EXPECT_EQ(server.sent, "3/12 a[-1]=2 b[-1]=3;");
+        EXPECT_EQ(list.FlushToContainer(&server.record, nullptr, {}), answer.second == 3);
         EXPECT_TRUE(list.IsEmpty(jobs, 12)); // Nothing is tried again.
     }
 }

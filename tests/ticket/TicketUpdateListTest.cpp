@@ -23,22 +23,19 @@ class UpdateList : public testing::Test {
 };
 
 TEST(UpdateListAddress, IsRealVirtualOrLocal) {
-    struct Case {
+    const struct {
         int type, id;
         bool valid;
         int filedUnder;
-    };
-    const Case cases[] = {
+    } cases[] = {
         {49, 16777215, true, 49}, {50, 0, false, 50},      {1000, 0, true, 1000},
         {-1, 0, false, -1},       {3, 16777216, false, 3}, {3, -1, false, 3},
         {3, -4, true, 3},         {3, -2000, true, 3},     {50, -9999, true, -1},
         {1000, -2000, true, -1},  {3, -1999, false, 3},    {3, -10000, false, 3},
     };
-    for (const Case& c : cases) {
-        SCOPED_TRACE(std::to_string(c.type) + ", " + std::to_string(c.id));
-        int type = c.type;
-        EXPECT_EQ(TICKET_UPDATE_LIST::TicketValid(type, c.id), c.valid);
-        EXPECT_EQ(type, c.filedUnder);
+    for (auto [type, ticket, valid, filedUnder] : cases) {
+        EXPECT_EQ(TICKET_UPDATE_LIST::TicketValid(type, ticket), valid) << type << ", " << ticket;
+        EXPECT_EQ(type, filedUnder) << ticket;
     }
     TICKET_UPDATE_LIST::nextID = -2001;
     for (const int next : {-2001, -2000, -9999}) {
@@ -47,12 +44,11 @@ TEST(UpdateListAddress, IsRealVirtualOrLocal) {
 }
 
 TEST_F(UpdateList, OverlaysTheServersValues) {
-    struct Case {
+    const struct {
         const char* edits;
         int position;
         int found, value;
-    };
-    const Case cases[] = {
+    } cases[] = {
         {"", -1, 0, 7},
         {"a[-1]=9", -1, 1, 9},
         {"a[-1]=9", 1, 0, 7},
@@ -75,7 +71,6 @@ TEST_F(UpdateList, OverlaysTheServersValues) {
         EXPECT_EQ(list.ParameterChanged(jobs, id, "a"), keys.contains("a"));
         EXPECT_EQ(list.ParameterExists(jobs, id, "a"), keys.contains("a") && found != 2);
     }
-    list.Clear();
     edit(list, jobs, id, "a[-1]=-");
     std::vector<int> values{5};
     EXPECT_EQ(list.xGetVectorParameter(jobs, id, "a", values), 1); // And nothing was read.
@@ -155,8 +150,7 @@ TEST_F(UpdateList, RefusesWithoutATrace) {
 }
 
 TEST_F(UpdateList, MergesATicketAsItIsWalked) {
-    const WorkTicket source;
-    source.view().SetMultiParameter(support::RecordTable("ab[-1]=1 abc[-1]=2 b[-1]=3").records());
+    const WorkTicket source("ab[-1]=1 abc[-1]=2 b[-1]=3");
     int told = 0;
     list.RegisterSetParamCallback([&](int, int, const char*, PARAM_TYPE, const void*) { ++told; });
     const std::pair<std::vector<const char*>, std::string> cases[] = {
