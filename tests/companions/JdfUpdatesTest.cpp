@@ -64,7 +64,6 @@ std::string enlarged(std::string text) {
 class JdfUpdates : public StoreProgram {
   protected:
     JdfUpdates() {
-        store::makeStore(m_address, "Press room");
         m_store = store::openStore(m_address);
         m_store->create(3, 7);
         setText("Output/Jdf/FileName", "job-7.jdf");

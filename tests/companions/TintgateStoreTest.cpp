@@ -2,7 +2,7 @@
 
 #include <bit>
 #include <limits>
-#include <map>
+#include <numeric>
 #include <random>
 #include <sstream>
 #include <string>
@@ -18,6 +18,7 @@
 
 #include "Postgres.h"
 #include "StoreProgram.h"
+#include "TicketText.h"
 #include "comgui/KeyBytes.h"
 #include "comgui/StoreEngine.h"
 #include "comgui/Users.h"
@@ -28,75 +29,58 @@ using nlohmann::json;
 using testing::HasSubstr;
 using testing::Not;
 
+store::TicketContent contentOf(const std::string& records) {
+    store::TicketContent content;
+    content.apply(support::RecordTable(records).records());
+    return content;
+}
+
+/// Of every type the values that a conversion is likeliest to lose.
+store::TicketContent awkwardContent() {
+    store::TicketContent content =
+        contentOf("special=0.0,-0.0,inf,-inf,nan holes[0]=1 holes[3]='x holes[4]='y "
+                  "holes[16777215]=2 numbers=-2147483648,u2147483648,l-9223372036854775808,"
+                  "l9007199254740993,U18446744073709551615,7,u7,l7,U7,7.0,p0,p18446744073709551615 "
+                  "texts=','\x01\x1f\"\\/\x7f,'\xf0\x9f\x8e\xa8,'\xed\xa0\x80,'a\xff "
+                  "\x80key_that_is_no_UTF-8\xff=1 \xc3\xbc/\x01\"key\"='x");
+    auto doubles = std::make_shared<store::Elements>();
+    std::mt19937_64 random(4711);
+    for (int i = 0; i < 2000; ++i) { // Among them not-a-numbers with payloads.
+        const auto bits = random() | (i % 50 == 0 ? 0x7FF0000000000000 : 0);
+        doubles->put(i, std::bit_cast<double>(bits));
+    }
+    doubles->put(2000, std::numeric_limits<double>::denorm_min());
+    content.put("doubles", doubles);
+    std::string everyByte(256, '\0');
+    std::iota(everyByte.begin(), everyByte.end(), '\0');
+    auto binaries = std::make_shared<store::Elements>();
+    for (const int length : {0, 1, 255, 256}) {
+        binaries->put(binaries->count(),
+                      store::Binary{std::make_shared<store::Bytes>(everyByte.substr(0, length))});
+    }
+    content.put("binaries", binaries);
+    return content;
+}
+
+std::string bytesOf(const store::TicketContent& content) {
+    std::string bytes;
+    for (const auto& [key, elements] : content.keys()) {
+        bytes += key + '\n' + store::keyBytes(*elements) + '\n';
+    }
+    return bytes;
+}
+
 class TintgateStore : public StoreProgram {
   protected:
-    TintgateStore() { store::makeStore(m_address, "Press room"); }
-
     std::unique_ptr<store::StoreEngine> open() const { return store::openStore(m_address); }
 
     void makeTicket(int type, int id, const store::TicketContent& content) const {
         const auto engine = open();
         engine->create(type, id);
-        store::Scope all;
-        all.everything = true;
-        engine->change(type, id, all,
+        engine->change(type, id, store::Scope{true, {}},
                        [&](store::TicketContent& stored) { stored.transfer(content, true); });
     }
 };
-
-std::shared_ptr<store::Elements> elementsOf(const std::vector<store::Value>& values) {
-    auto elements = std::make_shared<store::Elements>();
-    for (std::size_t i = 0; i < values.size(); ++i) {
-        elements->put(static_cast<int>(i), values[i]);
-    }
-    return elements;
-}
-
-store::Value text(const std::string& bytes) {
-    return store::Text{std::make_shared<store::Bytes>(bytes)};
-}
-
-store::Value binary(const std::string& bytes) {
-    return store::Binary{std::make_shared<store::Bytes>(bytes)};
-}
-
-/// Of every type the values that a conversion is likeliest to lose.
-store::TicketContent awkwardContent() {
-    std::vector<store::Value> doubles;
-    std::mt19937_64 random(4711);
-    for (int i = 0; i < 2000; ++i) { // Among them not-a-numbers with payloads.
-        const auto bits = random();
-        doubles.push_back(std::bit_cast<double>(i % 50 == 0 ? bits | 0x7FF0000000000000 : bits));
-    }
-    for (const std::uint64_t bits :
-         {0x0ULL, 0x8000000000000000ULL, 0x1ULL, 0x7FF0000000000000ULL, 0xFFF0000000000000ULL,
-          0x7FF8000000000000ULL, 0xFFF8000000000000ULL}) {
-        doubles.push_back(std::bit_cast<double>(bits));
-    }
-    std::string everyByte;
-    for (int byte = 0; byte < 256; ++byte) {
-        everyByte += static_cast<char>(byte);
-    }
-    using Int64 = std::numeric_limits<long long>;
-    store::TicketContent content;
-    content.put("doubles", elementsOf(doubles));
-    content.put("numbers", elementsOf({std::numeric_limits<int>::min(), 1U << 31, Int64::min(),
-                                       (1LL << 53) + 1, std::numeric_limits<unsigned long>::max(),
-                                       7, 7U, 7LL, 7ULL, 7.0, static_cast<void*>(nullptr),
-                                       reinterpret_cast<void*>(~std::uintptr_t{0})}));
-    content.put("texts", elementsOf({text(""), text("\x01\x1f\"\\/\x7f"), text("\xf0\x9f\x8e\xa8"),
-                                     text("\xed\xa0\x80"), text("a\xff")}));
-    content.put("binaries", elementsOf({binary(""), binary("a"), binary(everyByte.substr(0, 255)),
-                                        binary(everyByte)}));
-    content.put("\x80 key that is no UTF-8 \xff", elementsOf({1}));
-    content.put("\xc3\xbc/\n\"key\"", elementsOf({text("\n")}));
-    auto holes = elementsOf({1});
-    holes->put(3, text("x"));
-    holes->put(4, text("y"));
-    holes->put(store::highestPosition, 2);
-    content.put("holes", holes);
-    return content;
-}
 
 TEST_F(TintgateStore, ExportAndImportKeepEveryBit) {
     const auto content = awkwardContent();
@@ -115,13 +99,7 @@ TEST_F(TintgateStore, ExportAndImportKeepEveryBit) {
     answer({"ticket", "delete", "job/7"});
     answer({"key", "set", "49/16777215", "To be gone", "int", "1"});
     EXPECT_EQ(answer({"import", file}), "Imported 3 tickets\n");
-    const auto read = open()->content(3, 7, store::KeyFilter());
-    ASSERT_NE(read, nullptr);
-    ASSERT_EQ(read->keys().size(), content.keys().size());
-    for (const auto& [key, elements] : content.keys()) {
-        ASSERT_NE(read->find(key), nullptr) << key;
-        EXPECT_EQ(store::keyBytes(*read->find(key)), store::keyBytes(*elements)) << key;
-    }
+    EXPECT_TRUE(bytesOf(*open()->content(3, 7, store::KeyFilter())) == bytesOf(content));
     EXPECT_TRUE(open()->content(49, 0xFFFFFF, store::KeyFilter())->empty());
 
     const auto merged = m_folder.write("t.json", R"({"format": "tintgate tickets", "version": 1,
@@ -148,22 +126,16 @@ TEST_F(TintgateStore, BrokenFilesChangeNothing) {
     const std::pair<std::string, const char*> cases[] = {
         {key(R"({"int": 1})").substr(0, 150), "no JSON"},
         {R"({"format": "tintgate tickets", "version": 2, "tickets": []})", "\"version\""},
-        {R"({"format": "tintgate tickets", "version": 1, "tickets": [], "more": 1})", "more"},
         {R"({"format": "tintgate tickets", "version": 1})", "\"tickets\" is no list"},
         {ticket(R"("type": 3, "id": 18446744073709551617, "keys": {})"), "16777215"},
         {ticket(R"("type": 3, "id": 1, "keys": {})"), "job/1 stands there twice"},
         {ticket(R"("type": 3, "id": 2, "keys": {"a": {"int": 1}, "a": {"int": 1}})"), "twice"},
         {byteKey("YQ=="), "twice"},
         {byteKey("YQ="), "base64"},
-        {ticket(R"("type": 3, "id": 2, "keys": {"a*": {"int": 1}})"), "a key is not empty"},
-        {key(R"({"int": 1, "uint": 1})"), "no type"},
         {key(R"({"int": 2147483648})"), "job/2, key \"k\": 2147483648 is no int"},
-        {key(R"({"int": 1.0})"), "1.0 is no int"},
         {key(R"({"uint64": "18446744073709551616"})"), "is no uint64"},
         {key(R"({"double": "NaN:7ff0000000000000"})"), "is no double"},
         {key(R"({"string": "a\u0000b"})"), "zero byte"},
-        {key(R"({"string": {"base64": "YQB=" }})"), "is no string"},
-        {key(R"([{"int": [1, 2]}, {"at": 1, "int": 3}])"), "a position from 2"},
         {key(R"({"at": 16777215, "int": [3, 4]})"), "more elements than"},
     };
     for (const auto& [contents, words] : cases) {
@@ -190,8 +162,7 @@ TEST_F(TintgateStore, UsersLogInAsTheySay) {
     EXPECT_EQ(add("anna", longest), 0);
     EXPECT_EQ(add("anna", "other"), 2);
     EXPECT_EQ(login("anna", std::string(127, '\xff')), store::LoginAnswer::Welcome);
-    for (const auto& refused :
-         std::vector<std::string>{"", "\xc4\x80", "a\xff", "a\xc2\x80", std::string(128, 'a')}) {
+    for (const std::string& refused : {std::string("\xc4\x80"), std::string(128, 'a')}) {
         EXPECT_EQ(add(refused, "p"), 3) << refused;
         EXPECT_EQ(add("b", refused), 3) << refused;
     }
@@ -209,10 +180,9 @@ TEST_F(TintgateStore, UsersLogInAsTheySay) {
     expectRefusal({"user", "enable", zoe}, 1, "there is no user");
 }
 
-/// Runs "user add" on a terminal of its own, types the lines as they are asked for, and returns all
-/// that the terminal showed.
-std::string typePasswords(const std::string& address, const std::vector<std::string>& lines,
-                          int& status) {
+/// Runs "user add" on a terminal of its own and answers both of its questions. Returns what the
+/// terminal showed, and behind that the exit code.
+std::string addUserByHand(const std::string& address, const char* password, const char* again) {
     int terminal = -1;
     const pid_t child = forkpty(&terminal, nullptr, nullptr, nullptr);
     if (child == 0) {
@@ -221,26 +191,22 @@ std::string typePasswords(const std::string& address, const std::vector<std::str
         _exit(127);
     }
     std::string shown;
-    std::size_t typed = 0;
-    char byte = 0;
-    while (read(terminal, &byte, 1) == 1) {
+    for (char byte; read(terminal, &byte, 1) == 1;) {
         shown += byte;
-        if (typed < lines.size() && shown.ends_with(": ")) {
-            const std::string line = lines[typed++] + '\n';
-            EXPECT_EQ(write(terminal, line.data(), line.size()), ssize_t(line.size()));
+        if (shown.ends_with(": ")) {
+            dprintf(terminal, "%s\n", std::exchange(password, again));
         }
     }
+    int status = 0;
     waitpid(child, &status, 0);
     close(terminal);
-    return shown;
+    return shown + std::to_string(WEXITSTATUS(status));
 }
 
 TEST_F(TintgateStore, PasswordsAreNotShownOnATerminal) {
-    int status = -1;
-    EXPECT_THAT(typePasswords(m_address, {"secret", "secreT"}, status), HasSubstr("differ"));
-    EXPECT_EQ(WEXITSTATUS(status), 3);
-    EXPECT_THAT(typePasswords(m_address, {"secret", "secret"}, status), Not(HasSubstr("secret")));
-    EXPECT_EQ(status, 0);
+    EXPECT_THAT(addUserByHand(m_address, "secret", "secreT"), testing::EndsWith("\n3"));
+    const std::string shown = addUserByHand(m_address, "secret", "secret");
+    EXPECT_THAT(shown, AllOf(testing::EndsWith("\n0"), Not(HasSubstr("secret"))));
     EXPECT_EQ(store::checkLogin(*open(), "anna", "secret"), store::LoginAnswer::Welcome);
 }
 
@@ -249,10 +215,8 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     const std::pair<std::vector<std::string>, std::string> steps[] = {
         {{"int", "-5", "3"}, R"({"int":[-5,3]})"},
         {{"string", "[a,b]", "add", "--append"}, R"([{"int":[-5,3]},{"string":["[a,b]","add"]}])"},
-        {{"double", "2.5", "--position", "1"},
-         R"([{"int":-5},{"double":2.5},{"string":["[a,b]","add"]}])"},
-        {{"string", "--append", "--", "-x", "--json", "--"},
-         R"([{"int":-5},{"double":2.5},{"string":["[a,b]","add","-x","--json","--"]}])"},
+        {{"string", "--append", "--", "--json"},
+         R"([{"int":[-5,3]},{"string":["[a,b]","add","--json"]}])"},
         {{"double", "-Infinity", "-0.0", "1e-310", "NaN"},
          R"({"double":["-Infinity",-0.0,1e-310,"NaN"]})"},
         {{"binary", "YWI="}, R"({"binary":"YWI="})"},
@@ -275,10 +239,8 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     EXPECT_EQ(answer({"key", "get", "job/7", "B", "--raw"}), bytes);
     answer({"key", "set", "job/7", "Escape", "string", "\x1b[2J"});
     EXPECT_THAT(answer({"key", "list", "job/7", "E"}), HasSubstr("\\x1B[2J"));
-
     expectRefusal({"key", "set", "job/7", "K*", "int", "1"}, 3, "does not end in *");
     expectRefusal({"key", "set", "job/8", "K", "int", "1"}, 1, "no ticket job/8");
-    expectRefusal({"key", "set", "job/7", "K", "int"}, 64, "say the values");
 }
 
 TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
@@ -308,37 +270,22 @@ TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
     expectRefusal({"file", "put", m_folder.path("missing"), "/a"}, 12, "can't be read");
 }
 
-/// Keys of a job that are all integers.
-using Keys = std::map<std::string, int>;
-
-store::TicketContent jobOf(const Keys& keys) {
-    store::TicketContent content;
-    for (const auto& [key, value] : keys) {
-        content.put(key, elementsOf({value}));
-    }
-    return content;
-}
-
-constexpr const char* display = "Job/Display/Status";
-constexpr const char* show = "Remote/ShowInVerifier";
-constexpr const char* parent = "General/ParentID";
-constexpr const char* status1 = "Remote/Measurement/Status";
-constexpr const char* status2 = "Remote/Measurement2/Status";
-constexpr const char* approval1 = "Remote/Measurement/Approval";
-constexpr const char* approval2 = "Remote/Measurement2/Approval";
-
 TEST_F(TintgateStore, JobsAreListedByTheirVerification) {
-    const std::pair<Keys, const char*> cases[] = {
-        {{{display, 208}}, "waiting 208 - - -"},
-        {{{display, 208}, {"Input/FileType", 4096}}, "- 208 - - -"},
-        {{{display, 30}, {show, 1}, {status1, 1}, {parent, 9}}, "waiting 30 measured - 9"},
-        {{{display, 211}, {show, 0}, {approval1, 1}, {approval2, 0}}, "passed 211 passed failed -"},
-        {{{display, 212}, {approval1, -1}}, "failed 212 - - -"},
+    const std::pair<const char*, const char*> cases[] = {
+        {"Job/Display/Status=208", "waiting 208 - - -"},
+        {"Job/Display/Status=208 Input/FileType=4096", "- 208 - - -"},
+        {"Job/Display/Status=30 Remote/ShowInVerifier=1 Remote/Measurement/Status=1 "
+         "General/ParentID=9",
+         "waiting 30 measured - 9"},
+        {"Job/Display/Status=211 Remote/ShowInVerifier=0 Remote/Measurement/Approval=1 "
+         "Remote/Measurement2/Approval=0",
+         "passed 211 passed failed -"},
+        {"Job/Display/Status=212 Remote/Measurement/Approval=-1", "failed 212 - - -"},
     };
     int id = 0;
     std::string expected = "JOB TITLE STATE CODE STRIP 1 STRIP 2 PARENT\n";
     for (const auto& [keys, line] : cases) {
-        makeTicket(3, ++id, jobOf(keys));
+        makeTicket(3, ++id, contentOf(keys));
         expected += std::to_string(id) + " " + line + "\n";
     }
     std::string table;
@@ -348,39 +295,37 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerification) {
         }
     }
     EXPECT_EQ(table, expected);
-    EXPECT_EQ(json::parse(answer({"jobs", "--json"}))[3]["strip2"],
-              json({{"measurements", 0}, {"passed", false}}));
 }
 
 TEST_F(TintgateStore, ResetLetsAJobRunAgain) {
-    const Keys closed = {{display, 211}, {show, 0},      {parent, 5},   {status1, 1},
-                         {status2, 1},   {approval1, 1}, {approval2, 0}};
-    const Keys stranger = {{display, 211}, {show, 0}, {parent, 4}, {status1, 1}};
-    makeTicket(3, 5, jobOf({{display, 212}, {show, 0}, {status1, 2}})); // The parent.
-    makeTicket(3, 6, jobOf({{display, 208}, {show, 0}, {parent, 5}, {status1, 1}}));
-    makeTicket(3, 7, jobOf(closed));
-    makeTicket(3, 8, jobOf(stranger));
-    const auto keysOf = [&](int id) {
-        Keys read;
-        const auto content = open()->content(3, id, store::KeyFilter());
-        for (const auto& [key, elements] : content->keys()) {
-            read[key] = std::get<int>(*elements->first());
-        }
-        return read;
+    // Their status, whether they are shown, their parent, and what else they have.
+    const auto keys = [](const char* status, const char* shown, const char* parent,
+                         const std::string& more = "") {
+        return bytesOf(contentOf("Job/Display/Status=" + std::string(status) +
+                                 " Remote/ShowInVerifier=" + shown + " General/ParentID=" + parent +
+                                 " " + more));
     };
-
+    const std::string first = "Remote/Measurement/Status=1 Remote/Measurement/Approval=1 ";
+    const std::string second = "Remote/Measurement2/Status=1 Remote/Measurement2/Approval=0 ";
+    const std::string closed = "Job/Display/Status=211 Remote/ShowInVerifier=0 " + first;
+    makeTicket(3, 5, contentOf(closed + "General/ParentID=0")); // The parent.
+    makeTicket(3, 6,
+               contentOf("Job/Display/Status=208 Remote/ShowInVerifier=0 "
+                         "General/ParentID=5 " +
+                         first));
+    makeTicket(3, 7, contentOf(closed + second + "General/ParentID=5"));
+    makeTicket(3, 8, contentOf(closed + "General/ParentID=4"));
+    const auto expectKeys = [&](int id, const std::string& expected) {
+        EXPECT_TRUE(bytesOf(*open()->content(3, id, store::KeyFilter())) == expected) << id;
+    };
     answer({"reset", "7", "--strip", "2"});
-    EXPECT_EQ(keysOf(7),
-              (Keys{{display, 211}, {show, 1}, {parent, 5}, {status1, 1}, {approval1, 1}}));
-    EXPECT_EQ(keysOf(5), (Keys{{display, 212}, {show, 0}, {status1, 2}}));
-
-    EXPECT_EQ(json::parse(answer({"--json", "reset", "job/7", "--family"}))[0],
-              json::parse(R"({"job": 7, "there": true, "reopened": false, "removed":
-                  ["Remote/Measurement/Status", "Remote/Measurement/Approval"]})"));
-    EXPECT_EQ(keysOf(7), (Keys{{display, 211}, {show, 1}, {parent, 5}}));
-    EXPECT_EQ(keysOf(6), (Keys{{display, 208}, {show, 0}, {parent, 5}})); // It waits already.
-    EXPECT_EQ(keysOf(5), (Keys{{display, 212}, {show, 1}}));
-    EXPECT_EQ(keysOf(8), stranger);
+    expectKeys(7, keys("211", "1", "5", first));
+    expectKeys(5, keys("211", "0", "0", first));
+    answer({"reset", "job/7", "--family"});
+    expectKeys(7, keys("211", "1", "5"));
+    expectKeys(6, keys("208", "0", "5")); // It waits already.
+    expectKeys(5, keys("211", "1", "0"));
+    expectKeys(8, keys("211", "0", "4", first));
     expectRefusal({"reset", "9"}, 1, "there is no job 9");
 }
 
@@ -401,16 +346,15 @@ class StoreCopy : public TintgateStore {
   protected:
     StoreCopy() {
         makeTicket(3, 7, awkwardContent());
+        makeTicket(49, 0xFFFFFF, {});
         const auto engine = open();
-        engine->create(49, 0xFFFFFF);
         engine->create(3, 90);
         engine->remove(3, 90);
         engine->putUser({"J\xF6rg", store::passwordHash("x"), true});
         for (int i = 0; i < 200; ++i) {
             // Not by way of the store, where each would wait for the disk.
-            const std::string name = "store/files/" + std::to_string(i % 10) + "-\xFF";
-            m_folder.makeFolder(name);
-            m_folder.write(name + "/" + std::to_string(i), std::string(i * 37U, 'x'));
+            m_folder.write("store/files/" + std::to_string(i % 10) + "-\xFF/" + std::to_string(i),
+                           std::string(i * 37U, 'x'));
         }
         for (const std::string content : {"one", "", "three", "four"}) {
             std::istringstream from(content);
@@ -419,16 +363,11 @@ class StoreCopy : public TintgateStore {
         engine->pruneVersions("jobs/7.jdf", 2); // So that they do not start at 1.
     }
 
-    std::string answerOf(const std::string& address, std::vector<std::string> arguments) const {
-        arguments.insert(arguments.begin(), {"--store", address});
-        return answer(arguments);
-    }
-
     /// All that a store holds.
     std::string allOf(const std::string& address) const {
         const auto engine = store::openStore(address);
         std::ostringstream text;
-        text << answerOf(address, {"export"});
+        text << answer({"--store", address, "export"});
         for (const auto& user : engine->users()) {
             text << user.name << user.passwordHash << user.disabled << '\n';
         }
@@ -454,7 +393,7 @@ TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
     answer({"copy", "room", back});
     EXPECT_TRUE(allOf(back) == before);
     for (const std::string& address : {m_address, std::string("room"), back}) {
-        EXPECT_EQ(answerOf(address, {"ticket", "create", "job"}), "job/91\n");
+        EXPECT_EQ(answer({"--store", address, "ticket", "create", "job"}), "job/91\n");
     }
     expectRefusal({"copy", m_address, "room"}, 2, "already");
     expectRefusal({"copy", m_folder.path("none"), m_folder.path("new")}, 4, "none");

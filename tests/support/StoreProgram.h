@@ -10,9 +10,10 @@
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 
-/// Makes no store; "make" does.
 class StoreProgram : public testing::Test {
   protected:
+    StoreProgram() { answer({"make", "--name", "Press room"}); }
+
     support::Outcome run(std::vector<std::string> arguments,
                          support::RunOptions options = {}) const {
         options.environment.insert({"TINTGATE_STORE", m_address});

@@ -68,7 +68,6 @@ class StoreTrend : public StoreProgram {
     static constexpr int jobs = 12;
 
     StoreTrend() {
-        answer({"make"});
         answer({"file", "put", source + "/presets/CVP_0001.xml", "/server/tickets/CVP_0001.xml"});
         const std::string psd =
             std::regex_replace(support::contentsOf(source + "/presets/CVP_0007.xml"),
