@@ -7,7 +7,7 @@ using support::RecordTable;
 using support::resultText;
 
 TEST(SingleTicket, ReadsOnlyWhatIsThereUnderItsType) {
-    const WorkTicket ticket("a=5 v[2]='x v[4]=u7 d=2.5 b=#0102 p=p16");
+    const WorkTicket ticket("a=5 v[2]='x v[4]=u7 d=2.5 b=#0102 n=4,5,6");
     const struct {
         const char* key;
         int type, position;
@@ -21,6 +21,9 @@ TEST(SingleTicket, ReadsOnlyWhatIsThereUnderItsType) {
         {"v", PARAM_COUNT, -1, "5"},     {"z", PARAM_COUNT, -1, "none"},
         {"v", PARAM_DELETE, 4, "8"},     {"v", PARAM_DELETE, 3, "none"},
         {"d", PARAM_DOUBLE, -1, "2.5"},  {"b", PARAM_BINARY, 0, "#0102"},
+        {"n", PARAM_INT, 2, "6"},        {"n", PARAM_INT, -1, "4"},
+        {"n", PARAM_UINT, 2, "none"},    {"n", PARAM_INT, 3, "none"},
+        {"n", PARAM_DELETE, 2, "2"},     {"n", PARAM_COUNT, -1, "3"},
     };
     for (const auto& [key, type, position, expected] : rows) {
         std::uint64_t place[2] = {};
