@@ -13,12 +13,12 @@
 #include <unistd.h>
 
 #include <gtest/gtest.h>
-#include <sqlite3.h>
 
 #include "Postgres.h"
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 #include "TicketText.h"
+#include "comgui/Sqlite.h"
 #include "comgui/StoreEngine.h"
 #include "comgui/StoreKeep.h"
 
@@ -128,11 +128,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
             support::BarePostgres("room").run(postgres);
             return;
         }
-        sqlite3* database = nullptr;
-        sqlite3_open((address + "/tickets.db").c_str(), &database);
-        EXPECT_EQ(sqlite3_exec(database, sqlite.c_str(), nullptr, nullptr, nullptr), SQLITE_OK)
-            << sqlite3_errmsg(database);
-        sqlite3_close(database);
+        store::sqlite::Database(address + "/tickets.db", false).run(sqlite.c_str());
     }
 
     void setFormat(int format) const {
