@@ -65,23 +65,11 @@ TEST_F(HelperTest, ReadsValuesThatAreOnlyValues) {
     m_root.writePreferences("test.plist", {{"hostile", hostile},
                                            {"blanks", "  /x \t "},
                                            {"lines", "first\nsecond"},
-                                           {"long", std::string(300, 'x')},
-                                           {"dict/in:side", "nested"}});
+                                           {"long", std::string(300, 'x')}});
     EXPECT_EQ(value("hostile"), hostile);
     EXPECT_EQ(value("blanks") + "," + value("lines") + "," + value("missing"), "  /x,first,");
     EXPECT_EQ(value("long"), std::string(255, 'x'));
-    EXPECT_EQ(value("'dict':'in:side'"), "nested");
     EXPECT_FALSE(support::exists(m_root.path("ran")));
-}
-
-TEST_F(HelperTest, RunsTheCommandForExistingFilesOnly) {
-    const std::string reader = m_root.path("usr/libexec/Plistbuddy");
-    fs::remove(reader);
-    writeScript("usr/libexec/Plistbuddy", "printf '%s|' \"$0\" \"$@\"\n");
-    EXPECT_EQ(value("key"), "");
-    m_root.writePreferences("test.plist", {});
-    EXPECT_EQ(value("'a b':c"),
-              reader + "|-c|Print :'a b':c|" + m_root.path("Library/Preferences/test.plist") + "|");
 }
 
 TEST_F(HelperTest, FindsTheSuite) {
