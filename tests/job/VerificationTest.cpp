@@ -1,5 +1,6 @@
 // Runs of the real program on jobs, as a client starts it: arguments and a store in; the exit code,
 // the log, the job's folder and the tickets out.
+#include <algorithm>
 #include <atomic>
 #include <chrono>
 #include <filesystem>
@@ -148,16 +149,6 @@ class Place {
         return outcome.output;
     }
 
-    /// The keys of a job, each with its number of elements.
-    std::map<std::string, int> counts(int job) const {
-        std::map<std::string, int> all;
-        const auto content = engine()->content(3, job, store::KeyFilter());
-        for (const auto& [key, elements] : content->keys()) {
-            all[key] = elements->count();
-        }
-        return all;
-    }
-
     /// What the server shows of a job: 208 to be verified, 211 passed, 212 failed.
     int status(const std::string& job) const {
         const auto content = engine()->content(3, std::stoi(job), store::KeyFilter());
@@ -195,20 +186,6 @@ class Place {
     std::unique_ptr<support::RunningProgram> beside; ///< A program that runs for as long.
 };
 
-/// Most of a run is waiting, so several go side by side.
-template<class Work>
-void sideBySide(std::size_t count, Work work) {
-    std::atomic<std::size_t> next = 0;
-    std::vector<std::jthread> threads;
-    for (int i = 0; i < 8; ++i) {
-        threads.emplace_back([&] {
-            for (std::size_t number; (number = next++) < count;) {
-                work(number);
-            }
-        });
-    }
-}
-
 struct Case {
     std::string what;
     int code;
@@ -227,7 +204,17 @@ void expectRuns(const std::vector<Case>& cases) {
             cases[i].prepare(places[i]);
         }
     }
-    sideBySide(cases.size(), [&](std::size_t i) { outcomes[i] = places[i].run(cases[i].call); });
+    // Most of a run is waiting, so several go side by side.
+    std::atomic<std::size_t> next = 0;
+    std::vector<std::thread> threads;
+    for (int i = 0; i < 8; ++i) {
+        threads.emplace_back([&] {
+            for (std::size_t number; (number = next++) < cases.size();) {
+                outcomes[number] = places[number].run(cases[number].call);
+            }
+        });
+    }
+    std::ranges::for_each(threads, &std::thread::join);
     for (std::size_t i = 0; i < cases.size(); ++i) {
         const auto& [what, code, inLog, prepare, call] = cases[i];
         const std::string log = places[i].log();
@@ -313,7 +300,6 @@ TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
     };
     expectRuns({
         {"no job", 5, loginLines, {}, {.job = ""}},
-        {"no strip", 5, loginLines, {}, {.strip = ""}},
         {"a strip beyond all numbers", 5, loginLines, {}, {.strip = "4294967296"}},
         {"no store", 150, "to = /no/store last ComGui error = 150", {}, {.host = "/no/store"}},
         {"another user", 151, refused + "151", {}, {.user = "proof"}},
@@ -323,7 +309,6 @@ TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
         {"another job", 108, loggedIn, {}, {.job = "99"}},
         {"a closed job", 108, loggedIn, setting("Job/Display/Status=211 Remote/ShowInVerifier=0")},
         {"no name of a JDF", 255, "LoadKZJobData returns = -1", setting("Output/Jdf/FileName=-")},
-        {"no JDF", 111, "LoadKZJobData returns = 111", setting("Output/Jdf/FileName='none.jdf")},
         {"a damaged preset", 103, "parsePresetParameterXMLFile returns = 103",
          file("/server/tickets/CVP_0001.xml", "<preset")},
         {"no number of patches", 107, "LoadKZJobMeasurements returns = -1",
@@ -346,7 +331,6 @@ TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
 TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
     const Call call = {.job = "8"};
     const Call again = {.remeasure = "KEY_KZ_REMEASURE:=:true"};
-    const Call almost = {.remeasure = "KEY_KZ_REMEASURE:=:True"};
     const auto tool = [](const std::string& settings, bool withReferences = true) {
         return [=](const Place& place) {
             place.installTool(settings);
@@ -380,36 +364,26 @@ TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
     expectRuns({
         {"measured", 0, "Copying resulting data to job ticket\n", tool(""), call},
         {"measured again", 0, "Copying resulting data to job ticket\n", closedJob, again},
-        {"almost measured again", 0, "Comparing existing data\n", {}, almost},
         {"no tool", 106, launched + "-2", {}, call},
         {"a tool that runs already", 106, launched + "-1", runningTool, call},
         {"a tool that can't be executed", 105, launched + "0",
          [](auto& place) { fs::permissions(place.installTool(), fs::perms(0600)); }, call},
-        {"a tool that ends at once", 105, launched + "0",
-         [](auto& place) { place.installTool("", "/bin/true"); }, call},
         {"a tool that crashes", 105, launched + "0", tool("mishap = crash\n"), call},
         {"no references", 10, "Reference file not found = \nOverall", tool("", false), call},
-        {"neither", 105, "Measurement file not found", tool("mishap = crash\n", false), call},
         {"inline 40", 107, compared, inlineStrip("40"), second},
         {"inline 44", 106, "existing measurement job", inlineStrip("44"), second},
-        {"inline 47", 107, compared, inlineStrip("47"), second},
     });
 }
 
 // Whatever a ticket holds, a run ends with a code and without much memory.
 TEST(Verification, BearsHostileTickets) {
     const std::string root = "Remote/Measurement/";
-    const std::string samples = root + "SpectralValues/Length=";
-    const std::string wavelengths = "2147483647 " + root + "SpectralValues/Stepsize=2147483647 ";
     const std::pair<std::string, int> tickets[] = {
-        {root + "Numpatches=2147483647 " + samples + "36", 105},
+        {root + "Numpatches=2147483647", 105},
         {root + "Numpatches=100000", 0},
-        {samples + "2147483647", 0},
-        {samples + "36 " + root + "SpectralValues/Base=" + wavelengths, 0},
         {root + "LabValues/LValues=nan", 28},
         {root + "Reference/Numpatches=2000000000", 103},
         {root + "Status=-2147483648 Workflow/Verify/ComparisonMethod=-5", 103},
-        {root + "Status=2147483647 Workflow/Verify/DeltaEMode=-2147483648", 0},
         {"General/ParentID=2147483647 Footer/Nesting/PSDAssessment=' "
          "Footer/Nesting/ControlstripMode=1 Footer/Nesting/ControlstripFile='.",
          0},
@@ -417,9 +391,7 @@ TEST(Verification, BearsHostileTickets) {
          "Footer/Dynstrip/IT8='/ Footer/Dynstrip/File='..",
          20},
         {"Output/Jdf/FileName='../../../../../etc/passwd", 111},
-        {"Output/Jdf/FileName='\xff\xfe", 111},
         {"Input/Title='a\"</script>%s\\\x01-\xc3\xa9" + std::string(100'000, 'x'), 0},
-        {"Input/Title='caf\xe9", 0},
         {"Footer/ControlstripFile='" + std::string(5'000, 'x'), 0},
     };
     std::vector<Case> cases;
@@ -485,50 +457,6 @@ TEST(Verification, UsesNoFolderOfOthers) {
     fs::create_directory_symlink(place.path("theirs"), place.temporary + "/Tintgate");
     EXPECT_EQ(place.run().exitCode, 111);
     EXPECT_TRUE(fs::is_empty(place.path("theirs")));
-}
-
-// Kills a run some milliseconds after its JDF has changed, so while it writes the job's keys.
-constexpr char killWhileItWrites[] = R"sh(
-    jdf=$1; delay=$2; shift 2
-    "$@" & run=$!
-    until [ "$(wc -c < "$jdf")" -gt 8192 ] || [ ! -e /proc/$run/exe ]; do :; done 2>/dev/null
-    sleep "$delay"
-    kill -9 $run)sh";
-
-TEST(Verification, KilledWhileItWritesLeavesAllWholeAndCanBeRunAgain) {
-    const char* const delays[] = {"0", "0.002", "0.005", "0.01", "0.02", "0.04"};
-    std::vector<Place> places(std::size(delays));
-    std::vector<std::map<std::string, int>> left;
-    for (const Place& place : places) {
-        place.installTool();
-    }
-    sideBySide(places.size(), [&](std::size_t i) {
-        std::vector<std::string> words = places[i].words({.job = "8"});
-        words.insert(words.begin(), {"sh", "-c", killWhileItWrites, "sh",
-                                     places[i].jobFile("job-8.jdf", "8"), delays[i]});
-        places[i].run(words);
-    });
-    for (const Place& place : places) {
-        std::ostringstream delivered;
-        place.engine()->getFile("server/temp/job-8.jdf", delivered);
-        EXPECT_TRUE(delivered.str().size() == 8192 ||
-                    delivered.str() == support::contentsOf(place.jobFile("job-8.jdf", "8")));
-        left.push_back(place.counts(8));
-        place.administer({"reset", "8"});
-    }
-    sideBySide(places.size(),
-               [&](std::size_t i) { EXPECT_EQ(places[i].run({.job = "8"}).exitCode, 0); });
-    int cutOff = 0;
-    for (std::size_t i = 0; i < places.size(); ++i) {
-        EXPECT_NE(places[i].status("8"), 208);
-        const auto whole = places[i].counts(8);
-        EXPECT_EQ(whole.at("Remote/Measurement/SpectralValues/DValues"), 48 * 36);
-        for (const auto& [key, count] : left[i]) {
-            EXPECT_EQ(count, whole.at(key)) << key;
-        }
-        cutOff += left[i].size() < whole.size() ? 1 : 0;
-    }
-    EXPECT_GT(cutOff, 0) << "all were killed after they had written everything";
 }
 
 } // namespace
