@@ -44,36 +44,44 @@ TEST(ParameterList, OwnsKeysAndValuesAsDeepAsItIs) {
 }
 
 TEST(ParameterList, EqualOnesAreStoredOnceAndNoNumbersAreOneConstant) {
-    SETMULTIPAR_LIST list(true);
-    RecordTable given(
-        "one[-1]='value two[-1]='value one[-1]=1e308 one[1]=nan one[2]=inf one[3]=-inf");
-    add(list, &SETMULTIPAR_LIST::xSetParameter, given.records());
-    const SETMULTIPAR* table = list.Table(false);
-    EXPECT_EQ(table[0].key, table[2].key);
-    EXPECT_EQ(table[0].value, table[1].value);
-    EXPECT_EQ(*static_cast<const double*>(table[2].value), 1e308);
-    for (int i = 3; i < 6; ++i) {
-        EXPECT_EQ(table[i].value, &MathLib::NOT_A_DOUBLE_NUMBER) << i;
+    // Numbers that differ in their first bits only, in their last only, and in sign.
+    std::vector<double> numbers = {0.0, -0.0, NAN, HUGE_VAL, -HUGE_VAL};
+    for (int i = 0; i < 10'000; ++i) {
+        numbers.push_back(std::ldexp(i % 2 == 0 ? 1 + i * 1e-15 : -1, i % 997));
     }
+    const int count = static_cast<int>(numbers.size());
+    SETMULTIPAR_LIST list(true);
+    EXPECT_TRUE(list.xSetNumbers("once", PARAM_DOUBLE, numbers.data(), count));
+    EXPECT_FALSE(list.xSetNumbers("never", PARAM_UINT, numbers.data(), count));
+    for (int i = 0; i < count; ++i) {
+        list.xSetParameter("again", PARAM_DOUBLE, &numbers[std::size_t(i)], i);
+    }
+    RecordTable given("one[-1]='value two[-1]='value");
+    EXPECT_EQ(add(list, &SETMULTIPAR_LIST::xSetParameter, given.records()), "11");
 
-    const double array[] = {0.0, -0.0, NAN, 0.5};
-    EXPECT_TRUE(list.xSetNumbers("array", PARAM_DOUBLE, array, 4));
-    EXPECT_FALSE(list.xSetNumbers("array", PARAM_UINT, array, 4));
-    table = list.Table(false) + 6;
+    const SETMULTIPAR* table = list.Table(false);
     EXPECT_EQ(table[0].value, table[1].value);
-    EXPECT_EQ(table[2].value, &MathLib::NOT_A_DOUBLE_NUMBER);
-    EXPECT_EQ(table[3].position, 3);
-    EXPECT_EQ(*static_cast<const double*>(table[3].value), 0.5);
-    EXPECT_EQ(list.Size(), 10u);
+    for (int i = 0; i < count; ++i) {
+        const auto* value = static_cast<const double*>(table[i].value);
+        ASSERT_TRUE(std::isfinite(numbers[std::size_t(i)]) ? *value == numbers[std::size_t(i)]
+                                                           : value == &MathLib::NOT_A_DOUBLE_NUMBER)
+            << i;
+        ASSERT_EQ(value, table[count + i].value) << i;
+        ASSERT_EQ(table[i].position, i);
+        ASSERT_EQ(table[i].key, table[0].key);
+    }
+    EXPECT_EQ(table[2 * count].value, table[2 * count + 1].value);
+    EXPECT_EQ(list.Size(), 2 * numbers.size() + 2);
 }
 
 TEST(ParameterList, TableSortsByKeyAndKeepsTheOrderWithinAKey) {
-    SETMULTIPAR_LIST list(false);
+    void* opaque = MultiParListCreate();
+    auto& list = *static_cast<SETMULTIPAR_LIST*>(opaque);
     for (int i = 0; i < 100; ++i) {
-        list.DelParameter(i % 2 == 0 ? "b" : "a", i);
+        MultiParListSetParameter(opaque, i % 2 == 0 ? "b" : "a", PARAM_DELETE, nullptr, i);
     }
-    EXPECT_EQ(list.Table(false)[1].position, 1);
-    list.Table(true);
+    EXPECT_EQ(MultiParListTable(opaque, 2)[1].position, 1); // Bit 0 asks for sorting.
+    MultiParListTable(opaque, 3);
     for (int i = 0; i < 100; ++i) { // The list itself is sorted now.
         EXPECT_EQ(list.Table(false)[i].position, i < 50 ? 2 * i + 1 : 2 * (i - 50));
     }
@@ -88,6 +96,8 @@ TEST(ParameterList, TableSortsByKeyAndKeepsTheOrderWithinAKey) {
     EXPECT_EQ(tableText(list.Table(false)), "");
     EXPECT_EQ(tableText(list.Table(true)), "z[-1]=- \xC3\xA4[-1]=-");
     EXPECT_TRUE(list.Size() == 3 && list.ParameterExists("z") && !list.ParameterExists(nullptr));
+    MultiParListDestroy(&opaque);
+    EXPECT_EQ(opaque, nullptr);
 }
 
 TEST(ParameterList, CollectsFromATicket) {
@@ -112,59 +122,15 @@ TEST(ParameterList, CollectsFromATicket) {
     SETMULTIPAR_LIST list(true);
     list.MergeIf(nullptr, [](const char*) { return true; });
     list.MergeIf(work.real(), nullptr);
+    for (const PARAM_TYPE type : {PARAM_DELETE, PARAM_COUNT}) { // They carry no values.
+        EXPECT_TRUE(SETMULTIPAR_LIST::CollectAction(&list, "k", type, nullptr, 0));
+    }
     EXPECT_EQ(list.Size(), 0u);
     // Each call finds the predicate as it was given: a count that it keeps never grows.
     list.MergeIf(work.real(), [calls = 0](const char* key) mutable {
         return ++calls == 1 && std::string_view(key) != "B";
     });
     EXPECT_EQ(tableText(list.Table(false)), all.substr(8));
-}
-
-// A walk that shows types which carry no value, as the engine never does.
-TEST(ParameterList, OnlyMergeIfTakesTypesWithoutValues) {
-    STICKET_ACCESS odd{};
-    ticket::single::Walk::put(
-        odd, +[](void*, SCollect show, void* context, const char*, int) {
-            for (int type = PARAM_DELETE; type <= PARAM_UINT64 + 1; ++type) {
-                EXPECT_TRUE(show(context, "k", static_cast<PARAM_TYPE>(type), nullptr, type));
-            }
-            return 0;
-        });
-    SETMULTIPAR_LIST list(true);
-    list.Merge(&odd, nullptr);
-    EXPECT_EQ(list.Size(), 8u);
-    list.Merge(&odd, PARTIAL_MODE(std::vector<const char*>{"k*", nullptr}.data()));
-    EXPECT_EQ(list.Size(), 16u);
-    list.MergeIf(&odd, [](const char*) { return true; });
-    EXPECT_EQ(list.Size(), 27u);
-}
-
-TEST(ParameterList, WorksBehindAnOpaquePointer) {
-    void* list = MultiParListCreate();
-    for (const char* key : {"b", "a"}) {
-        EXPECT_TRUE(MultiParListSetParameter(list, key, PARAM_DELETE, nullptr, 0));
-    }
-    EXPECT_STREQ(MultiParListTable(list, 2)[0].key, "b"); // bit 0 asks for sorting
-    EXPECT_STREQ(MultiParListTable(list, 3)[0].key, "a");
-    MultiParListDestroy(&list);
-    MultiParListDestroy(&list); // is null by now
-    EXPECT_TRUE(MultiParListSize(list) == 0 && MultiParListTable(list, 1) == nullptr);
-}
-
-TEST(ParameterList, KeepsManyNumbersOnceAndInTheirPlaces) {
-    // Numbers that differ in their first bits only, in their last only, and in sign.
-    std::vector<double> numbers;
-    for (int i = 0; i < 10'000; ++i) {
-        numbers.push_back(std::ldexp(i % 2 == 0 ? 1 + i * 1e-15 : -1, i % 997));
-    }
-    SETMULTIPAR_LIST list(true);
-    list.xSetNumbers("once", PARAM_DOUBLE, numbers.data(), 10'000);
-    list.xSetNumbers("again", PARAM_DOUBLE, numbers.data(), 10'000);
-    const SETMULTIPAR* table = list.Table(false);
-    for (int i = 0; i < 10'000; ++i) {
-        ASSERT_EQ(*static_cast<const double*>(table[i].value), numbers[std::size_t(i)]);
-        ASSERT_EQ(table[i].value, table[10'000 + i].value) << i;
-    }
 }
 
 } // namespace
