@@ -22,8 +22,6 @@ TEST_F(JobStatus, IsClosedOnceAllStripsHaveAResult) {
         {"other=1", true, -1, 211, single},
         {"Workflow/Verify/Active=3.0", false, -1, 212, single}, // Of another type: not there.
         {two + second, true, 0, 0, twoLine + "Read Approvals1, err=-1, iTmp==-1\n"},
-        {two + "Remote/Measurement/Approval=-2 " + second, true, 0, 0,
-         twoLine + "Read Approvals1, err=0, iTmp==-2\n"},
         {two + first, true, 0, 0, twoLine + firstLines + "Read Approvals2, err=-1, iTmp==-1\n"},
         {two + first + second, true, 0, 211,
          twoLine + firstLines + "Read Approvals2, err=0, iTmp==0\nSecond Strip verified YES\n"},
