@@ -7,8 +7,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "Handled.h"
-#include "RunProgram.h"
+#include "Browse.h"
 
 namespace {
 
@@ -50,8 +49,7 @@ TEST_F(Viewer, ShowsTheVerdictAndRunsNothingOfATicket) {
     page.insert(page.find("<header>"),
                 "<script>document.documentElement.lang='ran'</script>"
                 "<img src='data:,' onerror=\"document.documentElement.lang='ran'\">");
-    const support::Outcome seen =
-        support::browse(m_scratch.write("altered.html", page), m_scratch.path("browser"));
+    const support::Outcome seen = support::browse(m_scratch, m_scratch.write("altered.html", page));
     std::size_t stopped = 0;
     for (std::size_t at = 0; (at = seen.error.find("CONSOLE", at)) != seen.error.npos; ++at)
         ++stopped;
@@ -80,7 +78,7 @@ TEST_F(Viewer, ShowsTheVerdictAndRunsNothingOfATicket) {
 
 TEST_F(Viewer, SortsFindsAndSavesPatches) {
     ASSERT_EQ(show().exitCode, 0);
-    const support::Outcome seen = browseHandled(m_scratch, m_page, R"(
+    const support::Outcome seen = support::browseHandled(m_scratch, m_page, R"(
         const ids = () => [...document.querySelectorAll("td.patch")].map((cell) =>
             cell.firstChild.data.trim()).join("|");
         const heading = (i) => document.querySelectorAll("#patches th button")[i];
@@ -123,7 +121,7 @@ TEST_F(Viewer, ListsAPageARunAndPassesOverWhatIsNone) {
     std::filesystem::create_symlink(pageName, job + "/report-link.html");
     ASSERT_EQ(support::run({VIEWER}, options).exitCode, 0);
     const support::Outcome seen =
-        support::browse(m_scratch.path("Tintgate/reports.html"), m_scratch.path("browser"));
+        support::browse(m_scratch, m_scratch.path("Tintgate/reports.html"));
     EXPECT_THAT(seen.error, Not(HasSubstr("CONSOLE")));
     EXPECT_THAT(seen.output, HasSubstr("1 report in " + m_scratch.path("Tintgate")));
     EXPECT_THAT(seen.output, HasSubstr("<a href=\"./JobID_7/" + pageName + "\">Größe \"7\" &lt;"));

@@ -5,8 +5,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "Handled.h"
-#include "RunProgram.h"
+#include "Browse.h"
 
 namespace {
 
@@ -70,7 +69,7 @@ TEST_F(Trend, ShowsADriftAndLeadsToEachJob) {
         EXPECT_TRUE(fs::exists(pages / ("job-" + std::to_string(job) + "-strip2-2024-05-" +
                                         twoDigits(job) + "-123456.html")));
 
-    const support::Outcome seen = browseHandled(m_scratch, m_page, R"(
+    const support::Outcome seen = support::browseHandled(m_scratch, m_page, R"(
         const choose = (i) => document.querySelectorAll("#series button")[i].click();
         choose(1);
         seen("second", `${text("word")} ${text("range")} ${text("title").slice(0, 5)}`);
