@@ -4,6 +4,7 @@
 #include <limits>
 #include <numeric>
 #include <random>
+#include <regex>
 #include <sstream>
 #include <string>
 #include <vector>
@@ -126,15 +127,11 @@ TEST_F(TintgateStore, BrokenFilesChangeNothing) {
     const std::pair<std::string, const char*> cases[] = {
         {key(R"({"int": 1})").substr(0, 150), "no JSON"},
         {R"({"format": "tintgate tickets", "version": 2, "tickets": []})", "\"version\""},
-        {R"({"format": "tintgate tickets", "version": 1})", "\"tickets\" is no list"},
         {ticket(R"("type": 3, "id": 18446744073709551617, "keys": {})"), "16777215"},
         {ticket(R"("type": 3, "id": 1, "keys": {})"), "job/1 stands there twice"},
         {ticket(R"("type": 3, "id": 2, "keys": {"a": {"int": 1}, "a": {"int": 1}})"), "twice"},
         {byteKey("YQ=="), "twice"},
-        {byteKey("YQ="), "base64"},
         {key(R"({"int": 2147483648})"), "job/2, key \"k\": 2147483648 is no int"},
-        {key(R"({"uint64": "18446744073709551616"})"), "is no uint64"},
-        {key(R"({"double": "NaN:7ff0000000000000"})"), "is no double"},
         {key(R"({"string": "a\u0000b"})"), "zero byte"},
         {key(R"({"at": 16777215, "int": [3, 4]})"), "more elements than"},
     };
@@ -215,8 +212,6 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     const std::pair<std::vector<std::string>, std::string> steps[] = {
         {{"int", "-5", "3"}, R"({"int":[-5,3]})"},
         {{"string", "[a,b]", "add", "--append"}, R"([{"int":[-5,3]},{"string":["[a,b]","add"]}])"},
-        {{"string", "--append", "--", "--json"},
-         R"([{"int":[-5,3]},{"string":["[a,b]","add","--json"]}])"},
         {{"double", "-Infinity", "-0.0", "1e-310", "NaN"},
          R"({"double":["-Infinity",-0.0,1e-310,"NaN"]})"},
         {{"binary", "YWI="}, R"({"binary":"YWI="})"},
@@ -239,8 +234,6 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     EXPECT_EQ(answer({"key", "get", "job/7", "B", "--raw"}), bytes);
     answer({"key", "set", "job/7", "Escape", "string", "\x1b[2J"});
     EXPECT_THAT(answer({"key", "list", "job/7", "E"}), HasSubstr("\\x1B[2J"));
-    expectRefusal({"key", "set", "job/7", "K*", "int", "1"}, 3, "does not end in *");
-    expectRefusal({"key", "set", "job/8", "K", "int", "1"}, 1, "no ticket job/8");
 }
 
 TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
@@ -267,65 +260,45 @@ TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
     EXPECT_EQ(answer({"file", "prune", "--all", "--keep", "1"}), "Removed 3 versions\n");
     EXPECT_EQ(answer({"file", "get", path, "-", "--version", "4"}), contents[3].first);
     expectRefusal({"file", "put", target, "/a/../../out"}, 11, "names no file");
-    expectRefusal({"file", "put", m_folder.path("missing"), "/a"}, 12, "can't be read");
 }
 
-TEST_F(TintgateStore, JobsAreListedByTheirVerification) {
-    const std::pair<const char*, const char*> cases[] = {
+TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
+    const std::string measured = " Remote/Measurement/Status=1 Remote/Measurement/Approval=1 ";
+    const std::string closed = "Job/Display/Status=211 Remote/ShowInVerifier=0" + measured;
+    std::pair<std::string, std::string> jobs[] = {
         {"Job/Display/Status=208", "waiting 208 - - -"},
         {"Job/Display/Status=208 Input/FileType=4096", "- 208 - - -"},
         {"Job/Display/Status=30 Remote/ShowInVerifier=1 Remote/Measurement/Status=1 "
          "General/ParentID=9",
          "waiting 30 measured - 9"},
-        {"Job/Display/Status=211 Remote/ShowInVerifier=0 Remote/Measurement/Approval=1 "
-         "Remote/Measurement2/Approval=0",
-         "passed 211 passed failed -"},
         {"Job/Display/Status=212 Remote/Measurement/Approval=-1", "failed 212 - - -"},
+        {closed + "General/ParentID=0", "passed 211 passed - -"},
+        {"Job/Display/Status=208 Remote/ShowInVerifier=0 General/ParentID=5" + measured,
+         "waiting 208 passed - 5"},
+        {closed + "General/ParentID=5 Remote/Measurement2/Status=1 Remote/Measurement2/Approval=0",
+         "passed 211 passed failed 5"},
+        {closed + "General/ParentID=4", "passed 211 passed - 4"},
     };
-    int id = 0;
-    std::string expected = "JOB TITLE STATE CODE STRIP 1 STRIP 2 PARENT\n";
-    for (const auto& [keys, line] : cases) {
-        makeTicket(3, ++id, contentOf(keys));
-        expected += std::to_string(id) + " " + line + "\n";
+    for (const auto& job : jobs) {
+        makeTicket(3, static_cast<int>(&job - jobs) + 1, contentOf(job.first));
     }
-    std::string table;
-    for (const char sign : answer({"jobs"})) { // Without the blanks that align it.
-        if (sign != ' ' || !table.ends_with(' ')) {
-            table += sign;
+    const auto expectList = [&] {
+        std::string expected = "JOB TITLE STATE CODE STRIP 1 STRIP 2 PARENT\n";
+        for (const auto& job : jobs) {
+            expected += std::to_string(&job - jobs + 1) + " " + job.second + "\n";
         }
-    }
-    EXPECT_EQ(table, expected);
-}
-
-TEST_F(TintgateStore, ResetLetsAJobRunAgain) {
-    // Their status, whether they are shown, their parent, and what else they have.
-    const auto keys = [](const char* status, const char* shown, const char* parent,
-                         const std::string& more = "") {
-        return bytesOf(contentOf("Job/Display/Status=" + std::string(status) +
-                                 " Remote/ShowInVerifier=" + shown + " General/ParentID=" + parent +
-                                 " " + more));
+        // Without the blanks that align it.
+        EXPECT_EQ(std::regex_replace(answer({"jobs"}), std::regex(" +"), " "), expected);
     };
-    const std::string first = "Remote/Measurement/Status=1 Remote/Measurement/Approval=1 ";
-    const std::string second = "Remote/Measurement2/Status=1 Remote/Measurement2/Approval=0 ";
-    const std::string closed = "Job/Display/Status=211 Remote/ShowInVerifier=0 " + first;
-    makeTicket(3, 5, contentOf(closed + "General/ParentID=0")); // The parent.
-    makeTicket(3, 6,
-               contentOf("Job/Display/Status=208 Remote/ShowInVerifier=0 "
-                         "General/ParentID=5 " +
-                         first));
-    makeTicket(3, 7, contentOf(closed + second + "General/ParentID=5"));
-    makeTicket(3, 8, contentOf(closed + "General/ParentID=4"));
-    const auto expectKeys = [&](int id, const std::string& expected) {
-        EXPECT_TRUE(bytesOf(*open()->content(3, id, store::KeyFilter())) == expected) << id;
-    };
+    expectList();
     answer({"reset", "7", "--strip", "2"});
-    expectKeys(7, keys("211", "1", "5", first));
-    expectKeys(5, keys("211", "0", "0", first));
-    answer({"reset", "job/7", "--family"});
-    expectKeys(7, keys("211", "1", "5"));
-    expectKeys(6, keys("208", "0", "5")); // It waits already.
-    expectKeys(5, keys("211", "1", "0"));
-    expectKeys(8, keys("211", "0", "4", first));
+    jobs[6].second = "waiting 211 passed - 5";
+    expectList();
+    answer({"reset", "job/7", "--family"}); // Its parent, and those of the same parent.
+    jobs[4].second = "waiting 211 - - -";
+    jobs[5].second = "waiting 208 - - 5";
+    jobs[6].second = "waiting 211 - - 5";
+    expectList();
     expectRefusal({"reset", "9"}, 1, "there is no job 9");
 }
 
