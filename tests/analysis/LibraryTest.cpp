@@ -239,7 +239,6 @@ TEST_F(Library, NamesInstruments) {
          "BEGIN_DATA\r\n1\r\nEND_DATA",
          0, wxString(L"Gro\u00df = A")},
         {"CGATS.17\r\nKEYWORD DEVICEMODE\r\nDEVICEMODE 0\r\n", exitInputDamaged, "before"},
-        {"CGATS.17\r\nDEVICE some\r\n", exitValueNotNumeric, "before"},
     };
     for (const auto& [definition, status, expected] : cases) {
         wxString name = "before";
