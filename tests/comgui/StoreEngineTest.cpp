@@ -1,6 +1,10 @@
 #include "comgui/StoreEngine.h"
 
+#include <algorithm>
 #include <csignal>
+#include <map>
+#include <random>
+#include <ranges>
 
 #include <sys/resource.h>
 #include <sys/stat.h>
@@ -82,58 +86,50 @@ TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
 }
 
 TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
-    const auto other = open();
-    store::StoreKeep keep(open());
-    const std::string status = "Job/Display/Status";
-    const auto read = [&](int id, const std::string& key) {
-        const auto elements = keep.key(3, id, key);
-        return elements == nullptr ? -1 : std::get<int>(*elements->first());
-    };
-    const auto write = [&](int id, int value, const std::string& more = {}) {
-        send(*other, 3, id, status + "=" + std::to_string(value) + " " + more);
-    };
-    for (const int id : {3, 1, 2}) {
-        other->create(3, id);
-        write(id, 200 + id);
-    }
-    other->create(27, 2); // Of another type.
-    send(*other, 27, 2, status + "=1");
-    // From here on the keep holds the status of all jobs; no read may show what is no longer there.
-    EXPECT_EQ(keep.ids(3), (std::vector<int>{1, 2, 3}));
-    EXPECT_EQ(read(1, status), 201);
-    EXPECT_EQ(read(2, status), 202);
-    EXPECT_EQ(read(1, "Input/FileType"), -1);
-    write(2, 209, "Input/FileType=4096");
-    EXPECT_EQ(read(2, status), 209);
-    EXPECT_EQ(read(2, "Input/FileType"), 4096);
-    keep.ids(3);
-    std::string large;
-    for (int i = 1; i < 100; ++i) {
-        large += status + "[-2]=1 ";
-    }
-    write(3, 7, large); // No longer held.
-    EXPECT_EQ(read(3, status), 7);
-    EXPECT_EQ(read(1, status), 201);
-    other->remove(3, 1);
-    EXPECT_EQ(read(1, status), -1);
-    EXPECT_EQ(keep.ids(3), (std::vector<int>{2, 3}));
-    EXPECT_EQ(read(2, status), 209);
-    write(3, 8);
-    keep.ids(3);
-    EXPECT_EQ(read(3, status), 8) << "a listing is no older than its ids";
-    keep.ids(3);
-    EXPECT_EQ(read(2, status), 209);
-    support::RecordTable own(status + "=9");
-    keep.apply(3, 3, own.records());
-    EXPECT_EQ(read(3, status), 9) << "its own writes show in a listing, too";
-    for (int i = 0; i < 200; ++i) { // Across overviews that fall due.
-        write(2, i, "Other=" + std::to_string(i));
-        if (i % 50 == 0) {
+    // The first two are held of all jobs at once, from when a reader asks for the ids.
+    const std::string keys[] = {"Job/Display/Status", "Input/FileType", "Other"};
+    store::StoreKeep reader(open());
+    store::StoreKeep other(open());
+    std::map<int, std::map<std::string, int>> jobs; // What is there.
+    std::mt19937 random(1);
+    const auto below = [&](int limit) { return static_cast<int>(random() % unsigned(limit)); };
+    other.create(27, 2); // Of another type.
+    for (int step = 0; step < 250 && !HasFailure(); ++step) {
+        store::StoreKeep& writer = below(3) == 0 ? reader : other;
+        const int id = 1 + below(3);
+        const std::string& key = keys[below(3)];
+        const int what = below(9);
+        if (what == 0) {
+            EXPECT_EQ(writer.remove(3, id), jobs.erase(id) != 0);
+        } else if (what == 1) {
+            EXPECT_EQ(writer.create(3, id), jobs.try_emplace(id).second);
+        } else if (what == 2) {
             sql("PRAGMA wal_checkpoint(TRUNCATE)", "SELECT 1");
+        } else {
+            std::string records = key + "=" + std::to_string(step);
+            for (int more = what == 3 ? 100 : 0; more > 0; --more) { // Too many to be held.
+                records += " " + key + "[-2]=1";
+            }
+            support::RecordTable table(records);
+            other.apply(27, 2, table.records());
+            if (writer.apply(3, id, table.records())) {
+                jobs[id][key] = step;
+            }
         }
-        EXPECT_EQ(read(2, "Other"), i);
-        EXPECT_EQ(read(2, status), i);
-        EXPECT_EQ(read(3, status), 9);
+        if (below(4) == 0) {
+            EXPECT_TRUE(std::ranges::equal(reader.ids(3), std::views::keys(jobs)));
+        }
+        // In this order no read goes on with a listing, which may show what was there before.
+        for (int job = 3; job > 0; --job) {
+            for (const int index : {1, 0, 2}) {
+                const std::string& name = keys[index == 2 && step / 8 % 3 + 1 != job ? 0 : index];
+                const auto elements = reader.key(3, job, name);
+                const bool isThere = jobs.count(job) != 0 && jobs[job].count(name) != 0;
+                ASSERT_EQ(elements ? std::get<int>(*elements->first()) : -1,
+                          isThere ? jobs[job][name] : -1)
+                    << step << ": " << job << " " << name;
+            }
+        }
     }
 }
 
