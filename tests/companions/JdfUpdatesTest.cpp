@@ -221,7 +221,6 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
              "</j:ResourcePool><j:ResourceLinkPool a='/>' >" + linkTo(none) +
              "</j:ResourceLinkPool></j:JDF>"},
         {pooled(full + "</tazo:MeasurementData>"), pooled(holder())}, // As an update made it.
-        {pooled(full + "</tazo:MeasurementData\n>"), pooled(holder())},
         {pooled("<tazo:MeasurementData ID='a'/>"),
          pooled("<tazo:MeasurementData ID='a'></tazo:MeasurementData>")},
         {pooled(holder(), "<Sender printdate=\"\" printtime='1'/>"),
@@ -246,8 +245,6 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
          "line 2 would mislead the update: a date"},
         {"<JDF><!-- </tazo:MeasurementData> --><x/></JDF>", "no tag"},
         {"<JDF><!-- " + full + " --><x/></JDF>", "own opening tag"},
-        {"<JDF/>", "nothing in the document"},
-        {"<JDF>\n</x>", "line 2: mismatched tag"},
         {std::string("<\0a\0/\0>\0", 8), "UTF-16"},
     };
     for (const auto& [text, words] : refused) {
@@ -282,18 +279,12 @@ TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     answer({"jdf", "rebuild", "7", "--from", std::to_string(lastVersion() + 1)});
     EXPECT_THAT(stored(), HasSubstr("<JDF><new/>"));
     EXPECT_EQ(measurements(stored()), "");
-    put("<JDF>");
-    expectRefusal({"jdf", "rebuild", "7", "--from", "99"}, 15);
-    EXPECT_EQ(stored(), "<JDF>");
 }
 
 TEST_F(JdfUpdates, AreOfTheJdfsThatAJobNames) {
     expectRefusal({"jdf", "ready", "7"}, 1, "not there: " + jdfPath);
     put(delivered);
     expectRefusal({"jdf", "ready", "7", "--updates", "17"}, 16, "too many");
-    EXPECT_EQ(stored(), delivered);
-    answer({"jdf", "ready", "7", "--updates", "16"});
-    EXPECT_EQ(stored().size(), 5000U + 2358684);
 
     // The folder's other key; and the second JDF of a job that is printed elsewhere.
     answer({"key", "delete", "job/7", "System/Folders/Temp"});
@@ -311,26 +302,22 @@ TEST_F(JdfUpdates, AreOfTheJdfsThatAJobNames) {
 
 TEST_F(JdfUpdates, ArePreparedForAtDeliveryWhereTheStoreSaysSo) {
     const std::string tree = m_folder.makeFolder("tree");
-    m_folder.write("tree/A.JDF", delivered);
-    m_folder.write("tree/a.xml", delivered);
-    m_folder.write("tree/broken.jdf", "<JDF>");
-    const auto put = [&] {
-        const auto outcome = run({"file", "put", tree, "/tree"});
-        EXPECT_EQ(outcome.exitCode, 0);
-        return outcome.error;
+    const std::pair<std::string, std::string> files[] = {
+        {"a.JDF", delivered}, {"a.xml", delivered}, {"broken.jdf", "<JDF>"}};
+    for (const auto& [name, text] : files) {
+        m_folder.write("tree/" + name, text);
+    }
+    const auto putTree = [&](const std::string& prepared, const std::string& words) {
+        EXPECT_THAT(run({"file", "put", tree, "/tree"}).error, HasSubstr(words));
+        for (const auto& [name, text] : files) {
+            EXPECT_EQ(withoutBlanks(answer({"file", "get", "/tree/" + name, "-"})),
+                      name == "a.JDF" ? prepared : text);
+        }
     };
-    const auto get = [&](const char* name) {
-        return answer({"file", "get", std::string("/tree/") + name, "-"});
-    };
-    EXPECT_EQ(put(), "");
-    EXPECT_EQ(get("A.JDF"), delivered);
+    putTree(delivered, "");
     answer({"key", "set", "system", "System/Jdf/Updates", "int", "6"});
-    EXPECT_THAT(put(), HasSubstr("delivered as it is, /tree/broken.jdf: it is not well-formed"));
-    EXPECT_EQ(withoutBlanks(get("A.JDF")), prepared);
-    EXPECT_EQ(get("A.JDF").size(), 5000U + 2052);
-    EXPECT_EQ(m_store->versions("/tree/A.JDF").size(), 2U); // As delivered both times.
-    EXPECT_EQ(get("a.xml"), delivered);
-    EXPECT_EQ(get("broken.jdf"), "<JDF>");
+    putTree(prepared, "delivered as it is, /tree/broken.jdf: it is not well-formed");
+    EXPECT_EQ(m_store->versions("/tree/a.JDF").size(), 2U); // As delivered both times.
 }
 
 } // namespace
