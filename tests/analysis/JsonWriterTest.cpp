@@ -7,8 +7,6 @@
 
 #include <gtest/gtest.h>
 
-#include "analysis/Text.h"
-
 namespace {
 
 std::string numberText(double value) {
@@ -58,14 +56,6 @@ TEST(JsonText, IsAsciiWhateverGoesIn) {
         json.text(text);
         EXPECT_EQ(json.written(), expected);
     }
-}
-
-TEST(Text, BytesSurviveTheRoundTrip) {
-    const std::string bytes = "\xc3\xa4\xff \xed\xb2\x80 \xf4\x90\x80\x80 \xe2\x82";
-    EXPECT_EQ(analysis::narrowed(analysis::widened(bytes)), bytes);
-    const std::wstring units = {wchar_t(0xFFFFFF80), wchar_t(0xFFFFFFFF), wchar_t(0xD800)};
-    EXPECT_EQ(analysis::narrowed(units), "\x80\xff\ufffd");
-    EXPECT_EQ(analysis::documentText(units), "\ufffd\ufffd\ufffd");
 }
 
 } // namespace

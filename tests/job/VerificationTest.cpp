@@ -24,6 +24,7 @@
 #include "RunningProgram.h"
 #include "SuiteRoot.h"
 #include "TicketText.h"
+#include "comgui/Sqlite.h"
 #include "comgui/StoreEngine.h"
 #include "comgui/StoreKeep.h"
 #include "comgui/Users.h"
@@ -248,12 +249,10 @@ auto file(const std::string& serverPath, const std::string& contents) {
 auto blocked(const char* jobFile) {
     return [=](const Place& place) { fs::create_directories(place.jobFile(jobFile)); };
 }
-auto storeFormat(const std::string& version) {
+auto storeFormat(const std::string& format) {
     return [=](const Place& place) {
-        support::run({"python3", "-c",
-                      "import sqlite3, sys\n"
-                      "sqlite3.connect(sys.argv[1]).execute('PRAGMA user_version=' + sys.argv[2])",
-                      place.address + "/tickets.db", version});
+        store::sqlite::Database(place.address + "/tickets.db", false)
+            .run(("PRAGMA user_version = " + format).c_str());
     };
 }
 

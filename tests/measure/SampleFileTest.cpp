@@ -18,10 +18,8 @@ constexpr double infinity = std::numeric_limits<double>::infinity();
 
 /// Numbers on which texts could part: edges, any bits at all, and few digits as instruments give.
 double anyNumber(std::mt19937_64& random) {
-    static const double edges[] = {
-        0.0,       -0.0,       infinity,       -infinity, std::nan(""),        -std::nan(""),
-        999999.5,  9999999.5,  99999999.5,     2.5e-5,    0.00009999999999995, 9.9999995,
-        99999.995, 1.9073e-06, std::exp2(-19), 100000,    0.09999999499999999, 0.0001};
+    static const double edges[] = {-0.0,      infinity,  -std::nan(""),       999999.5,
+                                   9999999.5, 9.9999995, 0.00009999999999995, 1e5};
     const std::uint64_t bits = random();
     switch (random() % 4) {
     case 0:
