@@ -140,47 +140,41 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
     longNames.resize(511 - std::string("SAMPLE_ID\t").size());
 
     const struct {
-        const char* what;
         std::string text;
         std::string patches;
+        int exitCode = 0;
+        const char* words = "";
     } cases[] = {
-        {"names of several bytes, whose rows are cut off",
-         table("SAMPLE_NAME\t" + cmyk + colours,
+        // Names of several bytes and none, in rows that are cut off.
+        {table("SAMPLE_NAME\t" + cmyk + colours,
                "1\tGröße a\t100\t0\t0\t0\t55\t-36\t-50\t1\t2\t74.\n"
                "2\t白い 紙\t40\t27\t27\t0\t95.00\t0.00\t0.00\t84.00\n"
                "3\t\t0\t0\t0\t50\t95\t0\t0\t84\t87\t74\n" +
                    end),
          simple + "3: 0 0 0 50; "},
-        {"rows and names cut off at 511 bytes",
-         table(longNames, ("1\t100\t0\t0\t0" + values).substr(0, 511) + "\n" +
+        // Rows and names of columns cut off at 511 bytes.
+        {table(longNames, ("1\t100\t0\t0\t0" + values).substr(0, 511) + "\n" +
                               ("2\t40\t27\t27\t0" + values).substr(0, 511) + "\n" + end),
          simple},
-        {"filling rows, beyond the count, with columns of their own",
-         table("SAMPLE_NAME\tCMYK_K\tCMYK_C\tCMYK_M\tCMYK_Y\tSPOT_1",
+        // Rows that fill a strip, with columns of their own.
+        {table("SAMPLE_NAME\tCMYK_K\tCMYK_C\tCMYK_M\tCMYK_Y\tSPOT_1",
                "1\tA1\t5\t100\t0\t0\t0\n2" + white + "3" + white + "END_DATA"),
          "1: 100 0 0 5 0; 2: 0 0 0 0 0; 3: 0 0 0 0 0; "},
-        {"RGB in percent",
-         table("RGB_R\tRGB_G\tRGB_B" + lab, "1\t0\t20\t100\t3\t0\t0\n2" + whiteRgb + "END_DATA"),
+        {table("RGB_R\tRGB_G\tRGB_B" + lab, "1\t0\t20\t100\t3\t0\t0\n2" + whiteRgb + "END_DATA"),
          "1: 0 20 100; 2: 100 100 100; "},
-    };
-    for (const auto& c : cases) {
-        SCOPED_TRACE(c.what);
-        EXPECT_EQ(patchesText(measured(crlf(c.text), virtualPrint)), c.patches);
-    }
-
-    const struct {
-        std::string text;
-        int exitCode;
-        const char* words;
-    } refused[] = {
-        {"", 4, "is neither"},
-        {head + format(cmyk) + begin + "1\t100", 4, "is damaged or cut off"},
-        {table("SAMPLE_NAME\t" + cmyk + "\tSPOT_1", "1\tGrün\t0\t0\t0\t0\t10\n" + end), 4,
+        {"", "", 4, "is neither"},
+        {head + format(cmyk) + begin + "1\t100", "", 4, "is damaged or cut off"},
+        {table("SAMPLE_NAME\t" + cmyk + "\tSPOT_1", "1\tGrün\t0\t0\t0\t0\t10\n" + end), "", 4,
          "row 1 of the definition has lost"},
-        {table(cmyk + "\tSPOT_1", "1\t0\t0\t0\t0\t9\n" + end), 5, "other colorants"},
+        {table(cmyk + "\tSPOT_1", "1\t0\t0\t0\t0\t9\n" + end), "", 5, "other colorants"},
     };
-    for (const auto& c : refused)
-        expectFailure(measure(crlf(c.text), virtualPrint), c.exitCode, c.words);
+    for (const auto& [text, patches, exitCode, words] : cases) {
+        SCOPED_TRACE(text);
+        if (exitCode != 0)
+            expectFailure(measure(crlf(text), virtualPrint), exitCode, words);
+        else
+            EXPECT_EQ(patchesText(measured(crlf(text), virtualPrint)), patches);
+    }
 }
 
 TEST_F(MeasureTool, SpectraHaveTheColourMeasured) {

@@ -1,6 +1,5 @@
 #include <algorithm>
 #include <cmath>
-#include <functional>
 #include <limits>
 #include <string>
 #include <vector>
@@ -130,15 +129,6 @@ TEST(Model, SaysFirstWhatFailedAndByHowMuch) {
               "1 of 2 criteria can't be answered from these data, 1 failed.");
     result.criteria.clear();
     EXPECT_THAT(makeModel(result, nullptr).sentence, HasSubstr("judges no criterion"));
-}
-
-TEST(Model, DrawsTheWorstAndAnEvenRest) {
-    const Model model = makeModel(resultOf(100'000), nullptr);
-    ASSERT_EQ(model.drawn.size(), mostDrawn);
-    EXPECT_EQ(model.drawn[999], 999u);
-    EXPECT_EQ(model.drawn[1001] - model.drawn[1000], 99u);
-    EXPECT_EQ(std::adjacent_find(model.drawn.begin(), model.drawn.end(), std::greater_equal()),
-              model.drawn.end());
 }
 
 TEST(Readers, RefuseWhatIsNoResultAndNoTime) {

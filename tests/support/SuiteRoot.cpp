@@ -9,18 +9,10 @@ namespace support {
 
 namespace {
 
-std::string escaped(const std::string& text) {
-    std::string result;
-    for (const char c : text) {
-        result += c == '&' ? "&amp;" : c == '<' ? "&lt;" : std::string(1, c);
-    }
-    return result;
-}
-
 std::string entry(const std::string& key, const std::string& value) {
     const std::size_t slash = key.find('/');
     if (slash == std::string::npos) {
-        return "<key>" + key + "</key><string>" + escaped(value) + "</string>";
+        return "<key>" + key + "</key><string><![CDATA[" + value + "]]></string>";
     }
     return "<key>" + key.substr(0, slash) + "</key><dict>" + entry(key.substr(slash + 1), value) +
            "</dict>";

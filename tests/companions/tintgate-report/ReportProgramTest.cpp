@@ -1,4 +1,5 @@
 #include <filesystem>
+#include <regex>
 #include <string>
 #include <vector>
 
@@ -116,13 +117,10 @@ TEST_F(ReportProgram, SaysTheVerdictByItsExitStatusAlone) {
 }
 
 TEST_F(ReportProgram, ExplainsExitCodes) {
-    for (const ExitCodeText& code : {std::begin(exitCodeTexts)[0], std::end(exitCodeTexts)[-1]}) {
-        std::string words = report({"--explain", std::to_string(code.code)}).output;
-        for (std::size_t at; (at = words.find("\n        ")) != words.npos;)
-            words.replace(at, 9, " ");
-        for (const char* text : {code.meaning, code.cause, code.remedy})
-            EXPECT_THAT(words, HasSubstr(text + std::string(".\n")));
-    }
+    const ExitCodeText& code = std::end(exitCodeTexts)[-1];
+    const std::string words = report({"--explain", std::to_string(code.code)}).output;
+    EXPECT_THAT(std::regex_replace(words, std::regex("\\s+"), " "),
+                AllOf(HasSubstr(code.meaning), HasSubstr(code.cause), HasSubstr(code.remedy)));
     EXPECT_EQ(report({"--explain", "104"}).exitCode, 9);
     EXPECT_THAT(report({"--explain", "139"}).error, HasSubstr("signal"));
 }
