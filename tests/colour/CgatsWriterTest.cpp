@@ -89,21 +89,10 @@ TEST(CgatsWriter, StatesItsScales) {
     expectReadBack(dark);
 }
 
-// ArgyllCMS as a second reader: it finds no difference between a text of ours and one of its own,
-// and makes a profile's input of it.
+// ArgyllCMS as a second reader, which makes a profile's input of a text of ours.
 TEST(CgatsWriter, IsReadByArgyll) {
     const support::ScratchFolder folder;
-    const std::string fogra = "/usr/share/color/icc/FOGRA39L.ti3";
-    DataSet set;
-    ASSERT_EQ(readCgats(support::contentsOf(fogra), {}, set), Failure::None);
-    EXPECT_THAT(set.notes, testing::IsEmpty());
-    EXPECT_EQ(set.conditions, (Conditions{"D50", "2", ""}));
-    const support::Outcome compared =
-        support::run({"colverify", "-v", fogra, folder.write("ours.txt", writeCgats(set))});
-    EXPECT_THAT(compared.output, HasSubstr("No of test patches = 1617")) << compared.error;
-    EXPECT_THAT(compared.output, HasSubstr("peak = 0.000000, avg = 0.000000"));
-
-    set = randomSet(50);
+    const DataSet set = randomSet(50);
     const std::string measured = folder.write("measured.txt", writeCgats(set));
     const support::Outcome converted = support::run({"txt2ti3", measured, folder.path("measured")});
     EXPECT_EQ(converted.exitCode, 0) << converted.error;

@@ -1,8 +1,7 @@
 #include "colour/ColourFile.h"
 
-#include <fstream>
+#include <cstdlib>
 #include <string>
-#include <thread>
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -65,13 +64,9 @@ TEST(ColourFile, WaitsForPipes) {
     const support::ScratchFolder folder;
     const std::string path = folder.path("pipe");
     ASSERT_EQ(mkfifo(path.c_str(), 0600), 0);
-    std::thread writer([&] {
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-        std::ofstream pipe(path);
-        pipe << text.substr(0, 20) << std::flush;
-        std::this_thread::sleep_for(std::chrono::milliseconds(10));
-        pipe << text.substr(20);
-    });
+    const std::string file = folder.write("file", text);
+    const std::string pieces =
+        "(head -c 20 " + file + "; sleep 0.02; tail -c +21 " + file + ") > " + path + " &";
+    ASSERT_EQ(std::system(pieces.c_str()), 0);
     EXPECT_EQ(load(path), Failure::None);
-    writer.join();
 }
