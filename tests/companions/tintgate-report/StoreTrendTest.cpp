@@ -185,12 +185,9 @@ TEST_F(StoreTrend, CountsTheResultOfASheetOnce) {
 
 TEST_F(StoreTrend, LeadsToThePagesOnThisMachine) {
     const std::string data = source + "/tests/data/report/";
-    m_folder.makeFolder("Tintgate/JobID_5");
     m_folder.write("Tintgate/JobID_5/output.json", support::contentsOf(data + "output.json"));
     json meta = json::parse(support::contentsOf(data + "meta.json"));
-    meta["job"]["id"] = 5;
-    meta["job"]["strip"] = 1;
-    meta["job"]["title"] = "Order 5";
+    meta["job"].update({{"id", 5}, {"strip", 1}, {"title", "Order 5"}});
     for (const char* created : {"2026-11-05T21:53:00+01:00",    // Of the run before.
                                 "2026-11-05T21:53:09+01:00",    // That of the ticket.
                                 "2026-11-06T10:00:00+01:00"}) { // Compared again.
@@ -198,8 +195,7 @@ TEST_F(StoreTrend, LeadsToThePagesOnThisMachine) {
         const auto path = m_folder.write("Tintgate/JobID_5/meta.json", meta.dump());
         EXPECT_EQ(support::run({VIEWER, "-meta", path}).exitCode, 0);
     }
-    m_folder.makeFolder("pages");
-    ASSERT_EQ(report({"-o", m_folder.path("pages/trend.html")}).exitCode, 0);
+    ASSERT_EQ(report({"-o", m_folder.makeFolder("pages") + "/trend.html"}).exitCode, 0);
     const std::string page = support::contentsOf(m_folder.path("pages/trend.html"));
     EXPECT_THAT(page, HasSubstr("./../Tintgate/JobID_5/report-strip1-2026-11-05-215309.html"));
     EXPECT_EQ(page.find("report-strip1-"), page.rfind("report-strip1-"));
