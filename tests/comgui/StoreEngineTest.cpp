@@ -16,7 +16,12 @@ using store::Fault;
 namespace {
 
 class StoreEngine : public StoreTest {};
-class FolderStore : public FolderStoreTest {};
+
+/// What only a store in a folder has.
+class FolderStore : public StoreTest {
+  protected:
+    FolderStore() : StoreTest(Engine::Sqlite) {}
+};
 
 ON_BOTH_ENGINES(StoreEngine);
 

@@ -140,9 +140,3 @@ class StoreTest : public testing::TestWithParam<Engine> {
     const std::unique_ptr<support::PostgresRoom> room; ///< Null where the store is a folder.
     const std::string address;
 };
-
-/// Tests of what only a store in a folder has.
-class FolderStoreTest : public StoreTest {
-  protected:
-    FolderStoreTest() : StoreTest(Engine::Sqlite) {}
-};
