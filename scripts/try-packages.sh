@@ -15,6 +15,7 @@ leave() {
 }
 trap 'leave '"${1:+kept}" EXIT
 
+chmod 755 "$root" # Of a root for its owner alone no other user of it could enter "/".
 [ -e "$root/bin/sh" ] || debootstrap --variant=minbase bookworm "$root" >/dev/null
 mount -t proc proc "$root/proc"
 cp /etc/resolv.conf "$root/etc/"
