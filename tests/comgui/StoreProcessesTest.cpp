@@ -27,11 +27,40 @@ class NumberedWrites {
     };
 
     NumberedWrites()
-        : done(*new (mmap(nullptr, sizeof(Done), PROT_READ | PROT_WRITE, MAP_SHARED | MAP_ANONYMOUS,
-                          -1, 0)) Done{}) {}
-    ~NumberedWrites() { munmap(&done, sizeof(Done)); }
+        : m_done(*new (mmap(nullptr, sizeof(Done), PROT_READ | PROT_WRITE,
+                            MAP_SHARED | MAP_ANONYMOUS, -1, 0)) Done{}) {}
+    ~NumberedWrites() { munmap(&m_done, sizeof(Done)); }
     NumberedWrites(const NumberedWrites&) = delete;
 
+    /// Has writers of a store cut off, each at some moment of its work.
+    void expectWholeAfter(const std::string& store, int rounds,
+                          const std::function<void(pid_t writer)>& cutOff) {
+        store::openStore(store)->create(3, 1);
+        int last = 0;
+        int workedOn = 0; // Rounds in which something was written.
+        for (int round = 0; round < rounds && !testing::Test::HasFailure(); ++round) {
+            m_done.begun = false;
+            const pid_t writer = startProcess([&] {
+                alarm(35); // For a server that falls silent, instead of telling at once.
+                const auto fault =
+                    StoreTest::faultOf([&] { write(*store::openStore(store), last + 1); });
+                return fault == store::Fault::Lost || fault == store::Fault::Missing ? 0 : 2;
+            });
+            // Of every ten rounds one may be in its first write.
+            for (int wait = 0; round % 10 != 0 && !m_done.begun && wait < 200'000; ++wait) {
+                usleep(100);
+            }
+            usleep(m_random() % 60'000);
+            cutOff(writer);
+            const int table = expectWhole(*store::openStore(store));
+            workedOn += table > last ? 1 : 0;
+            last = table;
+        }
+        EXPECT_GT(workedOn, rounds / 3) << "writers were cut off before they wrote anything";
+        expectWholeVersions(*store::openStore(store));
+    }
+
+  private:
     /// Writes with this number and those behind it, until the store fails.
     [[noreturn]] void write(store::StoreEngine& engine, int number) const {
         for (;; ++number) {
@@ -43,19 +72,11 @@ class NumberedWrites {
             if (StoreTest::send(engine, 3, 1, records + " last=" + text)[0] == 'r') {
                 engine.ids(3); // Tells why it was refused.
             }
-            done.table = number;
+            m_done.table = number;
             StoreTest::putFile(engine, path, fileText(number));
-            done.file = number;
-            done.begun = true;
+            m_done.file = number;
+            m_done.begun = true;
         }
-    }
-
-    /// Waits for a moment in a writer's work: of every ten rounds one may be in its first write.
-    void waitForAMoment(int round, unsigned window) {
-        for (int wait = 0; round % 10 != 0 && !done.begun && wait < 200'000; ++wait) {
-            usleep(100);
-        }
-        usleep(m_random() % window);
     }
 
     /// The number of the table that is there; the file's may be a further one.
@@ -71,9 +92,9 @@ class NumberedWrites {
         const int table = numbers.empty() ? 0 : *numbers.begin();
         EXPECT_EQ(numbers.count(table), numbers.empty() ? 0u : arraySize + 2);
         EXPECT_EQ(numbers.count(table), numbers.size());
-        EXPECT_GE(table, done.table);
-        if (done.file > 0) {
-            EXPECT_GE(expectWholeFile(StoreTest::file(engine, path)), done.file);
+        EXPECT_GE(table, m_done.table);
+        if (m_done.file > 0) {
+            EXPECT_GE(expectWholeFile(StoreTest::file(engine, path)), m_done.file);
         }
         return table;
     }
@@ -89,9 +110,6 @@ class NumberedWrites {
         EXPECT_EQ(engine.files().size(), 1u);
     }
 
-    Done& done;
-
-  private:
     static constexpr const char* path = "jobs/1/job.jdf";
     static constexpr unsigned arraySize = 1'500;
     static constexpr std::size_t fill = 100'000;
@@ -106,6 +124,7 @@ class NumberedWrites {
         return number;
     }
 
+    Done& m_done;
     std::mt19937 m_random{5}; // NOLINT: the same moments, as far as that goes
 };
 
@@ -162,52 +181,21 @@ TEST_P(StoreProcesses, TwoWritersLoseAndMixNothing) {
 }
 
 TEST_P(StoreProcesses, WritersKilledAtAnyMomentLeaveWholeTablesAndFiles) {
-    const int rounds = roundsOr(25);
-    open()->create(3, 1);
-    NumberedWrites writes;
-    int written = 0;
-    for (int round = 0; round < rounds && !HasFailure(); ++round) {
-        writes.done.begun = false;
-        const pid_t child = startProcess([&] {
-            writes.write(*open(), written + 1);
-            return 0;
-        });
-        writes.waitForAMoment(round, 50'000);
-        kill(child, SIGKILL);
-        ASSERT_EQ(endOf(child), 1000 + SIGKILL);
-        written = writes.expectWhole(*open());
-    }
-    EXPECT_GT(written, rounds / 4) << "the writers were killed before they wrote anything";
-    writes.expectWholeVersions(*open());
+    NumberedWrites().expectWholeAfter(address, roundsOr(25), [](pid_t writer) {
+        kill(writer, SIGKILL);
+        EXPECT_EQ(endOf(writer), 1000 + SIGKILL);
+    });
 }
 
 // As a crash would stop it.
 TEST(PostgresStop, LosesNothingAndLeavesNoWriterHanging) {
-    const int rounds = roundsOr(5);
     const support::PostgresServer server;
     store::makeStore("tintgate", "Press room");
-    store::openStore("tintgate")->create(3, 1);
-    NumberedWrites writes;
-    int last = 0;
-    int workedOn = 0; // Rounds in which something was written.
-    for (int round = 0; round < rounds && !testing::Test::HasFailure(); ++round) {
-        writes.done.begun = false;
-        const pid_t client = startProcess([&] {
-            alarm(35); // It is told at once; the limit is for a server that only falls silent.
-            const auto fault =
-                StoreTest::faultOf([&] { writes.write(*store::openStore("tintgate"), last + 1); });
-            return fault == store::Fault::Lost || fault == store::Fault::Missing ? 0 : 2;
-        });
-        writes.waitForAMoment(round, 100'000);
+    NumberedWrites().expectWholeAfter("tintgate", roundsOr(5), [&](pid_t writer) {
         server.stop("immediate");
-        EXPECT_EQ(endOf(client), 0);
+        EXPECT_EQ(endOf(writer), 0);
         server.startAgain();
-        const int table = writes.expectWhole(*store::openStore("tintgate"));
-        workedOn += table > last ? 1 : 0;
-        last = table;
-    }
-    EXPECT_GT(workedOn, rounds / 3) << "the server was stopped before anything was written";
-    writes.expectWholeVersions(*store::openStore("tintgate"));
+    });
     EXPECT_EQ(support::BarePostgres("tintgate")
                   .run("SELECT count(*) FROM tintgate.contents WHERE number NOT IN"
                        " (SELECT content FROM tintgate.files WHERE content IS NOT NULL UNION ALL"

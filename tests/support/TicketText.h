@@ -12,7 +12,7 @@
 // a[-1]=1 a[1]=2 a[2]=3.
 #pragma once
 
-#include <cmath>
+#include <charconv>
 #include <cstdint>
 #include <cstdio>
 #include <cstring>
@@ -60,12 +60,8 @@ inline std::string valueText(PARAM_TYPE type, const void* value) {
     case PARAM_STRING:
         return std::string("'") + static_cast<const char*>(value);
     case PARAM_DOUBLE: {
-        const double number = *static_cast<const double*>(value);
-        if (std::isnan(number)) {
-            return "nan";
-        }
-        char text[40];
-        std::snprintf(text, sizeof text, "%.17g", number);
+        char text[40] = {};
+        std::to_chars(text, std::end(text), *static_cast<const double*>(value));
         return std::strpbrk(text, ".en") != nullptr ? text : std::string(text) + ".0";
     }
     case PARAM_BINARY: {
