@@ -26,9 +26,7 @@ class Tidy : public testing::Test {
 
     /// A job's folder with a file and a folder in it, all of that age.
     void makeJob(const std::string& name, int days = 40) const {
-        m_scratch.makeFolder("Tintgate/" + name);
         m_scratch.write("Tintgate/" + name + "/output.json", "{}");
-        m_scratch.makeFolder("Tintgate/" + name + "/inner");
         m_scratch.write("Tintgate/" + name + "/inner/file", "x");
         makeOld(path(name), days);
     }
