@@ -91,7 +91,7 @@ int showResult(KZJobDataStruct& job, const std::wstring& json) {
     int result = exitDone;
     if (!Helper::LaunchNerovaVerify(result, false, " -detail -meta " + meta, true)) {
         CLogger::GetLogger()->Log("Nerova Verify.exe allready running");
-        return exitViewerRunning;
+        return exitViewerNotStarted;
     }
     return result;
 }
