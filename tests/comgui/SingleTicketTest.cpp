@@ -18,12 +18,12 @@ TEST(SingleTicket, ReadsOnlyWhatIsThereUnderItsType) {
         {"a", PARAM_STRING, -1, "none"}, {"a", 10, -1, "none"},
         {"v", PARAM_STRING, -1, "'x"},   {"v", PARAM_STRING, 0, "none"},
         {"v", PARAM_UINT, -1, "none"},   {"v", PARAM_UINT, 4, "u7"},
-        {"v", PARAM_COUNT, -1, "5"},     {"z", PARAM_COUNT, -1, "none"},
-        {"v", PARAM_DELETE, 4, "8"},     {"v", PARAM_DELETE, 3, "none"},
+        {"v", PARAM_COUNT, -1, "U5"},    {"z", PARAM_COUNT, -1, "none"},
+        {"v", PARAM_DELETE, 4, "U8"},    {"v", PARAM_DELETE, 3, "none"},
         {"d", PARAM_DOUBLE, -1, "2.5"},  {"b", PARAM_BINARY, 0, "#0102"},
         {"n", PARAM_INT, 2, "6"},        {"n", PARAM_INT, -1, "4"},
         {"n", PARAM_UINT, 2, "none"},    {"n", PARAM_INT, 3, "none"},
-        {"n", PARAM_DELETE, 2, "2"},     {"n", PARAM_COUNT, -1, "3"},
+        {"n", PARAM_DELETE, 2, "U2"},    {"n", PARAM_COUNT, -1, "U3"},
     };
     for (const auto& [key, type, position, expected] : rows) {
         std::uint64_t place[2] = {};
@@ -31,14 +31,11 @@ TEST(SingleTicket, ReadsOnlyWhatIsThereUnderItsType) {
         GETMULTIPAR table[2] = {
             {.key = key, .type = ptype, .value = place, .position = position, .result = 1}, {}};
         single::GetMultiParameter::call(*ticket.real(), table);
-        const void* value = place;
-        if (ptype == PARAM_STRING) {
-            value = reinterpret_cast<const char*>(place[0]);
-        }
         const bool isNumber = ptype == PARAM_COUNT || ptype == PARAM_DELETE;
+        const void* text = reinterpret_cast<const char*>(place[0]);
         EXPECT_EQ(!table[0].ok() ? "none"
-                  : isNumber     ? std::to_string(place[0])
-                                 : support::valueText(ptype, value),
+                                 : support::valueText(isNumber ? PARAM_UINT64 : ptype,
+                                                      ptype == PARAM_STRING ? text : place),
                   expected)
             << key << " as " << type << " at " << position;
     }

@@ -122,10 +122,18 @@ TEST(ParameterList, CollectsFromATicket) {
     SETMULTIPAR_LIST list(true);
     list.MergeIf(nullptr, [](const char*) { return true; });
     list.MergeIf(work.real(), nullptr);
-    for (const PARAM_TYPE type : {PARAM_DELETE, PARAM_COUNT}) { // They carry no values.
-        EXPECT_TRUE(SETMULTIPAR_LIST::CollectAction(&list, "k", type, nullptr, 0));
-    }
+    // A walk that shows a type which carries no value, as the engine never does.
+    STICKET_ACCESS odd{};
+    ticket::single::Walk::put(
+        odd, +[](void*, SCollect show, void* context, const char*, int) {
+            return show(context, "ab", PARAM_DELETE, nullptr, 0) ? 1 : 0;
+        });
+    list.Merge(&odd, nullptr);
+    list.Merge(&odd, PARTIAL_MODE(prefix));
     EXPECT_EQ(list.Size(), 0u);
+    list.MergeIf(&odd, [](const char*) { return true; });
+    EXPECT_EQ(tableText(list.Table(false)), "ab[-1]=-");
+    list.Clear();
     // Each call finds the predicate as it was given: a count that it keeps never grows.
     list.MergeIf(work.real(), [calls = 0](const char* key) mutable {
         return ++calls == 1 && std::string_view(key) != "B";
