@@ -9,9 +9,9 @@ TEST(ParameterTables, ResultsAreCopiedUpToTheShorterEnd) {
     SETMULTIPAR* longer = table.records();
     longer[2].result = longer[3].result = 0xFF;
     const ticket::Block<SETMULTIPAR> shorter(MultiParameterDup(longer + 1));
-    EXPECT_FALSE(AllMultiParameterOk(shorter.get()));
     shorter[0].result = 0xFF;
     shorter[1].result = 0xFE;
+    EXPECT_FALSE(AllMultiParameterOk(shorter.get()));
     MultiParameterResultCpy(longer, shorter.get());
     EXPECT_TRUE(longer[0].result == 1 && longer[1].result == 0 && longer[2].result == 0xFF);
     MultiParameterResultCpy(shorter.get(), longer + 2);
