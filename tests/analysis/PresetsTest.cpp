@@ -85,6 +85,7 @@ TEST(Presets, OneCodeForOneCause) {
         {"<psd>no", "<psd>yes", exitPresetValueMissing},
         {"<id>12</id>", "<id>12</id><id>12</id>", exitPresetValueRepeated},
         {"greyHueAverage", "average", exitPresetValueRepeated},
+        {"used=\"yes\"", "used=\"yes\" used=\"yes\"", exitPresetValueRepeated},
         {"2.5", "2,5", exitPresetNotNumeric},
         {"2.5", "nan", exitPresetNotNumeric},
         {"2.5", "-2.5", exitPresetOutOfRange},
