@@ -223,6 +223,7 @@ TEST(CgatsText, TellsDeviceChannelsAndTheirScales) {
         {"R G B", "100 50 0", "rgb RGB_R RGB_G RGB_B 100 50 0"},
         {"R G B", "51 0 0 \n255 255 255", "rgb RGB_R RGB_G RGB_B 20 0 0 100 100 100"},
         {"R G B", "0.5 0 1", "rgb RGB_R RGB_G RGB_B 50 0 100"},
+        {"R G B", "65535 0 0", "rgb RGB_R RGB_G RGB_B 100 0 0"},
         {"C M Y K", "100.4 0 0 1", "cmyk CMYK 100.4 0 0 1"},
         {"C M Y K", "25.5 0 0 102 \n0 0 255 0", "cmyk CMYK 10 0 0 40 0 0 100 0"},
     };
@@ -356,6 +357,7 @@ TEST(CgatsText, NamesOneCauseForEachFailure) {
         {"Dear Sir,\n\nwhat a fine day.\n", Failure::NotRecognised},
         {"CGATS.17\nNUMBER_OF_SETS 9\n", Failure::Damaged},
         {rows("1 50 0 0\n2 50 0\n"), Failure::Damaged},
+        {rows("1 50 0 0\n2 50 0 0 7 8\n"), Failure::Damaged},
         {replaced(rows("1 50 0 0\n2 50 0 0 7 8\n"), " ", "\t"), Failure::Damaged},
         {rows(""), Failure::NoPatches},
         {table("RGB_I RGB_R RGB_G RGB_B", "0 0 0 0\n"), Failure::NoPatches},

@@ -215,6 +215,7 @@ TEST_F(LoadJob, FindsReferences) {
         {workflow + "4", "formula=0 preset=none reference= workflow=4"},
         {workflow + "1" + first + "'/s/profile.icc" + other, "reference=/s/profile.icc workflow=1"},
         {workflow + "1" + first + "'" + other, "reference=/s/profile2.icc workflow=1"},
+        {workflow + "1" + first + "'\xff" + other, "reference= workflow=1"},
         {stored + "2" + other, "reference=/s/profile2.icc workflow=3"}, // Not measured so far.
         {stored + "2 Remote/Measurement/Status=2",
          "patches=2 reference=/Measured reference.txt status=2 type=3 workflow=3"},
@@ -324,6 +325,7 @@ TEST_F(LoadJob, KnowsInlineInstruments) {
          "device=47" + dynamic +
              "inline=1 mode=-1 reference=/s/dyn/dyn.it8 status=2 "
              "strip=/s/dyn/dyn.it8 type=3"},
+        {device + "48" + values, "device=48" + dynamic + files},
     });
 }
 

@@ -359,10 +359,11 @@ TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
         };
     };
     const std::string launched = "ConfigureAndLaunchNerovaMeasure returns = ";
-    const std::string compared = "m_jobType is = 0\nComparing existing data\n";
+    const std::string compared = "\nComparing existing data\n";
     expectRuns({
         {"measured", 0, "Copying resulting data to job ticket\n", tool(""), call},
         {"measured again", 0, "Copying resulting data to job ticket\n", closedJob, again},
+        {"not again", 0, compared, {}, {.remeasure = "KEY_KZ_REMEASURE:=:false"}},
         {"no tool", 106, launched + "-2", {}, call},
         {"a tool that runs already", 106, launched + "-1", runningTool, call},
         {"a tool that can't be executed", 105, launched + "0",

@@ -189,6 +189,7 @@ TEST_F(WriteBack, LeavesOutArraysThatAreNotThere) {
         {2, 0, xyz, lab, cmyk, "clnx"},
         {2, 1, none, none, cmyk, "cns"}, // Fewer samples than a patch has values.
         {2, 37, xyz, lab, cmyk, ""},     // More than a row holds.
+        {2, -1, xyz, lab, cmyk, ""},
         {0, 3, xyz, lab, cmyk, ""},
         {1'000'001, 3, xyz, lab, cmyk, "n"}, // More than there is memory for.
         {2, 3, xyz, lab, none, "lnsx"},
