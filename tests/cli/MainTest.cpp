@@ -117,7 +117,7 @@ TEST_F(MainTest, WritesEveryCharacterThroughALink) {
     const std::string file = m_folder.write("out.json", std::string(200'000, 'x'));
     const std::string link = m_folder.path("r\xe9sultat");
     symlink("out.json", link.c_str());
-    runScripted({"t", "m", "x", link}, {{"JSON", json}, {"LC_ALL", "no_such"}});
+    runScripted({"t", "m", "x", link}, {{"JSON", json}, {"LC_ALL", "C"}});
     EXPECT_TRUE(contentsOf(file) == json);
     EXPECT_TRUE(std::filesystem::is_symlink(link));
 }
