@@ -55,7 +55,6 @@ TEST(Pairing, GoesFromTheSurestToTheWeakest) {
         {"the nearest first, then whole percents", "cmyk 1:3,2.24,2.24,0 2:3.1,2.2,2.2,0",
          "cmyk 1:3.1,2.2,2.2,0 2:3,2,2,0", "deviceValues 1 0", 1},
         {"spots", ramp, "cmyk 1:50,0,0,0,0 2:0,0,0,0,100", "deviceValues - 0 -"},
-        {"nothing alike", "rgb 1:0,0,0", "rgb 1:99,0,0", "deviceValues -"},
         {"ids across spaces", ramp, "rgb 3:0,0,0 2:0,0,0 9:0,0,0", "labels - 1 0"},
         {"no ids", ramp, "none : :", "order 0 1 -"},
         {"ids of another kind, one size", ramp, "none A1: A2: A3:", "order 0 1 2"},

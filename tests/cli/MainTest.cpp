@@ -96,15 +96,14 @@ TEST_F(MainTest, HelpHasItsLines) {
 
 // A caller that starts the program anew must not lose the result that it has.
 TEST_F(MainTest, AFailedComparisonTouchesNoOutput) {
-    const std::string output = m_folder.write("out.json", "last result");
-    for (const char* failing : {"PARSE", "ANALYZE"}) {
-        for (const std::string& path : {output, m_folder.path("new.json")}) {
+    const std::string old = m_folder.write("out.json", "last result");
+    for (const char* failing : {"ANALYZE", "PARSE"}) {
+        for (const std::string& path : {old, m_folder.path("new.json")}) {
             EXPECT_EQ(runScripted({"t", "m", "x", path}, {{failing, "47"}}).exitCode, 47);
         }
-        EXPECT_EQ(contentsOf(output), "last result");
+        EXPECT_EQ(contentsOf(old), "last result");
         EXPECT_FALSE(support::exists(m_folder.path("new.json")));
     }
-    runScripted({"t", "m", "x", output}, {{"PARSE", "47"}});
     EXPECT_EQ(calls(), "parse [x] false\n");
 }
 

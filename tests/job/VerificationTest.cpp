@@ -5,7 +5,6 @@
 #include <chrono>
 #include <filesystem>
 #include <functional>
-#include <map>
 #include <memory>
 #include <regex>
 #include <sstream>
@@ -53,8 +52,6 @@ struct Call {
     std::string host = {};      ///< Empty: the store's.
     std::string remeasure = {}; ///< Empty: none.
 };
-
-using Environment = std::map<std::string, std::optional<std::string>>;
 
 /// A system root with the viewer, a temporary folder, and a store with the example job 7, which
 /// holds its measurement, and 8, which is to be measured.
@@ -110,13 +107,12 @@ class Place {
         return words;
     }
 
-    support::Outcome run(std::vector<std::string> words, Environment environment = {}) const {
+    support::Outcome run(std::vector<std::string> words) const {
 #ifndef __SANITIZE_ADDRESS__
         words.insert(words.begin(), {"prlimit", "--as=1500000000"});
 #endif
-        environment.insert({{"TMPDIR", temporary}, {"TINTGATE_ROOT", m_root.path()}});
         support::RunOptions options;
-        options.environment = std::move(environment);
+        options.environment = {{"TMPDIR", temporary}, {"TINTGATE_ROOT", m_root.path()}};
         return support::run(words, options);
     }
 
@@ -408,10 +404,10 @@ TEST(Verification, KeepsEveryCharacterInEveryLocale) {
     fs::create_directories(place.temporary);
     place.set("Input/Title='\xc3\x89preuve-\xf0\x9f\x8e\xa8");
     place.engine()->putUser({"J\xf6rg", store::passwordHash("\xe9t\xe9"), false});
-    const support::Outcome outcome =
-        place.run(place.words({.password = "\xc3\xa9t\xc3\xa9", .user = "J\xc3\xb6rg"}),
-                  {{"LC_ALL", "C"}, {"LANG", "C"}});
-    EXPECT_EQ(outcome.exitCode, 0);
+    std::vector<std::string> words =
+        place.words({.password = "\xc3\xa9t\xc3\xa9", .user = "J\xc3\xb6rg"});
+    words.insert(words.begin(), {"env", "LC_ALL=C"});
+    EXPECT_EQ(place.run(words).exitCode, 0);
     EXPECT_THAT(place.log(), HasSubstr(analysisLines));
     const std::string meta = support::contentsOf(place.jobFile("meta.json"));
     EXPECT_THAT(meta, HasSubstr("\\u00c9preuve-\\ud83c\\udfa8"));
