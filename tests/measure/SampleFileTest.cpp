@@ -84,13 +84,6 @@ class SampleFile : public testing::Test {
         m_job.measurement.cmyk = m_cmyk;
     }
 
-    void addSpectra(int base, int stepsize, int length) {
-        m_job.measurement.spectral = m_spectra;
-        m_spectra[0].base = base; // The first row's range is that of all.
-        m_spectra[0].stepsize = stepsize;
-        m_spectra[0].length = length;
-    }
-
     int write(bool reference) {
         return KZVerifyJobProcessor().WriteTemporarySampleFile(m_job, reference);
     }
@@ -112,8 +105,10 @@ TEST_F(SampleFile, IsWhatAStreamWrites) {
         m_job.measurement.xyz = random() % 2 == 0 ? m_xyz : nullptr;
         m_job.measurement.spectral = nullptr;
         if (random() % 3 != 0) {
-            addSpectra(static_cast<int>(random()), static_cast<int>(random()),
-                       lengths[random() % std::size(lengths)]);
+            m_job.measurement.spectral = m_spectra;
+            m_spectra[0].base = static_cast<int>(random()); // The first row's range is that of all.
+            m_spectra[0].stepsize = static_cast<int>(random());
+            m_spectra[0].length = lengths[random() % std::size(lengths)];
         }
         for (const std::span<double> values :
              {std::span<double>(m_cmyk), std::span<double>(m_lab), std::span<double>(m_xyz),
