@@ -52,10 +52,7 @@ TEST(SingleTicket, TransfersTakeWholeKeys) {
     } rows[] = {
         {"a=9 b=8", {nullptr}, false, "a[0]=9 b[0]=8 c[0]=1"},
         {"a=9 b=8", {nullptr}, true, "a[0]=9 b[0]=8"},
-        {"a=9 ab=1 b=3 bb=4",
-         {"ab*", "b", "no", nullptr},
-         false,
-         "a[0]=1 a[1]=2 ab[0]=1 b[0]=3 c[0]=1"},
+        {"ab=1 b=3 bb=4", {"ab*", "b", nullptr}, false, "a[0]=1 a[1]=2 ab[0]=1 b[0]=3 c[0]=1"},
         {"ab=1 b=3", {"x", nullptr}, true, ""},
         {"ab=1 b=3", {"", "b", nullptr}, true, "b[0]=3"},
     };
