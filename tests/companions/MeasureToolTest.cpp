@@ -239,6 +239,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
          made + "11 100 0 0 0 55 -37 -50\n12 39.6 27.4 27 0 60 1 2\n" + whites + end},
         {"ids that are names here",
          labels + "A4 95 0 -3\nA1 55 -37 -50\nA2 60 1 2\nA3 95 0 -2\n" + end},
+        {"two too few", made + two + end, 8, "2 patches where 4"},
         {"another patch", made + "1 100 0 0 0 55 -37 -50\n2 40 27 29 0 60 1 2\n" + whites + end, 8,
          "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
         {"other ids", labels + "4 95 0 -3\n1 55 -37 -50\n2 60 1 2\n5 95 0 -2\n" + end, 8,

@@ -137,8 +137,9 @@ TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
     ASSERT_TRUE(readResult(whole, problem)) << problem;
     for (const std::string& text :
          {std::string("[]"), whole.substr(0, whole.size() / 2),
-          with(whole, "tintgate-result", "other"), with(whole, "\"failed\"", "\"won\""),
-          with(whole, "[100,0,0,0]", "[100,0,0]"),
+          with(whole, "tintgate-result", "other"),
+          with(whole, "\"formatVersion\": 1", "\"formatVersion\": 2"),
+          with(whole, "\"failed\"", "\"won\""), with(whole, "[100,0,0,0]", "[100,0,0]"),
           with(whole, "\"worstPatch\":1", "\"worstPatch\":4"),
           with(whole, "\"decimals\":2", "\"decimals\":1e300"),
           with(whole, "[55,-37,-50]", "[55,\"x\",-50]")}) {

@@ -119,6 +119,7 @@ TEST_F(TintgateStore, BrokenFilesChangeNothing) {
     const std::pair<std::string, const char*> cases[] = {
         {key(R"({"int": 1})").substr(0, 150), "no JSON"},
         {R"({"format": "tintgate tickets", "version": 2, "tickets": []})", "\"version\""},
+        {R"({"format": "tintgate tickets", "version": 1, "tickets": {}})", "is no list"},
         {ticket(R"("type": 3, "id": 18446744073709551617, "keys": {})"), "16777215"},
         {ticket(R"("type": 3, "id": 1, "keys": {})"), "job/1 stands there twice"},
         {ticket(R"("type": 3, "id": 2, "keys": {"a": {"int": 1}, "a": {"int": 1}})"), "twice"},

@@ -142,6 +142,7 @@ TEST_F(Viewer, OpensThePageWhereThereIsADisplay) {
         usleep(10'000);
     EXPECT_EQ(support::contentsOf(opened), m_page);
     options.environment["PATH"] = m_folder;
+    std::swap(options.environment["DISPLAY"], options.environment["WAYLAND_DISPLAY"]);
     const support::Outcome outcome = show(options);
     EXPECT_EQ(outcome.exitCode, 7);
     EXPECT_THAT(outcome.error, HasSubstr("xdg-open"));
