@@ -1,10 +1,10 @@
 // Runs of the real program on jobs, as a client starts it: arguments and a store in; the exit code,
 // the log, the job's folder and the tickets out.
-#include <algorithm>
 #include <atomic>
 #include <chrono>
 #include <filesystem>
 #include <functional>
+#include <map>
 #include <memory>
 #include <regex>
 #include <sstream>
@@ -146,6 +146,16 @@ class Place {
         return outcome.output;
     }
 
+    /// The keys of a job, each with its number of elements.
+    std::map<std::string, int> counts(int job) const {
+        std::map<std::string, int> all;
+        const auto content = engine()->content(3, job, store::KeyFilter());
+        for (const auto& [key, elements] : content->keys()) {
+            all[key] = elements->count();
+        }
+        return all;
+    }
+
     /// What the server shows of a job: 208 to be verified, 211 passed, 212 failed.
     int status(const std::string& job) const {
         const auto content = engine()->content(3, std::stoi(job), store::KeyFilter());
@@ -183,6 +193,20 @@ class Place {
     std::unique_ptr<support::RunningProgram> beside; ///< A program that runs for as long.
 };
 
+/// Most of a run is waiting, so several go side by side.
+template<class Work>
+void sideBySide(std::size_t count, Work work) {
+    std::atomic<std::size_t> next = 0;
+    std::vector<std::jthread> threads;
+    for (int i = 0; i < 8; ++i) {
+        threads.emplace_back([&] {
+            for (std::size_t number; (number = next++) < count;) {
+                work(number);
+            }
+        });
+    }
+}
+
 struct Case {
     std::string what;
     int code;
@@ -201,17 +225,7 @@ void expectRuns(const std::vector<Case>& cases) {
             cases[i].prepare(places[i]);
         }
     }
-    // Most of a run is waiting, so several go side by side.
-    std::atomic<std::size_t> next = 0;
-    std::vector<std::thread> threads;
-    for (int i = 0; i < 8; ++i) {
-        threads.emplace_back([&] {
-            for (std::size_t number; (number = next++) < cases.size();) {
-                outcomes[number] = places[number].run(cases[number].call);
-            }
-        });
-    }
-    std::ranges::for_each(threads, &std::thread::join);
+    sideBySide(cases.size(), [&](std::size_t i) { outcomes[i] = places[i].run(cases[i].call); });
     for (std::size_t i = 0; i < cases.size(); ++i) {
         const auto& [what, code, inLog, prepare, call] = cases[i];
         const std::string log = places[i].log();
@@ -452,6 +466,50 @@ TEST(Verification, UsesNoFolderOfOthers) {
     fs::create_directory_symlink(place.path("theirs"), place.temporary + "/Tintgate");
     EXPECT_EQ(place.run().exitCode, 111);
     EXPECT_TRUE(fs::is_empty(place.path("theirs")));
+}
+
+// Kills a run some milliseconds after its JDF has changed, so while it writes the job's keys.
+constexpr char killWhileItWrites[] = R"sh(
+    jdf=$1; delay=$2; shift 2
+    "$@" & run=$!
+    until [ "$(wc -c < "$jdf")" -gt 8192 ] || [ ! -e /proc/$run/exe ]; do :; done 2>/dev/null
+    sleep "$delay"
+    kill -9 $run)sh";
+
+TEST(Verification, KilledWhileItWritesLeavesAllWholeAndCanBeRunAgain) {
+    const char* const delays[] = {"0", "0.002", "0.005", "0.01", "0.02", "0.04"};
+    std::vector<Place> places(std::size(delays));
+    std::vector<std::map<std::string, int>> left;
+    for (const Place& place : places) {
+        place.installTool();
+    }
+    sideBySide(places.size(), [&](std::size_t i) {
+        std::vector<std::string> words = places[i].words({.job = "8"});
+        words.insert(words.begin(), {"sh", "-c", killWhileItWrites, "sh",
+                                     places[i].jobFile("job-8.jdf", "8"), delays[i]});
+        places[i].run(words);
+    });
+    for (const Place& place : places) {
+        std::ostringstream delivered;
+        place.engine()->getFile("server/temp/job-8.jdf", delivered);
+        EXPECT_TRUE(delivered.str().size() == 8192 ||
+                    delivered.str() == support::contentsOf(place.jobFile("job-8.jdf", "8")));
+        left.push_back(place.counts(8));
+        place.administer({"reset", "8"});
+    }
+    sideBySide(places.size(),
+               [&](std::size_t i) { EXPECT_EQ(places[i].run({.job = "8"}).exitCode, 0); });
+    int cutOff = 0;
+    for (std::size_t i = 0; i < places.size(); ++i) {
+        EXPECT_NE(places[i].status("8"), 208);
+        const auto whole = places[i].counts(8);
+        EXPECT_EQ(whole.at("Remote/Measurement/SpectralValues/DValues"), 48 * 36);
+        for (const auto& [key, count] : left[i]) {
+            EXPECT_EQ(count, whole.at(key)) << key;
+        }
+        cutOff += left[i].size() < whole.size() ? 1 : 0;
+    }
+    EXPECT_GT(cutOff, 0) << "all were killed after they had written everything";
 }
 
 } // namespace
