@@ -46,17 +46,43 @@ class Printed {
     _exit(127);
 }
 
-// In the child. Its group is its own, so that a time limit ends its children too.
-[[noreturn]] void become(std::vector<std::string> command, int output, int error,
+std::vector<std::string>
+environmentWith(const std::map<std::string, std::optional<std::string>>& changes) {
+    std::vector<std::string> result;
+    for (char** entry = environ; *entry != nullptr; ++entry) {
+        const std::string text = *entry;
+        if (changes.count(text.substr(0, text.find('='))) == 0) {
+            result.push_back(text);
+        }
+    }
+    for (const auto& [name, value] : changes) {
+        if (value) {
+            result.push_back(name + "=" + *value);
+        }
+    }
+    return result;
+}
+
+std::vector<char*> pointersTo(std::vector<std::string>& texts) {
+    std::vector<char*> pointers;
+    for (std::string& text : texts) {
+        pointers.push_back(text.data());
+    }
+    pointers.push_back(nullptr);
+    return pointers;
+}
+
+// In the child, which must not allocate: another thread may have held the heap's lock at the fork.
+// Its group is its own, so that a time limit ends its children too.
+[[noreturn]] void become(char* const* arguments, char* const* environment, int output, int error,
                          const RunOptions& options) {
     setpgid(0, 0);
     dup2(open("/dev/null", O_RDONLY), STDIN_FILENO);
     dup2(error, STDERR_FILENO);
     // An ordinary user may not be able to reach the build tree, so the program is opened before.
-    const char* const path = command[0].c_str();
     int program = -1;
     if (options.user != 0) {
-        program = open(path, O_RDONLY | O_CLOEXEC);
+        program = open(arguments[0], O_RDONLY | O_CLOEXEC);
         if (!becomeUser(options.user)) {
             refuse("become another user");
         }
@@ -70,21 +96,21 @@ class Printed {
     if (!options.folder.empty() && chdir(options.folder.c_str()) != 0) {
         refuse(options.folder.c_str());
     }
-    for (const auto& [name, value] : options.environment) {
-        value ? setenv(name.c_str(), value->c_str(), 1) : unsetenv(name.c_str());
+    if (program >= 0) {
+        fexecve(program, arguments, environment);
+    } else {
+        execvpe(arguments[0], arguments, environment);
     }
-    std::vector<char*> arguments;
-    for (std::string& word : command) {
-        arguments.push_back(word.data());
-    }
-    arguments.push_back(nullptr);
-    program < 0 ? execvp(path, arguments.data()) : fexecve(program, arguments.data(), environ);
-    refuse(path);
+    refuse(arguments[0]);
 }
 
 } // namespace
 
 Outcome run(const std::vector<std::string>& command, const RunOptions& options) {
+    std::vector<std::string> words = command;
+    std::vector<std::string> environment = environmentWith(options.environment);
+    const std::vector<char*> arguments = pointersTo(words);
+    const std::vector<char*> variables = pointersTo(environment);
     const Printed output;
     const Printed error;
     const pid_t child = fork();
@@ -92,7 +118,7 @@ Outcome run(const std::vector<std::string>& command, const RunOptions& options) 
         throw std::runtime_error("no process");
     }
     if (child == 0) {
-        become(command, output.descriptor, error.descriptor, options);
+        become(arguments.data(), variables.data(), output.descriptor, error.descriptor, options);
     }
     setpgid(child, child); // Here as well, so that it is done whoever comes first.
 
