@@ -3,12 +3,14 @@
 #include <filesystem>
 #include <fstream>
 #include <iostream>
+#include <iterator>
 #include <set>
 
 #include <unistd.h>
 
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
 
 namespace admin {
@@ -72,12 +74,12 @@ class Copy {
         }
         Progress progress(total, "tickets and files");
         m_progress = &progress;
-        const std::size_t users = copyUsers();
+        const auto users = copyUsers();
         copyTickets(tickets);
         copyFiles(files);
         m_to.finishCopy();
-        m_told = std::to_string(tickets.size()) + " tickets, " + std::to_string(files.size()) +
-                 " files and " + std::to_string(users) + " users";
+        m_told = counted(std::ssize(tickets), "ticket") + ", " +
+                 counted(std::ssize(files), "file") + " and " + counted(users, "user");
     }
 
     const std::string& told() const { return m_told; }
@@ -102,7 +104,7 @@ class Copy {
         return files;
     }
 
-    std::size_t copyUsers() {
+    std::int64_t copyUsers() {
         const auto users = m_from.users();
         for (const auto& former : m_to.users()) {
             m_to.removeUser(former.name);
@@ -110,7 +112,7 @@ class Copy {
         for (const auto& user : users) {
             m_to.putUser(user);
         }
-        return users.size();
+        return std::ssize(users);
     }
 
     void copyTickets(const std::vector<TicketName>& tickets) {

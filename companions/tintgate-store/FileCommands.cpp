@@ -194,12 +194,12 @@ void prune(const Invocation& invocation, const FileOptions& options) {
     } else {
         removed = store->pruneVersions(options.path, keep);
     }
-    std::cout << "Removed " << removed << (removed == 1 ? " version\n" : " versions\n");
+    std::cout << "Removed " << counted(removed, "version") << '\n';
 }
 
 void clean(const Invocation& invocation) {
     const int removed = invocation.open()->removeLeftovers();
-    std::cout << "Removed " << removed << (removed == 1 ? " leftover\n" : " leftovers\n");
+    std::cout << "Removed " << counted(removed, "leftover") << '\n';
 }
 
 } // namespace

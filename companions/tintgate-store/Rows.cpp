@@ -81,4 +81,8 @@ void showObject(const Row& object, bool asJson) {
     printTable(lines);
 }
 
+std::string counted(std::int64_t count, const std::string& one) {
+    return std::to_string(count) + ' ' + one + (count == 1 ? "" : "s");
+}
+
 } // namespace admin

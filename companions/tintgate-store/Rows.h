@@ -1,6 +1,7 @@
 // What a command shows: a table for people, or JSON for scripts.
 #pragma once
 
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -22,5 +23,8 @@ void showRows(const std::vector<Column>& columns, const std::vector<Row>& rows, 
 
 /// One object: as JSON, or with a line for each member.
 void showObject(const Row& object, bool asJson);
+
+/// As in "1 file" and "2 files".
+std::string counted(std::int64_t count, const std::string& one);
 
 } // namespace admin

@@ -130,7 +130,7 @@ void importAll(const Invocation& invocation, const ImportOptions& options) {
             progress.done(++count);
         }
     }
-    std::cout << "Imported " << count << (count == 1 ? " ticket\n" : " tickets\n");
+    std::cout << "Imported " << counted(count, "ticket") << '\n';
 }
 
 struct ExportOptions {

@@ -308,7 +308,7 @@ class StoreCopy : public TintgateStore {
         engine->create(3, 90);
         engine->remove(3, 90);
         engine->putUser({"J\xF6rg", store::passwordHash("x"), true});
-        for (int i = 0; i < 200; ++i) {
+        for (int i = 0; i < 1'000; ++i) {
             // Not by way of the store, where each would wait for the disk.
             m_folder.write("store/files/" + std::to_string(i % 10) + "-\xFF/" + std::to_string(i),
                            std::string(i * 37U, 'x'));
@@ -345,7 +345,7 @@ class StoreCopy : public TintgateStore {
 
 TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
     const std::string before = allOf(m_address);
-    EXPECT_THAT(answer({"copy", m_address, "room"}), HasSubstr("3 tickets, 201 files and 1 user"));
+    EXPECT_THAT(answer({"copy", m_address, "room"}), HasSubstr("3 tickets, 1001 files and 1 user\n"));
     EXPECT_TRUE(allOf("room") == before);
     answer({"copy", "room", back});
     EXPECT_TRUE(allOf(back) == before);
