@@ -17,7 +17,10 @@ target_compile_options(wx INTERFACE ${_wx_cxxflags})
 target_link_libraries(wx INTERFACE ${_wx_libs})
 
 pkg_check_modules(lcms2 REQUIRED IMPORTED_TARGET lcms2)
-pkg_check_modules(libplist REQUIRED IMPORTED_TARGET libplist-2.0)
+# Opened when a property list is read: only the headers are for building.
+pkg_check_modules(libplist REQUIRED libplist-2.0)
+add_library(libplistheaders INTERFACE)
+target_include_directories(libplistheaders SYSTEM INTERFACE ${libplist_INCLUDE_DIRS})
 pkg_check_modules(sqlite3 REQUIRED IMPORTED_TARGET sqlite3)
 pkg_check_modules(libsodium REQUIRED IMPORTED_TARGET libsodium)
 pkg_check_modules(expat REQUIRED IMPORTED_TARGET expat)

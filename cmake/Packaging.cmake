@@ -129,10 +129,12 @@ set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS "${CMAKE_LIBRARY_OUTPUT_DIRECTOR
 
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_NAME tintgate)
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_SECTION graphics)
-# ICU is opened when a text needs it, so the linker does not know of it.
+# These are opened when a property list or a text needs them, so the linker does not know of them.
+set(_plist "libplist3 (>= 2.2.0)")
 file(STRINGS "${ICU_INCLUDE_DIR}/unicode/uvernum.h" _icu REGEX "^#define U_ICU_VERSION_SHORT ")
 string(REGEX MATCH "[0-9]+" _icu "${_icu}")
-set(CPACK_DEBIAN_TINTGATE_PACKAGE_DEPENDS "libtintgate1 (>= ${PROJECT_VERSION}), libicu${_icu}")
+set(CPACK_DEBIAN_TINTGATE_PACKAGE_DEPENDS
+  "libtintgate1 (>= ${PROJECT_VERSION}), libicu${_icu}, ${_plist}")
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_RECOMMENDS "tintgate-comgui, tintgate-companions")
 set(CPACK_DEBIAN_TINTGATE_DESCRIPTION "verifies the colour of print jobs
 Compares the colours of a proof, a print or a printing condition with their
@@ -159,6 +161,7 @@ JSON. This package holds the headers.")
 
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_NAME tintgate-comgui)
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_SECTION graphics)
+set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_DEPENDS "${_plist}")
 # Opened when a store's address names a server.
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_RECOMMENDS "libpq5 (>= 14)")
 set(CPACK_DEBIAN_TINTGATE-COMGUI_DESCRIPTION "ticket stores for Tintgate

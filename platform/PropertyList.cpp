@@ -7,7 +7,9 @@
 #include <filesystem>
 #include <fstream>
 #include <limits>
+#include <type_traits>
 
+#include <dlfcn.h>
 #include <plist/plist.h>
 
 namespace platform {
@@ -17,6 +19,45 @@ namespace {
 // libplist counts bytes in 32 bits.
 constexpr std::uintmax_t largestFile = std::numeric_limits<std::uint32_t>::max();
 constexpr std::int64_t secondsFrom1970To2001 = 978307200;
+
+// clang-format off
+#define TINTGATE_LIBPLIST_FUNCTIONS(X)                                                            \
+    X(array_get_item) X(array_get_size) X(dict_get_item) X(dict_new_iter) X(dict_next_item)       \
+    X(free) X(from_memory) X(get_bool_val) X(get_date_val) X(get_node_type) X(get_real_val)       \
+    X(get_string_val) X(get_uint_val)
+// clang-format on
+
+/// The functions that are used of libplist, without their plist_ in front.
+struct LibPlist {
+#define TINTGATE_LIBPLIST_MEMBER(name) decltype(&plist_##name) name = nullptr;
+    TINTGATE_LIBPLIST_FUNCTIONS(TINTGATE_LIBPLIST_MEMBER)
+#undef TINTGATE_LIBPLIST_MEMBER
+};
+
+/// Opened with the first list that is read, since it would cost every program that can read one a
+/// twentieth of its start. Nothing where the library is not installed.
+std::optional<LibPlist> loadLibPlist() {
+    void* const library = dlopen("libplist-2.0.so.3", RTLD_NOW | RTLD_LOCAL);
+    if (library == nullptr) {
+        return std::nullopt;
+    }
+    LibPlist functions;
+    bool complete = true;
+    const auto find = [&](auto& function, const char* name) {
+        function =
+            reinterpret_cast<std::remove_reference_t<decltype(function)>>(dlsym(library, name));
+        complete = complete && function != nullptr;
+    };
+#define TINTGATE_LIBPLIST_FIND(name) find(functions.name, "plist_" #name);
+    TINTGATE_LIBPLIST_FUNCTIONS(TINTGATE_LIBPLIST_FIND)
+#undef TINTGATE_LIBPLIST_FIND
+    return complete ? std::optional(functions) : std::nullopt;
+}
+
+const std::optional<LibPlist>& libPlist() {
+    static const std::optional<LibPlist> functions = loadLibPlist();
+    return functions;
+}
 
 struct FreeText {
     void operator()(char* text) const { std::free(text); }
@@ -48,13 +89,13 @@ std::optional<std::uint32_t> elementNumber(const std::string& name) {
 }
 
 plist_t child(plist_t node, const std::string& name) {
-    switch (plist_get_node_type(node)) {
+    switch (libPlist()->get_node_type(node)) {
     case PLIST_DICT:
-        return plist_dict_get_item(node, name.c_str());
+        return libPlist()->dict_get_item(node, name.c_str());
     case PLIST_ARRAY:
         if (const auto number = elementNumber(name);
-            number && *number < plist_array_get_size(node)) {
-            return plist_array_get_item(node, *number);
+            number && *number < libPlist()->array_get_size(node)) {
+            return libPlist()->array_get_item(node, *number);
         }
         return nullptr;
     default:
@@ -77,15 +118,15 @@ std::string realText(double value) {
 
 } // namespace
 
-PropertyList::PropertyList(void* root) : m_root(root, plist_free) {}
+PropertyList::PropertyList(void* root) : m_root(root, libPlist()->free) {}
 
 std::optional<PropertyList> PropertyList::read(const std::string& path) {
     const auto bytes = readFile(path);
-    if (!bytes || bytes->empty()) {
+    if (!bytes || bytes->empty() || !libPlist()) {
         return std::nullopt;
     }
     plist_t root = nullptr;
-    plist_from_memory(bytes->data(), static_cast<std::uint32_t>(bytes->size()), &root);
+    libPlist()->from_memory(bytes->data(), static_cast<std::uint32_t>(bytes->size()), &root);
     if (root == nullptr) {
         return std::nullopt;
     }
@@ -109,33 +150,33 @@ std::optional<std::string> PropertyList::text(const Way& way) const {
     if (node == nullptr) {
         return std::nullopt;
     }
-    switch (plist_get_node_type(node)) {
+    switch (libPlist()->get_node_type(node)) {
     case PLIST_STRING: {
         char* text = nullptr;
-        plist_get_string_val(node, &text);
+        libPlist()->get_string_val(node, &text);
         const OwnedText owner(text);
         return text == nullptr ? std::string() : std::string(text);
     }
     case PLIST_BOOLEAN: {
         std::uint8_t value = 0;
-        plist_get_bool_val(node, &value);
+        libPlist()->get_bool_val(node, &value);
         return value != 0 ? "true" : "false";
     }
     case PLIST_UINT: {
         // Negative numbers come in the same 64 bits.
         std::uint64_t value = 0;
-        plist_get_uint_val(node, &value);
+        libPlist()->get_uint_val(node, &value);
         return std::to_string(static_cast<std::int64_t>(value));
     }
     case PLIST_REAL: {
         double value = 0;
-        plist_get_real_val(node, &value);
+        libPlist()->get_real_val(node, &value);
         return realText(value);
     }
     case PLIST_DATE: {
         std::int32_t seconds = 0;
         std::int32_t microseconds = 0;
-        plist_get_date_val(node, &seconds, &microseconds);
+        libPlist()->get_date_val(node, &seconds, &microseconds);
         return dateText(seconds);
     }
     default:
@@ -145,17 +186,17 @@ std::optional<std::string> PropertyList::text(const Way& way) const {
 
 std::optional<std::vector<std::string>> PropertyList::names(const Way& way) const {
     const plist_t node = find(way);
-    if (node == nullptr || plist_get_node_type(node) != PLIST_DICT) {
+    if (node == nullptr || libPlist()->get_node_type(node) != PLIST_DICT) {
         return std::nullopt;
     }
     std::vector<std::string> names;
     plist_dict_iter iterator = nullptr;
-    plist_dict_new_iter(node, &iterator);
+    libPlist()->dict_new_iter(node, &iterator);
     const std::unique_ptr<void, decltype(&std::free)> owner(iterator, std::free);
     for (;;) {
         char* name = nullptr;
         plist_t value = nullptr;
-        plist_dict_next_item(node, iterator, &name, &value);
+        libPlist()->dict_next_item(node, iterator, &name, &value);
         const OwnedText nameOwner(name);
         if (value == nullptr) {
             return names;
@@ -166,10 +207,10 @@ std::optional<std::vector<std::string>> PropertyList::names(const Way& way) cons
 
 std::optional<std::size_t> PropertyList::count(const Way& way) const {
     const plist_t node = find(way);
-    if (node == nullptr || plist_get_node_type(node) != PLIST_ARRAY) {
+    if (node == nullptr || libPlist()->get_node_type(node) != PLIST_ARRAY) {
         return std::nullopt;
     }
-    return plist_array_get_size(node);
+    return libPlist()->array_get_size(node);
 }
 
 } // namespace platform

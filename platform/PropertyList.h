@@ -23,7 +23,8 @@ class PropertyList {
     /// number of the element. The empty way leads to the outermost value.
     using Way = std::vector<std::string>;
 
-    /// Nothing if there is no regular file at path, or it is no property list.
+    /// Nothing if there is no regular file at path, it is no property list, or libplist is not
+    /// installed.
     static std::optional<PropertyList> read(const std::string& path);
 
     /// Whether a value of any kind stands there.
