@@ -1,11 +1,11 @@
 #include "analysis/JsonWriter.h"
 
+#include <algorithm>
 #include <array>
 #include <charconv>
 #include <cmath>
-#include <cstdlib>
 #include <cstring>
-#include <new>
+#include <utility>
 
 #include "analysis/Text.h"
 
@@ -82,32 +82,26 @@ char* writeNumber(char* at, double value) {
 
 } // namespace
 
-JsonWriter::JsonWriter(std::size_t expected) {
-    room(expected);
-}
-
-JsonWriter::~JsonWriter() {
-    std::free(m_begin);
-}
-
-/// malloc and realloc: a large buffer grows by moving pages, not bytes, and none is zeroed first.
+/// Makes sure of room for so many bytes, at most mostRoom.
 void JsonWriter::room(std::size_t bytes) {
-    if (static_cast<std::size_t>(m_end - m_at) >= bytes)
-        return;
-    const auto used = static_cast<std::size_t>(m_at - m_begin);
-    const std::size_t size = used + bytes + used / 2;
-    auto* const grown = static_cast<char*>(std::realloc(m_begin, size));
-    if (!grown)
-        throw std::bad_alloc();
-    m_begin = grown;
-    m_at = grown + used;
-    m_end = grown + size;
+    if (static_cast<std::size_t>(m_block.data() + m_block.size() - m_at) < bytes)
+        widen(blockSize);
+}
+
+/// Takes the first bytes of the block to the text, and the others to the block's start.
+void JsonWriter::widen(std::size_t count) {
+    const std::size_t before = m_text.size();
+    m_text.resize(before + count);
+    std::copy_n(m_block.data(), count, m_text.data() + before);
+    m_at = std::copy(m_block.data() + count, m_at, m_block.data());
 }
 
 void JsonWriter::raw(std::string_view ascii) {
-    room(ascii.size());
-    std::memcpy(m_at, ascii.data(), ascii.size());
-    m_at += ascii.size();
+    for (; !ascii.empty(); ascii.remove_prefix(std::min(ascii.size(), mostRoom))) {
+        const std::string_view piece = ascii.substr(0, mostRoom);
+        room(piece.size());
+        m_at = std::copy(piece.begin(), piece.end(), m_at);
+    }
 }
 
 void JsonWriter::lineBreak() {
@@ -116,8 +110,7 @@ void JsonWriter::lineBreak() {
     const auto indent = static_cast<std::size_t>(m_depth) * 2;
     room(1 + indent);
     *m_at++ = '\n';
-    std::memset(m_at, ' ', indent);
-    m_at += indent;
+    m_at = std::fill_n(m_at, indent, ' ');
 }
 
 /// Before every value and every key.
@@ -209,8 +202,7 @@ void JsonWriter::escaped(int character) {
 
 void JsonWriter::text(std::string_view utf8) {
     separate();
-    room(utf8.size() + 2);
-    *m_at++ = '"';
+    raw("\"");
     const char* from = utf8.data();
     const char* const end = from + utf8.size();
     while (from != end) {
@@ -236,7 +228,7 @@ void JsonWriter::number(double value) {
 void JsonWriter::integer(std::int64_t value) {
     separate();
     room(longestNumber);
-    m_at = std::to_chars(m_at, m_end, value).ptr;
+    m_at = std::to_chars(m_at, m_at + longestNumber, value).ptr;
 }
 
 void JsonWriter::boolean(bool value) {
@@ -273,12 +265,9 @@ void JsonWriter::member(std::string_view name, bool value) {
     boolean(value);
 }
 
-std::string_view JsonWriter::written() const {
-    return {m_begin, static_cast<std::size_t>(m_at - m_begin)};
-}
-
-std::wstring JsonWriter::wide() const {
-    return std::wstring(m_begin, m_at);
+std::wstring JsonWriter::finish() {
+    widen(static_cast<std::size_t>(m_at - m_block.data()));
+    return std::move(m_text);
 }
 
 } // namespace analysis

@@ -1,6 +1,8 @@
-// ASCII JSON, written straight into one buffer.
+// ASCII JSON, written as the wide text that callers of the library get.
 #pragma once
 
+#include <array>
+#include <cstddef>
 #include <cstdint>
 #include <string>
 #include <string_view>
@@ -12,9 +14,8 @@ namespace analysis {
 /// row by row. The text is ASCII whatever goes in.
 class JsonWriter {
   public:
-    /// `expected`: bytes to have room for at once.
-    explicit JsonWriter(std::size_t expected);
-    ~JsonWriter();
+    /// `expected`: characters to have room for at once.
+    explicit JsonWriter(std::size_t expected) { m_text.reserve(expected); }
     JsonWriter(const JsonWriter&) = delete;
     JsonWriter& operator=(const JsonWriter&) = delete;
 
@@ -45,13 +46,17 @@ class JsonWriter {
     /// The line end of the whole text.
     void endLine() { raw("\n"); }
 
-    std::string_view written() const;
-
-    /// What was written, as wide text.
-    std::wstring wide() const;
+    /// What was written, which ends the writing.
+    std::wstring finish();
 
   private:
+    /// Characters are gathered as bytes and widened a block at a time: a second buffer of the whole
+    /// text would cost its pages.
+    static constexpr std::size_t blockSize = 4096;
+    static constexpr std::size_t mostRoom = 512;
+
     void room(std::size_t bytes);
+    void widen(std::size_t count);
     void raw(std::string_view ascii);
     void separate();
     void lineBreak();
@@ -59,9 +64,9 @@ class JsonWriter {
     void close(char bracket);
     void escaped(int character);
 
-    char* m_begin = nullptr;
-    char* m_at = nullptr;
-    char* m_end = nullptr;
+    std::wstring m_text;
+    std::array<char, blockSize + mostRoom> m_block;
+    char* m_at = m_block.data();
     int m_depth = 0;
     int m_compactFrom = 0; ///< Depth from which on all is compact; 0: nothing is.
     bool m_first = true;   ///< Nothing stands in the innermost bracket yet.

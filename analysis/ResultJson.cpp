@@ -223,9 +223,9 @@ void writePatches(JsonWriter& json, const Comparison& c) {
 
 std::wstring resultJson(const Comparison& c, const Judgement& judgement,
                         const tolerancePresetParameterRecord& preset) {
-    constexpr std::size_t bytesOfHead = 8192;
-    constexpr std::size_t bytesOfPatch = 96;
-    JsonWriter json(bytesOfHead + c.patchCount() * bytesOfPatch);
+    constexpr std::size_t charactersOfHead = 8192;
+    constexpr std::size_t charactersOfPatch = 96;
+    JsonWriter json(charactersOfHead + c.patchCount() * charactersOfPatch);
     json.beginObject();
     json.member("format", "tintgate-result");
     json.member("formatVersion", std::int64_t{1});
@@ -259,7 +259,7 @@ std::wstring resultJson(const Comparison& c, const Judgement& judgement,
     writePatches(json, c);
     json.endObject();
     json.endLine();
-    return json.wide();
+    return json.finish();
 }
 
 } // namespace analysis
