@@ -39,14 +39,17 @@ char* writeWhole(char* at, std::uint64_t value) {
     return std::to_chars(at, at + 20, value).ptr;
 }
 
-/// Six decimals without the zeros at their end; `millionths` is below a million.
+/// Six decimals without the zeros at their end; `millionths` is below a million. Most values of
+/// instruments have two.
 char* writeFraction(char* at, std::uint32_t millionths) {
     if (millionths == 0)
         return at;
     *at++ = '.';
     at = writePair(at, millionths / 10000);
-    at = writePair(at, millionths / 100 % 100);
-    at = writePair(at, millionths % 100);
+    if (const std::uint32_t rest = millionths % 10000; rest != 0) {
+        at = writePair(at, rest / 100);
+        at = writePair(at, rest % 100);
+    }
     while (at[-1] == '0')
         --at;
     return at;

@@ -4,8 +4,6 @@
 #include <cstddef>
 #include <filesystem>
 #include <fstream>
-#include <functional>
-#include <numeric>
 #include <ostream>
 #include <system_error>
 
@@ -18,14 +16,17 @@ namespace {
 /// the analysis itself. A piece of plain ASCII, as all of ours are, is narrowed here: wx goes
 /// through the C library's converter twice, which took a seventh of a whole run.
 void writeText(std::ostream& stream, std::wstring_view text) {
-    constexpr std::size_t pieceLength = 1 << 14;
+    constexpr std::size_t pieceLength = 1 << 18;
     std::string narrow;
     for (; !text.empty() && stream; text.remove_prefix(std::min(pieceLength, text.size()))) {
         const std::wstring_view piece = text.substr(0, pieceLength);
-        const bool ascii =
-            (std::reduce(piece.begin(), piece.end(), wchar_t{}, std::bit_or<>()) & ~0x7F) == 0;
-        if (ascii) {
-            narrow.assign(piece.begin(), piece.end());
+        narrow.resize(piece.size());
+        wchar_t all = 0;
+        for (std::size_t i = 0; i < piece.size(); ++i) {
+            all |= piece[i];
+            narrow[i] = static_cast<char>(piece[i]);
+        }
+        if ((all & ~0x7F) == 0) {
             stream << narrow;
         } else {
             stream << wxString(piece.data(), piece.size());
