@@ -10,8 +10,8 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
 #include "comgui/Session.h"
-#include "comgui/Users.h"
-#include "comgui/WorkTickets.h"
+#include "store/Users.h"
+#include "store/tickets/WorkTickets.h"
 
 namespace store {
 

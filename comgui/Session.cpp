@@ -11,7 +11,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "comgui/SingleTicket.h"
+#include "store/tickets/SingleTicket.h"
 
 namespace store {
 

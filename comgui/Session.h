@@ -6,9 +6,9 @@
 #include <string>
 #include <string_view>
 
-#include "comgui/StoreEngine.h"
-#include "comgui/StoreKeep.h"
-#include "comgui/TicketContainer.h"
+#include "store/StoreEngine.h"
+#include "store/StoreKeep.h"
+#include "store/tickets/TicketContainer.h"
 
 namespace store {
 

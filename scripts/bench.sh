@@ -9,14 +9,14 @@ cmake --preset release >/dev/null
 
 # Each prints a ratio against a peer or a bare loop that it times in the same run.
 benches=(colour_cgats_bench colour_difference_bench ticket_list_bench ticket_flush_bench jdf_bench
-  comgui_store_bench job_bench)
-cmake --build --preset release --target Tintgate empty_wx comgui_postgres_bench "${benches[@]}"
+  store_bench job_bench)
+cmake --build --preset release --target Tintgate empty_wx store_postgres_bench "${benches[@]}"
 for bench in "${benches[@]}"; do
   echo "== $bench"
   "build/release/bin/$bench"
 done
-echo "== comgui_postgres_bench"
-scripts/with-postgres.sh build/release/bin/comgui_postgres_bench
+echo "== store_postgres_bench"
+scripts/with-postgres.sh build/release/bin/store_postgres_bench
 echo "== the whole program"
 cmake --build --preset release --target bench_tool
 echo "== a whole run of the job form"

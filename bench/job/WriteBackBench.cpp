@@ -15,8 +15,8 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "SuiteRoot.h"
 #include "Timing.h"
-#include "comgui/StoreEngine.h"
-#include "comgui/Users.h"
+#include "store/StoreEngine.h"
+#include "store/Users.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "platform/WideBytes.h"
 

@@ -6,9 +6,9 @@
 #include <memory>
 #include <string>
 
-#include "comgui/MemoryKeep.h"
-#include "comgui/TicketContainer.h"
-#include "comgui/WorkTickets.h"
+#include "store/tickets/MemoryKeep.h"
+#include "store/tickets/TicketContainer.h"
+#include "store/tickets/WorkTickets.h"
 #include "ticket/TicketFactory.h"
 #include "ticket/TicketUpdateList.h"
 

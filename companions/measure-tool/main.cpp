@@ -25,7 +25,7 @@
 #include "companions/measure-tool/Progress.h"
 #include "companions/measure-tool/Settings.h"
 #include "companions/measure-tool/VirtualInstrument.h"
-#include "companions/report/PageFile.h"
+#include "report/PageFile.h"
 
 namespace {
 

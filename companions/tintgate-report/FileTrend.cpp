@@ -3,8 +3,8 @@
 
 #include <sys/stat.h>
 
-#include "companions/report/Page.h"
-#include "companions/report/PageFile.h"
+#include "report/Page.h"
+#include "report/PageFile.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/Trend.h"

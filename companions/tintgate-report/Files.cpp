@@ -9,7 +9,7 @@
 #include <memory>
 
 #include "colour/ColourFile.h"
-#include "companions/report/PageFile.h"
+#include "report/PageFile.h"
 #include "companions/tintgate-report/Failure.h"
 
 namespace reporting {

@@ -6,8 +6,8 @@
 #include <string_view>
 #include <vector>
 
-#include "companions/report/Meta.h"
-#include "companions/report/Result.h"
+#include "report/Meta.h"
+#include "report/Result.h"
 
 namespace reporting {
 

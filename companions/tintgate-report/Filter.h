@@ -5,7 +5,7 @@
 #include <optional>
 #include <string>
 
-#include "companions/report/Sample.h"
+#include "report/Sample.h"
 
 namespace reporting {
 

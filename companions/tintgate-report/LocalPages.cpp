@@ -1,6 +1,6 @@
 #include "companions/tintgate-report/LocalPages.h"
 
-#include "companions/report/Reports.h"
+#include "report/Reports.h"
 #include "companions/tintgate-report/Filter.h"
 #include "platform/TemporaryFolder.h"
 

@@ -5,8 +5,8 @@
 #include <string>
 #include <vector>
 
-#include "companions/report/Page.h"
-#include "companions/report/Sample.h"
+#include "report/Page.h"
+#include "report/Sample.h"
 
 namespace reporting {
 

@@ -3,7 +3,7 @@
 
 #include <string>
 
-#include "companions/report/Result.h"
+#include "report/Result.h"
 
 namespace reporting {
 

@@ -7,7 +7,7 @@
 #include <string>
 #include <utility>
 
-#include "comgui/StoreEngine.h"
+#include "store/StoreEngine.h"
 #include "companions/tintgate-report/TicketKeys.h"
 #include "job/AnalysisLibrary.h"
 

@@ -5,7 +5,7 @@
 #include "analysis/Criteria.h"
 #include "analysis/Judgement.h"
 #include "colour/Difference.h"
-#include "comgui/StoreEngine.h"
+#include "store/StoreEngine.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/LocalPages.h"

@@ -2,7 +2,7 @@
 
 #include <algorithm>
 
-#include "companions/report/Model.h"
+#include "report/Model.h"
 
 namespace reporting {
 namespace {

@@ -3,9 +3,9 @@
 
 #include <string>
 
-#include "companions/report/Meta.h"
-#include "companions/report/Result.h"
-#include "companions/report/Trend.h"
+#include "report/Meta.h"
+#include "report/Result.h"
+#include "report/Trend.h"
 #include "companions/tintgate-report/Terminal.h"
 
 namespace reporting {

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "comgui/TicketElements.h"
+#include "store/tickets/TicketElements.h"
 
 namespace reporting {
 

@@ -12,7 +12,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "companions/report/Model.h"
+#include "report/Model.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Processes.h"
 

@@ -5,7 +5,7 @@
 #include <string>
 #include <vector>
 
-#include "companions/report/Trend.h"
+#include "report/Trend.h"
 #include "companions/tintgate-report/Filter.h"
 
 namespace reporting {

@@ -13,9 +13,9 @@
 
 #include <CLI/CLI.hpp>
 
-#include "companions/report/Page.h"
-#include "companions/report/PageFile.h"
-#include "companions/report/TrendPage.h"
+#include "report/Page.h"
+#include "report/PageFile.h"
+#include "report/TrendPage.h"
 #include "companions/tintgate-report/Explain.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"

@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-#include "comgui/StoreEngine.h"
+#include "store/StoreEngine.h"
 #include "companions/tintgate-store/CommandLine.h"
 
 namespace admin {

@@ -21,7 +21,7 @@
 #include <memory>
 #include <string>
 
-#include "comgui/TicketElements.h"
+#include "store/tickets/TicketElements.h"
 #include "companions/tintgate-store/Bytes.h"
 
 namespace admin {

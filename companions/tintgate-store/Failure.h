@@ -4,7 +4,7 @@
 #include <stdexcept>
 #include <string>
 
-#include "comgui/StoreEngine.h"
+#include "store/StoreEngine.h"
 
 namespace admin {
 

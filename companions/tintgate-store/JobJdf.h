@@ -4,7 +4,7 @@
 #include <string>
 #include <vector>
 
-#include "comgui/StoreEngine.h"
+#include "store/StoreEngine.h"
 
 namespace admin {
 

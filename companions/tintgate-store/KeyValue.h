@@ -5,7 +5,7 @@
 #include <optional>
 #include <string>
 
-#include "comgui/TicketContent.h"
+#include "store/tickets/TicketContent.h"
 
 namespace admin {
 

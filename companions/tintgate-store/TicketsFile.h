@@ -27,7 +27,7 @@
 #include <string>
 #include <vector>
 
-#include "comgui/TicketContent.h"
+#include "store/tickets/TicketContent.h"
 #include "companions/tintgate-store/TicketName.h"
 
 namespace admin {

@@ -1,6 +1,6 @@
 #include <iostream>
 
-#include "comgui/Users.h"
+#include "store/Users.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"

@@ -10,11 +10,11 @@
 #include <vector>
 
 #include "colour/ColourFile.h"
-#include "companions/report/Meta.h"
-#include "companions/report/Page.h"
-#include "companions/report/PageFile.h"
-#include "companions/report/Reports.h"
-#include "companions/report/Result.h"
+#include "report/Meta.h"
+#include "report/Page.h"
+#include "report/PageFile.h"
+#include "report/Reports.h"
+#include "report/Result.h"
 #include "companions/viewer/Browser.h"
 #include "platform/TemporaryFolder.h"
 

@@ -12,7 +12,7 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
 #include "StoreTest.h"
 #include "SuiteRoot.h"
-#include "comgui/Users.h"
+#include "store/Users.h"
 #include "platform/WideBytes.h"
 
 namespace {

@@ -2,9 +2,9 @@
 
 #include <memory>
 
-#include "comgui/MemoryKeep.h"
-#include "comgui/TicketContainer.h"
-#include "comgui/WorkTickets.h"
+#include "store/tickets/MemoryKeep.h"
+#include "store/tickets/TicketContainer.h"
+#include "store/tickets/WorkTickets.h"
 
 #define EXPORTED extern "C" __attribute__((visibility("default")))
 

@@ -12,7 +12,7 @@
 #include <pugixml.hpp>
 
 #include "StoreProgram.h"
-#include "comgui/StoreEngine.h"
+#include "store/StoreEngine.h"
 #include "jdf/JdfHandler.h"
 
 namespace {

@@ -16,9 +16,9 @@
 #include "Postgres.h"
 #include "StoreProgram.h"
 #include "TicketText.h"
-#include "comgui/KeyBytes.h"
-#include "comgui/StoreEngine.h"
-#include "comgui/Users.h"
+#include "store/KeyBytes.h"
+#include "store/StoreEngine.h"
+#include "store/Users.h"
 
 namespace {
 

@@ -15,9 +15,9 @@
 #include "SuiteRoot.h"
 #include "TicketText.h"
 #include "cli/CLogger.h"
-#include "comgui/StoreEngine.h"
-#include "comgui/StoreKeep.h"
-#include "comgui/Users.h"
+#include "store/StoreEngine.h"
+#include "store/StoreKeep.h"
+#include "store/Users.h"
 #include "job/KZVerifyJobProcessor.h"
 
 class JobOnStore : public testing::Test {

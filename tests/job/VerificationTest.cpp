@@ -23,10 +23,10 @@
 #include "RunningProgram.h"
 #include "SuiteRoot.h"
 #include "TicketText.h"
-#include "comgui/Sqlite.h"
-#include "comgui/StoreEngine.h"
-#include "comgui/StoreKeep.h"
-#include "comgui/Users.h"
+#include "store/sqlite/Sqlite.h"
+#include "store/StoreEngine.h"
+#include "store/StoreKeep.h"
+#include "store/Users.h"
 
 namespace {
 

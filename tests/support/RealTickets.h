@@ -9,9 +9,9 @@
 #include <gtest/gtest.h>
 
 #include "TicketText.h"
-#include "comgui/MemoryKeep.h"
-#include "comgui/TicketContainer.h"
-#include "comgui/WorkTickets.h"
+#include "store/tickets/MemoryKeep.h"
+#include "store/tickets/TicketContainer.h"
+#include "store/tickets/WorkTickets.h"
 #include "ticket/SingleTicket.h"
 #include "ticket/TicketContainer.h"
 #include "ticket/TicketFactory.h"

@@ -1,0 +1,107 @@
+// Everything that the page of a report says, worked out of a result and, for a job, its meta file.
+// The page itself (page.html, page.js) places, sorts and draws, and works nothing out.
+#pragma once
+
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "report/Meta.h"
+#include "report/Result.h"
+#include "report/Swatch.h"
+
+namespace report {
+
+/// One criterion. Numbers are texts, with the decimals of the preset.
+struct Figure {
+    std::string title;
+    std::string unit;
+    Outcome outcome = Outcome::Unjudged;
+    std::string word; ///< The outcome in a word: "Passed", "Failed", "No data", "Not judged".
+    std::string value;
+    std::string tolerance;
+    std::string
+        distance; ///< "2.63 above", "0.40 below" or "at the tolerance"; empty without a judgement.
+    double fill = 0; ///< Value as a share of twice the tolerance, 0 to 1: half is the limit.
+    std::size_t patches = 0;
+    std::string worstLabel; ///< Worst patch with its device values, or empty.
+    double excess = 0;      ///< Value over tolerance, for the order; infinite for a tolerance of 0.
+};
+
+struct Bin {
+    double from = 0;
+    double to = 0;
+    std::size_t count = 0;
+};
+
+/// A vertical line in the histogram.
+struct Mark {
+    std::string label;
+    double value = 0;
+    bool limit = false; ///< A tolerance, drawn apart from the figures.
+};
+
+/// One patch with what the page shows of it. Differences are measured less target.
+struct Row {
+    std::size_t patch = 0; ///< Index into the result's patches.
+    Swatch target;
+    Swatch measured;
+};
+
+using Facts = std::vector<std::pair<std::string, std::string>>; ///< Label and text.
+
+struct Model {
+    std::string title;    ///< Of the job, else of the measurement.
+    std::string subtitle; ///< Strip, paper, instrument: what is known, parted by middle dots.
+    Verdict verdict = Verdict::Incomplete;
+    std::string word;                 ///< "Passed", "Failed", "Incomplete".
+    std::string sentence;             ///< What the verdict rests on.
+    std::vector<std::string> reasons; ///< Failed criteria, the furthest above first; then those
+                                      ///< without data.
+    std::string unit;                 ///< Of the differences, such as "ΔE00".
+    std::vector<Figure> judged;       ///< Used criteria: failed, without data, passed.
+    std::vector<Figure> others;       ///< The rest, in the result's order.
+    Facts statistics;
+    std::vector<std::string> warnings;
+    std::vector<Bin> histogram;
+    std::vector<Mark> marks;
+    std::string histogramText;      ///< The same in words, for those who can't see it.
+    std::vector<Row> rows;          ///< All patches, the largest difference first, no number last.
+    std::vector<std::size_t> drawn; ///< Indices of `rows` for the charts.
+    std::string drawnText;          ///< Says so where the charts don't draw all.
+    std::vector<std::pair<std::string, Facts>> sections; ///< Job, inputs, pairing, programs.
+    std::string created; ///< Of the meta file, as a person reads it.
+};
+
+/// Charts draw all patches up to this number; beyond it, half of it from the worst and half evenly
+/// from the rest, which keeps a chart of any size quick and its outline true.
+inline constexpr std::size_t mostDrawn = 2000;
+
+/// `meta` may be null: a result of files has no job.
+Model makeModel(const Result& result, const Meta* meta);
+
+/// Bins of equal, round width (1, 2 or 5 times a power of ten) from 0 to behind the largest value:
+/// about 12 to 30 of them. Values that are not finite are left out, negative ones count as 0.
+std::vector<Bin> histogramOf(const std::vector<double>& values);
+
+/// "Passed", "Failed", "Incomplete".
+const char* wordOf(Verdict verdict);
+
+/// A patch for a person: its id and name or, without either, its row; then its device values.
+std::string labelOf(const Result& result, std::size_t patch);
+
+/// Fixed decimals with a point in every locale; "–" where not finite.
+std::string fixedText(double value, int decimals);
+
+/// "1 May 2024"
+std::string dayText(int day, int month, int year);
+
+/// What a criterion is measured in, such as "ΔE00" under the formula "CIE2000".
+std::string unitOf(const Criterion& criterion, const std::string& formula);
+
+/// 2024-05-01T12:34:56+02:00 as "1 May 2024, 12:34 (UTC+02:00)".
+std::string dateText(const std::string& created);
+
+} // namespace report

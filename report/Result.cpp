@@ -1,0 +1,206 @@
+#include "report/Result.h"
+
+#include <algorithm>
+#include <limits>
+#include <map>
+#include <stdexcept>
+
+#include <nlohmann/json.hpp>
+
+namespace report {
+namespace {
+
+using Json = nlohmann::json;
+
+constexpr int knownVersion = 1;
+
+double number(const Json& value) {
+    return value.is_null() ? std::numeric_limits<double>::quiet_NaN() : value.get<double>();
+}
+
+/// A whole number. A real one is not turned into it, for it may have no room there.
+std::int64_t whole(const Json& value) {
+    if (!value.is_number_integer())
+        throw std::runtime_error("a number that is not whole");
+    return value.get<std::int64_t>();
+}
+
+std::size_t count(const Json& value) {
+    if (whole(value) < 0)
+        throw std::runtime_error("a count below 0");
+    return value.get<std::size_t>();
+}
+
+std::optional<double> optionalNumber(const Json& value) {
+    return value.is_null() ? std::nullopt : std::optional(value.get<double>());
+}
+
+template<class Value>
+Value oneOf(const Json& text, const std::map<std::string, Value>& words) {
+    const auto found = words.find(text.get<std::string>());
+    if (found == words.end())
+        throw std::runtime_error("unknown word \"" + text.get<std::string>() + "\"");
+    return found->second;
+}
+
+colour::Lab lab(const Json& values) {
+    return {number(values.at(0)), number(values.at(1)), number(values.at(2))};
+}
+
+Criterion criterion(const Json& json) {
+    Criterion c;
+    c.name = json.at("name");
+    c.title = json.at("title");
+    c.unit = json.at("unit");
+    c.used = json.at("used");
+    c.outcome = oneOf<Outcome>(json.at("outcome"), {{"pass", Outcome::Pass},
+                                                    {"fail", Outcome::Fail},
+                                                    {"unanswered", Outcome::Unanswered},
+                                                    {"unjudged", Outcome::Unjudged}});
+    c.tolerance = optionalNumber(json.at("tolerance"));
+    c.value = optionalNumber(json.at("value"));
+    c.rounded = optionalNumber(json.at("rounded"));
+    if (const Json& decimals = json.at("decimals"); !decimals.is_null())
+        c.decimals = static_cast<int>(std::clamp<std::int64_t>(whole(decimals), 0, 6));
+    c.patches = count(json.at("patches"));
+    if (const Json& worst = json.at("worstPatch"); !worst.is_null())
+        c.worstPatch = count(worst);
+    return c;
+}
+
+Input input(const Json& json) {
+    Input input;
+    input.path = json.at("path");
+    input.kind = json.at("kind");
+    for (const auto& [key, title] :
+         {std::pair{"description", "Description"}, std::pair{"originator", "Originator"},
+          std::pair{"created", "Created"}, std::pair{"instrumentation", "Instrumentation"},
+          std::pair{"illuminant", "Illuminant"}, std::pair{"observer", "Observer"},
+          std::pair{"measurementCondition", "Measurement condition"}})
+        if (const auto found = json.find(key); found != json.end() && found->is_string())
+            input.statements.emplace_back(title, found->get<std::string>());
+    return input;
+}
+
+Statistics statistics(const Json& json) {
+    return {number(json.at("mean")), number(json.at("median")), number(json.at("percentile95")),
+            number(json.at("maximum")), number(json.at("standardDeviation"))};
+}
+
+/// Takes the rows of the long arrays as the parser meets them, and has them thrown away.
+class Rows {
+  public:
+    explicit Rows(Result& result) : m_result(result) {}
+
+    bool operator()(int depth, Json::parse_event_t event, Json& parsed) {
+        if (event == Json::parse_event_t::key && depth <= 2)
+            (depth == 1 ? m_outer : m_inner) = parsed.get<std::string>();
+        if (event != Json::parse_event_t::array_end)
+            return true;
+        if (depth == 2 && m_outer == "patches")
+            takePatch(parsed);
+        else if (depth == 3 && m_outer == "unpaired")
+            takeUnpaired(parsed);
+        else
+            return true;
+        return false;
+    }
+
+    /// Throws where patches have different numbers of device values.
+    void check() const {
+        if (m_result.device.size() != m_result.channels.size() * m_result.patches.size() ||
+            m_uneven)
+            throw std::runtime_error("device values do not match their channels");
+        if (m_result.patches.empty())
+            throw std::runtime_error("no patches");
+    }
+
+  private:
+    void takePatch(const Json& row) {
+        m_result.patches.push_back(
+            {row.at(0), row.at(1), lab(row.at(3)), lab(row.at(4)), number(row.at(5))});
+        const Json& device = row.at(2);
+        if (m_result.patches.size() == 1)
+            m_channels = device.size();
+        m_uneven = m_uneven || device.size() != m_channels;
+        for (const Json& value : device)
+            m_result.device.push_back(number(value));
+    }
+
+    void takeUnpaired(const Json& row) {
+        Unpaired& list = m_inner == "target"        ? m_result.unpairedTarget
+                         : m_inner == "measurement" ? m_result.unpairedMeasurement
+                                                    : m_result.unpairedPatchSet;
+        ++list.count;
+        if (list.labels.size() < Result::mostLabels) {
+            const std::string id = row.at(0);
+            list.labels.push_back(id.empty() ? row.at(1).get<std::string>() : id);
+        }
+    }
+
+    Result& m_result;
+    std::string m_outer;
+    std::string m_inner;
+    std::size_t m_channels = 0;
+    bool m_uneven = false;
+};
+
+void checkFormat(const Json& json) {
+    if (!json.is_object() || json.value("format", Json()) != "tintgate-result")
+        throw std::runtime_error("not a result");
+    if (json.at("formatVersion") != knownVersion)
+        throw std::runtime_error("a format that this version does not know");
+}
+
+void fill(Result& result, const Json& json) {
+    result.toolVersion = json.at("tool").at("version");
+    result.libraryVersion = json.at("library").at("version");
+    result.verdict = oneOf<Verdict>(json.at("verdict"), {{"passed", Verdict::Passed},
+                                                         {"failed", Verdict::Failed},
+                                                         {"incomplete", Verdict::Incomplete}});
+    result.formula = json.at("formula").at("name");
+    result.presetName = json.at("preset").at("name");
+    result.presetId = whole(json.at("preset").at("id"));
+    const Json& inputs = json.at("inputs");
+    result.target = input(inputs.at("target"));
+    result.measurement = input(inputs.at("measurement"));
+    if (!inputs.at("patchSet").is_null())
+        result.patchSet = input(inputs.at("patchSet"));
+    const Json& pairing = json.at("pairing");
+    result.selection = pairing.at("selection");
+    result.targetBy = pairing.at("target");
+    result.measurementBy = pairing.at("measurement");
+    result.statistics = statistics(json.at("statistics"));
+    for (const Json& item : json.at("criteria"))
+        result.criteria.push_back(criterion(item));
+    for (const Json& item : json.at("warnings"))
+        result.warnings.push_back(item.at("text"));
+    for (const Json& item : json.at("deviceChannels"))
+        result.channels.push_back(item);
+}
+
+void checkWorstPatches(const Result& result) {
+    for (const Criterion& c : result.criteria)
+        if (c.worstPatch && *c.worstPatch >= result.patches.size())
+            throw std::runtime_error("a criterion names a patch that is not there");
+}
+
+} // namespace
+
+std::optional<Result> readResult(std::string_view text, std::string& problem) {
+    try {
+        Result result;
+        Rows rows(result);
+        const Json json = Json::parse(text, std::ref(rows));
+        checkFormat(json);
+        fill(result, json);
+        rows.check();
+        checkWorstPatches(result);
+        return result;
+    } catch (const std::exception& failure) {
+        problem = failure.what();
+        return std::nullopt;
+    }
+}
+
+} // namespace report

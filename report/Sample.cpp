@@ -1,0 +1,108 @@
+#include "report/Sample.h"
+
+#include <cmath>
+
+namespace report {
+namespace {
+
+constexpr struct {
+    const char* name;
+    const char* criterion;
+} inkTable[inkCount] = {{"Paper white", "paperWhite"},
+                        {"Cyan", "solidCyan"},
+                        {"Magenta", "solidMagenta"},
+                        {"Yellow", "solidYellow"},
+                        {"Black", "solidBlack"}};
+
+constexpr double deviceTolerance = 0.5;
+
+bool near(double value, double wanted) {
+    return std::abs(value - wanted) <= deviceTolerance;
+}
+
+InkColours inksOf(const Result& result) {
+    const std::size_t channels = result.channels.size();
+    InkMeans means;
+    for (std::size_t i = 0; i < result.patches.size(); ++i)
+        if (const auto ink = inkOf(result.device.data() + i * channels, channels))
+            means.add(*ink, result.patches[i].measured);
+    return means.means();
+}
+
+std::string instrumentationOf(const Input& input) {
+    for (const auto& [label, text] : input.statements)
+        if (label == "Instrumentation")
+            return text;
+    return {};
+}
+
+} // namespace
+
+const char* inkName(Ink ink) {
+    return inkTable[static_cast<std::size_t>(ink)].name;
+}
+
+const char* inkCriterion(Ink ink) {
+    return inkTable[static_cast<std::size_t>(ink)].criterion;
+}
+
+std::optional<Ink> inkOf(const double* device, std::size_t channels) {
+    if (channels < 4)
+        return std::nullopt;
+    std::optional<std::size_t> full;
+    for (std::size_t i = 0; i < channels; ++i) {
+        if (near(device[i], 0))
+            continue;
+        if (full || i >= 4 || !near(device[i], 100))
+            return std::nullopt;
+        full = i;
+    }
+    return full ? allInks[*full + 1] : Ink::Paper;
+}
+
+void InkMeans::add(Ink ink, const colour::Lab& lab) {
+    if (!std::isfinite(lab.L) || !std::isfinite(lab.a) || !std::isfinite(lab.b))
+        return;
+    Sum& sum = m_sums[static_cast<std::size_t>(ink)];
+    sum.lab = {sum.lab.L + lab.L, sum.lab.a + lab.a, sum.lab.b + lab.b};
+    ++sum.count;
+}
+
+InkColours InkMeans::means() const {
+    InkColours means;
+    for (std::size_t i = 0; i < inkCount; ++i) {
+        const auto& [lab, count] = m_sums[i];
+        const auto n = static_cast<double>(count);
+        if (count != 0)
+            means[i] = colour::Lab{lab.L / n, lab.a / n, lab.b / n};
+    }
+    return means;
+}
+
+Sample sampleOf(const Result& result, const Meta* meta) {
+    Sample sample;
+    const std::string& path = result.measurement.path;
+    sample.title = path.substr(path.rfind('/') + 1);
+    sample.instrument = instrumentationOf(result.measurement);
+    if (meta != nullptr) {
+        sample.title = meta->title.empty() ? "Job " + std::to_string(meta->jobId) : meta->title;
+        sample.jobId = meta->jobId;
+        sample.strip = meta->strip;
+        sample.paper = meta->paper;
+        sample.workflow = meta->workflow;
+        if (!meta->instrument.empty())
+            sample.instrument = meta->instrument;
+    }
+    sample.preset = result.presetName;
+    sample.presetId = result.presetId;
+    sample.formula = result.formula;
+    sample.verdict = result.verdict;
+    sample.criteria = result.criteria;
+    // RGB and the like have channels that are no process inks.
+    if (result.channels.size() >= 4 && result.channels[0].ends_with("C") &&
+        result.channels[3].ends_with("K"))
+        sample.inks = inksOf(result);
+    return sample;
+}
+
+} // namespace report

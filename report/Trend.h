@@ -1,0 +1,95 @@
+// Everything that the page of a trend says, worked out of many results. The page itself
+// (trend.html, trend.js) places and draws, and works nothing out.
+#pragma once
+
+#include <array>
+#include <cstddef>
+#include <cstdint>
+#include <string>
+#include <utility>
+#include <vector>
+
+#include "report/Sample.h"
+#include "report/Swatch.h"
+
+namespace report {
+
+enum class Movement { Unknown, TooFew, Steady, Drifting };
+
+/// Paper or a solid over time.
+struct InkTrend {
+    Ink ink = Ink::Paper;
+    Movement movement = Movement::Unknown;
+    std::string word;     ///< "Drifting", "Steady", "Too few jobs", "No data".
+    std::string sentence; ///< Where it has gone: "1.84 from where it began: lighter (L* +1.20)".
+    colour::Lab began;    ///< Mean of the first jobs; NaN without colours, as is `now`.
+    colour::Lab now;      ///< Average of the latest jobs.
+    Swatch beganSwatch;
+    Swatch nowSwatch;
+    double shift = 0; ///< Distance of the two in CIELAB; without colours, change of the difference.
+    /// L*, a*, b* of each job less `began`: as measured, and averaged. NaN where nothing is known;
+    /// empty without any colours.
+    std::array<std::vector<double>, 3> changes;
+    std::array<std::vector<double>, 3> averages;
+    /// The latest difference from the target with its tolerance; empty where not judged.
+    std::string value;
+    std::string tolerance;
+    double fill = 0;    ///< Value as a share of twice the tolerance, 0 to 1.
+    bool above = false; ///< The latest job is above the tolerance.
+};
+
+/// A criterion over time.
+struct CriterionTrend {
+    std::string title;
+    std::string unit;
+    bool used = false; ///< By at least one job.
+    int decimals = 2;
+    std::vector<double> values;    ///< One a job, as judged; NaN for none.
+    std::vector<Outcome> outcomes; ///< One a job.
+    /// The tolerance and the index of the job from which it holds; NaN for none.
+    std::vector<std::pair<std::size_t, double>> tolerances;
+    std::size_t failed = 0;
+    std::size_t answered = 0;
+    std::string latest;    ///< The last value that there is.
+    std::string tolerance; ///< The last one.
+};
+
+/// Results that may be compared with each other: of one paper, preset, formula, instrument,
+/// workflow and strip.
+struct Series {
+    std::string name; ///< These six in words.
+    std::string preset;
+    std::string paper;
+    Movement movement = Movement::Unknown;
+    bool failing = false; ///< The latest job failed.
+    std::string word;     ///< "Drifting: cyan, black", "Steady", ...
+    std::string sentence;
+    std::vector<std::string> reasons;
+    std::string span; ///< "3 November 2026 to 24 November 2026".
+    std::size_t passed = 0;
+    std::size_t failed = 0;
+    std::size_t incomplete = 0;
+    std::vector<InkTrend> inks;           ///< All five, in the order of Ink.
+    std::vector<CriterionTrend> criteria; ///< Used ones first, else in the results' order.
+    std::vector<std::size_t> samples;     ///< Indices into TrendModel::samples, by time.
+    std::size_t beginning = 0;            ///< How many jobs make the beginning.
+};
+
+struct TrendModel {
+    std::string subtitle;
+    std::vector<std::string> notes; ///< What a person should know of the data as a whole.
+    std::vector<Sample> samples;    ///< By time.
+    std::vector<Series> series;     ///< Drifting ones first, then those of the most jobs.
+};
+
+/// `source` says in words where the samples come from. REQUIRES: samples.
+TrendModel makeTrend(std::vector<Sample> samples, const std::string& source,
+                     std::vector<std::string> notes);
+
+/// The furthest of a job's used criteria, as "Solid cyan 4.75 of 3.00"; empty without any.
+std::string nearestText(const Sample& sample);
+
+/// "24 November 2026, 21:53", of a time as samples have it.
+std::string timeText(std::int64_t time);
+
+} // namespace report

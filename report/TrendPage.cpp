@@ -1,0 +1,147 @@
+#include "report/TrendPage.h"
+
+#include <cmath>
+
+#include "report/InPage.h"
+#include "report/Model.h"
+#include "report/Template.h"
+
+namespace report {
+namespace {
+
+constexpr double secondsOfDay = 86400;
+
+const char* keyOf(Movement movement) {
+    switch (movement) {
+    case Movement::Drifting:
+        return "drifting";
+    case Movement::Steady:
+        return "steady";
+    case Movement::TooFew:
+    case Movement::Unknown:
+        break;
+    }
+    return "unknown";
+}
+
+std::string labText(const colour::Lab& lab) {
+    if (!std::isfinite(lab.L))
+        return {};
+    const auto tenths = [](double value) {
+        return fixedText(std::round(value * 10) / 10 + 0.0, 1); // No "-0.0".
+    };
+    return tenths(lab.L) + " " + tenths(lab.a) + " " + tenths(lab.b);
+}
+
+/// A part of the page's data: a tree for what there is little of, then lists of numbers as text.
+class Part {
+  public:
+    explicit Part(const PageJson& head) : m_text(inScript(head)) { m_text.pop_back(); }
+
+    void numbers(const char* name, const std::vector<double>& values, int decimals) {
+        m_text += std::string(",\"") + name + "\":";
+        appendRounded(m_text, values, decimals);
+    }
+    void list(const char* name, const std::vector<std::string>& parts) {
+        m_text += std::string(",\"") + name + "\":[";
+        for (std::size_t i = 0; i < parts.size(); ++i)
+            m_text += (i == 0 ? "\n" : ",\n") + parts[i];
+        m_text += ']';
+    }
+    std::string text() && { return std::move(m_text) + "}"; }
+
+  private:
+    std::string m_text;
+};
+
+std::string inkData(const InkTrend& ink) {
+    Part part({{"name", inkName(ink.ink)},
+               {"movement", keyOf(ink.movement)},
+               {"word", ink.word},
+               {"sentence", ink.sentence},
+               {"began", labText(ink.began)},
+               {"now", labText(ink.now)},
+               {"beganSwatch", swatchText(ink.beganSwatch)},
+               {"nowSwatch", swatchText(ink.nowSwatch)},
+               {"value", ink.value},
+               {"tolerance", ink.tolerance},
+               {"fill", ink.fill},
+               {"above", ink.above}});
+    static constexpr const char* changeNames[] = {"changeL", "changeA", "changeB"};
+    static constexpr const char* averageNames[] = {"averageL", "averageA", "averageB"};
+    for (std::size_t i = 0; i < 3; ++i) {
+        part.numbers(changeNames[i], ink.changes[i], 3);
+        part.numbers(averageNames[i], ink.averages[i], 3);
+    }
+    return std::move(part).text();
+}
+
+std::string criterionData(const CriterionTrend& criterion) {
+    std::string outcomes;
+    for (const Outcome outcome : criterion.outcomes)
+        outcomes += keyOf(outcome)[0]; // p, f, i or u
+    PageJson tolerances = PageJson::array();
+    for (const auto& [job, tolerance] : criterion.tolerances)
+        tolerances.push_back({job, std::isfinite(tolerance) ? PageJson(tolerance) : PageJson()});
+    Part part({{"title", criterion.title},
+               {"unit", criterion.unit},
+               {"used", criterion.used},
+               {"decimals", criterion.decimals},
+               {"latest", criterion.latest},
+               {"tolerance", criterion.tolerance},
+               {"failed", criterion.failed},
+               {"answered", criterion.answered},
+               {"tolerances", tolerances},
+               {"outcomes", outcomes}});
+    part.numbers("values", criterion.values, 6);
+    return std::move(part).text();
+}
+
+/// [time in days, verdict, title, nearest criterion, link]
+std::string jobData(const Sample& sample) {
+    return inScript({static_cast<double>(sample.time) / secondsOfDay, keyOf(sample.verdict),
+                     sample.title + (sample.strip == 2 ? ", second strip" : ""),
+                     nearestText(sample), sample.page.empty() ? "" : linkTo(sample.page)});
+}
+
+std::string seriesData(const TrendModel& model, const Series& series) {
+    Part part({{"name", series.name},
+               {"movement", keyOf(series.movement)},
+               {"failing", series.failing},
+               {"word", series.word},
+               {"sentence", series.sentence},
+               {"reasons", series.reasons},
+               {"span", series.span},
+               {"passed", series.passed},
+               {"failed", series.failed},
+               {"incomplete", series.incomplete},
+               {"beginning", series.beginning}});
+    std::vector<std::string> parts;
+    for (const InkTrend& ink : series.inks)
+        parts.push_back(inkData(ink));
+    part.list("inks", parts);
+    parts.clear();
+    for (const CriterionTrend& criterion : series.criteria)
+        parts.push_back(criterionData(criterion));
+    part.list("criteria", parts);
+    parts.clear();
+    for (const std::size_t index : series.samples)
+        parts.push_back(jobData(model.samples[index]));
+    part.list("jobs", parts);
+    return std::move(part).text();
+}
+
+} // namespace
+
+std::string trendPageOf(const TrendModel& model) {
+    Part data({{"subtitle", model.subtitle}, {"notes", model.notes}});
+    std::vector<std::string> parts;
+    for (const Series& series : model.series)
+        parts.push_back(seriesData(model, series));
+    data.list("series", parts);
+    std::string page(trendTemplate[0]);
+    page += std::move(data).text();
+    return page += trendTemplate[1];
+}
+
+} // namespace report

@@ -1,0 +1,14 @@
+// The page of a trend: HTML in one piece that fetches nothing.
+#pragma once
+
+#include <string>
+
+#include "report/Trend.h"
+
+namespace report {
+
+/// The whole page as UTF-8; the same samples give the same bytes. What is said of pageOf holds here
+/// too: texts are data, and nothing runs but the page's own scripts.
+std::string trendPageOf(const TrendModel& model);
+
+} // namespace report

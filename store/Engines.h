@@ -1,0 +1,39 @@
+// The kinds of places that stores are in, and what is the same in each.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <string_view>
+#include <utility>
+#include <vector>
+
+#include "store/StoreEngine.h"
+
+namespace store {
+
+/// One kind. As the functions of StoreEngine.h.
+struct EngineKind {
+    std::unique_ptr<StoreEngine> (*open)(const std::string& address);
+    void (*make)(const std::string& address, const std::string& serverName);
+    std::unique_ptr<StoreEngine> (*openCopy)(const std::string& address);
+    bool (*bringUpToDate)(const std::string& address);
+};
+
+extern const EngineKind sqliteKind;
+extern const EngineKind postgresKind;
+
+inline constexpr int highestTicketId = 0xFFFFFF;
+
+/// What is stored of a key. Throws StoreFailure (Damaged).
+std::shared_ptr<Elements> decoded(std::string_view bytes);
+
+/// Names and stored values of what every client asks the system ticket for.
+std::vector<std::pair<std::string, std::string>> systemKeys(const std::string& serverName);
+
+/// The lowest number from 1 on that is not among ascending ids.
+int lowestFree(const std::vector<int>& ids);
+
+/// Throws the failure of a store of another format than the present one.
+void checkFormat(std::int64_t found, std::int64_t present);
+
+} // namespace store

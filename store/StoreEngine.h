@@ -1,0 +1,196 @@
+// Where a store's tickets, users and files are kept: the one interface behind which a database is
+// known. What a table does to a ticket is said above it, by TicketContent.
+#pragma once
+
+#include <chrono>
+#include <cstddef>
+#include <cstdint>
+#include <functional>
+#include <iosfwd>
+#include <map>
+#include <memory>
+#include <optional>
+#include <stdexcept>
+#include <string>
+#include <string_view>
+#include <vector>
+
+#include "store/tickets/TicketContent.h"
+
+namespace store {
+
+/// Why a store did not do what it was asked.
+enum class Fault {
+    Missing,  ///< No store at this address, or none that this user may read.
+    Newer,    ///< A store of a format that this program does not know yet.
+    Older,    ///< A store of an earlier format: bringStoreUpToDate.
+    ReadOnly, ///< The store, or a place in it, can't be written.
+    Full,     ///< No room: disk, quota or limit.
+    Busy,     ///< Others held the store longer than longestWait.
+    Damaged,  ///< What is stored makes no sense.
+    BadPath,  ///< A server path that leads nowhere inside the store, or to something else than a
+              ///< file.
+    NoFile,   ///< No such file or version.
+    Exists,   ///< There is one already.
+    Lost,     ///< The server does not answer (any more). Whether it still took what was under way
+              ///< is not known; it took all of it or nothing.
+    Other,    ///< The text tells.
+};
+
+/// A failure of a store. Whatever was under way is undone, but see Lost. The text is one for
+/// people.
+class StoreFailure : public std::runtime_error {
+  public:
+    StoreFailure(Fault fault, const std::string& text) : std::runtime_error(text), fault(fault) {}
+
+    const Fault fault;
+};
+
+/// How long a change waits for changes of others before it fails with Fault::Busy.
+inline constexpr int longestWaitMilliseconds = 10'000;
+
+/// Names of users and passwords have at most this many bytes.
+inline constexpr std::size_t longestCredential = 127;
+
+struct User {
+    std::string name; ///< Bytes, as the session record carries them.
+    std::string passwordHash;
+    bool disabled = false;
+};
+
+/// Times are in seconds since 1970. Paths are server paths without a slash in front.
+struct FileEntry {
+    std::string path;
+    std::uint64_t size = 0;
+    std::int64_t time = 0;
+};
+
+/// A file's content before it was replaced.
+struct FileVersion {
+    int number = 0; ///< From 1, in the order of replacement.
+    std::uint64_t size = 0;
+    std::int64_t time = 0; ///< When this content had been written.
+};
+
+/// What a change of a ticket is about to touch.
+struct Scope {
+    /// The ticket is emptied first; keys says nothing then.
+    bool everything = false;
+    /// By name, whether what the key holds is needed. Keys that are not listed stay as they are.
+    std::map<std::string, bool, std::less<>> keys;
+};
+
+/// An open store. All of it may throw StoreFailure, and std::bad_alloc. One thread at a time.
+///
+/// Types and ids are valid ones (TICKET_Valid). Keys and names are bytes and compared as bytes.
+/// Each operation is a transaction of its own and sees what others, in this process or another,
+/// have committed.
+class StoreEngine {
+  public:
+    virtual ~StoreEngine() = default;
+
+    /// False once the connection to a server is lost, which is for good. Asks nobody.
+    virtual bool alive() = 0;
+
+    /// A number that differs from the last one if anybody has committed anything since. It may
+    /// differ without that. Meant to be asked before each read. Where only a server knows, it is
+    /// asked if something fetched by keysOfAll may still be as it was; an answer that may be of
+    /// this age spares that. Commits of this object itself are noticed at any age.
+    virtual std::uint64_t commits(std::chrono::milliseconds age) = 0;
+
+    // Tickets.
+
+    /// Of all tickets of a type, ascending.
+    virtual std::vector<int> ids(int type) = 0;
+    virtual bool exists(int type, int id) = 0;
+    /// An empty ticket under this id. False when there is one already.
+    virtual bool create(int type, int id) = 0;
+    /// An empty ticket under the id after the highest that the type ever had or, when these are
+    /// used up, under the lowest free one. Its id, or -1.
+    virtual int createNext(int type) = 0;
+    virtual bool remove(int type, int id) = 0;
+
+    /// One key; null when there is no such key or ticket. The same key again costs no more than to
+    /// see that it has not changed.
+    virtual std::shared_ptr<const Elements> key(int type, int id, std::string_view name) = 0;
+    /// The keys that the filter takes, all of one moment; null when there is no such ticket.
+    virtual std::shared_ptr<const TicketContent> content(int type, int id,
+                                                         const KeyFilter& filter) = 0;
+
+    /// Shown one key of one ticket: name is an index into the list of names. Elements are null for
+    /// a key that takes more room than was asked for.
+    using ShowKey =
+        std::function<void(int id, std::size_t name, std::shared_ptr<const Elements> elements)>;
+    /// Some keys of all tickets of a type, all of one moment, as far as each takes at most
+    /// largestBytes in the store; by ascending id. Equal elements may be one object.
+    virtual void keysOfAll(int type, const std::vector<std::string>& names,
+                           std::size_t largestBytes, const ShowKey& show) = 0;
+
+    /// One transaction, which locks the ticket first: fetches the keys that the scope needs, has
+    /// them changed by work, and writes what differs then. Work touches no key outside the scope.
+    /// False when there is no such ticket, which is not looked for before work is called unless
+    /// something is needed. What work throws undoes it.
+    virtual bool change(int type, int id, const Scope& scope,
+                        const std::function<void(TicketContent&)>& work) = 0;
+
+    // Users.
+
+    virtual std::vector<User> users() = 0; ///< By name.
+    virtual std::optional<User> user(std::string_view name) = 0;
+    /// Adds the user, or takes the place of the one with this name.
+    virtual void putUser(const User& user) = 0;
+    virtual bool removeUser(std::string_view name) = 0;
+
+    // Files. A server path may start with slashes; it means the file below the store's files in
+    // any case. Refused with Fault::BadPath: parts that are "..", that start with ".tintgate-" or
+    // have more than 255 bytes, NUL, a slash at the end, more than 2,048 bytes, no part at all; and
+    // any symbolic link on the way, wherever it leads.
+
+    /// Puts a file in place whole, from the stream's bytes up to its end: whoever looks sees all of
+    /// it, or what was there before. What it replaces is kept as a version. Folders are made.
+    virtual void putFile(std::string_view path, std::istream& from) = 0;
+    /// Copies a file, of one version throughout, to the stream.
+    virtual void getFile(std::string_view path, std::ostream& to) = 0;
+    virtual std::vector<FileEntry> files() = 0; ///< By path.
+
+    virtual std::vector<FileVersion> versions(std::string_view path) = 0; ///< By number.
+    virtual void getVersion(std::string_view path, int number, std::ostream& to) = 0;
+    /// Puts a version in place again; what it replaces is kept as a version in turn.
+    virtual void restoreVersion(std::string_view path, int number) = 0;
+    /// Removes a file's versions but for the newest ones. The number removed.
+    virtual int pruneVersions(std::string_view path, int keepNewest) = 0;
+    /// Removes what interrupted deliveries left behind. The number of files removed.
+    virtual int removeLeftovers() = 0;
+
+    // What a copy needs on top of these.
+
+    /// By type, the highest id that it ever had, if that is above 0.
+    virtual std::map<int, int> highestIds() = 0;
+    /// Makes createNext go on behind this id at the least.
+    virtual void raiseHighestId(int type, int id) = 0;
+    /// Puts a content in place with its number and time, and keeps nothing of what it replaces.
+    /// Number 0 is the file itself, which goes first. The size is not looked at.
+    virtual void placeVersion(std::string_view path, const FileVersion& version,
+                              std::istream& from) = 0;
+    /// Makes a store of what openCopy opened. Before it, nothing of it has to be on the disk.
+    virtual void finishCopy() = 0;
+};
+
+// A store's address, as bytes, is the path of a folder on a local disk where it starts with a
+// slash. Any other names a connection service of a PostgreSQL server (pg_service.conf), with a
+// store in the schema "tintgate" of its database.
+
+std::unique_ptr<StoreEngine> openStore(const std::string& address);
+
+/// Makes a new store, with the system ticket in it, where nothing is or an empty folder. A folder
+/// and what is in it are for owner and group alone, as the umask allows.
+void makeStore(const std::string& address, const std::string& serverName);
+
+/// Makes a store without anything in it, as makeStore, or opens one of which a copy was begun and
+/// not finished. Until finishCopy nobody can open it otherwise, and nobody else to copy to it.
+std::unique_ptr<StoreEngine> openCopy(const std::string& address);
+
+/// Brings a store of an earlier format up to date. False when it was.
+bool bringStoreUpToDate(const std::string& address);
+
+} // namespace store

@@ -1,0 +1,24 @@
+// Who may log in to a store.
+#pragma once
+
+#include <string>
+#include <string_view>
+
+#include "store/StoreEngine.h"
+
+namespace store {
+
+enum class LoginAnswer { Welcome, WrongUserOrPassword, Disabled };
+
+/// Names and passwords are compared as the bytes that they arrive in.
+///
+/// Whether or not there is such a user, the answer takes the time of one hash: Argon2id at
+/// libsodium's limits for interactive use, two passes over 64 MiB, which costs a login somewhat
+/// under 0.1 s of one core and that memory for as long.
+LoginAnswer checkLogin(StoreEngine& store, std::string_view name, std::string_view password);
+
+/// The salted hash of a password, as a user's record holds it. Throws std::bad_alloc where there is
+/// no memory for it.
+std::string passwordHash(std::string_view password);
+
+} // namespace store

@@ -1,0 +1,446 @@
+#include "store/postgres/Postgres.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <cstdlib>
+#include <new>
+#include <utility>
+
+#include <poll.h>
+
+namespace store::postgres {
+
+namespace {
+
+using Clock = std::chrono::steady_clock;
+
+constexpr int oldestServer = 130'000; // The first with pg_current_snapshot.
+
+constexpr Statement begin = {"BEGIN ISOLATION LEVEL READ COMMITTED"};
+constexpr Statement commit = {"COMMIT"};
+
+/// Faults by the start of the server's five-letter codes; the first that fits counts. Appendix A of
+/// PostgreSQL's manual lists them.
+struct FaultRow {
+    std::string_view state;
+    Fault fault;
+};
+constexpr FaultRow faults[] = {
+    {"08", Fault::Lost},                                    // connection exceptions
+    {"25006", Fault::ReadOnly}, {"25P03", Fault::Lost},     // idle in a transaction for too long
+    {"40", Fault::Busy},                                    // deadlocks
+    {"23505", Fault::Exists},                               // made by two at once
+    {"42P06", Fault::Exists},   {"42501", Fault::ReadOnly}, // insufficient privilege
+    {"42", Fault::Damaged},                                 // a table or column that is not there
+    {"3F", Fault::Damaged},                                 // nor a schema
+    {"53", Fault::Full},                                    // disk, memory, connections
+    {"54", Fault::Full},    // what the server can't hold in one piece
+    {"55P03", Fault::Busy}, // waited too long for a lock
+    {"57014", Fault::Busy}, // a statement that took too long
+    {"57", Fault::Lost},    // shut down, or not up yet
+    {"XX001", Fault::Damaged},  {"XX002", Fault::Damaged},
+};
+
+Fault faultOf(std::string_view state) {
+    for (const auto& row : faults) {
+        if (state.starts_with(row.state)) {
+            return row.fault;
+        }
+    }
+    return Fault::Other;
+}
+
+/// A message of the library as one line.
+std::string oneLine(std::string text) {
+    while (!text.empty() && text.back() == '\n') {
+        text.pop_back();
+    }
+    std::replace(text.begin(), text.end(), '\n', ' ');
+    return text;
+}
+
+void appendBigEndian(std::string& bytes, std::uint64_t number, int size) {
+    for (int shift = 8 * (size - 1); shift >= 0; shift -= 8) {
+        bytes += static_cast<char>(number >> shift);
+    }
+}
+
+/// A number that the service says; 0 where it says none that limits anything.
+template<class Settings>
+int said(const Settings& settings, const char* name) {
+    const auto found = settings.find(name);
+    return found == settings.end() ? 0 : std::max(std::atoi(found->second.c_str()), 0);
+}
+
+} // namespace
+
+std::int64_t numberOf(std::string_view bytes) {
+    // The first byte bears the sign, except in a boolean, which is 0 or 1 anyway.
+    std::int64_t number = bytes.empty() ? 0 : static_cast<signed char>(bytes[0]);
+    for (std::size_t i = 1; i < bytes.size(); ++i) {
+        number = number * 256 + static_cast<unsigned char>(bytes[i]);
+    }
+    return number;
+}
+
+std::int64_t Result::number(int row, int column) const {
+    return numberOf(bytes(row, column));
+}
+
+int Result::changed() const {
+    return std::atoi(m_pq->cmdTuples(m_result.get()));
+}
+
+// Number of dimensions, whether there are nulls, type; of the dimension its length and first index;
+// then each element's length and bytes.
+ArrayReader::ArrayReader(std::string_view value) : m_value(value) {
+    constexpr std::size_t header = 20;
+    if (value.size() >= header) {
+        m_left = static_cast<std::size_t>(numberOf(value.substr(12, 4)));
+        m_value.remove_prefix(header);
+    }
+}
+
+std::string_view ArrayReader::next() {
+    --m_left;
+    const auto size = static_cast<std::size_t>(numberOf(m_value.substr(0, 4)));
+    const std::string_view element = m_value.substr(4, size);
+    m_value.remove_prefix(4 + size);
+    return element;
+}
+
+void Arguments::addOwn(std::string bytes) {
+    m_own.push_back(std::move(bytes));
+    m_views.push_back(m_own.back());
+}
+
+void Arguments::add(int number) {
+    std::string bytes;
+    appendBigEndian(bytes, static_cast<std::uint64_t>(std::int64_t{number}), 4);
+    addOwn(std::move(bytes));
+}
+
+void Arguments::add(std::int64_t number) {
+    std::string bytes;
+    appendBigEndian(bytes, static_cast<std::uint64_t>(number), 8);
+    addOwn(std::move(bytes));
+}
+
+void Arguments::add(bool value) {
+    addOwn(std::string(1, value ? '\1' : '\0'));
+}
+
+void Arguments::add(std::string_view bytes) {
+    m_views.push_back(bytes.data() == nullptr ? std::string_view("") : bytes);
+}
+
+void Arguments::add(const std::vector<std::string_view>& list) {
+    constexpr int byteaType = 17;
+    std::size_t size = 20;
+    for (const auto element : list) {
+        size += 4 + element.size();
+    }
+    if (size > std::size_t{1} << 30) {
+        throw StoreFailure(Fault::Full, "the server takes no more than 1 GB in one piece");
+    }
+    std::string bytes;
+    bytes.reserve(size);
+    for (const std::uint64_t word :
+         {std::uint64_t{!list.empty()}, std::uint64_t{0}, std::uint64_t{byteaType}}) {
+        appendBigEndian(bytes, word, 4);
+    }
+    if (!list.empty()) {
+        appendBigEndian(bytes, list.size(), 4);
+        appendBigEndian(bytes, 1, 4);
+    }
+    for (const auto element : list) {
+        appendBigEndian(bytes, element.size(), 4);
+        bytes += element;
+    }
+    addOwn(std::move(bytes));
+}
+
+std::vector<const char*> Arguments::values() const {
+    std::vector<const char*> values;
+    for (const auto view : m_views) {
+        values.push_back(view.data());
+    }
+    return values;
+}
+
+std::vector<int> Arguments::lengths() const {
+    std::vector<int> lengths;
+    for (const auto view : m_views) {
+        lengths.push_back(static_cast<int>(view.size()));
+    }
+    return lengths;
+}
+
+/// What the service and the user's environment say. The service is read by the library alone, when
+/// it connects; so it is made to connect to where nothing can be.
+Connection::Settings Connection::settingsOf(const LibPq& pq, const std::string& service) {
+    const char* const names[] = {"service", "host", nullptr};
+    const char* const values[] = {service.c_str(), "/dev/null", nullptr};
+    const Handle nowhere(pq.connectStartParams(names, values, 0), pq.finish);
+    const std::unique_ptr<PQconninfoOption, void (*)(PQconninfoOption*)> options(
+        pq.conninfo(nowhere.get()), pq.conninfoFree);
+    Settings settings;
+    for (const auto* option = options.get(); option != nullptr && option->keyword != nullptr;
+         ++option) {
+        if (option->val != nullptr) {
+            settings[option->keyword] = option->val;
+        }
+    }
+    return settings;
+}
+
+PGconn* Connection::connect(const LibPq& pq, const std::string& service, const Settings& said) {
+    const std::string connectLimit = std::to_string(longestConnect.count());
+    const std::string wayLimit = std::to_string(std::chrono::milliseconds(longestWay).count());
+    std::vector<const char*> names = {"service", "fallback_application_name"};
+    std::vector<const char*> values = {service.c_str(), "tintgate"};
+    const auto unlessSaid = [&](const char* name, const std::string& value) {
+        if (postgres::said(said, name) == 0) {
+            names.push_back(name);
+            values.push_back(value.c_str());
+        }
+    };
+    unlessSaid("connect_timeout", connectLimit);
+    unlessSaid("tcp_user_timeout", wayLimit);
+    names.push_back(nullptr);
+    values.push_back(nullptr);
+    return pq.connectdbParams(names.data(), values.data(), 0);
+}
+
+Connection::Connection(const std::string& service)
+    : m_pq(&libPq()), m_connection(nullptr, m_pq->finish) {
+    const Settings said = settingsOf(*m_pq, service);
+    m_connection.reset(connect(*m_pq, service, said));
+    if (lost()) {
+        throw std::bad_alloc();
+    }
+    if (m_pq->status(m_connection.get()) != CONNECTION_OK) {
+        throw StoreFailure(Fault::Missing,
+                           service + ": " + oneLine(m_pq->errorMessage(m_connection.get())));
+    }
+    if (m_pq->serverVersion(m_connection.get()) < oldestServer) {
+        throw StoreFailure(Fault::Missing, service + " is a server before PostgreSQL 13");
+    }
+    settle(said);
+}
+
+void Connection::settle(const Settings& said) {
+    m_pq->setNoticeProcessor(
+        m_connection.get(), [](void*, const char*) {}, nullptr);
+    m_pq->setnonblocking(m_connection.get(), 1);
+    m_pq->enterPipelineMode(m_connection.get());
+    static const std::string settings =
+        "SELECT set_config(name, value, false) FROM (VALUES ('lock_timeout', '" +
+        std::to_string(longestWaitMilliseconds) +
+        "', true),"
+        " ('jit', 'off', true)," // It takes longer than what it would make faster.
+        " ('statement_timeout', '" +
+        std::to_string(longestStatement.count()) +
+        "s', false), ('idle_in_transaction_session_timeout', '" +
+        std::to_string(longestPause.count()) +
+        "s', false)) AS setting (name, value, always)"
+        " WHERE always OR current_setting(name) = '0'";
+    static constexpr Statement limit = {
+        "SELECT setting::bigint FROM pg_settings WHERE name = 'statement_timeout'"};
+    send(Statement{settings.c_str()});
+    send(limit);
+    const int way = postgres::said(said, "tcp_user_timeout");
+    m_longestSilence = std::chrono::milliseconds(finish()[1].number(0, 0)) +
+                       (way > 0 ? std::chrono::milliseconds(way) : longestWay);
+}
+
+void Connection::beThere() const {
+    if (lost()) {
+        throw StoreFailure(Fault::Lost, "the connection to the server was lost");
+    }
+}
+
+void Connection::lose(const std::string& why) {
+    m_connection.reset();
+    m_sent.clear();
+    throw StoreFailure(Fault::Lost, "the connection to the server was lost: " + why);
+}
+
+void Connection::fail(const PGresult* result) {
+    const char* const state = m_pq->resultErrorField(result, PG_DIAG_SQLSTATE);
+    const char* const primary = m_pq->resultErrorField(result, PG_DIAG_MESSAGE_PRIMARY);
+    const std::string text =
+        oneLine(primary != nullptr ? primary : m_pq->resultErrorMessage(result));
+    const Fault fault = faultOf(state == nullptr ? "" : state);
+    if (fault == Fault::Lost || m_pq->status(m_connection.get()) != CONNECTION_OK) {
+        lose(text);
+    }
+    throw StoreFailure(fault, "the store's server: " + text);
+}
+
+void Connection::checkSent(int done) {
+    if (done != 1) {
+        lose(oneLine(m_pq->errorMessage(m_connection.get())));
+    }
+}
+
+void Connection::sendArguments(const Statement& statement, const Arguments& arguments) {
+    beThere();
+    const std::string name = std::to_string(reinterpret_cast<std::uintptr_t>(statement.text));
+    if (m_prepared.count(statement.text) == 0) {
+        checkSent(m_pq->sendPrepare(m_connection.get(), name.c_str(), statement.text, 0, nullptr));
+        m_sent.push_back({statement.text, true});
+        m_prepared.insert(statement.text);
+    }
+    const std::vector<int> binary(static_cast<std::size_t>(arguments.count()), 1);
+    checkSent(m_pq->sendQueryPrepared(m_connection.get(), name.c_str(), arguments.count(),
+                                      arguments.values().data(), arguments.lengths().data(),
+                                      binary.data(), 1));
+    m_sent.push_back({statement.text, false});
+}
+
+/// Until there is something to read.
+void Connection::waitForServer() {
+    const auto end = Clock::now() + m_longestSilence;
+    for (;;) {
+        const int unsent = m_pq->flush(m_connection.get());
+        if (unsent < 0) {
+            lose(oneLine(m_pq->errorMessage(m_connection.get())));
+        }
+        pollfd wait = {m_pq->socket(m_connection.get()),
+                       static_cast<short>(POLLIN | (unsent > 0 ? POLLOUT : 0)), 0};
+        const auto left =
+            std::chrono::duration_cast<std::chrono::milliseconds>(end - Clock::now()).count();
+        const int ready = left > 0 ? poll(&wait, 1, static_cast<int>(left)) : 0;
+        if (ready == 0) {
+            lose("it has not answered for " + std::to_string(m_longestSilence.count() / 1'000) +
+                 " seconds");
+        }
+        if (ready > 0 && (wait.revents & ~POLLOUT) != 0) {
+            break;
+        }
+        if (ready > 0) {
+            return; // It took something: a sign of life.
+        }
+        if (errno != EINTR) {
+            lose("it can't be waited for");
+        }
+    }
+    if (m_pq->consumeInput(m_connection.get()) == 0) {
+        lose(oneLine(m_pq->errorMessage(m_connection.get())));
+    }
+}
+
+PGresult* Connection::nextResult() {
+    while (m_pq->isBusy(m_connection.get()) != 0) {
+        waitForServer();
+    }
+    return m_pq->getResult(m_connection.get());
+}
+
+std::vector<Result> Connection::finish() {
+    beThere();
+    checkSent(m_pq->pipelineSync(m_connection.get()));
+    const std::vector<Sent> sent = std::move(m_sent);
+    m_sent.clear();
+    std::vector<Result> results;
+    std::unique_ptr<Result> failed;
+    for (const auto& each : sent) {
+        Result result(*m_pq, nextResult());
+        const ExecStatusType status = m_pq->resultStatus(result.get());
+        if (status == PGRES_COMMAND_OK || status == PGRES_TUPLES_OK) {
+            if (!each.preparing) {
+                results.push_back(std::move(result));
+            }
+        } else {
+            if (each.preparing) {
+                m_prepared.erase(each.text);
+            }
+            if (!failed) {
+                failed = std::make_unique<Result>(std::move(result));
+            }
+        }
+        if (m_pq->status(m_connection.get()) != CONNECTION_OK) {
+            fail(failed ? failed->get() : nullptr);
+        }
+        m_pq->clear(nextResult()); // The null behind each.
+    }
+    m_pq->clear(nextResult()); // That of the synchronisation.
+    if (failed) {
+        fail(failed->get());
+    }
+    return results;
+}
+
+void Connection::script(const std::string& statements) {
+    beThere();
+    const std::chrono::milliseconds former =
+        std::exchange(m_longestSilence, std::chrono::hours(24));
+    checkSent(m_pq->exitPipelineMode(m_connection.get()));
+    checkSent(m_pq->sendQuery(m_connection.get(), statements.c_str()));
+    std::unique_ptr<Result> failed;
+    while (PGresult* const next = nextResult()) {
+        Result result(*m_pq, next);
+        if (m_pq->resultStatus(next) == PGRES_FATAL_ERROR && !failed) {
+            failed = std::make_unique<Result>(std::move(result));
+        }
+    }
+    m_longestSilence = former;
+    if (!failed) {
+        checkSent(m_pq->enterPipelineMode(m_connection.get()));
+        return;
+    }
+    if (m_pq->status(m_connection.get()) == CONNECTION_OK) {
+        m_pq->enterPipelineMode(m_connection.get());
+    }
+    fail(failed->get());
+}
+
+void Connection::rollBack() noexcept {
+    static constexpr Statement rollback = {"ROLLBACK"};
+    if (lost()) {
+        return;
+    }
+    try {
+        if (!m_sent.empty()) {
+            try {
+                finish();
+            } catch (const StoreFailure&) { // It is undone all the same.
+            }
+        }
+        if (!lost() && m_pq->transactionStatus(m_connection.get()) != PQTRANS_IDLE) {
+            run(rollback);
+        }
+    } catch (...) {
+        m_connection.reset(); // Which undoes it, too.
+    }
+}
+
+Transaction::Transaction(Connection& connection) : m_connection(connection) {
+    m_connection.send(begin);
+}
+
+Transaction::~Transaction() {
+    if (m_open) {
+        m_connection.rollBack();
+    }
+}
+
+std::vector<Result> Transaction::finish() {
+    auto results = m_connection.finish();
+    if (!m_begun) {
+        results.erase(results.begin());
+        m_begun = true;
+    }
+    return results;
+}
+
+std::vector<Result> Transaction::commit() {
+    m_connection.send(store::postgres::commit);
+    auto results = finish();
+    results.pop_back();
+    m_open = false;
+    return results;
+}
+
+} // namespace store::postgres

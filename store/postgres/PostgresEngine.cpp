@@ -1,0 +1,447 @@
+// A store in the database of a PostgreSQL server; PostgresSchema.cpp has its tables.
+//
+// What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction: it locks
+// the ticket's row, fetches what it needs, writes, and commits. Where it needs nothing of what the
+// keys held, that is one round trip, else two.
+#include <ctime>
+#include <map>
+#include <utility>
+
+#include "store/Engines.h"
+#include "store/KeyBytes.h"
+#include "store/postgres/Postgres.h"
+#include "store/postgres/PostgresFiles.h"
+#include "store/postgres/PostgresListing.h"
+#include "store/postgres/PostgresSchema.h"
+
+namespace store {
+
+namespace {
+
+using postgres::ArrayReader;
+using postgres::Connection;
+using postgres::Result;
+using postgres::Statement;
+using postgres::Transaction;
+
+constexpr Statement idsOf = {
+    "SELECT ARRAY (SELECT id FROM tintgate.tickets WHERE type = $1 ORDER BY id)"};
+constexpr Statement isThere = {
+    "SELECT EXISTS (SELECT FROM tintgate.tickets WHERE type = $1 AND id = $2)"};
+
+// The row of the highest id is locked before a ticket is made. Whoever makes one takes them in this
+// order, so that nobody waits in a circle.
+constexpr Statement createTicket = {
+    "WITH raised AS (INSERT INTO tintgate.highest_ids AS highest (type, id) VALUES ($1, $2)"
+    " ON CONFLICT (type) DO UPDATE SET id = greatest(highest.id, excluded.id) RETURNING type)"
+    " INSERT INTO tintgate.tickets (type, id) SELECT type, $2 FROM raised ON CONFLICT DO NOTHING"};
+constexpr Statement raiseHighest = {
+    "INSERT INTO tintgate.highest_ids AS highest (type, id) VALUES ($1, $2)"
+    " ON CONFLICT (type) DO UPDATE SET id = greatest(highest.id, excluded.id)"
+    " RETURNING id"};
+constexpr Statement allHighest = {"SELECT type, id FROM tintgate.highest_ids WHERE id > 0"};
+constexpr Statement removeTicket = {"DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2"};
+
+// The value only if it is another one than the caller has: one that this change of that ticket
+// wrote.
+constexpr Statement oneKey = {
+    "SELECT number, change, CASE WHEN (number, change) <> ($4::bigint, $5::bigint) THEN value END"
+    " FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
+    " WHERE type = $1 AND id = $2 AND hash = sha256($3)"};
+constexpr Statement allKeys = {
+    "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number"
+    " WHERE type = $1 AND id = $2"};
+constexpr Statement someKeys = {
+    "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
+    " (hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact)) OR"
+    " EXISTS (SELECT FROM unnest($4::bytea[]) AS prefix"
+    " WHERE substring(name FOR length(prefix)) = prefix))"
+    " WHERE type = $1 AND id = $2"};
+/// Which transactions have come to their end. While this is the same, nobody has committed
+/// anything.
+constexpr Statement snapshot = {"SELECT pg_current_snapshot()::text"};
+
+constexpr Statement lockTicket = {
+    "UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = $1 AND id = $2"
+    " RETURNING number"};
+constexpr Statement neededKeys = {
+    "SELECT name, value FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
+    " WHERE type = $1 AND id = $2"
+    " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
+
+// What follows is sent before it is known whether there was a ticket to lock. It touches one only
+// if this very transaction has, so that it leaves alone one that somebody makes in between.
+constexpr Statement putOneKey = {
+    "INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, $3, $4, changes"
+    " FROM tintgate.tickets WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
+    " ON CONFLICT (ticket, hash) DO UPDATE SET value = excluded.value, change = excluded.change"};
+constexpr Statement putKeys = {
+    "INSERT INTO tintgate.keys (ticket, name, value, change)"
+    " SELECT number, name, value, changes FROM tintgate.tickets,"
+    " unnest($3::bytea[], $4::bytea[]) AS new (name, value) WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
+    " ON CONFLICT (ticket, hash) DO UPDATE SET value = excluded.value, change = excluded.change"};
+constexpr Statement deleteKeys = {
+    "DELETE FROM tintgate.keys USING tintgate.tickets"
+    " WHERE ticket = number AND type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
+    " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
+constexpr Statement emptyTicket = {"DELETE FROM tintgate.keys USING tintgate.tickets"
+                                   " WHERE ticket = number AND type = $1 AND id = $2"
+                                   " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"};
+
+constexpr Statement allUsers = {"SELECT name, hash, disabled FROM tintgate.users ORDER BY name"};
+constexpr Statement oneUser = {"SELECT name, hash, disabled FROM tintgate.users WHERE name = $1"};
+constexpr Statement putOneUser = {
+    "INSERT INTO tintgate.users (name, hash, disabled) VALUES ($1, $2, $3)"
+    " ON CONFLICT (name) DO UPDATE SET hash = excluded.hash, disabled = excluded.disabled"};
+constexpr Statement removeOneUser = {"DELETE FROM tintgate.users WHERE name = $1"};
+
+/// Held by the one who copies to the store. "TGAT" as a number.
+constexpr Statement lockCopy = {"SELECT pg_try_advisory_lock(1413955924)"};
+/// Until it is a store, nothing in it needs to be on the disk.
+constexpr Statement writeLater = {"SELECT set_config('synchronous_commit', 'off', false)"};
+constexpr Statement writeThrough = {"SELECT set_config('synchronous_commit', 'on', false)"};
+
+using Names = std::vector<std::string_view>;
+
+User userIn(const Result& rows, int row) {
+    return {rows.text(row, 0), rows.text(row, 1), rows.number(row, 2) != 0};
+}
+
+/// For ages. It is looked at for each read of a listing, of which the exact clock would be a third.
+struct CoarseClock {
+    using duration = std::chrono::nanoseconds;
+    using rep = duration::rep;
+    using period = duration::period;
+    using time_point = std::chrono::time_point<CoarseClock>;
+    static constexpr bool is_steady = true;
+
+    /// A tick of the system, by which it is late at most.
+    static constexpr std::chrono::milliseconds coarseness{10};
+
+    static time_point now() {
+        timespec now{};
+        clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
+        return time_point(std::chrono::seconds(now.tv_sec) + duration(now.tv_nsec));
+    }
+};
+
+class PostgresEngine : public StoreEngine {
+  public:
+    explicit PostgresEngine(Connection connection) : m_connection(std::move(connection)) {}
+
+    bool alive() override { return !m_connection.lost(); }
+
+    std::uint64_t commits(std::chrono::milliseconds age) override {
+        const auto now = CoarseClock::now();
+        const bool asks = now - m_asked > age - CoarseClock::coarseness;
+        if (m_snapshot.empty() || (asks && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
+            noteChange();
+        } else if (asks) {
+            m_asked = now;
+        }
+        return m_commits;
+    }
+
+    std::vector<int> ids(int type) override {
+        // Clients ask for their number, and then for the ids.
+        if (type == m_ids.type && m_connection.run(snapshot).bytes(0, 0) == m_ids.snapshot) {
+            return m_ids.ids;
+        }
+        // The snapshot first: what is committed between the two only has them fetched again.
+        m_connection.send(snapshot);
+        m_connection.send(idsOf, type);
+        const auto results = m_connection.finish();
+        std::vector<int> ids;
+        for (ArrayReader array(results[1].bytes(0, 0)); array.left() != 0;) {
+            ids.push_back(static_cast<int>(postgres::numberOf(array.next())));
+        }
+        m_ids = {type, results[0].text(0, 0), ids};
+        return ids;
+    }
+
+    bool exists(int type, int id) override {
+        return m_connection.run(isThere, type, id).number(0, 0) != 0;
+    }
+
+    bool create(int type, int id) override {
+        if (exists(type, id)) {
+            return false; // Without waiting for others.
+        }
+        noteChange();
+        return m_connection.run(createTicket, type, id).changed() != 0;
+    }
+
+    int createNext(int type) override {
+        noteChange();
+        Transaction transaction(m_connection);
+        m_connection.send(raiseHighest, type, 0);
+        const auto results = transaction.finish();
+        int id = static_cast<int>(results[0].number(0, 0)) + 1;
+        if (id > highestTicketId) {
+            id = lowestFree(ids(type));
+        }
+        if (id > highestTicketId) {
+            return -1;
+        }
+        m_connection.send(createTicket, type, id);
+        return transaction.commit()[0].changed() != 0 ? id : -1;
+    }
+
+    bool remove(int type, int id) override {
+        noteChange();
+        return m_connection.run(removeTicket, type, id).changed() != 0;
+    }
+
+    std::shared_ptr<const Elements> key(int type, int id, std::string_view name) override {
+        const bool again = type == m_last.type && id == m_last.id && name == m_last.name;
+        const Result row =
+            m_connection.run(oneKey, type, id, name, std::int64_t{again ? m_last.ticket : 0},
+                             std::int64_t{again ? m_last.change : 0});
+        if (row.rows() == 0) {
+            m_last = {};
+            return nullptr;
+        }
+        if (!row.isNull(0, 2)) {
+            m_last = {};
+            auto elements = decoded(row.bytes(0, 2));
+            m_last = {type, id, std::string(name), row.number(0, 0), row.number(0, 1), elements};
+        }
+        return m_last.elements;
+    }
+
+    std::shared_ptr<const TicketContent> content(int type, int id,
+                                                 const KeyFilter& filter) override {
+        const Names exact(filter.exact().begin(), filter.exact().end());
+        const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
+        const Result rows = filter.all() ? m_connection.run(allKeys, type, id)
+                                         : m_connection.run(someKeys, type, id, exact, prefixes);
+        return rows.rows() == 0 ? nullptr : std::make_shared<TicketContent>(contentOf(rows));
+    }
+
+    void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
+                   const ShowKey& show) override {
+        // The snapshot first: what is committed between the two only has it all fetched again.
+        m_asked = CoarseClock::now();
+        m_connection.send(snapshot);
+        postgres::askForKeys(m_connection, type, names, largestBytes);
+        const auto results = m_connection.finish();
+        postgres::showKeys(results[1], names, show);
+        m_snapshot = results[0].text(0, 0);
+    }
+
+    bool change(int type, int id, const Scope& scope,
+                const std::function<void(TicketContent&)>& work) override {
+        noteChange();
+        Transaction transaction(m_connection);
+        m_connection.send(lockTicket, type, id);
+        TicketContent content;
+        Names needed;
+        for (const auto& [name, isNeeded] : scope.keys) {
+            if (isNeeded && !scope.everything) {
+                needed.push_back(name);
+            }
+        }
+        if (!needed.empty()) {
+            m_connection.send(neededKeys, type, id, needed);
+            const auto results = transaction.finish();
+            if (results[0].rows() == 0) {
+                return false;
+            }
+            content = contentOf(results[1]);
+        }
+        const TicketContent before = content; // Shares the elements: a change makes others.
+        work(content);
+        const bool writes = write(type, id, scope, before, content);
+        if (!needed.empty()) {
+            if (writes) {
+                transaction.commit();
+            }
+            return true;
+        }
+        const auto locked = writes ? transaction.commit() : transaction.finish();
+        return locked[0].rows() != 0;
+    }
+
+    std::vector<User> users() override {
+        const Result rows = m_connection.run(allUsers);
+        std::vector<User> users;
+        for (int row = 0; row < rows.rows(); ++row) {
+            users.push_back(userIn(rows, row));
+        }
+        return users;
+    }
+
+    std::optional<User> user(std::string_view name) override {
+        const Result rows = m_connection.run(oneUser, name);
+        return rows.rows() == 0 ? std::nullopt : std::optional(userIn(rows, 0));
+    }
+
+    void putUser(const User& user) override {
+        noteChange();
+        m_connection.run(putOneUser, user.name, user.passwordHash, user.disabled);
+    }
+
+    bool removeUser(std::string_view name) override {
+        noteChange();
+        return m_connection.run(removeOneUser, name).changed() != 0;
+    }
+
+    void putFile(std::string_view path, std::istream& from) override {
+        noteChange();
+        m_files.put(path, from);
+    }
+    void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
+    std::vector<FileEntry> files() override { return m_files.list(); }
+    std::vector<FileVersion> versions(std::string_view path) override {
+        return m_files.versions(path);
+    }
+    void getVersion(std::string_view path, int number, std::ostream& to) override {
+        m_files.getVersion(path, number, to);
+    }
+    void restoreVersion(std::string_view path, int number) override {
+        noteChange();
+        m_files.restoreVersion(path, number);
+    }
+    int pruneVersions(std::string_view path, int keepNewest) override {
+        noteChange();
+        return m_files.pruneVersions(path, keepNewest);
+    }
+    int removeLeftovers() override { return 0; } // The server undoes what is cut off.
+
+    std::map<int, int> highestIds() override {
+        const Result rows = m_connection.run(allHighest);
+        std::map<int, int> ids;
+        for (int row = 0; row < rows.rows(); ++row) {
+            ids.emplace(rows.number(row, 0), rows.number(row, 1));
+        }
+        return ids;
+    }
+    void raiseHighestId(int type, int id) override { m_connection.run(raiseHighest, type, id); }
+    void placeVersion(std::string_view path, const FileVersion& version,
+                      std::istream& from) override {
+        m_files.placeVersion(path, version, from);
+    }
+    void finishCopy() override {
+        m_connection.run(writeThrough); // What it waits for has all before it in front.
+        postgres::finishCopy(m_connection);
+    }
+
+  private:
+    /// The key that was fetched last.
+    struct Fetched {
+        int type = -1;
+        int id = -1;
+        std::string name;
+        std::int64_t ticket = 0;
+        std::int64_t change = 0;
+        std::shared_ptr<const Elements> elements;
+    };
+
+    /// The ids that were asked for last.
+    struct Ids {
+        int type = -1;
+        std::string snapshot; ///< Of when they were fetched, or before.
+        std::vector<int> ids;
+    };
+
+    void noteChange() {
+        m_snapshot.clear();
+        ++m_commits;
+    }
+
+    /// Of rows of name and value. A ticket without keys may have one of nulls.
+    static TicketContent contentOf(const Result& rows) {
+        TicketContent content;
+        for (int row = 0; row < rows.rows(); ++row) {
+            if (!rows.isNull(row, 0)) {
+                content.put(rows.text(row, 0), decoded(rows.bytes(row, 1)));
+            }
+        }
+        return content;
+    }
+
+    /// Sends what makes the ticket's keys those of after. False when there is nothing to write.
+    bool write(int type, int id, const Scope& scope, const TicketContent& before,
+               const TicketContent& after) {
+        Names put;
+        Names deleted;
+        std::vector<std::string> bytes;
+        const auto putKey = [&](const std::string& name, const Elements& elements) {
+            put.push_back(name);
+            bytes.push_back(keyBytes(elements));
+        };
+        if (scope.everything) {
+            m_connection.send(emptyTicket, type, id);
+            for (const auto& [name, elements] : after.keys()) {
+                putKey(name, *elements);
+            }
+        } else {
+            for (const auto& [name, needed] : scope.keys) {
+                const auto elements = after.find(name);
+                if (needed && elements == before.find(name)) {
+                    continue;
+                }
+                if (elements != nullptr) {
+                    putKey(name, *elements);
+                } else {
+                    deleted.push_back(name);
+                }
+            }
+        }
+        if (!deleted.empty()) {
+            m_connection.send(deleteKeys, type, id, deleted);
+        }
+        if (put.size() == 1) { // Mostly: a list of the server's costs more than what is in it.
+            m_connection.send(putOneKey, type, id, put[0], bytes[0]);
+        } else if (!put.empty()) {
+            m_connection.send(putKeys, type, id, put, Names(bytes.begin(), bytes.end()));
+        }
+        return scope.everything || !deleted.empty() || !put.empty();
+    }
+
+    Connection m_connection;
+    postgres::Files m_files{m_connection};
+    Fetched m_last;
+    std::uint64_t m_commits = 0;
+    std::string m_snapshot; ///< Of the last keysOfAll; empty once somebody has committed since.
+    CoarseClock::time_point m_asked; ///< When that was still the server's.
+    Ids m_ids;
+};
+
+std::unique_ptr<StoreEngine> openPostgres(const std::string& service) {
+    Connection connection(service);
+    postgres::checkSchema(connection);
+    return std::make_unique<PostgresEngine>(std::move(connection));
+}
+
+void makePostgres(const std::string& service, const std::string& serverName) {
+    Connection connection(service);
+    postgres::makeSchema(connection, &serverName);
+}
+
+std::unique_ptr<StoreEngine> openPostgresCopy(const std::string& service) {
+    Connection connection(service);
+    if (!postgres::isUnfinishedCopy(connection)) {
+        postgres::makeSchema(connection, nullptr);
+    }
+    if (connection.run(lockCopy).number(0, 0) == 0) {
+        throw StoreFailure(Fault::Busy, "somebody else is copying to this store");
+    }
+    connection.run(writeLater);
+    return std::make_unique<PostgresEngine>(std::move(connection));
+}
+
+bool upgradePostgres(const std::string& service) {
+    Connection connection(service);
+    return postgres::upgradeSchema(connection);
+}
+
+} // namespace
+
+constinit const EngineKind postgresKind = {openPostgres, makePostgres, openPostgresCopy,
+                                           upgradePostgres};
+
+} // namespace store

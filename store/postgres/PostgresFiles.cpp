@@ -1,0 +1,292 @@
+#include "store/postgres/PostgresFiles.h"
+
+#include <algorithm>
+#include <istream>
+#include <ostream>
+
+#include "store/ServerPath.h"
+
+namespace store::postgres {
+
+namespace {
+
+/// Of a content in one row: as little as fits a client's memory, as much as makes round trips rare.
+constexpr std::size_t pieceSize = 1 << 18;
+/// Pieces on their way at once.
+constexpr int piecesAhead = 8;
+
+constexpr Statement addContent = {"INSERT INTO tintgate.contents DEFAULT VALUES RETURNING number"};
+constexpr Statement addPiece = {
+    "INSERT INTO tintgate.pieces (content, position, bytes) VALUES ($1, $2, $3)"};
+constexpr Statement setSize = {"UPDATE tintgate.contents SET size = $2 WHERE number = $1"};
+constexpr Statement addFolders = {
+    "INSERT INTO tintgate.files (path) SELECT unnest($1::bytea[]) ON CONFLICT DO NOTHING"};
+constexpr Statement isFileAmong = {
+    "SELECT EXISTS (SELECT FROM tintgate.files WHERE path = ANY ($1::bytea[])"
+    " AND content IS NOT NULL)"};
+
+#define TINTGATE_NOW "extract(epoch FROM clock_timestamp())::bigint"
+
+/// Locks the file, and gives what content is there: the new one where there was nothing, null for a
+/// folder. That nothing changes in a row which is there is intended: it is how it is locked.
+constexpr Statement claimFile = {
+    "INSERT INTO tintgate.files AS file (path, content, written)"
+    " VALUES ($1, $2, " TINTGATE_NOW ")"
+    " ON CONFLICT (path) DO UPDATE SET path = excluded.path RETURNING file.content"};
+constexpr Statement keepVersion = {
+    "INSERT INTO tintgate.versions (path, number, content, written)"
+    " SELECT path, (SELECT coalesce(max(number), 0) + 1 FROM tintgate.versions WHERE path = $1),"
+    " content, written FROM tintgate.files WHERE path = $1"};
+constexpr Statement exchange = {"UPDATE tintgate.files SET content = $2, written = " TINTGATE_NOW
+                                " WHERE path = $1"};
+constexpr Statement exchangeAsOf = {
+    "UPDATE tintgate.files SET content = $2, written = $3 WHERE path = $1"};
+constexpr Statement lockFile = {"SELECT content FROM tintgate.files WHERE path = $1 FOR UPDATE"};
+
+// Number, size and first piece: most files have no other.
+constexpr Statement current = {
+    "SELECT files.content, size, bytes FROM tintgate.files"
+    " LEFT JOIN tintgate.contents ON contents.number = files.content"
+    " LEFT JOIN tintgate.pieces ON pieces.content = files.content AND position = 0"
+    " WHERE path = $1"};
+constexpr Statement version = {
+    "SELECT versions.content, size, bytes FROM tintgate.versions"
+    " JOIN tintgate.contents ON contents.number = versions.content"
+    " LEFT JOIN tintgate.pieces ON pieces.content = versions.content AND position = 0"
+    " WHERE path = $1 AND versions.number = $2"};
+constexpr Statement piece = {
+    "SELECT bytes FROM tintgate.pieces WHERE content = $1 AND position = $2"};
+constexpr Statement allFiles = {
+    "SELECT path, size, written FROM tintgate.files"
+    " JOIN tintgate.contents ON contents.number = content ORDER BY path"};
+constexpr Statement allVersions = {
+    "SELECT versions.number, size, written FROM tintgate.versions"
+    " JOIN tintgate.contents ON contents.number = content WHERE path = $1"
+    " ORDER BY versions.number"};
+constexpr Statement putVersion = {
+    "INSERT INTO tintgate.versions (path, number, content, written) VALUES ($1, $2, $3, $4)"
+    " ON CONFLICT (path, number) DO UPDATE SET content = excluded.content,"
+    " written = excluded.written"};
+constexpr Statement dropVersions = {
+    "DELETE FROM tintgate.versions WHERE path = $1 AND number NOT IN"
+    " (SELECT number FROM tintgate.versions WHERE path = $1 ORDER BY number DESC LIMIT $2)"
+    " RETURNING content"};
+constexpr Statement dropContent = {
+    "DELETE FROM tintgate.contents WHERE number = $1"
+    " AND NOT EXISTS (SELECT FROM tintgate.files WHERE content = $1)"
+    " AND NOT EXISTS (SELECT FROM tintgate.versions WHERE content = $1)"};
+constexpr Statement contentsOf = {
+    "SELECT content FROM tintgate.versions WHERE path = $1 AND number = $2"};
+
+/// A path as the database has it, and the folders above it, the highest first.
+struct Place {
+    explicit Place(std::string_view given) {
+        const auto parts = partsOfServerPath(given);
+        for (std::size_t count = 1; count < parts.size(); ++count) {
+            folders.push_back(joinedParts(parts, count));
+        }
+        path = joinedParts(parts, parts.size());
+        for (const auto& folder : folders) {
+            folderViews.push_back(folder);
+        }
+    }
+    Place(const Place&) = delete;
+
+    std::string what() const { return shownServerPath(path); }
+
+    [[noreturn]] void refuse() const {
+        throw StoreFailure(Fault::BadPath, what() + " is no file, or leads through one");
+    }
+
+    std::string path;
+    std::vector<std::string> folders;
+    std::vector<std::string_view> folderViews;
+};
+
+std::size_t readPiece(std::istream& from, std::string& bytes, const Place& place) {
+    bytes.resize(pieceSize);
+    from.read(bytes.data(), static_cast<std::streamsize>(bytes.size()));
+    if (from.bad()) {
+        throw StoreFailure(Fault::Other, place.what() + ": the source can't be read");
+    }
+    bytes.resize(static_cast<std::size_t>(from.gcount()));
+    return bytes.size();
+}
+
+/// Stores a stream as a content, and gives its number. Within a transaction.
+std::int64_t storeContent(Connection& connection, Transaction& transaction, const Place& place,
+                          std::istream& from) {
+    std::string bytes;
+    readPiece(from, bytes, place); // Whoever writes the stream may take long to begin.
+    connection.send(addContent);
+    const std::int64_t content = transaction.finish()[0].number(0, 0);
+    std::int64_t size = 0;
+    for (int position = 0; !bytes.empty(); ++position) {
+        connection.send(addPiece, content, position, bytes);
+        size += static_cast<std::int64_t>(bytes.size());
+        if (position % piecesAhead == piecesAhead - 1) {
+            transaction.finish();
+        }
+        readPiece(from, bytes, place);
+    }
+    connection.send(setSize, content, size);
+    return content;
+}
+
+/// Makes the folders above a file and locks the file. What content is there; the given one where
+/// there was nothing.
+std::int64_t claim(Connection& connection, Transaction& transaction, const Place& place,
+                   std::int64_t content) {
+    connection.send(addFolders, place.folderViews);
+    connection.send(isFileAmong, place.folderViews);
+    connection.send(claimFile, place.path, content);
+    const auto results = transaction.finish();
+    const Result& there = results.back();
+    if (results[results.size() - 2].number(0, 0) != 0 || there.isNull(0, 0)) {
+        place.refuse();
+    }
+    return there.number(0, 0);
+}
+
+/// Puts a content in place, and what was there among the versions.
+void exchangeFile(Connection& connection, Transaction& transaction, const Place& place,
+                  std::int64_t content) {
+    if (claim(connection, transaction, place, content) != content) {
+        connection.send(keepVersion, place.path);
+        connection.send(exchange, place.path, content);
+    }
+    transaction.commit();
+}
+
+/// Why there is nothing at a path.
+[[noreturn]] void failMissing(Connection& connection, const Place& place) {
+    if (connection.run(isFileAmong, place.folderViews).number(0, 0) != 0) {
+        place.refuse();
+    }
+    throw StoreFailure(Fault::NoFile, place.what() + ": there is no such file");
+}
+
+/// Copies the content that one of the statements above finds; false where it finds none. A content
+/// never changes, so that all of it is of one moment.
+template<class... Each>
+bool copyOut(Connection& connection, const Place& place, std::ostream& to, const Statement& find,
+             const Each&... each) {
+    const Result found = connection.run(find, each...);
+    if (found.rows() == 0) {
+        return false;
+    }
+    if (found.isNull(0, 0)) {
+        place.refuse();
+    }
+    const auto write = [&](std::string_view bytes) {
+        if (!to.write(bytes.data(), static_cast<std::streamsize>(bytes.size()))) {
+            throw StoreFailure(Fault::Full, place.what() + ": the copy can't be written");
+        }
+        return static_cast<std::int64_t>(bytes.size());
+    };
+    const std::int64_t content = found.number(0, 0);
+    std::int64_t left = found.number(0, 1) - write(found.bytes(0, 2));
+    for (int position = 1; left > 0; ++position) {
+        const Result next = connection.run(piece, content, position);
+        if (next.rows() == 0) {
+            throw StoreFailure(Fault::NoFile, place.what() + " was pruned while it was read");
+        }
+        left -= write(next.bytes(0, 0));
+    }
+    return true;
+}
+
+} // namespace
+
+void Files::put(std::string_view path, std::istream& from) {
+    const Place place(path);
+    Transaction transaction(m_connection);
+    const std::int64_t content = storeContent(m_connection, transaction, place, from);
+    exchangeFile(m_connection, transaction, place, content);
+}
+
+void Files::get(std::string_view path, std::ostream& to) {
+    const Place place(path);
+    if (!copyOut(m_connection, place, to, current, place.path)) {
+        failMissing(m_connection, place);
+    }
+}
+
+std::vector<FileEntry> Files::list() {
+    const Result rows = m_connection.run(allFiles);
+    std::vector<FileEntry> entries;
+    for (int row = 0; row < rows.rows(); ++row) {
+        entries.push_back({rows.text(row, 0), static_cast<std::uint64_t>(rows.number(row, 1)),
+                           rows.number(row, 2)});
+    }
+    return entries;
+}
+
+std::vector<FileVersion> Files::versions(std::string_view path) {
+    const Place place(path);
+    const Result rows = m_connection.run(allVersions, place.path);
+    std::vector<FileVersion> list;
+    for (int row = 0; row < rows.rows(); ++row) {
+        list.push_back({static_cast<int>(rows.number(row, 0)),
+                        static_cast<std::uint64_t>(rows.number(row, 1)), rows.number(row, 2)});
+    }
+    return list;
+}
+
+void Files::getVersion(std::string_view path, int number, std::ostream& to) {
+    const Place place(path);
+    if (!copyOut(m_connection, place, to, version, place.path, number)) {
+        throw StoreFailure(Fault::NoFile,
+                           place.what() + " has no version " + std::to_string(number));
+    }
+}
+
+void Files::restoreVersion(std::string_view path, int number) {
+    const Place place(path);
+    Transaction transaction(m_connection);
+    // Locked first, so that the version is not pruned meanwhile.
+    m_connection.send(lockFile, place.path);
+    m_connection.send(contentsOf, place.path, number);
+    const auto results = transaction.finish();
+    if (results[1].rows() == 0) {
+        throw StoreFailure(Fault::NoFile,
+                           place.what() + " has no version " + std::to_string(number));
+    }
+    exchangeFile(m_connection, transaction, place, results[1].number(0, 0));
+}
+
+int Files::pruneVersions(std::string_view path, int keepNewest) {
+    const Place place(path);
+    Transaction transaction(m_connection);
+    m_connection.send(lockFile, place.path);
+    m_connection.send(dropVersions, place.path, std::int64_t{std::max(keepNewest, 0)});
+    const auto results = transaction.finish();
+    const Result& dropped = results[1];
+    for (int row = 0; row < dropped.rows(); ++row) {
+        m_connection.send(dropContent, dropped.number(row, 0));
+    }
+    transaction.commit();
+    return dropped.rows();
+}
+
+void Files::placeVersion(std::string_view path, const FileVersion& version, std::istream& from) {
+    const Place place(path);
+    Transaction transaction(m_connection);
+    const std::int64_t content = storeContent(m_connection, transaction, place, from);
+    const std::int64_t there = claim(m_connection, transaction, place, content);
+    std::int64_t replaced = there;
+    if (version.number != 0) {
+        m_connection.send(contentsOf, place.path, version.number);
+        const auto results = transaction.finish();
+        replaced = results[0].rows() == 0 ? content : results[0].number(0, 0);
+        m_connection.send(putVersion, place.path, version.number, content, version.time);
+    } else {
+        m_connection.send(exchangeAsOf, place.path, content, version.time);
+    }
+    if (replaced != content) {
+        m_connection.send(dropContent, replaced);
+    }
+    transaction.commit();
+}
+
+} // namespace store::postgres

@@ -1,0 +1,29 @@
+// The files of a store in a PostgreSQL database, which are there for every machine that reaches the
+// server. A delivery is one transaction, so that nothing is ever left of one that was cut off.
+#pragma once
+
+#include <string_view>
+
+#include "store/postgres/Postgres.h"
+
+namespace store::postgres {
+
+/// See StoreEngine for each of these. The connection outlives it.
+class Files {
+  public:
+    explicit Files(Connection& connection) : m_connection(connection) {}
+
+    void put(std::string_view path, std::istream& from);
+    void get(std::string_view path, std::ostream& to);
+    std::vector<FileEntry> list();
+    std::vector<FileVersion> versions(std::string_view path);
+    void getVersion(std::string_view path, int number, std::ostream& to);
+    void restoreVersion(std::string_view path, int number);
+    int pruneVersions(std::string_view path, int keepNewest);
+    void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
+
+  private:
+    Connection& m_connection;
+};
+
+} // namespace store::postgres

@@ -1,0 +1,141 @@
+#include "store/postgres/PostgresListing.h"
+
+#include <algorithm>
+#include <array>
+#include <climits>
+#include <cstdint>
+#include <cstring>
+#include <memory>
+#include <numeric>
+#include <string_view>
+#include <utility>
+
+#include <endian.h>
+
+#include "store/Engines.h"
+
+namespace store::postgres {
+
+namespace {
+
+// The keys of a listing hold few different values: a row for each name and value, with the numbers
+// of all tickets that have it, costs less than a row for each key. They are packed, since an array
+// costs more. Which tickets are of the type is a row of its own, with nulls in front: to bring the
+// two together here costs a tenth of a join there. It is one statement, so that it is all of one
+// moment. Where most keys are passed over, the name, at the start of a row, is found sooner than
+// the hash behind it.
+constexpr Statement keysOfType = {
+    "SELECT name, value, string_agg(int8send(ticket), ''), NULL FROM (SELECT name, ticket,"
+    " CASE WHEN length(value) <= $3 THEN value END AS value"
+    " FROM tintgate.keys WHERE name = ANY ($2::bytea[])) AS found GROUP BY name, value"
+    " UNION ALL SELECT NULL, NULL,"
+    " string_agg(int8send(number), ''), string_agg(int4send(id), '')"
+    " FROM tintgate.tickets WHERE type = $1"};
+enum Column { nameColumn, valueColumn, numbersColumn, idsColumn };
+
+/// The first of numbers that are packed one behind the other, which it takes off them.
+std::int64_t takeBigint(std::string_view& packed) {
+    std::uint64_t bytes = 0;
+    std::memcpy(&bytes, packed.data(), sizeof bytes);
+    packed.remove_prefix(sizeof bytes);
+    return static_cast<std::int64_t>(be64toh(bytes));
+}
+int takeInt(std::string_view& packed) {
+    std::uint32_t bytes = 0;
+    std::memcpy(&bytes, packed.data(), sizeof bytes);
+    packed.remove_prefix(sizeof bytes);
+    return static_cast<int>(be32toh(bytes));
+}
+
+/// Id and number.
+using Ticket = std::pair<int, std::int64_t>;
+
+/// By id.
+std::vector<Ticket> ticketsIn(const Result& rows, int row) {
+    std::string_view ids = rows.bytes(row, idsColumn);
+    std::string_view numbers = rows.bytes(row, numbersColumn);
+    std::vector<Ticket> tickets;
+    while (!ids.empty()) {
+        const int id = takeInt(ids);
+        tickets.emplace_back(id, takeBigint(numbers));
+    }
+    std::sort(tickets.begin(), tickets.end());
+    return tickets;
+}
+
+/// A key of some ticket.
+struct Key {
+    std::int64_t ticket; ///< Its number.
+    std::size_t row;     ///< That tells name and value.
+};
+
+/// Digit by digit: the numbers of a store's tickets are so close together that few digits do.
+void sortByTicket(std::vector<Key>& keys) {
+    constexpr int digitBits = 11;
+    constexpr int digits = 1 << digitBits;
+    std::int64_t highest = 0;
+    for (const Key& key : keys) {
+        highest = std::max(highest, key.ticket);
+    }
+    std::vector<Key> sorted(keys.size());
+    for (int shift = 0; shift < 63 && highest >> shift != 0; shift += digitBits) {
+        const auto digit = [shift](const Key& key) {
+            return static_cast<std::size_t>(key.ticket >> shift & (digits - 1));
+        };
+        std::array<std::size_t, digits + 1> starts{};
+        for (const Key& key : keys) {
+            ++starts[digit(key) + 1];
+        }
+        std::partial_sum(starts.begin(), starts.end(), starts.begin());
+        for (const Key& key : keys) {
+            sorted[starts[digit(key)]++] = key;
+        }
+        keys.swap(sorted);
+    }
+}
+
+} // namespace
+
+void askForKeys(Connection& connection, int type, const std::vector<std::string>& names,
+                std::size_t largestBytes) {
+    connection.send(keysOfType, type, std::vector<std::string_view>(names.begin(), names.end()),
+                    static_cast<int>(std::min<std::size_t>(largestBytes, INT_MAX)));
+}
+
+void showKeys(const Result& rows, const std::vector<std::string>& names,
+              const StoreEngine::ShowKey& show) {
+    const auto rowCount = static_cast<std::size_t>(rows.rows());
+    std::vector<std::size_t> nameOf(rowCount);
+    std::vector<std::shared_ptr<const Elements>> elementsOf(rowCount);
+    std::vector<Ticket> tickets;
+    std::vector<Key> keys;
+    for (std::size_t i = 0; i < rowCount; ++i) {
+        const int row = static_cast<int>(i);
+        if (rows.isNull(row, nameColumn)) {
+            tickets = ticketsIn(rows, row);
+            continue;
+        }
+        const auto name = std::find(names.begin(), names.end(), rows.bytes(row, nameColumn));
+        nameOf[i] = static_cast<std::size_t>(name - names.begin());
+        if (!rows.isNull(row, valueColumn)) {
+            elementsOf[i] = decoded(rows.bytes(row, valueColumn));
+        }
+        for (std::string_view numbers = rows.bytes(row, numbersColumn); !numbers.empty();) {
+            keys.push_back({takeBigint(numbers), i});
+        }
+    }
+    sortByTicket(keys);
+    auto key = keys.begin();
+    for (const auto& [id, number] : tickets) {
+        if (key == keys.end() || key->ticket != number) { // Ids mostly go the way of the numbers.
+            key = std::lower_bound(
+                keys.begin(), keys.end(), number,
+                [](const Key& key, std::int64_t number) { return key.ticket < number; });
+        }
+        for (; key != keys.end() && key->ticket == number; ++key) {
+            show(id, nameOf[key->row], elementsOf[key->row]);
+        }
+    }
+}
+
+} // namespace store::postgres

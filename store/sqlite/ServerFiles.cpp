@@ -1,0 +1,553 @@
+#include "store/sqlite/ServerFiles.h"
+
+#include <algorithm>
+#include <cerrno>
+#include <charconv>
+#include <chrono>
+#include <cstring>
+#include <functional>
+#include <istream>
+#include <memory>
+#include <ostream>
+#include <thread>
+#include <utility>
+
+#include <dirent.h>
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+#include <unistd.h>
+
+#include "store/ServerPath.h"
+
+namespace store {
+
+namespace {
+
+constexpr std::string_view deliveryPrefix = ".tintgate-new-";
+constexpr const char* versionsFolder = ".tintgate-versions";
+constexpr std::size_t blockSize = 1 << 16;
+
+[[noreturn]] void fail(int error, const std::string& what) {
+    const std::string text = what + ": " + std::strerror(error);
+    switch (error) {
+    case ENOENT:
+        throw StoreFailure(Fault::NoFile, text);
+    case ELOOP:
+    case ENOTDIR:
+    case EISDIR:
+    case ENAMETOOLONG:
+    case ENXIO:
+        throw StoreFailure(Fault::BadPath, text);
+    case EACCES:
+    case EPERM:
+    case EROFS:
+        throw StoreFailure(Fault::ReadOnly, text);
+    case ENOSPC:
+    case EDQUOT:
+    case EFBIG:
+        throw StoreFailure(Fault::Full, text);
+    case ENOMEM:
+        throw std::bad_alloc();
+    default:
+        throw StoreFailure(Fault::Other, text);
+    }
+}
+
+/// The folders and the name that a server path consists of.
+class Place {
+  public:
+    explicit Place(std::string_view path) : m_parts(partsOfServerPath(path)) {}
+
+    std::vector<std::string> folders() const { return {m_parts.begin(), m_parts.end() - 1}; }
+    const std::string& name() const { return m_parts.back(); }
+
+    /// The folders of the place's versions, below the files folder.
+    std::vector<std::string> versions() const {
+        std::vector<std::string> folders{versionsFolder};
+        folders.insert(folders.end(), m_parts.begin(), m_parts.end());
+        return folders;
+    }
+
+    std::string text() const { return shownServerPath(joinedParts(m_parts, m_parts.size())); }
+
+  private:
+    std::vector<std::string> m_parts;
+};
+
+Descriptor openFolder(int parent, const char* name) {
+    return Descriptor(openat(parent, name, O_RDONLY | O_DIRECTORY | O_NOFOLLOW | O_CLOEXEC));
+}
+
+void flush(const Descriptor& file, const std::string& what) {
+    if (fsync(file.get()) != 0) {
+        fail(errno, what);
+    }
+}
+
+/// Walks down from a folder. With make, folders that are missing are made, and are on the disk when
+/// this returns.
+Descriptor walk(const Descriptor& from, const std::vector<std::string>& folders, bool make,
+                const std::string& what) {
+    Descriptor folder = openFolder(from.get(), ".");
+    for (const auto& name : folders) {
+        Descriptor next = openFolder(folder.get(), name.c_str());
+        if (!next.valid() && errno == ENOENT && make) {
+            if (mkdirat(folder.get(), name.c_str(), 0770) == 0) {
+                flush(folder, what);
+            } else if (errno != EEXIST) {
+                fail(errno, what);
+            }
+            next = openFolder(folder.get(), name.c_str());
+        }
+        if (!next.valid()) {
+            fail(errno, what);
+        }
+        folder = std::move(next);
+    }
+    return folder;
+}
+
+bool isMissing(const StoreFailure& failure) {
+    return failure.fault == Fault::NoFile;
+}
+
+/// Names in a folder, in byte order.
+std::vector<std::string> namesIn(const Descriptor& folder) {
+    Descriptor own = openFolder(folder.get(), ".");
+    const std::unique_ptr<DIR, int (*)(DIR*)> stream(own.valid() ? fdopendir(own.get()) : nullptr,
+                                                     closedir);
+    if (stream == nullptr) {
+        fail(errno, "a folder of the store");
+    }
+    own.release();
+    std::vector<std::string> names;
+    while (const dirent* const entry = readdir(stream.get())) {
+        const std::string_view name = entry->d_name;
+        if (name != "." && name != "..") {
+            names.emplace_back(name);
+        }
+    }
+    std::sort(names.begin(), names.end());
+    return names;
+}
+
+struct stat statusOf(int file, const std::string& what) {
+    struct stat status;
+    if (fstat(file, &status) != 0) {
+        fail(errno, what);
+    }
+    return status;
+}
+
+/// A regular file, open for reading. O_NONBLOCK, since opening a pipe would wait for its writer.
+Descriptor openFile(const Descriptor& folder, const std::string& name, const std::string& what) {
+    Descriptor file(
+        openat(folder.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    if (!file.valid()) {
+        fail(errno, what);
+    }
+    if (!S_ISREG(statusOf(file.get(), what).st_mode)) {
+        throw StoreFailure(Fault::BadPath, what + " is no file");
+    }
+    return file;
+}
+
+/// Reads up to size bytes; fewer at the end of the file only.
+std::size_t readBlock(const Descriptor& file, char* block, std::size_t size,
+                      const std::string& what) {
+    std::size_t filled = 0;
+    while (filled < size) {
+        const ssize_t count = read(file.get(), block + filled, size - filled);
+        if (count < 0 && errno != EINTR) {
+            fail(errno, what);
+        }
+        if (count == 0) {
+            break;
+        }
+        filled += count > 0 ? static_cast<std::size_t>(count) : 0;
+    }
+    return filled;
+}
+
+void writeAll(const Descriptor& file, const char* bytes, std::size_t size,
+              const std::string& what) {
+    while (size > 0) {
+        const ssize_t count = write(file.get(), bytes, size);
+        if (count < 0) {
+            if (errno == EINTR) {
+                continue;
+            }
+            fail(errno, what);
+        }
+        bytes += count;
+        size -= static_cast<std::size_t>(count);
+    }
+}
+
+void copyOut(const Descriptor& file, std::ostream& to, const std::string& what) {
+    std::vector<char> block(blockSize);
+    std::size_t count = blockSize;
+    while (count == blockSize) {
+        count = readBlock(file, block.data(), block.size(), what);
+        if (!to.write(block.data(), static_cast<std::streamsize>(count))) {
+            throw StoreFailure(Fault::Full, what + ": the copy can't be written");
+        }
+    }
+}
+
+/// Takes the next bytes; 0 at the end.
+using Source = std::function<std::size_t(char* block, std::size_t size)>;
+
+Source sourceOf(std::istream& from, const Place& place) {
+    return [&from, &place](char* block, std::size_t size) {
+        from.read(block, static_cast<std::streamsize>(size));
+        if (from.bad()) {
+            throw StoreFailure(Fault::Other, place.text() + ": the source can't be read");
+        }
+        return static_cast<std::size_t>(from.gcount());
+    };
+}
+
+/// A file that is being written under a name of its own; gone again unless it is put in place. It
+/// holds a lock on itself, which tells it from what an interrupted delivery left.
+class Delivery {
+  public:
+    /// Unless later, all of it is on the disk when it is in place.
+    Delivery(const Descriptor& folder, std::string what, bool later = false)
+        : m_folder(folder), m_what(std::move(what)), m_later(later) {
+        static int counter = 0;
+        do {
+            m_name = std::string(deliveryPrefix) + std::to_string(getpid()) + "-" +
+                     std::to_string(counter++);
+            m_file = Descriptor(openat(folder.get(), m_name.c_str(),
+                                       O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0660));
+        } while (!m_file.valid() && errno == EEXIST);
+        if (!m_file.valid()) {
+            fail(errno, m_what);
+        }
+        flock(m_file.get(), LOCK_EX | LOCK_NB);
+    }
+
+    ~Delivery() {
+        if (!m_name.empty()) {
+            unlinkat(m_folder.get(), m_name.c_str(), 0);
+        }
+    }
+
+    void fill(const Source& source) {
+        std::vector<char> block(blockSize);
+        while (const std::size_t count = source(block.data(), block.size())) {
+            writeAll(m_file, block.data(), count, m_what);
+        }
+        if (!m_later) {
+            flush(m_file, m_what);
+        }
+    }
+
+    void setTime(std::int64_t seconds) {
+        const timespec times[2] = {{0, UTIME_OMIT}, {static_cast<time_t>(seconds), 0}};
+        if (futimens(m_file.get(), times) != 0) {
+            fail(errno, m_what);
+        }
+    }
+
+    void putInPlace(const std::string& name) {
+        if (renameat(m_folder.get(), m_name.c_str(), m_folder.get(), name.c_str()) != 0) {
+            fail(errno, m_what);
+        }
+        m_name.clear();
+        if (!m_later) {
+            flush(m_folder, m_what);
+        }
+    }
+
+  private:
+    const Descriptor& m_folder;
+    const std::string m_what;
+    const bool m_later;
+    std::string m_name; ///< Empty once in place.
+    Descriptor m_file;
+};
+
+/// Held while a file is exchanged: of two deliveries to one place, each must keep as a version what
+/// it really replaces. The kernel lets go of it with the process.
+class ExchangeLock {
+  public:
+    explicit ExchangeLock(const Descriptor& files) : m_own(openFolder(files.get(), ".")) {
+        using namespace std::chrono;
+        const auto end = steady_clock::now() + milliseconds(longestWaitMilliseconds);
+        while (flock(m_own.get(), LOCK_EX | LOCK_NB) != 0) {
+            if (errno != EWOULDBLOCK && errno != EINTR) {
+                fail(errno, "the store's files");
+            }
+            if (steady_clock::now() > end) {
+                throw StoreFailure(Fault::Busy, "the store's files are held by another process");
+            }
+            std::this_thread::sleep_for(milliseconds(1));
+        }
+    }
+
+  private:
+    Descriptor m_own;
+};
+
+std::string versionName(int number) {
+    return std::string(ownPrefix) + std::to_string(number);
+}
+
+/// The number in a version's name, or 0.
+int versionNumber(std::string_view name) {
+    if (!name.starts_with(ownPrefix)) {
+        return 0;
+    }
+    name.remove_prefix(ownPrefix.size());
+    int number = 0;
+    const auto result = std::from_chars(name.data(), name.data() + name.size(), number);
+    const bool whole = result.ec == std::errc() && result.ptr == name.data() + name.size();
+    return whole && number > 0 ? number : 0;
+}
+
+struct VersionFile {
+    FileVersion version;
+    ino_t inode = 0;
+};
+
+/// By number.
+std::vector<VersionFile> versionsIn(const Descriptor& folder) {
+    std::vector<VersionFile> found;
+    for (const auto& name : namesIn(folder)) {
+        struct stat status;
+        const int number = versionNumber(name);
+        if (number > 0 && fstatat(folder.get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
+            S_ISREG(status.st_mode)) {
+            found.push_back({{number, static_cast<std::uint64_t>(status.st_size),
+                              std::int64_t{status.st_mtim.tv_sec}},
+                             status.st_ino});
+        }
+    }
+    std::sort(found.begin(), found.end(),
+              [](const auto& a, const auto& b) { return a.version.number < b.version.number; });
+    return found;
+}
+
+/// Keeps what stands at the place as a version. The exchange lock is held.
+void keepVersion(const Descriptor& files, const Descriptor& folder, const Place& place) {
+    const std::string what = place.text();
+    struct stat current;
+    if (fstatat(folder.get(), place.name().c_str(), &current, AT_SYMLINK_NOFOLLOW) != 0) {
+        if (errno == ENOENT) {
+            return;
+        }
+        fail(errno, what);
+    }
+    if (!S_ISREG(current.st_mode)) {
+        throw StoreFailure(Fault::BadPath, what + " is no file");
+    }
+    const Descriptor versions = walk(files, place.versions(), true, what);
+    const auto kept = versionsIn(versions);
+    // A process that was killed between this and the exchange has kept it already.
+    if (!kept.empty() && kept.back().inode == current.st_ino) {
+        return;
+    }
+    const int number = kept.empty() ? 1 : kept.back().version.number + 1;
+    if (linkat(folder.get(), place.name().c_str(), versions.get(), versionName(number).c_str(),
+               0) != 0) {
+        fail(errno, what);
+    }
+    flush(versions, what);
+}
+
+void deliver(const Descriptor& files, const Place& place, const Source& source) {
+    const std::string what = place.text();
+    const Descriptor folder = walk(files, place.folders(), true, what);
+    Delivery delivery(folder, what);
+    delivery.fill(source);
+    const ExchangeLock lock(files);
+    keepVersion(files, folder, place);
+    delivery.putInPlace(place.name());
+}
+
+/// Shows each entry below a folder, but for the versions: its folder, its name and its path.
+using ShowEntry = std::function<void(const Descriptor& folder, const std::string& name,
+                                     const std::string& path, const struct stat& status)>;
+
+void visitAll(const Descriptor& folder, const std::string& prefix, const ShowEntry& show) {
+    for (const auto& name : namesIn(folder)) {
+        struct stat status;
+        if (name == versionsFolder ||
+            fstatat(folder.get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
+            continue;
+        }
+        if (S_ISDIR(status.st_mode)) {
+            const Descriptor below = openFolder(folder.get(), name.c_str());
+            if (below.valid()) {
+                visitAll(below, prefix + name + "/", show);
+            }
+        } else {
+            show(folder, name, prefix + name, status);
+        }
+    }
+}
+
+} // namespace
+
+Descriptor& Descriptor::operator=(Descriptor&& other) noexcept {
+    std::swap(m_number, other.m_number);
+    return *this;
+}
+
+Descriptor::~Descriptor() {
+    if (valid()) {
+        close(m_number);
+    }
+}
+
+int Descriptor::release() {
+    return std::exchange(m_number, -1);
+}
+
+ServerFiles::ServerFiles(const std::string& storeFolder, bool create) {
+    const std::string path = storeFolder + "/files";
+    if (create && mkdir(path.c_str(), 0770) != 0 && errno != EEXIST) {
+        fail(errno, path);
+    }
+    // A link in this place is the administrator's: the files may lie on a disk of their own.
+    m_files = Descriptor(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    if (!m_files.valid()) {
+        throw StoreFailure(Fault::Missing, path + ": " + std::strerror(errno));
+    }
+}
+
+void ServerFiles::put(std::string_view path, std::istream& from) {
+    const Place place(path);
+    deliver(m_files, place, sourceOf(from, place));
+}
+
+void ServerFiles::get(std::string_view path, std::ostream& to) {
+    const Place place(path);
+    const std::string what = place.text();
+    const Descriptor folder = walk(m_files, place.folders(), false, what);
+    copyOut(openFile(folder, place.name(), what), to, what);
+}
+
+std::vector<FileEntry> ServerFiles::list() {
+    std::vector<FileEntry> entries;
+    visitAll(m_files, "",
+             [&](const Descriptor&, const std::string& name, const std::string& path,
+                 const struct stat& status) {
+                 if (S_ISREG(status.st_mode) && !name.starts_with(ownPrefix)) {
+                     entries.push_back({path, static_cast<std::uint64_t>(status.st_size),
+                                        std::int64_t{status.st_mtim.tv_sec}});
+                 }
+             });
+    std::sort(entries.begin(), entries.end(),
+              [](const auto& a, const auto& b) { return a.path < b.path; });
+    return entries;
+}
+
+std::vector<FileVersion> ServerFiles::versions(std::string_view path) {
+    const Place place(path);
+    const std::string what = place.text();
+    std::vector<FileVersion> list;
+    try {
+        const Descriptor folder = walk(m_files, place.versions(), false, what);
+        struct stat current {};
+        try {
+            const Descriptor above = walk(m_files, place.folders(), false, what);
+            fstatat(above.get(), place.name().c_str(), &current, AT_SYMLINK_NOFOLLOW);
+        } catch (const StoreFailure& failure) {
+            if (!isMissing(failure)) {
+                throw;
+            }
+        }
+        for (const auto& file : versionsIn(folder)) {
+            // What is still in place has not been replaced yet.
+            if (file.inode != current.st_ino) {
+                list.push_back(file.version);
+            }
+        }
+    } catch (const StoreFailure& failure) {
+        if (!isMissing(failure)) {
+            throw;
+        }
+    }
+    return list;
+}
+
+void ServerFiles::getVersion(std::string_view path, int number, std::ostream& to) {
+    const Place place(path);
+    const std::string what = place.text() + ", version " + std::to_string(number);
+    const Descriptor folder = walk(m_files, place.versions(), false, what);
+    copyOut(openFile(folder, versionName(number), what), to, what);
+}
+
+void ServerFiles::restoreVersion(std::string_view path, int number) {
+    const Place place(path);
+    const std::string what = place.text() + ", version " + std::to_string(number);
+    const Descriptor folder = walk(m_files, place.versions(), false, what);
+    const Descriptor version = openFile(folder, versionName(number), what);
+    deliver(m_files, place,
+            [&](char* block, std::size_t size) { return readBlock(version, block, size, what); });
+}
+
+int ServerFiles::pruneVersions(std::string_view path, int keepNewest) {
+    const Place place(path);
+    const std::string what = place.text();
+    const ExchangeLock lock(m_files);
+    const auto list = versions(path);
+    int removed = 0;
+    if (list.empty()) {
+        return removed;
+    }
+    const Descriptor folder = walk(m_files, place.versions(), false, what);
+    const auto keep = static_cast<std::size_t>(std::max(keepNewest, 0));
+    for (std::size_t i = 0; i + keep < list.size(); ++i) {
+        if (unlinkat(folder.get(), versionName(list[i].number).c_str(), 0) != 0) {
+            fail(errno, what);
+        }
+        ++removed;
+    }
+    return removed;
+}
+
+int ServerFiles::removeLeftovers() {
+    constexpr std::int64_t youngestSeconds = 60; // Between making a file and locking it, say.
+    int removed = 0;
+    visitAll(m_files, "",
+             [&](const Descriptor& folder, const std::string& name, const std::string&,
+                 const struct stat& status) {
+                 if (!S_ISREG(status.st_mode) || !name.starts_with(deliveryPrefix) ||
+                     time(nullptr) - status.st_mtim.tv_sec < youngestSeconds) {
+                     return;
+                 }
+                 const Descriptor file(
+                     openat(folder.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC));
+                 if (file.valid() && flock(file.get(), LOCK_EX | LOCK_NB) == 0 &&
+                     unlinkat(folder.get(), name.c_str(), 0) == 0) {
+                     ++removed;
+                 }
+             });
+    return removed;
+}
+
+void ServerFiles::placeVersion(std::string_view path, const FileVersion& version,
+                               std::istream& from) {
+    const Place place(path);
+    const std::string what = place.text();
+    const bool current = version.number == 0;
+    const Descriptor folder =
+        walk(m_files, current ? place.folders() : place.versions(), true, what);
+    Delivery delivery(folder, what, true);
+    delivery.fill(sourceOf(from, place));
+    delivery.setTime(version.time);
+    delivery.putInPlace(current ? place.name() : versionName(version.number));
+}
+
+void ServerFiles::flushAll() {
+    if (syncfs(m_files.get()) != 0) {
+        fail(errno, "the store's files");
+    }
+}
+
+} // namespace store

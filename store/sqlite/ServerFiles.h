@@ -1,0 +1,64 @@
+// The files of a store on a local disk.
+//
+//   files/
+//     ControlCharts/chart.it8
+//     jobs/7/.tintgate-new-812-0             a delivery under way
+//     jobs/7/job.jdf
+//     .tintgate-versions/
+//       jobs/7/job.jdf/.tintgate-1           what job.jdf was before
+//       jobs/7/job.jdf/.tintgate-2
+//
+// Server paths have no part that starts with ".tintgate-", so that none of these names can be
+// reached or be in the way.
+#pragma once
+
+#include <string>
+#include <string_view>
+
+#include "store/StoreEngine.h"
+
+namespace store {
+
+/// An open folder or file.
+class Descriptor {
+  public:
+    Descriptor() = default;
+    explicit Descriptor(int number) : m_number(number) {}
+    Descriptor(Descriptor&& other) noexcept : m_number(other.release()) {}
+    Descriptor& operator=(Descriptor&& other) noexcept;
+    ~Descriptor();
+
+    int get() const { return m_number; }
+    int release();
+    bool valid() const { return m_number >= 0; }
+
+  private:
+    int m_number = -1;
+};
+
+/// See StoreEngine for each of these. The folder is held open, so that files stay where they were
+/// when the store was opened, whatever becomes of the names above it. Everything below it is
+/// reached one part at a time without following a symbolic link, so that there is no moment in
+/// which a name could be exchanged for one that leads out.
+class ServerFiles {
+  public:
+    /// The store's "files" folder, made with create.
+    ServerFiles(const std::string& storeFolder, bool create);
+
+    void put(std::string_view path, std::istream& from);
+    void get(std::string_view path, std::ostream& to);
+    std::vector<FileEntry> list();
+    std::vector<FileVersion> versions(std::string_view path);
+    void getVersion(std::string_view path, int number, std::ostream& to);
+    void restoreVersion(std::string_view path, int number);
+    int pruneVersions(std::string_view path, int keepNewest);
+    int removeLeftovers();
+    /// Not on the disk before flushAll.
+    void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
+    void flushAll();
+
+  private:
+    Descriptor m_files;
+};
+
+} // namespace store

@@ -1,0 +1,530 @@
+// A store in one folder on a local disk:
+//
+//   tickets.db      tickets and users, a SQLite database in WAL mode (with tickets.db-wal and -shm
+//                   beside it while it is open)
+//   files/          see ServerFiles.h
+//
+// Key names and values are blobs, which SQLite compares as bytes. A key is one row, its value as
+// KeyBytes.h tells. PRAGMA user_version is the format.
+#include <algorithm>
+#include <cerrno>
+#include <climits>
+#include <cstdlib>
+#include <cstring>
+#include <filesystem>
+#include <set>
+#include <utility>
+
+#include <fcntl.h>
+#include <sys/file.h>
+#include <sys/stat.h>
+
+#include "store/Engines.h"
+#include "store/KeyBytes.h"
+#include "store/sqlite/ServerFiles.h"
+#include "store/sqlite/Sqlite.h"
+#include "store/sqlite/WalWatch.h"
+
+namespace store {
+
+namespace {
+
+using sqlite::Database;
+using sqlite::Statement;
+using sqlite::Transaction;
+
+constexpr std::int64_t applicationId = 0x54474154;    // "TGAT", as file(1) can show it.
+constexpr std::int64_t unfinishedCopyId = 0x54474143; // "TGAC"
+constexpr std::int64_t format = 1;
+
+constexpr const char* tables = R"(
+    CREATE TABLE tickets (
+        number  INTEGER PRIMARY KEY,
+        type    INTEGER NOT NULL,
+        id      INTEGER NOT NULL,
+        changes INTEGER NOT NULL DEFAULT 0,  -- written first by each change: the ticket's lock
+        UNIQUE (type, id)
+    ) STRICT;
+    CREATE TABLE keys (
+        ticket INTEGER NOT NULL REFERENCES tickets (number) ON DELETE CASCADE,
+        name   BLOB NOT NULL,
+        value  BLOB NOT NULL,
+        UNIQUE (ticket, name)
+    ) STRICT;
+    CREATE TABLE highest_ids (type INTEGER PRIMARY KEY, id INTEGER NOT NULL) STRICT;
+    CREATE TABLE users (
+        name     BLOB PRIMARY KEY,
+        hash     BLOB NOT NULL,
+        disabled INTEGER NOT NULL
+    ) STRICT, WITHOUT ROWID;
+)";
+
+std::string databasePath(const std::string& folder) {
+    return folder + "/tickets.db";
+}
+
+/// The folder's own path, which starts with a slash: SQLite would take "file:" in front of a name
+/// for a URI.
+std::string realPath(const std::string& address) {
+    if (address.empty() || address.find('\0') != std::string::npos) {
+        throw StoreFailure(Fault::Missing, "no store has an empty name");
+    }
+    const std::unique_ptr<char, void (*)(void*)> path(realpath(address.c_str(), nullptr), free);
+    if (path == nullptr) {
+        throw StoreFailure(Fault::Missing, address + ": " + std::strerror(errno));
+    }
+    return path.get();
+}
+
+/// The database in a store's folder, whatever its format, if it is of this kind.
+Database openDatabase(const std::string& folder, std::int64_t kind = applicationId) {
+    const std::string path = databasePath(folder);
+    struct stat status;
+    if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode)) {
+        throw StoreFailure(Fault::Missing, folder + " holds no store");
+    }
+    Database database(path, false);
+    if (sqlite3_db_readonly(database.get(), "main") == 1) {
+        throw StoreFailure(Fault::ReadOnly, path + " can't be written");
+    }
+    const std::int64_t found = database.number("PRAGMA application_id");
+    if (found != kind) {
+        throw StoreFailure(Fault::Missing,
+                           found == unfinishedCopyId
+                               ? folder + " is a copy of a store that was not finished"
+                               : path + " is no database of a store");
+    }
+    // What is in the file is data, and never to be run.
+    database.run("PRAGMA trusted_schema = OFF");
+    return database;
+}
+
+void checkFormat(Database& database) {
+    store::checkFormat(database.number("PRAGMA user_version"), format);
+}
+
+void setKind(Database& database, std::int64_t kind) {
+    database.run(("PRAGMA application_id = " + std::to_string(kind)).c_str());
+}
+
+class SqliteEngine : public StoreEngine {
+  public:
+    explicit SqliteEngine(const std::string& folder, std::int64_t kind = applicationId)
+        : m_database(openDatabase(folder, kind)), m_ready(m_database), m_files(folder, false) {}
+
+    bool alive() override { return true; }
+
+    std::uint64_t commits(std::chrono::milliseconds) override { return m_watch.commits(); }
+
+    std::vector<int> ids(int type) override {
+        std::vector<int> ids;
+        auto run = m_ids.run(type);
+        while (run.step()) {
+            ids.push_back(static_cast<int>(run.number(0)));
+        }
+        return ids;
+    }
+
+    bool exists(int type, int id) override { return m_number.run(type, id).step(); }
+
+    bool create(int type, int id) override {
+        if (exists(type, id)) {
+            return false; // Without waiting for those who write.
+        }
+        Transaction transaction(m_database);
+        if (!insert(type, id)) {
+            return false;
+        }
+        transaction.commit();
+        return true;
+    }
+
+    int createNext(int type) override {
+        Transaction transaction(m_database);
+        int id = 1;
+        {
+            auto run = m_highest.run(type);
+            if (run.step()) {
+                id = static_cast<int>(run.number(0)) + 1;
+            }
+        }
+        if (id > highestTicketId) {
+            id = lowestFree(ids(type));
+        }
+        if (id > highestTicketId || !insert(type, id)) {
+            return -1;
+        }
+        transaction.commit();
+        return id;
+    }
+
+    bool remove(int type, int id) override {
+        if (!exists(type, id)) {
+            return false;
+        }
+        Transaction transaction(m_database);
+        m_remove.run(type, id).finish();
+        const bool removed = sqlite3_changes(m_database.get()) != 0;
+        transaction.commit();
+        return removed;
+    }
+
+    std::shared_ptr<const Elements> key(int type, int id, std::string_view name) override {
+        auto run = m_key.run(type, id, name);
+        return run.step() ? decoded(run.bytes(0)) : nullptr;
+    }
+
+    std::shared_ptr<const TicketContent> content(int type, int id,
+                                                 const KeyFilter& filter) override {
+        // One statement: SQLite sees one moment throughout. A ticket without keys gives one row.
+        auto content = std::make_shared<TicketContent>();
+        auto run = m_content.run(type, id);
+        bool found = false;
+        while (run.step()) {
+            found = true;
+            if (!run.isNull(0) && filter.takes(run.bytes(0))) {
+                content->put(run.text(0), decoded(run.bytes(1)));
+            }
+        }
+        return found ? content : nullptr;
+    }
+
+    void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
+                   const ShowKey& show) override {
+        std::string list;
+        for (std::size_t i = 0; i < names.size(); ++i) {
+            list += (i == 0 ? "?" : ", ?") + std::to_string(i + 3);
+        }
+        Statement statement(m_database,
+                            ("SELECT t.id, k.name, CASE WHEN length(k.value) <= ?2 THEN k.value END"
+                             " FROM tickets t CROSS JOIN keys k ON k.ticket = t.number"
+                             " WHERE t.type = ?1 AND k.name IN (" +
+                             list + ") ORDER BY t.id")
+                                .c_str());
+        auto run = statement.runList(type, static_cast<std::int64_t>(largestBytes), names);
+        // Such keys hold few different values.
+        std::map<std::string, std::shared_ptr<const Elements>, std::less<>> known;
+        while (run.step()) {
+            const auto name = std::find(names.begin(), names.end(), run.bytes(1));
+            std::shared_ptr<const Elements> elements;
+            if (!run.isNull(2)) {
+                const std::string_view bytes = run.bytes(2);
+                auto same = known.find(bytes);
+                if (same == known.end()) {
+                    same = known.emplace(bytes, decoded(bytes)).first;
+                }
+                elements = same->second;
+            }
+            show(static_cast<int>(run.number(0)), static_cast<std::size_t>(name - names.begin()),
+                 std::move(elements));
+        }
+    }
+
+    bool change(int type, int id, const Scope& scope,
+                const std::function<void(TicketContent&)>& work) override {
+        Transaction transaction(m_database);
+        std::int64_t ticket = 0;
+        {
+            auto run = m_lock.run(type, id);
+            if (!run.step()) {
+                return false;
+            }
+            ticket = run.number(0);
+            run.finish();
+        }
+        TicketContent content;
+        for (const auto& [name, needed] : scope.keys) {
+            if (needed && !scope.everything) {
+                auto run = m_keyOf.run(ticket, name);
+                if (run.step()) {
+                    content.put(name, decoded(run.bytes(0)));
+                }
+            }
+        }
+        const TicketContent before = content; // Shares the elements: a change makes others.
+        work(content);
+        if (write(ticket, scope, before, content)) {
+            transaction.commit();
+        }
+        return true;
+    }
+
+    std::vector<User> users() override {
+        std::vector<User> users;
+        auto run = m_users.run();
+        while (run.step()) {
+            users.push_back({run.text(0), run.text(1), run.number(2) != 0});
+        }
+        return users;
+    }
+
+    std::optional<User> user(std::string_view name) override {
+        auto run = m_user.run(name);
+        if (!run.step()) {
+            return std::nullopt;
+        }
+        return User{run.text(0), run.text(1), run.number(2) != 0};
+    }
+
+    void putUser(const User& user) override {
+        Transaction transaction(m_database);
+        m_putUser.run(user.name, user.passwordHash, user.disabled ? 1 : 0).finish();
+        transaction.commit();
+    }
+
+    bool removeUser(std::string_view name) override {
+        Transaction transaction(m_database);
+        m_removeUser.run(name).finish();
+        const bool removed = sqlite3_changes(m_database.get()) != 0;
+        transaction.commit();
+        return removed;
+    }
+
+    void putFile(std::string_view path, std::istream& from) override { m_files.put(path, from); }
+    void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
+    std::vector<FileEntry> files() override { return m_files.list(); }
+    std::vector<FileVersion> versions(std::string_view path) override {
+        return m_files.versions(path);
+    }
+    void getVersion(std::string_view path, int number, std::ostream& to) override {
+        m_files.getVersion(path, number, to);
+    }
+    void restoreVersion(std::string_view path, int number) override {
+        m_files.restoreVersion(path, number);
+    }
+    int pruneVersions(std::string_view path, int keepNewest) override {
+        return m_files.pruneVersions(path, keepNewest);
+    }
+    int removeLeftovers() override { return m_files.removeLeftovers(); }
+
+    std::map<int, int> highestIds() override {
+        Statement statement(m_database, "SELECT type, id FROM highest_ids WHERE id > 0");
+        auto run = statement.run();
+        std::map<int, int> ids;
+        while (run.step()) {
+            ids.emplace(run.number(0), run.number(1));
+        }
+        return ids;
+    }
+    void raiseHighestId(int type, int id) override {
+        Transaction transaction(m_database);
+        m_raiseHighest.run(type, id).finish();
+        transaction.commit();
+    }
+    void placeVersion(std::string_view path, const FileVersion& version,
+                      std::istream& from) override {
+        m_files.placeVersion(path, version, from);
+    }
+    void finishCopy() override { setKind(m_database, applicationId); }
+
+  protected:
+    Database& database() { return m_database; }
+    ServerFiles& serverFiles() { return m_files; }
+
+  private:
+    /// Settles the connection before a statement is prepared.
+    struct Ready {
+        explicit Ready(Database& database) {
+            checkFormat(database);
+            database.run("PRAGMA synchronous = FULL; PRAGMA foreign_keys = ON");
+        }
+    };
+
+    bool insert(int type, int id) {
+        m_insert.run(type, id).finish();
+        if (sqlite3_changes(m_database.get()) == 0) {
+            return false;
+        }
+        m_raiseHighest.run(type, id).finish();
+        return true;
+    }
+
+    /// False when there was nothing to write.
+    bool write(std::int64_t ticket, const Scope& scope, const TicketContent& before,
+               const TicketContent& after) {
+        if (scope.everything) {
+            m_empty.run(ticket).finish();
+            for (const auto& [name, elements] : after.keys()) {
+                put(ticket, name, *elements);
+            }
+            return true;
+        }
+        bool written = false;
+        for (const auto& [name, needed] : scope.keys) {
+            const auto elements = after.find(name);
+            if (needed && elements == before.find(name)) {
+                continue;
+            }
+            if (elements != nullptr) {
+                put(ticket, name, *elements);
+            } else {
+                m_delete.run(ticket, name).finish();
+            }
+            written = true;
+        }
+        return written;
+    }
+
+    void put(std::int64_t ticket, const std::string& name, const Elements& elements) {
+        const std::string bytes = keyBytes(elements);
+        m_put.run(ticket, name, bytes).finish();
+    }
+
+    Database m_database;
+    Ready m_ready;
+    ServerFiles m_files;
+    WalWatch m_watch{m_database};
+
+    Statement m_ids{m_database, "SELECT id FROM tickets WHERE type = ? ORDER BY id"};
+    Statement m_number{m_database, "SELECT number FROM tickets WHERE type = ? AND id = ?"};
+    Statement m_insert{m_database, "INSERT OR IGNORE INTO tickets (type, id) VALUES (?, ?)"};
+    Statement m_highest{m_database, "SELECT id FROM highest_ids WHERE type = ?"};
+    Statement m_raiseHighest{m_database,
+                             "INSERT INTO highest_ids (type, id) VALUES (?, ?) ON CONFLICT (type)"
+                             " DO UPDATE SET id = max(id, excluded.id)"};
+    Statement m_remove{m_database, "DELETE FROM tickets WHERE type = ? AND id = ?"};
+    Statement m_lock{m_database,
+                     "UPDATE tickets SET changes = changes + 1 WHERE type = ? AND id = ?"
+                     " RETURNING number"};
+    Statement m_key{m_database, "SELECT k.value FROM tickets t JOIN keys k ON k.ticket = t.number"
+                                " WHERE t.type = ? AND t.id = ? AND k.name = ?"};
+    Statement m_content{m_database, "SELECT k.name, k.value FROM tickets t"
+                                    " LEFT JOIN keys k ON k.ticket = t.number"
+                                    " WHERE t.type = ? AND t.id = ? ORDER BY k.name"};
+    Statement m_keyOf{m_database, "SELECT value FROM keys WHERE ticket = ? AND name = ?"};
+    Statement m_put{m_database, "INSERT INTO keys (ticket, name, value) VALUES (?, ?, ?)"
+                                " ON CONFLICT (ticket, name) DO UPDATE SET value = excluded.value"};
+    Statement m_delete{m_database, "DELETE FROM keys WHERE ticket = ? AND name = ?"};
+    Statement m_empty{m_database, "DELETE FROM keys WHERE ticket = ?"};
+    Statement m_users{m_database, "SELECT name, hash, disabled FROM users ORDER BY name"};
+    Statement m_user{m_database, "SELECT name, hash, disabled FROM users WHERE name = ?"};
+    Statement m_putUser{m_database,
+                        "INSERT OR REPLACE INTO users (name, hash, disabled) VALUES (?, ?, ?)"};
+    Statement m_removeUser{m_database, "DELETE FROM users WHERE name = ?"};
+};
+
+void makeSystemTicket(Database& database, const std::string& serverName) {
+    database.run("INSERT INTO tickets (type, id) VALUES (0, 0)");
+    Statement insert(database, "INSERT INTO keys (ticket, name, value)"
+                               " SELECT number, ?, ? FROM tickets WHERE type = 0 AND id = 0");
+    for (const auto& [name, value] : systemKeys(serverName)) {
+        insert.run(name, value).finish();
+    }
+}
+
+/// Whether a folder has nothing in it, or at most what a store that was not made to its end has.
+/// For what that database holds, see makeSqlite.
+bool isFree(const std::string& folder) {
+    namespace fs = std::filesystem;
+    // The journal is there while the log is being turned on.
+    const std::set<std::string> begun = {"files", "tickets.db", "tickets.db-journal",
+                                         "tickets.db-wal", "tickets.db-shm"};
+    std::error_code failure;
+    for (const auto& entry : fs::directory_iterator(folder, failure)) {
+        if (begun.count(entry.path().filename()) == 0) {
+            return false;
+        }
+    }
+    const bool hasFiles = fs::exists(folder + "/files", failure);
+    return !failure && (!hasFiles || fs::is_empty(folder + "/files", failure)) && !failure;
+}
+
+void makeFolder(const std::string& address) {
+    if (address.empty() || address.find('\0') != std::string::npos) {
+        throw StoreFailure(Fault::BadPath, "a store needs a path");
+    }
+    if (mkdir(address.c_str(), 0770) == 0) {
+        return;
+    }
+    const int error = errno;
+    if (error == EEXIST && isFree(address)) {
+        return;
+    }
+    throw StoreFailure(error == EEXIST ? Fault::Exists : Fault::ReadOnly,
+                       address + ": " + std::strerror(error));
+}
+
+/// Without a server's name there is nothing in it.
+void makeSqlite(const std::string& address, const std::string* serverName, std::int64_t kind) {
+    makeFolder(address);
+    const std::string folder = realPath(address);
+    const ServerFiles files(folder, true);
+    Database database(databasePath(folder), true);
+    // Log and index take the database's permissions. Password hashes are nobody else's.
+    const mode_t mask = umask(0);
+    umask(mask);
+    chmod(databasePath(folder).c_str(), 0660 & ~mask);
+    database.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = FULL");
+    Transaction transaction(database);
+    if (database.number("SELECT count(*) FROM sqlite_schema") != 0) {
+        throw StoreFailure(Fault::Exists, folder + " holds a store");
+    }
+    database.run(tables);
+    if (serverName != nullptr) {
+        makeSystemTicket(database, *serverName);
+    }
+    database.run(("PRAGMA user_version = " + std::to_string(format)).c_str());
+    // Without it a database is no store, so one that was not made to its end is none.
+    setKind(database, kind);
+    transaction.commit();
+}
+
+std::unique_ptr<StoreEngine> openSqlite(const std::string& address) {
+    return std::make_unique<SqliteEngine>(realPath(address));
+}
+
+void makeSqliteStore(const std::string& address, const std::string& serverName) {
+    makeSqlite(address, &serverName, applicationId);
+}
+
+/// The engine of a copy holds the lock on its folder. Until it is a store, nothing in it needs to
+/// be on the disk.
+class SqliteCopy : public SqliteEngine {
+  public:
+    explicit SqliteCopy(const std::string& folder)
+        : SqliteEngine(folder, unfinishedCopyId),
+          m_folder(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {
+        if (flock(m_folder.get(), LOCK_EX | LOCK_NB) != 0) {
+            throw StoreFailure(Fault::Busy, "somebody else is copying to " + folder);
+        }
+        database().run("PRAGMA synchronous = NORMAL");
+    }
+
+    void finishCopy() override {
+        serverFiles().flushAll();
+        database().run("PRAGMA synchronous = FULL"); // Of what is in the log so far as well.
+        SqliteEngine::finishCopy();
+    }
+
+  private:
+    Descriptor m_folder;
+};
+
+std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
+    try {
+        return std::make_unique<SqliteCopy>(realPath(address));
+    } catch (const StoreFailure& failure) {
+        if (failure.fault != Fault::Missing) {
+            throw;
+        }
+    }
+    makeSqlite(address, nullptr, unfinishedCopyId);
+    return std::make_unique<SqliteCopy>(realPath(address));
+}
+
+bool upgradeSqlite(const std::string& address) {
+    Database database = openDatabase(realPath(address));
+    if (database.number("PRAGMA user_version") >= format) {
+        checkFormat(database);
+        return false;
+    }
+    // Format 1 is the first that was ever given out: a step for each later one goes here.
+    throw StoreFailure(Fault::Damaged, "no way is known from this format to the present one");
+}
+
+} // namespace
+
+constinit const EngineKind sqliteKind = {openSqlite, makeSqliteStore, openSqliteCopy,
+                                         upgradeSqlite};
+
+} // namespace store

@@ -1,0 +1,159 @@
+#include <algorithm>
+#include <cmath>
+#include <limits>
+#include <string>
+#include <vector>
+
+#include <gmock/gmock.h>
+#include <gtest/gtest.h>
+#include <lcms2.h>
+
+#include "ScratchFolder.h"
+#include "report/Model.h"
+
+namespace {
+
+using namespace report;
+using testing::ElementsAre;
+using testing::HasSubstr;
+
+constexpr double none = std::numeric_limits<double>::quiet_NaN();
+const std::string data = TINTGATE_SOURCE_DIR "/tests/data/report/";
+
+std::string with(std::string text, const std::string& part, const std::string& other) {
+    const std::size_t at = text.find(part);
+    EXPECT_NE(at, text.npos) << part;
+    return text.replace(at, part.size(), other);
+}
+
+// LittleCMS as the peer: Lab to sRGB, which is relative colorimetric with Bradford inside.
+TEST(Swatch, IsTheColourThatLittleCmsShows) {
+    cmsHPROFILE const lab = cmsCreateLab4Profile(nullptr);
+    cmsHPROFILE const srgb = cmsCreate_sRGBProfile();
+    cmsHTRANSFORM const transform = cmsCreateTransform(
+        lab, TYPE_Lab_DBL, srgb, TYPE_RGB_DBL, INTENT_RELATIVE_COLORIMETRIC, cmsFLAGS_NOOPTIMIZE);
+    int inside = 0;
+    for (int i = 0; i < 21 * 13 * 13; ++i) {
+        const double colour[3] = {i % 21 * 5.0, i / 21 % 13 * 15.0 - 90, i / 21 / 13 * 15.0 - 90};
+        SCOPED_TRACE(testing::PrintToString(colour));
+        double rgb[3];
+        cmsDoTransform(transform, colour, rgb, 1);
+        const Swatch s = swatch({colour[0], colour[1], colour[2]});
+        const double ours[3] = {double(s.red), double(s.green), double(s.blue)};
+        for (int channel = 0; channel < 3; ++channel)
+            EXPECT_NEAR(ours[channel], 255 * std::clamp(rgb[channel], 0.0, 1.0), 1.0);
+        // Well inside or outside, so that rounding can't decide.
+        const auto [least, most] = std::minmax({rgb[0], rgb[1], rgb[2]});
+        if (least < -0.01 || most > 1.01) {
+            EXPECT_TRUE(s.clipped);
+        } else if (least > 0.01 && most < 0.99) {
+            EXPECT_FALSE(s.clipped);
+            ++inside;
+        }
+    }
+    EXPECT_GT(inside, 500);
+    for (const double bad : {none, 1e308, -1e308})
+        EXPECT_TRUE(swatch({bad, bad, bad}).clipped);
+    cmsDeleteTransform(transform);
+    cmsCloseProfile(lab);
+    cmsCloseProfile(srgb);
+}
+
+TEST(Histogram, HasFewRoundBinsThatHoldEveryNumber) {
+    const struct {
+        std::vector<double> values;
+        std::size_t bins;
+        double width;
+        std::size_t first, sum; ///< How many numbers the first bin has, and all.
+    } cases[] = {
+        {{0, 0, 0}, 1, 0.01, 3, 3},
+        {{0.1, 0.49, 0.5, 7.6}, 16, 0.5, 2, 4},
+        {{1e308, std::numeric_limits<double>::infinity()}, 21, 5e306, 0, 1},
+    };
+    for (const auto& [values, bins, width, first, sum] : cases) {
+        SCOPED_TRACE(values.back());
+        const std::vector<Bin> histogram = histogramOf(values);
+        ASSERT_EQ(histogram.size(), bins);
+        EXPECT_NEAR(histogram[0].to / width, 1, 1e-9);
+        EXPECT_EQ(histogram[0].count, first);
+        std::size_t counted = 0;
+        for (const Bin& bin : histogram)
+            counted += bin.count;
+        EXPECT_EQ(counted, sum);
+    }
+}
+
+Criterion criterion(const char* name, double tolerance, double value, Outcome outcome) {
+    Criterion c;
+    c.name = c.title = name;
+    c.unit = "dE";
+    c.used = name != std::string("unused");
+    c.outcome = outcome;
+    c.tolerance = tolerance;
+    if (std::isfinite(value))
+        c.value = c.rounded = value;
+    return c;
+}
+
+Result resultOf(std::size_t patches) {
+    Result result;
+    result.formula = "CIE2000";
+    for (std::size_t i = 0; i < patches; ++i)
+        result.patches.push_back({std::to_string(i + 1), "", {50, 0, 0}, {50, 1, 0}, double(i)});
+    return result;
+}
+
+TEST(Model, SaysFirstWhatFailedAndByHowMuch) {
+    Result result = resultOf(3);
+    result.patches[1].difference = none;
+    result.verdict = Verdict::Failed;
+    result.criteria = {
+        criterion("near", 3, 2.9, Outcome::Pass), criterion("little", 10, 20, Outcome::Fail),
+        criterion("unused", 1, 9, Outcome::Fail), criterion("much", 2.125, 6, Outcome::Fail),
+        criterion("zero", 0, 0.5, Outcome::Fail), criterion("far", 3, 0.5, Outcome::Pass)};
+    Model model = makeModel(result, nullptr);
+    EXPECT_EQ(model.sentence, "3 of 5 criteria are above tolerance.");
+    EXPECT_THAT(model.reasons,
+                ElementsAre("zero: 0.50 ΔE00, 0.50 above the tolerance of 0.00",
+                            "much: 6.00 ΔE00, 3.875 above the tolerance of 2.125",
+                            "little: 20.00 ΔE00, 10.00 above the tolerance of 10.00"));
+    EXPECT_EQ(model.judged[3].title, "near");
+    EXPECT_EQ(model.judged[3].distance, "0.10 below");
+    EXPECT_EQ(model.rows[0].patch, 2u); // No number comes last.
+    EXPECT_EQ(model.rows[2].patch, 1u);
+
+    result.verdict = Verdict::Incomplete;
+    result.criteria = {criterion("there", 3, 4, Outcome::Fail),
+                       criterion("missing", 3, none, Outcome::Unanswered)};
+    EXPECT_EQ(makeModel(result, nullptr).sentence,
+              "1 of 2 criteria can't be answered from these data, 1 failed.");
+    result.criteria.clear();
+    EXPECT_THAT(makeModel(result, nullptr).sentence, HasSubstr("judges no criterion"));
+}
+
+TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
+    const std::string whole = support::contentsOf(data + "output.json");
+    std::string problem;
+    ASSERT_TRUE(readResult(whole, problem)) << problem;
+    for (const std::string& text :
+         {std::string("[]"), whole.substr(0, whole.size() / 2),
+          with(whole, "tintgate-result", "other"),
+          with(whole, "\"formatVersion\": 1", "\"formatVersion\": 2"),
+          with(whole, "\"failed\"", "\"won\""), with(whole, "[100,0,0,0]", "[100,0,0]"),
+          with(whole, "\"worstPatch\":1", "\"worstPatch\":4"),
+          with(whole, "\"decimals\":2", "\"decimals\":1e300"),
+          with(whole, "[55,-37,-50]", "[55,\"x\",-50]")}) {
+        problem.clear();
+        EXPECT_FALSE(readResult(text, problem)) << text.substr(0, 200);
+        EXPECT_NE(problem, "");
+    }
+
+    // The time becomes a part of a file's name.
+    const std::string meta = support::contentsOf(data + "meta.json");
+    const std::string time = "2024-05-01T12:34:56+02:00";
+    EXPECT_EQ(dateText(readMeta(meta, problem)->created), "1 May 2024, 12:34 (UTC+02:00)");
+    for (const char* other : {"../../../../etc/cron.d/xxx", "2024-05-01T12:34:56Z", ""})
+        EXPECT_FALSE(readMeta(with(meta, time, other), problem)) << other;
+}
+
+} // namespace

@@ -1,0 +1,123 @@
+#include "store/sqlite/ServerFiles.h"
+
+#include <filesystem>
+
+#include <sys/stat.h>
+#include <unistd.h>
+#include <utime.h>
+
+#include "StoreTest.h"
+
+using store::Fault;
+
+namespace {
+
+class ServerFiles : public StoreTest {
+  protected:
+    /// Nothing is read there, nothing is written, and nothing is left.
+    void expectRefused(const std::string& path) {
+        SCOPED_TRACE(path.substr(0, 60));
+        const auto before = engine->files().size();
+        EXPECT_EQ(faultOf([&] { file(*engine, path); }), Fault::BadPath);
+        EXPECT_EQ(faultOf([&] { putFile(*engine, path, "hostile"); }), Fault::BadPath);
+        EXPECT_EQ(engine->files().size(), before);
+    }
+
+    using StoreTest::StoreTest;
+    const std::unique_ptr<store::StoreEngine> engine = open();
+};
+ON_BOTH_ENGINES(ServerFiles);
+
+class FilesInFolder : public ServerFiles {
+  protected:
+    FilesInFolder() : ServerFiles(Engine::Sqlite) {}
+};
+
+} // namespace
+
+TEST_P(ServerFiles, PathsStayBelowTheFilesWhateverTheyContain) {
+    putFile(*engine, "inside/file", "x");
+    std::string deep = "x";
+    for (int i = 0; i < 1'100; ++i) {
+        deep += "/a";
+    }
+    for (const std::string& path :
+         {std::string("../secret"), std::string("inside/../../secret"),
+          std::string("inside/../inside/file"), std::string(".."), std::string("/"),
+          std::string("."), std::string(), std::string("inside"), std::string("inside/file/"),
+          std::string("inside/file/more"), std::string("inside/file\0.txt", 16),
+          std::string(256, 'a'), deep, std::string(".tintgate-versions/inside/file/.tintgate-1"),
+          std::string("inside/.tintgate-new-1-0")}) {
+        expectRefused(path);
+    }
+    EXPECT_EQ(faultOf([&] { file(*engine, "missing/file"); }), Fault::NoFile);
+
+    // Absolute paths mean the same below the files, and names of any bytes are names.
+    putFile(*engine, "//opt/server/./ControlCharts/a\\b \xFF\n.it8", "chart");
+    EXPECT_EQ(file(*engine, "opt/server/ControlCharts/a\\b \xFF\n.it8"), "chart");
+    EXPECT_EQ(engine->files().back().path, "opt/server/ControlCharts/a\\b \xFF\n.it8");
+    std::string large(1'000'003, 'x'); // Of several pieces, where there are pieces.
+    large.replace(262'100, 100, "where one ends");
+    for (const std::string& text : {large, large.substr(0, 524'288)}) {
+        putFile(*engine, "large", text);
+        EXPECT_EQ(file(*engine, "large"), text);
+    }
+}
+
+TEST_F(FilesInFolder, NoLinkLeadsOut) {
+    folder.write("secret", "secret");
+    const std::string outside = folder.makeFolder("outside");
+    symlink(outside.c_str(), (address + "/files/out").c_str());
+    symlink(folder.path("secret").c_str(), (address + "/files/link").c_str());
+    symlink(".", (address + "/files/round").c_str());
+    mkfifo((address + "/files/pipe").c_str(), 0666);
+    for (const char* path : {"out/file", "link", "round/inside/file", "pipe"}) {
+        expectRefused(path);
+    }
+    EXPECT_EQ(support::contentsOf(folder.path("secret")), "secret");
+    EXPECT_TRUE(std::filesystem::is_empty(outside));
+}
+
+TEST_P(ServerFiles, KeepsEachVersionUntilItIsPruned) {
+    const std::string path = "jobs/7/job.jdf";
+    using Texts = std::vector<std::string>;
+    EXPECT_EQ(versions(*engine, path), Texts());
+    for (const std::string text : {"one", "two!", "three", "three", ""}) {
+        putFile(*engine, path, text);
+    }
+    EXPECT_EQ(versions(*engine, path), (Texts{"one", "two!", "three", "three"}));
+    engine->restoreVersion(path, 2);
+    EXPECT_EQ(file(*engine, path), "two!");
+    EXPECT_EQ(versions(*engine, path), (Texts{"one", "two!", "three", "three", ""}));
+    EXPECT_EQ(faultOf([&] { engine->restoreVersion(path, 9); }), Fault::NoFile);
+
+    EXPECT_EQ(engine->pruneVersions(path, 2), 3);
+    putFile(*engine, path, "last");
+    EXPECT_EQ(versions(*engine, path), (Texts{"three", "", "two!"}));
+    EXPECT_EQ(engine->versions(path).back().number, 6) << "numbers are not used twice";
+    // A path below a file's versions.
+    putFile(*engine, path + ".d/1", "below");
+    EXPECT_EQ(engine->pruneVersions(path, 0), 3);
+    EXPECT_EQ(file(*engine, path), "last");
+    EXPECT_EQ(file(*engine, path + ".d/1"), "below");
+    EXPECT_EQ(engine->files().size(), 2u);
+}
+
+TEST_F(FilesInFolder, LeftoversGoWhileDeliveriesStay) {
+    putFile(*engine, "a/file", "x");
+    const std::string left = folder.write("store/files/a/.tintgate-new-1-1", "half");
+    EXPECT_EQ(engine->removeLeftovers(), 0) << "it may be a delivery that just began";
+    const utimbuf old = {1, 1};
+    utime(left.c_str(), &old);
+    EXPECT_EQ(engine->files().size(), 1u);
+    EXPECT_EQ(engine->removeLeftovers(), 1);
+    EXPECT_FALSE(support::exists(left));
+
+    // A process that was killed after it had kept a version, and before the exchange.
+    std::filesystem::create_directories(address + "/files/.tintgate-versions/a/file");
+    std::filesystem::create_hard_link(address + "/files/a/file",
+                                      address + "/files/.tintgate-versions/a/file/.tintgate-1");
+    EXPECT_TRUE(engine->versions("a/file").empty());
+    putFile(*engine, "a/file", "y");
+    EXPECT_EQ(versions(*engine, "a/file"), std::vector<std::string>{"x"});
+}

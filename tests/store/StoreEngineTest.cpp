@@ -1,0 +1,196 @@
+#include "store/StoreEngine.h"
+
+#include <algorithm>
+#include <csignal>
+#include <map>
+#include <random>
+#include <ranges>
+
+#include <sys/resource.h>
+#include <sys/stat.h>
+
+#include "StoreTest.h"
+
+using store::Fault;
+
+namespace {
+
+class StoreEngine : public StoreTest {};
+
+/// What only a store in a folder has.
+class FolderStore : public StoreTest {
+  protected:
+    FolderStore() : StoreTest(Engine::Sqlite) {}
+};
+
+ON_BOTH_ENGINES(StoreEngine);
+
+} // namespace
+
+TEST_P(StoreEngine, IdsAreNotUsedTwice) {
+    const auto engine = open();
+    EXPECT_EQ(ticket(*engine, 0, 0),
+              "System/Product/MajorVersion[0]=5 System/ServerName[0]='Press room");
+    EXPECT_EQ(engine->createNext(3), 1);
+    EXPECT_TRUE(engine->create(3, 40));
+    EXPECT_EQ(engine->createNext(3), 41);
+    EXPECT_TRUE(engine->remove(3, 41));
+    EXPECT_EQ(engine->createNext(3), 42);
+    EXPECT_TRUE(engine->create(3, 0xFFFFFF));
+    EXPECT_EQ(engine->createNext(3), 2) << "the lowest free one, when the highest is used up";
+    EXPECT_EQ(engine->ids(3), (std::vector<int>{1, 2, 40, 42, 0xFFFFFF}));
+    EXPECT_EQ(engine->ids(4), std::vector<int>());
+}
+
+TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
+    open()->createNext(3);
+    const struct {
+        const char* sent;
+        const char* results;
+        const char* ticket; // Keys go as bytes, not as letters.
+    } tables[] = {
+        {"a=1 a[16777215]=2 a[-2]=3 a[16777216]=1 a[-3]=- a[-2]=- z[0]=- z=-", "taken 11000001",
+         "a[0]=1 a[16777215]=2"},
+        {"a*=- *[0]=1 =- a[-1]=9 a[-2]='x e=# p=p0", "taken 0001111",
+         "a[0]=9 a[1]='x e[0]=# p[0]=p0"},
+        {"a=- a[-2]=7 a[0]=- e=- p=-", "taken 11111", ""},
+        // Arrays as they are sent, one with something behind it.
+        {"c[0]=1 c[1]=2 c[2]=3 c[4]=9 d=- d[0]=0.5 d[1]=2.5 d[2]='x", "taken 11111111",
+         "c[0]=1 c[1]=2 c[2]=3 c[4]=9 d[0]=0.5 d[1]=2.5 d[2]='x"},
+        {"c=- d=- b=1,2.5,'x é=7 b2=U9 A=#00 b[5]=l-1 zz*=1 =1 b[-3]=4", "taken 111111111000",
+         "A[0]=#00 b[0]=1 b[1]=2.5 b[2]='x b[5]=l-1 b2[0]=U9 é[0]=7"},
+        // Changes of keys that the table replaces, changes, deletes, and deletes in vain.
+        {"b[5]=- b[-2]=9 A=- gone=- b2=1 b2[-2]=2 é[3]=-", "taken 1111110",
+         "b[0]=1 b[1]=2.5 b[2]='x b[3]=9 b2[0]=1 b2[1]=2 é[0]=7"},
+        {"b[-1]='new b[1]=-", "taken 10", "b[0]='new b2[0]=1 b2[1]=2 é[0]=7"},
+    };
+    for (const auto& [sent, results, expected] : tables) {
+        EXPECT_EQ(send(*open(), 3, 1, sent), results);
+        EXPECT_EQ(ticket(*open(), 3, 1), expected);
+    }
+    const auto engine = open();
+    const char* filter[] = {"b", "é*", nullptr};
+    EXPECT_EQ(contentText(*engine->content(3, 1, store::KeyFilter(filter))), "b[0]='new é[0]=7");
+
+    // A change that fails on its way leaves nothing.
+    const auto failing = [](store::TicketContent& content) {
+        content.apply(support::RecordTable("b=1,2,3").records());
+        throw std::runtime_error("on the way");
+    };
+    EXPECT_THROW(engine->change(3, 1, {.keys = {{"b", true}}}, failing), std::runtime_error);
+    EXPECT_EQ(ticket(*open(), 3, 1), std::end(tables)[-1].ticket);
+}
+
+TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
+    // The first two are held of all jobs at once, from when a reader asks for the ids.
+    const std::string keys[] = {"Job/Display/Status", "Input/FileType", "Other"};
+    store::StoreKeep reader(open());
+    store::StoreKeep other(open());
+    std::map<int, std::map<std::string, int>> jobs; // What is there.
+    std::mt19937 random(1);
+    const auto below = [&](int limit) { return static_cast<int>(random() % unsigned(limit)); };
+    other.create(27, 2); // Of another type.
+    for (int step = 0; step < 250 && !HasFailure(); ++step) {
+        store::StoreKeep& writer = below(3) == 0 ? reader : other;
+        const int id = 1 + below(3);
+        const std::string& key = keys[below(3)];
+        const int what = below(9);
+        if (what == 0) {
+            EXPECT_EQ(writer.remove(3, id), jobs.erase(id) != 0);
+        } else if (what == 1) {
+            EXPECT_EQ(writer.create(3, id), jobs.try_emplace(id).second);
+        } else if (what == 2) {
+            sql("PRAGMA wal_checkpoint(TRUNCATE)", "SELECT 1");
+        } else {
+            std::string records = key + "=" + std::to_string(step);
+            for (int more = what == 3 ? 100 : 0; more > 0; --more) { // Too many to be held.
+                records += " " + key + "[-2]=1";
+            }
+            support::RecordTable table(records);
+            other.apply(27, 2, table.records());
+            const bool isThere = jobs.count(id) != 0;
+            EXPECT_EQ(writer.apply(3, id, table.records()), isThere);
+            if (isThere) {
+                jobs[id][key] = step;
+            }
+        }
+        if (below(4) == 0) {
+            EXPECT_TRUE(std::ranges::equal(reader.ids(3), std::views::keys(jobs)));
+        }
+        // In this order no read goes on with a listing, which may show what was there before.
+        for (int job = 3; job > 0; --job) {
+            for (const int index : {1, 0, 2}) {
+                const std::string& name = keys[index == 2 && step / 8 % 3 + 1 != job ? 0 : index];
+                const auto elements = reader.key(3, job, name);
+                const bool isThere = jobs.count(job) != 0 && jobs[job].count(name) != 0;
+                ASSERT_EQ(elements ? std::get<int>(*elements->first()) : -1,
+                          isThere ? jobs[job][name] : -1)
+                    << step << ": " << job << " " << name;
+            }
+        }
+    }
+}
+
+TEST_F(FolderStore, OpensOnlyFoldersWithAStore) {
+    folder.makeFolder("strange/files");
+    folder.write("strange/tickets.db", "");
+    folder.makeFolder("noise/files");
+    folder.write("noise/tickets.db", std::string(5000, 'x'));
+    const std::pair<std::string, Fault> cases[] = {
+        {folder.path("nowhere"), Fault::Missing},
+        {folder.makeFolder("empty"), Fault::Missing},
+        {folder.write("file", "x"), Fault::Missing},
+        {folder.path("strange"), Fault::Missing},
+        {folder.path("noise"), Fault::Damaged},
+        {"", Fault::Missing},
+        {address + std::string("\0", 1), Fault::Missing},
+        {"file:" + address + "?mode=memory", Fault::Missing},
+    };
+    for (const auto& [place, fault] : cases) {
+        EXPECT_EQ(faultOf([&, at = place] { store::openStore(at); }), fault) << place;
+    }
+    folder.makeFolder("begun/files"); // By a making that was killed as it turned the log on.
+    folder.write("begun/tickets.db-journal", "");
+    EXPECT_NO_THROW(store::makeStore(folder.path("begun"), "press"));
+    EXPECT_EQ(support::modeOf(folder.path("begun/tickets.db")) & 0007u, 0u);
+}
+
+TEST_P(StoreEngine, NeitherOverwritesAStoreNorReadsADamagedKey) {
+    EXPECT_EQ(faultOf([&] { store::makeStore(address, "x"); }), Fault::Exists);
+    EXPECT_EQ(faultOf([&] { store::openCopy(address); }), Fault::Exists);
+    EXPECT_FALSE(store::bringStoreUpToDate(address));
+    setFormat(9);
+    EXPECT_EQ(faultOf([&] { store::bringStoreUpToDate(address); }), Fault::Newer);
+    setFormat(room ? 2 : 1);
+    sql("INSERT INTO keys SELECT number, x'61', x'010299' FROM tickets",
+        "INSERT INTO tintgate.keys (ticket, name, value, change)"
+        " SELECT number, '\\x61', '\\x010299', 0 FROM tintgate.tickets");
+    const auto engine = open();
+    EXPECT_EQ(faultOf([&] { engine->key(0, 0, "a"); }), Fault::Damaged);
+    EXPECT_EQ(send(*engine, 0, 0, "a[1]=1"), "refused 0");
+    EXPECT_EQ(send(*engine, 0, 0, "a=1"), "taken 1") << "replacing it mends it";
+}
+
+TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
+    const std::string much(300'000, 'x');
+    open()->create(3, 1);
+    send(*open(), 3, 1, "kept=1,2,3");
+    putFile(*open(), "kept", "old");
+    // A limit on the size of files, which the kernel reports as it reports a full disk.
+    const pid_t child = startProcess([&] {
+        signal(SIGXFSZ, SIG_IGN);
+        const rlimit limit = {200'000, 200'000};
+        setrlimit(RLIMIT_FSIZE, &limit);
+        const auto engine = open();
+        EXPECT_EQ(send(*engine, 3, 1, "kept='" + much + " other=1"), "refused 00");
+        EXPECT_EQ(faultOf([&] { putFile(*engine, "kept", much); }), Fault::Full);
+        EXPECT_EQ(send(*engine, 3, 1, "small=1"), "taken 1");
+        return HasFailure() ? 1 : 0;
+    });
+    EXPECT_EQ(endOf(child), 0);
+    const auto engine = open();
+    EXPECT_EQ(ticket(*engine, 3, 1), "kept[0]=1 kept[1]=2 kept[2]=3 small[0]=1");
+    EXPECT_EQ(file(*engine, "kept"), "old");
+    EXPECT_EQ(engine->files().size(), 1u);
+    EXPECT_TRUE(engine->versions("kept").empty());
+}

@@ -1,0 +1,142 @@
+// A store of a test's own, and processes that work on it.
+#pragma once
+
+#include <cstdio>
+#include <functional>
+#include <memory>
+#include <optional>
+#include <sstream>
+#include <string>
+#include <vector>
+
+#include <sys/wait.h>
+#include <unistd.h>
+
+#include <gtest/gtest.h>
+
+#include "Postgres.h"
+#include "RunProgram.h"
+#include "ScratchFolder.h"
+#include "TicketText.h"
+#include "store/sqlite/Sqlite.h"
+#include "store/StoreEngine.h"
+#include "store/StoreKeep.h"
+
+/// Starts work in a process of its own, which ends with what work returns; 99 after an exception.
+inline pid_t startProcess(const std::function<int()>& work) {
+    const pid_t child = fork();
+    if (child == 0) {
+        int code = 99;
+        try {
+            code = work();
+        } catch (const std::exception& failure) {
+            fprintf(stderr, "%s\n", failure.what());
+        }
+        _exit(code);
+    }
+    return child;
+}
+
+/// The exit code, or 1000 and the signal that ended it.
+inline int endOf(pid_t child) {
+    int status = 0;
+    waitpid(child, &status, 0);
+    return WIFEXITED(status) ? WEXITSTATUS(status) : 1000 + WTERMSIG(status);
+}
+
+/// All that is in a ticket, in the words of TicketText.h.
+inline std::string contentText(const store::TicketContent& content) {
+    std::vector<SETMULTIPAR> table;
+    content.walk(support::collect, &table);
+    table.emplace_back();
+    return support::tableText(table.data());
+}
+
+enum class Engine { Sqlite, Postgres };
+
+/// For a suite of tests that hold wherever a store is.
+#define ON_BOTH_ENGINES(Suite)                                                                     \
+    INSTANTIATE_TEST_SUITE_P(                                                                      \
+        , Suite, testing::Values(Engine::Sqlite, Engine::Postgres), [](const auto& info) {         \
+            return std::string(info.param == Engine::Sqlite ? "Sqlite" : "Postgres");              \
+        })
+
+class StoreTest : public testing::TestWithParam<Engine> {
+  public:
+    /// Sends a table as a session would; what became of it and of its records.
+    static std::string send(store::StoreEngine& engine, int type, int id,
+                            const std::string& records) {
+        // The keep is gone before the engine is.
+        store::StoreKeep keep(std::shared_ptr<store::StoreEngine>(&engine, [](auto*) {}));
+        support::RecordTable table(records);
+        const bool taken = keep.apply(type, id, table.records());
+        return (taken ? "taken " : "refused ") + support::resultText(table.records());
+    }
+
+    /// All keys of a ticket, or "none".
+    static std::string ticket(store::StoreEngine& engine, int type, int id) {
+        const auto content = engine.content(type, id, store::KeyFilter());
+        return content == nullptr ? "none" : contentText(*content);
+    }
+
+    static void putFile(store::StoreEngine& engine, const std::string& path,
+                        const std::string& text) {
+        std::istringstream from(text);
+        engine.putFile(path, from);
+    }
+
+    static std::string file(store::StoreEngine& engine, const std::string& path) {
+        std::ostringstream to;
+        engine.getFile(path, to);
+        return to.str();
+    }
+
+    /// What a file held before, the oldest first.
+    static std::vector<std::string> versions(store::StoreEngine& engine, const std::string& path) {
+        std::vector<std::string> texts;
+        for (const auto& version : engine.versions(path)) {
+            std::ostringstream to;
+            engine.getVersion(path, version.number, to);
+            EXPECT_EQ(to.str().size(), version.size);
+            texts.push_back(to.str());
+        }
+        return texts;
+    }
+
+    /// The fault that work ends with; nothing where it does not fail.
+    static std::optional<store::Fault> faultOf(const std::function<void()>& work) {
+        try {
+            work();
+        } catch (const store::StoreFailure& failure) {
+            return failure.fault;
+        }
+        return std::nullopt;
+    }
+
+  protected:
+    explicit StoreTest(Engine kind = GetParam())
+        : room(kind == Engine::Postgres ? std::make_unique<support::PostgresRoom>() : nullptr),
+          address(room ? "room" : folder.path("store")) {
+        store::makeStore(address, "Press room");
+    }
+
+    std::unique_ptr<store::StoreEngine> open() const { return store::openStore(address); }
+
+    /// Runs SQL behind the store's back: the first text where it is a folder, else the second.
+    void sql(const std::string& sqlite, const std::string& postgres) const {
+        if (room) {
+            support::BarePostgres("room").run(postgres);
+            return;
+        }
+        store::sqlite::Database(address + "/tickets.db", false).run(sqlite.c_str());
+    }
+
+    void setFormat(int format) const {
+        const std::string number = std::to_string(format);
+        sql("PRAGMA user_version = " + number, "UPDATE tintgate.store SET format = " + number);
+    }
+
+    const support::ScratchFolder folder;
+    const std::unique_ptr<support::PostgresRoom> room; ///< Null where the store is a folder.
+    const std::string address;
+};
