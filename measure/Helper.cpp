@@ -23,7 +23,7 @@
 #include "platform/CoreFoundationStrings.h"
 #include "platform/Processes.h"
 #include "platform/SystemRoot.h"
-#include "platform/WideBytes.h"
+#include "base/WideBytes.h"
 
 namespace {
 
@@ -44,11 +44,11 @@ constexpr std::array<const char*, 28> siblingApplications = {
 };
 
 wxString textFromBytes(const std::string& bytes) {
-    return platform::wideFromBytes(bytes);
+    return base::wideFromBytes(bytes);
 }
 
 std::string bytesFromText(const wxString& text) {
-    return platform::bytesFromWide(text.ToStdWstring());
+    return base::bytesFromWide(text.ToStdWstring());
 }
 
 wxString underRoot(const char* literal) {

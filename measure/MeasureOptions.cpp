@@ -9,7 +9,7 @@
 
 #include <string_view>
 
-#include "platform/WideBytes.h"
+#include "base/WideBytes.h"
 
 namespace {
 
@@ -93,7 +93,7 @@ constexpr std::string_view password = "-pwd";
 std::string measure::optionsText(const NerovaMeasureParams& params) {
     std::string text;
     for (const auto& [name, member] : options) {
-        const std::string value = platform::bytesFromWide((params.*member).ToStdWstring());
+        const std::string value = base::bytesFromWide((params.*member).ToStdWstring());
         if (name == password) {
             text.append(name).append("\n\"").append(value).append("\"\n");
         } else if (!value.empty()) {

@@ -2,8 +2,9 @@
 
 #include <algorithm>
 
-#include <dlfcn.h>
 #include <unicode/ucnv.h>
+
+#include "base/SharedObject.h"
 
 namespace platform {
 namespace {
@@ -24,18 +25,16 @@ static_assert(croatian.size() == upperSize && romanian.size() == upperSize);
 
 // ICU's functions bear its version in their names, which its headers hide behind macros.
 #define TINTGATE_TEXT(name) #name
-#define TINTGATE_ICU_FUNCTION(library, name)                                                       \
-    reinterpret_cast<decltype(&name)>(dlsym(library, TINTGATE_TEXT(name)))
+#define TINTGATE_FIND(function, name)                                                              \
+    decltype(&name) function = nullptr;                                                            \
+    library.find(TINTGATE_TEXT(name), function)
 
 /// The upper half of a converter, or nothing. The library stays open: it keeps caches of its own.
 std::u16string upperFromIcu(const char* converter) {
-    void* const library = dlopen("libicuuc.so." U_ICU_VERSION_SHORT, RTLD_NOW | RTLD_LOCAL);
-    if (library == nullptr) {
-        return {};
-    }
-    const auto open = TINTGATE_ICU_FUNCTION(library, ucnv_open);
-    const auto toUChars = TINTGATE_ICU_FUNCTION(library, ucnv_toUChars);
-    const auto close = TINTGATE_ICU_FUNCTION(library, ucnv_close);
+    const base::SharedObject library("libicuuc.so." U_ICU_VERSION_SHORT);
+    TINTGATE_FIND(open, ucnv_open);
+    TINTGATE_FIND(toUChars, ucnv_toUChars);
+    TINTGATE_FIND(close, ucnv_close);
     if (open == nullptr || toUChars == nullptr || close == nullptr) {
         return {};
     }
@@ -51,7 +50,7 @@ std::u16string upperFromIcu(const char* converter) {
     return U_SUCCESS(status) && length == upperSize ? upper : std::u16string();
 }
 
-#undef TINTGATE_ICU_FUNCTION
+#undef TINTGATE_FIND
 #undef TINTGATE_TEXT
 
 } // namespace

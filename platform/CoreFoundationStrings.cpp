@@ -5,7 +5,7 @@
 #include <string_view>
 
 #include "platform/CodePage.h"
-#include "platform/Utf8.h"
+#include "base/Utf8.h"
 
 namespace {
 
@@ -21,7 +21,7 @@ std::optional<std::u16string> decodeUtf8(std::string_view text) {
     std::u16string units;
     units.reserve(text.size());
     while (!text.empty()) {
-        const auto c = platform::takeUtf8(text);
+        const auto c = base::takeUtf8(text);
         if (!c) {
             return std::nullopt;
         }
@@ -43,10 +43,10 @@ std::optional<std::string> encodeUtf8(std::u16string_view units) {
         if (isHighSurrogate(units[i]) && i + 1 < units.size() && isLowSurrogate(units[i + 1])) {
             c = 0x10000 + ((c & 0x3FF) << 10 | (units[++i] & 0x3FF));
         }
-        if (!platform::isCharacter(c)) {
+        if (!base::isCharacter(c)) {
             return std::nullopt;
         }
-        platform::appendUtf8(text, c);
+        base::appendUtf8(text, c);
     }
     return text;
 }

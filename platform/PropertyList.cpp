@@ -2,15 +2,15 @@
 
 #include <charconv>
 #include <cstdint>
-#include <cstdlib>
 #include <ctime>
 #include <filesystem>
 #include <fstream>
 #include <limits>
-#include <type_traits>
 
-#include <dlfcn.h>
 #include <plist/plist.h>
+
+#include "base/Malloc.h"
+#include "base/SharedObject.h"
 
 namespace platform {
 
@@ -34,21 +34,14 @@ struct LibPlist {
 #undef TINTGATE_LIBPLIST_MEMBER
 };
 
-/// Opened with the first list that is read, since it would cost every program that can read one a
-/// twentieth of its start. Nothing where the library is not installed.
+/// Opens the library with the first list that is read: linked, it would cost every program that can
+/// read a list a twentieth of its start. Returns nothing if the library is not installed.
 std::optional<LibPlist> loadLibPlist() {
-    void* const library = dlopen("libplist-2.0.so.3", RTLD_NOW | RTLD_LOCAL);
-    if (library == nullptr) {
-        return std::nullopt;
-    }
+    const base::SharedObject library("libplist-2.0.so.3");
     LibPlist functions;
     bool complete = true;
-    const auto find = [&](auto& function, const char* name) {
-        function =
-            reinterpret_cast<std::remove_reference_t<decltype(function)>>(dlsym(library, name));
-        complete = complete && function != nullptr;
-    };
-#define TINTGATE_LIBPLIST_FIND(name) find(functions.name, "plist_" #name);
+#define TINTGATE_LIBPLIST_FIND(name)                                                               \
+    complete = library.find("plist_" #name, functions.name) && complete;
     TINTGATE_LIBPLIST_FUNCTIONS(TINTGATE_LIBPLIST_FIND)
 #undef TINTGATE_LIBPLIST_FIND
     return complete ? std::optional(functions) : std::nullopt;
@@ -59,10 +52,7 @@ const std::optional<LibPlist>& libPlist() {
     return functions;
 }
 
-struct FreeText {
-    void operator()(char* text) const { std::free(text); }
-};
-using OwnedText = std::unique_ptr<char, FreeText>;
+using OwnedText = base::Malloced<char>;
 
 std::optional<std::string> readFile(const std::string& path) {
     std::error_code failure;

@@ -18,7 +18,7 @@
 #include "store/StoreEngine.h"
 #include "store/Users.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "platform/WideBytes.h"
+#include "base/WideBytes.h"
 
 namespace {
 
@@ -163,7 +163,7 @@ int main() {
     engine->create(3, job);
 
     KZVerifyJobProcessor processor;
-    processor.m_connector = new CKZConnector(platform::wideFromBytes(address), L"bench", L"bench",
+    processor.m_connector = new CKZConnector(base::wideFromBytes(address), L"bench", L"bench",
                                              0x5071103, false, false);
     check(processor.m_connector->IsLoggedIn(), "the login");
     ComGUIManager& manager = *processor.m_connector->getComGUIMngrInstance();

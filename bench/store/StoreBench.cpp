@@ -17,7 +17,7 @@
 #include "store/StoreEngine.h"
 #include "store/StoreKeep.h"
 #include "store/Users.h"
-#include "platform/WideBytes.h"
+#include "base/WideBytes.h"
 
 namespace {
 
@@ -85,7 +85,7 @@ int main() {
         bare.run("COMMIT");
     }
 
-    CKZConnector connector(platform::wideFromBytes(address), L"bench", L"bench", 0x5071103, false,
+    CKZConnector connector(base::wideFromBytes(address), L"bench", L"bench", 0x5071103, false,
                            false);
     check(connector.IsLoggedIn(), "the login");
     ComGUIManager& manager = *connector.getComGUIMngrInstance();

@@ -13,7 +13,7 @@
 #include "StoreTest.h"
 #include "SuiteRoot.h"
 #include "store/Users.h"
-#include "platform/WideBytes.h"
+#include "base/WideBytes.h"
 
 namespace {
 
@@ -34,7 +34,7 @@ class ComGUIPlugIn : public StoreTest {
     /// Hashing is slow by intent.
     inline static const std::string hash = store::passwordHash("room");
     const support::SuiteRoot root;
-    const std::wstring here = platform::wideFromBytes(address);
+    const std::wstring here = base::wideFromBytes(address);
 };
 ON_BOTH_ENGINES(ComGUIPlugIn);
 
@@ -100,9 +100,9 @@ TEST_F(ComGUISlots, AddressesArriveOneByteACharacterAndAreLimited) {
     longest.resize(127, 'x');
     const std::tuple<std::string, std::wstring, bool> addresses[] = {
         // Given in UTF-8, as the tool's arguments are; it reaches the plug-in as Latin-1.
-        {folder.path("Größe"), platform::wideFromBytes(folder.path()) + L"/Gr\u00F6\u00DFe", true},
-        {longest, platform::wideFromBytes(longest), true},
-        {longest + "x", platform::wideFromBytes(longest + "x"), false},
+        {folder.path("Größe"), base::wideFromBytes(folder.path()) + L"/Gr\u00F6\u00DFe", true},
+        {longest, base::wideFromBytes(longest), true},
+        {longest + "x", base::wideFromBytes(longest + "x"), false},
     };
     std::string last = address;
     for (const auto& [path, given, isReached] : addresses) {

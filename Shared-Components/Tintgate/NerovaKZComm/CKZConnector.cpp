@@ -10,7 +10,7 @@
 #include <utility>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
-#include "platform/WideBytes.h"
+#include "base/WideBytes.h"
 #include "text/StringUtilsComGUI.h"
 #include "ticket/ParameterTables.h"
 
@@ -22,7 +22,7 @@ constexpr int jobTickets = 3;
 
 // UTF-8, but byte for byte where a path is none.
 std::string pathBytes(const wxString& path) {
-    return platform::bytesFromWide(path.ToStdWstring());
+    return base::bytesFromWide(path.ToStdWstring());
 }
 
 bool isRegularFile(const std::string& path) {

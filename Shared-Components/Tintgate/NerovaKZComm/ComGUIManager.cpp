@@ -8,7 +8,7 @@
 #include "measure/Helper.h"
 #include "platform/PlugIn.h"
 #include "platform/SystemRoot.h"
-#include "platform/WideBytes.h"
+#include "base/WideBytes.h"
 #include "text/CharSets.h"
 #include "text/CharSetsWx.h"
 #include "text/StringUtilsComGUI.h"
@@ -95,7 +95,7 @@ int ComGUIManager::RegisterPlugIn(__CFBundle** plugIn) {
     std::wstring suite = Helper::GetHWBInstallationPath().ToStdWstring();
     if (suite.empty()) {
         suite =
-            platform::wideFromBytes(platform::systemRoot()); // What follows is a fixed path then.
+            base::wideFromBytes(platform::systemRoot()); // What follows is a fixed path then.
     }
     const std::wstring path =
         suite + static_cast<wchar_t>(wxFileName::GetPathSeparator()) + L"lib/" + pszLibName;

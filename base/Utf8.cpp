@@ -1,12 +1,12 @@
-#include "platform/Utf8.h"
+#include "base/Utf8.h"
 
 #include <iterator>
 
-namespace platform {
+namespace base {
 namespace {
 
-/// Lead bytes of UTF-8 by the number of bytes that follow, and the smallest character that needs
-/// as many.
+/// Lead bytes by the number of bytes that follow, each with the smallest character that needs this
+/// many.
 constexpr struct {
     unsigned char mask;
     unsigned char lead;
@@ -41,6 +41,15 @@ std::optional<char32_t> takeUtf8(std::string_view& text) {
     return std::nullopt;
 }
 
+bool isUtf8(std::string_view text) {
+    while (!text.empty()) {
+        if (!takeUtf8(text)) {
+            return false;
+        }
+    }
+    return true;
+}
+
 void appendUtf8(std::string& text, char32_t c) {
     std::size_t following = std::size(sequences) - 1;
     while (c < sequences[following].smallest) {
@@ -52,4 +61,12 @@ void appendUtf8(std::string& text, char32_t c) {
     }
 }
 
-} // namespace platform
+std::string utf8FromLatin1(std::string_view text) {
+    std::string utf8;
+    for (const char c : text) {
+        appendUtf8(utf8, static_cast<unsigned char>(c));
+    }
+    return utf8;
+}
+
+} // namespace base
