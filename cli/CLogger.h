@@ -9,9 +9,10 @@
 #include <string>
 
 /// One process-wide log with at most one open file. For the main thread alone: nothing is locked.
+/// It belongs to the program; a module that the program loads writes to the same log.
 ///
 /// Nothing is flushed before DeleteLogger, so a crash can lose the tail of a trace.
-class CLogger {
+class __attribute__((visibility("default"))) CLogger {
   public:
     /// Opens `fileName`, replacing its contents; if a log is open already, the name is ignored.
     ///

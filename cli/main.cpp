@@ -5,37 +5,33 @@
 #include <clocale>
 #include <cstdio>
 #include <cstring>
+#include <filesystem>
 #include <string>
+#include <system_error>
 
 #include <langinfo.h>
 #include <malloc.h>
 
-#include <wx/debug.h>
-#include <wx/init.h>
-#include <wx/log.h>
-
 #include "ExitCodes.h"
+#include "base/SharedObject.h"
+#include "base/TextFile.h"
 #include "cli/CLogger.h"
 #include "cli/HelpText.h"
+#include "cli/JobForm.h"
 #include "job/AnalysisLibrary.h"
-#include "job/JobFiles.h"
-#include "job/KZVerifyJobProcessor.h"
 #include "platform/TemporaryFolder.h"
 
 namespace {
 
-/// The tool's own version; that of the library is a matter of its own.
-constexpr int toolVersion[] = {1, 6, 20};
+using cli::toolVersion;
 
 /// Texts and file names are taken as the user's locale has them, and as UTF-8 where that can't hold
-/// every character. Numbers keep their point. wx is to stay silent whatever happens.
+/// every character. Numbers keep their point.
 void prepareProcess() {
     const char* locale = std::setlocale(LC_CTYPE, "");
     if (locale == nullptr || std::strcmp(nl_langinfo(CODESET), "UTF-8") != 0) {
         std::setlocale(LC_CTYPE, "C.UTF-8");
     }
-    wxDisableAsserts();
-    wxLog::EnableLogging(false);
 }
 
 /// A run lives for milliseconds and allocates in ever larger pieces. To map each of them and to
@@ -99,13 +95,22 @@ int calculateSummary(char* arguments[], const char* patchSetPath) {
         return result;
     }
 
-    return writeTextFile(arguments[4], json) ? exitDone : exitResultNotWritten;
+    return base::writeTextInPlace(arguments[4], json) ? exitDone : exitResultNotWritten;
 }
 
-/// What stands behind the last ":" of an argument, or all of it.
-std::wstring valueOf(const char* argument) {
-    const std::wstring text = stringToWstring(argument);
-    return text.substr(text.rfind(L':') + 1); // Without a ":", from the start.
+/// Null if the module is not where it was installed, seen from the program.
+cli::VerifyJob loadJobForm() {
+    std::error_code failure;
+    const auto program = std::filesystem::read_symlink("/proc/self/exe", failure);
+    for (const char* const folder : {"../lib", TINTGATE_LIBRARIES_FROM_PROGRAMS}) {
+        const base::SharedObject module(
+            (program.parent_path() / folder / "tintgate/TintgateJob.so").c_str());
+        cli::VerifyJob verify = nullptr;
+        if (!failure && module.find(cli::verifyJobName, verify)) {
+            return verify;
+        }
+    }
+    return nullptr;
 }
 
 /// A client application starts one run for each job, and looks at nothing but its exit code. An
@@ -114,19 +119,8 @@ int verifyJob(int count, char* arguments[]) {
     if (std::strstr(arguments[1], "KEY_KZ_HOST") == nullptr) {
         return exitJobFormRefused;
     }
-    const bool remeasure = count == 9 && std::strcmp(arguments[8], "KEY_KZ_REMEASURE:=:true") == 0;
-    const wxInitializer wx; // The file forms do without, which saves a part of their time.
-    KZVerifyJobProcessor processor;
-    unsigned int major = 0;
-    unsigned int minor = 0;
-    unsigned int patch = 0;
-    getLibVersion(major, minor, patch);
-    CLogger::GetLogger()->Log("Tintgate.exe verion = %d.%d.%d", toolVersion[0], toolVersion[1],
-                              toolVersion[2]);
-    CLogger::GetLogger()->Log("TintgateLib.dll verion = %u.%u.%u", major, minor, patch);
-    return processor.VerifyKZJob(valueOf(arguments[1]), valueOf(arguments[7]),
-                                 valueOf(arguments[6]), valueOf(arguments[3]),
-                                 valueOf(arguments[2]), valueOf(arguments[4]), remeasure);
+    const cli::VerifyJob verify = loadJobForm();
+    return verify == nullptr ? static_cast<int>(exitJobFormRefused) : verify(count, arguments);
 }
 
 } // namespace

@@ -12,9 +12,11 @@ execute_process(COMMAND ${WX_CONFIG} --libs base
 separate_arguments(_wx_cxxflags UNIX_COMMAND "${_wx_cxxflags}")
 separate_arguments(_wx_libs UNIX_COMMAND "${_wx_libs}")
 list(TRANSFORM _wx_cxxflags REPLACE "^-I" "-isystem")
+# The records at the library's boundary need no more of wx than what its headers bring inline.
+add_library(wxheaders INTERFACE)
+target_compile_options(wxheaders INTERFACE ${_wx_cxxflags})
 add_library(wx INTERFACE)
-target_compile_options(wx INTERFACE ${_wx_cxxflags})
-target_link_libraries(wx INTERFACE ${_wx_libs})
+target_link_libraries(wx INTERFACE wxheaders ${_wx_libs})
 
 pkg_check_modules(lcms2 REQUIRED IMPORTED_TARGET lcms2)
 # Opened when a property list is read: only the headers are for building.

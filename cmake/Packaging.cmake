@@ -62,6 +62,8 @@ endforeach()
 add_custom_target(pages ALL DEPENDS ${_pages})
 
 install(TARGETS Tintgate RUNTIME COMPONENT tintgate)
+install(TARGETS TintgateJob LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}/tintgate"
+  COMPONENT tintgate)
 install(DIRECTORY presets/ DESTINATION "${_share}/presets" COMPONENT tintgate)
 install(FILES "${_made}/Tintgate.1.gz" DESTINATION "${CMAKE_INSTALL_MANDIR}/man1"
   COMPONENT tintgate)

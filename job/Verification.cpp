@@ -10,6 +10,7 @@
 #include "ExitCodes.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "cli/CLogger.h"
+#include "base/TextFile.h"
 #include "job/JobFiles.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "job/StripKeys.h"
@@ -71,7 +72,7 @@ bool isMeasured(const KZJobDataStruct& job) {
 /// Writes a file for the viewer, logging where that fails.
 bool writeForViewer(const wxString& path, const std::wstring& text, const char* complaint) {
     const std::string bytes = measure::pathBytes(path);
-    const bool written = writeTextFile(bytes, text) && fileExists(path);
+    const bool written = base::writeTextInPlace(bytes, text) && fileExists(path);
     if (!written) {
         CLogger::GetLogger()->Log("Resulting %s file not found = %s", complaint, bytes.c_str());
     }

@@ -1,5 +1,6 @@
 // The program as its callers see it: arguments in; exit code, standard output and files out.
 
+#include <filesystem>
 #include <regex>
 #include <string>
 #include <vector>
@@ -30,7 +31,7 @@ class MainTest : public testing::Test {
         RunOptions options;
         options.environment = std::move(settings);
         options.environment.insert({"TMPDIR", m_folder.path()});
-        arguments.insert(arguments.begin(), TINTGATE_PROGRAM);
+        arguments.insert(arguments.begin(), m_program);
         return support::run(arguments, options);
     }
 
@@ -46,6 +47,7 @@ class MainTest : public testing::Test {
     std::string calls() const { return contentsOf(m_folder.path("calls")); }
 
     support::ScratchFolder m_folder;
+    std::string m_program = TINTGATE_PROGRAM;
 };
 
 TEST_F(MainTest, TheArgumentCountDecides) {
@@ -92,6 +94,17 @@ TEST_F(MainTest, HelpHasItsLines) {
     EXPECT_EQ(std::count(text.begin(), text.end(), '\n'), 35);
     EXPECT_THAT(text, testing::HasSubstr("icc profile: \n")); // With a blank at its end.
     EXPECT_THAT(text, EndsWith("\n" + std::string(86, '*') + "\n\n"));
+}
+
+// The job form is a module beside the program's libraries; the file forms do without it and wx.
+TEST_F(MainTest, RefusesJobsWithoutTheModule) {
+    m_program = m_folder.path("Tintgate");
+    std::filesystem::copy_file(TINTGATE_PROGRAM, m_program);
+    EXPECT_EQ(runScripted({"file"}, {{"VALIDATE", "22"}}).exitCode, 22);
+    const std::vector<std::string> job = {"KEY_KZ_HOST:=:h", "1", "7", "en_US", "0", "p", "u"};
+    const Outcome refused = runScripted(job, {});
+    EXPECT_EQ(refused.exitCode, 255);
+    EXPECT_EQ(refused.output + refused.error, "");
 }
 
 // A caller that starts the program anew must not lose the result that it has.

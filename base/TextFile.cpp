@@ -1,0 +1,62 @@
+#include "base/TextFile.h"
+
+#include <algorithm>
+#include <climits>
+#include <cstddef>
+#include <cwchar>
+#include <fstream>
+#include <ostream>
+
+namespace base {
+namespace {
+
+/// Up to the first NUL, as the C library converts. A character that the encoding lacks fails the
+/// stream, and nothing of the piece is written.
+void writeConverted(std::ostream& stream, std::wstring_view piece) {
+    const std::wstring wide(piece);
+    const wchar_t* from = wide.c_str();
+    std::string narrow(wide.size() * MB_LEN_MAX + 1, '\0');
+    std::mbstate_t state = {};
+    const std::size_t size = std::wcsrtombs(narrow.data(), &from, narrow.size(), &state);
+    if (size == static_cast<std::size_t>(-1)) {
+        stream.setstate(std::ios::failbit);
+    } else {
+        stream.write(narrow.data(), static_cast<std::streamsize>(size));
+    }
+}
+
+/// In pieces, since the narrow copy of a large result would cost as much memory as the analysis
+/// itself. A piece of plain ASCII, as all of ours are, is narrowed here: the C library's converter
+/// would take a seventh of a whole run.
+void write(std::ostream& stream, std::wstring_view text) {
+    constexpr std::size_t pieceLength = 1 << 18;
+    std::string narrow;
+    for (; !text.empty() && stream; text.remove_prefix(std::min(pieceLength, text.size()))) {
+        const std::wstring_view piece = text.substr(0, pieceLength);
+        narrow.resize(piece.size());
+        wchar_t all = 0;
+        for (std::size_t i = 0; i < piece.size(); ++i) {
+            all |= piece[i];
+            narrow[i] = static_cast<char>(piece[i]);
+        }
+        if ((all & ~0x7F) == 0) {
+            stream << narrow;
+        } else {
+            writeConverted(stream, piece);
+        }
+    }
+}
+
+} // namespace
+
+bool writeTextInPlace(const std::string& path, std::wstring_view text) {
+    std::ofstream output(path, std::ios::out | std::ios::trunc);
+    if (!output) {
+        return false;
+    }
+    write(output, text);
+    output.close();
+    return output.good();
+}
+
+} // namespace base
