@@ -1,15 +1,17 @@
-# docs/exit-codes.csv is the one place that states exit codes; "ExitCodes.h" is made from it.
+# docs/exit-codes.csv is the one place that states exit codes, and docs/job-outcomes.csv the one that
+# states what they ask of whom in a job. "ExitCodes.h" is made from both.
 
 find_package(Python3 REQUIRED COMPONENTS Interpreter)
 
 set(_codes "${PROJECT_SOURCE_DIR}/docs/exit-codes.csv")
+set(_outcomes "${PROJECT_SOURCE_DIR}/docs/job-outcomes.csv")
 set(_maker "${PROJECT_SOURCE_DIR}/scripts/make-exit-codes.py")
 set(_header "${PROJECT_BINARY_DIR}/see/exitcodes/ExitCodes.h")
 
 file(MAKE_DIRECTORY "${PROJECT_BINARY_DIR}/see/exitcodes")
 add_custom_command(OUTPUT "${_header}"
   COMMAND Python3::Interpreter "${_maker}" header "${_codes}" "${_header}"
-  DEPENDS "${_codes}" "${_maker}"
+  DEPENDS "${_codes}" "${_outcomes}" "${_maker}"
   COMMENT "Making ExitCodes.h from docs/exit-codes.csv" VERBATIM)
 add_custom_target(exitcodes_header DEPENDS "${_header}")
 

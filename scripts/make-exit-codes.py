@@ -1,16 +1,21 @@
 #!/usr/bin/env python3
-"""Makes from docs/exit-codes.csv whatever states exit codes, so that each is said in one place.
+"""Makes whatever states exit codes, so that each is described in one place: docs/exit-codes.csv
+describes the codes, docs/job-outcomes.csv beside it what those that a job can end with ask of whom.
 
 make-exit-codes.py header docs/exit-codes.csv ExitCodes.h
 make-exit-codes.py man    docs/exit-codes.csv page.1.in page.1
 make-exit-codes.py table  docs/exit-codes.csv exit-codes.md
+make-exit-codes.py jobs   docs/exit-codes.csv docs/jobs.md    replaces the page's table of outcomes
+make-exit-codes.py check  docs/exit-codes.csv docs/jobs.md    fails if that table is out of date
 """
 
 import csv
+import re
 import sys
+from pathlib import Path
 
 HEADER = """\
-// Made from docs/exit-codes.csv; change that file instead.
+// Made from docs/exit-codes.csv and docs/job-outcomes.csv; change those files instead.
 #pragma once
 
 /// Exit codes of the tool, and statuses of the analysis library. One code for one cause.
@@ -19,13 +24,16 @@ enum ExitCode : int {{
 }};
 
 /// What a code means to the person who meets it. All texts are ASCII, without a full stop at their
-/// end, and neither empty nor null.
+/// end, and neither empty nor null. The last three are null if no job ends with the code.
 struct ExitCodeText {{
     int code;
     const char* name;
     const char* meaning;
     const char* cause;
     const char* remedy;
+    const char* jobCause; ///< What causes the code in a job: often `cause`.
+    const char* jobActor; ///< Who can change the outcome: client, operator or administrator.
+    const char* jobRetry; ///< Whether the same call can help: begins with no, after a fix, or yes.
 }};
 
 /// Every code, in rising order.
@@ -34,19 +42,51 @@ inline constexpr ExitCodeText exitCodeTexts[] = {{
 }};
 """
 
+ACTORS = ("client", "operator", "administrator")
+RETRIES = r"(no|after a fix|yes)(,.+)?"
+BLOCK_START = (
+    "<!-- Made from exit-codes.csv and job-outcomes.csv by scripts/make-exit-codes.py. -->\n\n"
+)
+BLOCK_END = "\n<!-- End of the table. -->\n"
 
-def rows_of(path):
+
+def read(path, columns):
+    """The rows by their codes."""
     with open(path, newline="", encoding="utf-8") as source:
-        rows = list(csv.DictReader(source))
+        rows = list(csv.DictReader(source, strict=True))
     codes = [int(row["code"]) for row in rows]
     if codes != sorted(set(codes)) or codes[-1] > 255:
         sys.exit(f"{path}: codes repeat, do not rise or are no exit codes")
     for row in rows:
-        for part in ("name", "from", "meaning", "cause", "remedy"):
-            text = row[part]
+        for column in columns:
+            text = row[column]
             if not text or not text.isascii() or text.endswith("."):
-                sys.exit(f"{path}: {row['code']}: '{part}' is empty, not ASCII or ends with a stop")
-    return rows
+                sys.exit(f"{path}: {row['code']}: '{column}' is empty, not ASCII or ends with a stop")
+    return dict(zip(codes, rows))
+
+
+def outcomes_of(path, codes):
+    """Of the codes that a job can end with: the row, with the code's own cause if it has none."""
+    outcomes = read(path, ("who", "retry"))
+    for code, row in outcomes.items():
+        if code not in codes:
+            sys.exit(f"{path}: there is no exit code {code}")
+        row["job_cause"] = row["job_cause"] or codes[code]["cause"]
+        if not set(row["who"].split(", ")) <= set(ACTORS):
+            sys.exit(f"{path}: {code}: '{row['who']}' are not {', '.join(ACTORS)}")
+        if not re.fullmatch(RETRIES, row["retry"]):
+            sys.exit(f"{path}: {code}: '{row['retry']}' does not begin with a known answer")
+    missing = [code for code, row in codes.items() if row["from"] == "job" and code not in outcomes]
+    if missing:
+        sys.exit(f"{path}: codes of jobs without an outcome: {missing}")
+    return outcomes
+
+
+def rows_of(path):
+    """All codes in rising order; "job" is the outcome, or None."""
+    codes = read(path, ("name", "from", "meaning", "cause", "remedy"))
+    outcomes = outcomes_of(Path(path).with_name("job-outcomes.csv"), codes)
+    return [row | {"job": outcomes.get(code)} for code, row in codes.items()]
 
 
 def c_text(text):
@@ -57,18 +97,28 @@ def roff(text):
     return text.replace("\\", "\\e").replace("-", "\\-").replace("'", "\\(aq")
 
 
+def initializer(row):
+    texts = [c_text(row[part]) for part in ("name", "meaning", "cause", "remedy")]
+    if row["job"]:
+        texts += [c_text(row["job"][part]) for part in ("job_cause", "who", "retry")]
+    else:
+        texts += ["nullptr"] * 3
+    return f"    {{{row['code']}, " + ",\n     ".join(texts) + "},"
+
+
 def header(rows):
     return HEADER.format(
         enumerators="\n".join(
             f"    exit{row['name']} = {row['code']}, ///< {row['meaning']}." for row in rows
         ),
-        rows="\n".join(
-            "    {%s, %s, %s,\n     %s,\n     %s}," % (
-                row["code"], c_text(row["name"]), c_text(row["meaning"]),
-                c_text(row["cause"]), c_text(row["remedy"]))
-            for row in rows
-        ),
+        rows="\n".join(map(initializer, rows)),
     )
+
+
+def own_job_cause(row):
+    """The cause in a job, if it differs from the code's."""
+    job = row["job"]
+    return job["job_cause"] if job and job["job_cause"] != row["cause"] else None
 
 
 def man(rows, template):
@@ -76,28 +126,65 @@ def man(rows, template):
     for row in rows:
         lines += [".TP", f".B {row['code']}", roff(row["meaning"] + ".")]
         lines += [roff(row[part] + ".") for part in ("cause", "remedy")]
+        if own_job_cause(row):
+            lines += [roff(f"In a job: {own_job_cause(row)}.")]
     with open(template, encoding="utf-8") as source:
         return source.read().replace("@EXIT_CODES@", "\n".join(lines))
 
 
+def markdown(heads, rows):
+    lines = [heads, ("---",) * len(heads), *rows]
+    return "".join("| " + " | ".join(cells) + " |\n" for cells in lines)
+
+
+def stars(text):
+    """L*a*b* is not emphasis."""
+    return text.replace("*", "\\*")
+
+
 def table(rows):
     parts = ("code", "from", "meaning", "cause", "remedy")
-    lines = [parts, ("---",) * len(parts), *([row[part] for part in parts] for row in rows)]
     return (
         "# Exit codes\n\n"
-        "Of the tool itself, of a job on the print server, and of the analysis library.\n\n"
-        + "".join("| " + " | ".join(cells) + " |\n" for cells in lines)
+        "Of the tool itself, of a job on the print server, and of the analysis library. "
+        "What a client does with those of a job is in jobs.md.\n\n"
+        + markdown((*parts, "cause in a job"),
+                   [[stars(row[part]) for part in parts] + [stars(own_job_cause(row) or "")]
+                    for row in rows])
     )
 
 
+def outcomes(rows):
+    return markdown(
+        ("Code", "Meaning", "Cause in a job", "Who acts", "Retry"),
+        [[row["code"], *(stars(text) for text in (row["meaning"], row["job"]["job_cause"])),
+          row["job"]["who"], row["job"]["retry"]] for row in rows if row["job"]],
+    )
+
+
+def with_outcomes(rows, page):
+    """The page with the present table in place of the one between its marks."""
+    head, start, rest = page.partition(BLOCK_START)
+    _, end, tail = rest.partition(BLOCK_END)
+    if not start or not end:
+        sys.exit("the page lacks the marks of its table")
+    return head + start + outcomes(rows) + end + tail
+
+
 def main(arguments):
-    kind, source = arguments[0], rows_of(arguments[1])
-    if kind == "man":
-        text = man(source, arguments[2])
+    kind, rows, target = arguments[0], rows_of(arguments[1]), Path(arguments[-1])
+    if kind in ("jobs", "check"):
+        page = target.read_text(encoding="utf-8")
+        text = with_outcomes(rows, page)
+        if kind == "check" and text != page:
+            sys.exit(f"{target} is out of date: run "
+                     f"scripts/make-exit-codes.py jobs docs/exit-codes.csv docs/jobs.md")
+    elif kind == "man":
+        text = man(rows, arguments[2])
     else:
-        text = {"header": header, "table": table}[kind](source)
-    with open(arguments[-1], "w", encoding="utf-8") as target:
-        target.write(text)
+        text = {"header": header, "table": table}[kind](rows)
+    if kind != "check":
+        target.write_text(text, encoding="utf-8")
 
 
 if __name__ == "__main__":

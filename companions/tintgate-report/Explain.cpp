@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <iterator>
+#include <string_view>
 
 #include "ExitCodes.h"
 #include "companions/tintgate-report/Failure.h"
@@ -9,7 +10,7 @@
 namespace reporting {
 namespace {
 
-/// The text behind its label, broken at blanks to lines that fit a terminal.
+/// The text after its label, broken at blanks to lines that fit a terminal.
 std::string paragraph(const std::string& label, const std::string& text) {
     constexpr std::size_t indent = 8;
     constexpr std::size_t width = 79;
@@ -33,6 +34,16 @@ std::string paragraph(const std::string& label, const std::string& text) {
     return lines + '\n';
 }
 
+/// What a code means if a job on the print server ended with it.
+std::string jobParagraph(const ExitCodeText& code) {
+    std::string text;
+    if (std::string_view(code.jobCause) != code.cause) {
+        text += code.jobCause + std::string(". ");
+    }
+    text += "Who acts: " + std::string(code.jobActor) + ". Retry: " + code.jobRetry + ".";
+    return paragraph("Job", text);
+}
+
 } // namespace
 
 std::string explanationOf(int code) {
@@ -44,9 +55,13 @@ std::string explanationOf(int code) {
                           (code > 128 && code < 160 ? "; a shell gives 128 and the number of the "
                                                       "signal that ended a program"
                                                     : ""));
-    return paragraph(std::to_string(code), found->meaning + std::string(".")) +
-           paragraph("Cause", found->cause + std::string(".")) +
-           paragraph("Remedy", found->remedy + std::string("."));
+    std::string text = paragraph(std::to_string(code), found->meaning + std::string(".")) +
+                       paragraph("Cause", found->cause + std::string(".")) +
+                       paragraph("Remedy", found->remedy + std::string("."));
+    if (found->jobActor != nullptr) {
+        text += jobParagraph(*found);
+    }
+    return text;
 }
 
 } // namespace reporting

@@ -117,10 +117,22 @@ TEST_F(ReportProgram, SaysTheVerdictByItsExitStatusAlone) {
 }
 
 TEST_F(ReportProgram, ExplainsExitCodes) {
-    const ExitCodeText& code = std::end(exitCodeTexts)[-1];
-    const std::string words = report({"--explain", std::to_string(code.code)}).output;
-    EXPECT_THAT(std::regex_replace(words, std::regex("\\s+"), " "),
-                AllOf(HasSubstr(code.meaning), HasSubstr(code.cause), HasSubstr(code.remedy)));
+    const auto explained = [&](int code) {
+        const std::string words = report({"--explain", std::to_string(code)}).output;
+        return std::regex_replace(words, std::regex("\\s+"), " ");
+    };
+    for (const ExitCodeText& code : exitCodeTexts) {
+        const std::string words = explained(code.code);
+        EXPECT_THAT(words, AllOf(HasSubstr(code.meaning), HasSubstr(code.cause),
+                                 HasSubstr(code.remedy)));
+        EXPECT_EQ(words.find(" Job ") != std::string::npos, code.jobActor != nullptr) << words;
+        if (code.jobActor != nullptr) {
+            EXPECT_THAT(words, AllOf(HasSubstr(code.jobCause), HasSubstr(code.jobActor),
+                                     HasSubstr(code.jobRetry)));
+            // A cause that is the same in a job is not repeated.
+            EXPECT_EQ(words.find(code.jobCause), words.rfind(code.jobCause)) << words;
+        }
+    }
     EXPECT_EQ(report({"--explain", "104"}).exitCode, 9);
     EXPECT_THAT(report({"--explain", "139"}).error, HasSubstr("signal"));
 }
