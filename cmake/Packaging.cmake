@@ -15,6 +15,7 @@ set(_made "${PROJECT_BINARY_DIR}/docs")
 set(_codes "${PROJECT_SOURCE_DIR}/docs/exit-codes.csv")
 set(_outcomes "${PROJECT_SOURCE_DIR}/docs/job-outcomes.csv")
 set(_maker "${PROJECT_SOURCE_DIR}/scripts/make-exit-codes.py")
+set(_tables "${PROJECT_SOURCE_DIR}/scripts/tables.py")
 set(_page "${PROJECT_SOURCE_DIR}/docs/Tintgate.1.in")
 set(_changes "${PROJECT_SOURCE_DIR}/debian/changelog")
 set(_pages "${_made}/exit-codes.md" "${_made}/Tintgate.1.gz" "${_made}/changelog.gz")
@@ -26,7 +27,7 @@ add_custom_command(OUTPUT ${_pages}
   COMMAND Python3::Interpreter "${_maker}" man "${_codes}" "${_page}" "${_made}/Tintgate.1"
   COMMAND ${GZIP} -9nc "${_made}/Tintgate.1" > "${_made}/Tintgate.1.gz"
   COMMAND ${GZIP} -9nc "${_changes}" > "${_made}/changelog.gz"
-  DEPENDS "${_codes}" "${_outcomes}" "${_maker}" "${_page}" "${_changes}"
+  DEPENDS "${_codes}" "${_outcomes}" "${_maker}" "${_tables}" "${_page}" "${_changes}"
   COMMENT "Making the pages that list exit codes" VERBATIM)
 
 # Programs that explain themselves: name of the page, and the target that is asked.

@@ -9,10 +9,13 @@ make-exit-codes.py jobs   docs/exit-codes.csv docs/jobs.md    replaces the page'
 make-exit-codes.py check  docs/exit-codes.csv docs/jobs.md    fails if that table is out of date
 """
 
-import csv
 import re
 import sys
 from pathlib import Path
+
+sys.dont_write_bytecode = True  # The source tree stays as it is.
+from tables import (c_text, expect_rising, markdown, read, replaced, roff,  # noqa: E402
+                    write_or_check)
 
 HEADER = """\
 // Made from docs/exit-codes.csv and docs/job-outcomes.csv; change those files instead.
@@ -50,24 +53,16 @@ BLOCK_START = (
 BLOCK_END = "\n<!-- End of the table. -->\n"
 
 
-def read(path, columns):
-    """The rows by their codes."""
-    with open(path, newline="", encoding="utf-8") as source:
-        rows = list(csv.DictReader(source, strict=True))
+def by_code(path, columns):
+    rows = read(path, columns)
     codes = [int(row["code"]) for row in rows]
-    if codes != sorted(set(codes)) or codes[-1] > 255:
-        sys.exit(f"{path}: codes repeat, do not rise or are no exit codes")
-    for row in rows:
-        for column in columns:
-            text = row[column]
-            if not text or not text.isascii() or text.endswith("."):
-                sys.exit(f"{path}: {row['code']}: '{column}' is empty, not ASCII or ends with a stop")
+    expect_rising(path, codes)
     return dict(zip(codes, rows))
 
 
 def outcomes_of(path, codes):
     """Of the codes that a job can end with: the row, with the code's own cause if it has none."""
-    outcomes = read(path, ("who", "retry"))
+    outcomes = by_code(path, ("who", "retry"))
     for code, row in outcomes.items():
         if code not in codes:
             sys.exit(f"{path}: there is no exit code {code}")
@@ -84,17 +79,9 @@ def outcomes_of(path, codes):
 
 def rows_of(path):
     """All codes in rising order; "job" is the outcome, or None."""
-    codes = read(path, ("name", "from", "meaning", "cause", "remedy"))
+    codes = by_code(path, ("name", "from", "meaning", "cause", "remedy"))
     outcomes = outcomes_of(Path(path).with_name("job-outcomes.csv"), codes)
     return [row | {"job": outcomes.get(code)} for code, row in codes.items()]
-
-
-def c_text(text):
-    return '"' + text.replace("\\", "\\\\").replace('"', '\\"') + '"'
-
-
-def roff(text):
-    return text.replace("\\", "\\e").replace("-", "\\-").replace("'", "\\(aq")
 
 
 def initializer(row):
@@ -132,11 +119,6 @@ def man(rows, template):
         return source.read().replace("@EXIT_CODES@", "\n".join(lines))
 
 
-def markdown(heads, rows):
-    lines = [heads, ("---",) * len(heads), *rows]
-    return "".join("| " + " | ".join(cells) + " |\n" for cells in lines)
-
-
 def stars(text):
     """L*a*b* is not emphasis."""
     return text.replace("*", "\\*")
@@ -162,29 +144,18 @@ def outcomes(rows):
     )
 
 
-def with_outcomes(rows, page):
-    """The page with the present table in place of the one between its marks."""
-    head, start, rest = page.partition(BLOCK_START)
-    _, end, tail = rest.partition(BLOCK_END)
-    if not start or not end:
-        sys.exit("the page lacks the marks of its table")
-    return head + start + outcomes(rows) + end + tail
-
-
 def main(arguments):
     kind, rows, target = arguments[0], rows_of(arguments[1]), Path(arguments[-1])
     if kind in ("jobs", "check"):
-        page = target.read_text(encoding="utf-8")
-        text = with_outcomes(rows, page)
-        if kind == "check" and text != page:
-            sys.exit(f"{target} is out of date: run "
-                     f"scripts/make-exit-codes.py jobs docs/exit-codes.csv docs/jobs.md")
-    elif kind == "man":
+        text = replaced(target, BLOCK_START, outcomes(rows), BLOCK_END)
+        write_or_check(target, text, kind == "check",
+                       "scripts/make-exit-codes.py jobs docs/exit-codes.csv docs/jobs.md")
+        return
+    if kind == "man":
         text = man(rows, arguments[2])
     else:
         text = {"header": header, "table": table}[kind](rows)
-    if kind != "check":
-        target.write_text(text, encoding="utf-8")
+    target.write_text(text, encoding="utf-8")
 
 
 if __name__ == "__main__":

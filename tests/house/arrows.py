@@ -62,8 +62,8 @@ EXPOSES = {
     "store": "StoreEngine",
 }
 
-# Made by the build for everybody who returns or explains an exit code.
-FOR_ALL = {"ExitCodes.h"}
+# Made by the build for everybody who returns or explains an exit code or a status.
+FOR_ALL = {"ExitCodes.h", "CompanionStatuses.h"}
 
 
 def seen_by(target):
