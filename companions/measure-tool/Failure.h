@@ -4,26 +4,12 @@
 #include <stdexcept>
 #include <string>
 
+#include "CompanionStatuses.h"
 #include "colour/Failure.h"
 
 namespace measuring {
 
-/// The exit status of the program. The numbers are in its help and in docs/measuring.md.
-enum class Status : int {
-    Done = 0,
-    BadOptions = 2,        ///< The options file can't be read, or asks for what can't be done.
-    BadSettings = 3,       ///< No settings, or settings that make no sense.
-    BadDefinition = 4,     ///< The definition can't be read.
-    NotMeasurable = 5,     ///< The virtual instrument can't print or measure such patches.
-    BadProfile = 6,        ///< The profile can't be used.
-    BadExport = 7,         ///< The exported measurement is not there or can't be used.
-    OtherPatches = 8,      ///< The exported measurement is not of the patches asked for.
-    NotWritten = 9,        ///< The result can't be written.
-    InstrumentFailed = 10, ///< As the settings wanted it.
-    Cancelled = 11,        ///< By a signal, or as the settings wanted it.
-    BadCommand = 64,       ///< The command line is not understood.
-    OutOfMemory = 70,
-};
+using Status = NerovaMeasureStatus; ///< Listed in docs/companion-statuses.csv.
 
 /// Ends the run. The text is a sentence for people, without a full stop.
 class Failure : public std::runtime_error {

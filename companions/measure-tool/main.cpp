@@ -53,20 +53,6 @@ Library/Preferences/NerovaMeasure.conf below TINTGATE_ROOT, else ~/.config/tintg
   delay = MILLISECONDS      for each patch
   mishap = fail             or cancel, hang, crash; mishap-at = PATCH
 
-Exit status:
-   0  the measurement is there
-   2  the options file can't be read, or asks for what can't be done
-   3  there are no settings, or they make no sense
-   4  the definition is missing or damaged
-   5  the virtual instrument can't measure such patches
-   6  the profile is missing or can't be used
-   7  the exported measurement is missing or can't be used
-   8  the exported measurement is of other patches
-   9  the measurement could not be written
-  10  the instrument failed, as the settings want it
-  11  cancelled
-  64  the command is not understood
-  70  out of memory
 )";
 
 int end(Status status) {
@@ -138,7 +124,9 @@ int run(const std::vector<std::string_view>& words) {
     if (words.size() != 1)
         return fail(Status::BadCommand, "not understood; --help tells how it is called");
     if (words[0] == "--help" || words[0] == "-h")
-        return std::fputs(help, stdout) < 0 ? end(Status::NotWritten) : end(Status::Done);
+        return end(std::fputs((std::string(help) + nerovaMeasureStatusHelp).c_str(), stdout) < 0
+                       ? Status::NotWritten
+                       : Status::Done);
     measure(readOptions(std::string(words[0])));
     return end(Status::Done);
 }

@@ -5,12 +5,13 @@
 
 #include <CLI/CLI.hpp>
 
+#include "CompanionStatuses.h"
 #include "companions/plist-reader/EntryWay.h"
 #include "platform/PropertyList.h"
 
 namespace {
 
-enum : int { found = 0, noSuchValue = 1, noPropertyList = 2, noCommand = 64, notWritten = 74 };
+using Status = PlistbuddyStatus; ///< Listed in docs/companion-statuses.csv.
 
 constexpr const char* footer = R"(
 Examples:
@@ -18,19 +19,18 @@ Examples:
   -c "Print :'Nerova Hue Workbench':library_path" packages.plist
   -c "Print :Folders:0" list.plist         first element of an array
 
-Exit codes:
-   0  the value is on standard output, with a line feed behind it
-   1  there is no such value, or it is a dictionary, an array or binary data
-   2  the file can't be read or is no property list
-  64  the command is not understood
-  74  the value could not be written)";
+)";
+
+int end(Status status) {
+    return static_cast<int>(status);
+}
 
 // A program reads what comes from here, so there are no words but on request.
-int fail(int code, bool verbose, const std::string& words) {
+int fail(Status status, bool verbose, const std::string& words) {
     if (verbose) {
         std::fprintf(stderr, "%s\n", words.c_str());
     }
-    return code;
+    return end(status);
 }
 
 std::string namesAt(const platform::PropertyList& list, const platform::PropertyList::Way& way) {
@@ -53,30 +53,30 @@ int main(int argumentCount, char** arguments) {
         ->type_name("COMMAND");
     app.add_option("file", path, "The property list")->required();
     app.add_flag("-v,--verbose", verbose, "Say on standard error what is wrong");
-    app.footer(footer);
+    app.footer(std::string(footer) + plistbuddyStatusHelp);
     try {
         app.parse(argumentCount, arguments);
     } catch (const CLI::ParseError& failure) {
-        return app.exit(failure) == 0 ? found : noCommand;
+        return app.exit(failure) == 0 ? end(Status::Done) : end(Status::BadCommand);
     }
 
     const auto way = parsePrintCommand(command);
     if (!way) {
-        return fail(noCommand, verbose, "Not understood: " + command);
+        return fail(Status::BadCommand, verbose, "Not understood: " + command);
     }
     const auto list = platform::PropertyList::read(path);
     if (!list) {
-        return fail(noPropertyList, verbose, "No property list: " + path);
+        return fail(Status::NoPropertyList, verbose, "No property list: " + path);
     }
     const auto value = list->text(*way);
     if (!value) {
-        return list->exists(*way) ? fail(noSuchValue, verbose,
+        return list->exists(*way) ? fail(Status::NoSuchValue, verbose,
                                          "Not a single value: " + command + namesAt(*list, *way))
-                                  : fail(noSuchValue, verbose, "Not there: " + command);
+                                  : fail(Status::NoSuchValue, verbose, "Not there: " + command);
     }
     std::fwrite(value->data(), 1, value->size(), stdout);
     std::fputc('\n', stdout);
     return std::fflush(stdout) == 0 && std::ferror(stdout) == 0
-               ? found
-               : fail(notWritten, verbose, "Not written");
+               ? end(Status::Done)
+               : fail(Status::NotWritten, verbose, "Not written");
 }

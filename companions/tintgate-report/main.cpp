@@ -50,20 +50,6 @@ which stand in a folder beside it (trend.html has trend-jobs), or where the view
 has made them. The times are those of the jobs, else those that the measurements
 tell, else those of the files.
 
-Exit status:
-   0  done; with --verdict: passed
-   1  with --verdict: failed
-   2  with --verdict: incomplete, or the result is missing or unreadable
-   3  a result or meta file is missing or can't be read
-   4  a result or meta file is broken
-   5  the output could not be written
-   6  the trend is there, but results that could not be read are not in it
-   7  there is no result that fits; nothing was written
-   8  the store can't be opened or read
-   9  there is no such exit code
-  10  a job's folder could not be looked at or removed
-  64  the command line is not understood
-  70  out of memory, or a fault of the program
 )";
 
 struct Options {
@@ -293,7 +279,7 @@ void addOptions(CLI::App& program, Options& options) {
         ->group(upkeep);
     program.add_flag("--dry-run", options.dryRun, "With --tidy: only say what would go")
         ->group(upkeep);
-    program.footer(footer);
+    program.footer(std::string(footer) + tintgateReportStatusHelp);
 }
 
 /// Days in words become times, and what does not go together is refused.

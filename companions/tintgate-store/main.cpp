@@ -37,25 +37,7 @@ Examples:
 
 Each command has a --help of its own. docs/stores.md shows how to set up a whole job.
 
-Exit status:
-   0  done
-   1  there is no such ticket, key, user, file or version
-   2  there is one already
-   3  a value, name, password or JSON file is refused; nothing was changed
-   4  there is no store at that address
-   5  the store is of an older format: tintgate-store upgrade
-   6  the store is of a newer format: use the newer program
-   7  the store can't be written by this user
-   8  there is no room left
-   9  others held the store for too long: try again
-  10  the store is damaged
-  11  the server path leads to no file inside the store
-  12  a file of this machine can't be read or written
-  13  anything else; the message tells
-  14  the server was lost on the way; a change may have been made: look, and try again
-  15  the JDF is not well-formed, or would mislead its update; nothing was changed
-  16  the JDF would be too large; nothing was changed
-  64  the command line is not understood)";
+)";
 
 int end(Status status) {
     return static_cast<int>(status);
@@ -143,7 +125,7 @@ int main(int argumentCount, char** arguments) {
     admin::addJobCommands(commands, invocation);
     admin::addJdfCommands(commands, invocation);
     admin::addCopyCommand(commands, invocation);
-    program.footer(footer);
+    program.footer(std::string(footer) + tintgateStoreStatusHelp);
     unmarkOptions(program);
     auto words = markedArguments(argumentCount, arguments);
     std::reverse(words.begin(), words.end()); // As CLI11 wants them.

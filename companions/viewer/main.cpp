@@ -9,6 +9,7 @@
 #include <unistd.h>
 #include <vector>
 
+#include "CompanionStatuses.h"
 #include "colour/ColourFile.h"
 #include "report/Meta.h"
 #include "report/Page.h"
@@ -20,17 +21,7 @@
 
 namespace {
 
-enum : int {
-    done = 0,
-    metaMissing = 2,
-    metaBroken = 3,
-    resultMissing = 4,
-    resultBroken = 5,
-    pageNotWritten = 6,
-    pageNotOpened = 7,
-    commandNotUnderstood = 64,
-    outOfMemory = 70
-};
+using Status = NerovaVerifyStatus; ///< Listed in docs/companion-statuses.csv.
 
 constexpr std::size_t mostBytes = std::size_t{1} << 30; ///< Of a result: millions of patches.
 
@@ -43,21 +34,15 @@ The page is written beside the meta file, as report-strip1-2024-05-01-123456.htm
 there is a display. PATH is all words behind -meta, with one blank in between. On a terminal the
 page's path is printed.
 
-Exit status:
-   0  the page is there, and opened where there is a display
-   2  the meta file is missing or can't be read
-   3  the meta file is broken
-   4  the result ("output.json" beside the meta file) is missing or can't be read
-   5  the result is broken
-   6  the page could not be written
-   7  the page is there but could not be opened
-  64  the command is not understood
-  70  out of memory
 )";
 
-int fail(int code, const std::string& words) {
+int end(Status status) {
+    return static_cast<int>(status);
+}
+
+int fail(Status status, const std::string& words) {
     std::fprintf(stderr, "Nerova Verify: %s\n", words.c_str());
-    return code;
+    return end(status);
 }
 
 bool read(const std::string& path, std::string& bytes) {
@@ -74,43 +59,43 @@ int show(const std::string& page) {
         std::printf("%s\n", page.c_str());
     std::string problem;
     if (viewer::hasDisplay() && !viewer::openFile(page, problem))
-        return fail(pageNotOpened, page + " is not opened: " + problem);
-    return done;
+        return fail(Status::PageNotOpened, page + " is not opened: " + problem);
+    return end(Status::Done);
 }
 
 int showReport(const std::string& metaPath) {
     std::string bytes;
     std::string problem;
     if (!read(metaPath, bytes))
-        return fail(metaMissing, "can't read " + metaPath);
+        return fail(Status::MetaMissing, "can't read " + metaPath);
     const std::optional<report::Meta> meta = report::readMeta(bytes, problem);
     if (!meta)
-        return fail(metaBroken, metaPath + " is broken: " + problem);
+        return fail(Status::MetaBroken, metaPath + " is broken: " + problem);
     const std::string folder = folderOf(metaPath);
     const std::string resultPath = folder + "/output.json";
     if (!read(resultPath, bytes))
-        return fail(resultMissing, "can't read " + resultPath);
+        return fail(Status::ResultMissing, "can't read " + resultPath);
     const std::optional<report::Result> result = report::readResult(bytes, problem);
     if (!result)
-        return fail(resultBroken, resultPath + " is broken: " + problem);
+        return fail(Status::ResultBroken, resultPath + " is broken: " + problem);
     const std::string page =
         report::keepPage(folder, report::pageStem(*meta), report::pageOf(*result, &*meta), problem);
     if (page.empty())
-        return fail(pageNotWritten, "can't write a page in " + folder + ": " + problem);
+        return fail(Status::PageNotWritten, "can't write a page in " + folder + ": " + problem);
     return show(page);
 }
 
 int showIndex() {
     const std::string temporary = platform::temporaryFolder();
     if (temporary.empty())
-        return fail(pageNotWritten, "there is no temporary folder that may be used");
+        return fail(Status::PageNotWritten, "there is no temporary folder that may be used");
     // The tool's working folder, or the temporary folder as long as there is none.
     const std::string working = temporary + "/Tintgate";
     const std::string folder = access(working.c_str(), W_OK | X_OK) == 0 ? working : temporary;
     const std::string path = folder + "/reports.html";
     std::string problem;
     if (!report::replacePage(path, report::indexOf(report::reportsBelow(folder), folder), problem))
-        return fail(pageNotWritten, "can't write " + path + ": " + problem);
+        return fail(Status::PageNotWritten, "can't write " + path + ": " + problem);
     return show(path);
 }
 
@@ -118,10 +103,12 @@ int run(const std::vector<std::string_view>& words) {
     if (words.empty())
         return showIndex();
     if (words.size() == 1 && (words[0] == "--help" || words[0] == "-h"))
-        return std::fputs(help, stdout) < 0 ? pageNotWritten : done;
+        return end(std::fputs((std::string(help) + nerovaVerifyStatusHelp).c_str(), stdout) < 0
+                       ? Status::PageNotWritten
+                       : Status::Done);
     const std::size_t meta = words[0] == "-detail" ? 1 : 0;
     if (words.size() < meta + 2 || words[meta] != "-meta")
-        return fail(commandNotUnderstood, "not understood; --help tells how it is called");
+        return fail(Status::BadCommand, "not understood; --help tells how it is called");
     // Whoever starts this program does not quote the path, so blanks part it into words.
     std::string path(words[meta + 1]);
     for (std::size_t i = meta + 2; i < words.size(); ++i)
@@ -135,6 +122,6 @@ int main(int argumentCount, char** arguments) {
     try {
         return run({arguments + (argumentCount > 0), arguments + argumentCount});
     } catch (const std::bad_alloc&) {
-        return fail(outOfMemory, "out of memory");
+        return fail(Status::OutOfMemory, "out of memory");
     }
 }
