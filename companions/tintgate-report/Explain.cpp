@@ -34,13 +34,16 @@ std::string paragraph(const std::string& label, const std::string& text) {
     return lines + '\n';
 }
 
+/// Most codes of a job have several causes. This program can't know the job.
+constexpr char finder[] = "'tintgate-store diagnose JOB' names what is wrong with a job.";
+
 /// What a code means if a job on the print server ended with it.
 std::string jobParagraph(const ExitCodeText& code) {
     std::string text;
     if (std::string_view(code.jobCause) != code.cause) {
         text += code.jobCause + std::string(". ");
     }
-    text += "Who acts: " + std::string(code.jobActor) + ". Retry: " + code.jobRetry + ".";
+    text += "Who acts: " + std::string(code.jobActor) + ". Retry: " + code.jobRetry + ". " + finder;
     return paragraph("Job", text);
 }
 

@@ -128,7 +128,8 @@ TEST_F(ReportProgram, ExplainsExitCodes) {
         EXPECT_EQ(words.find(" Job ") != std::string::npos, code.jobActor != nullptr) << words;
         if (code.jobActor != nullptr) {
             EXPECT_THAT(words, AllOf(HasSubstr(code.jobCause), HasSubstr(code.jobActor),
-                                     HasSubstr(code.jobRetry)));
+                                     HasSubstr(code.jobRetry),
+                                     HasSubstr("tintgate-store diagnose")));
             // A cause that is the same in a job is not repeated.
             EXPECT_EQ(words.find(code.jobCause), words.rfind(code.jobCause)) << words;
         }
