@@ -76,30 +76,37 @@ install(DIRECTORY docs/ DESTINATION "${_doc}/tintgate" COMPONENT tintgate
 install(FILES docs/Tintgate.completion RENAME Tintgate
   DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions" COMPONENT tintgate)
 
-# The suite's installation, below the packages' root, less what the other package brings.
-function(install_suite_for component)
-  list(TRANSFORM ARGN PREPEND "\${_root}/" OUTPUT_VARIABLE _others)
-  list(JOIN _others "\" \"" _others)
+# Installs the suite into its root below the prefix. A package leaves out what the other package
+# installs. An installation without a component gets the whole suite, once.
+function(install_suite code component)
   install(CODE "
     set(_root \"\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/${TINTGATE_PACKAGE_ROOT}\")
     execute_process(COMMAND \"${CMAKE_COMMAND}\" --install \"${PROJECT_BINARY_DIR}\"
       --component companions --prefix \"\${CMAKE_INSTALL_PREFIX}/${TINTGATE_PACKAGE_ROOT}\"
       OUTPUT_QUIET COMMAND_ERROR_IS_FATAL ANY)
+    ${code}" COMPONENT ${component} ${ARGN})
+endfunction()
+function(install_suite_for component)
+  list(TRANSFORM ARGN PREPEND "\${_root}/" OUTPUT_VARIABLE _others)
+  list(JOIN _others "\" \"" _others)
+  install_suite("
     file(REMOVE_RECURSE \"${_others}\")
     file(GLOB_RECURSE _programs \"\${_root}/ComGUI\" \"\${_root}/Plistbuddy\"
       \"\${_root}/NerovaMeasure\" \"\${_root}/Nerova Verify\")
     execute_process(COMMAND \"${CMAKE_STRIP}\" --strip-unneeded \${_programs}
-      COMMAND_ERROR_IS_FATAL ANY)" COMPONENT ${component})
+      COMMAND_ERROR_IS_FATAL ANY)" ${component} EXCLUDE_FROM_ALL)
 endfunction()
+install_suite("" suite)
 install_suite_for(tintgate-comgui Applications Library/Preferences/NerovaMeasure.conf.example
   Library/Preferences/ApplicationsUsingNerovaMeasure_x64.plist)
 install_suite_for(tintgate-companions lib usr Library/Preferences/Qen)
-# A room's settings of the measuring tool belong to its administrator.
+# A room's settings of the measuring tool belong to its administrator. Without packages they are a
+# file in the root.
 install(CODE "
   set(_settings \"${TINTGATE_PACKAGE_ROOT}/Library/Preferences/NerovaMeasure.conf\")
   file(CREATE_LINK /etc/tintgate/measure.conf
     \"\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/\${_settings}\" SYMBOLIC)"
-  COMPONENT tintgate-companions)
+  COMPONENT tintgate-companions EXCLUDE_FROM_ALL)
 
 install(TARGETS libTintgate
   LIBRARY COMPONENT libtintgate1 NAMELINK_COMPONENT libtintgate-dev)

@@ -9,7 +9,8 @@ namespace platform {
 /// own. Asked afresh at every call.
 ///
 /// The environment variable TINTGATE_ROOT, else the one given at build time (the CMake variable of
-/// the same name). A root with a quote, a dollar sign, a backtick or a backslash counts as none: it
+/// the same name), else that of the installation to which the program belongs: an installed suite
+/// works wherever its prefix is. A program in a build tree belongs to none. A root with a quote, a dollar sign, a backtick or a backslash counts as none: it
 /// could not stand in a shell command.
 std::string systemRoot();
 
