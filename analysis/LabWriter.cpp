@@ -20,31 +20,42 @@ double sixDecimals(double value) {
 } // namespace
 
 int writeLab(const std::string& reference, const std::string& profile, const std::string& output) {
+    if (const int status = checkOutput(output, {reference, profile})) {
+        return status;
+    }
     colour::ColourFile file;
     const colour::CgatsWants wants{.spectra = false};
-    if (const int status = statusOf(colour::loadColourFile(reference, wants, file)))
-        return status;
-    if (!file.set)
-        return exitPatchSetNotText;
-    if (!file.set->hasCmyk())
+    const colour::Failure failure = colour::loadColourFile(reference, wants, file);
+    if (failure == colour::Failure::NotRecognised || file.profile) {
+        return exitReferenceNotText;
+    }
+    if (failure != colour::Failure::None) {
+        return statusOf(failure);
+    }
+    if (!file.set->hasCmyk()) {
         return exitNoDeviceValues;
+    }
     colour::DataSet chart = colour::chartOf(std::move(*file.set));
     chart.originator = "Tintgate";
     chart.conditions = {.illuminant = "D50", .observer = "2", .measurement = {}};
 
-    colour::ColourFile profileFile;
-    if (const int status = statusOf(colour::loadColourFile(profile, wants, profileFile)))
-        return status;
-    if (!profileFile.profile)
-        return exitProfileDamaged;
-
-    chart.descriptor = profileFile.profile->description();
+    colour::Profile icc;
+    const colour::Failure profileFailure = colour::loadProfile(profile, icc);
+    if (profileFailure == colour::Failure::NotRecognised) {
+        return exitNotAProfile;
+    }
+    if (profileFailure != colour::Failure::None) {
+        return statusOf(profileFailure);
+    }
+    chart.descriptor = icc.description();
     chart.lab.resize(chart.patchCount);
-    if (const int status = statusOf(profileFile.profile->evaluate(
-            chart.device.data(), chart.patchCount, chart.channels.size(), chart.lab.data())))
+    if (const int status = statusOf(icc.evaluate(chart.device.data(), chart.patchCount,
+                                                 chart.channels.size(), chart.lab.data()))) {
         return status;
-    for (colour::Lab& lab : chart.lab)
+    }
+    for (colour::Lab& lab : chart.lab) {
         lab = {sixDecimals(lab.L), sixDecimals(lab.a), sixDecimals(lab.b)};
+    }
     return writeOutputFile(output, colour::writeCgats(chart));
 }
 

@@ -7,7 +7,8 @@ namespace analysis {
 
 /// Reads process colours from the CGATS text `reference`, evaluates `profile` at them and writes
 /// both with the ids to `output`. Paths are bytes as the file system has them.
-/// Gives 0 or a code of docs/exit-codes.csv.
+/// An output that is an input, or that holds something else than CGATS text, is refused before
+/// anything is read. Gives 0 or a code of docs/exit-codes.csv.
 int writeLab(const std::string& reference, const std::string& profile, const std::string& output);
 
 } // namespace analysis

@@ -1,6 +1,8 @@
 // The ten functions. Nothing is thrown out of them: another program's code waits behind.
 #include <exception>
+#include <filesystem>
 #include <new>
+#include <system_error>
 #include <utility>
 
 #include "ExitCodes.h"
@@ -56,10 +58,21 @@ int validate(const std::wstring& path) {
 
 int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& preset,
             analyseResultsRecord* results, std::wstring* json, KZJobDataStruct* job) {
+    // Of a job, target and measurement are never one file unless a name has gone wrong: every patch
+    // would pass. A person may compare a file with itself.
+    std::error_code error;
+    const bool isSameFile = std::filesystem::equivalent(narrowed(paths.target),
+                                                        narrowed(paths.measurement), error);
+    if (isSameFile && job) {
+        return exitTargetIsMeasurement;
+    }
     Comparison comparison;
     const auto formula = colour::formulaFromNumber(preset.deltaEMode);
     if (const int status = compare(paths, formula, job != nullptr, comparison))
         return status;
+    if (isSameFile) {
+        comparison.warnings.push_back({"sameFile", "Target and measurement are the same file."});
+    }
     const Judgement judgement = judge(comparison, preset);
 
     // All that can fail comes before the first byte that a caller sees.

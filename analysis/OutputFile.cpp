@@ -2,6 +2,8 @@
 
 #include <algorithm>
 #include <cerrno>
+#include <filesystem>
+#include <system_error>
 #include <utility>
 
 #include <fcntl.h>
@@ -120,6 +122,16 @@ int writeOutputFile(const std::string& path, std::string_view bytes) {
         return writeInPlace(path, bytes);
 
     return replaceWhole(path, bytes, exists ? &old : nullptr);
+}
+
+int checkOutput(const std::string& path, std::initializer_list<std::string> inputs) {
+    for (const std::string& input : inputs) {
+        std::error_code error; // Devices and pipes, and files that are not there, are not the same.
+        if (std::filesystem::equivalent(path, input, error)) {
+            return exitOutputIsInput;
+        }
+    }
+    return colour::isEmptyOrCgats(path) ? exitDone : exitOutputNotOurs;
 }
 
 } // namespace analysis

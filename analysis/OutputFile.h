@@ -1,6 +1,8 @@
 // Writing a file so that what stood there before is lost only to something whole.
 #pragma once
 
+#include <initializer_list>
+
 #include <string>
 #include <string_view>
 
@@ -13,5 +15,9 @@ namespace analysis {
 /// room for a regular file is reserved first, so that a full disk leaves it as it was. Gives 0, 50
 /// (can't be created or written to) or 51 (could not be written to its end).
 int writeOutputFile(const std::string& path, std::string_view bytes);
+
+/// Whether a CGATS text may be written to `path`: 0, 52 (a regular file that is one of `inputs`, under
+/// whatever name) or 53 (a regular file that is neither empty nor CGATS text).
+int checkOutput(const std::string& path, std::initializer_list<std::string> inputs);
 
 } // namespace analysis

@@ -130,6 +130,33 @@ Failure readWholeFile(const std::string& path, std::size_t limit, std::string& b
     }
 }
 
+bool isEmptyOrCgats(const std::string& path) {
+    struct stat status {};
+    if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode) || status.st_size == 0) {
+        return true;
+    }
+    const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
+    std::string head(headBytes, '\0');
+    const ssize_t count =
+        file.number() < 0 ? -1 : readSome(file.number(), false, head.data(), head.size());
+    return count >= 0 && looksLikeCgats({head.data(), static_cast<std::size_t>(count)});
+}
+
+Failure loadProfile(const std::string& path, Profile& profile) {
+    try {
+        std::string bytes;
+        if (const Failure failure = readBytes(path, maxCgatsBytes, looksLikeProfile, bytes);
+            failure != Failure::None) {
+            return failure;
+        }
+        return profile.open(bytes);
+    } catch (const std::bad_alloc&) {
+        return Failure::OutOfMemory;
+    } catch (const std::length_error&) {
+        return Failure::OutOfMemory;
+    }
+}
+
 Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file) {
     try {
         std::string bytes;

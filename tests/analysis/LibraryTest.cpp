@@ -82,6 +82,7 @@ TEST_F(Library, WritesSoundResults) {
         {profile, few, "", 2, "\"selection\": \"measurement\""},
         {few, profile, "", 3, "\"measurement\": \"profile\""},
         {profile, profile, strip, 4, "\"Gr\\u00e4y\""},
+        {profile, profile, strip, 4, "\"sameFile\""},
         {few, profile, strip, 0, "\"unpairedPatchSet\": 1"},
         {m0, m1, "", 0, "\"pairedByOrder\""},
         {m0, m1, "", 0, "measurement conditions: M0 and M1."},
@@ -90,7 +91,7 @@ TEST_F(Library, WritesSoundResults) {
     std::vector<std::string> texts;
     for (const auto& c : cases) {
         preset.deltaEMode = c.formula;
-        EXPECT_EQ(analyse(c.target, c.measurement, c.patchSet), 0);
+        EXPECT_EQ(analyse(c.target, c.measurement, c.patchSet, nullptr), 0);
         EXPECT_THAT(json, HasSubstr(c.shows));
         texts.push_back(json);
     }
@@ -107,7 +108,7 @@ TEST_F(Library, TakesNoNoticeOfDeviceValuesThatWereNeverFilledIn) {
         EXPECT_EQ(results.values[4], 1); // paper
         EXPECT_EQ(results.values[0], 0); // solid cyan
     }
-    analyse(zeros, zeros);
+    analyse(zeros, zeros, "", nullptr);
     EXPECT_THAT(json, HasSubstr("\"measurement\": \"deviceValues\""));
 }
 
@@ -116,6 +117,12 @@ TEST_F(Library, GivesOneCodeForOneCause) {
     const std::string inks = chart("C M Y K", "9 9 9 9\n");
     const std::string other = chart(inksAndLab, "1 1 9 9 9 50 0 0\n");
     const std::string rgbProfile = sets + "ghostscript/srgb.icc";
+    const std::string sameLab = scratch.path("copy");
+    const std::string linkToLab = scratch.path("link");
+    const std::string anotherProfile = scratch.path("copy.icc");
+    std::filesystem::copy_file(lab, sameLab);
+    std::filesystem::create_hard_link(lab, linkToLab);
+    std::filesystem::copy_file(profile, anotherProfile);
     const struct {
         std::string target, measurement, patchSet;
         int status;
@@ -123,9 +130,11 @@ TEST_F(Library, GivesOneCodeForOneCause) {
         {scratch.path("none"), lab, "", exitInputMissing},
         {fogra, inks, "", exitNoColourValues},
         {profile, lab, "", exitNoDeviceValues},
-        {profile, profile, "", exitNoDeviceValues},
-        {lab, lab, lab, exitNoDeviceValues},
-        {lab, lab, profile, exitPatchSetNotText},
+        {profile, anotherProfile, "", exitNoDeviceValues},
+        {lab, sameLab, lab, exitNoDeviceValues},
+        {lab, sameLab, profile, exitPatchSetNotText},
+        {lab, lab, "", exitTargetIsMeasurement},
+        {lab, linkToLab, "", exitTargetIsMeasurement},
         {fogra, other, "", exitNothingToPair},
         {rgbProfile, fogra, "", exitProfileWrongColourSpace},
     };
@@ -202,23 +211,55 @@ TEST_F(Library, MetaTellsOfTheJobButNotItsPassword) {
 }
 
 TEST_F(Library, WritesTheLabThatAProfileGives) {
-    const std::string lab = scratch.write("lab \xff.txt", "before");
+    const std::string lab = scratch.write("lab \xff.txt", "CGATS.17 before\n");
     const std::string colours = chart(labNames, "50 0 0\n");
+    const std::string reference = scratch.path("fogra.ti3");
+    std::filesystem::copy_file(fogra, reference);
+    const std::string linkToReference = scratch.path("link");
+    std::filesystem::create_symlink(reference, linkToReference);
+    const std::string preset = scratch.write("preset.xml", "<?xml version=\"1.0\"?>\n<preset/>\n");
+    const std::string cut = scratch.write("cut.icc", support::contentsOf(profile).substr(0, 999));
+    const auto write = [](const std::string& chart, const std::string& icc,
+                          const std::string& output) {
+        return writeLabFromReferencesAndICCProfile(stringToWstring(chart), stringToWstring(icc),
+                                                   stringToWstring(output));
+    };
     const struct {
-        std::string reference, profile;
+        std::string reference, profile, output;
         int status;
     } cases[] = {
-        {scratch.path("none"), profile, exitInputMissing},
-        {colours, profile, exitNoDeviceValues},
-        {fogra, colours, exitProfileDamaged},
-        {fogra, profile, 0},
+        {scratch.path("none"), profile, lab, exitInputMissing},
+        {colours, profile, lab, exitNoDeviceValues},
+        {profile, profile, lab, exitReferenceNotText},
+        {preset, profile, lab, exitReferenceNotText},
+        {reference, scratch.path("none"), lab, exitInputMissing},
+        {reference, colours, lab, exitNotAProfile},
+        {reference, preset, lab, exitNotAProfile},
+        {reference, cut, lab, exitProfileDamaged},
+        {reference, cut, cut, exitOutputIsInput},
+        {reference, profile, reference, exitOutputIsInput},
+        {reference, profile, linkToReference, exitOutputIsInput},
+        {reference, profile, preset, exitOutputNotOurs},
+        {reference, profile, cut, exitOutputNotOurs},
+        {reference, profile, lab, 0},
+        {reference, profile, colours, 0},
+        {reference, profile, scratch.path("new"), 0},
+        {reference, profile, scratch.write("empty", ""), 0},
     };
-    for (const auto& [reference, icc, status] : cases) {
-        EXPECT_EQ(support::contentsOf(lab), "before");
-        EXPECT_EQ(writeLabFromReferencesAndICCProfile(stringToWstring(reference),
-                                                      stringToWstring(icc), stringToWstring(lab)),
-                  status);
+    for (const auto& [chart, icc, output, status] : cases) {
+        const bool exists = std::filesystem::exists(output);
+        const std::string before = exists ? support::contentsOf(output) : "";
+        EXPECT_EQ(write(chart, icc, output), status) << chart << icc << output;
+        if (status == 0) {
+            EXPECT_THAT(support::contentsOf(output), testing::StartsWith("CGATS.17"));
+        } else {
+            EXPECT_EQ(support::contentsOf(output), before);
+        }
     }
+    // Devices are never refused, even if one of them is an input too.
+    std::filesystem::create_symlink("/dev/null", scratch.path("null"));
+    EXPECT_EQ(write(scratch.path("null"), profile, scratch.path("null")), exitReferenceNotText);
+    EXPECT_EQ(write(reference, profile, scratch.path("null")), 0);
     ASSERT_EQ(analyse(lab, profile), 0);
     EXPECT_LT(results.values[6], 1e-4);
     EXPECT_THAT(json, HasSubstr("\"paired\": 1617"));

@@ -29,10 +29,14 @@ class LibraryTest : public testing::Test {
     /// Compares under the preset; what comes of it is in the members.
     int analyse(const std::string& target, const std::string& measurement,
                 const std::string& patchSet = "") {
+        return analyse(target, measurement, patchSet, &job);
+    }
+    int analyse(const std::string& target, const std::string& measurement,
+                const std::string& patchSet, KZJobDataStruct* job) {
         std::wstring text = stringToWstring(json);
         const int status =
             analyzeMeasurements(stringToWstring(target), stringToWstring(measurement),
-                                stringToWstring(patchSet), preset, &results, &text, &job);
+                                stringToWstring(patchSet), preset, &results, &text, job);
         json = wstringToString(text);
         return status;
     }
