@@ -3,14 +3,10 @@
 #include <algorithm>
 #include <limits>
 
-#include <fcntl.h>
-#include <unistd.h>
-
-#include <wx/convauto.h>
 #include <wx/filename.h>
 
-#include "job/JobFiles.h"
 #include "job/KZVerifyJobProcessor.h"
+#include "measure/StripText.h"
 
 namespace {
 
@@ -66,19 +62,6 @@ std::string measure::pathBytes(const wxString& path) {
     return wstringToString(path.ToStdWstring());
 }
 
-// wx would lose a path that is not valid in the user's locale, so the file goes to it opened.
-bool measure::readLines(const wxString& path, wxTextFile* file) {
-    if (!fileExists(path)) {
-        return false;
-    }
-    const int opened = open(pathBytes(path).c_str(), O_RDONLY | O_CLOEXEC);
-    if (opened >= 0) {
-        file->Open("/proc/self/fd/" + std::to_string(opened), wxConvAuto());
-        close(opened);
-    }
-    return true;
-}
-
 long measure::numberBehind(const wxString& line, std::size_t offset) {
     long number = 0;
     // A number that is followed by something else is stored all the same.
@@ -87,13 +70,13 @@ long measure::numberBehind(const wxString& line, std::size_t offset) {
 
 int KZVerifyJobProcessor::GetDeviceIDFromIt8ControlStripFileEx(wxString path, int* deviceID) {
     *deviceID = 0;
-    wxTextFile file;
-    if (!measure::readLines(path, &file)) {
+    measure::StripText strip;
+    if (!strip.read(path)) {
         return noSuchFile;
     }
     wxString line;
     constexpr std::size_t afterKeyword = 6;
-    if (findStringInFile(&file, "DEVICE", &line)) {
+    if (strip.find("DEVICE", &line)) {
         const long number = measure::numberBehind(line, afterKeyword);
         using Limits = std::numeric_limits<int>;
         *deviceID = number < Limits::min() || number > Limits::max() ? 0 : static_cast<int>(number);

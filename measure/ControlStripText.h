@@ -9,7 +9,8 @@
 #include <wx/textfile.h>
 
 /// Finds the first line of the file that contains the needle. The file's current line stays there,
-/// or at the file's end where there is none; then false, and *line is left alone.
+/// or at the file's end where there is none; then false, and *line is left alone. The system itself
+/// walks strips with measure::StripText, which does the same in less memory.
 bool findStringInFile(wxTextFile* file, wxString needle, wxString* line);
 
 /// The line without the control characters at its end, and with "\r\n" there.
@@ -29,10 +30,6 @@ wxString pathBeside(const wxString& path, const char* name);
 
 /// A path as the bytes that the system knows it by.
 std::string pathBytes(const wxString& path);
-
-/// Reads all lines of a file; none where it can't be read. False if there is no regular file of
-/// this name.
-bool readLines(const wxString& path, wxTextFile* file);
 
 /// The whole number that a line ends with, behind its first `offset` characters; 0 where that is
 /// anything else.

@@ -33,10 +33,9 @@
 
 #include <unistd.h>
 
-#include <wx/textfile.h>
-
 #include "job/KZVerifyJobProcessor.h"
 #include "measure/ControlStripText.h"
+#include "measure/StripText.h"
 
 namespace {
 
@@ -69,15 +68,20 @@ constexpr InstrumentLines instrumentLines[] = {
     {{21, 22, 48, 49, 50}, "KEYWORD ZEBRA_RULER_MODE\r\nZEBRA_RULER_MODE 1\r\n"},
 };
 
-bool contains(const wxString& line, std::initializer_list<const char*> words) {
+bool contains(std::wstring_view line, std::initializer_list<std::wstring_view> words) {
     return std::any_of(words.begin(), words.end(),
-                       [&](const char* word) { return line.Contains(word); });
+                       [&](std::wstring_view word) { return line.find(word) != line.npos; });
+}
+
+/// A line as it goes into a definition.
+std::string conditioned(std::wstring_view line) {
+    return line.empty() ? "\r\n" : StringConditioning({line.data(), line.size()}).utf8_string();
 }
 
 /// The text of a definition, made from the lines of a strip.
 class Definition {
   public:
-    Definition(wxTextFile& strip, const KZJobDataStruct& job)
+    Definition(measure::StripText& strip, const KZJobDataStruct& job)
         : m_strip(strip), m_job(job), m_isDynamic(job.useDynstrip == 1 && job.secondStrip == 0) {}
 
     /// False where the size of the strip can't be told: the text ends there.
@@ -105,26 +109,27 @@ class Definition {
 
   private:
     void add(std::string_view text) { m_text += text; }
-    void addLine(const wxString& line) { m_text += StringConditioning(line).utf8_string(); }
+    void addLine(std::wstring_view line) { m_text += conditioned(line); }
+    void addFoundLine() { addLine({m_line.wx_str(), m_line.length()}); }
 
-    bool find(const char* word) { return findStringInFile(&m_strip, word, &m_line); }
+    bool find(const char* word) { return m_strip.find(word, &m_line); }
 
     void addFormat() {
         if (find("NUMBER_OF_FIELDS")) {
-            addLine(m_line);
+            addFoundLine();
         }
         if (find("BEGIN_DATA_FORMAT")) {
-            addLine(m_line);
-            addLine(m_strip.GetNextLine()); // The field list stands on one line.
+            addFoundLine();
+            addLine(m_strip.nextLine()); // The field list stands on one line.
         }
         add("END_DATA_FORMAT\r\n");
     }
 
     /// By requirement an instrument that the strip does not name gets no KEYWORD line.
     void addDevice() {
-        for (std::size_t i = 0; i < m_strip.GetLineCount(); ++i) {
-            const wxString& line = m_strip.GetLine(i);
-            if (line.Contains("DEVICE") && !line.Contains("KEYWORD")) {
+        for (std::wstring_view line = m_strip.firstLine(); !m_strip.atEnd();
+             line = m_strip.nextLine()) {
+            if (contains(line, {L"DEVICE"}) && !contains(line, {L"KEYWORD"})) {
                 add("KEYWORD\tDEVICE\r\n");
                 addLine(line);
                 return;
@@ -152,7 +157,7 @@ class Definition {
         const bool found = find(word);
         if (found) {
             add("KEYWORD " + std::string(word) + "\r\n");
-            addLine(m_line);
+            addFoundLine();
         }
         return found;
     }
@@ -194,9 +199,9 @@ class Definition {
         if (!find("END_DATA_FORMAT")) {
             return;
         }
-        while (!m_strip.Eof()) {
-            const wxString& line = m_strip.GetNextLine();
-            if (line.Contains("BEGIN_DATA")) {
+        while (!m_strip.atEnd()) {
+            const std::wstring_view line = m_strip.nextLine();
+            if (contains(line, {L"BEGIN_DATA"})) {
                 addLine(line);
                 return;
             }
@@ -205,17 +210,17 @@ class Definition {
 
     /// All that follows, and an empty line: what comes behind the last line is one.
     void addRows() {
-        while (!m_strip.Eof()) {
-            addLine(m_strip.GetNextLine());
+        while (!m_strip.atEnd()) {
+            addLine(m_strip.nextLine());
         }
     }
 
     /// The strip's rows, and white ones up to the size of the grid.
     void addFilledRows() {
         long rows = 0;
-        while (!m_strip.Eof()) {
-            const wxString& line = m_strip.GetNextLine();
-            if (line.Contains("END_DATA")) {
+        while (!m_strip.atEnd()) {
+            const std::wstring_view line = m_strip.nextLine();
+            if (contains(line, {L"END_DATA"})) {
                 break;
             }
             ++rows; // By requirement also the empty line behind the last one.
@@ -229,7 +234,7 @@ class Definition {
         add("END_DATA"); // By requirement without a line end.
     }
 
-    wxTextFile& m_strip;
+    measure::StripText& m_strip;
     const KZJobDataStruct& m_job;
     const bool m_isDynamic;
     long m_sets = 0; ///< Of a dynamic strip.
@@ -239,15 +244,15 @@ class Definition {
 
 /// The head of a strip for those instruments that are set up by a file of their own beside the
 /// definition: what stands in front of its table.
-std::string headOf(wxTextFile& strip) {
+std::string headOf(measure::StripText& strip) {
     std::string text;
-    const wxString* line = &strip.GetFirstLine();
-    while (!contains(*line, {"BEGIN_DATA_FORMAT", "NUMBER_OF_FIELDS", "SAMPLE_NAME"})) {
-        text += StringConditioning(*line).utf8_string();
-        if (strip.Eof()) {
+    std::wstring_view line = strip.firstLine();
+    while (!contains(line, {L"BEGIN_DATA_FORMAT", L"NUMBER_OF_FIELDS", L"SAMPLE_NAME"})) {
+        text += conditioned(line);
+        if (strip.atEnd()) {
             break;
         }
-        line = &strip.GetNextLine();
+        line = strip.nextLine();
     }
     return text;
 }
@@ -264,20 +269,21 @@ void write(const wxString& path, const std::string& text) {
 // The strip is read whole before anything is removed: it may bear the definition's name itself.
 wxString KZVerifyJobProcessor::WriteTemporaryMeasurementDefinitionFile(wxString path,
                                                                        KZJobDataStruct* job) {
-    wxTextFile strip;
-    if (!measure::readLines(path, &strip)) {
+    measure::StripText strip;
+    if (!strip.read(path)) {
         return {};
     }
-    Definition definition(strip, *job);
-    const bool isWhole = definition.build();
     const wxString output = measure::pathBeside(path, measure::definitionName);
-    write(output, definition.text());
-    if (!isWhole) {
-        return {};
+    {
+        Definition definition(strip, *job);
+        const bool isWhole = definition.build();
+        write(output, definition.text());
+        if (!isWhole) {
+            return {};
+        }
     }
     wxString line;
-    if (findStringInFile(&strip, "File_Format=BARBIERI", &line) ||
-        findStringInFile(&strip, "iSis_INFO", &line)) {
+    if (strip.find("File_Format=BARBIERI", &line) || strip.find("iSis_INFO", &line)) {
         write(measure::pathBeside(path, "NMPatchSetDefinition.dcf"), headOf(strip));
     }
     return output;
