@@ -123,13 +123,76 @@ constexpr struct Field {
     {"psd", [](auto text, Record& preset) { return readSwitch(text, preset.fograPSDPreset); }},
 };
 
+/// The fault that reading meets, with its place.
+class Finding {
+  public:
+    /// An element, or what is wrong within its parent.
+    Status at(Status status, const pugi::xml_node& node, std::string_view text = {}) {
+        return status == exitDone ? status : note(status, node, nameOf(node), text);
+    }
+    Status atAttribute(Status status, const pugi::xml_node& element, const std::string& attribute,
+                       std::string_view text = {}) {
+        return status == exitDone
+                   ? status
+                   : note(status, element, attribute + " of " + nameOf(element), text);
+    }
+    Status missing(const pugi::xml_node& parent, const std::string& name) {
+        return note(exitPresetValueMissing, parent, "<" + name + ">", {});
+    }
+    Status document(Status status, std::ptrdiff_t offset, std::string description) {
+        m_offset = offset;
+        m_description = std::move(description);
+        return status;
+    }
+
+    /// -1 without a place.
+    std::ptrdiff_t offset() const { return m_offset; }
+    const std::string& description() const { return m_description; }
+
+  private:
+    static std::string nameOf(const pugi::xml_node& node) {
+        return node.type() == pugi::node_element ? "<" + std::string(node.name()) + ">"
+                                                 : "text in " + nameOf(node.parent());
+    }
+
+    Status note(Status status, const pugi::xml_node& node, const std::string& place,
+                std::string_view text) {
+        constexpr std::size_t longest = 60; // A long text would hide what is said about it.
+        const std::string_view value = node.value(); // Text begins at the end of the line before.
+        const std::size_t blanks = std::min(value.find_first_not_of(" \t\r\n"), value.size());
+        m_offset = node.offset_debug() + static_cast<std::ptrdiff_t>(blanks);
+        m_description = place;
+        for (const auto& [code, what] : {
+                 std::pair{exitPresetNotXml, " is not UTF-8"},
+                 std::pair{exitPresetValueMissing, " is missing or empty"},
+                 std::pair{exitPresetValueRepeated, " appears twice"},
+                 std::pair{exitPresetNotNumeric, " is not a number"},
+                 std::pair{exitPresetOutOfRange, " is outside its range or not one of its choices"},
+                 std::pair{exitPresetUnknownEntry, " is unknown here"},
+             }) {
+            if (code == status) {
+                m_description += what;
+            }
+        }
+        if (!text.empty() && status != exitPresetNotXml) {
+            m_description += ": " + std::string(text.substr(0, longest));
+        }
+        return status;
+    }
+
+    std::ptrdiff_t m_offset = -1;
+    std::string m_description;
+};
+
 /// The text of an element that holds nothing else.
-Status textOf(const pugi::xml_node& element, std::string& text) {
-    if (element.first_attribute())
-        return exitPresetUnknownEntry;
+Status textOf(const pugi::xml_node& element, std::string& text, Finding& finding) {
+    if (const pugi::xml_attribute attribute = element.first_attribute()) {
+        return finding.atAttribute(exitPresetUnknownEntry, element, attribute.name());
+    }
     for (const pugi::xml_node& part : element) {
-        if (part.type() == pugi::node_element)
-            return exitPresetUnknownEntry;
+        if (part.type() == pugi::node_element) {
+            return finding.at(exitPresetUnknownEntry, part);
+        }
         text += part.value();
     }
     return exitDone;
@@ -138,145 +201,213 @@ Status textOf(const pugi::xml_node& element, std::string& text) {
 /// The attributes of an element by the names that it may have; null where one is absent.
 template<std::size_t count>
 Status attributesOf(const pugi::xml_node& element, const char* const (&names)[count],
-                    std::array<const char*, count>& values) {
+                    std::array<const char*, count>& values, Finding& finding) {
     values.fill(nullptr);
     for (const pugi::xml_attribute& attribute : element.attributes()) {
         const auto* name =
             std::find(std::begin(names), std::end(names), std::string_view(attribute.name()));
-        if (name == std::end(names))
-            return exitPresetUnknownEntry;
+        if (name == std::end(names)) {
+            return finding.atAttribute(exitPresetUnknownEntry, element, attribute.name());
+        }
         const char*& value = values[name - std::begin(names)];
-        if (value)
-            return exitPresetValueRepeated;
+        if (value) {
+            return finding.atAttribute(exitPresetValueRepeated, element, *name);
+        }
         value = attribute.value();
     }
     return exitDone;
 }
 
-Status readCriterion(const pugi::xml_node& element, const Criterion& criterion, Record& preset) {
+Status readCriterion(const pugi::xml_node& element, const Criterion& criterion, Record& preset,
+                     Finding& finding) {
     constexpr const char* names[] = {"tolerance", "used", "decimals", "psdTolerance", "psdUsed"};
     std::array<const char*, std::size(names)> values{};
-    Status status = attributesOf(element, names, values);
-    if (status == exitDone && element.first_child())
-        status = exitPresetUnknownEntry;
-    const auto [tolerance, used, decimals, psdTolerance, psdUsed] = values;
-    const bool hasPsd = psdTolerance || psdUsed || preset.fograPSDPreset > 0;
-
-    const auto tolerances = [&](const char* text, double& value) {
-        if (status == exitDone)
-            status = readNumber(text ? text : "", 0.0, largestTolerance, value);
-    };
-    const auto switches = [&](const char* text, int& value) {
-        if (status == exitDone)
-            status = readSwitch(text ? text : "", value);
-    };
-    tolerances(tolerance, preset.presetValues[criterion.index]);
-    switches(used, preset.usedForResult[criterion.index]);
-    if (status == exitDone)
-        status = readNumber(decimals ? decimals : "", 0, largestDecimals,
-                            preset.decimalPlaces[criterion.index]);
-    if (hasPsd) {
-        tolerances(psdTolerance, preset.psdPresetValues[criterion.psdEntry]);
-        switches(psdUsed, preset.usedForPSDResult[criterion.psdEntry]);
+    if (const Status status = attributesOf(element, names, values, finding); status != exitDone) {
+        return status;
     }
-    return status;
-}
-
-/// REQUIRES: preset.fograPSDPreset is read: a PSD preset must state its values for each criterion.
-Status readCriteria(const pugi::xml_node& section, Record& preset) {
-    if (section.first_attribute())
-        return exitPresetUnknownEntry;
-    std::array<bool, presetValueCount> seen{};
-    for (const pugi::xml_node& element : section) {
-        const Criterion* criterion =
-            element.type() == pugi::node_element ? criterionOfName(element.name()) : nullptr;
-        if (!criterion)
-            return exitPresetUnknownEntry;
-        if (std::exchange(seen[criterion->index], true))
-            return exitPresetValueRepeated;
-        if (const Status status = readCriterion(element, *criterion, preset); status != exitDone)
-            return status;
+    if (const pugi::xml_node part = element.first_child()) {
+        return finding.at(exitPresetUnknownEntry, part);
+    }
+    const bool hasPsd = values[3] || values[4] || preset.fograPSDPreset > 0;
+    for (std::size_t i = 0; i < (hasPsd ? std::size(names) : 3); ++i) {
+        const char* const text = values[i] ? values[i] : "";
+        Status status = exitDone;
+        switch (i) {
+        case 0:
+            status = readNumber(text, 0.0, largestTolerance, preset.presetValues[criterion.index]);
+            break;
+        case 1:
+            status = readSwitch(text, preset.usedForResult[criterion.index]);
+            break;
+        case 2:
+            status = readNumber(text, 0, largestDecimals, preset.decimalPlaces[criterion.index]);
+            break;
+        case 3:
+            status = readNumber(text, 0.0, largestTolerance,
+                                preset.psdPresetValues[criterion.psdEntry]);
+            break;
+        default:
+            status = readSwitch(text, preset.usedForPSDResult[criterion.psdEntry]);
+        }
+        if (status != exitDone) {
+            return finding.atAttribute(status, element, names[i], text);
+        }
     }
     return exitDone;
 }
 
-Status readVersion(const pugi::xml_node& root) {
-    constexpr const char* names[] = {"version"};
-    std::array<const char*, 1> values{};
-    if (const Status status = attributesOf(root, names, values); status != exitDone)
-        return status;
-    int version = 0;
-    return readNumber(values[0] ? values[0] : "", formatVersion, formatVersion, version);
+/// REQUIRES: preset.fograPSDPreset is read: a PSD preset must state its values for each criterion.
+Status readCriteria(const pugi::xml_node& section, Record& preset, Finding& finding) {
+    if (const pugi::xml_attribute attribute = section.first_attribute()) {
+        return finding.atAttribute(exitPresetUnknownEntry, section, attribute.name());
+    }
+    std::array<bool, presetValueCount> seen{};
+    for (const pugi::xml_node& element : section) {
+        const Criterion* criterion =
+            element.type() == pugi::node_element ? criterionOfName(element.name()) : nullptr;
+        if (!criterion) {
+            return finding.at(exitPresetUnknownEntry, element);
+        }
+        if (std::exchange(seen[criterion->index], true)) {
+            return finding.at(exitPresetValueRepeated, element);
+        }
+        if (const Status status = readCriterion(element, *criterion, preset, finding);
+            status != exitDone) {
+            return status;
+        }
+    }
+    return exitDone;
 }
 
-Status readRoot(const pugi::xml_node& root, Record& preset) {
-    if (const Status status = readVersion(root); status != exitDone)
+Status readVersion(const pugi::xml_node& root, Finding& finding) {
+    constexpr const char* names[] = {"version"};
+    std::array<const char*, 1> values{};
+    if (const Status status = attributesOf(root, names, values, finding); status != exitDone) {
         return status;
+    }
+    int version = 0;
+    const char* const text = values[0] ? values[0] : "";
+    return finding.atAttribute(readNumber(text, formatVersion, formatVersion, version), root,
+                               names[0], text);
+}
+
+Status readRoot(const pugi::xml_node& root, Record& preset, Finding& finding) {
+    if (const Status status = readVersion(root, finding); status != exitDone) {
+        return status;
+    }
     pugi::xml_node criteriaSection;
     std::array<pugi::xml_node, std::size(fields)> found;
     for (const pugi::xml_node& element : root) {
         const std::string_view name = element.name(); // empty for stray text
         const auto* field = std::find_if(std::begin(fields), std::end(fields),
                                          [&](const Field& f) { return name == f.name; });
-        if (field == std::end(fields) && name != "criteria")
-            return exitPresetUnknownEntry;
+        if (field == std::end(fields) && name != "criteria") {
+            return finding.at(exitPresetUnknownEntry, element);
+        }
         pugi::xml_node& place =
             field == std::end(fields) ? criteriaSection : found[field - std::begin(fields)];
-        if (place)
-            return exitPresetValueRepeated;
+        if (place) {
+            return finding.at(exitPresetValueRepeated, element);
+        }
         place = element;
     }
     for (std::size_t i = 0; i < std::size(fields); ++i) {
-        if (!found[i])
-            return exitPresetValueMissing;
+        if (!found[i]) {
+            return finding.missing(root, fields[i].name);
+        }
         std::string text;
-        Status status = textOf(found[i], text);
-        if (status == exitDone)
-            status = fields[i].read(text, preset);
-        if (status != exitDone)
+        Status status = textOf(found[i], text, finding);
+        if (status == exitDone) {
+            status = finding.at(fields[i].read(text, preset), found[i], trimmed(text));
+        }
+        if (status != exitDone) {
             return status;
+        }
     }
-    return criteriaSection ? readCriteria(criteriaSection, preset) : exitPresetValueMissing;
+    return criteriaSection ? readCriteria(criteriaSection, preset, finding)
+                           : finding.missing(root, "criteria");
 }
 
 /// The one element of a document. A document type can only bring entities, which no preset needs.
-Status rootOf(const pugi::xml_document& document, pugi::xml_node& root) {
+Status rootOf(const pugi::xml_document& document, pugi::xml_node& root, Finding& finding) {
     for (const pugi::xml_node& part : document) {
-        if (part.type() == pugi::node_doctype)
-            return exitPresetWrongKind;
-        if (part.type() != pugi::node_element || root)
-            return exitPresetNotXml;
+        if (part.type() == pugi::node_doctype) {
+            return finding.document(exitPresetWrongKind, part.offset_debug(),
+                                    "a preset has no document type");
+        }
+        if (part.type() != pugi::node_element || root) {
+            return finding.document(exitPresetNotXml, part.offset_debug(),
+                                    "a document is one element");
+        }
         root = part;
     }
-    if (!root)
-        return exitPresetNotXml;
-    return root.name() == std::string_view("tolerancePreset") ? exitDone : exitPresetWrongKind;
+    if (!root) {
+        return finding.document(exitPresetNotXml, -1, "there is no element");
+    }
+    if (root.name() != std::string_view("tolerancePreset")) {
+        return finding.document(exitPresetWrongKind, root.offset_debug(),
+                                "the outermost element is not <tolerancePreset>");
+    }
+    return exitDone;
+}
+
+/// Line of a place that is counted in bytes of UTF-8, to which the parser converts Latin-1.
+std::size_t lineOf(std::string_view bytes, std::ptrdiff_t offset, bool isLatin1) {
+    std::size_t line = 1;
+    std::ptrdiff_t at = 0;
+    for (const char c : bytes) {
+        if (at >= offset) {
+            break;
+        }
+        at += isLatin1 && (c & 0x80) != 0 ? 2 : 1;
+        line += c == '\n' ? 1 : 0;
+    }
+    return line;
+}
+
+Status parse(std::string_view bytes, Record& preset, pugi::xml_document& document,
+             pugi::xml_encoding& encoding, Finding& finding) {
+    if (bytes.size() > maxPresetBytes) {
+        return finding.document(exitPresetWrongKind, -1, "the file has more than 1 MB");
+    }
+    if (const std::size_t nul = bytes.find('\0'); nul != bytes.npos) { // ends pugixml's document
+        return finding.document(exitPresetNotXml, static_cast<std::ptrdiff_t>(nul),
+                                "the file has a byte 0 in it");
+    }
+    const auto parsed =
+        document.load_buffer(bytes.data(), bytes.size(),
+                             pugi::parse_default | pugi::parse_fragment | pugi::parse_doctype);
+    encoding = parsed.encoding;
+    if (parsed.status == pugi::status_out_of_memory) {
+        return exitOutOfMemory;
+    }
+    if (!parsed) {
+        return finding.document(exitPresetNotXml, parsed.offset, parsed.description());
+    }
+    pugi::xml_node root;
+    const Status status = rootOf(document, root, finding);
+    return status == exitDone ? readRoot(root, preset, finding) : status;
 }
 
 } // namespace
 
-int parsePreset(std::string_view bytes, bool keepJobChoice,
-                tolerancePresetParameterRecord& preset) {
-    if (bytes.size() > maxPresetBytes)
-        return exitPresetWrongKind;
-    if (bytes.find('\0') != std::string_view::npos) // would end the document for pugixml
-        return exitPresetNotXml;
-    pugi::xml_document document;
-    const auto parsed =
-        document.load_buffer(bytes.data(), bytes.size(),
-                             pugi::parse_default | pugi::parse_fragment | pugi::parse_doctype);
-    if (parsed.status == pugi::status_out_of_memory)
-        return exitOutOfMemory;
-    if (!parsed)
-        return exitPresetNotXml;
-
+int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParameterRecord& preset,
+                PresetFault* fault) {
     tolerancePresetParameterRecord read;
-    pugi::xml_node root;
-    Status status = rootOf(document, root);
-    if (status == exitDone)
-        status = readRoot(root, read);
-    if (status != exitDone)
+    pugi::xml_document document;
+    pugi::xml_encoding encoding = pugi::encoding_utf8;
+    Finding finding;
+    if (const Status status = parse(bytes, read, document, encoding, finding);
+        status != exitDone) {
+        if (fault) {
+            const bool hasPlace = finding.offset() >= 0;
+            fault->line = hasPlace ? lineOf(bytes, finding.offset(),
+                                            encoding == pugi::encoding_latin1)
+                                   : 0;
+            fault->description = finding.description();
+        }
         return status;
+    }
     read.filePath = preset.filePath;
     read.reserved1 = preset.reserved1;
     read.reserved2 = preset.reserved2;
@@ -288,24 +419,31 @@ int parsePreset(std::string_view bytes, bool keepJobChoice,
     return exitDone;
 }
 
-int readPreset(const std::string& path, bool keepJobChoice,
-               tolerancePresetParameterRecord& preset) {
+int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParameterRecord& preset,
+               PresetFault* fault) {
     std::string bytes;
+    const auto fail = [&](int status, const char* description) {
+        if (fault) {
+            *fault = {0, description};
+        }
+        return status;
+    };
     switch (colour::readWholeFile(path, maxPresetBytes, bytes)) {
     case colour::Failure::None:
         break;
     case colour::Failure::Missing:
-        return exitPresetMissing;
+        return fail(exitPresetMissing, "there is no file");
     case colour::Failure::TooLarge:
-        return exitPresetWrongKind;
+        return fail(exitPresetWrongKind, "the file has more than 1 MB");
     case colour::Failure::OutOfMemory:
         return exitOutOfMemory;
     default:
-        return exitPresetUnreadable;
+        return fail(exitPresetUnreadable, "the file can't be read");
     }
-    const int status = parsePreset(bytes, keepJobChoice, preset);
-    if (status == exitDone && preset.filePath.empty())
+    const int status = parsePreset(bytes, keepJobChoice, preset, fault);
+    if (status == exitDone && preset.filePath.empty()) {
         preset.filePath = wxString(widened(path));
+    }
     return status;
 }
 

@@ -5,6 +5,7 @@
 #include <string_view>
 
 #include "ExitCodes.h"
+#include "companions/tintgate-report/CheckPreset.h"
 #include "companions/tintgate-report/Failure.h"
 
 namespace reporting {
@@ -47,6 +48,14 @@ std::string jobParagraph(const ExitCodeText& code) {
     return paragraph("Job", text);
 }
 
+/// The folder that remedies of presets speak of. Nothing if it is not known.
+std::string presetsParagraph(int code) {
+    const bool isAboutPresets =
+        (code >= exitPresetMissing && code <= exitPresetUnknownEntry) || code == exitPresetFailed;
+    const std::string folder = isAboutPresets ? installedPresets() : "";
+    return folder.empty() ? "" : paragraph("Presets", folder);
+}
+
 } // namespace
 
 std::string explanationOf(int code) {
@@ -61,6 +70,7 @@ std::string explanationOf(int code) {
     std::string text = paragraph(std::to_string(code), found->meaning + std::string(".")) +
                        paragraph("Cause", found->cause + std::string(".")) +
                        paragraph("Remedy", found->remedy + std::string("."));
+    text += presetsParagraph(code);
     if (found->jobActor != nullptr) {
         text += jobParagraph(*found);
     }

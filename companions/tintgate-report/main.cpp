@@ -16,6 +16,7 @@
 #include "report/Page.h"
 #include "report/PageFile.h"
 #include "report/TrendPage.h"
+#include "companions/tintgate-report/CheckPreset.h"
 #include "companions/tintgate-report/Explain.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
@@ -42,6 +43,7 @@ Examples:
   tintgate-report results/ -o trend.html          the trend of all results below
   tintgate-report --store /srv/tintgate --since 30d --paper matt -o trend.html
   tintgate-report --explain $?                    behind a run of Tintgate
+  tintgate-report --check-preset my-preset.xml    what is wrong with a preset, and where
   tintgate-report --tidy 30 --dry-run
 
 A trend compares only results of one paper, preset, instrument, workflow and strip
@@ -67,6 +69,7 @@ struct Options {
     reporting::Filter filter;
     std::optional<int> code;
     std::optional<int> tidyDays;
+    std::string preset;
     bool dryRun = false;
 
     bool fromStore() const { return !store.empty(); }
@@ -197,6 +200,8 @@ int run(const Options& options) {
     try {
         if (options.code)
             reporting::writeOutput("-", reporting::explanationOf(*options.code));
+        else if (!options.preset.empty())
+            reporting::writeOutput("-", reporting::presetSummary(options.preset));
         else if (options.tidyDays)
             return static_cast<int>(tidyFolders(options));
         else if (wantsTrend(options))
@@ -271,6 +276,11 @@ void addOptions(CLI::App& program, Options& options) {
         ->type_name("CODE")
         ->group(upkeep);
     program
+        .add_option("--check-preset", options.preset,
+                    "Check a tolerance preset, and name the line and\nthe element of its first fault")
+        ->type_name("FILE")
+        ->group(upkeep);
+    program
         .add_option("--tidy", options.tidyDays,
                     "Remove the folders of jobs in the temporary\n"
                     "folder in which nothing has changed for so many\n"
@@ -297,13 +307,13 @@ void settle(Options& options) {
     if (!options.until.empty())
         options.filter.until = day(options.until, "--until") + secondsOfDay;
     const char* const store = std::getenv("TINTGATE_STORE");
-    if (!options.code && !options.tidyDays && options.results.empty() && options.store.empty() &&
+    if (!options.code && !options.tidyDays && options.preset.empty() && options.results.empty() && options.store.empty() &&
         store != nullptr)
         options.store = store;
-    if (options.code.has_value() + options.tidyDays.has_value() + options.fromStore() +
-            !options.results.empty() !=
+    if (options.code.has_value() + options.tidyDays.has_value() + !options.preset.empty() +
+            options.fromStore() + !options.results.empty() !=
         1)
-        throw CLI::RequiredError("One of results, --store, --explain and --tidy");
+        throw CLI::RequiredError("One of results, --store, --explain, --check-preset and --tidy");
     if (options.text + options.csv + options.verdict > 1)
         throw CLI::ExcludesError("--text, --csv and --verdict", "each other");
     constexpr int mostDays = 36500;

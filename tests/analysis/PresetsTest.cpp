@@ -71,6 +71,51 @@ TEST(Presets, EverythingOfTheRecordComesFromTheFile) {
     }
 }
 
+TEST(Presets, AFaultIsNamedWithElementAndLine) {
+    const struct {
+        std::string from, to;
+        std::size_t line;
+        const char* description;
+    } edits[] = {
+        {"</tolerancePreset>", "</criteria>", 17, "Start-end tags mismatch"},
+        {"ü", "\xFC", 5, "<name> is not UTF-8"},
+        {"<!-- a comment -->", "<!DOCTYPE a>", 2, "a preset has no document type"},
+        {" version=\"1\"", "", 3, "version of <tolerancePreset> is missing or empty"},
+        {"<id>12</id>\n", "\n", 3, "<id> is missing or empty"},
+        {">yes<", "><", 7, "<editable> is missing or empty"},
+        {"used=\"yes\"", "", 13, "used of <average> is missing or empty"},
+        {"<psd>no", "<psd>yes", 13, "psdTolerance of <average> is missing or empty"},
+        {"<psd>no", "\n<psd>no</psd><psd>no", 12, "<psd> appears twice"},
+        {"decimals=\"10\"", "decimals=\"10\" decimals=\"1\"", 14,
+         "decimals of <greyHueAverage> appears twice"},
+        {"2.5", "2,5", 13, "tolerance of <average> is not a number: 2,5"},
+        {"1e1", "1e9", 15,
+         "tolerance of <spotMaximum> is outside its range or not one of its choices: 1e9"},
+        {"<average", "<avarage", 13, "<avarage> is unknown here"},
+        {"<average", "<average colour=\"1\"", 13, "colour of <average> is unknown here"},
+        {"<average", "more <average", 13, "text in <criteria> is unknown here"},
+    };
+    for (const auto& [from, to, line, description] : edits) {
+        std::string text = goodText;
+        text.replace(text.find(from), from.size(), to);
+        Record record;
+        PresetFault fault;
+        EXPECT_NE(parsePreset(text, false, record, &fault), exitDone);
+        EXPECT_EQ(fault.line, line) << description;
+        EXPECT_EQ(fault.description, description);
+    }
+    // The parser counts in UTF-8.
+    const std::string umlauts(30, '\xFC');
+    Record record;
+    PresetFault fault;
+    EXPECT_EQ(parsePreset("<?xml version=\"1.0\" encoding=\"ISO-8859-1\"?>\n<!--" + umlauts +
+                              "-->\n<tolerancePreset version=\"1\">\n\n\n<colour/>\n\n\n\n\n"
+                              "</tolerancePreset>",
+                          false, record, &fault),
+              exitPresetUnknownEntry);
+    EXPECT_EQ(fault.line, 6u);
+}
+
 // What becomes of the text above with a word of it replaced.
 TEST(Presets, OneCodeForOneCause) {
     const std::tuple<std::string, std::string, int> edits[] = {

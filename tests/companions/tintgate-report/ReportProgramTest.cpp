@@ -138,6 +138,20 @@ TEST_F(ReportProgram, ExplainsExitCodes) {
     EXPECT_THAT(report({"--explain", "139"}).error, HasSubstr("signal"));
 }
 
+TEST_F(ReportProgram, ChecksPresets) {
+    const std::string sound = TINTGATE_SOURCE_DIR "/presets/CVP_0001.xml";
+    EXPECT_THAT(report({"--check-preset", sound}).output,
+                AllOf(HasSubstr("sound"), HasSubstr("preset 1, ")));
+    std::string text = support::contentsOf(sound);
+    const std::size_t used = text.rfind("used=\"yes\""); // A comment has the first.
+    const auto line = std::count(text.begin(), text.begin() + std::ptrdiff_t(used), '\n') + 1;
+    const std::string broken = m_scratch.write("preset.xml", text.replace(used, 10, "used=\"y\""));
+    const support::Outcome outcome = report({"--check-preset", broken});
+    EXPECT_EQ(outcome.exitCode, 4);
+    EXPECT_THAT(outcome.error, AllOf(HasSubstr(broken + ":" + std::to_string(line) + ": used of <"),
+                                     HasSubstr(": y (exit code 47)")));
+}
+
 TEST_F(ReportProgram, EndsEachFaultInItsOwnStatus) {
     const std::string broken = m_scratch.write("broken.json", "{\"format\":");
     const std::string missing = m_scratch.path("nothing.json");
@@ -147,6 +161,9 @@ TEST_F(ReportProgram, EndsEachFaultInItsOwnStatus) {
         {{broken}, 4},
         {{m_result, "-o", folder}, 5},
         {{m_result, "--csv", "-o", "/dev/full"}, 5},
+        {{"--check-preset", missing}, 3},
+        {{"--check-preset", broken}, 4},
+        {{"--check-preset", broken, missing}, 64},
         {{"--text"}, 64},
     };
     for (const auto& [words, exitCode] : cases) {
