@@ -215,7 +215,7 @@ std::int64_t putRun(const Json& run, std::int64_t next, store::Elements& element
     }
     const auto [type, values] = typeAndValues(run);
     std::int64_t position = startOf(run, next);
-    const auto put = [&](const Json& value) {
+    const auto put = [&, type = type](const Json& value) {
         if (position > store::highestPosition) {
             throw Failure(Status::BadInput, "there are more elements than a key can hold");
         }

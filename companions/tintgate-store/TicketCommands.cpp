@@ -90,7 +90,9 @@ void import(store::StoreEngine& store, const NamedTicket& ticket, bool merge) {
     try {
         const bool changed =
             store.change(name.type, name.id, scope,
-                         [&](store::TicketContent& stored) { stored.transfer(content, !merge); });
+                         [&, &content = content](store::TicketContent& stored) {
+                             stored.transfer(content, !merge);
+                         });
         if (!changed) {
             throw Failure(Status::Busy, "somebody else removed the ticket meanwhile");
         }

@@ -116,7 +116,7 @@ struct CoarseClock {
     using rep = duration::rep;
     using period = duration::period;
     using time_point = std::chrono::time_point<CoarseClock>;
-    static constexpr bool is_steady = true;
+    [[maybe_unused]] static constexpr bool is_steady = true;
 
     /// A tick of the system, by which it is late at most.
     static constexpr std::chrono::milliseconds coarseness{10};
