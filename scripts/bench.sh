@@ -9,7 +9,7 @@ cmake --preset release >/dev/null
 
 # Each prints a ratio against a peer or a bare loop that it times in the same run.
 benches=(colour_cgats_bench colour_difference_bench ticket_list_bench ticket_flush_bench jdf_bench
-  store_bench job_bench)
+  store_bench measure_bench job_bench)
 cmake --build --preset release --target Tintgate empty_wx store_postgres_bench "${benches[@]}"
 for bench in "${benches[@]}"; do
   echo "== $bench"
