@@ -9,6 +9,9 @@ execute_process(COMMAND ${WX_CONFIG} --cxxflags base
   OUTPUT_VARIABLE _wx_cxxflags OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
 execute_process(COMMAND ${WX_CONFIG} --libs base
   OUTPUT_VARIABLE _wx_libs OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
+# For programs that use the installed library.
+set(TINTGATE_PC_WX_CFLAGS "${_wx_cxxflags}")
+set(TINTGATE_PC_WX_LIBS "${_wx_libs}")
 separate_arguments(_wx_cxxflags UNIX_COMMAND "${_wx_cxxflags}")
 separate_arguments(_wx_libs UNIX_COMMAND "${_wx_libs}")
 list(TRANSFORM _wx_cxxflags REPLACE "^-I" "-isystem")

@@ -114,6 +114,16 @@ install(FILES job/AnalysisLibrary.h job/JobRecords.h DESTINATION "${_include}/jo
   COMPONENT libtintgate-dev)
 install(FILES "${PROJECT_BINARY_DIR}/see/exitcodes/ExitCodes.h" DESTINATION "${_include}"
   COMPONENT libtintgate-dev)
+# The version is the library's own. The prefix is found from the file's place.
+get_target_property(TINTGATE_PC_VERSION libTintgate VERSION)
+file(RELATIVE_PATH TINTGATE_PREFIX_FROM_PC "/${CMAKE_INSTALL_LIBDIR}/pkgconfig" "/")
+configure_file(cmake/tintgate.pc.in "${_made}/tintgate.pc" @ONLY)
+install(FILES "${_made}/tintgate.pc" DESTINATION "${CMAKE_INSTALL_LIBDIR}/pkgconfig"
+  COMPONENT libtintgate-dev)
+install(FILES docs/example-library/compare.cpp DESTINATION "${_doc}/libtintgate-dev/examples"
+  COMPONENT libtintgate-dev)
+install(FILES docs/criteria.md docs/result.md docs/result.schema.json
+  DESTINATION "${_doc}/libtintgate-dev" COMPONENT libtintgate-dev)
 set(_packages tintgate libtintgate1 libtintgate-dev tintgate-comgui tintgate-companions)
 foreach(_package IN LISTS _packages)
   install(FILES debian/copyright "${_made}/changelog.gz" DESTINATION "${_doc}/${_package}"
@@ -168,7 +178,7 @@ set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_DEPENDS
   "libtintgate1 (= ${PROJECT_VERSION}), libwxgtk3.2-dev")
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_DESCRIPTION "analysis library of Tintgate, for developers
 Compares colour data, judges the outcome by a tolerance preset and writes it as
-JSON. This package holds the headers.")
+JSON. This package contains the headers, a pkg-config file and an example.")
 
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_NAME tintgate-comgui)
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_SECTION graphics)

@@ -33,7 +33,7 @@ struct tolerancePresetParameterRecord {
     int usedForPSDResult[psdPresetValueCount] = {};
 };
 
-/// What an analysis says. docs/criteria.md states every entry.
+/// What an analysis says. criteria.md describes every entry.
 struct analyseResultsRecord {
     double values[resultValueCount] = {}; ///< -1.0 where the data can't answer.
     bool approvals[presetValueCount] = {};
@@ -47,7 +47,7 @@ struct analyseResultsRecord {
 #define TINTGATE_API
 #endif
 
-// Every integer result is a status: 0 is success, anything else a code of docs/exit-codes.csv. The
+// Every integer result is a status: 0 is success, anything else a code of ExitCodes.h. The
 // library is not reentrant: all calls come from one thread.
 
 /// Compares target with measurement, each an ICC profile or a CGATS text, under a preset.

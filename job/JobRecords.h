@@ -19,7 +19,7 @@ struct spectralRow {
 /// One measurement or reference data set.
 ///
 /// The arrays come from malloc and hold numPatches rows each. A copy of the record shares them;
-/// destruction frees nothing: KZVerifyJobProcessor::FreeMeasurementData does.
+/// destruction frees nothing: the owner of the job does, with free.
 struct measurementDataRecord {
     wxString reservedText1;
     wxString reservedText2;
@@ -56,7 +56,7 @@ struct KZJobDataStruct {
     int useDynstrip = 0;
     int deviceID = 0;            ///< Measuring instrument; 0 is unknown.
     int nestedStrip = 0;         ///< 1 when a nesting control strip was fetched.
-    int* childJobIDs = nullptr;  ///< From malloc; freed by VerifyKZJob.
+    int* childJobIDs = nullptr;  ///< From malloc; freed by the owner of the job.
     int childJobCount = 0;
     int presetID = 0;
     int measurementWorkflow = 0;

@@ -18,7 +18,7 @@ from tables import (c_text, expect_rising, markdown, read, replaced, roff,  # no
                     write_or_check)
 
 HEADER = """\
-// Made from docs/exit-codes.csv and docs/job-outcomes.csv; change those files instead.
+// Made from the lists that document exit codes.
 #pragma once
 
 /// Exit codes of the tool, and statuses of the analysis library. One code for one cause.

@@ -1,12 +1,15 @@
 #!/usr/bin/env bash
-# Verifies a job with the programs that `cmake --install` put into a prefix, and with nothing in the
-# environment that leads to a suite: measured by the virtual instrument, then shown.
+# Tries what `cmake --install` put into a prefix. Verifies a job with nothing in the environment that
+# leads to a suite: measured by the virtual instrument, then shown. Then builds the example of the
+# library's users against the installed headers and library.
 #
-#   try-installed.sh PREFIX
+#   try-installed.sh PREFIX [COMPILER OPTION...]
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
 prefix=$(cd "$1" && pwd)
+shift
+[ $# -gt 0 ] || set -- g++
 settings=$prefix/lib/tintgate/root/Library/Preferences/NerovaMeasure.conf
 profile=$(find /usr/share/color/icc/ghostscript -name default_cmyk.icc)
 place=$(mktemp -d)
@@ -32,3 +35,21 @@ done
 echo "there is no page in $folder" >&2
 exit 1
 INSIDE
+
+pc=$(find "$prefix" -name tintgate.pc)
+PKG_CONFIG_PATH=$(dirname "$pc")
+export PKG_CONFIG_PATH
+# shellcheck disable=SC2046 # Options are words.
+"$@" -std=c++17 -Wall -Wextra -Werror "$prefix/share/doc/libtintgate-dev/examples/compare.cpp" \
+  $(pkg-config --cflags --libs tintgate) \
+  "-Wl,-rpath,$(pkg-config --variable=libdir tintgate)" -o "$place/compare"
+sets=/usr/share/color/icc
+"$place/compare" "$sets/FOGRA39L.ti3" "$sets/FOGRA39L.ti3" \
+  "$prefix/share/tintgate/presets/CVP_0002.xml"
+code=0
+"$place/compare" "$sets/FOGRA39L.ti3" "$sets/FOGRA28L.ti3" \
+  "$prefix/share/tintgate/presets/CVP_0002.xml" || code=$?
+[ "$code" -eq 1 ]
+words=$("$place/compare" "$sets/FOGRA39L.ti3" "$place/none" \
+  "$prefix/share/tintgate/presets/CVP_0002.xml" 2>&1) || true
+grep "An input file is not there" <<<"$words"

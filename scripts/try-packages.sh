@@ -1,6 +1,7 @@
 #!/usr/bin/env bash
 # Installs the packages of scripts/package.sh in a fresh Debian 12 without a compiler, and verifies a
-# job there: measured by the virtual instrument, then shown. Needs root, debootstrap and a mirror.
+# job there: measured by the virtual instrument, then shown. Then installs a compiler and builds the
+# example of libtintgate-dev. Needs root, debootstrap and a mirror.
 #
 #   try-packages.sh [FOLDER]      a folder for the root, kept; else one that is removed again
 set -euo pipefail
@@ -21,7 +22,8 @@ mount -t proc proc "$root/proc"
 cp /etc/resolv.conf "$root/etc/"
 mkdir -p "$root/packages"
 cp "${packages[@]}" "$root/packages/"
-rm -f "$root"/packages/libtintgate-dev_*
+mkdir -p "$root/packages/dev"
+mv "$root"/packages/libtintgate-dev_* "$root/packages/dev/"
 
 chroot "$root" bash -euo pipefail <<'INSIDE'
 export DEBIAN_FRONTEND=noninteractive LANG=C
@@ -56,4 +58,11 @@ man -w Tintgate tintgate-store tintgate-report NerovaMeasure NerovaVerify 2>/dev
 echo "exit code of the job: $code"
 exit "$code"
 PRESS
+
+apt-get install -y -q --no-install-recommends /packages/dev/*.deb g++ pkg-config >/dev/null
+# shellcheck disable=SC2046 # Options are words.
+g++ -std=c++17 -Wall -Wextra -Werror /usr/share/doc/libtintgate-dev/examples/compare.cpp \
+  $(pkg-config --cflags --libs tintgate) -o /tmp/compare
+/tmp/compare /usr/share/color/icc/FOGRA39L.ti3 /usr/share/color/icc/FOGRA39L.ti3 \
+  /usr/share/tintgate/presets/CVP_0002.xml
 INSIDE
