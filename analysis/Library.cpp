@@ -61,8 +61,8 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
     // Of a job, target and measurement are never one file unless a name has gone wrong: every patch
     // would pass. A person may compare a file with itself.
     std::error_code error;
-    const bool isSameFile = std::filesystem::equivalent(narrowed(paths.target),
-                                                        narrowed(paths.measurement), error);
+    const bool isSameFile =
+        std::filesystem::equivalent(narrowed(paths.target), narrowed(paths.measurement), error);
     if (isSameFile && job) {
         return exitTargetIsMeasurement;
     }

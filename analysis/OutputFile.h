@@ -16,8 +16,8 @@ namespace analysis {
 /// (can't be created or written to) or 51 (could not be written to its end).
 int writeOutputFile(const std::string& path, std::string_view bytes);
 
-/// Whether a CGATS text may be written to `path`: 0, 52 (a regular file that is one of `inputs`, under
-/// whatever name) or 53 (a regular file that is neither empty nor CGATS text).
+/// Whether a CGATS text may be written to `path`: 0, 52 (a regular file that is one of `inputs`,
+/// under whatever name) or 53 (a regular file that is neither empty nor CGATS text).
 int checkOutput(const std::string& path, std::initializer_list<std::string> inputs);
 
 } // namespace analysis

@@ -243,8 +243,8 @@ Status readCriterion(const pugi::xml_node& element, const Criterion& criterion, 
             status = readNumber(text, 0, largestDecimals, preset.decimalPlaces[criterion.index]);
             break;
         case 3:
-            status = readNumber(text, 0.0, largestTolerance,
-                                preset.psdPresetValues[criterion.psdEntry]);
+            status =
+                readNumber(text, 0.0, largestTolerance, preset.psdPresetValues[criterion.psdEntry]);
             break;
         default:
             status = readSwitch(text, preset.usedForPSDResult[criterion.psdEntry]);
@@ -397,13 +397,11 @@ int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParam
     pugi::xml_document document;
     pugi::xml_encoding encoding = pugi::encoding_utf8;
     Finding finding;
-    if (const Status status = parse(bytes, read, document, encoding, finding);
-        status != exitDone) {
+    if (const Status status = parse(bytes, read, document, encoding, finding); status != exitDone) {
         if (fault) {
             const bool hasPlace = finding.offset() >= 0;
-            fault->line = hasPlace ? lineOf(bytes, finding.offset(),
-                                            encoding == pugi::encoding_latin1)
-                                   : 0;
+            fault->line =
+                hasPlace ? lineOf(bytes, finding.offset(), encoding == pugi::encoding_latin1) : 0;
             fault->description = finding.description();
         }
         return status;

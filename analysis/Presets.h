@@ -23,8 +23,8 @@ struct PresetFault {
 /// With keepJobChoice presetID and deltaEMode of the record stay, and all else comes from the file;
 /// an entry that the file does not name is 0. A filePath that the caller has given stays, an empty
 /// one becomes `path`. Gives exitDone or one of the codes exitPresetMissing to
-/// exitPresetUnknownEntry, or exitOutOfMemory; on failure `preset` is left as it was, and *fault (if
-/// not null) describes the fault.
+/// exitPresetUnknownEntry, or exitOutOfMemory; on failure `preset` is left as it was, and *fault
+/// (if not null) describes the fault.
 int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParameterRecord& preset,
                PresetFault* fault = nullptr);
 

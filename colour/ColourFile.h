@@ -20,8 +20,8 @@ struct ColourFile {
 /// Loads the file at `path` (bytes as the file system has them). On failure `file` is untouched.
 Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file);
 
-/// Loads the file at `path` as a profile; NotRecognised if it is anything else. It need not be read to
-/// its end for that. On failure `profile` may hold no profile.
+/// Loads the file at `path` as a profile; NotRecognised if it is anything else. It need not be read
+/// to its end for that. On failure `profile` may hold no profile.
 Failure loadProfile(const std::string& path, Profile& profile);
 
 /// Whole contents of a file; Missing, Unreadable, TooLarge (above `limit`) or OutOfMemory. Devices

@@ -8,10 +8,10 @@
 
 namespace measure {
 
-/// A text file that is walked line by line, with the lines, the conversion and the current line of a
-/// wxTextFile opened with wxConvAuto. It keeps the text and no list of lines, which for a file of
-/// short lines is 80 times as large as the file: reading takes 9 bytes for each byte of the file, and
-/// keeping the text 4.
+/// A text file that is walked line by line, with the lines, the conversion and the current line of
+/// a wxTextFile opened with wxConvAuto. It keeps the text and no list of lines, which for a file of
+/// short lines is 80 times as large as the file: reading takes 9 bytes for each byte of the file,
+/// and keeping the text 4.
 class StripText {
   public:
     /// Reads a file; its first line becomes the current one. False if there is no regular file of

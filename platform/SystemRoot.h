@@ -10,8 +10,8 @@ namespace platform {
 ///
 /// The environment variable TINTGATE_ROOT, else the one given at build time (the CMake variable of
 /// the same name), else that of the installation to which the program belongs: an installed suite
-/// works wherever its prefix is. A program in a build tree belongs to none. A root with a quote, a dollar sign, a backtick or a backslash counts as none: it
-/// could not stand in a shell command.
+/// works wherever its prefix is. A program in a build tree belongs to none. A root with a quote, a
+/// dollar sign, a backtick or a backslash counts as none: it could not stand in a shell command.
 std::string systemRoot();
 
 /// A literal path of the suite, below the system root. For literals alone: values that were read

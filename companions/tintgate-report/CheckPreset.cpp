@@ -24,8 +24,9 @@ std::string presetSummary(const std::string& path) {
                       path + (fault.line != 0 ? ":" + std::to_string(fault.line) : "") + ": " +
                           fault.description + " (exit code " + std::to_string(code) + ")");
     }
-    const auto used = std::count_if(std::begin(preset.usedForResult),
-                                    std::end(preset.usedForResult), [](int use) { return use != 0; });
+    const auto used =
+        std::count_if(std::begin(preset.usedForResult), std::end(preset.usedForResult),
+                      [](int use) { return use != 0; });
     return path + ": sound; preset " + std::to_string(preset.presetID) + ", \"" +
            preset.name.utf8_string() + "\", judges by " + std::to_string(used) +
            (used == 1 ? " criterion\n" : " criteria\n");

@@ -6,7 +6,8 @@
 namespace reporting {
 
 /// One line about a sound preset: its file, number, name and number of criteria. Throws Failure
-/// (Missing or Broken) with the line, the element and the exit code that Tintgate gives for the fault.
+/// (Missing or Broken) with the line, the element and the exit code that Tintgate gives for the
+/// fault.
 std::string presetSummary(const std::string& path);
 
 /// Where the presets are that were installed with this program; empty if it is not installed.

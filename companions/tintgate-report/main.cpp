@@ -277,7 +277,8 @@ void addOptions(CLI::App& program, Options& options) {
         ->group(upkeep);
     program
         .add_option("--check-preset", options.preset,
-                    "Check a tolerance preset, and name the line and\nthe element of its first fault")
+                    "Check a tolerance preset, and name the line and\n"
+                    "the element of its first fault")
         ->type_name("FILE")
         ->group(upkeep);
     program
@@ -307,8 +308,8 @@ void settle(Options& options) {
     if (!options.until.empty())
         options.filter.until = day(options.until, "--until") + secondsOfDay;
     const char* const store = std::getenv("TINTGATE_STORE");
-    if (!options.code && !options.tidyDays && options.preset.empty() && options.results.empty() && options.store.empty() &&
-        store != nullptr)
+    if (!options.code && !options.tidyDays && options.preset.empty() && options.results.empty() &&
+        options.store.empty() && store != nullptr)
         options.store = store;
     if (options.code.has_value() + options.tidyDays.has_value() + !options.preset.empty() +
             options.fromStore() + !options.results.empty() !=

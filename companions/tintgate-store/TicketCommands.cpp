@@ -88,11 +88,10 @@ void import(store::StoreEngine& store, const NamedTicket& ticket, bool merge) {
     }
     const bool made = store.create(name.type, name.id);
     try {
-        const bool changed =
-            store.change(name.type, name.id, scope,
-                         [&, &content = content](store::TicketContent& stored) {
-                             stored.transfer(content, !merge);
-                         });
+        const bool changed = store.change(name.type, name.id, scope,
+                                          [&, &content = content](store::TicketContent& stored) {
+                                              stored.transfer(content, !merge);
+                                          });
         if (!changed) {
             throw Failure(Status::Busy, "somebody else removed the ticket meanwhile");
         }

@@ -1,11 +1,11 @@
-// Compares a measurement with a target under a tolerance preset, as a program that uses libTintgate.
-// With libtintgate-dev installed:
+// Compares a measurement with a target under a tolerance preset, as a program that uses
+// libTintgate. With libtintgate-dev installed:
 //
 //   g++ -std=c++17 compare.cpp $(pkg-config --cflags --libs tintgate) -o compare
 //   ./compare target.ti3 measurement.ti3 /usr/share/tintgate/presets/CVP_0001.xml
 //
-// Prints the average and the largest colour difference and the verdict. Exit status: 0 passed, 1 not
-// passed, 2 not compared.
+// Prints the average and the largest colour difference and the verdict. Exit status: 0 passed, 1
+// not passed, 2 not compared.
 #include <clocale>
 #include <cstdio>
 #include <string>
@@ -45,9 +45,9 @@ int main(int count, char** arguments) {
     }
     analyseResultsRecord results;
     std::wstring json; // The whole result, with every patch.
-    if (const int status = analyzeMeasurements(stringToWstring(arguments[1]),
-                                               stringToWstring(arguments[2]), L"", preset, &results,
-                                               &json, nullptr)) {
+    if (const int status =
+            analyzeMeasurements(stringToWstring(arguments[1]), stringToWstring(arguments[2]), L"",
+                                preset, &results, &json, nullptr)) {
         return fail(status);
     }
     std::printf("libTintgate %u.%u.%u, %s: average %.2f, largest %.2f, %s\n", major, minor, patch,
