@@ -176,6 +176,8 @@ set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_NAME libtintgate-dev)
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_DEPENDS
   "libtintgate1 (= ${PROJECT_VERSION}), libwxgtk3.2-dev")
+# Texts of ExitCodes.h for people name programs and pages of these.
+set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_SUGGESTS "tintgate, tintgate-companions")
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_DESCRIPTION "analysis library of Tintgate, for developers
 Compares colour data, judges the outcome by a tolerance preset and writes it as
 JSON. This package contains the headers, a pkg-config file and an example.")
