@@ -51,6 +51,11 @@ constexpr Statement oneKey = {
 constexpr Statement allKeys = {
     "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number"
     " WHERE type = $1 AND id = $2"};
+constexpr Statement exactKeys = {
+    "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
+    " hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact))"
+    " WHERE type = $1 AND id = $2"};
+// Names have no index, as they may be of any length, so that a prefix costs a walk of the ticket.
 constexpr Statement someKeys = {
     "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
     " (hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact)) OR"
@@ -216,8 +221,10 @@ class PostgresEngine : public StoreEngine {
                                                  const KeyFilter& filter) override {
         const Names exact(filter.exact().begin(), filter.exact().end());
         const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
-        const Result rows = filter.all() ? m_connection.run(allKeys, type, id)
-                                         : m_connection.run(someKeys, type, id, exact, prefixes);
+        const Result rows = filter.all()       ? m_connection.run(allKeys, type, id)
+                            : prefixes.empty() ? m_connection.run(exactKeys, type, id, exact)
+                                               : m_connection.run(someKeys, type, id, exact,
+                                                                  prefixes);
         return rows.rows() == 0 ? nullptr : std::make_shared<TicketContent>(contentOf(rows));
     }
 

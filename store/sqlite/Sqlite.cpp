@@ -122,6 +122,10 @@ Transaction::~Transaction() {
     }
 }
 
+ReadTransaction::~ReadTransaction() {
+    sqlite3_exec(m_database.get(), "COMMIT", nullptr, nullptr, nullptr);
+}
+
 void Transaction::commit() {
     m_database.run("COMMIT"); // Where that fails, the destructor undoes it.
     m_open = false;

@@ -116,4 +116,16 @@ class Transaction {
     bool m_open = true;
 };
 
+/// Statements that read, all of one moment.
+class ReadTransaction {
+  public:
+    explicit ReadTransaction(Database& database) : m_database(database) { m_database.run("BEGIN"); }
+    ~ReadTransaction();
+    ReadTransaction(const ReadTransaction&) = delete;
+    ReadTransaction& operator=(const ReadTransaction&) = delete;
+
+  private:
+    Database& m_database;
+};
+
 } // namespace store::sqlite

@@ -30,6 +30,7 @@ namespace store {
 namespace {
 
 using sqlite::Database;
+using sqlite::ReadTransaction;
 using sqlite::Statement;
 using sqlite::Transaction;
 
@@ -107,6 +108,17 @@ void setKind(Database& database, std::int64_t kind) {
     database.run(("PRAGMA application_id = " + std::to_string(kind)).c_str());
 }
 
+/// The first bytes behind all that start with a prefix; empty where nothing is behind them.
+std::string endOfPrefix(std::string prefix) {
+    while (!prefix.empty() && prefix.back() == '\xFF') {
+        prefix.pop_back();
+    }
+    if (!prefix.empty()) {
+        prefix.back() = static_cast<char>(static_cast<unsigned char>(prefix.back()) + 1);
+    }
+    return prefix;
+}
+
 class SqliteEngine : public StoreEngine {
   public:
     explicit SqliteEngine(const std::string& folder, std::int64_t kind = applicationId)
@@ -176,17 +188,35 @@ class SqliteEngine : public StoreEngine {
 
     std::shared_ptr<const TicketContent> content(int type, int id,
                                                  const KeyFilter& filter) override {
-        // One statement: SQLite sees one moment throughout. A ticket without keys gives one row.
+        // What is asked for must not cost the reading of all other keys. All of it is of one
+        // moment: a statement by itself, several within a transaction.
         auto content = std::make_shared<TicketContent>();
-        auto run = m_content.run(type, id);
-        bool found = false;
-        while (run.step()) {
-            found = true;
-            if (!run.isNull(0) && filter.takes(run.bytes(0))) {
-                content->put(run.text(0), decoded(run.bytes(1)));
-            }
+        if (filter.all()) {
+            return take(m_content.run(type, id), *content) ? content : nullptr;
         }
-        return found ? content : nullptr;
+        if (filter.exact().size() == 1 && filter.prefixes().empty()) {
+            return take(m_oneKey.run(type, id, *filter.exact().begin()), *content) ? content
+                                                                                    : nullptr;
+        }
+        const ReadTransaction transaction(m_database);
+        std::int64_t ticket = 0;
+        {
+            auto run = m_number.run(type, id);
+            if (!run.step()) {
+                return nullptr;
+            }
+            ticket = run.number(0);
+        }
+        for (const auto& name : filter.exact()) {
+            take(m_namedKey.run(ticket, name), *content);
+        }
+        for (const auto& prefix : filter.prefixes()) {
+            const std::string end = endOfPrefix(prefix);
+            take(end.empty() ? m_keysFrom.run(ticket, prefix)
+                             : m_keysBetween.run(ticket, prefix, end),
+                 *content);
+        }
+        return content;
     }
 
     void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
@@ -330,6 +360,19 @@ class SqliteEngine : public StoreEngine {
         }
     };
 
+    /// Puts rows of name and value in a content. A ticket without keys may give one of nulls. False
+    /// for no rows.
+    static bool take(Statement::Run run, TicketContent& content) {
+        bool found = false;
+        while (run.step()) {
+            found = true;
+            if (!run.isNull(0)) {
+                content.put(run.text(0), decoded(run.bytes(1)));
+            }
+        }
+        return found;
+    }
+
     bool insert(int type, int id) {
         m_insert.run(type, id).finish();
         if (sqlite3_changes(m_database.get()) == 0) {
@@ -391,6 +434,13 @@ class SqliteEngine : public StoreEngine {
     Statement m_content{m_database, "SELECT k.name, k.value FROM tickets t"
                                     " LEFT JOIN keys k ON k.ticket = t.number"
                                     " WHERE t.type = ? AND t.id = ? ORDER BY k.name"};
+    Statement m_oneKey{m_database, "SELECT k.name, k.value FROM tickets t"
+                                   " LEFT JOIN keys k ON k.ticket = t.number AND k.name = ?3"
+                                   " WHERE t.type = ?1 AND t.id = ?2"};
+    Statement m_namedKey{m_database, "SELECT name, value FROM keys WHERE ticket = ? AND name = ?"};
+    Statement m_keysFrom{m_database, "SELECT name, value FROM keys WHERE ticket = ? AND name >= ?"};
+    Statement m_keysBetween{m_database, "SELECT name, value FROM keys"
+                                        " WHERE ticket = ? AND name >= ? AND name < ?"};
     Statement m_keyOf{m_database, "SELECT value FROM keys WHERE ticket = ? AND name = ?"};
     Statement m_put{m_database, "INSERT INTO keys (ticket, name, value) VALUES (?, ?, ?)"
                                 " ON CONFLICT (ticket, name) DO UPDATE SET value = excluded.value"};

@@ -69,8 +69,20 @@ TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
         EXPECT_EQ(ticket(*open(), 3, 1), expected);
     }
     const auto engine = open();
-    const char* filter[] = {"b", "é*", nullptr};
-    EXPECT_EQ(contentText(*engine->content(3, 1, store::KeyFilter(filter))), "b[0]='new é[0]=7");
+    const std::pair<std::vector<const char*>, const char*> filters[] = {
+        {{"b", "é*", nullptr}, "b[0]='new é[0]=7"},
+        {{"b*", "b2", "no", nullptr}, "b[0]='new b2[0]=1 b2[1]=2"},
+        {{"b2", nullptr}, "b2[0]=1 b2[1]=2"},
+        {{"no", nullptr}, ""},
+        {{"\xC3*", nullptr}, "é[0]=7"},
+        {{"\xFF*", "c*", nullptr}, ""},
+        {{"*", nullptr}, "b[0]='new b2[0]=1 b2[1]=2 é[0]=7"},
+    };
+    for (const auto& [keys, expected] : filters) {
+        const store::KeyFilter filter(keys.data());
+        EXPECT_EQ(contentText(*engine->content(3, 1, filter)), expected) << keys[0];
+        EXPECT_EQ(engine->content(3, 2, filter), nullptr) << "there is no such ticket";
+    }
 
     // A change that fails on its way leaves nothing.
     const auto failing = [](store::TicketContent& content) {
