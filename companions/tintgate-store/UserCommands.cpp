@@ -30,7 +30,7 @@ void refuseKnown(store::StoreEngine& store, const UserOptions& options) {
 }
 
 void add(const Invocation& invocation, const UserOptions& options) {
-    const std::string name = userName(options.name);
+    const std::string name = newUserName(options.name);
     const auto store = invocation.open();
     refuseKnown(*store, options);
     const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
@@ -98,8 +98,9 @@ void addUserCommands(Command program, Invocation& invocation) {
     command("remove", "Remove a user", remove);
     addCommand<UserOptions>(group, invocation, "list", "List users", options,
                             [&](const UserOptions&) { list(invocation); });
-    group.footer("Names and passwords have 1 to 127 characters, none above U+00FF: a login brings "
-                 "one byte for each.");
+    group.footer("Names and passwords have 1 to 127 characters, none above U+00FF and no \":\": a login "
+                 "brings one byte\nfor each, and a job's arguments keep only what follows the last "
+                 "\":\".");
 }
 
 } // namespace admin
