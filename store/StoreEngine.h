@@ -15,6 +15,7 @@
 #include <string_view>
 #include <vector>
 
+#include "store/JobOverview.h"
 #include "store/tickets/TicketContent.h"
 
 namespace store {
@@ -94,8 +95,8 @@ class StoreEngine {
 
     /// A number that differs from the last one if anybody has committed anything since. It may
     /// differ without that. Meant to be asked before each read. Where only a server knows, it is
-    /// asked if something fetched by keysOfAll may still be as it was; an answer that may be of
-    /// this age spares that. Commits of this object itself are noticed at any age.
+    /// asked if what overview fetched may still be as it was; accepting an answer of this age
+    /// avoids that. Commits of this object itself are noticed at any age.
     virtual std::uint64_t commits(std::chrono::milliseconds age) = 0;
 
     // Tickets.
@@ -125,6 +126,9 @@ class StoreEngine {
     /// largestBytes in the store; by ascending id. Equal elements may be one object.
     virtual void keysOfAll(int type, const std::vector<std::string>& names,
                            std::size_t largestBytes, const ShowKey& show) = 0;
+
+    /// The overview of all jobs, of one moment.
+    virtual void overview(JobOverview& jobs) = 0;
 
     /// One transaction, which locks the ticket first: fetches the keys that the scope needs, has
     /// them changed by work, and writes what differs then. Work touches no key outside the scope.

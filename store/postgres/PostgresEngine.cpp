@@ -3,11 +3,13 @@
 // What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction: it locks
 // the ticket's row, fetches what it needs, writes, and commits. Where it needs nothing of what the
 // keys held, that is one round trip, else two.
+#include <algorithm>
 #include <ctime>
 #include <map>
 #include <utility>
 
 #include "store/Engines.h"
+#include "store/JobOverview.h"
 #include "store/KeyBytes.h"
 #include "store/postgres/Postgres.h"
 #include "store/postgres/PostgresFiles.h"
@@ -41,6 +43,24 @@ constexpr Statement raiseHighest = {
     " RETURNING id"};
 constexpr Statement allHighest = {"SELECT type, id FROM tintgate.highest_ids WHERE id > 0"};
 constexpr Statement removeTicket = {"DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2"};
+
+// The overview of jobs: see JobOverview.h. A ticket's row is locked before its block is, and a
+// transaction touches one ticket only, so that nobody waits in a circle.
+constexpr Statement allBlocks = {"SELECT number, content FROM tintgate.job_blocks"};
+constexpr Statement addEntry = {
+    "INSERT INTO tintgate.job_blocks AS block (number, content) SELECT $3, $4"
+    " FROM tintgate.tickets WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
+    " ON CONFLICT (number) DO UPDATE SET content = overlay(block.content PLACING $5 FROM $6)"};
+constexpr Statement putEntry = {
+    "UPDATE tintgate.job_blocks SET content = overlay(content PLACING $4 FROM $5) WHERE number = $3"
+    " AND EXISTS (SELECT FROM tintgate.tickets WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid)"};
+constexpr Statement removeJob = {
+    "WITH gone AS (DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2 RETURNING id),"
+    " emptied AS (UPDATE tintgate.job_blocks"
+    " SET content = overlay(content PLACING $4 FROM $5) FROM gone WHERE job_blocks.number = $3)"
+    " SELECT count(*) FROM gone"};
 
 // The value only if it is another one than the caller has: one that this change of that ticket
 // wrote.
@@ -176,7 +196,8 @@ class PostgresEngine : public StoreEngine {
             return false; // Without waiting for others.
         }
         noteChange();
-        return m_connection.run(createTicket, type, id).changed() != 0;
+        sendCreate(type, id);
+        return m_connection.finish()[0].changed() != 0;
     }
 
     int createNext(int type) override {
@@ -191,12 +212,18 @@ class PostgresEngine : public StoreEngine {
         if (id > highestTicketId) {
             return -1;
         }
-        m_connection.send(createTicket, type, id);
+        sendCreate(type, id);
         return transaction.commit()[0].changed() != 0 ? id : -1;
     }
 
     bool remove(int type, int id) override {
         noteChange();
+        if (type == jobType) {
+            return m_connection
+                       .run(removeJob, type, id, blockOf(id), std::string(entryBytes, '\0'),
+                            position(entryOffset(id)))
+                       .number(0, 0) != 0;
+        }
         return m_connection.run(removeTicket, type, id).changed() != 0;
     }
 
@@ -230,12 +257,26 @@ class PostgresEngine : public StoreEngine {
 
     void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
                    const ShowKey& show) override {
+        postgres::askForKeys(m_connection, type, names, largestBytes);
+        postgres::showKeys(m_connection.finish()[0], names, show);
+    }
+
+    void overview(JobOverview& jobs) override {
         // The snapshot first: what is committed between the two only has it all fetched again.
         m_asked = CoarseClock::now();
         m_connection.send(snapshot);
-        postgres::askForKeys(m_connection, type, names, largestBytes);
+        m_connection.send(allBlocks);
         const auto results = m_connection.finish();
-        postgres::showKeys(results[1], names, show);
+        // Sorted here: with so many bytes the server would do it on its disk.
+        std::vector<std::pair<int, int>> blocks;
+        for (int row = 0; row < results[1].rows(); ++row) {
+            blocks.emplace_back(static_cast<int>(results[1].number(row, 0)), row);
+        }
+        std::sort(blocks.begin(), blocks.end());
+        jobs.clear();
+        for (const auto& [number, row] : blocks) {
+            jobs.add(number, results[1].bytes(row, 1));
+        }
         m_snapshot = results[0].text(0, 0);
     }
 
@@ -359,6 +400,44 @@ class PostgresEngine : public StoreEngine {
         ++m_commits;
     }
 
+    /// As the server counts bytes.
+    static int position(std::size_t offset) { return static_cast<int>(offset) + 1; }
+
+    /// Sends what makes a ticket. The first result tells whether there is a new one.
+    void sendCreate(int type, int id) {
+        m_connection.send(createTicket, type, id);
+        if (type == jobType) {
+            std::string block(blockBytes, '\0');
+            block[entryOffset(id)] = 1;
+            m_connection.send(addEntry, type, id, blockOf(id), block,
+                              block.substr(entryOffset(id), entryBytes), position(entryOffset(id)));
+        }
+    }
+
+    /// Sends what a change means for the overview.
+    void writeOverview(int id, const Scope& scope, const TicketContent& before,
+                       const TicketContent& after) {
+        std::string entry(1, '\1');
+        for (std::size_t i = 0; i < overviewKeys.size(); ++i) {
+            const auto elements = after.find(overviewKeys[i]);
+            const std::string slot = slotOf(elements.get());
+            entry += slot;
+            if (scope.everything) {
+                continue;
+            }
+            const auto touched = scope.keys.find(overviewKeys[i]);
+            if (touched != scope.keys.end() &&
+                !(touched->second && elements == before.find(overviewKeys[i]))) {
+                m_connection.send(putEntry, jobType, id, blockOf(id), slot,
+                                  position(slotOffset(id, i)));
+            }
+        }
+        if (scope.everything) {
+            m_connection.send(putEntry, jobType, id, blockOf(id), entry,
+                              position(entryOffset(id)));
+        }
+    }
+
     /// Of rows of name and value. A ticket without keys may have one of nulls.
     static TicketContent contentOf(const Result& rows) {
         TicketContent content;
@@ -406,6 +485,9 @@ class PostgresEngine : public StoreEngine {
         } else if (!put.empty()) {
             m_connection.send(putKeys, type, id, put, Names(bytes.begin(), bytes.end()));
         }
+        if (type == jobType) {
+            writeOverview(id, scope, before, after);
+        }
         return scope.everything || !deleted.empty() || !put.empty();
     }
 
@@ -413,7 +495,7 @@ class PostgresEngine : public StoreEngine {
     postgres::Files m_files{m_connection};
     Fetched m_last;
     std::uint64_t m_commits = 0;
-    std::string m_snapshot; ///< Of the last keysOfAll; empty once somebody has committed since.
+    std::string m_snapshot; ///< Of the last overview; empty once somebody has committed since.
     CoarseClock::time_point m_asked; ///< When that was still the server's.
     Ids m_ids;
 };

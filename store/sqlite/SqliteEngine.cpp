@@ -5,7 +5,8 @@
 //   files/          see ServerFiles.h
 //
 // Key names and values are blobs, which SQLite compares as bytes. A key is one row, its value as
-// KeyBytes.h tells. PRAGMA user_version is the format.
+// KeyBytes.h tells; what concerns all jobs is kept once more, as JobOverview.h describes. PRAGMA
+// user_version is the format.
 #include <algorithm>
 #include <cerrno>
 #include <climits>
@@ -20,6 +21,7 @@
 #include <sys/stat.h>
 
 #include "store/Engines.h"
+#include "store/JobOverview.h"
 #include "store/KeyBytes.h"
 #include "store/sqlite/ServerFiles.h"
 #include "store/sqlite/Sqlite.h"
@@ -36,7 +38,15 @@ using sqlite::Transaction;
 
 constexpr std::int64_t applicationId = 0x54474154;    // "TGAT", as file(1) can show it.
 constexpr std::int64_t unfinishedCopyId = 0x54474143; // "TGAC"
-constexpr std::int64_t format = 1;
+/// 1: tickets, keys, users. 2: the overview of jobs.
+constexpr std::int64_t format = 2;
+
+constexpr const char* overviewTable = R"(
+    CREATE TABLE job_blocks (
+        number  INTEGER PRIMARY KEY,  -- as JobOverview.h describes
+        content BLOB NOT NULL
+    ) STRICT;
+)";
 
 constexpr const char* tables = R"(
     CREATE TABLE tickets (
@@ -177,6 +187,9 @@ class SqliteEngine : public StoreEngine {
         Transaction transaction(m_database);
         m_remove.run(type, id).finish();
         const bool removed = sqlite3_changes(m_database.get()) != 0;
+        if (removed && type == jobType) {
+            writeEntry(id, {{entryOffset(id), std::string(entryBytes, '\0')}});
+        }
         transaction.commit();
         return removed;
     }
@@ -236,6 +249,9 @@ class SqliteEngine : public StoreEngine {
         std::map<std::string, std::shared_ptr<const Elements>, std::less<>> known;
         while (run.step()) {
             const auto name = std::find(names.begin(), names.end(), run.bytes(1));
+            if (name == names.end()) { // Index and table disagree.
+                throw StoreFailure(Fault::Damaged, "the store's keys can't be read");
+            }
             std::shared_ptr<const Elements> elements;
             if (!run.isNull(2)) {
                 const std::string_view bytes = run.bytes(2);
@@ -247,6 +263,16 @@ class SqliteEngine : public StoreEngine {
             }
             show(static_cast<int>(run.number(0)), static_cast<std::size_t>(name - names.begin()),
                  std::move(elements));
+        }
+    }
+
+    void overview(JobOverview& jobs) override {
+        jobs.clear();
+        auto run = m_blocks.run();
+        while (run.step()) {
+            // Any other number is refused as damage.
+            jobs.add(static_cast<int>(std::clamp<std::int64_t>(run.number(0), -1, INT_MAX)),
+                     run.bytes(1));
         }
     }
 
@@ -274,6 +300,9 @@ class SqliteEngine : public StoreEngine {
         const TicketContent before = content; // Shares the elements: a change makes others.
         work(content);
         if (write(ticket, scope, before, content)) {
+            if (type == jobType) {
+                writeOverview(id, scope, content);
+            }
             transaction.commit();
         }
         return true;
@@ -379,7 +408,48 @@ class SqliteEngine : public StoreEngine {
             return false;
         }
         m_raiseHighest.run(type, id).finish();
+        if (type == jobType) {
+            writeEntry(id, {{entryOffset(id), std::string(1, '\1')}});
+        }
         return true;
+    }
+
+    /// Bytes by where in a block they go.
+    using Places = std::vector<std::pair<std::size_t, std::string>>;
+
+    /// Writes parts of a job's entry in the overview.
+    void writeEntry(int id, const Places& places) {
+        std::string block(blockBytes, '\0');
+        {
+            auto run = m_block.run(blockOf(id));
+            if (run.step()) {
+                block = run.text(0);
+            }
+        }
+        if (block.size() != blockBytes) {
+            throw StoreFailure(Fault::Damaged, "the store's overview of jobs can't be read");
+        }
+        bool differs = false;
+        for (const auto& [offset, bytes] : places) {
+            differs = differs || block.compare(offset, bytes.size(), bytes) != 0;
+            block.replace(offset, bytes.size(), bytes);
+        }
+        if (differs) {
+            m_putBlock.run(blockOf(id), block).finish();
+        }
+    }
+
+    /// After a change, what concerns the overview.
+    void writeOverview(int id, const Scope& scope, const TicketContent& after) {
+        Places places;
+        for (std::size_t key = 0; key < overviewKeys.size(); ++key) {
+            if (scope.everything || scope.keys.contains(overviewKeys[key])) {
+                places.emplace_back(slotOffset(id, key), slotOf(after.find(overviewKeys[key]).get()));
+            }
+        }
+        if (!places.empty()) {
+            writeEntry(id, places);
+        }
     }
 
     /// False when there was nothing to write.
@@ -442,6 +512,10 @@ class SqliteEngine : public StoreEngine {
     Statement m_keysBetween{m_database, "SELECT name, value FROM keys"
                                         " WHERE ticket = ? AND name >= ? AND name < ?"};
     Statement m_keyOf{m_database, "SELECT value FROM keys WHERE ticket = ? AND name = ?"};
+    Statement m_blocks{m_database, "SELECT number, content FROM job_blocks ORDER BY number"};
+    Statement m_block{m_database, "SELECT content FROM job_blocks WHERE number = ?"};
+    Statement m_putBlock{m_database,
+                         "INSERT OR REPLACE INTO job_blocks (number, content) VALUES (?, ?)"};
     Statement m_put{m_database, "INSERT INTO keys (ticket, name, value) VALUES (?, ?, ?)"
                                 " ON CONFLICT (ticket, name) DO UPDATE SET value = excluded.value"};
     Statement m_delete{m_database, "DELETE FROM keys WHERE ticket = ? AND name = ?"};
@@ -510,6 +584,7 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
         throw StoreFailure(Fault::Exists, folder + " holds a store");
     }
     database.run(tables);
+    database.run(overviewTable);
     if (serverName != nullptr) {
         makeSystemTicket(database, *serverName);
     }
@@ -562,14 +637,65 @@ std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
     return std::make_unique<SqliteCopy>(realPath(address));
 }
 
+/// Makes the overview of the jobs that are there.
+void fillOverview(Database& database) {
+    Statement jobs(database, "SELECT id, number FROM tickets WHERE type = ? ORDER BY id");
+    Statement key(database, "SELECT value FROM keys WHERE ticket = ? AND name = ?");
+    Statement put(database, "INSERT INTO job_blocks (number, content) VALUES (?, ?)");
+    // As anything that is no single number: readers then look at the key itself.
+    const Elements empty;
+    const std::string unreadable = slotOf(&empty);
+    int number = -1;
+    std::string block;
+    const auto finishBlock = [&] {
+        if (number >= 0) {
+            put.run(number, block).finish();
+        }
+    };
+    auto run = jobs.run(jobType);
+    while (run.step()) {
+        const int id = static_cast<int>(run.number(0));
+        if (blockOf(id) != number) {
+            finishBlock();
+            number = blockOf(id);
+            block.assign(blockBytes, '\0');
+        }
+        block[entryOffset(id)] = 1;
+        for (std::size_t i = 0; i < overviewKeys.size(); ++i) {
+            auto value = key.run(run.number(1), overviewKeys[i]);
+            if (value.step()) {
+                // A damaged key is left to those who read it.
+                const auto elements = elementsFromBytes(value.bytes(0));
+                block.replace(slotOffset(id, i), slotBytes,
+                              elements == nullptr ? unreadable : slotOf(elements.get()));
+            }
+        }
+    }
+    finishBlock();
+}
+
 bool upgradeSqlite(const std::string& address) {
     Database database = openDatabase(realPath(address));
     if (database.number("PRAGMA user_version") >= format) {
         checkFormat(database);
         return false;
     }
-    // Format 1 is the first that was ever given out: a step for each later one goes here.
-    throw StoreFailure(Fault::Damaged, "no way is known from this format to the present one");
+    database.run("PRAGMA synchronous = FULL");
+    Transaction transaction(database);
+    // Of two upgrades at once, the second finds nothing to do. Format 1 is the first that was ever
+    // given out: a step for each later one goes here.
+    const std::int64_t found = database.number("PRAGMA user_version");
+    if (found >= format) {
+        return false;
+    }
+    if (found != 1) {
+        throw StoreFailure(Fault::Damaged, "no way is known from this format to the present one");
+    }
+    database.run(overviewTable);
+    fillOverview(database);
+    database.run(("PRAGMA user_version = " + std::to_string(format)).c_str());
+    transaction.commit();
+    return true;
 }
 
 } // namespace

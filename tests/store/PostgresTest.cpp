@@ -116,7 +116,8 @@ TEST_F(Postgres, AServerThatTakesNoChangesIsReadOnly) {
 TEST_F(Postgres, AnOlderSchemaIsBroughtUpToDateOnce) {
     open()->createNext(3);
     // As it was before there were files.
-    bare.run("DROP TABLE tintgate.files, tintgate.versions, tintgate.contents, tintgate.pieces;"
+    bare.run("DROP TABLE tintgate.files, tintgate.versions, tintgate.contents, tintgate.pieces,"
+             " tintgate.job_blocks;"
              "UPDATE tintgate.store SET format = 1");
     EXPECT_EQ(faultOf([&] { open(); }), Fault::Older);
     pid_t upgrades[2];

@@ -143,6 +143,70 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
     }
 }
 
+TEST_P(StoreEngine, KeepsTheOverviewOfJobsInStep) {
+    // What each job holds: no key, a number, or something else.
+    const auto shown = [](store::StoreEngine& engine) {
+        store::JobOverview jobs;
+        engine.overview(jobs);
+        std::string text;
+        for (const int id : jobs.ids()) {
+            text += " " + std::to_string(id) + ":";
+            for (std::size_t key = 0; key < store::overviewKeys.size(); ++key) {
+                int number = 0;
+                const auto holds = jobs.find(id, key, number);
+                text += holds == store::JobOverview::Holds::Number  ? std::to_string(number) + ","
+                        : holds == store::JobOverview::Holds::Nothing ? "-,"
+                                                                      : "?,";
+            }
+        }
+        return text;
+    };
+    const auto engine = open();
+    for (const int id : {0, 1, 63, 64, 200, 201, 0xFFFFFF}) {
+        engine->create(3, id);
+    }
+    engine->create(4, 5);
+    EXPECT_EQ(engine->createNext(3), 2);
+    const std::pair<int, const char*> tables[] = {
+        {0, "Input/SubType=-2147483648 Job/Display/Status=258 Remote/ShowInVerifier=1"},
+        {0, "Remote/ShowInVerifier=- Workflow/Verify/Active[-2]=-1"},
+        {1, "Input/SubType=1,2 Input/FileType=u7 Job/Display/Status[3]=1 Other=1"},
+        {63, "Job/Display/Status=1,2 Workflow/Verify/Active='3"},
+        {63, "Job/Display/Status[1]=- Workflow/Verify/Active=3"},
+        {64, "Job/Display/Status=211 Input/FileType=4096"},
+        {64, "Job/Display/Status=- Other=2"},
+        {200, "Input/SubType=80"},
+        {0xFFFFFF, "Workflow/Verify/Active=3"},
+    };
+    for (const auto& [id, records] : tables) {
+        send(*engine, 3, id, records);
+    }
+    send(*engine, 4, 5, "Input/SubType=1");
+    engine->remove(3, 200);
+    store::Scope everything;
+    everything.everything = true;
+    engine->change(3, 201, everything, [](store::TicketContent& content) {
+        content.apply(support::RecordTable("Input/FileType=4 Input/SubType='x").records());
+    });
+    const std::string expected = " 0:-2147483648,258,-,-,-1, 1:?,?,-,?,-, 2:-,-,-,-,-,"
+                                 " 63:-,1,-,-,3, 64:-,-,-,4096,-, 201:?,-,-,4,-,"
+                                 " 16777215:-,-,-,-,3,";
+    EXPECT_EQ(shown(*engine), expected);
+    EXPECT_TRUE(engine->remove(3, 0) && engine->create(3, 0)) << "it starts without keys";
+    EXPECT_EQ(shown(*engine), " 0:-,-,-,-,-," + expected.substr(expected.find(" 1:")));
+
+    // A store that was made before there was an overview gets the same.
+    const std::string before = shown(*engine);
+    sql("DROP TABLE job_blocks", "DROP TABLE tintgate.job_blocks");
+    setFormat(room ? 2 : 1);
+    EXPECT_EQ(faultOf([&] { open(); }), Fault::Older);
+    EXPECT_TRUE(store::bringStoreUpToDate(address));
+    EXPECT_EQ(shown(*open()), before);
+    sql("UPDATE job_blocks SET content = CAST(substr(content, 2) AS BLOB)",
+        "UPDATE tintgate.job_blocks SET content = substring(content FROM 2)");
+    EXPECT_EQ(faultOf([&] { shown(*open()); }), Fault::Damaged);
+}
+
 TEST_F(FolderStore, OpensOnlyFoldersWithAStore) {
     folder.makeFolder("strange/files");
     folder.write("strange/tickets.db", "");
@@ -173,7 +237,7 @@ TEST_P(StoreEngine, NeitherOverwritesAStoreNorReadsADamagedKey) {
     EXPECT_FALSE(store::bringStoreUpToDate(address));
     setFormat(9);
     EXPECT_EQ(faultOf([&] { store::bringStoreUpToDate(address); }), Fault::Newer);
-    setFormat(room ? 2 : 1);
+    setFormat(room ? 3 : 2);
     sql("INSERT INTO keys SELECT number, x'61', x'010299' FROM tickets",
         "INSERT INTO tintgate.keys (ticket, name, value, change)"
         " SELECT number, '\\x61', '\\x010299', 0 FROM tintgate.tickets");
