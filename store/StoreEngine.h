@@ -33,7 +33,7 @@ enum class Fault {
               ///< file.
     NoFile,   ///< No such file or version.
     Exists,   ///< There is one already.
-    Lost,     ///< The server does not answer (any more). Whether it still took what was under way
+    Lost,     ///< The server does not answer (any more): see alive. Whether it still took what was under way
               ///< is not known; it took all of it or nothing.
     Other,    ///< The text tells.
 };
@@ -77,6 +77,9 @@ struct FileVersion {
 struct Scope {
     /// The ticket is emptied first; keys says nothing then.
     bool everything = false;
+    /// The change may be made twice, as if it were made once: no appended elements, and none that are
+    /// deleted by their position.
+    bool repeatable = false;
     /// By name, whether what the key holds is needed. Keys that are not listed stay as they are.
     std::map<std::string, bool, std::less<>> keys;
 };
@@ -90,7 +93,9 @@ class StoreEngine {
   public:
     virtual ~StoreEngine() = default;
 
-    /// False once the connection to a server is lost, which is for good. Asks nobody.
+    /// False once the connection to a server is lost for good. A connection that was lost is made
+    /// anew, here and by each operation; one that only reads, or that can be repeated, then starts
+    /// again. After 30 seconds without the server, all waits together, it is for good.
     virtual bool alive() = 0;
 
     /// A number that differs from the last one if anybody has committed anything since. It may
@@ -133,7 +138,8 @@ class StoreEngine {
     /// One transaction, which locks the ticket first: fetches the keys that the scope needs, has
     /// them changed by work, and writes what differs then. Work touches no key outside the scope.
     /// False when there is no such ticket, which is not looked for before work is called unless
-    /// something is needed. What work throws undoes it.
+    /// something is needed. What work throws undoes it. Work may be called again on the same ticket
+    /// if the scope is repeatable.
     virtual bool change(int type, int id, const Scope& scope,
                         const std::function<void(TicketContent&)>& work) = 0;
 

@@ -44,12 +44,17 @@ bool replacesKey(const SETMULTIPAR& record) {
 
 Scope scopeOf(const SETMULTIPAR* table) {
     Scope scope;
+    scope.repeatable = true;
     const char* last = nullptr;
+    bool needed = false; // What the record's key held before.
     for (const auto* record = table; record->key != nullptr; ++record) {
         if (record->key != last) {
             last = record->key;
-            scope.keys.try_emplace(last, !replacesKey(*record));
+            needed = scope.keys.try_emplace(last, !replacesKey(*record)).first->second;
         }
+        const bool counts = record->position == POSITION_APPEND ||
+                            (record->type == PARAM_DELETE && record->position != POSITION_WHOLE);
+        scope.repeatable = scope.repeatable && !(needed && counts);
     }
     return scope;
 }
@@ -63,6 +68,22 @@ void clearResults(SETMULTIPAR* table) {
 } // namespace
 
 StoreKeep::StoreKeep(std::shared_ptr<StoreEngine> engine) : m_engine(std::move(engine)) {}
+
+/// Writes to a ticket, unless a former write to it was lost.
+template<class Write>
+bool StoreKeep::write(int type, int id, Write write) {
+    const std::pair address = {type, id};
+    if (m_cutOff.contains(address)) {
+        return false;
+    }
+    // In front of the write: it is not to fail for want of memory behind it.
+    const auto cutOff = m_cutOff.insert(address).first;
+    return orElse(false, [&] {
+        const bool written = write();
+        m_cutOff.erase(cutOff);
+        return written;
+    });
+}
 
 std::vector<int> StoreKeep::ids(int type) {
     return orElse(std::vector<int>(), [&] { return listIds(type); });
@@ -93,7 +114,7 @@ int StoreKeep::createNext(int type) {
 }
 
 bool StoreKeep::remove(int type, int id) {
-    return orElse(false, [&] { return m_engine->remove(type, id); });
+    return write(type, id, [&] { return m_engine->remove(type, id); });
 }
 
 std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_view key) {
@@ -190,7 +211,7 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
         return exists(type, id);
     }
     try {
-        const bool done = orElse(false, [&] {
+        const bool done = write(type, id, [&] {
             return m_engine->change(type, id, scopeOf(table),
                                     [&](TicketContent& content) { content.apply(table); });
         });
@@ -207,10 +228,11 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
 bool StoreKeep::transfer(int type, int id, const TicketContent& source, bool replace) {
     Scope scope;
     scope.everything = replace;
+    scope.repeatable = true;
     for (const auto& [key, elements] : source.keys()) {
         scope.keys.emplace(key, false);
     }
-    return orElse(false, [&] {
+    return write(type, id, [&] {
         return m_engine->change(type, id, scope,
                                 [&](TicketContent& content) { content.transfer(source, replace); });
     });

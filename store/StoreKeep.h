@@ -5,6 +5,7 @@
 #include <chrono>
 #include <cstdint>
 #include <memory>
+#include <set>
 #include <string>
 #include <unordered_map>
 #include <utility>
@@ -17,6 +18,11 @@
 namespace store {
 
 /// A failure of the store is a ticket that isn't there, or a table that can't be written.
+///
+/// When the store could not take a write (busy, lost, full, damaged, out of memory), all later
+/// writes to that ticket fail for as long as this lives. A client writes the keys that complete a
+/// job last, so a job with a gap never looks complete. What is refused by the rules of tickets does
+/// not count.
 ///
 /// What was read is given again only while nobody has committed anything since, so a reader sees
 /// what is there now. Two things are kept that way: the key that was read last, so that the
@@ -56,12 +62,15 @@ class StoreKeep : public TicketKeep {
         std::uint64_t commits = 0;
     };
 
+    template<class Write>
+    bool write(int type, int id, Write write);
     bool goesOn(int id, std::size_t overviewKey);
     bool wantsOverview(std::uint64_t commits, bool listing);
     void fetchOverview(std::uint64_t commits);
     const SharedElements& elementsOf(std::size_t key, int number);
 
     const std::shared_ptr<StoreEngine> m_engine;
+    std::set<std::pair<int, int>> m_cutOff; ///< Types and ids of tickets that lost a write.
     Fetched m_fetched;
     JobOverview m_overview;
     std::unordered_map<int, SharedElements> m_numbers; ///< The different ones of the overview.

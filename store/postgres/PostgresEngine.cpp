@@ -157,12 +157,12 @@ class PostgresEngine : public StoreEngine {
   public:
     explicit PostgresEngine(Connection connection) : m_connection(std::move(connection)) {}
 
-    bool alive() override { return !m_connection.lost(); }
+    bool alive() override { return m_connection.isThere(); }
 
     std::uint64_t commits(std::chrono::milliseconds age) override {
         const auto now = CoarseClock::now();
         const bool asks = now - m_asked > age - CoarseClock::coarseness;
-        if (m_snapshot.empty() || (asks && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
+        if (m_snapshot.empty() || (asks && !isStillCurrent())) {
             noteChange();
         } else if (asks) {
             m_asked = now;
@@ -171,117 +171,255 @@ class PostgresEngine : public StoreEngine {
     }
 
     std::vector<int> ids(int type) override {
-        // Clients ask for their number, and then for the ids.
-        if (type == m_ids.type && m_connection.run(snapshot).bytes(0, 0) == m_ids.snapshot) {
-            return m_ids.ids;
-        }
-        // The snapshot first: what is committed between the two only has them fetched again.
-        m_connection.send(snapshot);
-        m_connection.send(idsOf, type);
-        const auto results = m_connection.finish();
-        std::vector<int> ids;
-        for (ArrayReader array(results[1].bytes(0, 0)); array.left() != 0;) {
-            ids.push_back(static_cast<int>(postgres::numberOf(array.next())));
-        }
-        m_ids = {type, results[0].text(0, 0), ids};
-        return ids;
+        return m_connection.repeating([&] {
+            forgetFormerServer();
+            // Clients ask for their number, and then for the ids.
+            if (type == m_ids.type && m_connection.run(snapshot).bytes(0, 0) == m_ids.snapshot) {
+                return m_ids.ids;
+            }
+            // The snapshot first: what is committed between the two only has them fetched again.
+            m_connection.send(snapshot);
+            m_connection.send(idsOf, type);
+            const auto results = m_connection.finish();
+            std::vector<int> ids;
+            for (ArrayReader array(results[1].bytes(0, 0)); array.left() != 0;) {
+                ids.push_back(static_cast<int>(postgres::numberOf(array.next())));
+            }
+            m_ids = {type, results[0].text(0, 0), ids};
+            return ids;
+        });
     }
 
     bool exists(int type, int id) override {
-        return m_connection.run(isThere, type, id).number(0, 0) != 0;
+        return m_connection.repeating([&] {
+            return m_connection.run(isThere, type, id).number(0, 0) != 0;
+        });
     }
 
     bool create(int type, int id) override {
-        if (exists(type, id)) {
-            return false; // Without waiting for others.
-        }
-        noteChange();
-        sendCreate(type, id);
-        return m_connection.finish()[0].changed() != 0;
+        return m_connection.once([&] {
+            if (exists(type, id)) {
+                return false; // Without waiting for others.
+            }
+            noteChange();
+            sendCreate(type, id);
+            return m_connection.finish()[0].changed() != 0;
+        });
     }
 
     int createNext(int type) override {
-        noteChange();
-        Transaction transaction(m_connection);
-        m_connection.send(raiseHighest, type, 0);
-        const auto results = transaction.finish();
-        int id = static_cast<int>(results[0].number(0, 0)) + 1;
-        if (id > highestTicketId) {
-            id = lowestFree(ids(type));
-        }
-        if (id > highestTicketId) {
-            return -1;
-        }
-        sendCreate(type, id);
-        return transaction.commit()[0].changed() != 0 ? id : -1;
+        return m_connection.once([&] {
+            noteChange();
+            Transaction transaction(m_connection);
+            m_connection.send(raiseHighest, type, 0);
+            const auto results = transaction.finish();
+            int id = static_cast<int>(results[0].number(0, 0)) + 1;
+            if (id > highestTicketId) {
+                id = lowestFree(ids(type));
+            }
+            if (id > highestTicketId) {
+                return -1;
+            }
+            sendCreate(type, id);
+            return transaction.commit()[0].changed() != 0 ? id : -1;
+        });
     }
 
     bool remove(int type, int id) override {
-        noteChange();
-        if (type == jobType) {
-            return m_connection
-                       .run(removeJob, type, id, blockOf(id), std::string(entryBytes, '\0'),
-                            position(entryOffset(id)))
-                       .number(0, 0) != 0;
-        }
-        return m_connection.run(removeTicket, type, id).changed() != 0;
+        return m_connection.once([&] {
+            noteChange();
+            if (type == jobType) {
+                return m_connection
+                           .run(removeJob, type, id, blockOf(id), std::string(entryBytes, '\0'),
+                                position(entryOffset(id)))
+                           .number(0, 0) != 0;
+            }
+            return m_connection.run(removeTicket, type, id).changed() != 0;
+        });
     }
 
     std::shared_ptr<const Elements> key(int type, int id, std::string_view name) override {
-        const bool again = type == m_last.type && id == m_last.id && name == m_last.name;
-        const Result row =
-            m_connection.run(oneKey, type, id, name, std::int64_t{again ? m_last.ticket : 0},
-                             std::int64_t{again ? m_last.change : 0});
-        if (row.rows() == 0) {
-            m_last = {};
-            return nullptr;
-        }
-        if (!row.isNull(0, 2)) {
-            m_last = {};
-            auto elements = decoded(row.bytes(0, 2));
-            m_last = {type, id, std::string(name), row.number(0, 0), row.number(0, 1), elements};
-        }
-        return m_last.elements;
+        return m_connection.repeating([&]() -> std::shared_ptr<const Elements> {
+            forgetFormerServer();
+            const bool again = type == m_last.type && id == m_last.id && name == m_last.name;
+            const Result row =
+                m_connection.run(oneKey, type, id, name, std::int64_t{again ? m_last.ticket : 0},
+                                 std::int64_t{again ? m_last.change : 0});
+            if (row.rows() == 0) {
+                m_last = {};
+                return nullptr;
+            }
+            if (!row.isNull(0, 2)) {
+                m_last = {};
+                auto elements = decoded(row.bytes(0, 2));
+                m_last = {type, id, std::string(name), row.number(0, 0), row.number(0, 1), elements};
+            }
+            return m_last.elements;
+        });
     }
 
     std::shared_ptr<const TicketContent> content(int type, int id,
                                                  const KeyFilter& filter) override {
-        const Names exact(filter.exact().begin(), filter.exact().end());
-        const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
-        const Result rows = filter.all()       ? m_connection.run(allKeys, type, id)
-                            : prefixes.empty() ? m_connection.run(exactKeys, type, id, exact)
-                                               : m_connection.run(someKeys, type, id, exact,
-                                                                  prefixes);
-        return rows.rows() == 0 ? nullptr : std::make_shared<TicketContent>(contentOf(rows));
+        return m_connection.repeating([&]() -> std::shared_ptr<const TicketContent> {
+            const Names exact(filter.exact().begin(), filter.exact().end());
+            const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
+            const Result rows = filter.all()       ? m_connection.run(allKeys, type, id)
+                                : prefixes.empty() ? m_connection.run(exactKeys, type, id, exact)
+                                                   : m_connection.run(someKeys, type, id, exact,
+                                                                      prefixes);
+            if (rows.rows() == 0) {
+                return nullptr;
+            }
+            return std::make_shared<TicketContent>(contentOf(rows));
+        });
     }
 
     void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
                    const ShowKey& show) override {
-        postgres::askForKeys(m_connection, type, names, largestBytes);
-        postgres::showKeys(m_connection.finish()[0], names, show);
+        m_connection.repeating([&] {
+            postgres::askForKeys(m_connection, type, names, largestBytes);
+            postgres::showKeys(m_connection.finish()[0], names, show);
+        });
     }
 
     void overview(JobOverview& jobs) override {
-        // The snapshot first: what is committed between the two only has it all fetched again.
-        m_asked = CoarseClock::now();
-        m_connection.send(snapshot);
-        m_connection.send(allBlocks);
-        const auto results = m_connection.finish();
-        // Sorted here: with so many bytes the server would do it on its disk.
-        std::vector<std::pair<int, int>> blocks;
-        for (int row = 0; row < results[1].rows(); ++row) {
-            blocks.emplace_back(static_cast<int>(results[1].number(row, 0)), row);
-        }
-        std::sort(blocks.begin(), blocks.end());
-        jobs.clear();
-        for (const auto& [number, row] : blocks) {
-            jobs.add(number, results[1].bytes(row, 1));
-        }
-        m_snapshot = results[0].text(0, 0);
+        m_connection.repeating([&] {
+            forgetFormerServer();
+            // The snapshot first: what is committed between the two only has it all fetched again.
+            m_asked = CoarseClock::now();
+            m_connection.send(snapshot);
+            m_connection.send(allBlocks);
+            const auto results = m_connection.finish();
+            // Sorted here: with so many bytes the server would do it on its disk.
+            std::vector<std::pair<int, int>> blocks;
+            for (int row = 0; row < results[1].rows(); ++row) {
+                blocks.emplace_back(static_cast<int>(results[1].number(row, 0)), row);
+            }
+            std::sort(blocks.begin(), blocks.end());
+            jobs.clear();
+            for (const auto& [number, row] : blocks) {
+                jobs.add(number, results[1].bytes(row, 1));
+            }
+            m_snapshot = results[0].text(0, 0);
+        });
     }
 
     bool change(int type, int id, const Scope& scope,
                 const std::function<void(TicketContent&)>& work) override {
+        const auto once = [&] { return changeOnce(type, id, scope, work); };
+        return scope.repeatable ? m_connection.repeating(once) : m_connection.once(once);
+    }
+
+    std::vector<User> users() override {
+        return m_connection.repeating([&] {
+            const Result rows = m_connection.run(allUsers);
+            std::vector<User> users;
+            for (int row = 0; row < rows.rows(); ++row) {
+                users.push_back(userIn(rows, row));
+            }
+            return users;
+        });
+    }
+
+    std::optional<User> user(std::string_view name) override {
+        return m_connection.repeating([&] {
+            const Result rows = m_connection.run(oneUser, name);
+            return rows.rows() == 0 ? std::nullopt : std::optional(userIn(rows, 0));
+        });
+    }
+
+    void putUser(const User& user) override {
+        m_connection.repeating([&] {
+            noteChange();
+            m_connection.run(putOneUser, user.name, user.passwordHash, user.disabled);
+        });
+    }
+
+    bool removeUser(std::string_view name) override {
+        return m_connection.once([&] {
+            noteChange();
+            return m_connection.run(removeOneUser, name).changed() != 0;
+        });
+    }
+
+    void putFile(std::string_view path, std::istream& from) override {
+        m_connection.once([&] {
+            noteChange();
+            m_files.put(path, from);
+        });
+    }
+    void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
+    std::vector<FileEntry> files() override {
+        return m_connection.repeating([&] { return m_files.list(); });
+    }
+    std::vector<FileVersion> versions(std::string_view path) override {
+        return m_connection.repeating([&] {
+            return m_files.versions(path);
+        });
+    }
+    void getVersion(std::string_view path, int number, std::ostream& to) override {
+        m_files.getVersion(path, number, to);
+    }
+    void restoreVersion(std::string_view path, int number) override {
+        m_connection.once([&] {
+            noteChange();
+            m_files.restoreVersion(path, number);
+        });
+    }
+    int pruneVersions(std::string_view path, int keepNewest) override {
+        return m_connection.once([&] {
+            noteChange();
+            return m_files.pruneVersions(path, keepNewest);
+        });
+    }
+    int removeLeftovers() override { return 0; } // The server undoes what is cut off.
+
+    std::map<int, int> highestIds() override {
+        return m_connection.repeating([&] {
+            const Result rows = m_connection.run(allHighest);
+            std::map<int, int> ids;
+            for (int row = 0; row < rows.rows(); ++row) {
+                ids.emplace(rows.number(row, 0), rows.number(row, 1));
+            }
+            return ids;
+        });
+    }
+    void raiseHighestId(int type, int id) override {
+        m_connection.repeating([&] { m_connection.run(raiseHighest, type, id); });
+    }
+    void placeVersion(std::string_view path, const FileVersion& version,
+                      std::istream& from) override {
+        m_connection.once([&] {
+            m_files.placeVersion(path, version, from);
+        });
+    }
+    void finishCopy() override {
+        m_connection.once([&] {
+            m_connection.run(writeThrough); // What it waits for has all before it in front.
+            postgres::finishCopy(m_connection);
+        });
+    }
+
+  private:
+    /// The key that was fetched last.
+    struct Fetched {
+        int type = -1;
+        int id = -1;
+        std::string name;
+        std::int64_t ticket = 0;
+        std::int64_t change = 0;
+        std::shared_ptr<const Elements> elements;
+    };
+
+    /// The ids that were asked for last.
+    struct Ids {
+        int type = -1;
+        std::string snapshot; ///< Of when they were fetched, or before.
+        std::vector<int> ids;
+    };
+
+    bool changeOnce(int type, int id, const Scope& scope,
+                    const std::function<void(TicketContent&)>& work) {
         noteChange();
         Transaction transaction(m_connection);
         m_connection.send(lockTicket, type, id);
@@ -313,87 +451,23 @@ class PostgresEngine : public StoreEngine {
         return locked[0].rows() != 0;
     }
 
-    std::vector<User> users() override {
-        const Result rows = m_connection.run(allUsers);
-        std::vector<User> users;
-        for (int row = 0; row < rows.rows(); ++row) {
-            users.push_back(userIn(rows, row));
+    /// Whether nobody has committed anything since the last overview.
+    bool isStillCurrent() {
+        return m_connection.repeating([&] {
+            forgetFormerServer();
+            return m_connection.run(snapshot).bytes(0, 0) == m_snapshot;
+        });
+    }
+
+    /// After a loss the server may be another one, in a state of its own.
+    void forgetFormerServer() {
+        if (m_connection.generation() != m_generation) {
+            m_generation = m_connection.generation();
+            m_last = {};
+            m_ids = {};
+            noteChange();
         }
-        return users;
     }
-
-    std::optional<User> user(std::string_view name) override {
-        const Result rows = m_connection.run(oneUser, name);
-        return rows.rows() == 0 ? std::nullopt : std::optional(userIn(rows, 0));
-    }
-
-    void putUser(const User& user) override {
-        noteChange();
-        m_connection.run(putOneUser, user.name, user.passwordHash, user.disabled);
-    }
-
-    bool removeUser(std::string_view name) override {
-        noteChange();
-        return m_connection.run(removeOneUser, name).changed() != 0;
-    }
-
-    void putFile(std::string_view path, std::istream& from) override {
-        noteChange();
-        m_files.put(path, from);
-    }
-    void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
-    std::vector<FileEntry> files() override { return m_files.list(); }
-    std::vector<FileVersion> versions(std::string_view path) override {
-        return m_files.versions(path);
-    }
-    void getVersion(std::string_view path, int number, std::ostream& to) override {
-        m_files.getVersion(path, number, to);
-    }
-    void restoreVersion(std::string_view path, int number) override {
-        noteChange();
-        m_files.restoreVersion(path, number);
-    }
-    int pruneVersions(std::string_view path, int keepNewest) override {
-        noteChange();
-        return m_files.pruneVersions(path, keepNewest);
-    }
-    int removeLeftovers() override { return 0; } // The server undoes what is cut off.
-
-    std::map<int, int> highestIds() override {
-        const Result rows = m_connection.run(allHighest);
-        std::map<int, int> ids;
-        for (int row = 0; row < rows.rows(); ++row) {
-            ids.emplace(rows.number(row, 0), rows.number(row, 1));
-        }
-        return ids;
-    }
-    void raiseHighestId(int type, int id) override { m_connection.run(raiseHighest, type, id); }
-    void placeVersion(std::string_view path, const FileVersion& version,
-                      std::istream& from) override {
-        m_files.placeVersion(path, version, from);
-    }
-    void finishCopy() override {
-        m_connection.run(writeThrough); // What it waits for has all before it in front.
-        postgres::finishCopy(m_connection);
-    }
-
-  private:
-    /// The key that was fetched last.
-    struct Fetched {
-        int type = -1;
-        int id = -1;
-        std::string name;
-        std::int64_t ticket = 0;
-        std::int64_t change = 0;
-        std::shared_ptr<const Elements> elements;
-    };
-
-    /// The ids that were asked for last.
-    struct Ids {
-        int type = -1;
-        std::string snapshot; ///< Of when they were fetched, or before.
-        std::vector<int> ids;
-    };
 
     void noteChange() {
         m_snapshot.clear();
@@ -494,6 +568,7 @@ class PostgresEngine : public StoreEngine {
     Connection m_connection;
     postgres::Files m_files{m_connection};
     Fetched m_last;
+    unsigned m_generation = 0;
     std::uint64_t m_commits = 0;
     std::string m_snapshot; ///< Of the last overview; empty once somebody has committed since.
     CoarseClock::time_point m_asked; ///< When that was still the server's.
@@ -501,7 +576,7 @@ class PostgresEngine : public StoreEngine {
 };
 
 std::unique_ptr<StoreEngine> openPostgres(const std::string& service) {
-    Connection connection(service);
+    Connection connection(service, postgres::longestAbsence, postgres::checkSchema);
     postgres::checkSchema(connection);
     return std::make_unique<PostgresEngine>(std::move(connection));
 }
@@ -513,6 +588,10 @@ void makePostgres(const std::string& service, const std::string& serverName) {
 
 std::unique_ptr<StoreEngine> openPostgresCopy(const std::string& service) {
     Connection connection(service);
+    if (connection.pooled()) {
+        throw StoreFailure(Fault::Other, "a copy needs a session of the server for itself: name a "
+                                         "service that does not lead through a pooler");
+    }
     if (!postgres::isUnfinishedCopy(connection)) {
         postgres::makeSchema(connection, nullptr);
     }
@@ -520,6 +599,7 @@ std::unique_ptr<StoreEngine> openPostgresCopy(const std::string& service) {
         throw StoreFailure(Fault::Busy, "somebody else is copying to this store");
     }
     connection.run(writeLater);
+    connection.stayWithThisServer();
     return std::make_unique<PostgresEngine>(std::move(connection));
 }
 

@@ -160,7 +160,9 @@ void exchangeFile(Connection& connection, Transaction& transaction, const Place&
 
 /// Why there is nothing at a path.
 [[noreturn]] void failMissing(Connection& connection, const Place& place) {
-    if (connection.run(isFileAmong, place.folderViews).number(0, 0) != 0) {
+    const Result among =
+        connection.repeating([&] { return connection.run(isFileAmong, place.folderViews); });
+    if (among.number(0, 0) != 0) {
         place.refuse();
     }
     throw StoreFailure(Fault::NoFile, place.what() + ": there is no such file");
@@ -171,7 +173,7 @@ void exchangeFile(Connection& connection, Transaction& transaction, const Place&
 template<class... Each>
 bool copyOut(Connection& connection, const Place& place, std::ostream& to, const Statement& find,
              const Each&... each) {
-    const Result found = connection.run(find, each...);
+    const Result found = connection.repeating([&] { return connection.run(find, each...); });
     if (found.rows() == 0) {
         return false;
     }
@@ -187,7 +189,8 @@ bool copyOut(Connection& connection, const Place& place, std::ostream& to, const
     const std::int64_t content = found.number(0, 0);
     std::int64_t left = found.number(0, 1) - write(found.bytes(0, 2));
     for (int position = 1; left > 0; ++position) {
-        const Result next = connection.run(piece, content, position);
+        const Result next =
+            connection.repeating([&] { return connection.run(piece, content, position); });
         if (next.rows() == 0) {
             throw StoreFailure(Fault::NoFile, place.what() + " was pruned while it was read");
         }

@@ -261,6 +261,12 @@ TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
         EXPECT_EQ(send(*engine, 3, 1, "kept='" + much + " other=1"), "refused 00");
         EXPECT_EQ(faultOf([&] { putFile(*engine, "kept", much); }), Fault::Full);
         EXPECT_EQ(send(*engine, 3, 1, "small=1"), "taken 1");
+        // A session that lost a write takes no more for that ticket.
+        engine->create(3, 2);
+        store::StoreKeep keep(open());
+        EXPECT_FALSE(keep.apply(3, 1, support::RecordTable("big='" + much).records()));
+        EXPECT_FALSE(keep.apply(3, 1, support::RecordTable("status=1").records()));
+        EXPECT_TRUE(keep.apply(3, 2, support::RecordTable("status=1").records()));
         return HasFailure() ? 1 : 0;
     });
     EXPECT_EQ(endOf(child), 0);
