@@ -68,7 +68,7 @@ struct FileEntry {
 
 /// A file's content before it was replaced.
 struct FileVersion {
-    int number = 0; ///< From 1, in the order of replacement.
+    int number = 0; ///< From 1, in the order of replacement. None is used twice for a path.
     std::uint64_t size = 0;
     std::int64_t time = 0; ///< When this content had been written.
 };
@@ -149,6 +149,8 @@ class StoreEngine {
     virtual std::optional<User> user(std::string_view name) = 0;
     /// Adds the user, or takes the place of the one with this name.
     virtual void putUser(const User& user) = 0;
+    /// False, and nothing is changed, when there is a user of this name.
+    virtual bool addUser(const User& user) = 0;
     virtual bool removeUser(std::string_view name) = 0;
 
     // Files. A server path may start with slashes; it means the file below the store's files in
@@ -190,7 +192,15 @@ class StoreEngine {
 // slash. Any other names a connection service of a PostgreSQL server (pg_service.conf), with a
 // store in the schema "tintgate" of its database.
 
-std::unique_ptr<StoreEngine> openStore(const std::string& address);
+/// What a store is opened for.
+enum class Access {
+    ReadAndWrite, ///< Refused (ReadOnly, Full) if the store can't be written as it is.
+    Read,         ///< Also a store on a full disk or one that is mounted for reading. Writing is
+                  ///< tried all the same, and may fail.
+};
+
+std::unique_ptr<StoreEngine> openStore(const std::string& address,
+                                       Access access = Access::ReadAndWrite);
 
 /// Makes a new store, with the system ticket in it, where nothing is or an empty folder. A folder
 /// and what is in it are for owner and group alone, as the umask allows.

@@ -59,7 +59,8 @@ def fill_server(service, jobs):
         INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, name, value, 0
             FROM tintgate.tickets, (VALUES {values}) AS k (name, value)
             WHERE type = 3 AND id <= {jobs};
-        DROP TABLE tintgate.job_blocks; UPDATE tintgate.store SET format = 2""")
+        DROP TABLE tintgate.job_blocks; ALTER TABLE tintgate.files DROP last_version;
+        UPDATE tintgate.store SET format = 2""")
     psql(service, "ANALYZE")
 
 

@@ -318,7 +318,7 @@ class Gatherer {
 
 Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place) {
     try {
-        const auto store = store::openStore(address);
+        const auto store = store::openStore(address, store::Access::Read);
         Gatherer gatherer(*store, filter, place);
         for (const Verified& verified : verifiedStrips(*store, filter))
             gatherer.add(verified);

@@ -167,7 +167,7 @@ class Copy {
 };
 
 void copy(const CopyOptions& options) {
-    const auto from = store::openStore(completeAddress(options.from));
+    const auto from = store::openStore(completeAddress(options.from), store::Access::Read);
     const std::string target = completeAddress(options.to);
     refuseColon(target, "the new store's address");
     const auto to = store::openCopy(target);

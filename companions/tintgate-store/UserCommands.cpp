@@ -34,8 +34,11 @@ void add(const Invocation& invocation, const UserOptions& options) {
     const auto store = invocation.open();
     refuseKnown(*store, options);
     const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
-    refuseKnown(*store, options); // A person may take minutes to type a password.
-    store->putUser({name, hash, false});
+    // A person may take minutes to type a password, and another one may be faster.
+    if (!store->addUser({name, hash, false})) {
+        refuseKnown(*store, options);
+        throw Failure(Status::Exists, "there was a user " + options.name);
+    }
 }
 
 void changePassword(const Invocation& invocation, const UserOptions& options) {

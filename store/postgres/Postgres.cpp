@@ -118,14 +118,24 @@ int Result::changed() const {
 ArrayReader::ArrayReader(std::string_view value) : m_value(value) {
     constexpr std::size_t header = 20;
     if (value.size() >= header) {
-        m_left = static_cast<std::size_t>(numberOf(value.substr(12, 4)));
+        m_left = static_cast<std::size_t>(std::max<std::int64_t>(numberOf(value.substr(12, 4)), 0));
         m_value.remove_prefix(header);
     }
 }
 
+void failDamaged() {
+    throw StoreFailure(Fault::Damaged, "what the store's server sent can't be read");
+}
+
 std::string_view ArrayReader::next() {
+    constexpr std::size_t sizeBytes = 4;
+    const std::int64_t given = m_value.size() < sizeBytes ? -1 : numberOf(m_value.substr(0, 4));
+    if (m_left == 0 || given < 0 ||
+        static_cast<std::uint64_t>(given) > m_value.size() - sizeBytes) {
+        failDamaged();
+    }
     --m_left;
-    const auto size = static_cast<std::size_t>(numberOf(m_value.substr(0, 4)));
+    const auto size = static_cast<std::size_t>(given);
     const std::string_view element = m_value.substr(4, size);
     m_value.remove_prefix(4 + size);
     return element;

@@ -74,6 +74,9 @@ class Result {
     std::unique_ptr<PGresult, void (*)(PGresult*)> m_result;
 };
 
+/// Throws StoreFailure (Damaged): nothing of what comes from the server is trusted.
+[[noreturn]] void failDamaged();
+
 /// Elements of an array without holes, one after the other. The array outlives it.
 class ArrayReader {
   public:
@@ -81,6 +84,7 @@ class ArrayReader {
     explicit ArrayReader(std::string_view value);
 
     std::size_t left() const { return m_left; }
+    /// Throws StoreFailure (Damaged).
     std::string_view next();
 
   private:

@@ -121,6 +121,8 @@ constexpr Statement oneUser = {"SELECT name, hash, disabled FROM tintgate.users 
 constexpr Statement putOneUser = {
     "INSERT INTO tintgate.users (name, hash, disabled) VALUES ($1, $2, $3)"
     " ON CONFLICT (name) DO UPDATE SET hash = excluded.hash, disabled = excluded.disabled"};
+constexpr Statement addOneUser = {
+    "INSERT INTO tintgate.users (name, hash, disabled) VALUES ($1, $2, $3) ON CONFLICT DO NOTHING"};
 constexpr Statement removeOneUser = {"DELETE FROM tintgate.users WHERE name = $1"};
 
 /// Held by the one who copies to the store. "TGAT" as a number.
@@ -332,6 +334,15 @@ class PostgresEngine : public StoreEngine {
         m_connection.repeating([&] {
             noteChange();
             m_connection.run(putOneUser, user.name, user.passwordHash, user.disabled);
+        });
+    }
+
+    bool addUser(const User& user) override {
+        return m_connection.once([&] {
+            noteChange();
+            return m_connection
+                       .run(addOneUser, user.name, user.passwordHash, user.disabled)
+                       .changed() != 0;
         });
     }
 
@@ -575,7 +586,7 @@ class PostgresEngine : public StoreEngine {
     Ids m_ids;
 };
 
-std::unique_ptr<StoreEngine> openPostgres(const std::string& service) {
+std::unique_ptr<StoreEngine> openPostgres(const std::string& service, Access) {
     Connection connection(service, postgres::longestAbsence, postgres::checkSchema);
     postgres::checkSchema(connection);
     return std::make_unique<PostgresEngine>(std::move(connection));

@@ -34,9 +34,11 @@ constexpr Statement claimFile = {
     " VALUES ($1, $2, " TINTGATE_NOW ")"
     " ON CONFLICT (path) DO UPDATE SET path = excluded.path RETURNING file.content"};
 constexpr Statement keepVersion = {
-    "INSERT INTO tintgate.versions (path, number, content, written)"
-    " SELECT path, (SELECT coalesce(max(number), 0) + 1 FROM tintgate.versions WHERE path = $1),"
-    " content, written FROM tintgate.files WHERE path = $1"};
+    "WITH kept AS (UPDATE tintgate.files SET last_version = last_version + 1 WHERE path = $1"
+    " RETURNING path, last_version, content, written)"
+    " INSERT INTO tintgate.versions (path, number, content, written) SELECT * FROM kept"};
+constexpr Statement raiseLastVersion = {
+    "UPDATE tintgate.files SET last_version = greatest(last_version, $2) WHERE path = $1"};
 constexpr Statement exchange = {"UPDATE tintgate.files SET content = $2, written = " TINTGATE_NOW
                                 " WHERE path = $1"};
 constexpr Statement exchangeAsOf = {
@@ -283,6 +285,7 @@ void Files::placeVersion(std::string_view path, const FileVersion& version, std:
         const auto results = transaction.finish();
         replaced = results[0].rows() == 0 ? content : results[0].number(0, 0);
         m_connection.send(putVersion, place.path, version.number, content, version.time);
+        m_connection.send(raiseLastVersion, place.path, version.number);
     } else {
         m_connection.send(exchangeAsOf, place.path, content, version.time);
     }

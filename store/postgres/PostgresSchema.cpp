@@ -68,8 +68,12 @@ constexpr const char* migrations[] = {
         PRIMARY KEY (path, number)
     );
     CREATE INDEX ON tintgate.versions (content))",
-    // 3: the overview of jobs, as JobOverview.h describes it
+    // 3: the overview of jobs, as JobOverview.h describes it; numbers of versions are used once
     R"(
+    ALTER TABLE tintgate.files ADD last_version int NOT NULL DEFAULT 0;
+    UPDATE tintgate.files SET last_version = highest FROM
+        (SELECT path, max(number) AS highest FROM tintgate.versions GROUP BY path) AS known
+        WHERE files.path = known.path;
     CREATE TABLE tintgate.job_blocks (
         number  int PRIMARY KEY,
         content bytea NOT NULL

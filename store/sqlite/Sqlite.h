@@ -16,10 +16,16 @@ namespace store::sqlite {
 /// Throws the failure that a result code stands for. Database may be null.
 [[noreturn]] void fail(sqlite3* database, int code);
 
+enum class Opening {
+    Existing,
+    New,
+    /// A file that nobody can change: its log is not looked at, and nothing is made beside it.
+    Unchanging,
+};
+
 class Database {
   public:
-    /// An existing file, or with create a new one.
-    Database(const std::string& path, bool create);
+    Database(const std::string& path, Opening opening);
 
     sqlite3* get() const { return m_database.get(); }
     void run(const char* statements);

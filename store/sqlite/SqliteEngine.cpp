@@ -19,6 +19,7 @@
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/stat.h>
+#include <sys/statvfs.h>
 
 #include "store/Engines.h"
 #include "store/JobOverview.h"
@@ -32,6 +33,7 @@ namespace store {
 namespace {
 
 using sqlite::Database;
+using sqlite::Opening;
 using sqlite::ReadTransaction;
 using sqlite::Statement;
 using sqlite::Transaction;
@@ -87,6 +89,19 @@ std::string realPath(const std::string& address) {
     return path.get();
 }
 
+/// Whether a database is one of this kind. The first look into it, which opens its log.
+void checkKind(Database& database, const std::string& folder, std::int64_t kind) {
+    const std::int64_t found = database.number("PRAGMA application_id");
+    if (found != kind) {
+        throw StoreFailure(Fault::Missing,
+                           found == unfinishedCopyId
+                               ? folder + " is a copy of a store that was not finished"
+                               : databasePath(folder) + " is no database of a store");
+    }
+    // What is in the file is data, and never to be run.
+    database.run("PRAGMA trusted_schema = OFF");
+}
+
 /// The database in a store's folder, whatever its format, if it is of this kind.
 Database openDatabase(const std::string& folder, std::int64_t kind = applicationId) {
     const std::string path = databasePath(folder);
@@ -94,20 +109,59 @@ Database openDatabase(const std::string& folder, std::int64_t kind = application
     if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode)) {
         throw StoreFailure(Fault::Missing, folder + " holds no store");
     }
-    Database database(path, false);
+    Database database(path, Opening::Existing);
     if (sqlite3_db_readonly(database.get(), "main") == 1) {
         throw StoreFailure(Fault::ReadOnly, path + " can't be written");
     }
-    const std::int64_t found = database.number("PRAGMA application_id");
-    if (found != kind) {
-        throw StoreFailure(Fault::Missing,
-                           found == unfinishedCopyId
-                               ? folder + " is a copy of a store that was not finished"
-                               : path + " is no database of a store");
-    }
-    // What is in the file is data, and never to be run.
-    database.run("PRAGMA trusted_schema = OFF");
+    checkKind(database, folder, kind);
     return database;
+}
+
+bool isMountedForReading(const std::string& folder) {
+    struct statvfs mount;
+    return statvfs(folder.c_str(), &mount) == 0 && (mount.f_flag & ST_RDONLY) != 0;
+}
+
+/// A store's database as it can be opened, and whether others may be in it meanwhile.
+struct OpenedDatabase {
+    Database database;
+    bool shared;
+};
+
+/// For reading, a database opens also without the shared index of its log, for which a full disk
+/// has no room, and which nobody can make where a folder is mounted for reading.
+OpenedDatabase openDatabase(const std::string& folder, Access access, std::int64_t kind) {
+    const std::string path = databasePath(folder);
+    try {
+        return {openDatabase(folder, kind), true};
+    } catch (const StoreFailure& failure) {
+        if (access != Access::Read) {
+            throw;
+        }
+        if (failure.fault == Fault::Full) {
+            Database database(path, Opening::Existing);
+            database.run("PRAGMA locking_mode = EXCLUSIVE"); // The index is then in memory.
+            checkKind(database, folder, kind);
+            return {std::move(database), false};
+        }
+        if (!isMountedForReading(folder)) {
+            throw;
+        }
+    }
+    struct stat log;
+    const bool hasLog = stat((path + "-wal").c_str(), &log) == 0 && log.st_size != 0;
+    Database database(path, hasLog ? Opening::Existing : Opening::Unchanging);
+    try {
+        checkKind(database, folder, kind);
+    } catch (const StoreFailure&) {
+        if (!hasLog) {
+            throw;
+        }
+        throw StoreFailure(Fault::ReadOnly,
+                           path + " was not closed, and can't be read without writing: copy the "
+                                  "folder to a disk that can be written");
+    }
+    return {std::move(database), false};
 }
 
 void checkFormat(Database& database) {
@@ -131,8 +185,9 @@ std::string endOfPrefix(std::string prefix) {
 
 class SqliteEngine : public StoreEngine {
   public:
-    explicit SqliteEngine(const std::string& folder, std::int64_t kind = applicationId)
-        : m_database(openDatabase(folder, kind)), m_ready(m_database), m_files(folder, false) {}
+    explicit SqliteEngine(const std::string& folder, Access access = Access::ReadAndWrite,
+                          std::int64_t kind = applicationId)
+        : SqliteEngine(openDatabase(folder, access, kind), folder) {}
 
     bool alive() override { return true; }
 
@@ -331,6 +386,14 @@ class SqliteEngine : public StoreEngine {
         transaction.commit();
     }
 
+    bool addUser(const User& user) override {
+        Transaction transaction(m_database);
+        m_addUser.run(user.name, user.passwordHash, user.disabled ? 1 : 0).finish();
+        const bool added = sqlite3_changes(m_database.get()) != 0;
+        transaction.commit();
+        return added;
+    }
+
     bool removeUser(std::string_view name) override {
         Transaction transaction(m_database);
         m_removeUser.run(name).finish();
@@ -381,6 +444,10 @@ class SqliteEngine : public StoreEngine {
     ServerFiles& serverFiles() { return m_files; }
 
   private:
+    SqliteEngine(OpenedDatabase opened, const std::string& folder)
+        : m_database(std::move(opened.database)), m_ready(m_database), m_files(folder, false),
+          m_watch(m_database, opened.shared) {}
+
     /// Settles the connection before a statement is prepared.
     struct Ready {
         explicit Ready(Database& database) {
@@ -486,7 +553,7 @@ class SqliteEngine : public StoreEngine {
     Database m_database;
     Ready m_ready;
     ServerFiles m_files;
-    WalWatch m_watch{m_database};
+    WalWatch m_watch;
 
     Statement m_ids{m_database, "SELECT id FROM tickets WHERE type = ? ORDER BY id"};
     Statement m_number{m_database, "SELECT number FROM tickets WHERE type = ? AND id = ?"};
@@ -524,6 +591,8 @@ class SqliteEngine : public StoreEngine {
     Statement m_user{m_database, "SELECT name, hash, disabled FROM users WHERE name = ?"};
     Statement m_putUser{m_database,
                         "INSERT OR REPLACE INTO users (name, hash, disabled) VALUES (?, ?, ?)"};
+    Statement m_addUser{m_database,
+                        "INSERT OR IGNORE INTO users (name, hash, disabled) VALUES (?, ?, ?)"};
     Statement m_removeUser{m_database, "DELETE FROM users WHERE name = ?"};
 };
 
@@ -573,7 +642,7 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
     makeFolder(address);
     const std::string folder = realPath(address);
     const ServerFiles files(folder, true);
-    Database database(databasePath(folder), true);
+    Database database(databasePath(folder), Opening::New);
     // Log and index take the database's permissions. Password hashes are nobody else's.
     const mode_t mask = umask(0);
     umask(mask);
@@ -594,8 +663,8 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
     transaction.commit();
 }
 
-std::unique_ptr<StoreEngine> openSqlite(const std::string& address) {
-    return std::make_unique<SqliteEngine>(realPath(address));
+std::unique_ptr<StoreEngine> openSqlite(const std::string& address, Access access) {
+    return std::make_unique<SqliteEngine>(realPath(address), access);
 }
 
 void makeSqliteStore(const std::string& address, const std::string& serverName) {
@@ -607,7 +676,7 @@ void makeSqliteStore(const std::string& address, const std::string& serverName) 
 class SqliteCopy : public SqliteEngine {
   public:
     explicit SqliteCopy(const std::string& folder)
-        : SqliteEngine(folder, unfinishedCopyId),
+        : SqliteEngine(folder, Access::ReadAndWrite, unfinishedCopyId),
           m_folder(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {
         if (flock(m_folder.get(), LOCK_EX | LOCK_NB) != 0) {
             throw StoreFailure(Fault::Busy, "somebody else is copying to " + folder);

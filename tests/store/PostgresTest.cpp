@@ -10,7 +10,7 @@
 #include <sys/socket.h>
 
 #include "StoreTest.h"
-#include "comgui/Postgres.h"
+#include "store/postgres/Postgres.h"
 
 using store::Fault;
 

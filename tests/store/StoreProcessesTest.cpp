@@ -1,7 +1,6 @@
 // Several processes on one store; writers that are killed, and servers that are stopped under them.
 #include <atomic>
 #include <csignal>
-#include <cstdlib>
 #include <new>
 #include <random>
 #include <set>
@@ -15,12 +14,6 @@ namespace {
 
 class StoreProcesses : public StoreTest {};
 ON_BOTH_ENGINES(StoreProcesses);
-
-/// TINTGATE_ROUNDS asks for more rounds than those that every run of the tests takes.
-int roundsOr(int usual) {
-    const char* wanted = std::getenv("TINTGATE_ROUNDS");
-    return wanted == nullptr ? usual : std::atoi(wanted);
-}
 
 /// Writes that can be cut off at any moment, and of which one can tell whether they are there
 /// whole: each is a table of ticket 3/1 and a file, both of one number.

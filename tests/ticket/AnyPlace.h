@@ -10,8 +10,8 @@
 #include "Postgres.h"
 #include "RealTickets.h"
 #include "ScratchFolder.h"
-#include "comgui/StoreEngine.h"
-#include "comgui/StoreKeep.h"
+#include "store/StoreEngine.h"
+#include "store/StoreKeep.h"
 
 enum class Place { Memory, Sqlite, Postgres };
 
