@@ -29,8 +29,8 @@ bool isSound(const char* entry) {
 } // namespace
 
 std::size_t overviewKey(std::string_view name) {
-    return static_cast<std::size_t>(
-        std::find(overviewKeys.begin(), overviewKeys.end(), name) - overviewKeys.begin());
+    return static_cast<std::size_t>(std::find(overviewKeys.begin(), overviewKeys.end(), name) -
+                                    overviewKeys.begin());
 }
 
 std::string slotOf(const Elements* elements) {
@@ -59,8 +59,7 @@ void JobOverview::clear() {
 
 void JobOverview::add(int block, std::string_view bytes) {
     constexpr int blocks = 0x1000000 / jobsOfBlock; // Ids run up to 16,777,215.
-    if (block < static_cast<int>(m_start.size()) || block >= blocks ||
-        bytes.size() != blockBytes) {
+    if (block < static_cast<int>(m_start.size()) || block >= blocks || bytes.size() != blockBytes) {
         throw StoreFailure(Fault::Damaged, "the store's overview of jobs can't be read");
     }
     for (int i = 0; i < jobsOfBlock; ++i) {

@@ -33,8 +33,8 @@ enum class Fault {
               ///< file.
     NoFile,   ///< No such file or version.
     Exists,   ///< There is one already.
-    Lost,     ///< The server does not answer (any more): see alive. Whether it still took what was under way
-              ///< is not known; it took all of it or nothing.
+    Lost,     ///< The server does not answer (any more): see alive. Whether it still took what was
+              ///< under way is not known; it took all of it or nothing.
     Other,    ///< The text tells.
 };
 
@@ -77,8 +77,8 @@ struct FileVersion {
 struct Scope {
     /// The ticket is emptied first; keys says nothing then.
     bool everything = false;
-    /// The change may be made twice, as if it were made once: no appended elements, and none that are
-    /// deleted by their position.
+    /// The change may be made twice, as if it were made once: no appended elements, and none that
+    /// are deleted by their position.
     bool repeatable = false;
     /// By name, whether what the key holds is needed. Keys that are not listed stay as they are.
     std::map<std::string, bool, std::less<>> keys;

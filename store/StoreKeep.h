@@ -80,7 +80,7 @@ class StoreKeep : public TicketKeep {
     std::chrono::steady_clock::time_point m_overviewFetched;
     std::uint64_t m_overviewCommits = 0;
     bool m_overviewHeld = false;
-    std::size_t m_readsSince = 0;     ///< Of keys that an overview would have held.
+    std::size_t m_readsSince = 0;      ///< Of keys that an overview would have held.
     std::size_t m_readsUntilNext = 20; ///< An overview is due after so many.
 };
 

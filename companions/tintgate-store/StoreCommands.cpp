@@ -63,7 +63,8 @@ void addStoreCommands(Command program, Invocation& invocation) {
     command.option("--name", options->serverName, "Name that the server gives itself")
         .showDefault();
     command.footer(
-        "The folder must not be there yet, or be empty; a server's database must hold no store. The\n"
+        "The folder must not be there yet, or be empty; a server's database must hold no store. "
+        "The\n"
         "address must have no \":\", since a job's arguments keep only what follows the last one.");
 
     addCommand<NoOptions>(

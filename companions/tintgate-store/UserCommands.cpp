@@ -1,10 +1,10 @@
 #include <iostream>
 
-#include "store/Users.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/Rows.h"
+#include "store/Users.h"
 
 namespace admin {
 
@@ -101,9 +101,10 @@ void addUserCommands(Command program, Invocation& invocation) {
     command("remove", "Remove a user", remove);
     addCommand<UserOptions>(group, invocation, "list", "List users", options,
                             [&](const UserOptions&) { list(invocation); });
-    group.footer("Names and passwords have 1 to 127 characters, none above U+00FF and no \":\": a login "
-                 "brings one byte\nfor each, and a job's arguments keep only what follows the last "
-                 "\":\".");
+    group.footer(
+        "Names and passwords have 1 to 127 characters, none above U+00FF and no \":\": a login "
+        "brings one byte\nfor each, and a job's arguments keep only what follows the last "
+        "\":\".");
 }
 
 } // namespace admin

@@ -274,9 +274,8 @@ void Connection::settle(const Settings& said) {
         m_connection.get(), [](void*, const char*) {}, nullptr);
     m_pq->setnonblocking(m_connection.get(), 1);
     m_pq->enterPipelineMode(m_connection.get());
-    static constexpr Statement limit = {
-        "SELECT setting::bigint, pg_backend_pid() FROM pg_settings"
-        " WHERE name = 'statement_timeout'"};
+    static constexpr Statement limit = {"SELECT setting::bigint, pg_backend_pid() FROM pg_settings"
+                                        " WHERE name = 'statement_timeout'"};
     send(limit); // The settings go in front of it.
     const auto results = finish();
     const int way = postgres::said(said, "tcp_user_timeout");
@@ -360,8 +359,9 @@ Connection::Call::~Call() {
     m_connection.m_inCall = false;
     if (m_lostSince) {
         const auto left = m_connection.m_absenceLeft - (Clock::now() - *m_lostSince);
-        m_connection.m_absenceLeft = std::max(
-            std::chrono::duration_cast<std::chrono::milliseconds>(left), std::chrono::milliseconds());
+        m_connection.m_absenceLeft =
+            std::max(std::chrono::duration_cast<std::chrono::milliseconds>(left),
+                     std::chrono::milliseconds());
     }
 }
 
@@ -425,8 +425,8 @@ void Connection::sendNow(const char* text, const char* name, const Arguments& ar
 void Connection::sendArguments(const Statement& statement, const Arguments& arguments) {
     beThere();
     if (m_pooled) {
-        const bool starts = m_sent.empty() &&
-                            m_pq->transactionStatus(m_connection.get()) == PQTRANS_IDLE;
+        const bool starts =
+            m_sent.empty() && m_pq->transactionStatus(m_connection.get()) == PQTRANS_IDLE;
         const bool isBegin = statement.text == begin.text;
         if (starts && !isBegin) {
             sendSettings();

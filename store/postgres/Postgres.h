@@ -19,8 +19,8 @@
 #include <string_view>
 #include <vector>
 
-#include "store/postgres/LibPq.h"
 #include "store/StoreEngine.h"
+#include "store/postgres/LibPq.h"
 
 namespace store::postgres {
 

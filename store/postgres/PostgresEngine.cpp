@@ -193,9 +193,8 @@ class PostgresEngine : public StoreEngine {
     }
 
     bool exists(int type, int id) override {
-        return m_connection.repeating([&] {
-            return m_connection.run(isThere, type, id).number(0, 0) != 0;
-        });
+        return m_connection.repeating(
+            [&] { return m_connection.run(isThere, type, id).number(0, 0) != 0; });
     }
 
     bool create(int type, int id) override {
@@ -254,7 +253,8 @@ class PostgresEngine : public StoreEngine {
             if (!row.isNull(0, 2)) {
                 m_last = {};
                 auto elements = decoded(row.bytes(0, 2));
-                m_last = {type, id, std::string(name), row.number(0, 0), row.number(0, 1), elements};
+                m_last = {type,    id, std::string(name), row.number(0, 0), row.number(0, 1),
+                          elements};
             }
             return m_last.elements;
         });
@@ -265,10 +265,10 @@ class PostgresEngine : public StoreEngine {
         return m_connection.repeating([&]() -> std::shared_ptr<const TicketContent> {
             const Names exact(filter.exact().begin(), filter.exact().end());
             const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
-            const Result rows = filter.all()       ? m_connection.run(allKeys, type, id)
-                                : prefixes.empty() ? m_connection.run(exactKeys, type, id, exact)
-                                                   : m_connection.run(someKeys, type, id, exact,
-                                                                      prefixes);
+            const Result rows = filter.all() ? m_connection.run(allKeys, type, id)
+                                : prefixes.empty()
+                                    ? m_connection.run(exactKeys, type, id, exact)
+                                    : m_connection.run(someKeys, type, id, exact, prefixes);
             if (rows.rows() == 0) {
                 return nullptr;
             }
@@ -340,8 +340,7 @@ class PostgresEngine : public StoreEngine {
     bool addUser(const User& user) override {
         return m_connection.once([&] {
             noteChange();
-            return m_connection
-                       .run(addOneUser, user.name, user.passwordHash, user.disabled)
+            return m_connection.run(addOneUser, user.name, user.passwordHash, user.disabled)
                        .changed() != 0;
         });
     }
@@ -364,9 +363,7 @@ class PostgresEngine : public StoreEngine {
         return m_connection.repeating([&] { return m_files.list(); });
     }
     std::vector<FileVersion> versions(std::string_view path) override {
-        return m_connection.repeating([&] {
-            return m_files.versions(path);
-        });
+        return m_connection.repeating([&] { return m_files.versions(path); });
     }
     void getVersion(std::string_view path, int number, std::ostream& to) override {
         m_files.getVersion(path, number, to);
@@ -400,9 +397,7 @@ class PostgresEngine : public StoreEngine {
     }
     void placeVersion(std::string_view path, const FileVersion& version,
                       std::istream& from) override {
-        m_connection.once([&] {
-            m_files.placeVersion(path, version, from);
-        });
+        m_connection.once([&] { m_files.placeVersion(path, version, from); });
     }
     void finishCopy() override {
         m_connection.once([&] {
@@ -518,8 +513,7 @@ class PostgresEngine : public StoreEngine {
             }
         }
         if (scope.everything) {
-            m_connection.send(putEntry, jobType, id, blockOf(id), entry,
-                              position(entryOffset(id)));
+            m_connection.send(putEntry, jobType, id, blockOf(id), entry, position(entryOffset(id)));
         }
     }
 

@@ -66,9 +66,8 @@ Database::Database(const std::string& path, Opening opening) {
     const int flags =
         unchanging ? SQLITE_OPEN_READONLY | SQLITE_OPEN_URI
                    : SQLITE_OPEN_READWRITE | (opening == Opening::New ? SQLITE_OPEN_CREATE : 0);
-    const int code =
-        sqlite3_open_v2(name.c_str(), &opened,
-                        flags | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE, nullptr);
+    const int code = sqlite3_open_v2(name.c_str(), &opened,
+                                     flags | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE, nullptr);
     m_database.reset(opened);
     if (code != SQLITE_OK) {
         fail(opened, code);

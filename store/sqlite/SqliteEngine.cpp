@@ -264,7 +264,7 @@ class SqliteEngine : public StoreEngine {
         }
         if (filter.exact().size() == 1 && filter.prefixes().empty()) {
             return take(m_oneKey.run(type, id, *filter.exact().begin()), *content) ? content
-                                                                                    : nullptr;
+                                                                                   : nullptr;
         }
         const ReadTransaction transaction(m_database);
         std::int64_t ticket = 0;
@@ -511,7 +511,8 @@ class SqliteEngine : public StoreEngine {
         Places places;
         for (std::size_t key = 0; key < overviewKeys.size(); ++key) {
             if (scope.everything || scope.keys.contains(overviewKeys[key])) {
-                places.emplace_back(slotOffset(id, key), slotOf(after.find(overviewKeys[key]).get()));
+                places.emplace_back(slotOffset(id, key),
+                                    slotOf(after.find(overviewKeys[key]).get()));
             }
         }
         if (!places.empty()) {

@@ -64,21 +64,20 @@ bool readValue(const Elements& key, PARAM_TYPE type, void* out, int position,
 
 /// Numbers are compared as they lie in memory: a NaN equals itself, and 0.0 does not equal -0.0.
 bool sameBits(const Value& a, const Value& b) {
-    return a.index() == b.index() && std::visit(
-                                         [&](const auto& value) {
-                                             using T = std::decay_t<decltype(value)>;
-                                             const T& there = *std::get_if<T>(&b);
-                                             if constexpr (std::is_same_v<T, Text> ||
-                                                           std::is_same_v<T, Binary>) {
-                                                 return value.bytes->text == there.bytes->text;
-                                             } else if constexpr (std::is_empty_v<T>) {
-                                                 return true;
-                                             } else {
-                                                 return std::memcmp(&value, &there,
-                                                                    sizeof value) == 0;
-                                             }
-                                         },
-                                         a);
+    return a.index() == b.index() &&
+           std::visit(
+               [&](const auto& value) {
+                   using T = std::decay_t<decltype(value)>;
+                   const T& there = *std::get_if<T>(&b);
+                   if constexpr (std::is_same_v<T, Text> || std::is_same_v<T, Binary>) {
+                       return value.bytes->text == there.bytes->text;
+                   } else if constexpr (std::is_empty_v<T>) {
+                       return true;
+                   } else {
+                       return std::memcmp(&value, &there, sizeof value) == 0;
+                   }
+               },
+               a);
 }
 
 bool removeElement(std::shared_ptr<Elements>& key, int position) {

@@ -353,7 +353,8 @@ class StoreCopy : public TintgateStore {
 
 TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
     const std::string before = allOf(m_address);
-    EXPECT_THAT(answer({"copy", m_address, "room"}), HasSubstr("3 tickets, 1001 files and 1 user\n"));
+    EXPECT_THAT(answer({"copy", m_address, "room"}),
+                HasSubstr("3 tickets, 1001 files and 1 user\n"));
     EXPECT_TRUE(allOf("room") == before);
     answer({"copy", "room", back});
     EXPECT_TRUE(allOf(back) == before);

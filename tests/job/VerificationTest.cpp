@@ -23,10 +23,10 @@
 #include "RunningProgram.h"
 #include "SuiteRoot.h"
 #include "TicketText.h"
-#include "store/sqlite/Sqlite.h"
 #include "store/StoreEngine.h"
 #include "store/StoreKeep.h"
 #include "store/Users.h"
+#include "store/sqlite/Sqlite.h"
 
 namespace {
 

@@ -123,7 +123,8 @@ TEST_F(Postgres, WhatWasSentIsRepeatedUnlessTwiceIsNotOnce) {
         const std::string before = contentText(expected);
         expected.apply(table.records());
         store::StoreKeep keep(open());
-        bare.run("BEGIN; UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = 3 AND id = 1");
+        bare.run(
+            "BEGIN; UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = 3 AND id = 1");
         std::thread killer([&] { // While the change waits at the server.
             std::string pid;
             const support::BarePostgres other("room");
@@ -176,7 +177,9 @@ TEST(PostgresLoss, ASessionGoesOnWhenItsServerIsBack) {
     static constexpr Statement one = {"SELECT 1"};
     Connection connection("tintgate", std::chrono::milliseconds(1'000));
     server.stop("fast");
-    const auto ask = [&] { connection.repeating([&] { return connection.run(one).number(0, 0); }); };
+    const auto ask = [&] {
+        connection.repeating([&] { return connection.run(one).number(0, 0); });
+    };
     const auto start = std::chrono::steady_clock::now();
     EXPECT_EQ(StoreTest::faultOf(ask), Fault::Lost);
     EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(900));
@@ -201,7 +204,8 @@ TEST_F(Postgres, ADislikedPasswordFileAndAnAddressCostNothing) {
     testing::internal::CaptureStderr();
     EXPECT_NO_THROW(store::openStore("disliked"));
     EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
-    std::thread opening([] { EXPECT_EQ(faultOf([] { store::openStore("addressed"); }), Fault::Missing); });
+    std::thread opening(
+        [] { EXPECT_EQ(faultOf([] { store::openStore("addressed"); }), Fault::Missing); });
     int connections = 0;
     for (pollfd wait = {listener, POLLIN, 0}; poll(&wait, 1, 1'000) > 0; ++connections) {
         close(accept(listener, nullptr, nullptr));

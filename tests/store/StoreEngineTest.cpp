@@ -188,7 +188,7 @@ TEST_P(StoreEngine, KeepsTheOverviewOfJobsInStep) {
             for (std::size_t key = 0; key < store::overviewKeys.size(); ++key) {
                 int number = 0;
                 const auto holds = jobs.find(id, key, number);
-                text += holds == store::JobOverview::Holds::Number  ? std::to_string(number) + ","
+                text += holds == store::JobOverview::Holds::Number    ? std::to_string(number) + ","
                         : holds == store::JobOverview::Holds::Nothing ? "-,"
                                                                       : "?,";
             }
@@ -231,7 +231,8 @@ TEST_P(StoreEngine, KeepsTheOverviewOfJobsInStep) {
 
     // A store that was made before there was an overview gets the same.
     const std::string before = shown(*engine);
-    sql("DROP TABLE job_blocks", "DROP TABLE tintgate.job_blocks; ALTER TABLE tintgate.files DROP last_version");
+    sql("DROP TABLE job_blocks",
+        "DROP TABLE tintgate.job_blocks; ALTER TABLE tintgate.files DROP last_version");
     setFormat(room ? 2 : 1);
     EXPECT_EQ(faultOf([&] { open(); }), Fault::Older);
     EXPECT_TRUE(store::bringStoreUpToDate(address));
@@ -287,8 +288,9 @@ TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
         const auto engine = open();
         for (int id = 1; id <= 70; ++id) {
             engine->create(3, id);
-            send(*engine, 3, id, "Job/Display/Status=208 Input/FileType=0 Input/SubType=1 v=1,2,3"
-                                 " t='text,'more b=#0001 p=2.5,'x n[7]=1");
+            send(*engine, 3, id,
+                 "Job/Display/Status=208 Input/FileType=0 Input/SubType=1 v=1,2,3"
+                 " t='text,'more b=#0001 p=2.5,'x n[7]=1");
         }
         engine->putUser({"press", "no hash", false});
         putFile(*engine, "a/b", "one");
@@ -349,8 +351,8 @@ TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
             place = bare.run("UPDATE tintgate." + std::string(table) + " SET " + name +
                              " = set_byte(" + name + ", " + at + " % length(" + name +
                              "), get_byte(" + name + ", " + at + " % length(" + name + ")) # " +
-                             std::to_string(static_cast<unsigned char>(bits)) +
-                             ") WHERE ctid = '" + place + "' RETURNING ctid");
+                             std::to_string(static_cast<unsigned char>(bits)) + ") WHERE ctid = '" +
+                             place + "' RETURNING ctid");
         };
         change();
         work(false);
@@ -363,8 +365,8 @@ TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
 TEST_F(FolderStore, CanBeReadOnAFullDisk) {
     open()->create(3, 1);
     send(*open(), 3, 1, "kept=1,2,3");
-    for (const auto& [access, result] : {std::pair(store::Access::ReadAndWrite, 2),
-                                         {store::Access::Read, 0}}) {
+    for (const auto& [access, result] :
+         {std::pair(store::Access::ReadAndWrite, 2), {store::Access::Read, 0}}) {
         const pid_t child = startProcess([&, access = access] {
             signal(SIGXFSZ, SIG_IGN);
             const rlimit limit = {20'000, 20'000}; // The index of the log takes 32 KB.

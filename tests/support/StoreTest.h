@@ -19,9 +19,9 @@
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 #include "TicketText.h"
-#include "store/sqlite/Sqlite.h"
 #include "store/StoreEngine.h"
 #include "store/StoreKeep.h"
+#include "store/sqlite/Sqlite.h"
 
 /// Starts work in a process of its own, which ends with what work returns; 99 after an exception.
 inline pid_t startProcess(const std::function<int()>& work) {
@@ -135,7 +135,8 @@ class StoreTest : public testing::TestWithParam<Engine> {
             support::BarePostgres("room").run(postgres);
             return;
         }
-        store::sqlite::Database(address + "/tickets.db", store::sqlite::Opening::Existing).run(sqlite.c_str());
+        store::sqlite::Database(address + "/tickets.db", store::sqlite::Opening::Existing)
+            .run(sqlite.c_str());
     }
 
     void setFormat(int format) const {

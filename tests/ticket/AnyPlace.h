@@ -45,10 +45,10 @@ class AnyPlace : public testing::TestWithParam<Place> {
 };
 
 #define IN_ANY_PLACE(Suite)                                                                        \
-    INSTANTIATE_TEST_SUITE_P(                                                                      \
-        , Suite, testing::Values(Place::Memory, Place::Sqlite, Place::Postgres),                   \
-        [](const auto& info) {                                                                     \
-            return std::string(info.param == Place::Memory   ? "Memory"                            \
-                               : info.param == Place::Sqlite ? "Sqlite"                            \
-                                                             : "Postgres");                        \
-        })
+    INSTANTIATE_TEST_SUITE_P(, Suite,                                                              \
+                             testing::Values(Place::Memory, Place::Sqlite, Place::Postgres),       \
+                             [](const auto& info) {                                                \
+                                 return std::string(info.param == Place::Memory   ? "Memory"       \
+                                                    : info.param == Place::Sqlite ? "Sqlite"       \
+                                                                                  : "Postgres");   \
+                             })

@@ -187,8 +187,8 @@ TEST_P(ShallowList, HoldsWhatAnyWalkShowedUntilTheTicketChanges) {
     other.apply(jobs, 12, RecordTable("t[1]='changed").records());
     unchanged();
     list.Merge(&ticket, nullptr);
-    EXPECT_EQ(tableText(list.Table(false)), texts + " " + content.substr(0, content.find('t')) +
-                                                "t[-1]='text t[1]='changed");
+    EXPECT_EQ(tableText(list.Table(false)),
+              texts + " " + content.substr(0, content.find('t')) + "t[-1]='text t[1]='changed");
 }
 
 } // namespace
