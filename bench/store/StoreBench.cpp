@@ -99,8 +99,9 @@ int main() {
                       " || x'000000' AS BLOB) FROM tickets WHERE type = 3")
                          .c_str());
         }
-        bare.run("COMMIT");
+        bare.run("DROP TABLE job_blocks; PRAGMA user_version = 1; COMMIT");
     }
+    check(store::bringStoreUpToDate(address), "making the overview of jobs");
 
     CKZConnector connector(base::wideFromBytes(address), L"bench", L"bench", 0x5071103, false,
                            false);

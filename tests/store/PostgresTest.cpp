@@ -2,11 +2,14 @@
 // are stopped, older schemas.
 #include <chrono>
 #include <csignal>
+#include <cstdlib>
 #include <filesystem>
+#include <fstream>
 #include <thread>
 
 #include <netinet/in.h>
 #include <poll.h>
+#include <pwd.h>
 #include <sys/socket.h>
 
 #include "StoreTest.h"
@@ -186,6 +189,80 @@ TEST(PostgresLoss, ASessionGoesOnWhenItsServerIsBack) {
     server.startAgain();
     EXPECT_EQ(StoreTest::faultOf(ask), Fault::Lost);
     EXPECT_FALSE(connection.isThere());
+}
+
+/// PgBouncer between a test and the tests' server, with one session for all. While it lives, the
+/// service "pooled" leads through it.
+class Pooler {
+  public:
+    explicit Pooler(const support::PostgresRoom& room) {
+        EXPECT_NE(mkdtemp(m_folder.data()), nullptr);
+        const std::string services = support::contentsOf(std::getenv("PGSERVICEFILE"));
+        const auto at = services.find("host=") + 5;
+        const std::string server = services.substr(at, services.find('\n', at) - at);
+        std::ofstream(m_folder + "/ini")
+            << "[databases]\n* = host=" << server << " user=tintgate\n"
+            << "[pgbouncer]\nlisten_port=6543\nunix_socket_dir=" << m_folder
+            << "\nauth_type=any\npool_mode=transaction\ndefault_pool_size=1\n";
+        // It refuses to run as root.
+        const passwd* const user = geteuid() == 0 ? getpwnam("postgres") : nullptr;
+        if (user != nullptr) {
+            EXPECT_EQ(chown(m_folder.c_str(), user->pw_uid, user->pw_gid), 0);
+        }
+        m_process = startProcess([&] {
+            if (user != nullptr && (setgid(user->pw_gid) != 0 || setuid(user->pw_uid) != 0)) {
+                return 1;
+            }
+            execl("/usr/sbin/pgbouncer", "pgbouncer", "-q", (m_folder + "/ini").c_str(), nullptr);
+            return 1;
+        });
+        room.addService("pooled", "port=6543\nhost=" + m_folder);
+        for (int wait = 0; wait < 500 && !std::filesystem::exists(m_folder + "/.s.PGSQL.6543");
+             ++wait) {
+            usleep(10'000);
+        }
+    }
+    ~Pooler() {
+        kill(m_process, SIGKILL);
+        endOf(m_process);
+        std::filesystem::remove_all(m_folder);
+    }
+    Pooler(const Pooler&) = delete;
+
+  private:
+    std::string m_folder = "/tmp/tintgate-pooler-XXXXXX"; ///< In reach of that user.
+    pid_t m_process = 0;
+};
+
+TEST_F(Postgres, APoolerMayHandOutSingleTransactions) {
+    const Pooler pooler(*room);
+    const auto one = store::openStore("pooled");
+    const auto other = store::openStore("pooled");
+    EXPECT_EQ(one->createNext(3), 1);
+    EXPECT_EQ(other->createNext(3), 2);
+    for (const auto& engine : {one.get(), other.get(), one.get()}) {
+        EXPECT_EQ(send(*engine, 3, 1, "a=1 b[-2]=2 Job/Display/Status=208"), "taken 111");
+        putFile(*engine, "a/b", std::string(3 << 20, 'x'));
+        store::JobOverview jobs;
+        engine->overview(jobs);
+        EXPECT_EQ(jobs.ids(), (std::vector<int>{1, 2}));
+    }
+    EXPECT_EQ(ticket(*open(), 3, 1), "Job/Display/Status[0]=208 a[0]=1 b[0]=2 b[1]=2 b[2]=2");
+    EXPECT_EQ(file(*other, "a/b").size(), 3u << 20);
+    EXPECT_EQ(versions(*one, "a/b").size(), 2u);
+    EXPECT_EQ(faultOf([] { store::openCopy("pooled"); }), Fault::Other);
+    // Limits are set for the transaction, and left to no other client of that session.
+    using namespace store::postgres;
+    static constexpr Statement limit = {"SELECT current_setting('lock_timeout')::text"};
+    Connection connection("pooled");
+    EXPECT_TRUE(connection.pooled());
+    EXPECT_EQ(connection.run(limit).text(0, 0), "10s");
+    EXPECT_EQ(support::BarePostgres("pooled").run(limit.text), "0");
+    EXPECT_FALSE(Connection("room").pooled());
+    // A measurement may take longer than a session may idle elsewhere.
+    room->addService("idle", "options=-c idle_session_timeout=300");
+    static constexpr Statement idle = {"SELECT current_setting('idle_session_timeout')::text"};
+    EXPECT_EQ(Connection("idle").run(idle).text(0, 0), "0");
 }
 
 TEST_F(Postgres, ADislikedPasswordFileAndAnAddressCostNothing) {
