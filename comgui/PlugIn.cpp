@@ -187,7 +187,8 @@ std::int32_t sendJob(void*, std::uint64_t, TJobIdentification*, const char*, con
     return codeRefused;
 }
 
-/// Answered from a session with this store, where there is one; else from the store itself. A store
+/// Answered from a session with this store if there is one, which then tries to reach a server that
+/// it has lost; otherwise from the store itself. A store
 /// of another format is alive: what is wrong with it is for the login to say.
 std::int32_t isAlive(void* instance, const char* host, int) {
     constexpr std::int32_t alive = 0;

@@ -21,5 +21,7 @@ echo "== the whole program"
 cmake --build --preset release --target bench_tool
 echo "== a whole run of the job form"
 cmake --build --preset release --target bench_job
+echo "== runs in stores of growing size"
+scripts/with-postgres.sh python3 bench/store/job_growth.py "$PWD/build/release" "$PWD"
 echo "== the pages of reports"
 cmake --build --preset release --target bench_report

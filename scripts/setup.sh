@@ -9,7 +9,7 @@ packages=(
   libexpat1-dev libpq-dev libjs-chart.js
   # To test and to measure
   libgtest-dev libgmock-dev libbenchmark-dev python3-jsonschema argyll liblcms2-utils chromium
-  postgresql
+  postgresql pgbouncer
   # Data of printing conditions, and CMYK profiles
   icc-profiles-free libgs-common
 )

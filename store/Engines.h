@@ -13,7 +13,7 @@ namespace store {
 
 /// One kind. As the functions of StoreEngine.h.
 struct EngineKind {
-    std::unique_ptr<StoreEngine> (*open)(const std::string& address);
+    std::unique_ptr<StoreEngine> (*open)(const std::string& address, Access access);
     void (*make)(const std::string& address, const std::string& serverName);
     std::unique_ptr<StoreEngine> (*openCopy)(const std::string& address);
     bool (*bringUpToDate)(const std::string& address);

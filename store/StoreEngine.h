@@ -15,6 +15,7 @@
 #include <string_view>
 #include <vector>
 
+#include "store/JobOverview.h"
 #include "store/tickets/TicketContent.h"
 
 namespace store {
@@ -32,8 +33,8 @@ enum class Fault {
               ///< file.
     NoFile,   ///< No such file or version.
     Exists,   ///< There is one already.
-    Lost,     ///< The server does not answer (any more). Whether it still took what was under way
-              ///< is not known; it took all of it or nothing.
+    Lost,     ///< The server does not answer (any more): see alive. Whether it still took what was
+              ///< under way is not known; it took all of it or nothing.
     Other,    ///< The text tells.
 };
 
@@ -67,7 +68,7 @@ struct FileEntry {
 
 /// A file's content before it was replaced.
 struct FileVersion {
-    int number = 0; ///< From 1, in the order of replacement.
+    int number = 0; ///< From 1, in the order of replacement. None is used twice for a path.
     std::uint64_t size = 0;
     std::int64_t time = 0; ///< When this content had been written.
 };
@@ -76,6 +77,9 @@ struct FileVersion {
 struct Scope {
     /// The ticket is emptied first; keys says nothing then.
     bool everything = false;
+    /// The change may be made twice, as if it were made once: no appended elements, and none that
+    /// are deleted by their position.
+    bool repeatable = false;
     /// By name, whether what the key holds is needed. Keys that are not listed stay as they are.
     std::map<std::string, bool, std::less<>> keys;
 };
@@ -89,13 +93,15 @@ class StoreEngine {
   public:
     virtual ~StoreEngine() = default;
 
-    /// False once the connection to a server is lost, which is for good. Asks nobody.
+    /// False once the connection to a server is lost for good. A connection that was lost is made
+    /// anew, here and by each operation; one that only reads, or that can be repeated, then starts
+    /// again. After 30 seconds without the server, all waits together, it is for good.
     virtual bool alive() = 0;
 
     /// A number that differs from the last one if anybody has committed anything since. It may
     /// differ without that. Meant to be asked before each read. Where only a server knows, it is
-    /// asked if something fetched by keysOfAll may still be as it was; an answer that may be of
-    /// this age spares that. Commits of this object itself are noticed at any age.
+    /// asked if what overview fetched may still be as it was; accepting an answer of this age
+    /// avoids that. Commits of this object itself are noticed at any age.
     virtual std::uint64_t commits(std::chrono::milliseconds age) = 0;
 
     // Tickets.
@@ -126,10 +132,14 @@ class StoreEngine {
     virtual void keysOfAll(int type, const std::vector<std::string>& names,
                            std::size_t largestBytes, const ShowKey& show) = 0;
 
+    /// The overview of all jobs, of one moment.
+    virtual void overview(JobOverview& jobs) = 0;
+
     /// One transaction, which locks the ticket first: fetches the keys that the scope needs, has
     /// them changed by work, and writes what differs then. Work touches no key outside the scope.
     /// False when there is no such ticket, which is not looked for before work is called unless
-    /// something is needed. What work throws undoes it.
+    /// something is needed. What work throws undoes it. Work may be called again on the same ticket
+    /// if the scope is repeatable.
     virtual bool change(int type, int id, const Scope& scope,
                         const std::function<void(TicketContent&)>& work) = 0;
 
@@ -139,6 +149,8 @@ class StoreEngine {
     virtual std::optional<User> user(std::string_view name) = 0;
     /// Adds the user, or takes the place of the one with this name.
     virtual void putUser(const User& user) = 0;
+    /// False, and nothing is changed, when there is a user of this name.
+    virtual bool addUser(const User& user) = 0;
     virtual bool removeUser(std::string_view name) = 0;
 
     // Files. A server path may start with slashes; it means the file below the store's files in
@@ -180,7 +192,15 @@ class StoreEngine {
 // slash. Any other names a connection service of a PostgreSQL server (pg_service.conf), with a
 // store in the schema "tintgate" of its database.
 
-std::unique_ptr<StoreEngine> openStore(const std::string& address);
+/// What a store is opened for.
+enum class Access {
+    ReadAndWrite, ///< Refused (ReadOnly, Full) if the store can't be written as it is.
+    Read,         ///< Also a store on a full disk or one that is mounted for reading. Writing is
+                  ///< tried all the same, and may fail.
+};
+
+std::unique_ptr<StoreEngine> openStore(const std::string& address,
+                                       Access access = Access::ReadAndWrite);
 
 /// Makes a new store, with the system ticket in it, where nothing is or an empty folder. A folder
 /// and what is in it are for owner and group alone, as the umask allows.

@@ -8,19 +8,9 @@ namespace store {
 
 namespace {
 
-constexpr int jobType = 3;
-
 // Places in a listing: in front of all, and where none is under way.
 constexpr std::pair listingStarts = {-1, std::size_t{0}};
 constexpr std::pair notListing = {std::numeric_limits<int>::max(), std::size_t{0}};
-
-/// In the order in which a client reads them.
-const std::vector<std::string> jobOverview = {"Input/SubType", "Job/Display/Status",
-                                              "Remote/ShowInVerifier", "Input/FileType",
-                                              "Workflow/Verify/Active"};
-
-/// Room for a number or a few; whoever put more there has it read singly.
-constexpr std::size_t largestOverviewBytes = 64;
 
 template<class Body, class Result>
 Result orElse(Result otherwise, Body body) {
@@ -54,12 +44,17 @@ bool replacesKey(const SETMULTIPAR& record) {
 
 Scope scopeOf(const SETMULTIPAR* table) {
     Scope scope;
+    scope.repeatable = true;
     const char* last = nullptr;
+    bool needed = false; // What the record's key held before.
     for (const auto* record = table; record->key != nullptr; ++record) {
         if (record->key != last) {
             last = record->key;
-            scope.keys.try_emplace(last, !replacesKey(*record));
+            needed = scope.keys.try_emplace(last, !replacesKey(*record)).first->second;
         }
+        const bool counts = record->position == POSITION_APPEND ||
+                            (record->type == PARAM_DELETE && record->position != POSITION_WHOLE);
+        scope.repeatable = scope.repeatable && !(needed && counts);
     }
     return scope;
 }
@@ -74,16 +69,36 @@ void clearResults(SETMULTIPAR* table) {
 
 StoreKeep::StoreKeep(std::shared_ptr<StoreEngine> engine) : m_engine(std::move(engine)) {}
 
+/// Writes to a ticket, unless a former write to it was lost.
+template<class Write>
+bool StoreKeep::write(int type, int id, Write write) {
+    const std::pair address = {type, id};
+    if (m_cutOff.contains(address)) {
+        return false;
+    }
+    // In front of the write: it is not to fail for want of memory behind it.
+    const auto cutOff = m_cutOff.insert(address).first;
+    return orElse(false, [&] {
+        const bool written = write();
+        m_cutOff.erase(cutOff);
+        return written;
+    });
+}
+
 std::vector<int> StoreKeep::ids(int type) {
     return orElse(std::vector<int>(), [&] { return listIds(type); });
 }
 
 std::vector<int> StoreKeep::listIds(int type) {
-    if (type == jobType) {
-        m_idsAsked = true;
-        m_listed = listingStarts;
+    if (type != jobType) {
+        return m_engine->ids(type);
     }
-    return m_engine->ids(type);
+    m_listed = listingStarts;
+    const std::uint64_t commits = m_engine->commits(std::chrono::milliseconds(0));
+    if (!m_overviewHeld || m_overviewCommits != commits) {
+        fetchOverview(commits);
+    }
+    return m_overview.ids();
 }
 
 bool StoreKeep::exists(int type, int id) {
@@ -99,29 +114,30 @@ int StoreKeep::createNext(int type) {
 }
 
 bool StoreKeep::remove(int type, int id) {
-    return orElse(false, [&] { return m_engine->remove(type, id); });
+    return write(type, id, [&] { return m_engine->remove(type, id); });
 }
 
 std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_view key) {
     return orElse(SharedElements(), [&] {
-        const auto name = type != jobType ? jobOverview.end()
-                                          : std::find(jobOverview.begin(), jobOverview.end(), key);
-        const auto index = static_cast<std::size_t>(name - jobOverview.begin());
+        const std::size_t index = type == jobType ? overviewKey(key) : overviewKeys.size();
+        const bool inOverview = index != overviewKeys.size();
         const bool again = id == m_fetched.id && type == m_fetched.type && key == m_fetched.key;
-        const bool listing = index != overviewKeys && goesOn(id, index);
+        const bool listing = inOverview && goesOn(id, index);
         // Asked before the store is: what is committed in between makes the next read fetch again.
         const std::uint64_t commits =
             m_engine->commits(listing ? oldestListed : std::chrono::milliseconds(0));
         if (again && commits == m_fetched.commits) {
             return m_fetched.elements;
         }
-        if (index != overviewKeys && wantsOverview(commits, listing)) {
-            const Row* const row = overviewRow(id);
-            if (row == nullptr) {
+        if (inOverview && wantsOverview(commits, listing)) {
+            int number = 0;
+            switch (m_overview.find(id, index, number)) {
+            case JobOverview::Holds::Nothing:
                 return SharedElements();
-            }
-            if (!row->large[index]) {
-                return row->elements[index];
+            case JobOverview::Holds::Number:
+                return elementsOf(index, number);
+            case JobOverview::Holds::SomethingElse:
+                break;
             }
         }
         m_fetched.type = -1;
@@ -152,7 +168,7 @@ bool StoreKeep::wantsOverview(std::uint64_t commits, bool listing) {
     }
     m_overviewHeld = false;
     ++m_readsSince;
-    if (!m_idsAsked && m_readsSince <= m_readsUntilNext &&
+    if (m_readsSince <= m_readsUntilNext &&
         !(listing && std::chrono::steady_clock::now() - m_overviewFetched > oldestListed)) {
         return false;
     }
@@ -160,40 +176,29 @@ bool StoreKeep::wantsOverview(std::uint64_t commits, bool listing) {
     return true;
 }
 
-/// Null for a job that has none of the keys.
-const StoreKeep::Row* StoreKeep::overviewRow(int id) {
-    const auto isAt = [&](std::size_t row) {
-        return row < m_overview.size() && m_overview[row].id == id;
-    };
-    if (!isAt(m_lastRow)) {
-        ++m_lastRow;
-    }
-    if (!isAt(m_lastRow)) {
-        const auto found = std::lower_bound(m_overview.begin(), m_overview.end(), id,
-                                            [](const Row& row, int id) { return row.id < id; });
-        m_lastRow = static_cast<std::size_t>(found - m_overview.begin());
-    }
-    return isAt(m_lastRow) ? &m_overview[m_lastRow] : nullptr;
-}
-
 void StoreKeep::fetchOverview(std::uint64_t commits) {
-    m_overview.clear();
-    m_engine->keysOfAll(jobType, jobOverview, largestOverviewBytes,
-                        [&](int id, std::size_t name, SharedElements elements) {
-                            if (m_overview.empty() || m_overview.back().id != id) {
-                                m_overview.push_back({id, {}, {}});
-                            }
-                            auto& row = m_overview.back();
-                            row.large[name] = elements == nullptr;
-                            row.elements[name] = std::move(elements);
-                        });
-    m_lastRow = 0;
+    m_overviewHeld = false;
+    m_engine->overview(m_overview);
     m_overviewFetched = std::chrono::steady_clock::now();
     m_overviewCommits = commits;
     m_overviewHeld = true;
-    m_idsAsked = false;
     m_readsSince = 0;
-    m_readsUntilNext = 20 + m_overview.size();
+    m_readsUntilNext = 20 + m_overview.ids().size();
+}
+
+const StoreKeep::SharedElements& StoreKeep::elementsOf(std::size_t key, int number) {
+    auto& [last, elements] = m_lastNumbers[key];
+    if (elements == nullptr || last != number) {
+        auto& known = m_numbers[number];
+        if (known == nullptr) {
+            Elements made;
+            made.put(0, number);
+            known = std::make_shared<const Elements>(std::move(made));
+        }
+        last = number;
+        elements = known;
+    }
+    return elements;
 }
 
 std::shared_ptr<const TicketContent> StoreKeep::content(int type, int id, const KeyFilter& filter) {
@@ -206,7 +211,7 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
         return exists(type, id);
     }
     try {
-        const bool done = orElse(false, [&] {
+        const bool done = write(type, id, [&] {
             return m_engine->change(type, id, scopeOf(table),
                                     [&](TicketContent& content) { content.apply(table); });
         });
@@ -223,10 +228,11 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
 bool StoreKeep::transfer(int type, int id, const TicketContent& source, bool replace) {
     Scope scope;
     scope.everything = replace;
+    scope.repeatable = true;
     for (const auto& [key, elements] : source.keys()) {
         scope.keys.emplace(key, false);
     }
-    return orElse(false, [&] {
+    return write(type, id, [&] {
         return m_engine->change(type, id, scope,
                                 [&](TicketContent& content) { content.transfer(source, replace); });
     });

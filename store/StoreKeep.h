@@ -5,10 +5,13 @@
 #include <chrono>
 #include <cstdint>
 #include <memory>
+#include <set>
 #include <string>
+#include <unordered_map>
 #include <utility>
 #include <vector>
 
+#include "store/JobOverview.h"
 #include "store/StoreEngine.h"
 #include "store/tickets/TicketKeep.h"
 
@@ -16,15 +19,19 @@ namespace store {
 
 /// A failure of the store is a ticket that isn't there, or a table that can't be written.
 ///
+/// When the store could not take a write (busy, lost, full, damaged, out of memory), all later
+/// writes to that ticket fail for as long as this lives. A client writes the keys that complete a
+/// job last, so a job with a gap never looks complete. What is refused by the rules of tickets does
+/// not count.
+///
 /// What was read is given again only while nobody has committed anything since, so a reader sees
 /// what is there now. Two things are kept that way: the key that was read last, so that the
 /// count and the elements of an array are one fetch; and, once the ids of the jobs have been asked
-/// for, the keys of all jobs by which a client picks those that concern it, since it is about to
-/// ask each job for each of them.
+/// for, the overview of all jobs, since a client is about to ask each job for each of its keys.
 ///
-/// A listing is the one thing that may be seen as it was a moment ago: from where a client starts,
-/// having asked for the ids, to where it no longer goes on to a further one of these keys or a job
-/// of a higher id, what it sees may be as old as oldestListed where asking costs a round trip.
+/// While a client lists jobs (it has asked for the ids and now reads these keys job by job), values
+/// may be up to oldestListed old if asking costs a round trip. Every other read sees the latest
+/// commit.
 class StoreKeep : public TicketKeep {
   public:
     explicit StoreKeep(std::shared_ptr<StoreEngine> engine);
@@ -55,29 +62,26 @@ class StoreKeep : public TicketKeep {
         std::uint64_t commits = 0;
     };
 
-    static constexpr std::size_t overviewKeys = 5;
-    struct Row {
-        int id;
-        std::array<SharedElements, overviewKeys> elements;
-        std::array<bool, overviewKeys> large; ///< Not held for its size.
-    };
-
+    template<class Write>
+    bool write(int type, int id, Write write);
     bool goesOn(int id, std::size_t overviewKey);
-    const Row* overviewRow(int id);
     bool wantsOverview(std::uint64_t commits, bool listing);
     void fetchOverview(std::uint64_t commits);
+    const SharedElements& elementsOf(std::size_t key, int number);
 
     const std::shared_ptr<StoreEngine> m_engine;
+    std::set<std::pair<int, int>> m_cutOff; ///< Types and ids of tickets that lost a write.
     Fetched m_fetched;
-    std::vector<Row> m_overview;            ///< By id.
-    std::size_t m_lastRow = 0;              ///< Jobs are asked for in this order.
+    JobOverview m_overview;
+    std::unordered_map<int, SharedElements> m_numbers; ///< The different ones of the overview.
+    /// By key, the number that was read last: mostly the next job's, too.
+    std::array<std::pair<int, SharedElements>, overviewKeys.size()> m_lastNumbers;
     std::pair<int, std::size_t> m_listed{}; ///< Job and overview key that a listing read last.
     std::chrono::steady_clock::time_point m_overviewFetched;
     std::uint64_t m_overviewCommits = 0;
     bool m_overviewHeld = false;
-    bool m_idsAsked = false;          ///< Since the last overview.
-    std::size_t m_readsSince = 0;     ///< Of keys that an overview would have held.
-    std::size_t m_readsUntilNext = 0; ///< An overview is due again after so many.
+    std::size_t m_readsSince = 0;      ///< Of keys that an overview would have held.
+    std::size_t m_readsUntilNext = 20; ///< An overview is due after so many.
 };
 
 } // namespace store

@@ -12,8 +12,8 @@ const EngineKind& kindOf(const std::string& address) {
 
 } // namespace
 
-std::unique_ptr<StoreEngine> openStore(const std::string& address) {
-    return kindOf(address).open(address);
+std::unique_ptr<StoreEngine> openStore(const std::string& address, Access access) {
+    return kindOf(address).open(address, access);
 }
 
 void makeStore(const std::string& address, const std::string& serverName) {

@@ -80,7 +80,7 @@ class VALCACHE {
     /// Makes room for that many more values.
     void reserve(std::size_t more) {
         const std::size_t places = std::bit_ceil(2 * (m_values.size() + more) + 1);
-        if (places > m_places.size()) {
+        if (more != 0 && places > m_places.size()) {
             Grow(places);
         }
     }

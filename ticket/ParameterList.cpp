@@ -110,7 +110,10 @@ bool SETMULTIPAR_LIST::xSetNumbers(const char* key, PARAM_TYPE type, const void*
     if (type != PARAM_INT && type != PARAM_DOUBLE) {
         return false;
     }
-    const auto more = static_cast<std::size_t>(std::max(count, 0));
+    if (count <= 0) {
+        return true; // Not even the key counts as set.
+    }
+    const auto more = static_cast<std::size_t>(count);
     if (m_list.size() + more > m_list.capacity()) {
         m_list.reserve(std::max(m_list.size() + more, 2 * m_list.capacity()));
     }

@@ -44,7 +44,8 @@ class SETMULTIPAR_LIST {
     bool xSetParameter(const char* key, PARAM_TYPE type, const void* value, int position);
 
     /// The same for a number at each position from 0 on, each PARAM_INT or each PARAM_DOUBLE: a
-    /// measured array, for which it is faster by half. False for another type, which adds nothing.
+    /// measured array, for which it is faster by half. False for another type, which adds nothing;
+    /// a count of 0 or less adds nothing either, and is true.
     bool xSetNumbers(const char* key, PARAM_TYPE type, const void* values, int count);
 
     /// Adds a record as a walk shows it: position 0 becomes -1, for a scalar as for a vector, and

@@ -399,7 +399,7 @@ bool TICKET_UPDATE_LIST::CollectAction(void* context, const char* key, PARAM_TYP
 
 bool UPDATE_PARTIAL_COLLECT_ACTION::SetParameter(const char* key, PARAM_TYPE ptype,
                                                  const void* value, int position) {
-    return !mode->multi_contains(key) ||
+    return key == nullptr || !mode->multi_contains(key) ||
            list->xSetParameter(type, id, key, ptype, value, position, true);
 }
 

@@ -212,7 +212,8 @@ struct UPDATE_PARTIAL_COLLECT_ACTION {
     int id;
     const PARTIAL_MODE* mode;
 
-    /// Sets the value if the mode has the key. True unless the list refuses it.
+    /// Sets the value if the mode has the key; no mode has a null key. True unless the list refuses
+    /// the value.
     bool SetParameter(const char* key, PARAM_TYPE ptype, const void* value, int position);
 
     /// As TICKET_UPDATE_LIST::CollectAction; the context is the action.

@@ -14,10 +14,12 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "StoreBench.h"
 #include "SuiteRoot.h"
+#include "base/WideBytes.h"
 #include "store/StoreEngine.h"
 #include "store/StoreKeep.h"
 #include "store/Users.h"
-#include "base/WideBytes.h"
+#include "ticket/ParameterList.h"
+#include "ticket/TicketUpdateList.h"
 
 namespace {
 
@@ -46,6 +48,21 @@ class BareDatabase {
   private:
     sqlite3* m_database = nullptr;
 };
+
+/// Gives ticket 2 that many keys of three elements; their names.
+std::vector<std::string> makeArrays(ComGUIManager& manager, int count) {
+    std::vector<std::string> names;
+    SETMULTIPAR_LIST list(true);
+    const int numbers[] = {1, 2, 3};
+    for (int i = 0; i < count; ++i) {
+        names.push_back("Array/" + std::to_string(i));
+        list.DelParameter(names.back().c_str(), POSITION_WHOLE);
+        list.xSetNumbers(names.back().c_str(), PARAM_INT, numbers, 3);
+    }
+    check(manager.GetClientContainer()->SetMultiParameter(3, 2, list.Table(false)),
+          "making arrays");
+    return names;
+}
 
 } // namespace
 
@@ -82,8 +99,9 @@ int main() {
                       " || x'000000' AS BLOB) FROM tickets WHERE type = 3")
                          .c_str());
         }
-        bare.run("COMMIT");
+        bare.run("DROP TABLE job_blocks; PRAGMA user_version = 1; COMMIT");
     }
+    check(store::bringStoreUpToDate(address), "making the overview of jobs");
 
     CKZConnector connector(base::wideFromBytes(address), L"bench", L"bench", 0x5071103, false,
                            false);
@@ -162,7 +180,34 @@ int main() {
             sqlite3_reset(select);
             check(rows == 5 * jobs, "the bare select");
         });
-    for (sqlite3_stmt* const statement : {write, read, select}) {
+
+    // The first edit of a key's element fetches the key. What a key costs must not grow with the
+    // number of keys that the ticket has.
+    sqlite3_stmt* const readKey =
+        bare.prepare("SELECT k.value FROM tickets t JOIN keys k ON k.ticket = t.number"
+                     " WHERE t.type = 3 AND t.id = 2 AND k.name = ?");
+    for (const int keys : {5'000, 20'000}) {
+        const std::vector<std::string> names = makeArrays(*connector.getComGUIMngrInstance(), keys);
+        compare((std::to_string(keys) + " edits of one element each").c_str(), 5, 7, touch,
+                [&] {
+                    TICKET_UPDATE_LIST list(manager.GetClientContainer());
+                    const int value = 7;
+                    for (const auto& name : names) {
+                        check(list.xSetParameter(3, 2, name.c_str(), PARAM_INT, &value, 1, false),
+                              "editing an element");
+                    }
+                },
+                [&] {
+                    for (const auto& name : names) {
+                        sqlite3_bind_blob(readKey, 1, name.data(), static_cast<int>(name.size()),
+                                          SQLITE_STATIC);
+                        check(sqlite3_step(readKey) == SQLITE_ROW, "the bare read of a key");
+                        g_sink = sqlite3_column_bytes(readKey, 0);
+                        sqlite3_reset(readKey);
+                    }
+                });
+    }
+    for (sqlite3_stmt* const statement : {write, read, select, readKey}) {
         sqlite3_finalize(statement);
     }
 }

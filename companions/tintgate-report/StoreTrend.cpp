@@ -5,13 +5,13 @@
 #include "analysis/Criteria.h"
 #include "analysis/Judgement.h"
 #include "colour/Difference.h"
-#include "store/StoreEngine.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/LocalPages.h"
 #include "companions/tintgate-report/ServerFiles.h"
 #include "companions/tintgate-report/TicketKeys.h"
 #include "companions/tintgate-report/Trend.h"
+#include "store/StoreEngine.h"
 
 namespace reporting {
 namespace {
@@ -318,7 +318,7 @@ class Gatherer {
 
 Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place) {
     try {
-        const auto store = store::openStore(address);
+        const auto store = store::openStore(address, store::Access::Read);
         Gatherer gatherer(*store, filter, place);
         for (const Verified& verified : verifiedStrips(*store, filter))
             gatherer.add(verified);

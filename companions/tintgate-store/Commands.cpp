@@ -30,7 +30,7 @@ const std::string& Invocation::givenAddress() const {
 }
 
 std::unique_ptr<store::StoreEngine> Invocation::open() const {
-    return store::openStore(givenAddress());
+    return store::openStore(givenAddress(), store::Access::Read);
 }
 
 std::string completeAddress(const std::string& typed) {

@@ -9,6 +9,7 @@
 #include <unistd.h>
 
 #include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
@@ -166,8 +167,10 @@ class Copy {
 };
 
 void copy(const CopyOptions& options) {
-    const auto from = store::openStore(completeAddress(options.from));
-    const auto to = store::openCopy(completeAddress(options.to));
+    const auto from = store::openStore(completeAddress(options.from), store::Access::Read);
+    const std::string target = completeAddress(options.to);
+    refuseColon(target, "the new store's address");
+    const auto to = store::openCopy(target);
     Copy copy(*from, *to);
     copy.run();
     std::cout << "Copied " << copy.told() << '\n';

@@ -144,6 +144,18 @@ std::string userName(const std::string& typed) {
     return narrowed(typed, "the user's name");
 }
 
+void refuseColon(const std::string& text, const std::string& what) {
+    if (text.find(':') != std::string::npos) {
+        throw Failure(Status::BadInput, what + " has a \":\", so no job could use it: a job's "
+                                               "arguments keep only what follows the last \":\"");
+    }
+}
+
+std::string newUserName(const std::string& typed) {
+    refuseColon(typed, "the user's name");
+    return userName(typed);
+}
+
 std::string shownName(const std::string& bytes) {
     std::string text;
     for (const char byte : bytes) {
@@ -162,6 +174,7 @@ std::string askPassword(const std::string& path, const std::string& user) {
     const int terminal = path.empty() ? openTerminal() : -1;
     const std::string typed =
         terminal >= 0 ? typedTwice(terminal, user) : firstLine(path.empty() ? "-" : path);
+    refuseColon(typed, "the password");
     return narrowed(typed, "the password");
 }
 

@@ -2,6 +2,7 @@
 
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/KeyValue.h"
 #include "companions/tintgate-store/Rows.h"
@@ -21,6 +22,7 @@ void make(const Invocation& invocation, const MakeOptions& options) {
     if (options.serverName.empty() || !isUtf8(options.serverName)) {
         throw Failure(Status::BadInput, "the server's name is empty or no UTF-8");
     }
+    refuseColon(invocation.givenAddress(), "the store's address");
     store::makeStore(invocation.givenAddress(), options.serverName);
     std::cout << "Made the store " << printable(invocation.givenAddress()) << '\n';
 }
@@ -61,7 +63,9 @@ void addStoreCommands(Command program, Invocation& invocation) {
     command.option("--name", options->serverName, "Name that the server gives itself")
         .showDefault();
     command.footer(
-        "The folder must not be there yet, or be empty; a server's database must hold no store.");
+        "The folder must not be there yet, or be empty; a server's database must hold no store. "
+        "The\n"
+        "address must have no \":\", since a job's arguments keep only what follows the last one.");
 
     addCommand<NoOptions>(
         program, invocation, "upgrade", "Bring a store of an older format up to date",

@@ -1,10 +1,10 @@
 #include <iostream>
 
-#include "store/Users.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/Rows.h"
+#include "store/Users.h"
 
 namespace admin {
 
@@ -30,12 +30,15 @@ void refuseKnown(store::StoreEngine& store, const UserOptions& options) {
 }
 
 void add(const Invocation& invocation, const UserOptions& options) {
-    const std::string name = userName(options.name);
+    const std::string name = newUserName(options.name);
     const auto store = invocation.open();
     refuseKnown(*store, options);
     const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
-    refuseKnown(*store, options); // A person may take minutes to type a password.
-    store->putUser({name, hash, false});
+    // A person may take minutes to type a password, and another one may be faster.
+    if (!store->addUser({name, hash, false})) {
+        refuseKnown(*store, options);
+        throw Failure(Status::Exists, "there was a user " + options.name);
+    }
 }
 
 void changePassword(const Invocation& invocation, const UserOptions& options) {
@@ -98,8 +101,10 @@ void addUserCommands(Command program, Invocation& invocation) {
     command("remove", "Remove a user", remove);
     addCommand<UserOptions>(group, invocation, "list", "List users", options,
                             [&](const UserOptions&) { list(invocation); });
-    group.footer("Names and passwords have 1 to 127 characters, none above U+00FF: a login brings "
-                 "one byte for each.");
+    group.footer(
+        "Names and passwords have 1 to 127 characters, none above U+00FF and no \":\": a login "
+        "brings one byte\nfor each, and a job's arguments keep only what follows the last "
+        "\":\".");
 }
 
 } // namespace admin

@@ -1,5 +1,6 @@
 // The administration tool of a store: users, tickets, files and jobs.
 #include <algorithm>
+#include <csignal>
 #include <cstdio>
 #include <exception>
 #include <filesystem>
@@ -105,6 +106,8 @@ int run(admin::Invocation& invocation) {
 } // namespace
 
 int main(int argumentCount, char** arguments) {
+    // A limit on the size of files is to be a failure like a full disk.
+    std::signal(SIGXFSZ, SIG_IGN);
     CLI::App program("Sets up and looks after a store: the tickets, users and files of a server.",
                      "tintgate-store");
     admin::Invocation invocation;

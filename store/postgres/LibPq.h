@@ -9,12 +9,12 @@ namespace store::postgres {
 
 // clang-format off
 #define TINTGATE_LIBPQ_FUNCTIONS(X)                                                               \
-    X(clear) X(cmdTuples) X(conninfo) X(conninfoFree) X(connectStartParams) X(connectdbParams)    \
-    X(consumeInput) X(enterPipelineMode) X(errorMessage) X(exitPipelineMode) X(finish) X(flush)   \
-    X(getResult) X(getisnull) X(getlength) X(getvalue) X(isBusy) X(ntuples) X(pipelineSync)       \
-    X(resultErrorField) X(resultErrorMessage) X(resultStatus) X(sendPrepare) X(sendQuery)         \
-    X(sendQueryPrepared) X(serverVersion) X(setNoticeProcessor) X(setnonblocking) X(socket)       \
-    X(status) X(transactionStatus)
+    X(backendPID) X(clear) X(cmdTuples) X(connectStartParams) X(connectdbParams) X(conninfo)      \
+    X(conninfoFree) X(consumeInput) X(enterPipelineMode) X(errorMessage) X(exitPipelineMode)      \
+    X(finish) X(flush) X(getResult) X(getisnull) X(getlength) X(getvalue) X(isBusy) X(ntuples)    \
+    X(pipelineSync) X(resultErrorField) X(resultErrorMessage) X(resultStatus) X(sendPrepare)      \
+    X(sendQuery) X(sendQueryParams) X(sendQueryPrepared) X(serverVersion) X(setNoticeProcessor)   \
+    X(setnonblocking) X(socket) X(status) X(transactionStatus)
 // clang-format on
 
 /// The functions that are used of it, without their PQ in front.

@@ -4,9 +4,13 @@
 #include <cerrno>
 #include <cstdlib>
 #include <new>
+#include <thread>
 #include <utility>
 
 #include <poll.h>
+#include <pwd.h>
+#include <sys/stat.h>
+#include <unistd.h>
 
 namespace store::postgres {
 
@@ -72,6 +76,24 @@ int said(const Settings& settings, const char* name) {
     return found == settings.end() ? 0 : std::max(std::atoi(found->second.c_str()), 0);
 }
 
+/// Where the library looks for passwords, or a name without a file: of a file that it dislikes it
+/// would complain on standard error, which is not ours to write to.
+template<class Settings>
+std::string passwordFile(const Settings& settings) {
+    std::string path;
+    if (const auto said = settings.find("passfile"); said != settings.end()) {
+        path = said->second;
+    } else if (const char* const home = std::getenv("HOME"); home != nullptr && *home != '\0') {
+        path = std::string(home) + "/.pgpass";
+    } else if (const passwd* const user = getpwuid(geteuid()); user != nullptr) {
+        path = std::string(user->pw_dir) + "/.pgpass";
+    }
+    struct stat status;
+    const bool liked = stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode) &&
+                       (status.st_mode & (S_IRWXG | S_IRWXO)) == 0;
+    return liked ? path : "/dev/null/none";
+}
+
 } // namespace
 
 std::int64_t numberOf(std::string_view bytes) {
@@ -96,14 +118,24 @@ int Result::changed() const {
 ArrayReader::ArrayReader(std::string_view value) : m_value(value) {
     constexpr std::size_t header = 20;
     if (value.size() >= header) {
-        m_left = static_cast<std::size_t>(numberOf(value.substr(12, 4)));
+        m_left = static_cast<std::size_t>(std::max<std::int64_t>(numberOf(value.substr(12, 4)), 0));
         m_value.remove_prefix(header);
     }
 }
 
+void failDamaged() {
+    throw StoreFailure(Fault::Damaged, "what the store's server sent can't be read");
+}
+
 std::string_view ArrayReader::next() {
+    constexpr std::size_t sizeBytes = 4;
+    const std::int64_t given = m_value.size() < sizeBytes ? -1 : numberOf(m_value.substr(0, 4));
+    if (m_left == 0 || given < 0 ||
+        static_cast<std::uint64_t>(given) > m_value.size() - sizeBytes) {
+        failDamaged();
+    }
     --m_left;
-    const auto size = static_cast<std::size_t>(numberOf(m_value.substr(0, 4)));
+    const auto size = static_cast<std::size_t>(given);
     const std::string_view element = m_value.substr(4, size);
     m_value.remove_prefix(4 + size);
     return element;
@@ -177,10 +209,11 @@ std::vector<int> Arguments::lengths() const {
 }
 
 /// What the service and the user's environment say. The service is read by the library alone, when
-/// it connects; so it is made to connect to where nothing can be.
+/// it connects. A host too many for its address ends that before anybody is asked for anything: no
+/// server, and no file with passwords.
 Connection::Settings Connection::settingsOf(const LibPq& pq, const std::string& service) {
-    const char* const names[] = {"service", "host", nullptr};
-    const char* const values[] = {service.c_str(), "/dev/null", nullptr};
+    const char* const names[] = {"service", "host", "hostaddr", nullptr};
+    const char* const values[] = {service.c_str(), "/dev/null,/dev/null", "127.0.0.1", nullptr};
     const Handle nowhere(pq.connectStartParams(names, values, 0), pq.finish);
     const std::unique_ptr<PQconninfoOption, void (*)(PQconninfoOption*)> options(
         pq.conninfo(nowhere.get()), pq.conninfoFree);
@@ -197,8 +230,9 @@ Connection::Settings Connection::settingsOf(const LibPq& pq, const std::string& 
 PGconn* Connection::connect(const LibPq& pq, const std::string& service, const Settings& said) {
     const std::string connectLimit = std::to_string(longestConnect.count());
     const std::string wayLimit = std::to_string(std::chrono::milliseconds(longestWay).count());
-    std::vector<const char*> names = {"service", "fallback_application_name"};
-    std::vector<const char*> values = {service.c_str(), "tintgate"};
+    const std::string passwords = passwordFile(said);
+    std::vector<const char*> names = {"service", "fallback_application_name", "passfile"};
+    std::vector<const char*> values = {service.c_str(), "tintgate", passwords.c_str()};
     const auto unlessSaid = [&](const char* name, const std::string& value) {
         if (postgres::said(said, name) == 0) {
             names.push_back(name);
@@ -207,13 +241,19 @@ PGconn* Connection::connect(const LibPq& pq, const std::string& service, const S
     };
     unlessSaid("connect_timeout", connectLimit);
     unlessSaid("tcp_user_timeout", wayLimit);
+    // So that no firewall forgets a connection that waits for a measurement.
+    unlessSaid("keepalives_idle", "60");
+    unlessSaid("keepalives_interval", "10");
+    unlessSaid("keepalives_count", "3");
     names.push_back(nullptr);
     values.push_back(nullptr);
     return pq.connectdbParams(names.data(), values.data(), 0);
 }
 
-Connection::Connection(const std::string& service)
-    : m_pq(&libPq()), m_connection(nullptr, m_pq->finish) {
+Connection::Connection(const std::string& service, std::chrono::milliseconds absence,
+                       std::function<void(Connection&)> check)
+    : m_pq(&libPq()), m_service(service), m_absenceLeft(absence), m_check(std::move(check)),
+      m_connection(nullptr, m_pq->finish) {
     const Settings said = settingsOf(*m_pq, service);
     m_connection.reset(connect(*m_pq, service, said));
     if (lost()) {
@@ -234,24 +274,109 @@ void Connection::settle(const Settings& said) {
         m_connection.get(), [](void*, const char*) {}, nullptr);
     m_pq->setnonblocking(m_connection.get(), 1);
     m_pq->enterPipelineMode(m_connection.get());
+    static constexpr Statement limit = {"SELECT setting::bigint, pg_backend_pid() FROM pg_settings"
+                                        " WHERE name = 'statement_timeout'"};
+    send(limit); // The settings go in front of it.
+    const auto results = finish();
+    const int way = postgres::said(said, "tcp_user_timeout");
+    m_longestSilence = std::chrono::milliseconds(results[0].number(0, 0)) +
+                       (way > 0 ? std::chrono::milliseconds(way) : longestWay);
+    // A pooler has a number of its own.
+    m_pooled = results[0].number(0, 1) != m_pq->backendPID(m_connection.get());
+}
+
+/// Of the transaction alone if the session may be another one's next.
+void Connection::sendSettings() {
     static const std::string settings =
-        "SELECT set_config(name, value, false) FROM (VALUES ('lock_timeout', '" +
+        "SELECT set_config(name, value, pg_backend_pid() <> $1) FROM (VALUES ('lock_timeout', '" +
         std::to_string(longestWaitMilliseconds) +
         "', true),"
         " ('jit', 'off', true)," // It takes longer than what it would make faster.
+        " ('idle_session_timeout', '0', true),"
         " ('statement_timeout', '" +
         std::to_string(longestStatement.count()) +
         "s', false), ('idle_in_transaction_session_timeout', '" +
         std::to_string(longestPause.count()) +
         "s', false)) AS setting (name, value, always)"
-        " WHERE always OR current_setting(name) = '0'";
-    static constexpr Statement limit = {
-        "SELECT setting::bigint FROM pg_settings WHERE name = 'statement_timeout'"};
-    send(Statement{settings.c_str()});
-    send(limit);
-    const int way = postgres::said(said, "tcp_user_timeout");
-    m_longestSilence = std::chrono::milliseconds(finish()[1].number(0, 0)) +
-                       (way > 0 ? std::chrono::milliseconds(way) : longestWay);
+        // Some servers do not know all of them.
+        " WHERE current_setting(name, true) = '0' OR"
+        " (always AND current_setting(name, true) IS NOT NULL)";
+    sendNow(settings.c_str(), "", Arguments(m_pq->backendPID(m_connection.get())));
+    m_sent.push_back({nullptr, true});
+}
+
+bool Connection::isThere() {
+    try {
+        repeating([] {});
+        return true;
+    } catch (const StoreFailure&) {
+        return false;
+    }
+}
+
+/// Notices a server that has closed the connection since the last call: nothing has been sent then.
+void Connection::dropIfClosed() {
+    if (lost()) {
+        return;
+    }
+    pollfd closed = {m_pq->socket(m_connection.get()), POLLRDHUP, 0};
+    if (poll(&closed, 1, 0) > 0 && closed.revents != 0) {
+        m_connection.reset();
+        m_sent.clear();
+    }
+}
+
+void Connection::connectAnew(Clock::time_point end) {
+    std::string why = "the connection to the server was lost";
+    for (auto pause = std::chrono::milliseconds(20); Clock::now() < end;
+         pause = std::min(2 * pause, std::chrono::milliseconds(1'000))) {
+        try {
+            Connection fresh(m_service, {});
+            if (m_check) {
+                m_check(fresh);
+            }
+            m_connection = std::move(fresh.m_connection);
+            m_prepared.clear();
+            m_sent.clear();
+            m_longestSilence = fresh.m_longestSilence;
+            m_pooled = fresh.m_pooled;
+            ++m_generation;
+            return;
+        } catch (const StoreFailure& failure) {
+            why = failure.what();
+            if (failure.fault == Fault::Newer || failure.fault == Fault::Older) {
+                break; // It is another store now.
+            }
+        }
+        std::this_thread::sleep_for(
+            std::min<Clock::duration>(pause, std::max(end - Clock::now(), Clock::duration())));
+    }
+    m_absenceLeft = {};
+    throw StoreFailure(Fault::Lost, why);
+}
+
+Connection::Call::~Call() {
+    m_connection.m_inCall = false;
+    if (m_lostSince) {
+        const auto left = m_connection.m_absenceLeft - (Clock::now() - *m_lostSince);
+        m_connection.m_absenceLeft =
+            std::max(std::chrono::duration_cast<std::chrono::milliseconds>(left),
+                     std::chrono::milliseconds());
+    }
+}
+
+void Connection::Call::noteLoss() {
+    if (!m_lostSince) {
+        m_lostSince = Clock::now();
+    }
+}
+
+void Connection::Call::attend() {
+    m_connection.dropIfClosed();
+    if (m_connection.lost()) {
+        noteLoss();
+        m_connection.connectAnew(*m_lostSince + m_connection.m_absenceLeft);
+    }
 }
 
 void Connection::beThere() const {
@@ -284,19 +409,43 @@ void Connection::checkSent(int done) {
     }
 }
 
+void Connection::sendNow(const char* text, const char* name, const Arguments& arguments) {
+    const std::vector<int> binary(static_cast<std::size_t>(arguments.count()), 1);
+    const auto values = arguments.values();
+    const auto lengths = arguments.lengths();
+    if (name[0] == '\0') {
+        checkSent(m_pq->sendQueryParams(m_connection.get(), text, arguments.count(), nullptr,
+                                        values.data(), lengths.data(), binary.data(), 1));
+    } else {
+        checkSent(m_pq->sendQueryPrepared(m_connection.get(), name, arguments.count(),
+                                          values.data(), lengths.data(), binary.data(), 1));
+    }
+}
+
 void Connection::sendArguments(const Statement& statement, const Arguments& arguments) {
     beThere();
+    if (m_pooled) {
+        const bool starts =
+            m_sent.empty() && m_pq->transactionStatus(m_connection.get()) == PQTRANS_IDLE;
+        const bool isBegin = statement.text == begin.text;
+        if (starts && !isBegin) {
+            sendSettings();
+        }
+        sendNow(statement.text, "", arguments);
+        m_sent.push_back({nullptr, false});
+        if (starts && isBegin) {
+            sendSettings();
+        }
+        return;
+    }
     const std::string name = std::to_string(reinterpret_cast<std::uintptr_t>(statement.text));
     if (m_prepared.count(statement.text) == 0) {
         checkSent(m_pq->sendPrepare(m_connection.get(), name.c_str(), statement.text, 0, nullptr));
         m_sent.push_back({statement.text, true});
         m_prepared.insert(statement.text);
     }
-    const std::vector<int> binary(static_cast<std::size_t>(arguments.count()), 1);
-    checkSent(m_pq->sendQueryPrepared(m_connection.get(), name.c_str(), arguments.count(),
-                                      arguments.values().data(), arguments.lengths().data(),
-                                      binary.data(), 1));
-    m_sent.push_back({statement.text, false});
+    sendNow(statement.text, name.c_str(), arguments);
+    m_sent.push_back({nullptr, false});
 }
 
 /// Until there is something to read.
@@ -349,12 +498,12 @@ std::vector<Result> Connection::finish() {
         Result result(*m_pq, nextResult());
         const ExecStatusType status = m_pq->resultStatus(result.get());
         if (status == PGRES_COMMAND_OK || status == PGRES_TUPLES_OK) {
-            if (!each.preparing) {
+            if (!each.isAside) {
                 results.push_back(std::move(result));
             }
         } else {
-            if (each.preparing) {
-                m_prepared.erase(each.text);
+            if (each.prepares != nullptr) {
+                m_prepared.erase(each.prepares);
             }
             if (!failed) {
                 failed = std::make_unique<Result>(std::move(result));

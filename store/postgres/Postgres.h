@@ -3,22 +3,24 @@
 // Statements are sent several at a time where one does not need what another gives, so that they
 // cost one round trip (libpq's pipeline mode). Arguments and results are in binary form.
 //
-// Each call ends: see the limits below. A connection that is lost stays lost, and whatever is asked
-// of it from then on fails at once.
+// Each call ends: see the limits below. A connection that was lost is made anew, for as long as a
+// session may be without its server; then it stays lost, and whatever is asked of it fails at once.
 #pragma once
 
 #include <chrono>
 #include <cstdint>
 #include <deque>
+#include <functional>
 #include <map>
 #include <memory>
+#include <optional>
 #include <set>
 #include <string>
 #include <string_view>
 #include <vector>
 
-#include "store/postgres/LibPq.h"
 #include "store/StoreEngine.h"
+#include "store/postgres/LibPq.h"
 
 namespace store::postgres {
 
@@ -35,6 +37,10 @@ inline constexpr std::chrono::seconds longestWay{10};
 /// For how long a client that has vanished in the middle of a change can keep others from changing
 /// the same ticket (idle_in_transaction_session_timeout).
 inline constexpr std::chrono::seconds longestPause{60};
+
+/// For how long a session may be without its server, all waits of its calls together. Then it is
+/// lost for good.
+inline constexpr std::chrono::milliseconds longestAbsence{30'000};
 
 /// A text with $1 and so on, which lives as long as the program. It is prepared when it is first
 /// sent, so that the server parses it once for a connection.
@@ -68,6 +74,9 @@ class Result {
     std::unique_ptr<PGresult, void (*)(PGresult*)> m_result;
 };
 
+/// Throws StoreFailure (Damaged): nothing of what comes from the server is trusted.
+[[noreturn]] void failDamaged();
+
 /// Elements of an array without holes, one after the other. The array outlives it.
 class ArrayReader {
   public:
@@ -75,6 +84,7 @@ class ArrayReader {
     explicit ArrayReader(std::string_view value);
 
     std::size_t left() const { return m_left; }
+    /// Throws StoreFailure (Damaged).
     std::string_view next();
 
   private:
@@ -116,11 +126,36 @@ class Arguments {
 class Connection {
   public:
     /// Connects by a libpq connection service. Throws StoreFailure: Missing for one that is not
-    /// known, can't be reached or refuses this user.
-    explicit Connection(const std::string& service);
+    /// known, can't be reached or refuses this user. Absence is how long it may be without its
+    /// server; check is called with each later connection before it is used, and may throw.
+    explicit Connection(const std::string& service,
+                        std::chrono::milliseconds absence = longestAbsence,
+                        std::function<void(Connection&)> check = {});
     Connection(Connection&&) = default;
 
     bool lost() const { return m_connection == nullptr; }
+    /// Whether the server is there, as far as can be told without asking it; a connection that was
+    /// lost is made anew. False once the session is lost for good.
+    bool isThere();
+    /// Counts the times that it was made anew. What was fetched before may be another server's.
+    unsigned generation() const { return m_generation; }
+    /// Whether a pooler is between this and the server, which may hand each transaction to another
+    /// of its sessions. Then nothing is prepared, and settings go with each transaction.
+    bool pooled() const { return m_pooled; }
+    /// From now on a loss is for good.
+    void stayWithThisServer() { m_absenceLeft = {}; }
+
+    /// Runs work, which may be done again, on a connection that is there: when the connection is
+    /// lost on the way, it is made anew and work starts from its beginning.
+    template<class Work>
+    auto repeating(Work work) {
+        return attending(true, work);
+    }
+    /// The same for work that must not be done twice: once it has begun, a loss is a failure.
+    template<class Work>
+    auto once(Work work) {
+        return attending(false, work);
+    }
 
     /// One statement, in the transaction that is open or in one of its own.
     template<class... Each>
@@ -147,12 +182,57 @@ class Connection {
     void rollBack() noexcept;
 
   private:
+    /// One call from outside, in which the time without the server is taken.
+    class Call {
+      public:
+        explicit Call(Connection& connection) : m_connection(connection) {
+            m_connection.m_inCall = true;
+        }
+        ~Call();
+        Call(const Call&) = delete;
+        Call& operator=(const Call&) = delete;
+
+        void noteLoss();
+        /// Makes sure that the connection is there. Throws StoreFailure (Lost).
+        void attend();
+
+      private:
+        Connection& m_connection;
+        std::optional<std::chrono::steady_clock::time_point> m_lostSince;
+    };
+
+    template<class Work>
+    auto attending(bool repeats, Work work) {
+        if (m_inCall) {
+            return work(); // Within a transaction, say, which ends with the connection.
+        }
+        Call call(*this);
+        for (;;) {
+            call.attend();
+            try {
+                return work();
+            } catch (const StoreFailure& failure) {
+                if (failure.fault != Fault::Lost) {
+                    throw;
+                }
+                call.noteLoss();
+                if (!repeats) {
+                    throw;
+                }
+            }
+        }
+    }
+
     using Handle = std::unique_ptr<PGconn, void (*)(PGconn*)>;
     using Settings = std::map<std::string, std::string>;
 
     static Settings settingsOf(const LibPq& pq, const std::string& service);
     static PGconn* connect(const LibPq& pq, const std::string& service, const Settings& said);
     void settle(const Settings& said);
+    void dropIfClosed();
+    void connectAnew(std::chrono::steady_clock::time_point end);
+    void sendSettings();
+    void sendNow(const char* text, const char* name, const Arguments& arguments);
     void sendArguments(const Statement& statement, const Arguments& arguments);
     void checkSent(int done);
     void beThere() const;
@@ -163,14 +243,20 @@ class Connection {
     [[noreturn]] void fail(const PGresult* result);
 
     const LibPq* m_pq;
+    std::string m_service;
+    std::chrono::milliseconds m_absenceLeft;
+    std::function<void(Connection&)> m_check;
     Handle m_connection;
+    unsigned m_generation = 0;
+    bool m_pooled = true; ///< Until it is known.
+    bool m_inCall = false;
     std::chrono::milliseconds m_longestSilence = longestStatement + longestWay;
     std::set<const char*> m_prepared;
-    /// Of what was sent since the last finish: whether each is a statement to prepare, whose result
-    /// nobody wants, and the text.
+    /// Of what was sent since the last finish: whether it is something whose result nobody wants,
+    /// and the text that it prepares, if it does.
     struct Sent {
-        const char* text;
-        bool preparing;
+        const char* prepares;
+        bool isAside;
     };
     std::vector<Sent> m_sent;
 };

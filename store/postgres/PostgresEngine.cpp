@@ -3,11 +3,13 @@
 // What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction: it locks
 // the ticket's row, fetches what it needs, writes, and commits. Where it needs nothing of what the
 // keys held, that is one round trip, else two.
+#include <algorithm>
 #include <ctime>
 #include <map>
 #include <utility>
 
 #include "store/Engines.h"
+#include "store/JobOverview.h"
 #include "store/KeyBytes.h"
 #include "store/postgres/Postgres.h"
 #include "store/postgres/PostgresFiles.h"
@@ -42,6 +44,24 @@ constexpr Statement raiseHighest = {
 constexpr Statement allHighest = {"SELECT type, id FROM tintgate.highest_ids WHERE id > 0"};
 constexpr Statement removeTicket = {"DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2"};
 
+// The overview of jobs: see JobOverview.h. A ticket's row is locked before its block is, and a
+// transaction touches one ticket only, so that nobody waits in a circle.
+constexpr Statement allBlocks = {"SELECT number, content FROM tintgate.job_blocks"};
+constexpr Statement addEntry = {
+    "INSERT INTO tintgate.job_blocks AS block (number, content) SELECT $3, $4"
+    " FROM tintgate.tickets WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid"
+    " ON CONFLICT (number) DO UPDATE SET content = overlay(block.content PLACING $5 FROM $6)"};
+constexpr Statement putEntry = {
+    "UPDATE tintgate.job_blocks SET content = overlay(content PLACING $4 FROM $5) WHERE number = $3"
+    " AND EXISTS (SELECT FROM tintgate.tickets WHERE type = $1 AND id = $2"
+    " AND tickets.xmin = pg_current_xact_id_if_assigned()::xid)"};
+constexpr Statement removeJob = {
+    "WITH gone AS (DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2 RETURNING id),"
+    " emptied AS (UPDATE tintgate.job_blocks"
+    " SET content = overlay(content PLACING $4 FROM $5) FROM gone WHERE job_blocks.number = $3)"
+    " SELECT count(*) FROM gone"};
+
 // The value only if it is another one than the caller has: one that this change of that ticket
 // wrote.
 constexpr Statement oneKey = {
@@ -51,6 +71,11 @@ constexpr Statement oneKey = {
 constexpr Statement allKeys = {
     "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number"
     " WHERE type = $1 AND id = $2"};
+constexpr Statement exactKeys = {
+    "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
+    " hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact))"
+    " WHERE type = $1 AND id = $2"};
+// Names have no index, as they may be of any length, so that a prefix costs a walk of the ticket.
 constexpr Statement someKeys = {
     "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
     " (hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact)) OR"
@@ -96,6 +121,8 @@ constexpr Statement oneUser = {"SELECT name, hash, disabled FROM tintgate.users 
 constexpr Statement putOneUser = {
     "INSERT INTO tintgate.users (name, hash, disabled) VALUES ($1, $2, $3)"
     " ON CONFLICT (name) DO UPDATE SET hash = excluded.hash, disabled = excluded.disabled"};
+constexpr Statement addOneUser = {
+    "INSERT INTO tintgate.users (name, hash, disabled) VALUES ($1, $2, $3) ON CONFLICT DO NOTHING"};
 constexpr Statement removeOneUser = {"DELETE FROM tintgate.users WHERE name = $1"};
 
 /// Held by the one who copies to the store. "TGAT" as a number.
@@ -132,12 +159,12 @@ class PostgresEngine : public StoreEngine {
   public:
     explicit PostgresEngine(Connection connection) : m_connection(std::move(connection)) {}
 
-    bool alive() override { return !m_connection.lost(); }
+    bool alive() override { return m_connection.isThere(); }
 
     std::uint64_t commits(std::chrono::milliseconds age) override {
         const auto now = CoarseClock::now();
         const bool asks = now - m_asked > age - CoarseClock::coarseness;
-        if (m_snapshot.empty() || (asks && m_connection.run(snapshot).bytes(0, 0) != m_snapshot)) {
+        if (m_snapshot.empty() || (asks && !isStillCurrent())) {
             noteChange();
         } else if (asks) {
             m_asked = now;
@@ -146,94 +173,259 @@ class PostgresEngine : public StoreEngine {
     }
 
     std::vector<int> ids(int type) override {
-        // Clients ask for their number, and then for the ids.
-        if (type == m_ids.type && m_connection.run(snapshot).bytes(0, 0) == m_ids.snapshot) {
-            return m_ids.ids;
-        }
-        // The snapshot first: what is committed between the two only has them fetched again.
-        m_connection.send(snapshot);
-        m_connection.send(idsOf, type);
-        const auto results = m_connection.finish();
-        std::vector<int> ids;
-        for (ArrayReader array(results[1].bytes(0, 0)); array.left() != 0;) {
-            ids.push_back(static_cast<int>(postgres::numberOf(array.next())));
-        }
-        m_ids = {type, results[0].text(0, 0), ids};
-        return ids;
+        return m_connection.repeating([&] {
+            forgetFormerServer();
+            // Clients ask for their number, and then for the ids.
+            if (type == m_ids.type && m_connection.run(snapshot).bytes(0, 0) == m_ids.snapshot) {
+                return m_ids.ids;
+            }
+            // The snapshot first: what is committed between the two only has them fetched again.
+            m_connection.send(snapshot);
+            m_connection.send(idsOf, type);
+            const auto results = m_connection.finish();
+            std::vector<int> ids;
+            for (ArrayReader array(results[1].bytes(0, 0)); array.left() != 0;) {
+                ids.push_back(static_cast<int>(postgres::numberOf(array.next())));
+            }
+            m_ids = {type, results[0].text(0, 0), ids};
+            return ids;
+        });
     }
 
     bool exists(int type, int id) override {
-        return m_connection.run(isThere, type, id).number(0, 0) != 0;
+        return m_connection.repeating(
+            [&] { return m_connection.run(isThere, type, id).number(0, 0) != 0; });
     }
 
     bool create(int type, int id) override {
-        if (exists(type, id)) {
-            return false; // Without waiting for others.
-        }
-        noteChange();
-        return m_connection.run(createTicket, type, id).changed() != 0;
+        return m_connection.once([&] {
+            if (exists(type, id)) {
+                return false; // Without waiting for others.
+            }
+            noteChange();
+            sendCreate(type, id);
+            return m_connection.finish()[0].changed() != 0;
+        });
     }
 
     int createNext(int type) override {
-        noteChange();
-        Transaction transaction(m_connection);
-        m_connection.send(raiseHighest, type, 0);
-        const auto results = transaction.finish();
-        int id = static_cast<int>(results[0].number(0, 0)) + 1;
-        if (id > highestTicketId) {
-            id = lowestFree(ids(type));
-        }
-        if (id > highestTicketId) {
-            return -1;
-        }
-        m_connection.send(createTicket, type, id);
-        return transaction.commit()[0].changed() != 0 ? id : -1;
+        return m_connection.once([&] {
+            noteChange();
+            Transaction transaction(m_connection);
+            m_connection.send(raiseHighest, type, 0);
+            const auto results = transaction.finish();
+            int id = static_cast<int>(results[0].number(0, 0)) + 1;
+            if (id > highestTicketId) {
+                id = lowestFree(ids(type));
+            }
+            if (id > highestTicketId) {
+                return -1;
+            }
+            sendCreate(type, id);
+            return transaction.commit()[0].changed() != 0 ? id : -1;
+        });
     }
 
     bool remove(int type, int id) override {
-        noteChange();
-        return m_connection.run(removeTicket, type, id).changed() != 0;
+        return m_connection.once([&] {
+            noteChange();
+            if (type == jobType) {
+                return m_connection
+                           .run(removeJob, type, id, blockOf(id), std::string(entryBytes, '\0'),
+                                position(entryOffset(id)))
+                           .number(0, 0) != 0;
+            }
+            return m_connection.run(removeTicket, type, id).changed() != 0;
+        });
     }
 
     std::shared_ptr<const Elements> key(int type, int id, std::string_view name) override {
-        const bool again = type == m_last.type && id == m_last.id && name == m_last.name;
-        const Result row =
-            m_connection.run(oneKey, type, id, name, std::int64_t{again ? m_last.ticket : 0},
-                             std::int64_t{again ? m_last.change : 0});
-        if (row.rows() == 0) {
-            m_last = {};
-            return nullptr;
-        }
-        if (!row.isNull(0, 2)) {
-            m_last = {};
-            auto elements = decoded(row.bytes(0, 2));
-            m_last = {type, id, std::string(name), row.number(0, 0), row.number(0, 1), elements};
-        }
-        return m_last.elements;
+        return m_connection.repeating([&]() -> std::shared_ptr<const Elements> {
+            forgetFormerServer();
+            const bool again = type == m_last.type && id == m_last.id && name == m_last.name;
+            const Result row =
+                m_connection.run(oneKey, type, id, name, std::int64_t{again ? m_last.ticket : 0},
+                                 std::int64_t{again ? m_last.change : 0});
+            if (row.rows() == 0) {
+                m_last = {};
+                return nullptr;
+            }
+            if (!row.isNull(0, 2)) {
+                m_last = {};
+                auto elements = decoded(row.bytes(0, 2));
+                m_last = {type,    id, std::string(name), row.number(0, 0), row.number(0, 1),
+                          elements};
+            }
+            return m_last.elements;
+        });
     }
 
     std::shared_ptr<const TicketContent> content(int type, int id,
                                                  const KeyFilter& filter) override {
-        const Names exact(filter.exact().begin(), filter.exact().end());
-        const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
-        const Result rows = filter.all() ? m_connection.run(allKeys, type, id)
-                                         : m_connection.run(someKeys, type, id, exact, prefixes);
-        return rows.rows() == 0 ? nullptr : std::make_shared<TicketContent>(contentOf(rows));
+        return m_connection.repeating([&]() -> std::shared_ptr<const TicketContent> {
+            const Names exact(filter.exact().begin(), filter.exact().end());
+            const Names prefixes(filter.prefixes().begin(), filter.prefixes().end());
+            const Result rows = filter.all() ? m_connection.run(allKeys, type, id)
+                                : prefixes.empty()
+                                    ? m_connection.run(exactKeys, type, id, exact)
+                                    : m_connection.run(someKeys, type, id, exact, prefixes);
+            if (rows.rows() == 0) {
+                return nullptr;
+            }
+            return std::make_shared<TicketContent>(contentOf(rows));
+        });
     }
 
     void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
                    const ShowKey& show) override {
-        // The snapshot first: what is committed between the two only has it all fetched again.
-        m_asked = CoarseClock::now();
-        m_connection.send(snapshot);
-        postgres::askForKeys(m_connection, type, names, largestBytes);
-        const auto results = m_connection.finish();
-        postgres::showKeys(results[1], names, show);
-        m_snapshot = results[0].text(0, 0);
+        m_connection.repeating([&] {
+            postgres::askForKeys(m_connection, type, names, largestBytes);
+            postgres::showKeys(m_connection.finish()[0], names, show);
+        });
+    }
+
+    void overview(JobOverview& jobs) override {
+        m_connection.repeating([&] {
+            forgetFormerServer();
+            // The snapshot first: what is committed between the two only has it all fetched again.
+            m_asked = CoarseClock::now();
+            m_connection.send(snapshot);
+            m_connection.send(allBlocks);
+            const auto results = m_connection.finish();
+            // Sorted here: with so many bytes the server would do it on its disk.
+            std::vector<std::pair<int, int>> blocks;
+            for (int row = 0; row < results[1].rows(); ++row) {
+                blocks.emplace_back(static_cast<int>(results[1].number(row, 0)), row);
+            }
+            std::sort(blocks.begin(), blocks.end());
+            jobs.clear();
+            for (const auto& [number, row] : blocks) {
+                jobs.add(number, results[1].bytes(row, 1));
+            }
+            m_snapshot = results[0].text(0, 0);
+        });
     }
 
     bool change(int type, int id, const Scope& scope,
                 const std::function<void(TicketContent&)>& work) override {
+        const auto once = [&] { return changeOnce(type, id, scope, work); };
+        return scope.repeatable ? m_connection.repeating(once) : m_connection.once(once);
+    }
+
+    std::vector<User> users() override {
+        return m_connection.repeating([&] {
+            const Result rows = m_connection.run(allUsers);
+            std::vector<User> users;
+            for (int row = 0; row < rows.rows(); ++row) {
+                users.push_back(userIn(rows, row));
+            }
+            return users;
+        });
+    }
+
+    std::optional<User> user(std::string_view name) override {
+        return m_connection.repeating([&] {
+            const Result rows = m_connection.run(oneUser, name);
+            return rows.rows() == 0 ? std::nullopt : std::optional(userIn(rows, 0));
+        });
+    }
+
+    void putUser(const User& user) override {
+        m_connection.repeating([&] {
+            noteChange();
+            m_connection.run(putOneUser, user.name, user.passwordHash, user.disabled);
+        });
+    }
+
+    bool addUser(const User& user) override {
+        return m_connection.once([&] {
+            noteChange();
+            return m_connection.run(addOneUser, user.name, user.passwordHash, user.disabled)
+                       .changed() != 0;
+        });
+    }
+
+    bool removeUser(std::string_view name) override {
+        return m_connection.once([&] {
+            noteChange();
+            return m_connection.run(removeOneUser, name).changed() != 0;
+        });
+    }
+
+    void putFile(std::string_view path, std::istream& from) override {
+        m_connection.once([&] {
+            noteChange();
+            m_files.put(path, from);
+        });
+    }
+    void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
+    std::vector<FileEntry> files() override {
+        return m_connection.repeating([&] { return m_files.list(); });
+    }
+    std::vector<FileVersion> versions(std::string_view path) override {
+        return m_connection.repeating([&] { return m_files.versions(path); });
+    }
+    void getVersion(std::string_view path, int number, std::ostream& to) override {
+        m_files.getVersion(path, number, to);
+    }
+    void restoreVersion(std::string_view path, int number) override {
+        m_connection.once([&] {
+            noteChange();
+            m_files.restoreVersion(path, number);
+        });
+    }
+    int pruneVersions(std::string_view path, int keepNewest) override {
+        return m_connection.once([&] {
+            noteChange();
+            return m_files.pruneVersions(path, keepNewest);
+        });
+    }
+    int removeLeftovers() override { return 0; } // The server undoes what is cut off.
+
+    std::map<int, int> highestIds() override {
+        return m_connection.repeating([&] {
+            const Result rows = m_connection.run(allHighest);
+            std::map<int, int> ids;
+            for (int row = 0; row < rows.rows(); ++row) {
+                ids.emplace(rows.number(row, 0), rows.number(row, 1));
+            }
+            return ids;
+        });
+    }
+    void raiseHighestId(int type, int id) override {
+        m_connection.repeating([&] { m_connection.run(raiseHighest, type, id); });
+    }
+    void placeVersion(std::string_view path, const FileVersion& version,
+                      std::istream& from) override {
+        m_connection.once([&] { m_files.placeVersion(path, version, from); });
+    }
+    void finishCopy() override {
+        m_connection.once([&] {
+            m_connection.run(writeThrough); // What it waits for has all before it in front.
+            postgres::finishCopy(m_connection);
+        });
+    }
+
+  private:
+    /// The key that was fetched last.
+    struct Fetched {
+        int type = -1;
+        int id = -1;
+        std::string name;
+        std::int64_t ticket = 0;
+        std::int64_t change = 0;
+        std::shared_ptr<const Elements> elements;
+    };
+
+    /// The ids that were asked for last.
+    struct Ids {
+        int type = -1;
+        std::string snapshot; ///< Of when they were fetched, or before.
+        std::vector<int> ids;
+    };
+
+    bool changeOnce(int type, int id, const Scope& scope,
+                    const std::function<void(TicketContent&)>& work) {
         noteChange();
         Transaction transaction(m_connection);
         m_connection.send(lockTicket, type, id);
@@ -265,91 +457,64 @@ class PostgresEngine : public StoreEngine {
         return locked[0].rows() != 0;
     }
 
-    std::vector<User> users() override {
-        const Result rows = m_connection.run(allUsers);
-        std::vector<User> users;
-        for (int row = 0; row < rows.rows(); ++row) {
-            users.push_back(userIn(rows, row));
+    /// Whether nobody has committed anything since the last overview.
+    bool isStillCurrent() {
+        return m_connection.repeating([&] {
+            forgetFormerServer();
+            return m_connection.run(snapshot).bytes(0, 0) == m_snapshot;
+        });
+    }
+
+    /// After a loss the server may be another one, in a state of its own.
+    void forgetFormerServer() {
+        if (m_connection.generation() != m_generation) {
+            m_generation = m_connection.generation();
+            m_last = {};
+            m_ids = {};
+            noteChange();
         }
-        return users;
     }
-
-    std::optional<User> user(std::string_view name) override {
-        const Result rows = m_connection.run(oneUser, name);
-        return rows.rows() == 0 ? std::nullopt : std::optional(userIn(rows, 0));
-    }
-
-    void putUser(const User& user) override {
-        noteChange();
-        m_connection.run(putOneUser, user.name, user.passwordHash, user.disabled);
-    }
-
-    bool removeUser(std::string_view name) override {
-        noteChange();
-        return m_connection.run(removeOneUser, name).changed() != 0;
-    }
-
-    void putFile(std::string_view path, std::istream& from) override {
-        noteChange();
-        m_files.put(path, from);
-    }
-    void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
-    std::vector<FileEntry> files() override { return m_files.list(); }
-    std::vector<FileVersion> versions(std::string_view path) override {
-        return m_files.versions(path);
-    }
-    void getVersion(std::string_view path, int number, std::ostream& to) override {
-        m_files.getVersion(path, number, to);
-    }
-    void restoreVersion(std::string_view path, int number) override {
-        noteChange();
-        m_files.restoreVersion(path, number);
-    }
-    int pruneVersions(std::string_view path, int keepNewest) override {
-        noteChange();
-        return m_files.pruneVersions(path, keepNewest);
-    }
-    int removeLeftovers() override { return 0; } // The server undoes what is cut off.
-
-    std::map<int, int> highestIds() override {
-        const Result rows = m_connection.run(allHighest);
-        std::map<int, int> ids;
-        for (int row = 0; row < rows.rows(); ++row) {
-            ids.emplace(rows.number(row, 0), rows.number(row, 1));
-        }
-        return ids;
-    }
-    void raiseHighestId(int type, int id) override { m_connection.run(raiseHighest, type, id); }
-    void placeVersion(std::string_view path, const FileVersion& version,
-                      std::istream& from) override {
-        m_files.placeVersion(path, version, from);
-    }
-    void finishCopy() override {
-        m_connection.run(writeThrough); // What it waits for has all before it in front.
-        postgres::finishCopy(m_connection);
-    }
-
-  private:
-    /// The key that was fetched last.
-    struct Fetched {
-        int type = -1;
-        int id = -1;
-        std::string name;
-        std::int64_t ticket = 0;
-        std::int64_t change = 0;
-        std::shared_ptr<const Elements> elements;
-    };
-
-    /// The ids that were asked for last.
-    struct Ids {
-        int type = -1;
-        std::string snapshot; ///< Of when they were fetched, or before.
-        std::vector<int> ids;
-    };
 
     void noteChange() {
         m_snapshot.clear();
         ++m_commits;
+    }
+
+    /// As the server counts bytes.
+    static int position(std::size_t offset) { return static_cast<int>(offset) + 1; }
+
+    /// Sends what makes a ticket. The first result tells whether there is a new one.
+    void sendCreate(int type, int id) {
+        m_connection.send(createTicket, type, id);
+        if (type == jobType) {
+            std::string block(blockBytes, '\0');
+            block[entryOffset(id)] = 1;
+            m_connection.send(addEntry, type, id, blockOf(id), block,
+                              block.substr(entryOffset(id), entryBytes), position(entryOffset(id)));
+        }
+    }
+
+    /// Sends what a change means for the overview.
+    void writeOverview(int id, const Scope& scope, const TicketContent& before,
+                       const TicketContent& after) {
+        std::string entry(1, '\1');
+        for (std::size_t i = 0; i < overviewKeys.size(); ++i) {
+            const auto elements = after.find(overviewKeys[i]);
+            const std::string slot = slotOf(elements.get());
+            entry += slot;
+            if (scope.everything) {
+                continue;
+            }
+            const auto touched = scope.keys.find(overviewKeys[i]);
+            if (touched != scope.keys.end() &&
+                !(touched->second && elements == before.find(overviewKeys[i]))) {
+                m_connection.send(putEntry, jobType, id, blockOf(id), slot,
+                                  position(slotOffset(id, i)));
+            }
+        }
+        if (scope.everything) {
+            m_connection.send(putEntry, jobType, id, blockOf(id), entry, position(entryOffset(id)));
+        }
     }
 
     /// Of rows of name and value. A ticket without keys may have one of nulls.
@@ -399,20 +564,24 @@ class PostgresEngine : public StoreEngine {
         } else if (!put.empty()) {
             m_connection.send(putKeys, type, id, put, Names(bytes.begin(), bytes.end()));
         }
+        if (type == jobType) {
+            writeOverview(id, scope, before, after);
+        }
         return scope.everything || !deleted.empty() || !put.empty();
     }
 
     Connection m_connection;
     postgres::Files m_files{m_connection};
     Fetched m_last;
+    unsigned m_generation = 0;
     std::uint64_t m_commits = 0;
-    std::string m_snapshot; ///< Of the last keysOfAll; empty once somebody has committed since.
+    std::string m_snapshot; ///< Of the last overview; empty once somebody has committed since.
     CoarseClock::time_point m_asked; ///< When that was still the server's.
     Ids m_ids;
 };
 
-std::unique_ptr<StoreEngine> openPostgres(const std::string& service) {
-    Connection connection(service);
+std::unique_ptr<StoreEngine> openPostgres(const std::string& service, Access) {
+    Connection connection(service, postgres::longestAbsence, postgres::checkSchema);
     postgres::checkSchema(connection);
     return std::make_unique<PostgresEngine>(std::move(connection));
 }
@@ -424,6 +593,10 @@ void makePostgres(const std::string& service, const std::string& serverName) {
 
 std::unique_ptr<StoreEngine> openPostgresCopy(const std::string& service) {
     Connection connection(service);
+    if (connection.pooled()) {
+        throw StoreFailure(Fault::Other, "a copy needs a session of the server for itself: name a "
+                                         "service that does not lead through a pooler");
+    }
     if (!postgres::isUnfinishedCopy(connection)) {
         postgres::makeSchema(connection, nullptr);
     }
@@ -431,6 +604,7 @@ std::unique_ptr<StoreEngine> openPostgresCopy(const std::string& service) {
         throw StoreFailure(Fault::Busy, "somebody else is copying to this store");
     }
     connection.run(writeLater);
+    connection.stayWithThisServer();
     return std::make_unique<PostgresEngine>(std::move(connection));
 }
 

@@ -34,9 +34,11 @@ constexpr Statement claimFile = {
     " VALUES ($1, $2, " TINTGATE_NOW ")"
     " ON CONFLICT (path) DO UPDATE SET path = excluded.path RETURNING file.content"};
 constexpr Statement keepVersion = {
-    "INSERT INTO tintgate.versions (path, number, content, written)"
-    " SELECT path, (SELECT coalesce(max(number), 0) + 1 FROM tintgate.versions WHERE path = $1),"
-    " content, written FROM tintgate.files WHERE path = $1"};
+    "WITH kept AS (UPDATE tintgate.files SET last_version = last_version + 1 WHERE path = $1"
+    " RETURNING path, last_version, content, written)"
+    " INSERT INTO tintgate.versions (path, number, content, written) SELECT * FROM kept"};
+constexpr Statement raiseLastVersion = {
+    "UPDATE tintgate.files SET last_version = greatest(last_version, $2) WHERE path = $1"};
 constexpr Statement exchange = {"UPDATE tintgate.files SET content = $2, written = " TINTGATE_NOW
                                 " WHERE path = $1"};
 constexpr Statement exchangeAsOf = {
@@ -160,7 +162,9 @@ void exchangeFile(Connection& connection, Transaction& transaction, const Place&
 
 /// Why there is nothing at a path.
 [[noreturn]] void failMissing(Connection& connection, const Place& place) {
-    if (connection.run(isFileAmong, place.folderViews).number(0, 0) != 0) {
+    const Result among =
+        connection.repeating([&] { return connection.run(isFileAmong, place.folderViews); });
+    if (among.number(0, 0) != 0) {
         place.refuse();
     }
     throw StoreFailure(Fault::NoFile, place.what() + ": there is no such file");
@@ -171,7 +175,7 @@ void exchangeFile(Connection& connection, Transaction& transaction, const Place&
 template<class... Each>
 bool copyOut(Connection& connection, const Place& place, std::ostream& to, const Statement& find,
              const Each&... each) {
-    const Result found = connection.run(find, each...);
+    const Result found = connection.repeating([&] { return connection.run(find, each...); });
     if (found.rows() == 0) {
         return false;
     }
@@ -187,7 +191,8 @@ bool copyOut(Connection& connection, const Place& place, std::ostream& to, const
     const std::int64_t content = found.number(0, 0);
     std::int64_t left = found.number(0, 1) - write(found.bytes(0, 2));
     for (int position = 1; left > 0; ++position) {
-        const Result next = connection.run(piece, content, position);
+        const Result next =
+            connection.repeating([&] { return connection.run(piece, content, position); });
         if (next.rows() == 0) {
             throw StoreFailure(Fault::NoFile, place.what() + " was pruned while it was read");
         }
@@ -280,6 +285,7 @@ void Files::placeVersion(std::string_view path, const FileVersion& version, std:
         const auto results = transaction.finish();
         replaced = results[0].rows() == 0 ? content : results[0].number(0, 0);
         m_connection.send(putVersion, place.path, version.number, content, version.time);
+        m_connection.send(raiseLastVersion, place.path, version.number);
     } else {
         m_connection.send(exchangeAsOf, place.path, content, version.time);
     }

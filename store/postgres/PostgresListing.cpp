@@ -55,6 +55,10 @@ std::vector<Ticket> ticketsIn(const Result& rows, int row) {
     std::string_view ids = rows.bytes(row, idsColumn);
     std::string_view numbers = rows.bytes(row, numbersColumn);
     std::vector<Ticket> tickets;
+    if (ids.size() % sizeof(int) != 0 || ids.size() / sizeof(int) != numbers.size() / 8 ||
+        numbers.size() % 8 != 0) {
+        failDamaged();
+    }
     while (!ids.empty()) {
         const int id = takeInt(ids);
         tickets.emplace_back(id, takeBigint(numbers));
@@ -116,12 +120,18 @@ void showKeys(const Result& rows, const std::vector<std::string>& names,
             continue;
         }
         const auto name = std::find(names.begin(), names.end(), rows.bytes(row, nameColumn));
+        if (name == names.end() || rows.bytes(row, numbersColumn).size() % 8 != 0) {
+            failDamaged();
+        }
         nameOf[i] = static_cast<std::size_t>(name - names.begin());
         if (!rows.isNull(row, valueColumn)) {
             elementsOf[i] = decoded(rows.bytes(row, valueColumn));
         }
         for (std::string_view numbers = rows.bytes(row, numbersColumn); !numbers.empty();) {
             keys.push_back({takeBigint(numbers), i});
+            if (keys.back().ticket < 0) {
+                failDamaged();
+            }
         }
     }
     sortByTicket(keys);

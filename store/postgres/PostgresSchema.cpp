@@ -68,6 +68,36 @@ constexpr const char* migrations[] = {
         PRIMARY KEY (path, number)
     );
     CREATE INDEX ON tintgate.versions (content))",
+    // 3: the overview of jobs, as JobOverview.h describes it; numbers of versions are used once
+    R"(
+    ALTER TABLE tintgate.files ADD last_version int NOT NULL DEFAULT 0;
+    UPDATE tintgate.files SET last_version = highest FROM
+        (SELECT path, max(number) AS highest FROM tintgate.versions GROUP BY path) AS known
+        WHERE files.path = known.path;
+    CREATE TABLE tintgate.job_blocks (
+        number  int PRIMARY KEY,
+        content bytea NOT NULL
+    ) WITH (fillfactor = 70);
+    INSERT INTO tintgate.job_blocks (number, content)
+    SELECT block, string_agg(coalesce(entry, '\x0000000000000000000000000000000000000000000000000000'),
+                             '' ORDER BY place)
+    FROM (SELECT DISTINCT id / 64 AS block FROM tintgate.tickets WHERE type = 3) AS blocks
+    CROSS JOIN generate_series(0, 63) AS place
+    LEFT JOIN (
+        SELECT id, '\x01'::bytea || string_agg(
+            CASE WHEN value IS NULL THEN '\x0000000000'
+                 -- one int, at position 0, as KeyBytes.h describes
+                 WHEN length(value) = 10 AND substring(value FOR 6) = '\x010201000000'
+                 THEN '\x02'::bytea || substring(value FROM 7)
+                 ELSE '\xff00000000' END, '' ORDER BY slot) AS entry
+        FROM tintgate.tickets
+        CROSS JOIN (VALUES (1, 'Input/SubType'::bytea), (2, 'Job/Display/Status'),
+                           (3, 'Remote/ShowInVerifier'), (4, 'Input/FileType'),
+                           (5, 'Workflow/Verify/Active')) AS slots (slot, slot_name)
+        LEFT JOIN tintgate.keys ON ticket = tickets.number AND hash = sha256(slot_name)
+        WHERE type = 3 GROUP BY id
+    ) AS entries ON id = block * 64 + place
+    GROUP BY block)",
 };
 constexpr int format = std::size(migrations);
 

@@ -308,6 +308,41 @@ int versionNumber(std::string_view name) {
     return whole && number > 0 ? number : 0;
 }
 
+/// An empty file of this name stays when versions up to the newest one are pruned: their numbers
+/// are not used again.
+constexpr std::string_view usedUpPrefix = ".tintgate-used-";
+
+/// The highest number that was ever pruned in a folder of versions, or 0.
+int lastUsedUp(const Descriptor& versions) {
+    int last = 0;
+    for (const auto& name : namesIn(versions)) {
+        int number = 0;
+        if (name.starts_with(usedUpPrefix)) {
+            std::from_chars(name.data() + usedUpPrefix.size(), name.data() + name.size(), number);
+        }
+        last = std::max(last, number);
+    }
+    return last;
+}
+
+/// Notes a number as used up, before its version is removed.
+void useUp(const Descriptor& versions, int number, const std::string& what) {
+    const int former = lastUsedUp(versions);
+    if (former >= number) {
+        return;
+    }
+    const auto nameOf = [](int used) { return std::string(usedUpPrefix) + std::to_string(used); };
+    const Descriptor mark(openat(versions.get(), nameOf(number).c_str(),
+                                 O_WRONLY | O_CREAT | O_NOFOLLOW | O_CLOEXEC, 0660));
+    if (!mark.valid()) {
+        fail(errno, what);
+    }
+    flush(versions, what);
+    if (former != 0) {
+        unlinkat(versions.get(), nameOf(former).c_str(), 0);
+    }
+}
+
 struct VersionFile {
     FileVersion version;
     ino_t inode = 0;
@@ -350,7 +385,8 @@ void keepVersion(const Descriptor& files, const Descriptor& folder, const Place&
     if (!kept.empty() && kept.back().inode == current.st_ino) {
         return;
     }
-    const int number = kept.empty() ? 1 : kept.back().version.number + 1;
+    const int last = kept.empty() ? 0 : kept.back().version.number;
+    const int number = std::max(last, lastUsedUp(versions)) + 1;
     if (linkat(folder.get(), place.name().c_str(), versions.get(), versionName(number).c_str(),
                0) != 0) {
         fail(errno, what);
@@ -502,6 +538,9 @@ int ServerFiles::pruneVersions(std::string_view path, int keepNewest) {
     }
     const Descriptor folder = walk(m_files, place.versions(), false, what);
     const auto keep = static_cast<std::size_t>(std::max(keepNewest, 0));
+    if (keep == 0) {
+        useUp(folder, list.back().number, what);
+    }
     for (std::size_t i = 0; i + keep < list.size(); ++i) {
         if (unlinkat(folder.get(), versionName(list[i].number).c_str(), 0) != 0) {
             fail(errno, what);

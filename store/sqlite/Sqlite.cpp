@@ -1,5 +1,6 @@
 #include "store/sqlite/Sqlite.h"
 
+#include <cctype>
 #include <new>
 
 namespace store::sqlite {
@@ -40,12 +41,33 @@ void fail(sqlite3* database, int code) {
                            (database == nullptr ? sqlite3_errstr(code) : sqlite3_errmsg(database)));
 }
 
-Database::Database(const std::string& path, bool create) {
+namespace {
+
+/// The name of a file with all that means something in a URI escaped.
+std::string uriOf(const std::string& path) {
+    constexpr const char* digits = "0123456789ABCDEF";
+    std::string uri = "file:";
+    for (const unsigned char byte : path) {
+        if (std::isalnum(byte) != 0 || byte == '/') {
+            uri += static_cast<char>(byte);
+        } else {
+            uri += {'%', digits[byte >> 4], digits[byte & 15]};
+        }
+    }
+    return uri;
+}
+
+} // namespace
+
+Database::Database(const std::string& path, Opening opening) {
     sqlite3* opened = nullptr;
-    const int code = sqlite3_open_v2(path.c_str(), &opened,
-                                     SQLITE_OPEN_READWRITE | SQLITE_OPEN_NOMUTEX |
-                                         SQLITE_OPEN_EXRESCODE | (create ? SQLITE_OPEN_CREATE : 0),
-                                     nullptr);
+    const bool unchanging = opening == Opening::Unchanging;
+    const std::string name = unchanging ? uriOf(path) + "?immutable=1" : path;
+    const int flags =
+        unchanging ? SQLITE_OPEN_READONLY | SQLITE_OPEN_URI
+                   : SQLITE_OPEN_READWRITE | (opening == Opening::New ? SQLITE_OPEN_CREATE : 0);
+    const int code = sqlite3_open_v2(name.c_str(), &opened,
+                                     flags | SQLITE_OPEN_NOMUTEX | SQLITE_OPEN_EXRESCODE, nullptr);
     m_database.reset(opened);
     if (code != SQLITE_OK) {
         fail(opened, code);
@@ -120,6 +142,10 @@ Transaction::~Transaction() {
     if (m_open) {
         sqlite3_exec(m_database.get(), "ROLLBACK", nullptr, nullptr, nullptr);
     }
+}
+
+ReadTransaction::~ReadTransaction() {
+    sqlite3_exec(m_database.get(), "COMMIT", nullptr, nullptr, nullptr);
 }
 
 void Transaction::commit() {

@@ -16,10 +16,16 @@ namespace store::sqlite {
 /// Throws the failure that a result code stands for. Database may be null.
 [[noreturn]] void fail(sqlite3* database, int code);
 
+enum class Opening {
+    Existing,
+    New,
+    /// A file that nobody can change: its log is not looked at, and nothing is made beside it.
+    Unchanging,
+};
+
 class Database {
   public:
-    /// An existing file, or with create a new one.
-    Database(const std::string& path, bool create);
+    Database(const std::string& path, Opening opening);
 
     sqlite3* get() const { return m_database.get(); }
     void run(const char* statements);
@@ -114,6 +120,18 @@ class Transaction {
   private:
     Database& m_database;
     bool m_open = true;
+};
+
+/// Statements that read, all of one moment.
+class ReadTransaction {
+  public:
+    explicit ReadTransaction(Database& database) : m_database(database) { m_database.run("BEGIN"); }
+    ~ReadTransaction();
+    ReadTransaction(const ReadTransaction&) = delete;
+    ReadTransaction& operator=(const ReadTransaction&) = delete;
+
+  private:
+    Database& m_database;
 };
 
 } // namespace store::sqlite

@@ -5,7 +5,8 @@
 //   files/          see ServerFiles.h
 //
 // Key names and values are blobs, which SQLite compares as bytes. A key is one row, its value as
-// KeyBytes.h tells. PRAGMA user_version is the format.
+// KeyBytes.h tells; what concerns all jobs is kept once more, as JobOverview.h describes. PRAGMA
+// user_version is the format.
 #include <algorithm>
 #include <cerrno>
 #include <climits>
@@ -18,8 +19,10 @@
 #include <fcntl.h>
 #include <sys/file.h>
 #include <sys/stat.h>
+#include <sys/statvfs.h>
 
 #include "store/Engines.h"
+#include "store/JobOverview.h"
 #include "store/KeyBytes.h"
 #include "store/sqlite/ServerFiles.h"
 #include "store/sqlite/Sqlite.h"
@@ -30,12 +33,22 @@ namespace store {
 namespace {
 
 using sqlite::Database;
+using sqlite::Opening;
+using sqlite::ReadTransaction;
 using sqlite::Statement;
 using sqlite::Transaction;
 
 constexpr std::int64_t applicationId = 0x54474154;    // "TGAT", as file(1) can show it.
 constexpr std::int64_t unfinishedCopyId = 0x54474143; // "TGAC"
-constexpr std::int64_t format = 1;
+/// 1: tickets, keys, users. 2: the overview of jobs.
+constexpr std::int64_t format = 2;
+
+constexpr const char* overviewTable = R"(
+    CREATE TABLE job_blocks (
+        number  INTEGER PRIMARY KEY,  -- as JobOverview.h describes
+        content BLOB NOT NULL
+    ) STRICT;
+)";
 
 constexpr const char* tables = R"(
     CREATE TABLE tickets (
@@ -76,6 +89,19 @@ std::string realPath(const std::string& address) {
     return path.get();
 }
 
+/// Whether a database is one of this kind. The first look into it, which opens its log.
+void checkKind(Database& database, const std::string& folder, std::int64_t kind) {
+    const std::int64_t found = database.number("PRAGMA application_id");
+    if (found != kind) {
+        throw StoreFailure(Fault::Missing,
+                           found == unfinishedCopyId
+                               ? folder + " is a copy of a store that was not finished"
+                               : databasePath(folder) + " is no database of a store");
+    }
+    // What is in the file is data, and never to be run.
+    database.run("PRAGMA trusted_schema = OFF");
+}
+
 /// The database in a store's folder, whatever its format, if it is of this kind.
 Database openDatabase(const std::string& folder, std::int64_t kind = applicationId) {
     const std::string path = databasePath(folder);
@@ -83,20 +109,59 @@ Database openDatabase(const std::string& folder, std::int64_t kind = application
     if (stat(path.c_str(), &status) != 0 || !S_ISREG(status.st_mode)) {
         throw StoreFailure(Fault::Missing, folder + " holds no store");
     }
-    Database database(path, false);
+    Database database(path, Opening::Existing);
     if (sqlite3_db_readonly(database.get(), "main") == 1) {
         throw StoreFailure(Fault::ReadOnly, path + " can't be written");
     }
-    const std::int64_t found = database.number("PRAGMA application_id");
-    if (found != kind) {
-        throw StoreFailure(Fault::Missing,
-                           found == unfinishedCopyId
-                               ? folder + " is a copy of a store that was not finished"
-                               : path + " is no database of a store");
-    }
-    // What is in the file is data, and never to be run.
-    database.run("PRAGMA trusted_schema = OFF");
+    checkKind(database, folder, kind);
     return database;
+}
+
+bool isMountedForReading(const std::string& folder) {
+    struct statvfs mount;
+    return statvfs(folder.c_str(), &mount) == 0 && (mount.f_flag & ST_RDONLY) != 0;
+}
+
+/// A store's database as it can be opened, and whether others may be in it meanwhile.
+struct OpenedDatabase {
+    Database database;
+    bool shared;
+};
+
+/// For reading, a database opens also without the shared index of its log, for which a full disk
+/// has no room, and which nobody can make where a folder is mounted for reading.
+OpenedDatabase openDatabase(const std::string& folder, Access access, std::int64_t kind) {
+    const std::string path = databasePath(folder);
+    try {
+        return {openDatabase(folder, kind), true};
+    } catch (const StoreFailure& failure) {
+        if (access != Access::Read) {
+            throw;
+        }
+        if (failure.fault == Fault::Full) {
+            Database database(path, Opening::Existing);
+            database.run("PRAGMA locking_mode = EXCLUSIVE"); // The index is then in memory.
+            checkKind(database, folder, kind);
+            return {std::move(database), false};
+        }
+        if (!isMountedForReading(folder)) {
+            throw;
+        }
+    }
+    struct stat log;
+    const bool hasLog = stat((path + "-wal").c_str(), &log) == 0 && log.st_size != 0;
+    Database database(path, hasLog ? Opening::Existing : Opening::Unchanging);
+    try {
+        checkKind(database, folder, kind);
+    } catch (const StoreFailure&) {
+        if (!hasLog) {
+            throw;
+        }
+        throw StoreFailure(Fault::ReadOnly,
+                           path + " was not closed, and can't be read without writing: copy the "
+                                  "folder to a disk that can be written");
+    }
+    return {std::move(database), false};
 }
 
 void checkFormat(Database& database) {
@@ -107,10 +172,22 @@ void setKind(Database& database, std::int64_t kind) {
     database.run(("PRAGMA application_id = " + std::to_string(kind)).c_str());
 }
 
+/// The first bytes behind all that start with a prefix; empty where nothing is behind them.
+std::string endOfPrefix(std::string prefix) {
+    while (!prefix.empty() && prefix.back() == '\xFF') {
+        prefix.pop_back();
+    }
+    if (!prefix.empty()) {
+        prefix.back() = static_cast<char>(static_cast<unsigned char>(prefix.back()) + 1);
+    }
+    return prefix;
+}
+
 class SqliteEngine : public StoreEngine {
   public:
-    explicit SqliteEngine(const std::string& folder, std::int64_t kind = applicationId)
-        : m_database(openDatabase(folder, kind)), m_ready(m_database), m_files(folder, false) {}
+    explicit SqliteEngine(const std::string& folder, Access access = Access::ReadAndWrite,
+                          std::int64_t kind = applicationId)
+        : SqliteEngine(openDatabase(folder, access, kind), folder) {}
 
     bool alive() override { return true; }
 
@@ -165,6 +242,9 @@ class SqliteEngine : public StoreEngine {
         Transaction transaction(m_database);
         m_remove.run(type, id).finish();
         const bool removed = sqlite3_changes(m_database.get()) != 0;
+        if (removed && type == jobType) {
+            writeEntry(id, {{entryOffset(id), std::string(entryBytes, '\0')}});
+        }
         transaction.commit();
         return removed;
     }
@@ -176,17 +256,35 @@ class SqliteEngine : public StoreEngine {
 
     std::shared_ptr<const TicketContent> content(int type, int id,
                                                  const KeyFilter& filter) override {
-        // One statement: SQLite sees one moment throughout. A ticket without keys gives one row.
+        // What is asked for must not cost the reading of all other keys. All of it is of one
+        // moment: a statement by itself, several within a transaction.
         auto content = std::make_shared<TicketContent>();
-        auto run = m_content.run(type, id);
-        bool found = false;
-        while (run.step()) {
-            found = true;
-            if (!run.isNull(0) && filter.takes(run.bytes(0))) {
-                content->put(run.text(0), decoded(run.bytes(1)));
-            }
+        if (filter.all()) {
+            return take(m_content.run(type, id), *content) ? content : nullptr;
         }
-        return found ? content : nullptr;
+        if (filter.exact().size() == 1 && filter.prefixes().empty()) {
+            return take(m_oneKey.run(type, id, *filter.exact().begin()), *content) ? content
+                                                                                   : nullptr;
+        }
+        const ReadTransaction transaction(m_database);
+        std::int64_t ticket = 0;
+        {
+            auto run = m_number.run(type, id);
+            if (!run.step()) {
+                return nullptr;
+            }
+            ticket = run.number(0);
+        }
+        for (const auto& name : filter.exact()) {
+            take(m_namedKey.run(ticket, name), *content);
+        }
+        for (const auto& prefix : filter.prefixes()) {
+            const std::string end = endOfPrefix(prefix);
+            take(end.empty() ? m_keysFrom.run(ticket, prefix)
+                             : m_keysBetween.run(ticket, prefix, end),
+                 *content);
+        }
+        return content;
     }
 
     void keysOfAll(int type, const std::vector<std::string>& names, std::size_t largestBytes,
@@ -206,6 +304,9 @@ class SqliteEngine : public StoreEngine {
         std::map<std::string, std::shared_ptr<const Elements>, std::less<>> known;
         while (run.step()) {
             const auto name = std::find(names.begin(), names.end(), run.bytes(1));
+            if (name == names.end()) { // Index and table disagree.
+                throw StoreFailure(Fault::Damaged, "the store's keys can't be read");
+            }
             std::shared_ptr<const Elements> elements;
             if (!run.isNull(2)) {
                 const std::string_view bytes = run.bytes(2);
@@ -217,6 +318,16 @@ class SqliteEngine : public StoreEngine {
             }
             show(static_cast<int>(run.number(0)), static_cast<std::size_t>(name - names.begin()),
                  std::move(elements));
+        }
+    }
+
+    void overview(JobOverview& jobs) override {
+        jobs.clear();
+        auto run = m_blocks.run();
+        while (run.step()) {
+            // Any other number is refused as damage.
+            jobs.add(static_cast<int>(std::clamp<std::int64_t>(run.number(0), -1, INT_MAX)),
+                     run.bytes(1));
         }
     }
 
@@ -244,6 +355,9 @@ class SqliteEngine : public StoreEngine {
         const TicketContent before = content; // Shares the elements: a change makes others.
         work(content);
         if (write(ticket, scope, before, content)) {
+            if (type == jobType) {
+                writeOverview(id, scope, content);
+            }
             transaction.commit();
         }
         return true;
@@ -270,6 +384,14 @@ class SqliteEngine : public StoreEngine {
         Transaction transaction(m_database);
         m_putUser.run(user.name, user.passwordHash, user.disabled ? 1 : 0).finish();
         transaction.commit();
+    }
+
+    bool addUser(const User& user) override {
+        Transaction transaction(m_database);
+        m_addUser.run(user.name, user.passwordHash, user.disabled ? 1 : 0).finish();
+        const bool added = sqlite3_changes(m_database.get()) != 0;
+        transaction.commit();
+        return added;
     }
 
     bool removeUser(std::string_view name) override {
@@ -322,6 +444,10 @@ class SqliteEngine : public StoreEngine {
     ServerFiles& serverFiles() { return m_files; }
 
   private:
+    SqliteEngine(OpenedDatabase opened, const std::string& folder)
+        : m_database(std::move(opened.database)), m_ready(m_database), m_files(folder, false),
+          m_watch(m_database, opened.shared) {}
+
     /// Settles the connection before a statement is prepared.
     struct Ready {
         explicit Ready(Database& database) {
@@ -330,13 +456,68 @@ class SqliteEngine : public StoreEngine {
         }
     };
 
+    /// Puts rows of name and value in a content. A ticket without keys may give one of nulls. False
+    /// for no rows.
+    static bool take(Statement::Run run, TicketContent& content) {
+        bool found = false;
+        while (run.step()) {
+            found = true;
+            if (!run.isNull(0)) {
+                content.put(run.text(0), decoded(run.bytes(1)));
+            }
+        }
+        return found;
+    }
+
     bool insert(int type, int id) {
         m_insert.run(type, id).finish();
         if (sqlite3_changes(m_database.get()) == 0) {
             return false;
         }
         m_raiseHighest.run(type, id).finish();
+        if (type == jobType) {
+            writeEntry(id, {{entryOffset(id), std::string(1, '\1')}});
+        }
         return true;
+    }
+
+    /// Bytes by where in a block they go.
+    using Places = std::vector<std::pair<std::size_t, std::string>>;
+
+    /// Writes parts of a job's entry in the overview.
+    void writeEntry(int id, const Places& places) {
+        std::string block(blockBytes, '\0');
+        {
+            auto run = m_block.run(blockOf(id));
+            if (run.step()) {
+                block = run.text(0);
+            }
+        }
+        if (block.size() != blockBytes) {
+            throw StoreFailure(Fault::Damaged, "the store's overview of jobs can't be read");
+        }
+        bool differs = false;
+        for (const auto& [offset, bytes] : places) {
+            differs = differs || block.compare(offset, bytes.size(), bytes) != 0;
+            block.replace(offset, bytes.size(), bytes);
+        }
+        if (differs) {
+            m_putBlock.run(blockOf(id), block).finish();
+        }
+    }
+
+    /// After a change, what concerns the overview.
+    void writeOverview(int id, const Scope& scope, const TicketContent& after) {
+        Places places;
+        for (std::size_t key = 0; key < overviewKeys.size(); ++key) {
+            if (scope.everything || scope.keys.contains(overviewKeys[key])) {
+                places.emplace_back(slotOffset(id, key),
+                                    slotOf(after.find(overviewKeys[key]).get()));
+            }
+        }
+        if (!places.empty()) {
+            writeEntry(id, places);
+        }
     }
 
     /// False when there was nothing to write.
@@ -373,7 +554,7 @@ class SqliteEngine : public StoreEngine {
     Database m_database;
     Ready m_ready;
     ServerFiles m_files;
-    WalWatch m_watch{m_database};
+    WalWatch m_watch;
 
     Statement m_ids{m_database, "SELECT id FROM tickets WHERE type = ? ORDER BY id"};
     Statement m_number{m_database, "SELECT number FROM tickets WHERE type = ? AND id = ?"};
@@ -391,7 +572,18 @@ class SqliteEngine : public StoreEngine {
     Statement m_content{m_database, "SELECT k.name, k.value FROM tickets t"
                                     " LEFT JOIN keys k ON k.ticket = t.number"
                                     " WHERE t.type = ? AND t.id = ? ORDER BY k.name"};
+    Statement m_oneKey{m_database, "SELECT k.name, k.value FROM tickets t"
+                                   " LEFT JOIN keys k ON k.ticket = t.number AND k.name = ?3"
+                                   " WHERE t.type = ?1 AND t.id = ?2"};
+    Statement m_namedKey{m_database, "SELECT name, value FROM keys WHERE ticket = ? AND name = ?"};
+    Statement m_keysFrom{m_database, "SELECT name, value FROM keys WHERE ticket = ? AND name >= ?"};
+    Statement m_keysBetween{m_database, "SELECT name, value FROM keys"
+                                        " WHERE ticket = ? AND name >= ? AND name < ?"};
     Statement m_keyOf{m_database, "SELECT value FROM keys WHERE ticket = ? AND name = ?"};
+    Statement m_blocks{m_database, "SELECT number, content FROM job_blocks ORDER BY number"};
+    Statement m_block{m_database, "SELECT content FROM job_blocks WHERE number = ?"};
+    Statement m_putBlock{m_database,
+                         "INSERT OR REPLACE INTO job_blocks (number, content) VALUES (?, ?)"};
     Statement m_put{m_database, "INSERT INTO keys (ticket, name, value) VALUES (?, ?, ?)"
                                 " ON CONFLICT (ticket, name) DO UPDATE SET value = excluded.value"};
     Statement m_delete{m_database, "DELETE FROM keys WHERE ticket = ? AND name = ?"};
@@ -400,6 +592,8 @@ class SqliteEngine : public StoreEngine {
     Statement m_user{m_database, "SELECT name, hash, disabled FROM users WHERE name = ?"};
     Statement m_putUser{m_database,
                         "INSERT OR REPLACE INTO users (name, hash, disabled) VALUES (?, ?, ?)"};
+    Statement m_addUser{m_database,
+                        "INSERT OR IGNORE INTO users (name, hash, disabled) VALUES (?, ?, ?)"};
     Statement m_removeUser{m_database, "DELETE FROM users WHERE name = ?"};
 };
 
@@ -449,7 +643,7 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
     makeFolder(address);
     const std::string folder = realPath(address);
     const ServerFiles files(folder, true);
-    Database database(databasePath(folder), true);
+    Database database(databasePath(folder), Opening::New);
     // Log and index take the database's permissions. Password hashes are nobody else's.
     const mode_t mask = umask(0);
     umask(mask);
@@ -460,6 +654,7 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
         throw StoreFailure(Fault::Exists, folder + " holds a store");
     }
     database.run(tables);
+    database.run(overviewTable);
     if (serverName != nullptr) {
         makeSystemTicket(database, *serverName);
     }
@@ -469,8 +664,8 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
     transaction.commit();
 }
 
-std::unique_ptr<StoreEngine> openSqlite(const std::string& address) {
-    return std::make_unique<SqliteEngine>(realPath(address));
+std::unique_ptr<StoreEngine> openSqlite(const std::string& address, Access access) {
+    return std::make_unique<SqliteEngine>(realPath(address), access);
 }
 
 void makeSqliteStore(const std::string& address, const std::string& serverName) {
@@ -482,7 +677,7 @@ void makeSqliteStore(const std::string& address, const std::string& serverName) 
 class SqliteCopy : public SqliteEngine {
   public:
     explicit SqliteCopy(const std::string& folder)
-        : SqliteEngine(folder, unfinishedCopyId),
+        : SqliteEngine(folder, Access::ReadAndWrite, unfinishedCopyId),
           m_folder(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC)) {
         if (flock(m_folder.get(), LOCK_EX | LOCK_NB) != 0) {
             throw StoreFailure(Fault::Busy, "somebody else is copying to " + folder);
@@ -512,14 +707,65 @@ std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
     return std::make_unique<SqliteCopy>(realPath(address));
 }
 
+/// Makes the overview of the jobs that are there.
+void fillOverview(Database& database) {
+    Statement jobs(database, "SELECT id, number FROM tickets WHERE type = ? ORDER BY id");
+    Statement key(database, "SELECT value FROM keys WHERE ticket = ? AND name = ?");
+    Statement put(database, "INSERT INTO job_blocks (number, content) VALUES (?, ?)");
+    // As anything that is no single number: readers then look at the key itself.
+    const Elements empty;
+    const std::string unreadable = slotOf(&empty);
+    int number = -1;
+    std::string block;
+    const auto finishBlock = [&] {
+        if (number >= 0) {
+            put.run(number, block).finish();
+        }
+    };
+    auto run = jobs.run(jobType);
+    while (run.step()) {
+        const int id = static_cast<int>(run.number(0));
+        if (blockOf(id) != number) {
+            finishBlock();
+            number = blockOf(id);
+            block.assign(blockBytes, '\0');
+        }
+        block[entryOffset(id)] = 1;
+        for (std::size_t i = 0; i < overviewKeys.size(); ++i) {
+            auto value = key.run(run.number(1), overviewKeys[i]);
+            if (value.step()) {
+                // A damaged key is left to those who read it.
+                const auto elements = elementsFromBytes(value.bytes(0));
+                block.replace(slotOffset(id, i), slotBytes,
+                              elements == nullptr ? unreadable : slotOf(elements.get()));
+            }
+        }
+    }
+    finishBlock();
+}
+
 bool upgradeSqlite(const std::string& address) {
     Database database = openDatabase(realPath(address));
     if (database.number("PRAGMA user_version") >= format) {
         checkFormat(database);
         return false;
     }
-    // Format 1 is the first that was ever given out: a step for each later one goes here.
-    throw StoreFailure(Fault::Damaged, "no way is known from this format to the present one");
+    database.run("PRAGMA synchronous = FULL");
+    Transaction transaction(database);
+    // Of two upgrades at once, the second finds nothing to do. Format 1 is the first that was ever
+    // given out: a step for each later one goes here.
+    const std::int64_t found = database.number("PRAGMA user_version");
+    if (found >= format) {
+        return false;
+    }
+    if (found != 1) {
+        throw StoreFailure(Fault::Damaged, "no way is known from this format to the present one");
+    }
+    database.run(overviewTable);
+    fillOverview(database);
+    database.run(("PRAGMA user_version = " + std::to_string(format)).c_str());
+    transaction.commit();
+    return true;
 }
 
 } // namespace

@@ -27,8 +27,8 @@ const volatile std::uint32_t* sharedHeader(sqlite3* database) {
 
 } // namespace
 
-WalWatch::WalWatch(sqlite::Database& database)
-    : m_shared(sharedHeader(database.get())), m_database(database) {
+WalWatch::WalWatch(sqlite::Database& database, bool shared)
+    : m_shared(shared ? sharedHeader(database.get()) : nullptr), m_database(database) {
     if (m_shared == nullptr) {
         m_pragma.emplace(database, "PRAGMA data_version");
     }

@@ -18,7 +18,8 @@ namespace store {
 /// The connection outlives this object, has read from the database, and stays in WAL mode.
 class WalWatch {
   public:
-    explicit WalWatch(sqlite::Database& database);
+    /// Of a connection that has no shared index, the pragma is asked.
+    WalWatch(sqlite::Database& database, bool shared);
 
     /// Differs from the last one after any commit.
     std::uint64_t commits();

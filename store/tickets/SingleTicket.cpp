@@ -40,8 +40,8 @@ int getMultiParameter(void* handle, GETMULTIPAR* table) {
 
 int walk(void* handle, SCollect callback, void* context, const char*, int) {
     return on(handle, [&](Ticket& ticket) {
-        const auto content = ticket.content(KeyFilter());
-        if (content == nullptr || callback == nullptr) {
+        const auto content = callback == nullptr ? nullptr : ticket.shown();
+        if (content == nullptr) {
             return false;
         }
         content->walk(callback, context);

@@ -17,9 +17,12 @@ class Ticket {
     /// One element, as readElement tells.
     virtual bool get(const char* key, PARAM_TYPE type, void* out, int position) = 0;
 
-    /// The keys that the filter takes; null when the ticket is not there. The whole content stays
-    /// good until the ticket changes, longer for who holds it.
+    /// The keys that the filter takes, for a transfer; null when the ticket is not there.
     virtual std::shared_ptr<const TicketContent> content(const KeyFilter& filter) = 0;
+
+    /// The whole ticket, for a walk; null when it is not there. Its keys and values stay at their
+    /// addresses until the ticket changes through this object, however often it is walked.
+    virtual std::shared_ptr<const TicketContent> shown() = 0;
 
     /// As TicketContent::apply tells. False, and no result is set, when the ticket is not there.
     virtual bool apply(SETMULTIPAR* table) = 0;

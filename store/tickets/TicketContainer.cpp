@@ -161,6 +161,10 @@ class TicketContainer::OpenedTicket : public Ticket {
         return m_container.content(m_type, m_id, filter);
     }
 
+    std::shared_ptr<const TicketContent> shown() override {
+        return m_container.shown(m_type, m_id);
+    }
+
     bool apply(SETMULTIPAR* table) override { return m_container.apply(m_type, m_id, table); }
 
     bool transfer(const TicketContent& source, bool replace) override {
@@ -227,12 +231,27 @@ int TicketContainer::createNext(int type) {
     return TICKET_TYPE_Valid(type) ? m_keep->createNext(type) : -1;
 }
 
-bool TicketContainer::remove(int type, int id) {
-    if (!TICKET_Valid(type, id) || !m_keep->remove(type, id)) {
+/// Without a change, what walks showed stays. It goes last, since a table may point into it.
+template<class Change>
+bool TicketContainer::change(int type, int id, Change change) {
+    if (!TICKET_Valid(type, id)) {
         return false;
     }
     dropSnapshot();
-    m_shown.erase({type, id});
+    bool changed = true;
+    if (!change(changed)) {
+        return false;
+    }
+    if (changed) {
+        m_shown.erase({type, id});
+    }
+    return true;
+}
+
+bool TicketContainer::remove(int type, int id) {
+    if (!change(type, id, [&](bool&) { return m_keep->remove(type, id); })) {
+        return false;
+    }
     m_partial.erase({type, id});
     return true;
 }
@@ -282,33 +301,35 @@ bool TicketContainer::fetchAndGet(int type, int id, const char* key, PARAM_TYPE 
 
 std::shared_ptr<const TicketContent> TicketContainer::content(int type, int id,
                                                               const KeyFilter& filter) {
-    if (!TICKET_Valid(type, id)) {
+    return TICKET_Valid(type, id) ? m_keep->content(type, id, filter) : nullptr;
+}
+
+std::shared_ptr<const TicketContent> TicketContainer::shown(int type, int id) {
+    auto content = this->content(type, id, KeyFilter());
+    if (content == nullptr) {
         return nullptr;
     }
-    auto content = m_keep->content(type, id, filter);
-    if (content != nullptr && filter.all()) {
-        m_shown[{type, id}] = content;
+    auto& shown = m_shown[{type, id}];
+    if (shown.empty() || !shown.back()->equals(*content)) {
+        shown.push_back(std::move(content));
     }
-    return content;
+    return shown.back();
 }
 
 bool TicketContainer::apply(int type, int id, SETMULTIPAR* table) {
-    if (!TICKET_Valid(type, id)) {
-        return false;
-    }
-    dropSnapshot();
-    // The table may point into what a walk showed, so that goes last.
-    const auto shown = m_shown.extract({type, id});
-    return m_keep->apply(type, id, table);
+    return change(type, id, [&](bool& changed) {
+        const bool taken = m_keep->apply(type, id, table);
+        const auto* record = table;
+        while (record != nullptr && record->key != nullptr && !record->ok()) {
+            ++record;
+        }
+        changed = record != nullptr && record->key != nullptr;
+        return taken;
+    });
 }
 
 bool TicketContainer::transfer(int type, int id, const TicketContent& source, bool replace) {
-    if (!TICKET_Valid(type, id)) {
-        return false;
-    }
-    dropSnapshot();
-    m_shown.erase({type, id});
-    return m_keep->transfer(type, id, source, replace);
+    return change(type, id, [&](bool&) { return m_keep->transfer(type, id, source, replace); });
 }
 
 bool TicketContainer::setPartial(int type, int id, const char* const* keys) {

@@ -43,6 +43,7 @@ class TicketContainer {
     // As the functions of Ticket.
     bool get(int type, int id, const char* key, PARAM_TYPE ptype, void* out, int position);
     std::shared_ptr<const TicketContent> content(int type, int id, const KeyFilter& filter);
+    std::shared_ptr<const TicketContent> shown(int type, int id);
     bool apply(int type, int id, SETMULTIPAR* table);
     bool transfer(int type, int id, const TicketContent& source, bool replace);
 
@@ -78,7 +79,11 @@ class TicketContainer {
         std::shared_ptr<const Elements> elements;
     };
 
+    using Shown = std::vector<std::shared_ptr<const TicketContent>>;
+
     void dropSnapshot();
+    template<class Change>
+    bool change(int type, int id, Change change);
     bool fetchAndGet(int type, int id, const char* key, PARAM_TYPE ptype, void* out, int position);
 
     const std::shared_ptr<TicketKeep> m_keep;
@@ -86,8 +91,9 @@ class TicketContainer {
     HandedOut m_handedOut;
     Snapshot m_snapshot;
     std::map<Address, std::unique_ptr<TicketRecord>> m_opened;
-    /// The contents that walks showed, until their tickets change.
-    std::map<Address, std::shared_ptr<const TicketContent>> m_shown;
+    /// The different contents that walks showed, until their tickets change by this session. There
+    /// is more than one of a ticket only if others changed it between two walks.
+    std::map<Address, Shown> m_shown;
     std::map<Address, std::vector<std::string>> m_partial;
     std::map<std::tuple<int, int, int>, std::vector<std::string>> m_notifications;
 };

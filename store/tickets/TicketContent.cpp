@@ -162,6 +162,15 @@ void TicketContent::apply(SETMULTIPAR* table) {
     }
 }
 
+bool TicketContent::equals(const TicketContent& other) const {
+    return m_keys.size() == other.m_keys.size() &&
+           std::equal(m_keys.begin(), m_keys.end(), other.m_keys.begin(),
+                      [](const auto& a, const auto& b) {
+                          return a.first == b.first &&
+                                 (a.second == b.second || a.second->equals(*b.second));
+                      });
+}
+
 TicketContent TicketContent::select(const KeyFilter& filter) const {
     if (filter.all()) {
         return *this;

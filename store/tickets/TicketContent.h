@@ -43,6 +43,9 @@ class TicketContent {
     /// Null for a key that isn't there.
     std::shared_ptr<const Elements> find(std::string_view key) const;
 
+    /// The same keys with the same elements, bit by bit.
+    bool equals(const TicketContent& other) const;
+
     /// Puts a key as it is in another place of keeping.
     void put(std::string key, std::shared_ptr<Elements> elements);
 

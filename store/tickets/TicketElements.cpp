@@ -62,6 +62,24 @@ bool readValue(const Elements& key, PARAM_TYPE type, void* out, int position,
     return true;
 }
 
+/// Numbers are compared as they lie in memory: a NaN equals itself, and 0.0 does not equal -0.0.
+bool sameBits(const Value& a, const Value& b) {
+    return a.index() == b.index() &&
+           std::visit(
+               [&](const auto& value) {
+                   using T = std::decay_t<decltype(value)>;
+                   const T& there = *std::get_if<T>(&b);
+                   if constexpr (std::is_same_v<T, Text> || std::is_same_v<T, Binary>) {
+                       return value.bytes->text == there.bytes->text;
+                   } else if constexpr (std::is_empty_v<T>) {
+                       return true;
+                   } else {
+                       return std::memcmp(&value, &there, sizeof value) == 0;
+                   }
+               },
+               a);
+}
+
 bool removeElement(std::shared_ptr<Elements>& key, int position) {
     if (position == POSITION_WHOLE) {
         key.reset();
@@ -121,6 +139,22 @@ const Value* Elements::at(int position) const {
     }
     const auto found = m_far.find(position);
     return found == m_far.end() ? nullptr : &found->second;
+}
+
+bool Elements::equals(const Elements& other) const {
+    if (m_filled != other.m_filled || count() != other.count()) {
+        return false;
+    }
+    if (m_numberType != PARAM_DELETE && m_numberType == other.m_numberType) {
+        return m_numbers == other.m_numbers;
+    }
+    bool same = true;
+    visit([&](int position, const Value& value) {
+        const Value* const there = other.at(position);
+        same = there != nullptr && sameBits(value, *there);
+        return same;
+    });
+    return same;
 }
 
 const Value* Elements::first() const {

@@ -34,6 +34,9 @@ class Elements {
     PARAM_TYPE numberType() const { return m_numberType; }
     const std::string& numbers() const { return m_numbers; }
 
+    /// The same elements in the same places, bit by bit.
+    bool equals(const Elements& other) const;
+
     /// Null for a hole and beyond the end.
     const Value* at(int position) const;
     /// The element of the lowest position; null when there is none.

@@ -27,6 +27,9 @@ class WorkTicket : public Ticket {
         return std::make_shared<TicketContent>(m_content->select(filter));
     }
 
+    /// A change of the ticket leaves it as it is while somebody holds it: see own().
+    std::shared_ptr<const TicketContent> shown() override { return m_content; }
+
     bool apply(SETMULTIPAR* table) override {
         own(m_content).apply(table);
         return true;

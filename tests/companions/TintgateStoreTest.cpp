@@ -1,6 +1,7 @@
 // The administration tool as its callers see it, and what it then left in the store.
 
 #include <bit>
+#include <filesystem>
 #include <limits>
 #include <numeric>
 #include <random>
@@ -151,7 +152,8 @@ TEST_F(TintgateStore, UsersLogInAsTheySay) {
     EXPECT_EQ(add("anna", longest), 0);
     EXPECT_EQ(add("anna", "other"), 2);
     EXPECT_EQ(login("anna", std::string(127, '\xff')), store::LoginAnswer::Welcome);
-    for (const std::string& refused : {std::string("\xc4\x80"), std::string(128, 'a')}) {
+    for (const std::string& refused :
+         {std::string("\xc4\x80"), std::string(128, 'a'), std::string("a:b")}) {
         EXPECT_EQ(add(refused, "p"), 3) << refused;
         EXPECT_EQ(add("b", refused), 3) << refused;
     }
@@ -166,6 +168,8 @@ TEST_F(TintgateStore, UsersLogInAsTheySay) {
     answer({"user", "enable", zoe});
     EXPECT_EQ(login("Zo\xeb", "new"), store::LoginAnswer::Welcome);
     answer({"user", "remove", zoe});
+    open()->putUser({"an:na", "", false}); // Made by an earlier version: it can only be removed.
+    answer({"user", "remove", "an:na"});
     expectRefusal({"user", "enable", zoe}, 1, "there is no user");
 }
 
@@ -289,6 +293,10 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
 TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
     expectRefusal({"make"}, 2);
     expectRefusal({"-s", m_folder.path("none"), "jobs"}, 4, "none");
+    const std::string colon = m_folder.path("press:room");
+    expectRefusal({"-s", colon, "make"}, 3, "follows the last \":\"");
+    expectRefusal({"copy", m_folder.path("store"), colon}, 3, "follows the last \":\"");
+    EXPECT_FALSE(std::filesystem::exists(colon));
     support::RunOptions full;
     full.outputPath = "/dev/full";
     EXPECT_EQ(run({"export"}, full).exitCode, 12);
@@ -345,7 +353,8 @@ class StoreCopy : public TintgateStore {
 
 TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
     const std::string before = allOf(m_address);
-    EXPECT_THAT(answer({"copy", m_address, "room"}), HasSubstr("3 tickets, 1001 files and 1 user\n"));
+    EXPECT_THAT(answer({"copy", m_address, "room"}),
+                HasSubstr("3 tickets, 1001 files and 1 user\n"));
     EXPECT_TRUE(allOf("room") == before);
     answer({"copy", "room", back});
     EXPECT_TRUE(allOf(back) == before);

@@ -23,10 +23,10 @@
 #include "RunningProgram.h"
 #include "SuiteRoot.h"
 #include "TicketText.h"
-#include "store/sqlite/Sqlite.h"
 #include "store/StoreEngine.h"
 #include "store/StoreKeep.h"
 #include "store/Users.h"
+#include "store/sqlite/Sqlite.h"
 
 namespace {
 
@@ -261,7 +261,7 @@ auto blocked(const char* jobFile) {
 }
 auto storeFormat(const std::string& format) {
     return [=](const Place& place) {
-        store::sqlite::Database(place.address + "/tickets.db", false)
+        store::sqlite::Database(place.address + "/tickets.db", store::sqlite::Opening::Existing)
             .run(("PRAGMA user_version = " + format).c_str());
     };
 }

@@ -2,11 +2,18 @@
 // are stopped, older schemas.
 #include <chrono>
 #include <csignal>
+#include <cstdlib>
+#include <filesystem>
+#include <fstream>
+#include <thread>
 
 #include <netinet/in.h>
+#include <poll.h>
+#include <pwd.h>
 #include <sys/socket.h>
 
 #include "StoreTest.h"
+#include "store/postgres/Postgres.h"
 
 using store::Fault;
 
@@ -70,38 +77,219 @@ TEST_F(Postgres, ATicketThatIsHeldKeepsNobodyForEver) {
     EXPECT_EQ(send(*engine, 3, 1, "a=1"), "taken 1");
 }
 
-TEST_F(Postgres, AServerThatFallsSilentIsGivenUp) {
+TEST_F(Postgres, ASessionThatIsEndedOrFallsSilentIsReplaced) {
     room->addService("impatient", "options=-c statement_timeout=700\ntcp_user_timeout=800");
     open()->create(3, 1);
     const std::string process = "SELECT pid FROM pg_stat_activity WHERE application_name = "
                                 "'tintgate' AND datname = current_database()";
+    const auto engine = store::openStore("impatient");
+    std::string others;
     for (const bool stopped : {true, false}) {
-        while (!bare.run(process).empty()) {
-            usleep(1'000);
-        }
-        const auto engine = store::openStore("impatient");
-        const std::string pid = bare.run(process);
+        const std::string pid = bare.run(process + others);
         ASSERT_FALSE(pid.empty());
-        EXPECT_TRUE(engine->alive());
         if (stopped) {
             kill(std::stoi(pid), SIGSTOP);
         } else {
             bare.run("SELECT pg_terminate_backend(" + pid + ")");
         }
-        EXPECT_EQ(faultInTime([&] { engine->ids(3); }), Fault::Lost);
-        EXPECT_FALSE(engine->alive());
-        faultInTime([&] { // At once, however often it is asked.
-            for (int i = 0; i < 100; ++i) {
-                EXPECT_EQ(faultOf([&] { putFile(*engine, "a/b", "x"); }), Fault::Lost);
-                EXPECT_EQ(send(*engine, 3, 1, "a=2"), "refused 0");
-            }
-        });
+        EXPECT_EQ(faultInTime([&] { EXPECT_EQ(engine->ids(3), std::vector<int>{1}); }),
+                  std::nullopt);
+        EXPECT_EQ(send(*engine, 3, 1, "a=2"), "taken 1");
+        EXPECT_TRUE(engine->alive());
         if (stopped) {
             kill(std::stoi(pid), SIGCONT);
+            others = " AND pid <> " + pid;
         }
     }
-    EXPECT_EQ(ticket(*open(), 3, 1), "");
-    EXPECT_TRUE(open()->files().empty());
+}
+
+TEST_F(Postgres, WhatWasSentIsRepeatedUnlessTwiceIsNotOnce) {
+    const struct {
+        const char* records;
+        bool isRepeated;
+    } cases[] = {
+        {"v=1,2 d=0.5", true},
+        {"v[1]=5 w=-", true},
+        {"v=- v[-2]=1 v[-2]=2 v[0]=-", true}, // Nothing of what was there counts.
+        {"v[-2]=3", false},
+        {"v[0]=-", false},
+    };
+    open()->create(3, 1);
+    open()->create(3, 2);
+    const std::string waiting =
+        "SELECT pid FROM pg_stat_activity WHERE application_name = 'tintgate'"
+        " AND datname = current_database() AND wait_event_type = 'Lock'";
+    for (const auto& [records, isRepeated] : cases) {
+        send(*open(), 3, 1, "v=7,8,9 w=1");
+        support::RecordTable table(records);
+        store::TicketContent expected = *open()->content(3, 1, store::KeyFilter());
+        const std::string before = contentText(expected);
+        expected.apply(table.records());
+        store::StoreKeep keep(open());
+        bare.run(
+            "BEGIN; UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = 3 AND id = 1");
+        std::thread killer([&] { // While the change waits at the server.
+            std::string pid;
+            const support::BarePostgres other("room");
+            while ((pid = other.run(waiting)).empty()) {
+                usleep(1'000);
+            }
+            other.run("SELECT pg_terminate_backend(" + pid + ")");
+            bare.run("COMMIT");
+        });
+        EXPECT_EQ(keep.apply(3, 1, table.records()), isRepeated) << records;
+        killer.join();
+        EXPECT_EQ(ticket(*open(), 3, 1), isRepeated ? contentText(expected) : before) << records;
+        // A ticket with a gap takes no more from this session; others do.
+        EXPECT_EQ(keep.apply(3, 1, support::RecordTable("status=1").records()), isRepeated);
+        EXPECT_EQ(keep.remove(3, 1), isRepeated);
+        EXPECT_TRUE(keep.apply(3, 2, support::RecordTable("status=1").records()));
+        EXPECT_NE(keep.key(3, 2, "status"), nullptr);
+        keep.create(3, 1);
+    }
+}
+
+TEST(PostgresLoss, ASessionGoesOnWhenItsServerIsBack) {
+    const support::PostgresServer server;
+    store::makeStore("tintgate", "Press room");
+    const auto engine = store::openStore("tintgate");
+    engine->create(3, 1);
+    std::ostringstream fetched;
+    const std::function<void()> steps[] = {
+        [&] { EXPECT_EQ(StoreTest::send(*engine, 3, 1, "a=1 b=2"), "taken 11"); },
+        [&] { EXPECT_EQ(StoreTest::send(*engine, 3, 1, "a[-2]=2 b[0]=-"), "taken 11"); },
+        [&] { EXPECT_EQ(StoreTest::ticket(*engine, 3, 1), "a[0]=1 a[1]=2"); },
+        [&] { EXPECT_TRUE(engine->alive()); },
+        [&] { StoreTest::putFile(*engine, "a/b", "text"); },
+        [&] { engine->getFile("a/b", fetched); },
+        [&] { EXPECT_EQ(engine->createNext(3), 2); },
+    };
+    for (const auto& step : steps) {
+        server.stop("fast");
+        std::thread back([&] {
+            usleep(300'000);
+            server.startAgain();
+        });
+        step();
+        back.join();
+    }
+    EXPECT_EQ(fetched.str(), "text");
+
+    // Without its server for too long, all waits together, a session is lost for good.
+    using namespace store::postgres;
+    static constexpr Statement one = {"SELECT 1"};
+    Connection connection("tintgate", std::chrono::milliseconds(1'000));
+    server.stop("fast");
+    const auto ask = [&] {
+        connection.repeating([&] { return connection.run(one).number(0, 0); });
+    };
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(StoreTest::faultOf(ask), Fault::Lost);
+    EXPECT_GE(std::chrono::steady_clock::now() - start, std::chrono::milliseconds(900));
+    server.startAgain();
+    EXPECT_EQ(StoreTest::faultOf(ask), Fault::Lost);
+    EXPECT_FALSE(connection.isThere());
+}
+
+/// PgBouncer between a test and the tests' server, with one session for all. While it lives, the
+/// service "pooled" leads through it.
+class Pooler {
+  public:
+    explicit Pooler(const support::PostgresRoom& room) {
+        EXPECT_NE(mkdtemp(m_folder.data()), nullptr);
+        const std::string services = support::contentsOf(std::getenv("PGSERVICEFILE"));
+        const auto at = services.find("host=") + 5;
+        const std::string server = services.substr(at, services.find('\n', at) - at);
+        std::ofstream(m_folder + "/ini")
+            << "[databases]\n* = host=" << server << " user=tintgate\n"
+            << "[pgbouncer]\nlisten_port=6543\nunix_socket_dir=" << m_folder
+            << "\nauth_type=any\npool_mode=transaction\ndefault_pool_size=1\n";
+        // It refuses to run as root.
+        const passwd* const user = geteuid() == 0 ? getpwnam("postgres") : nullptr;
+        if (user != nullptr) {
+            EXPECT_EQ(chown(m_folder.c_str(), user->pw_uid, user->pw_gid), 0);
+        }
+        m_process = startProcess([&] {
+            if (user != nullptr && (setgid(user->pw_gid) != 0 || setuid(user->pw_uid) != 0)) {
+                return 1;
+            }
+            execl("/usr/sbin/pgbouncer", "pgbouncer", "-q", (m_folder + "/ini").c_str(), nullptr);
+            return 1;
+        });
+        room.addService("pooled", "port=6543\nhost=" + m_folder);
+        for (int wait = 0; wait < 500 && !std::filesystem::exists(m_folder + "/.s.PGSQL.6543");
+             ++wait) {
+            usleep(10'000);
+        }
+    }
+    ~Pooler() {
+        kill(m_process, SIGKILL);
+        endOf(m_process);
+        std::filesystem::remove_all(m_folder);
+    }
+    Pooler(const Pooler&) = delete;
+
+  private:
+    std::string m_folder = "/tmp/tintgate-pooler-XXXXXX"; ///< In reach of that user.
+    pid_t m_process = 0;
+};
+
+TEST_F(Postgres, APoolerMayHandOutSingleTransactions) {
+    const Pooler pooler(*room);
+    const auto one = store::openStore("pooled");
+    const auto other = store::openStore("pooled");
+    EXPECT_EQ(one->createNext(3), 1);
+    EXPECT_EQ(other->createNext(3), 2);
+    for (const auto& engine : {one.get(), other.get(), one.get()}) {
+        EXPECT_EQ(send(*engine, 3, 1, "a=1 b[-2]=2 Job/Display/Status=208"), "taken 111");
+        putFile(*engine, "a/b", std::string(3 << 20, 'x'));
+        store::JobOverview jobs;
+        engine->overview(jobs);
+        EXPECT_EQ(jobs.ids(), (std::vector<int>{1, 2}));
+    }
+    EXPECT_EQ(ticket(*open(), 3, 1), "Job/Display/Status[0]=208 a[0]=1 b[0]=2 b[1]=2 b[2]=2");
+    EXPECT_EQ(file(*other, "a/b").size(), 3u << 20);
+    EXPECT_EQ(versions(*one, "a/b").size(), 2u);
+    EXPECT_EQ(faultOf([] { store::openCopy("pooled"); }), Fault::Other);
+    // Limits are set for the transaction, and left to no other client of that session.
+    using namespace store::postgres;
+    static constexpr Statement limit = {"SELECT current_setting('lock_timeout')::text"};
+    Connection connection("pooled");
+    EXPECT_TRUE(connection.pooled());
+    EXPECT_EQ(connection.run(limit).text(0, 0), "10s");
+    EXPECT_EQ(support::BarePostgres("pooled").run(limit.text), "0");
+    EXPECT_FALSE(Connection("room").pooled());
+    // A measurement may take longer than a session may idle elsewhere.
+    room->addService("idle", "options=-c idle_session_timeout=300");
+    static constexpr Statement idle = {"SELECT current_setting('idle_session_timeout')::text"};
+    EXPECT_EQ(Connection("idle").run(idle).text(0, 0), "0");
+}
+
+TEST_F(Postgres, ADislikedPasswordFileAndAnAddressCostNothing) {
+    // What the library prints would be printed by the tool, and it connects once.
+    folder.write("passwords", "*:*:*:*:x\n");
+    const std::string fileOption = "passfile=" + folder.path("passwords");
+    std::filesystem::permissions(folder.path("passwords"), std::filesystem::perms(0644));
+    const int listener = socket(AF_INET, SOCK_STREAM, 0);
+    sockaddr_in place = {};
+    socklen_t size = sizeof place;
+    ASSERT_EQ(listen(listener, 8), 0);
+    ASSERT_EQ(getsockname(listener, reinterpret_cast<sockaddr*>(&place), &size), 0);
+    room->addService("disliked", fileOption);
+    room->addService("addressed", "host=localhost\nhostaddr=127.0.0.1\nconnect_timeout=2\nport=" +
+                                      std::to_string(ntohs(place.sin_port)));
+    testing::internal::CaptureStderr();
+    EXPECT_NO_THROW(store::openStore("disliked"));
+    EXPECT_EQ(testing::internal::GetCapturedStderr(), "");
+    std::thread opening(
+        [] { EXPECT_EQ(faultOf([] { store::openStore("addressed"); }), Fault::Missing); });
+    int connections = 0;
+    for (pollfd wait = {listener, POLLIN, 0}; poll(&wait, 1, 1'000) > 0; ++connections) {
+        close(accept(listener, nullptr, nullptr));
+    }
+    opening.join();
+    EXPECT_EQ(connections, 1);
+    close(listener);
 }
 
 TEST_F(Postgres, AServerThatTakesNoChangesIsReadOnly) {
@@ -116,7 +304,8 @@ TEST_F(Postgres, AServerThatTakesNoChangesIsReadOnly) {
 TEST_F(Postgres, AnOlderSchemaIsBroughtUpToDateOnce) {
     open()->createNext(3);
     // As it was before there were files.
-    bare.run("DROP TABLE tintgate.files, tintgate.versions, tintgate.contents, tintgate.pieces;"
+    bare.run("DROP TABLE tintgate.files, tintgate.versions, tintgate.contents, tintgate.pieces,"
+             " tintgate.job_blocks;"
              "UPDATE tintgate.store SET format = 1");
     EXPECT_EQ(faultOf([&] { open(); }), Fault::Older);
     pid_t upgrades[2];

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <csignal>
+#include <filesystem>
 #include <map>
 #include <random>
 #include <ranges>
@@ -15,7 +16,14 @@ using store::Fault;
 
 namespace {
 
-class StoreEngine : public StoreTest {};
+class StoreEngine : public StoreTest {
+  protected:
+    /// Puts a file; the number under which what it replaced is kept.
+    static int putAndKeep(store::StoreEngine& engine, const std::string& path, const char* text) {
+        putFile(engine, path, text);
+        return engine.versions(path).back().number;
+    }
+};
 
 /// What only a store in a folder has.
 class FolderStore : public StoreTest {
@@ -40,6 +48,32 @@ TEST_P(StoreEngine, IdsAreNotUsedTwice) {
     EXPECT_EQ(engine->createNext(3), 2) << "the lowest free one, when the highest is used up";
     EXPECT_EQ(engine->ids(3), (std::vector<int>{1, 2, 40, 42, 0xFFFFFF}));
     EXPECT_EQ(engine->ids(4), std::vector<int>());
+}
+
+TEST_P(StoreEngine, NumbersOfVersionsAndNamesOfUsersAreTakenOnce) {
+    const auto engine = open();
+    for (const char* text : {"one", "two", "three"}) {
+        putFile(*engine, "a/b", text);
+    }
+    EXPECT_EQ(engine->pruneVersions("a/b", 0), 2);
+    EXPECT_EQ(engine->pruneVersions("a/b", 0), 0);
+    putFile(*engine, "a/b", "four");
+    ASSERT_EQ(engine->versions("a/b").size(), 1u);
+    EXPECT_EQ(engine->versions("a/b")[0].number, 3);
+    EXPECT_EQ(engine->pruneVersions("a/b", 0), 1);
+    engine->restoreVersion("a/b", putAndKeep(*engine, "a/b", "five"));
+    EXPECT_EQ(engine->versions("a/b").back().number, 5);
+    EXPECT_EQ(engine->files().size(), 1u);
+
+    pid_t adding[4];
+    for (pid_t& process : adding) {
+        process = startProcess([&] { return open()->addUser({"anna", "hash", false}) ? 1 : 0; });
+    }
+    int added = 0;
+    for (const pid_t process : adding) {
+        added += endOf(process);
+    }
+    EXPECT_EQ(added, 1);
 }
 
 TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
@@ -69,8 +103,20 @@ TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
         EXPECT_EQ(ticket(*open(), 3, 1), expected);
     }
     const auto engine = open();
-    const char* filter[] = {"b", "é*", nullptr};
-    EXPECT_EQ(contentText(*engine->content(3, 1, store::KeyFilter(filter))), "b[0]='new é[0]=7");
+    const std::pair<std::vector<const char*>, const char*> filters[] = {
+        {{"b", "é*", nullptr}, "b[0]='new é[0]=7"},
+        {{"b*", "b2", "no", nullptr}, "b[0]='new b2[0]=1 b2[1]=2"},
+        {{"b2", nullptr}, "b2[0]=1 b2[1]=2"},
+        {{"no", nullptr}, ""},
+        {{"\xC3*", nullptr}, "é[0]=7"},
+        {{"\xFF*", "c*", nullptr}, ""},
+        {{"*", nullptr}, "b[0]='new b2[0]=1 b2[1]=2 é[0]=7"},
+    };
+    for (const auto& [keys, expected] : filters) {
+        const store::KeyFilter filter(keys.data());
+        EXPECT_EQ(contentText(*engine->content(3, 1, filter)), expected) << keys[0];
+        EXPECT_EQ(engine->content(3, 2, filter), nullptr) << "there is no such ticket";
+    }
 
     // A change that fails on its way leaves nothing.
     const auto failing = [](store::TicketContent& content) {
@@ -131,6 +177,71 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
     }
 }
 
+TEST_P(StoreEngine, KeepsTheOverviewOfJobsInStep) {
+    // What each job holds: no key, a number, or something else.
+    const auto shown = [](store::StoreEngine& engine) {
+        store::JobOverview jobs;
+        engine.overview(jobs);
+        std::string text;
+        for (const int id : jobs.ids()) {
+            text += " " + std::to_string(id) + ":";
+            for (std::size_t key = 0; key < store::overviewKeys.size(); ++key) {
+                int number = 0;
+                const auto holds = jobs.find(id, key, number);
+                text += holds == store::JobOverview::Holds::Number    ? std::to_string(number) + ","
+                        : holds == store::JobOverview::Holds::Nothing ? "-,"
+                                                                      : "?,";
+            }
+        }
+        return text;
+    };
+    const auto engine = open();
+    for (const int id : {0, 1, 63, 64, 200, 201, 0xFFFFFF}) {
+        engine->create(3, id);
+    }
+    engine->create(4, 5);
+    EXPECT_EQ(engine->createNext(3), 2);
+    const std::pair<int, const char*> tables[] = {
+        {0, "Input/SubType=-2147483648 Job/Display/Status=258 Remote/ShowInVerifier=1"},
+        {0, "Remote/ShowInVerifier=- Workflow/Verify/Active[-2]=-1"},
+        {1, "Input/SubType=1,2 Input/FileType=u7 Job/Display/Status[3]=1 Other=1"},
+        {63, "Job/Display/Status=1,2 Workflow/Verify/Active='3"},
+        {63, "Job/Display/Status[1]=- Workflow/Verify/Active=3"},
+        {64, "Job/Display/Status=211 Input/FileType=4096"},
+        {64, "Job/Display/Status=- Other=2"},
+        {200, "Input/SubType=80"},
+        {0xFFFFFF, "Workflow/Verify/Active=3"},
+    };
+    for (const auto& [id, records] : tables) {
+        send(*engine, 3, id, records);
+    }
+    send(*engine, 4, 5, "Input/SubType=1");
+    engine->remove(3, 200);
+    store::Scope everything;
+    everything.everything = true;
+    engine->change(3, 201, everything, [](store::TicketContent& content) {
+        content.apply(support::RecordTable("Input/FileType=4 Input/SubType='x").records());
+    });
+    const std::string expected = " 0:-2147483648,258,-,-,-1, 1:?,?,-,?,-, 2:-,-,-,-,-,"
+                                 " 63:-,1,-,-,3, 64:-,-,-,4096,-, 201:?,-,-,4,-,"
+                                 " 16777215:-,-,-,-,3,";
+    EXPECT_EQ(shown(*engine), expected);
+    EXPECT_TRUE(engine->remove(3, 0) && engine->create(3, 0)) << "it starts without keys";
+    EXPECT_EQ(shown(*engine), " 0:-,-,-,-,-," + expected.substr(expected.find(" 1:")));
+
+    // A store that was made before there was an overview gets the same.
+    const std::string before = shown(*engine);
+    sql("DROP TABLE job_blocks",
+        "DROP TABLE tintgate.job_blocks; ALTER TABLE tintgate.files DROP last_version");
+    setFormat(room ? 2 : 1);
+    EXPECT_EQ(faultOf([&] { open(); }), Fault::Older);
+    EXPECT_TRUE(store::bringStoreUpToDate(address));
+    EXPECT_EQ(shown(*open()), before);
+    sql("UPDATE job_blocks SET content = CAST(substr(content, 2) AS BLOB)",
+        "UPDATE tintgate.job_blocks SET content = substring(content FROM 2)");
+    EXPECT_EQ(faultOf([&] { shown(*open()); }), Fault::Damaged);
+}
+
 TEST_F(FolderStore, OpensOnlyFoldersWithAStore) {
     folder.makeFolder("strange/files");
     folder.write("strange/tickets.db", "");
@@ -161,7 +272,7 @@ TEST_P(StoreEngine, NeitherOverwritesAStoreNorReadsADamagedKey) {
     EXPECT_FALSE(store::bringStoreUpToDate(address));
     setFormat(9);
     EXPECT_EQ(faultOf([&] { store::bringStoreUpToDate(address); }), Fault::Newer);
-    setFormat(room ? 2 : 1);
+    setFormat(room ? 3 : 2);
     sql("INSERT INTO keys SELECT number, x'61', x'010299' FROM tickets",
         "INSERT INTO tintgate.keys (ticket, name, value, change)"
         " SELECT number, '\\x61', '\\x010299', 0 FROM tintgate.tickets");
@@ -169,6 +280,109 @@ TEST_P(StoreEngine, NeitherOverwritesAStoreNorReadsADamagedKey) {
     EXPECT_EQ(faultOf([&] { engine->key(0, 0, "a"); }), Fault::Damaged);
     EXPECT_EQ(send(*engine, 0, 0, "a[1]=1"), "refused 0");
     EXPECT_EQ(send(*engine, 0, 0, "a=1"), "taken 1") << "replacing it mends it";
+}
+
+// Of whatever kind, one byte that has changed is a failure or goes unnoticed; it crashes nobody.
+TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
+    {
+        const auto engine = open();
+        for (int id = 1; id <= 70; ++id) {
+            engine->create(3, id);
+            send(*engine, 3, id,
+                 "Job/Display/Status=208 Input/FileType=0 Input/SubType=1 v=1,2,3"
+                 " t='text,'more b=#0001 p=2.5,'x n[7]=1");
+        }
+        engine->putUser({"press", "no hash", false});
+        putFile(*engine, "a/b", "one");
+        putFile(*engine, "a/b", "two");
+    }
+    int noticed = 0;
+    const auto work = [&](bool writes) {
+        const auto fault = faultOf([&] {
+            const std::shared_ptr<store::StoreEngine> engine = open();
+            const std::vector<std::string> names = {"Job/Display/Status", "Input/FileType", "v"};
+            engine->keysOfAll(3, names, 64, [](int, std::size_t, const auto&) {});
+            for (const int id : engine->ids(3)) {
+                engine->content(3, id, store::KeyFilter());
+            }
+            engine->user("press");
+            engine->users();
+            engine->highestIds();
+            engine->versions("a/b");
+            store::StoreKeep keep(engine);
+            for (const int id : keep.listIds(3)) {
+                engine->key(3, id, "n");
+                keep.key(3, id, "Job/Display/Status");
+            }
+            if (writes) {
+                send(*engine, 3, 7, "Job/Display/Status[-2]=1 v[1]=- t=-");
+                engine->change(3, 8, {.everything = true, .keys = {}}, [](auto&) {});
+                engine->remove(3, 9);
+                engine->createNext(3);
+            }
+        });
+        noticed += fault ? 1 : 0;
+    };
+    std::mt19937 random(11); // NOLINT: the same bytes each time
+    const auto below = [&](std::size_t limit) { return random() % limit; };
+    const int rounds = roundsOr(80);
+    const std::string whole = room ? "" : support::contentsOf(address + "/tickets.db");
+    for (int round = 0; round < rounds; ++round) {
+        const auto bits = static_cast<char>(1 + below(255));
+        if (!room) {
+            std::string damaged = whole;
+            damaged[below(whole.size())] ^= bits;
+            std::filesystem::remove(address + "/tickets.db-wal");
+            std::filesystem::remove(address + "/tickets.db-shm");
+            folder.write("store/tickets.db", damaged);
+            work(round % 4 == 0);
+            continue;
+        }
+        const std::pair<const char*, const char*> places[] = {
+            {"keys", "value"}, {"job_blocks", "content"}, {"users", "hash"}, {"keys", "name"}};
+        const auto& [table, column] = places[below(std::size(places))];
+        const std::string name = column;
+        const support::BarePostgres bare("room");
+        // The row by its place; the same statement, at its new place, takes the change back.
+        std::string place = bare.run("SELECT ctid FROM tintgate." + std::string(table) +
+                                     " ORDER BY random() LIMIT 1");
+        const std::string at = std::to_string(below(1'000));
+        const auto change = [&] {
+            place = bare.run("UPDATE tintgate." + std::string(table) + " SET " + name +
+                             " = set_byte(" + name + ", " + at + " % length(" + name +
+                             "), get_byte(" + name + ", " + at + " % length(" + name + ")) # " +
+                             std::to_string(static_cast<unsigned char>(bits)) + ") WHERE ctid = '" +
+                             place + "' RETURNING ctid");
+        };
+        change();
+        work(false);
+        change();
+    }
+    EXPECT_GT(noticed, rounds / 20);
+    EXPECT_LT(noticed, rounds);
+}
+
+TEST_F(FolderStore, CanBeReadOnAFullDisk) {
+    open()->create(3, 1);
+    send(*open(), 3, 1, "kept=1,2,3");
+    for (const auto& [access, result] :
+         {std::pair(store::Access::ReadAndWrite, 2), {store::Access::Read, 0}}) {
+        const pid_t child = startProcess([&, access = access] {
+            signal(SIGXFSZ, SIG_IGN);
+            const rlimit limit = {20'000, 20'000}; // The index of the log takes 32 KB.
+            setrlimit(RLIMIT_FSIZE, &limit);
+            const auto fault = faultOf([&] {
+                const std::shared_ptr<store::StoreEngine> engine =
+                    store::openStore(address, access);
+                EXPECT_EQ(ticket(*engine, 3, 1), "kept[0]=1 kept[1]=2 kept[2]=3");
+                EXPECT_EQ(store::StoreKeep(engine).ids(3), std::vector<int>{1});
+                EXPECT_EQ(faultOf([&] { putFile(*engine, "a", std::string(30'000, 'x')); }),
+                          Fault::Full);
+            });
+            return HasFailure() ? 1 : fault == Fault::Full ? 2 : 0;
+        });
+        EXPECT_EQ(endOf(child), result);
+    }
 }
 
 TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
@@ -185,6 +399,12 @@ TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
         EXPECT_EQ(send(*engine, 3, 1, "kept='" + much + " other=1"), "refused 00");
         EXPECT_EQ(faultOf([&] { putFile(*engine, "kept", much); }), Fault::Full);
         EXPECT_EQ(send(*engine, 3, 1, "small=1"), "taken 1");
+        // A session that lost a write takes no more for that ticket.
+        engine->create(3, 2);
+        store::StoreKeep keep(open());
+        EXPECT_FALSE(keep.apply(3, 1, support::RecordTable("big='" + much).records()));
+        EXPECT_FALSE(keep.apply(3, 1, support::RecordTable("status=1").records()));
+        EXPECT_TRUE(keep.apply(3, 2, support::RecordTable("status=1").records()));
         return HasFailure() ? 1 : 0;
     });
     EXPECT_EQ(endOf(child), 0);

@@ -2,6 +2,7 @@
 // words.
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <vector>
@@ -57,11 +58,18 @@ class WorkTicket {
     const STICKET_ACCESS* m_real;
 };
 
+inline std::shared_ptr<store::TicketKeep> memoryKeep() {
+    return std::make_shared<store::MemoryKeep>();
+}
+
+/// Where the tickets of a new Server are, unless it is told.
+inline std::function<std::shared_ptr<store::TicketKeep>()> newKeep = memoryKeep;
+
 /// A session with a server.
 class Server {
   public:
-    explicit Server(std::shared_ptr<store::TicketKeep> keep = std::make_shared<store::MemoryKeep>())
-        : engine(std::move(keep)), record(*engine.access()) {
+    explicit Server(std::shared_ptr<store::TicketKeep> place = newKeep())
+        : keep(std::move(place)), engine(keep), record(*engine.access()) {
         hSTicketInstance = store::ticketFactory();
     }
 
@@ -79,6 +87,7 @@ class Server {
     }
     std::string content(int id) { return support::ticketText(engine.open(jobs, id)); }
 
+    const std::shared_ptr<store::TicketKeep> keep;
     store::TicketContainer engine;
     MTICKET_ACCESS record;
 };

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <cstdio>
+#include <cstdlib>
 #include <functional>
 #include <memory>
 #include <optional>
@@ -18,9 +19,9 @@
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 #include "TicketText.h"
-#include "store/sqlite/Sqlite.h"
 #include "store/StoreEngine.h"
 #include "store/StoreKeep.h"
+#include "store/sqlite/Sqlite.h"
 
 /// Starts work in a process of its own, which ends with what work returns; 99 after an exception.
 inline pid_t startProcess(const std::function<int()>& work) {
@@ -42,6 +43,12 @@ inline int endOf(pid_t child) {
     int status = 0;
     waitpid(child, &status, 0);
     return WIFEXITED(status) ? WEXITSTATUS(status) : 1000 + WTERMSIG(status);
+}
+
+/// TINTGATE_ROUNDS asks for more rounds than those that every run of the tests takes.
+inline int roundsOr(int usual) {
+    const char* const wanted = std::getenv("TINTGATE_ROUNDS");
+    return wanted == nullptr ? usual : std::atoi(wanted);
 }
 
 /// All that is in a ticket, in the words of TicketText.h.
@@ -128,7 +135,8 @@ class StoreTest : public testing::TestWithParam<Engine> {
             support::BarePostgres("room").run(postgres);
             return;
         }
-        store::sqlite::Database(address + "/tickets.db", false).run(sqlite.c_str());
+        store::sqlite::Database(address + "/tickets.db", store::sqlite::Opening::Existing)
+            .run(sqlite.c_str());
     }
 
     void setFormat(int format) const {

@@ -1,8 +1,9 @@
 #include "ticket/ParameterList.h"
 
+#include <array>
 #include <cmath>
 
-#include "RealTickets.h"
+#include "AnyPlace.h"
 #include "text/MathLib.h"
 
 namespace {
@@ -74,6 +75,22 @@ TEST(ParameterList, EqualOnesAreStoredOnceAndNoNumbersAreOneConstant) {
     EXPECT_EQ(list.Size(), 2 * numbers.size() + 2);
 }
 
+TEST(ParameterList, NoNumbersLeaveTheKeyUnset) {
+    void* opaque = MultiParListCreate();
+    const auto& list = *static_cast<SETMULTIPAR_LIST*>(opaque);
+    const double value = 2.5;
+    const int number = 7;
+    for (const int count : {0, -1}) {
+        EXPECT_TRUE(MultiParListSetNumbers(opaque, "a", PARAM_DOUBLE, &value, count));
+        EXPECT_TRUE(MultiParListSetNumbers(opaque, "a", PARAM_INT, &number, count));
+        EXPECT_TRUE(list.Size() == 0 && !list.ParameterExists("a"));
+    }
+    MultiParListSetParameter(opaque, "d", PARAM_DOUBLE, &value, -1);
+    MultiParListSetParameter(opaque, "i", PARAM_INT, &number, -1);
+    EXPECT_EQ(tableText(MultiParListTable(opaque, 0)), "d[-1]=2.5 i[-1]=7");
+    MultiParListDestroy(&opaque);
+}
+
 TEST(ParameterList, TableSortsByKeyAndKeepsTheOrderWithinAKey) {
     void* opaque = MultiParListCreate();
     auto& list = *static_cast<SETMULTIPAR_LIST*>(opaque);
@@ -139,6 +156,39 @@ TEST(ParameterList, CollectsFromATicket) {
         return ++calls == 1 && std::string_view(key) != "B";
     });
     EXPECT_EQ(tableText(list.Table(false)), all.substr(8));
+}
+
+class ShallowList : public AnyPlace {};
+IN_ANY_PLACE(ShallowList);
+
+// Texts and doubles of a shallow list stay the ticket's own.
+TEST_P(ShallowList, HoldsWhatAnyWalkShowedUntilTheTicketChanges) {
+    const std::string content = "d[-1]=0.5 l[-1]=l7 n[-1]=1.5 n[1]=2.5 t[-1]='text t[1]='more";
+    const std::string texts = content.substr(content.find('t'));
+    Server server;
+    server.create(12, content);
+    server.create(13, "d[-1]=9");
+    const auto& ticket = ticket::as<STICKET_MODIFY>(*server.engine.open(jobs, 12));
+    SETMULTIPAR_LIST list(false);
+    list.Merge(&ticket, PARTIAL_MODE(std::array<const char*, 2>{"t", nullptr}.data()));
+    const auto unchanged = [&] { // The more it is walked, the more would be freed too early.
+        list.Merge(&ticket, PARTIAL_MODE(std::array<const char*, 2>{"none", nullptr}.data()));
+        support::ticketText(&ticket);
+        const WorkTicket work;
+        EXPECT_TRUE(work.view().Merge(&ticket, nullptr));
+        EXPECT_EQ(tableText(list.Table(false)).substr(0, texts.size()), texts);
+    };
+    unchanged();
+    server.send(13, "d[-1]=10");
+    EXPECT_EQ(server.send(12, "d[-3]=10 *[0]=1"), "taken 00");
+    unchanged();
+    // By another session: what was shown before is still good, and what is shown now is new.
+    store::TicketContainer other(server.keep);
+    other.apply(jobs, 12, RecordTable("t[1]='changed").records());
+    unchanged();
+    list.Merge(&ticket, nullptr);
+    EXPECT_EQ(tableText(list.Table(false)),
+              texts + " " + content.substr(0, content.find('t')) + "t[-1]='text t[1]='changed");
 }
 
 } // namespace

@@ -1,4 +1,4 @@
-#include "RealTickets.h"
+#include "AnyPlace.h"
 
 namespace {
 
@@ -12,7 +12,7 @@ std::string entryText(const Entries& entries, int type, int ticket) {
     return found == entries.end() ? "none" : support::ticketText(found->second.ticket);
 }
 
-class UpdateList : public testing::Test {
+class UpdateList : public AnyPlace {
   protected:
     UpdateList() : list(&server.record) {
         server.create(id, "a=1,2,3,4 s[-1]='old s[1]='older d[-1]=0.5 u[-1]=u9");
@@ -21,6 +21,8 @@ class UpdateList : public testing::Test {
     Server server;
     TICKET_UPDATE_LIST list;
 };
+
+IN_ANY_PLACE(UpdateList);
 
 TEST(UpdateListAddress, IsRealVirtualOrLocal) {
     const struct {
@@ -43,7 +45,7 @@ TEST(UpdateListAddress, IsRealVirtualOrLocal) {
     }
 }
 
-TEST_F(UpdateList, OverlaysTheServersValues) {
+TEST_P(UpdateList, OverlaysTheServersValues) {
     const struct {
         const char* edits;
         int position;
@@ -77,7 +79,7 @@ TEST_F(UpdateList, OverlaysTheServersValues) {
     EXPECT_EQ(values, std::vector<int>{5});
 }
 
-TEST_F(UpdateList, KeepsWhatDeletionsTakeAway) {
+TEST_P(UpdateList, KeepsWhatDeletionsTakeAway) {
     const std::pair<const char*, const char*> cases[] = {
         {"a[2]=- a[1]=-", "a[0]=3 a[1]=2"},
         {"a[2]=- a[-1]=-", "a[0]=1"}, // In place of what was kept.
@@ -101,7 +103,7 @@ TEST_F(UpdateList, KeepsWhatDeletionsTakeAway) {
     EXPECT_EQ(entryText(lone.m_changed, jobs, id), "a[0]=9");
 }
 
-TEST_F(UpdateList, CountsAsEmptyByKeptValuesAlone) {
+TEST_P(UpdateList, CountsAsEmptyByKeptValuesAlone) {
     edit(list, jobs, id, "a[-1]=-");
     edit(list, jobs, 13, "k[-1]=1");
     EXPECT_TRUE(list.Clear(jobs, id));
@@ -113,7 +115,7 @@ TEST_F(UpdateList, CountsAsEmptyByKeptValuesAlone) {
     }
 }
 
-TEST_F(UpdateList, TellsOfEachChange) {
+TEST_P(UpdateList, TellsOfEachChange) {
     std::string told;
     list.RegisterSetParamCallback(
         [&](int type, int ticket, const char* key, PARAM_TYPE ptype, const void* value) {
@@ -134,7 +136,7 @@ TEST_F(UpdateList, TellsOfEachChange) {
     EXPECT_EQ(text, list.m_stringCache["a/b"]);
 }
 
-TEST_F(UpdateList, RefusesWithoutATrace) {
+TEST_P(UpdateList, RefusesWithoutATrace) {
     list.m_translate = [](void*, std::string&, const char*) { return 2; };
     EXPECT_FALSE(edit(list, jobs, id, "s[-1]='x"));
     EXPECT_FALSE(edit(list, 51, id, "a[-1]=1"));
@@ -149,12 +151,20 @@ TEST_F(UpdateList, RefusesWithoutATrace) {
     EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, -1), 2);
 }
 
-TEST_F(UpdateList, MergesATicketAsItIsWalked) {
+TEST_P(UpdateList, MergesATicketAsItIsWalked) {
     const WorkTicket source("ab[-1]=1 abc[-1]=2 b[-1]=3");
     int told = 0;
     list.RegisterSetParamCallback([&](int, int, const char*, PARAM_TYPE, const void*) { ++told; });
     const char* const keys[] = {"ab*", nullptr};
     list.Merge(jobs, 13, source.real(), keys);
+    EXPECT_EQ(entryText(list.m_changed, jobs, 13), "ab[0]=1 abc[0]=2");
+    STICKET_ACCESS odd{}; // A plug-in's walk that shows a value without a key.
+    ticket::single::Walk::put(
+        odd, +[](void*, SCollect show, void* context, const char*, int) {
+            static const int value = 1;
+            return show(context, nullptr, PARAM_INT, &value, 0) ? 1 : 0;
+        });
+    list.Merge(jobs, 13, &odd, keys);
     EXPECT_EQ(entryText(list.m_changed, jobs, 13), "ab[0]=1 abc[0]=2");
     list.Merge(jobs, 13, source.real(), PARTIAL_MODE());
     list.Merge(jobs, 13, nullptr, PARTIAL_MODE());

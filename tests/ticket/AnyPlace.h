@@ -1,0 +1,54 @@
+// Tests of lists and flushes that run wherever tickets are kept: in memory and in a store of each
+// kind.
+#pragma once
+
+#include <memory>
+#include <string>
+
+#include <gtest/gtest.h>
+
+#include "Postgres.h"
+#include "RealTickets.h"
+#include "ScratchFolder.h"
+#include "store/StoreEngine.h"
+#include "store/StoreKeep.h"
+
+enum class Place { Memory, Sqlite, Postgres };
+
+/// While it lives, each Server that names no place of its own gets an empty one of this kind. They
+/// share a store, so that only the last one made may be used.
+class AnyPlace : public testing::TestWithParam<Place> {
+  protected:
+    AnyPlace() {
+        if (GetParam() != Place::Memory) {
+            store::makeStore(m_address, "Press room");
+            newKeep = [this] { return emptied(); };
+        }
+    }
+    ~AnyPlace() override { newKeep = memoryKeep; }
+
+    bool inStore() const { return GetParam() != Place::Memory; }
+
+  private:
+    std::shared_ptr<store::TicketKeep> emptied() const {
+        auto keep = std::make_shared<store::StoreKeep>(store::openStore(m_address));
+        for (const int id : keep->ids(jobs)) {
+            EXPECT_TRUE(keep->remove(jobs, id));
+        }
+        return keep;
+    }
+
+    const support::ScratchFolder m_folder;
+    const std::unique_ptr<support::PostgresRoom> m_room =
+        GetParam() == Place::Postgres ? std::make_unique<support::PostgresRoom>() : nullptr;
+    const std::string m_address = m_room ? "room" : m_folder.path("store");
+};
+
+#define IN_ANY_PLACE(Suite)                                                                        \
+    INSTANTIATE_TEST_SUITE_P(, Suite,                                                              \
+                             testing::Values(Place::Memory, Place::Sqlite, Place::Postgres),       \
+                             [](const auto& info) {                                                \
+                                 return std::string(info.param == Place::Memory   ? "Memory"       \
+                                                    : info.param == Place::Sqlite ? "Sqlite"       \
+                                                                                  : "Postgres");   \
+                             })
