@@ -22,18 +22,23 @@ void Operator::askForExport(const std::string& path, Clock::time_point end) {
                        std::chrono::ceil<std::chrono::seconds>(end - Clock::now());
     m_log.add("Waiting for " + path + ", until " + timeText(until));
     m_progress.say("Your turn: measure " + m_strip + " and export it as " + path);
+    m_shown.clear();
     showTime();
     m_notification.show("Measure " + m_strip, {"Export it as " + path, timeLeft()});
 }
 
 void Operator::showTime() {
-    m_progress.line(timeLeft());
+    const std::string time = timeLeft();
+    if (time != m_shown)
+        m_progress.line(time);
+    m_shown = time;
 }
 
 void Operator::refuse(const std::string& problem) {
     m_log.add("Not accepted: " + problem);
     m_progress.say("Not accepted: " + problem);
     m_progress.say("Measure " + m_strip + " and export it again as " + m_path);
+    m_shown.clear();
     showTime();
     m_notification.show("Measure " + m_strip + " again",
                         {"Not accepted: " + problem, "Export it as " + m_path, timeLeft()});

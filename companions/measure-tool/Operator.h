@@ -37,6 +37,7 @@ class Operator {
     const RunLog& m_log;
     Notification m_notification;
     std::string m_path;
+    std::string m_shown; ///< The time on the terminal.
     Clock::time_point m_end;
 };
 
