@@ -53,13 +53,14 @@ constexpr const char* statedScales = "TINTGATE_SCALES \"device 100, XYZ 100, spe
 
 using Lines = std::vector<std::string>;
 
+/// Blank lines mean nothing and are left out: of a file of line ends, nothing stays.
 Lines linesOf(std::string_view text) {
     Lines lines;
     while (!text.empty()) {
-        const std::size_t end = text.find_first_of("\r\n");
-        lines.emplace_back(text.substr(0, end));
-        const bool both = end != text.npos && text.substr(end, 2) == "\r\n";
-        text.remove_prefix(end == text.npos ? text.size() : end + (both ? 2 : 1));
+        const std::size_t end = std::min(text.find_first_of("\r\n"), text.size());
+        if (end > 0)
+            lines.emplace_back(text.substr(0, end));
+        text.remove_prefix(std::min(end + 1, text.size()));
     }
     return lines;
 }

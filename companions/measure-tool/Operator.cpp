@@ -12,7 +12,7 @@ Operator::Operator(const std::string& strip, Progress& progress, const RunLog& l
 
 std::string Operator::timeLeft() const {
     const auto left = std::chrono::ceil<std::chrono::seconds>(m_end - Clock::now());
-    return minutesText(std::max(left, std::chrono::seconds(0))) + " left";
+    return minutesText(std::max(left, std::chrono::seconds(0))) + " left, until " + m_until;
 }
 
 void Operator::askForExport(const std::string& path, Clock::time_point end) {
@@ -20,6 +20,7 @@ void Operator::askForExport(const std::string& path, Clock::time_point end) {
     m_end = end;
     const auto until = std::chrono::system_clock::now() +
                        std::chrono::ceil<std::chrono::seconds>(end - Clock::now());
+    m_until = clockText(until);
     m_log.add("Waiting for " + path + ", until " + timeText(until));
     m_progress.say("Your turn: measure " + m_strip + " and export it as " + path);
     m_shown.clear();

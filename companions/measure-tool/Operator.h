@@ -39,6 +39,7 @@ class Operator {
     std::string m_path;
     std::string m_shown; ///< The time on the terminal.
     Clock::time_point m_end;
+    std::string m_until; ///< The same on the operator's clock.
 };
 
 } // namespace measuring

@@ -15,6 +15,23 @@
 #include "companions/measure-tool/Text.h"
 
 namespace measuring {
+namespace {
+
+/// True if a file starts as each line of a log does, or is empty.
+bool holdsLog(const std::string& path) {
+    constexpr std::string_view form = "0000-00-00T00:00:00Z ";
+    char head[form.size()];
+    const base::Descriptor file(open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
+    const ssize_t size = file.isOpen() ? read(file.get(), head, sizeof head) : -1;
+    const auto fits = [](char c, char expected) {
+        return expected == '0' ? c >= '0' && c <= '9' : c == expected;
+    };
+    return size == 0 || (size == static_cast<ssize_t>(form.size()) &&
+                         std::equal(form.begin(), form.end(), head,
+                                    [&](char expected, char c) { return fits(c, expected); }));
+}
+
+} // namespace
 
 void RunLog::start(const std::string& output, const std::vector<std::string>& inputs) {
     namespace fs = std::filesystem;
@@ -27,8 +44,8 @@ void RunLog::start(const std::string& output, const std::vector<std::string>& in
     if (isLog(output) || std::any_of(inputs.begin(), inputs.end(), isLog))
         return;
     struct stat status {};
-    if (lstat(path.c_str(), &status) == 0 &&
-        (!S_ISREG(status.st_mode) || unlink(path.c_str()) != 0))
+    const bool isThere = lstat(path.c_str(), &status) == 0;
+    if (isThere && (!S_ISREG(status.st_mode) || !holdsLog(path) || unlink(path.c_str()) != 0))
         return;
     m_path = path;
 }

@@ -14,7 +14,7 @@ class RunLog {
 
     /// From now on the log is the file of this name in the folder of the output, which is the
     /// job's folder. Removes that of an earlier run. Keeps no log if the file is the output itself
-    /// or one of `inputs`, or is not a regular file.
+    /// or one of `inputs`, or is anything else than an earlier log: files of the job are there too.
     void start(const std::string& output, const std::vector<std::string>& inputs);
 
     /// Adds a line with the time. Does nothing before start(). A log that can't be written is not

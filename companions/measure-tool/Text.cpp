@@ -27,6 +27,15 @@ std::string minutesText(std::chrono::seconds time) {
     return text;
 }
 
+std::string clockText(std::chrono::system_clock::time_point time) {
+    const std::time_t seconds = std::chrono::system_clock::to_time_t(time);
+    std::tm parts{};
+    localtime_r(&seconds, &parts);
+    char text[sizeof "15:32"];
+    std::strftime(text, sizeof text, "%H:%M", &parts);
+    return text;
+}
+
 std::string timeText(std::chrono::system_clock::time_point time) {
     const std::time_t seconds = std::chrono::system_clock::to_time_t(time);
     std::tm parts{};

@@ -14,6 +14,9 @@ std::string printable(std::string_view text);
 /// Minutes and seconds, such as "14:05"; whole hours count as minutes.
 std::string minutesText(std::chrono::seconds time);
 
+/// Hours and minutes of local time, such as "15:32".
+std::string clockText(std::chrono::system_clock::time_point time);
+
 /// The time in UTC as ISO 8601 has it: "2024-05-01T12:34:56Z".
 std::string timeText(std::chrono::system_clock::time_point time);
 

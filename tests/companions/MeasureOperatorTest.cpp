@@ -141,7 +141,8 @@ TEST_F(MeasureTool, TellsTheOperatorWhoseTurnItIs) {
                                 "0 0 0, was not asked for";
     EXPECT_THAT(desktop.calls(),
                 testing::ElementsAre(
-                    "notify 0: Measure strip.it8 | Export it as " + shown + "\n1:30 left",
+                    testing::StartsWith("notify 0: Measure strip.it8 | Export it as " + shown +
+                                        "\n1:30 left, until "),
                     testing::StartsWith("notify 7: Measure strip.it8 again | Not accepted: " +
                                         shown + problem + "\nExport it as " + shown + "\n1:2"),
                     "close 7"));

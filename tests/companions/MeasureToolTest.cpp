@@ -202,6 +202,24 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
     EXPECT_EQ(support::contentsOf(m_folder.path("definition.it8")), definitionOf({paper}));
 }
 
+TEST_F(MeasureTool, KeepsItsLogAndNobodyElsesFile) {
+    const std::string definition = definitionOf({paper});
+    const std::string fails = virtualPrint + "mishap = fail\n";
+    const auto logAfter = [&](const std::string& before, const std::string& settings) {
+        m_folder.write("out/NerovaMeasure.log", before);
+        measure(definition, settings);
+        takeResult();
+        return m_log;
+    };
+    const std::string old = "2024-05-01T12:34:56Z Waiting for something\n";
+    EXPECT_THAT(logAfter(old, fails),
+                testing::MatchesRegex("20[^ ]*Z the instrument failed at patch 1, [^\n]*\n"));
+    EXPECT_EQ(logAfter(old, virtualPrint), ""); // Nothing to report.
+    for (const std::string& other :
+         {std::string("CGATS.17\nand more than a time\n"), old.substr(1)})
+        EXPECT_EQ(logAfter(other, fails), other);
+}
+
 // One installation is a whole system root.
 TEST_F(MeasureTool, IsInstalledWithItsSuite) {
     const support::SuiteRoot root("a root");
