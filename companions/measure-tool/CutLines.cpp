@@ -216,10 +216,11 @@ void dropCutCells(const TableLines& table) {
     const Separator separator = separatorOf(table);
     const Cells nameCells = cellsOf(table.names, separator);
     std::vector<std::string> names(nameCells.begin(), nameCells.end());
-    const bool namesCut = mayBeCut(table.names);
-    const bool anyCut =
-        namesCut || std::any_of(table.rows.begin(), table.rows.end(),
-                                [](const auto& row) { return isRow(row) && mayBeCut(row); });
+    const bool namesCut = table.isWritten && mayBeCut(table.names);
+    const bool rowsCut =
+        table.isWritten && std::any_of(table.rows.begin(), table.rows.end(),
+                                       [](const auto& row) { return isRow(row) && mayBeCut(row); });
+    const bool anyCut = namesCut || rowsCut;
     if (anyCut && separator == Separator::Unknown)
         refuse("the definition has lines that may have lost their end, and its columns can't be "
                "told apart: in the strip, tabs separate them");

@@ -12,6 +12,7 @@ struct TableLines {
     std::string& names;          ///< The one line that names the columns.
     std::span<std::string> rows; ///< Blank lines and comments may be among them.
     std::size_t fieldCount = 0;  ///< As NUMBER_OF_FIELDS states it; 0 if nothing does.
+    bool isWritten = true;       ///< False for a strip as it is, which no writer has cut.
 };
 
 /// The writer ends each line after 511 bytes, and earlier by one byte for each byte that its

@@ -48,6 +48,9 @@ constexpr std::string_view fillings[] = {
     "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00",
 };
 
+/// The line by which a definition differs from a strip that was given by hand.
+constexpr const char* writer = "ORIGINATOR \"Nerova Verify\"";
+
 /// Makes the reader take values as they are, instead of judging their scale by the largest.
 constexpr const char* statedScales = "TINTGATE_SCALES \"device 100, XYZ 100, spectra 1\"";
 
@@ -130,7 +133,9 @@ Lines prepare(Lines& lines) {
     const std::size_t fieldCount = countIn(lines, "NUMBER_OF_FIELDS", firstRow);
     Lines numbers = takeFillings(lines, firstRow, lastRow);
     const auto rows = std::span(lines).subspan(firstRow, lastRow - firstRow - numbers.size());
-    dropCutCells({lines[names], rows, fieldCount});
+    const auto header = std::span(lines).first(format);
+    const bool isWritten = std::find(header.begin(), header.end(), writer) != header.end();
+    dropCutCells({lines[names], rows, fieldCount, isWritten});
     return numbers;
 }
 

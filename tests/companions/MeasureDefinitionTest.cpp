@@ -212,7 +212,7 @@ TEST(MeasureDefinition, IsReadRightOrRefused) {
     const support::ScratchFolder folder;
     int read = 0;
     int refused = 0;
-    for (unsigned round = 0; round < 1500; ++round) {
+    for (unsigned round = 0; round < 800; ++round) {
         const Strip strip = StripMaker(first + round).make();
         SCOPED_TRACE("TINTGATE_SEED=" + std::to_string(first + round) + "\n" + strip.text);
         KZJobDataStruct job;
@@ -243,8 +243,8 @@ TEST(MeasureDefinition, IsReadRightOrRefused) {
         }
     }
     // Both kinds are met, or the test is worth nothing.
-    EXPECT_GT(read, 500);
-    EXPECT_GT(refused, 100);
+    EXPECT_GT(read, 250);
+    EXPECT_GT(refused, 50);
 }
 
 } // namespace

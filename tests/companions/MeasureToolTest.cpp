@@ -65,6 +65,9 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
          "1: 100 0 0 5 0; 2: 0 0 0 0 0; 3: 0 0 0 0 0; "},
         {table("RGB_R\tRGB_G\tRGB_B" + lab, "1\t0\t20\t100\t3\t0\t0\n2" + whiteRgb + "END_DATA"),
          "1: 0 20 100; 2: 100 100 100; "},
+        // A strip that was given by hand has lost nothing.
+        {"CGATS.17\n" + format("SAMPLE_NAME\t" + cmyk) + begin + "1\tGröße\t100\t0\t0\t0\n" + end,
+         "1: 100 0 0 0; "},
         {"", "", 4, "is neither"},
         {head + format(cmyk) + begin + "1\t100", "", 4, "is damaged or cut off"},
         {table("SAMPLE_NAME\t" + cmyk + "\tSPOT_1", "1\tGrün\t0\t0\t0\t0\t10\n" + end), "", 4,
