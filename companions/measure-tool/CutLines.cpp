@@ -8,7 +8,9 @@
 #include "companions/measure-tool/CutLines.h"
 
 #include <algorithm>
+#include <cctype>
 #include <charconv>
+#include <iterator>
 #include <string_view>
 #include <vector>
 
@@ -114,12 +116,28 @@ bool isReference(Quantity quantity) {
     throw Failure(Status::BadDefinition, problem);
 }
 
-/// A cut list of columns ends in a damaged name, which says nothing, and the columns after it are
-/// unknown. They are taken for references if the one before is one.
+/// A name up to its first digit, in capitals.
+std::string startOf(const std::string& name) {
+    std::string start = name.substr(0, name.find_first_of("0123456789"));
+    std::transform(start.begin(), start.end(), start.begin(),
+                   [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
+    return start;
+}
+
+/// A cut list of columns ends in a damaged name, and the columns after it are unknown. They are
+/// taken for references if the name before is one, and the damaged name may be another.
 void checkCutNames(std::vector<std::string>& names) {
     const std::size_t whole = names.size() - 1;
     const auto meanings = colour::cgats::meaningsOf(names);
-    if (whole == 0 || !isReference(meanings[whole - 1].quantity))
+    const std::string damaged = startOf(names[whole]);
+    bool references = whole > 0 && isReference(meanings[whole - 1].quantity);
+    if (references) {
+        const std::string continued[] = {startOf(names[whole - 1]), "LAB_", "XYZ_"};
+        references =
+            std::any_of(std::begin(continued), std::end(continued),
+                        [&](const std::string& start) { return start.starts_with(damaged); });
+    }
+    if (!references)
         refuse("the definition's list of columns has lost its end: in the strip it has at most "
                "511 bytes, and names outside ASCII take more of them");
     names[whole] = "-";

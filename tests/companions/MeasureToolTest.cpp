@@ -77,6 +77,11 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
         {table(cmyk + "\tSPOT_485", "1\t0\t0\t0\t0\t9\n" + end), "", 5, "other colorants"},
         {table(cmyk, "1\t100\t0\t0\t0\n2\t0\t120\t0\t0\n" + end), "", 4,
          "row 2 of the definition has 120 for CMYK_M, which is beyond 100 percent"},
+        // The last name may have been SPOT_485, or that of a column before other inks.
+        {table("Größe\t" + cmyk + "\tLAB_L\tSPOT_4", "1\tx\t0\t0\t0\t0\t50\t20\n" + end), "", 4,
+         "list of columns has lost its end"},
+        {table("Größe\t" + cmyk, "1\tx\t0\t0\t0\t0\n" + end), "", 4,
+         "list of columns has lost its end"},
         {table("CMYK_C\tCMYK_M\tCMYK_Y", "1\t0\t0\t0\t100\n" + end), "", 4,
          "more cells than columns are named"},
         {table(cmyk + "\tSPOT_1", "1\t0\t0\t0\t0\t9\n" + end), "", 5, "other colorants"},
