@@ -226,6 +226,11 @@ TEST_F(MeasureTool, KeepsItsLogAndNobodyElsesFile) {
     for (const std::string& other :
          {std::string("CGATS.17\nand more than a time\n"), old.substr(1)})
         EXPECT_EQ(logAfter(other, fails), other);
+    // The measurement itself may have the name.
+    std::string options = support::contentsOf(writeOptions());
+    options.replace(options.find(m_output), m_output.size(), m_logPath);
+    support::run({MEASURE_TOOL, m_folder.write("options", options)}, environmentWith(fails));
+    EXPECT_FALSE(support::exists(m_logPath));
 }
 
 // One installation is a whole system root.
