@@ -46,6 +46,9 @@ std::string namesFile() {
 
 /// The name of `id` in the lines of a names file; empty where they have none.
 std::string_view nameIn(std::string_view lines, unsigned int id) {
+    constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF"; // some editors put it before UTF-8
+    if (lines.starts_with(byteOrderMark))
+        lines.remove_prefix(byteOrderMark.size());
     while (!lines.empty()) {
         const std::size_t end = lines.find('\n');
         const std::string_view line = trimmed(lines.substr(0, end));

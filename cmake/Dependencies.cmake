@@ -30,6 +30,7 @@ pkg_check_modules(sqlite3 REQUIRED IMPORTED_TARGET sqlite3)
 pkg_check_modules(libsodium REQUIRED IMPORTED_TARGET libsodium)
 pkg_check_modules(expat REQUIRED IMPORTED_TARGET expat)
 pkg_check_modules(libmd REQUIRED IMPORTED_TARGET libmd)
+pkg_check_modules(libsystemd REQUIRED IMPORTED_TARGET libsystemd)
 # The store's plug-in loads libpq itself, when it is needed: only the headers are for building.
 pkg_check_modules(libpq REQUIRED IMPORTED_TARGET libpq)
 add_library(libpqheaders INTERFACE)

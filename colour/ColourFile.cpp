@@ -21,6 +21,10 @@ constexpr std::size_t maxStreamBytes = std::size_t{512} << 20;
 /// How long a pipe may stay silent.
 constexpr int patience = 30'000; // ms
 
+/// How long nobody may have a pipe open to write. A writer that starts together with the reader
+/// takes a moment.
+constexpr int patienceForWriter = 2'000; // ms
+
 /// Enough to tell whether the rest is worth reading.
 constexpr std::size_t headBytes = std::size_t{64} << 10;
 
@@ -39,18 +43,30 @@ class Descriptor {
     int m_number;
 };
 
+/// What is read from, and how long to wait for it.
+struct Source {
+    int descriptor;
+    bool isStream;
+    bool awaitsWriter; ///< Nothing has shown yet that anybody has the pipe open to write.
+};
+
 /// One read that waits for data but not for ever. Bytes read, 0 at the end, -1 for a failure.
-ssize_t readSome(int descriptor, bool isStream, char* target, std::size_t room) {
+ssize_t readSome(Source& source, char* target, std::size_t room) {
     while (true) {
-        if (isStream) {
-            pollfd wait{descriptor, POLLIN, 0};
-            const int ready = poll(&wait, 1, patience);
+        bool silent = false;
+        if (source.isStream) {
+            pollfd wait{source.descriptor, POLLIN, 0};
+            const int ready = poll(&wait, 1, source.awaitsWriter ? patienceForWriter : patience);
             if (ready < 0 && errno == EINTR)
                 continue;
-            if (ready <= 0)
+            silent = ready == 0;
+            if (ready < 0 || (silent && !source.awaitsWriter))
                 return -1;
         }
-        const ssize_t count = read(descriptor, target, room);
+        const ssize_t count = read(source.descriptor, target, room);
+        if (silent && count == 0)
+            return -1; // poll does not report a pipe without a writer, but read finds its end
+        source.awaitsWriter = false;
         if (count >= 0 || (errno != EINTR && errno != EAGAIN))
             return count;
     }
@@ -82,6 +98,7 @@ Failure readBytes(const std::string& path, std::size_t limit, WorthReading worth
     if (fstat(file.number(), &status) != 0 || S_ISDIR(status.st_mode))
         return Failure::Unreadable;
     const bool isStream = !S_ISREG(status.st_mode);
+    Source source{file.number(), isStream, S_ISFIFO(status.st_mode)};
     if (isStream)
         limit = std::min(limit, maxStreamBytes);
     else if (static_cast<unsigned long long>(status.st_size) > limit)
@@ -92,8 +109,7 @@ Failure readBytes(const std::string& path, std::size_t limit, WorthReading worth
     bool isHeadSeen = false;
     contents.resize(headBytes);
     while (true) {
-        const ssize_t count =
-            readSome(file.number(), isStream, contents.data() + used, contents.size() - used);
+        const ssize_t count = readSome(source, contents.data() + used, contents.size() - used);
         if (count < 0)
             return Failure::Unreadable;
         used += static_cast<std::size_t>(count);

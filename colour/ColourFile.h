@@ -26,7 +26,7 @@ Failure loadProfile(const std::string& path, Profile& profile);
 
 /// Whole contents of a file; Missing, Unreadable, TooLarge (above `limit`) or OutOfMemory. Devices
 /// and pipes are read to their end, but no more than 512 MB of them (TooLarge), and a pipe that
-/// stays silent for 30 seconds is Unreadable.
+/// stays silent for 30 seconds is Unreadable, and so is one that nobody opens to write within 2.
 Failure readWholeFile(const std::string& path, std::size_t limit, std::string& bytes);
 
 /// True unless `path` is a regular file with contents of another kind than CGATS text. False for a

@@ -6,10 +6,10 @@ packages=(
   # To build
   g++ cmake ninja-build pkg-config python3 libwxgtk3.2-dev liblcms2-dev libpugixml-dev
   nlohmann-json3-dev libicu-dev libplist-dev libmd-dev libsqlite3-dev libsodium-dev libcli11-dev
-  libexpat1-dev libpq-dev libjs-chart.js
+  libexpat1-dev libpq-dev libjs-chart.js libsystemd-dev
   # To test and to measure
   libgtest-dev libgmock-dev libbenchmark-dev python3-jsonschema argyll liblcms2-utils chromium
-  postgresql pgbouncer
+  postgresql pgbouncer dbus
   # Data of printing conditions, and CMYK profiles
   icc-profiles-free libgs-common
 )

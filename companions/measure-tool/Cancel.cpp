@@ -1,14 +1,30 @@
 #include "companions/measure-tool/Cancel.h"
 
-#include <signal.h>
-#include <time.h>
+#include <algorithm>
+#include <cerrno>
+#include <cstddef>
+#include <system_error>
+#include <thread>
 
+#include <poll.h>
+#include <signal.h>
+#include <sys/eventfd.h>
+#include <sys/signalfd.h>
+#include <time.h>
+#include <unistd.h>
+
+#include "base/Descriptor.h"
 #include "companions/measure-tool/Failure.h"
 
 namespace measuring {
 namespace {
 
 constexpr int cancelling[] = {SIGINT, SIGHUP, SIGTERM};
+
+/// One wait; longer ones are made of several.
+constexpr std::chrono::milliseconds longestWait = std::chrono::hours(1);
+
+std::size_t worksLeft = 0;
 
 sigset_t cancellingSet() {
     sigset_t set;
@@ -28,6 +44,31 @@ void waitAtMost(std::chrono::nanoseconds time) {
         throw Failure(Status::Cancelled, "cancelled");
 }
 
+base::Descriptor checked(int number) {
+    if (number < 0)
+        throw std::system_error(errno, std::generic_category());
+    return base::Descriptor(number);
+}
+
+/// Waits until the event has happened. False if `end` comes first.
+bool awaitEvent(const base::Descriptor& event, Clock::time_point end) {
+    const sigset_t set = cancellingSet();
+    const base::Descriptor signals = checked(signalfd(-1, &set, SFD_CLOEXEC | SFD_NONBLOCK));
+    while (true) {
+        const auto left = end - Clock::now();
+        if (left <= Clock::duration::zero())
+            return false;
+        pollfd wait[] = {{event.get(), POLLIN, 0}, {signals.get(), POLLIN, 0}};
+        const auto limit = std::chrono::ceil<std::chrono::milliseconds>(
+            std::min<Clock::duration>(left, longestWait));
+        if (poll(wait, 2, static_cast<int>(limit.count())) < 0 && errno != EINTR)
+            throw std::system_error(errno, std::generic_category());
+        if ((wait[0].revents & POLLIN) != 0)
+            return true;
+        checkCancelled();
+    }
+}
+
 } // namespace
 
 void listenForCancel() {
@@ -40,12 +81,31 @@ void checkCancelled() {
 }
 
 void pauseFor(std::chrono::milliseconds time) {
-    const auto end = std::chrono::steady_clock::now() + time;
+    const auto end = Clock::now() + time;
     // Another signal, such as that of a changed window, ends a wait early.
-    for (auto left = end - std::chrono::steady_clock::now(); left.count() > 0;
-         left = end - std::chrono::steady_clock::now())
+    for (auto left = end - Clock::now(); left.count() > 0; left = end - Clock::now())
         waitAtMost(left);
     checkCancelled();
+}
+
+// A signal could interrupt a read only by a handler, and not even then where the file system waits
+// for a server. So the read gets a thread, which is given up.
+bool awaitWork(std::function<void()> work, Clock::time_point end) {
+    checkCancelled();
+    const auto done = std::make_shared<base::Descriptor>(checked(eventfd(0, EFD_CLOEXEC)));
+    std::thread([work = std::move(work), done] {
+        work();
+        eventfd_write(done->get(), 1);
+    }).detach();
+    ++worksLeft; // Also if the wait ends by an exception.
+    if (!awaitEvent(*done, end))
+        return false;
+    --worksLeft;
+    return true;
+}
+
+bool hasLeftWork() {
+    return worksLeft > 0;
 }
 
 } // namespace measuring

@@ -18,19 +18,21 @@
 //     4  0.00 0.00  0.00  0.00  95.00    0.00    0.00  84.00  87.00  74.00   always has these cells
 //     END_DATA
 //
-// The writer cuts a row by one byte for each byte that its characters have beyond the first, and
-// rows and names alike at 511 bytes. What goes is references, which nobody needs who measures: they
-// are taken out before the text is read.
+// The writer may have cut lines: CutLines.h describes how. Filling rows have these cells whatever
+// the columns of the strip are, so that they are taken out before the text is read.
 #include "companions/measure-tool/Definition.h"
 
 #include <algorithm>
-#include <cctype>
+#include <charconv>
+#include <cstdio>
 #include <span>
 #include <string_view>
 #include <utility>
 #include <vector>
 
+#include "colour/CgatsText.h"
 #include "colour/ColourFile.h"
+#include "companions/measure-tool/CutLines.h"
 #include "companions/measure-tool/Failure.h"
 
 namespace measuring {
@@ -38,20 +40,30 @@ namespace {
 
 constexpr std::size_t largestFile = 64 << 20;
 
+/// A rounded amount may exceed 100 percent by this much.
+constexpr double largestAmount = 101;
+
 constexpr std::string_view fillings[] = {
     "\t0.00\t0.00\t0.00\t0.00\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00",
     "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00",
 };
 
+/// The line by which a definition differs from a strip that was given by hand.
+constexpr const char* writer = "ORIGINATOR \"Nerova Verify\"";
+
+/// Makes the reader take values as they are, instead of judging their scale by the largest.
+constexpr const char* statedScales = "TINTGATE_SCALES \"device 100, XYZ 100, spectra 1\"";
+
 using Lines = std::vector<std::string>;
 
+/// Blank lines mean nothing and are left out: of a file of line ends, nothing stays.
 Lines linesOf(std::string_view text) {
     Lines lines;
     while (!text.empty()) {
-        const std::size_t end = text.find_first_of("\r\n");
-        lines.emplace_back(text.substr(0, end));
-        const bool both = end != text.npos && text.substr(end, 2) == "\r\n";
-        text.remove_prefix(end == text.npos ? text.size() : end + (both ? 2 : 1));
+        const std::size_t end = std::min(text.find_first_of("\r\n"), text.size());
+        if (end > 0)
+            lines.emplace_back(text.substr(0, end));
+        text.remove_prefix(std::min(end + 1, text.size()));
     }
     return lines;
 }
@@ -66,65 +78,6 @@ std::size_t findLine(const Lines& lines, const char* word, std::size_t first, st
     while (first < last && firstWordOf(lines[first]) != word)
         ++first;
     return first;
-}
-
-std::string upperCase(std::string name) {
-    std::transform(name.begin(), name.end(), name.begin(),
-                   [](unsigned char c) { return static_cast<char>(std::toupper(c)); });
-    return name;
-}
-
-bool isDevice(const std::string& name) {
-    const std::string upper = upperCase(name);
-    return upper.starts_with("CMYK") || upper.starts_with("RGB") || upper.starts_with("SPOT") ||
-           upper.find("CLR") != upper.npos;
-}
-
-/// True for a column of references: Lab, XYZ, or a spectral value, told by its wavelength.
-bool isReference(std::string name) {
-    name = upperCase(std::move(name));
-    for (const char* start : {"LAB_", "XYZ_", "CIE", "SPECTRAL"})
-        if (name.starts_with(start))
-            return true;
-    int digits = 0;
-    for (const char c : name) {
-        digits = c >= '0' && c <= '9' ? digits + 1 : 0;
-        if (digits == 3)
-            return true;
-    }
-    return false;
-}
-
-/// Takes away the meaning of the references' columns. Returns the number of columns up to the last
-/// one that is none, or 0 where the names are not parted by one tab each.
-std::size_t hideReferences(std::string& names) {
-    if (names.find('"') != names.npos)
-        return 0; // a name may have blanks in it
-    std::string hidden;
-    std::size_t count = 0;
-    std::size_t needed = 0;
-    bool tabs = true;
-    for (std::size_t at = 0; (at = names.find_first_not_of(" \t", at)) < names.size();) {
-        const std::size_t end = std::min(names.find_first_of(" \t", at), names.size());
-        const std::string name = names.substr(at, end - at);
-        const bool reference = isReference(name);
-        tabs = tabs && (end == names.size() || names[end] == '\t') &&
-               (at == 0 || names[at - 1] == '\t') && (at < 2 || names[at - 2] != '\t');
-        hidden.append(count == 0 ? "" : "\t").append(reference ? "-" : name);
-        ++count;
-        needed = reference ? needed : count;
-        at = end;
-    }
-    names = hidden;
-    return tabs ? needed : 0;
-}
-
-/// Takes off what stands behind so many cells parted by tabs.
-void cutBehind(std::size_t cells, std::string& line) {
-    std::size_t end = line.find('\t');
-    for (std::size_t i = 1; i < cells && end != line.npos; ++i)
-        end = line.find('\t', end + 1);
-    line.resize(std::min(end, line.size()));
 }
 
 /// The sample number of a filling row; empty for any other line.
@@ -154,16 +107,16 @@ Lines takeFillings(Lines& lines, std::size_t firstRow, std::size_t lastRow) {
     return numbers;
 }
 
-/// Where device values end a row, what was cut off is theirs, and the black of 100 reads 10.
-void checkUncut(const std::string& names, std::span<const std::string> rows) {
-    if (!isDevice(names.substr(names.find_last_of(" \t") + 1)))
-        return;
-    for (std::size_t row = 0; row < rows.size(); ++row)
-        if (std::any_of(rows[row].begin(), rows[row].end(), [](char c) { return (c & 0x80) != 0; }))
-            throw Failure(Status::BadDefinition,
-                          "row " + std::to_string(row + 1) +
-                              " of the definition has lost the end of its device values to a name "
-                              "of several bytes a character: in the strip, names go behind them");
+/// The whole number that follows a keyword in the lines before `last`; 0 if there is none.
+std::size_t countIn(const Lines& lines, const char* keyword, std::size_t last) {
+    const std::size_t line = findLine(lines, keyword, 0, last);
+    std::size_t count = 0;
+    if (line < last) {
+        const std::string& text = lines[line];
+        const std::size_t start = std::min(text.find_first_of("0123456789"), text.size());
+        std::from_chars(text.data() + start, text.data() + text.size(), count);
+    }
+    return count;
 }
 
 /// Makes a text that the reader of colour files takes whole. Returns the numbers of filling rows.
@@ -171,27 +124,22 @@ Lines prepare(Lines& lines) {
     const std::size_t format = findLine(lines, "BEGIN_DATA_FORMAT", 0, lines.size());
     const std::size_t firstRow = findLine(lines, "BEGIN_DATA", format, lines.size()) + 1;
     const std::size_t lastRow = findLine(lines, "END_DATA", firstRow, lines.size());
-    // The writer takes the names to stand on one line; where they don't, the text stays as it is.
+    // The writer expects the names on one line. A strip that was given by hand may have them on
+    // several: its lines were never cut, and it stays as it is.
     const std::size_t names = format + 1;
     if (firstRow > lines.size() ||
         findLine(lines, "END_DATA_FORMAT", format, firstRow) != names + 1)
         return {};
-    const std::size_t cells = hideReferences(lines[names]);
+    const std::size_t fieldCount = countIn(lines, "NUMBER_OF_FIELDS", firstRow);
     Lines numbers = takeFillings(lines, firstRow, lastRow);
     const auto rows = std::span(lines).subspan(firstRow, lastRow - firstRow - numbers.size());
-    checkUncut(lines[names], rows);
-    const bool tabs = std::all_of(rows.begin(), rows.end(), [](const std::string& row) {
-        return row.empty() || row.find('\t') != row.npos;
-    });
-    if (cells > 0 && tabs) {
-        cutBehind(cells, lines[names]);
-        for (std::string& row : rows)
-            cutBehind(cells, row);
-    }
+    const auto header = std::span(lines).first(format);
+    const bool isWritten = std::find(header.begin(), header.end(), writer) != header.end();
+    dropCutCells({lines[names], rows, fieldCount, isWritten});
     return numbers;
 }
 
-/// The reader tells a text that was cut off by its last line, which stays without an end.
+/// The last line stays without an end: by this the reader recognises a text that was cut off.
 std::string textOf(const Lines& lines, const std::string& original) {
     std::string text;
     for (const std::string& line : lines)
@@ -199,6 +147,36 @@ std::string textOf(const Lines& lines, const std::string& original) {
     if (!text.empty() && original.back() != '\n' && original.back() != '\r')
         text.pop_back();
     return text;
+}
+
+/// Amounts of ink are percent, whatever the largest is: a strip with one row of 120 is damaged, and
+/// not a strip of 0 to 255, in which cyan 100 would be 39 percent.
+void takeAmountsAsPercent(Lines lines, const std::string& original, colour::DataSet& set) {
+    lines.insert(lines.begin() + 1, statedScales);
+    colour::DataSet stated;
+    if (colour::readCgats(textOf(lines, original), {.spectra = false}, stated) !=
+            colour::Failure::None ||
+        stated.device.size() != set.device.size())
+        return;
+    // Fractions of 1 are left to the reader, which makes percent of them.
+    const double largest = *std::max_element(stated.device.begin(), stated.device.end());
+    if (largest > 1)
+        set.device = std::move(stated.device);
+}
+
+void checkAmounts(const colour::DataSet& set) {
+    const auto wrong = std::find_if(set.device.begin(), set.device.end(),
+                                    [](double value) { return value > largestAmount; });
+    if (wrong == set.device.end())
+        return;
+    const auto index = static_cast<std::size_t>(wrong - set.device.begin());
+    const std::size_t channels = set.channels.size();
+    char amount[32];
+    std::snprintf(amount, sizeof amount, "%.6g", *wrong);
+    throw Failure(Status::BadDefinition, "row " + std::to_string(index / channels + 1) +
+                                             " of the definition has " + amount + " for " +
+                                             set.channels[index % channels] +
+                                             ", which is beyond 100 percent");
 }
 
 void addPaper(colour::DataSet& chart, const Lines& numbers) {
@@ -213,23 +191,31 @@ void addPaper(colour::DataSet& chart, const Lines& numbers) {
     }
 }
 
+/// What ILLUMINATION_CONDITION asks for: 0 to 3 are M0 to M3, and -1 is any. Other numbers have no
+/// meaning that an export could be held against.
+std::string conditionIn(const std::string& bytes) {
+    const std::string number =
+        colour::cgatsKeyword(bytes, "ILLUMINATION_CONDITION").value_or(std::string());
+    const bool known = number.size() == 1 && number[0] >= '0' && number[0] <= '3';
+    return known ? "M" + number : std::string();
+}
+
 } // namespace
 
-colour::DataSet readDefinition(const std::string& path) {
+Definition readDefinition(const std::string& path) {
     std::string bytes;
     expectUsable(colour::readWholeFile(path, largestFile, bytes), Status::BadDefinition, path);
     Lines lines = linesOf(bytes);
     const Lines numbers = prepare(lines);
     colour::DataSet set;
-    const colour::CgatsWants wants{.spectra = false};
-    colour::Failure failure = colour::readCgats(textOf(lines, bytes), wants, set);
-    // Where references are all that there is, ids have to tell the patches apart.
-    if (failure == colour::Failure::NoColourValues && numbers.empty())
-        failure = colour::readCgats(bytes, wants, set);
-    expectUsable(failure, Status::BadDefinition, path);
-    colour::DataSet chart = colour::chartOf(std::move(set));
-    addPaper(chart, numbers);
-    return chart;
+    expectUsable(colour::readCgats(textOf(lines, bytes), {.spectra = false}, set),
+                 Status::BadDefinition, path);
+    if (set.hasDevice() && set.deviceSpace != colour::DeviceSpace::Rgb)
+        takeAmountsAsPercent(lines, bytes, set);
+    checkAmounts(set);
+    Definition definition{colour::chartOf(std::move(set)), conditionIn(bytes)};
+    addPaper(definition.chart, numbers);
+    return definition;
 }
 
 } // namespace measuring

@@ -7,11 +7,17 @@
 
 namespace measuring {
 
-/// Reads a definition: ids, names and device values of its patches, in their order, without any
-/// colours. Throws Failure (BadDefinition) where that can't be done.
+struct Definition {
+    colour::DataSet chart; ///< Ids, names and device values of the patches, in order; no colours.
+    std::string condition; ///< "M0" to "M3", as ISO 13655 names them; empty if any will do.
+};
+
+/// Reads a definition. Throws Failure (BadDefinition) if that can't be done.
 ///
-/// All that the writer makes of a strip is read: references that are cut off at the end of their
-/// rows, and filling rows that don't have the strip's columns, which become patches of paper.
-colour::DataSet readDefinition(const std::string& path);
+/// Reads all that the writer makes of a strip: references that are cut off at the end of their
+/// rows, and filling rows that don't have the strip's columns and become patches of paper. Refuses
+/// rows that may have lost ids or device values (see CutLines.h), and amounts of ink above 100 %:
+/// columns of inks are in percent, columns of RGB may be from 0 to 255.
+Definition readDefinition(const std::string& path);
 
 } // namespace measuring

@@ -1,9 +1,14 @@
 #include "companions/measure-tool/ExportedMeasurement.h"
 
-#include <sys/stat.h>
-
+#include <cerrno>
+#include <cstring>
+#include <filesystem>
+#include <optional>
 #include <string>
 #include <utility>
+
+#include <sys/stat.h>
+#include <unistd.h>
 
 #include "colour/ColourFile.h"
 #include "companions/measure-tool/Cancel.h"
@@ -13,10 +18,13 @@
 namespace measuring {
 namespace {
 
-/// So long an exported file must not change before it counts as written.
+/// An exported file must not change for this long before it counts as written.
 constexpr std::chrono::milliseconds rest{300};
 
-/// What tells one state of a file from another.
+/// A file that can't be read may still be half written. The operator hears of it after this time.
+constexpr std::chrono::seconds slowWriter{3};
+
+/// What distinguishes one state of a file from another.
 struct State {
     bool exists = false;
     dev_t device = 0;
@@ -37,7 +45,21 @@ State stateOf(const std::string& path) {
             {status.st_mtim.tv_sec, status.st_mtim.tv_nsec}};
 }
 
-/// Loads a file that has colours. Throws Failure (BadExport) where it is none.
+/// An export can never come if its folder is not there. Better to say so before anybody measures.
+void checkFolder(const std::string& path) {
+    const std::filesystem::path parent = std::filesystem::path(path).parent_path();
+    const std::string folder = parent.empty() ? "." : parent.string();
+    struct stat status {};
+    const bool found = stat(folder.c_str(), &status) == 0;
+    if (found && S_ISDIR(status.st_mode) && access(folder.c_str(), X_OK) == 0)
+        return;
+    const char* const reason =
+        found && !S_ISDIR(status.st_mode) ? std::strerror(ENOTDIR) : std::strerror(errno);
+    throw Failure(Status::BadExport,
+                  folder + ", the folder of the export, can't be used: " + reason);
+}
+
+/// Loads a file that has colours. Throws Failure (BadExport) if it has none.
 colour::DataSet load(const std::string& path) {
     colour::ColourFile file;
     expectUsable(colour::loadColourFile(path, {}, file), Status::BadExport, path);
@@ -46,39 +68,126 @@ colour::DataSet load(const std::string& path) {
     return std::move(*file.set);
 }
 
-/// Waits for a file that is newly written, and loads it. One that can't be used may be half written
-/// by somebody slow: there is time for it to become better.
-colour::DataSet awaitAndLoad(const std::string& path, std::chrono::seconds patience) {
-    const auto end = std::chrono::steady_clock::now() + patience;
-    std::string problem = path + " was not exported in time";
-    State known = stateOf(path); // too old, or tried in vain
-    for (State last = known; std::chrono::steady_clock::now() < end;) {
-        pauseFor(rest);
-        const State now = stateOf(path);
-        const bool atRest = now == last;
-        last = now;
-        if (!now.exists || !atRest || now == known)
-            continue;
-        known = now;
-        try {
-            return load(path);
-        } catch (const Failure& failure) {
-            problem = failure.what();
-        }
-    }
-    throw Failure(Status::BadExport, problem);
-}
+struct Accepted {
+    colour::DataSet set;
+    std::vector<std::size_t> rows;
+};
 
-} // namespace
-
-ExportedMeasurement::ExportedMeasurement(const Settings& settings, const colour::DataSet& chart)
-    : m_set(settings.wait.count() > 0 ? awaitAndLoad(settings.file, settings.wait)
-                                      : load(settings.file)) {
+/// Throws Failure (OtherPatches, OtherCondition) unless the export is what was asked for.
+Accepted accept(colour::DataSet set, const Settings& settings, const Definition& definition) {
+    const std::string& stated = set.conditions.measurement;
+    if (!definition.condition.empty() && !stated.empty() && stated != definition.condition)
+        throw Failure(Status::OtherCondition, settings.file + " was measured under " + stated +
+                                                  ", and the job asks for " + definition.condition);
     try {
-        m_rows = matchPatches(chart, m_set);
+        std::vector<std::size_t> rows = matchPatches(definition.chart, set, settings.bareIds);
+        return {std::move(set), std::move(rows)};
     } catch (const Failure& failure) {
         throw Failure(failure.status, settings.file + ": " + failure.what());
     }
+}
+
+/// Waits for a file that is newly written and can be accepted.
+class Wait {
+  public:
+    Wait(const Settings& settings, const Definition& definition, Operator& person)
+        : m_settings(settings), m_definition(definition), m_person(person),
+          m_end(Clock::now() + settings.wait) {}
+
+    Accepted run() {
+        const std::optional<State> known = look();
+        if (!known)
+            giveUp();
+        m_tried = m_last = *known;
+        m_person.askForExport(m_settings.file, m_end);
+        while (Clock::now() < m_end) {
+            pauseFor(rest);
+            m_person.showTime();
+            if (m_open && Clock::now() - m_failed >= slowWriter)
+                report();
+            if (!isNew())
+                continue;
+            if (std::optional<Accepted> accepted = attempt())
+                return std::move(*accepted);
+        }
+        giveUp();
+    }
+
+  private:
+    std::optional<State> look() const {
+        return resultBefore(m_end, [path = m_settings.file] { return stateOf(path); });
+    }
+
+    /// True if there is a file at rest that was not tried yet.
+    bool isNew() {
+        const State now = look().value_or(State());
+        const bool atRest = now == m_last;
+        m_last = now;
+        if (!now.exists || !atRest || now == m_tried)
+            return false;
+        m_tried = now;
+        return true;
+    }
+
+    std::optional<Accepted> attempt() {
+        try {
+            auto set = resultBefore(m_end, [path = m_settings.file] { return load(path); });
+            if (!set)
+                return std::nullopt;
+            return accept(std::move(*set), m_settings, m_definition);
+        } catch (const Failure& failure) {
+            if (failure.status == Status::Cancelled || failure.status == Status::OutOfMemory)
+                throw;
+            m_problem.emplace(failure);
+            m_failed = Clock::now();
+            m_open = true;
+            if (failure.status != Status::BadExport)
+                report();
+            return std::nullopt;
+        }
+    }
+
+    void report() {
+        m_open = false;
+        m_person.refuse(m_problem->what());
+    }
+
+    [[noreturn]] void giveUp() const {
+        if (!m_problem)
+            throw Failure(Status::BadExport, m_settings.file + " was not exported in time");
+        throw Failure(m_problem->status,
+                      std::string(m_problem->what()) + "; no other export came in time");
+    }
+
+    const Settings& m_settings;
+    const Definition& m_definition;
+    Operator& m_person;
+    const Clock::time_point m_end;
+    State m_tried; ///< Too old, or tried in vain.
+    State m_last;
+    std::optional<Failure> m_problem; ///< Of the last attempt.
+    Clock::time_point m_failed;
+    bool m_open = false; ///< The operator does not know of the problem yet.
+};
+
+} // namespace
+
+ExportedMeasurement::ExportedMeasurement(const Settings& settings, const Definition& definition,
+                                         Operator& person) {
+    const std::string& path = settings.file;
+    unlessCancelled([path] {
+        checkFolder(path);
+        return true;
+    });
+    Accepted accepted =
+        settings.wait.count() > 0
+            ? Wait(settings, definition, person).run()
+            : accept(unlessCancelled([path] { return load(path); }), settings, definition);
+    m_set = std::move(accepted.set);
+    m_rows = std::move(accepted.rows);
+    if (!definition.condition.empty() && m_set.conditions.measurement.empty())
+        person.remark(path + " does not state its measurement condition, and the job asks for " +
+                      definition.condition);
 }
 
 void ExportedMeasurement::describe(colour::DataSet& measurement) const {

@@ -1,18 +1,26 @@
 // A measurement that an instrument's own software has exported.
 #pragma once
 
+#include <cstddef>
+#include <vector>
+
+#include "companions/measure-tool/Definition.h"
 #include "companions/measure-tool/Instrument.h"
+#include "companions/measure-tool/Operator.h"
 #include "companions/measure-tool/Settings.h"
 
 namespace measuring {
 
-/// Hands over what was exported for the patches of a chart.
+/// Hands over what was exported for the patches of a definition.
 class ExportedMeasurement : public Instrument {
   public:
-    /// Takes the file that is there or, with a time to wait, one that is newly written: it differs
-    /// from the one that was there, and has come to rest. Throws Failure: BadExport, OtherPatches,
-    /// Cancelled.
-    ExportedMeasurement(const Settings& settings, const colour::DataSet& chart);
+    /// Takes the file that is there. With a time to wait, it asks the operator instead and takes a
+    /// file that is newly written: it differs from the one that was there, and has come to rest.
+    /// A file that can't be accepted is reported to the operator, and the wait goes on; when the
+    /// time is up, the last such problem is the failure.
+    ///
+    /// Throws Failure: BadExport, OtherPatches, OtherCondition, Cancelled.
+    ExportedMeasurement(const Settings& settings, const Definition& definition, Operator& person);
 
     void describe(colour::DataSet& measurement) const override;
     Reading measure(std::size_t patch) override;

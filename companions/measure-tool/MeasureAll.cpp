@@ -54,6 +54,7 @@ colour::DataSet measureAll(const colour::DataSet& chart, Instrument& instrument,
     const std::size_t mishapAt = std::min(settings.mishapAt.value_or(middle), count) - 1;
     colour::DataSet measurement = chart;
     instrument.describe(measurement);
+    progress.begin(chart);
     for (std::size_t patch = 0; patch < count; ++patch) {
         if (patch == mishapAt)
             meet(settings.mishap, patch);

@@ -14,32 +14,24 @@ namespace measuring {
 namespace {
 
 using colour::DataSet;
+using Labels = std::vector<std::string>;
 using Rows = std::vector<std::size_t>;
+
+constexpr std::size_t none = ~std::size_t{0};
 
 /// Other software exports whole percents, or what 0 to 255 makes of them.
 constexpr double rounding = 0.51; ///< In percent.
 
-/// Channels that a set lacks are 0: a process chart goes with one that has unused spot channels.
-double deviceValue(const DataSet& set, std::size_t patch, std::size_t channel) {
-    const std::size_t channels = set.channels.size();
-    return channel < channels ? set.device[patch * channels + channel] : 0;
+/// With more unpaired patches than this, nearly all are wrong, and it does not matter which one a
+/// message names.
+constexpr std::size_t mostCompared = 2000;
+
+[[noreturn]] void refuse(const std::string& text) {
+    throw Failure(Status::OtherPatches, text);
 }
 
-/// Row by row in the order at hand. False, with the first row that differs, if they are not.
-bool sameInOrder(const DataSet& chart, const DataSet& measured, std::size_t& differing) {
-    const std::size_t channels = std::max(chart.channels.size(), measured.channels.size());
-    for (std::size_t patch = 0; patch < chart.patchCount; ++patch)
-        for (std::size_t channel = 0; channel < channels; ++channel)
-            if (std::abs(deviceValue(chart, patch, channel) -
-                         deviceValue(measured, patch, channel)) > rounding) {
-                differing = patch;
-                return false;
-            }
-    return true;
-}
-
-/// Pairs equal keys, the first of the chart with the first of the measurement. Gives rows up to the
-/// first patch that has no counterpart.
+/// Pairs equal keys, the first of the chart with the first of the measurement. A patch without a
+/// counterpart gets no row.
 template<class Key>
 Rows pairByKeys(const std::vector<Key>& chart, const std::vector<Key>& measured) {
     std::map<Key, Rows> rowsOf;
@@ -48,12 +40,57 @@ Rows pairByKeys(const std::vector<Key>& chart, const std::vector<Key>& measured)
     Rows rows;
     for (const Key& key : chart) {
         const auto found = rowsOf.find(key);
-        if (found == rowsOf.end() || found->second.empty())
-            break;
-        rows.push_back(found->second.back());
-        found->second.pop_back();
+        const bool missing = found == rowsOf.end() || found->second.empty();
+        rows.push_back(missing ? none : found->second.back());
+        if (!missing)
+            found->second.pop_back();
     }
     return rows;
+}
+
+std::size_t firstWithout(const Rows& rows) {
+    return static_cast<std::size_t>(std::find(rows.begin(), rows.end(), none) - rows.begin());
+}
+
+std::size_t countOfPairs(const Rows& rows) {
+    return rows.size() - static_cast<std::size_t>(std::count(rows.begin(), rows.end(), none));
+}
+
+/// Rows from 0 to `count` that belong to no patch.
+Rows unpaired(const Rows& rows, std::size_t count) {
+    std::vector<bool> paired(count);
+    for (const std::size_t row : rows)
+        if (row != none)
+            paired[row] = true;
+    Rows left;
+    for (std::size_t row = 0; row < count; ++row)
+        if (!paired[row])
+            left.push_back(row);
+    return left;
+}
+
+std::string nameOf(const DataSet& set, std::size_t patch) {
+    return set.ids.empty() ? std::to_string(patch + 1) : set.ids[patch];
+}
+
+// Device values ------------------------------------------------------------------------------
+
+/// Channels that a set lacks are 0: a process chart goes with one that has unused spot channels.
+double deviceValue(const DataSet& set, std::size_t patch, std::size_t channel) {
+    const std::size_t channels = set.channels.size();
+    return channel < channels ? set.device[patch * channels + channel] : 0;
+}
+
+std::size_t channelsOf(const DataSet& chart, const DataSet& measured) {
+    return std::max(chart.channels.size(), measured.channels.size());
+}
+
+bool alike(const DataSet& chart, std::size_t patch, const DataSet& measured, std::size_t row) {
+    for (std::size_t channel = 0; channel < channelsOf(chart, measured); ++channel)
+        if (std::abs(deviceValue(chart, patch, channel) - deviceValue(measured, row, channel)) >
+            rounding)
+            return false;
+    return true;
 }
 
 /// Device values in hundredths of a percent, as sets of the same origin state them.
@@ -71,65 +108,131 @@ bool comparableDevices(const DataSet& chart, const DataSet& measured) {
     return chart.deviceSpace != colour::DeviceSpace::Other || chart.channels == measured.channels;
 }
 
-std::string nameOf(const DataSet& set, std::size_t patch) {
-    return set.ids.empty() ? std::to_string(patch + 1) : set.ids[patch];
+/// Gives patches without a row one that is alike.
+void pairAlike(const DataSet& chart, const DataSet& measured, Rows& rows) {
+    Rows left = unpaired(rows, measured.patchCount);
+    if (left.size() > mostCompared)
+        return;
+    for (std::size_t patch = 0; patch < rows.size(); ++patch) {
+        if (rows[patch] != none)
+            continue;
+        const auto row = std::find_if(left.begin(), left.end(), [&](std::size_t candidate) {
+            return alike(chart, patch, measured, candidate);
+        });
+        if (row != left.end()) {
+            rows[patch] = *row;
+            left.erase(row);
+        }
+    }
 }
 
-[[noreturn]] void refuse(const std::string& text) {
-    throw Failure(Status::OtherPatches, text);
+/// Names what is wrong: in the strip's order if the rows fit better that way, else in any order.
+[[noreturn]] void refuseDevices(const DataSet& chart, const DataSet& measured, Rows rows) {
+    std::size_t inOrder = 0;
+    std::size_t differing = none;
+    for (std::size_t patch = chart.patchCount; patch-- > 0;) {
+        const bool fits = alike(chart, patch, measured, patch);
+        inOrder += fits ? 1 : 0;
+        differing = fits ? differing : patch;
+    }
+    pairAlike(chart, measured, rows);
+    const std::size_t pairs = countOfPairs(rows);
+    if (pairs == rows.size())
+        refuse("the patches are in another order and their device values are rounded: they must "
+               "be in the strip's order, or not rounded");
+    if (inOrder > 0 && inOrder >= pairs)
+        refuse("patch " + nameOf(chart, differing) + " should be " + deviceText(chart, differing) +
+               ", and row " + std::to_string(differing + 1) + " is " +
+               deviceText(measured, differing));
+    const std::size_t missing = firstWithout(rows);
+    const std::size_t surplus = unpaired(rows, measured.patchCount).front();
+    refuse("there is no patch " + nameOf(chart, missing) + ", which is " +
+           deviceText(chart, missing) + ", and row " + std::to_string(surplus + 1) + ", which is " +
+           deviceText(measured, surplus) + ", was not asked for");
 }
 
 Rows matchDevices(const DataSet& chart, const DataSet& measured) {
-    std::size_t differing = 0;
-    if (sameInOrder(chart, measured, differing)) {
-        Rows rows(chart.patchCount);
-        std::iota(rows.begin(), rows.end(), std::size_t{0});
+    Rows rows(chart.patchCount);
+    std::iota(rows.begin(), rows.end(), std::size_t{0});
+    if (std::all_of(rows.begin(), rows.end(),
+                    [&](std::size_t patch) { return alike(chart, patch, measured, patch); }))
         return rows;
-    }
-    const std::size_t channels = std::max(chart.channels.size(), measured.channels.size());
-    Rows rows = pairByKeys(deviceKeys(chart, channels), deviceKeys(measured, channels));
-    if (rows.size() < chart.patchCount) {
-        const std::size_t patch = std::max(rows.size(), differing);
-        refuse("patch " + nameOf(chart, patch) + " should be " + deviceText(chart, patch) +
-               ", and row " + std::to_string(patch + 1) + " is " + deviceText(measured, patch));
-    }
+    const std::size_t channels = channelsOf(chart, measured);
+    rows = pairByKeys(deviceKeys(chart, channels), deviceKeys(measured, channels));
+    if (firstWithout(rows) < rows.size())
+        refuseDevices(chart, measured, std::move(rows));
     return rows;
 }
 
-Rows matchLabels(const DataSet& chart, const DataSet& measured) {
+// Labels -------------------------------------------------------------------------------------
+
+/// "0012" becomes "12"; other labels stay.
+Labels withoutZeros(Labels labels) {
+    for (std::string& label : labels)
+        if (label.find_first_not_of("0123456789") == label.npos)
+            label.erase(0, std::min(label.find_first_not_of('0'), label.size() - 1));
+    return labels;
+}
+
+/// True if the labels are the numbers 1 to N, in any order.
+bool areCounted(const Labels& labels) {
+    Labels present = withoutZeros(labels);
+    Labels counted;
+    for (std::size_t number = 1; number <= labels.size(); ++number)
+        counted.push_back(std::to_string(number));
+    std::sort(present.begin(), present.end());
+    std::sort(counted.begin(), counted.end());
+    return present == counted;
+}
+
+Rows pairLabels(const Labels& wanted, const Labels& present) {
+    Rows rows = pairByKeys(wanted, present);
+    if (firstWithout(rows) < rows.size())
+        rows = pairByKeys(withoutZeros(wanted), withoutZeros(present));
+    return rows;
+}
+
+Rows matchLabels(const DataSet& chart, const DataSet& measured, bool bareIds) {
     // An export may call a name what the strip calls an id.
-    const std::pair<const std::vector<std::string>*, const std::vector<std::string>*> ways[] = {
-        {&chart.ids, &measured.ids},
-        {&chart.names, &measured.names},
-        {&chart.ids, &measured.names},
-        {&chart.names, &measured.ids}};
+    const std::pair<const Labels*, const Labels*> ways[] = {{&chart.ids, &measured.ids},
+                                                            {&chart.names, &measured.names},
+                                                            {&chart.ids, &measured.names},
+                                                            {&chart.names, &measured.ids}};
     Rows best;
-    bool labelled = false;
+    const Labels* bestLabels = nullptr;
+    bool onlyCounted = false;
     for (const auto& [wanted, present] : ways) {
         if (wanted->empty() || present->empty())
             continue;
-        labelled = true;
-        Rows rows = pairByKeys(*wanted, *present);
-        if (rows.size() == chart.patchCount)
-            return rows;
-        if (rows.size() > best.size())
+        Rows rows = pairLabels(*wanted, *present);
+        if (firstWithout(rows) == rows.size()) {
+            if (bareIds || !areCounted(*wanted))
+                return rows;
+            onlyCounted = true;
+        } else if (bestLabels == nullptr || countOfPairs(rows) > countOfPairs(best)) {
             best = std::move(rows);
+            bestLabels = wanted;
+        }
     }
-    if (!labelled)
+    if (onlyCounted)
+        refuse("only the ids 1 to " + std::to_string(chart.patchCount) +
+               " identify the patches, and every strip of as many patches has these; the setting "
+               "match = ids accepts them");
+    if (bestLabels == nullptr)
         refuse("neither device values nor ids tell which patches were measured");
-    refuse("there is no patch " + nameOf(chart, best.size()));
+    refuse("there is no patch " + (*bestLabels)[firstWithout(best)]);
 }
 
 } // namespace
 
-std::vector<std::size_t> matchPatches(const DataSet& chart, const DataSet& measured) {
+std::vector<std::size_t> matchPatches(const DataSet& chart, const DataSet& measured, bool bareIds) {
     if (chart.patchCount != measured.patchCount)
         refuse("there are " + std::to_string(measured.patchCount) + " patches where " +
                std::to_string(chart.patchCount) + " were asked for");
     if (chart.hasDevice() && measured.hasDevice() && !comparableDevices(chart, measured))
         refuse("the device values are of other colorants");
     return chart.hasDevice() && measured.hasDevice() ? matchDevices(chart, measured)
-                                                     : matchLabels(chart, measured);
+                                                     : matchLabels(chart, measured, bareIds);
 }
 
 std::string deviceText(const DataSet& set, std::size_t patch) {

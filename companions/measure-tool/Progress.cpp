@@ -3,6 +3,7 @@
 #include <unistd.h>
 
 #include "companions/measure-tool/Patches.h"
+#include "companions/measure-tool/Text.h"
 
 namespace measuring {
 namespace {
@@ -23,6 +24,12 @@ Progress::~Progress() {
         std::fputc('\n', m_terminal);
 }
 
+void Progress::begin(const colour::DataSet& chart) {
+    const std::string first = deviceText(chart, 0);
+    line("Measuring " + std::to_string(chart.patchCount) + " patches" +
+         (first.empty() ? "" : ", the first is " + first));
+}
+
 void Progress::show(const colour::DataSet& measurement, std::size_t done, std::size_t total) {
     const auto now = std::chrono::steady_clock::now();
     if (m_terminal == nullptr || (now < m_next && done < total))
@@ -30,17 +37,26 @@ void Progress::show(const colour::DataSet& measurement, std::size_t done, std::s
     m_next = now + betweenLooks;
     const std::size_t patch = done - 1;
     const colour::Lab& lab = measurement.lab[patch];
-    std::fprintf(m_terminal, "%sPatch %zu of %zu    %s    L*a*b* %.2f %.2f %.2f", startOfCleanLine,
-                 done, total, deviceText(measurement, patch).c_str(), lab.L, lab.a, lab.b);
-    std::fflush(m_terminal);
-    m_open = true;
+    char colour[128];
+    std::snprintf(colour, sizeof colour, "L*a*b* %.2f %.2f %.2f", lab.L, lab.a, lab.b);
+    line("Patch " + std::to_string(done) + " of " + std::to_string(total) + "    " +
+         deviceText(measurement, patch) + "    " + colour);
 }
 
-void Progress::say(const char* sentence) {
+void Progress::say(const std::string& sentence) {
     if (m_terminal == nullptr)
         return;
-    std::fprintf(m_terminal, "%s%s\n", m_open ? "\n" : "", sentence);
+    std::fprintf(m_terminal, "%s%s\n", m_open ? startOfCleanLine : "", printable(sentence).c_str());
+    std::fflush(m_terminal);
     m_open = false;
+}
+
+void Progress::line(const std::string& text) {
+    if (m_terminal == nullptr)
+        return;
+    std::fprintf(m_terminal, "%s%s", startOfCleanLine, printable(text).c_str());
+    std::fflush(m_terminal);
+    m_open = true;
 }
 
 } // namespace measuring

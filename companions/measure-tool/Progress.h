@@ -4,6 +4,7 @@
 #include <chrono>
 #include <cstddef>
 #include <cstdio>
+#include <string>
 
 #include "colour/DataSet.h"
 
@@ -18,11 +19,17 @@ class Progress {
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;
 
+    /// The measurement of a chart begins: its size and its first patch.
+    void begin(const colour::DataSet& chart);
+
     /// The patches of the measurement so far, of `total`. Faster than an eye, some are passed over.
     void show(const colour::DataSet& measurement, std::size_t done, std::size_t total);
 
     /// A sentence on a line of its own.
-    void say(const char* sentence);
+    void say(const std::string& sentence);
+
+    /// A text in the line that changes.
+    void line(const std::string& text);
 
   private:
     std::FILE* m_terminal = nullptr;

@@ -28,6 +28,9 @@ constexpr int longestDelay = 60'000;
 constexpr int longestWait = 86'400;
 constexpr std::size_t lastPatch = 10'000'000;
 
+/// Some editors put it before UTF-8.
+constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
+
 std::string_view trimmed(std::string_view text) {
     constexpr const char* blanks = " \t\r";
     const std::size_t first = text.find_first_not_of(blanks);
@@ -91,6 +94,7 @@ struct Entry {
 
 constexpr std::pair<const char*, Settings::Instrument> instruments[] = {
     {"virtual", Settings::Instrument::Virtual}, {"file", Settings::Instrument::File}};
+constexpr std::pair<const char*, bool> proofs[] = {{"patches", false}, {"ids", true}};
 constexpr std::pair<const char*, bool> truths[] = {{"yes", true}, {"no", false}};
 constexpr std::pair<const char*, Mishap> mishaps[] = {{"none", Mishap::None},
                                                       {"fail", Mishap::Fail},
@@ -118,6 +122,8 @@ constexpr Entry entries[] = {
     {"file", "a path", [](std::string_view text, Settings& s) { return readPath(text, s.file); }},
     {"wait", "seconds, up to 86400",
      [](std::string_view text, Settings& s) { return readTime(text, longestWait, s.wait); }},
+    {"match", "patches or ids",
+     [](std::string_view text, Settings& s) { return choose(text, proofs, s.bareIds); }},
     {"delay", "milliseconds, up to 60000",
      [](std::string_view text, Settings& s) { return readTime(text, longestDelay, s.delay); }},
     {"mishap", "none, fail, cancel, hang or crash",
@@ -202,6 +208,10 @@ Settings readSettings(const std::string& path) {
     Settings settings;
     std::set<const Entry*> seen;
     std::string_view rest = bytes;
+    if (rest.starts_with(byteOrderMark))
+        rest.remove_prefix(byteOrderMark.size());
+    if (rest.find('\0') != rest.npos)
+        throw Failure(Status::BadSettings, path + " is not UTF-8 text");
     for (int number = 1; !rest.empty(); ++number) {
         const std::size_t end = rest.find('\n');
         if (const std::string problem = readLine(rest.substr(0, end), settings, seen);

@@ -28,6 +28,7 @@ struct Settings {
     // The exported measurement.
     std::string file;
     std::chrono::seconds wait{0}; ///< For a new file; 0: the one that is there is taken.
+    bool bareIds = false; ///< Whether ids that are the numbers 1 to N prove the right strip.
 
     // Both.
     std::chrono::milliseconds delay{0}; ///< Time that a patch takes.
@@ -37,10 +38,10 @@ struct Settings {
 
 /// The settings file of this run: what TINTGATE_MEASURE names, else
 /// Library/Preferences/NerovaMeasure.conf below the system root, else tintgate/measure.conf in the
-/// user's configuration folder. Throws Failure (BadSettings) where there is none.
+/// user's configuration folder. Throws Failure (BadSettings) if there is none.
 ///
-/// There are no settings to fall back on: what no instrument has measured must not pass for a
-/// measurement because somebody forgot to choose.
+/// There are no default settings: a file without an instrument must not lead to values that nobody
+/// has measured.
 std::string settingsPath();
 
 /// Reads a settings file; the paths in it are made relative to its folder. Throws Failure

@@ -8,6 +8,7 @@
 
 #include "colour/ColourFile.h"
 #include "colour/Difference.h"
+#include "companions/measure-tool/Cancel.h"
 #include "companions/measure-tool/Failure.h"
 
 namespace measuring {
@@ -24,8 +25,12 @@ colour::Lab possible(const colour::Lab& lab) {
 }
 
 colour::Profile openProfile(const std::string& path) {
-    colour::ColourFile file;
-    expectUsable(colour::loadColourFile(path, {.spectra = false}, file), Status::BadProfile, path);
+    colour::ColourFile file = unlessCancelled([path] {
+        colour::ColourFile loaded;
+        expectUsable(colour::loadColourFile(path, {.spectra = false}, loaded), Status::BadProfile,
+                     path);
+        return loaded;
+    });
     if (!file.profile)
         throw Failure(Status::BadProfile, path + " is no ICC profile");
     return std::move(*file.profile);

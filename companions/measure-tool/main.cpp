@@ -4,15 +4,16 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include <algorithm>
+#include <chrono>
 #include <cstdio>
-#include <ctime>
+#include <cstdlib>
 #include <filesystem>
 #include <memory>
 #include <new>
 #include <stdexcept>
 #include <string>
 #include <string_view>
+#include <system_error>
 #include <vector>
 
 #include "colour/CgatsText.h"
@@ -21,9 +22,12 @@
 #include "companions/measure-tool/ExportedMeasurement.h"
 #include "companions/measure-tool/Failure.h"
 #include "companions/measure-tool/MeasureAll.h"
+#include "companions/measure-tool/Operator.h"
 #include "companions/measure-tool/Options.h"
 #include "companions/measure-tool/Progress.h"
+#include "companions/measure-tool/RunLog.h"
 #include "companions/measure-tool/Settings.h"
+#include "companions/measure-tool/Text.h"
 #include "companions/measure-tool/VirtualInstrument.h"
 #include "report/PageFile.h"
 
@@ -42,14 +46,15 @@ handing over what an instrument's own software has exported.
   -o          path of the measurement, which appears whole or not at all
   -patchname  what people call the strip
   -i          the instrument's name
-Other options are read over. On a terminal the progress is shown.
+Other options are read over. On a terminal the progress is shown. What is reported is
+also kept in NerovaMeasure.log, in the folder of the measurement.
 
 Which instrument measures stands in the settings file: TINTGATE_MEASURE names it, else it is
 Library/Preferences/NerovaMeasure.conf below TINTGATE_ROOT, else ~/.config/tintgate/measure.conf.
 
   instrument = virtual      profile = FILE.icc, error = SIZE, bias = L a b, seed = NUMBER,
                             spectra = yes
-  instrument = file         file = EXPORT.txt, wait = SECONDS
+  instrument = file         file = EXPORT.txt, wait = SECONDS, match = ids
   delay = MILLISECONDS      for each patch
   mishap = fail             or cancel, hang, crash; mishap-at = PATCH
 
@@ -59,88 +64,111 @@ int end(Status status) {
     return static_cast<int>(status);
 }
 
-/// Ids and names of foreign files may stand in the words: a terminal is not to obey them.
-int fail(Status status, std::string words) {
-    std::replace_if(
-        words.begin(), words.end(), [](unsigned char c) { return c < 0x20 || c == 0x7F; }, '?');
-    std::fprintf(stderr, "NerovaMeasure: %s\n", words.c_str());
+int fail(Status status, const std::string& words, const RunLog& log) {
+    std::fprintf(stderr, "NerovaMeasure: %s\n", printable(words).c_str());
+    log.add(words);
     return end(status);
 }
 
-/// Finds out before the first patch what would stop the result at the last one, and keeps what is
-/// read from being written over.
-void checkOutput(const Options& options, const Settings& settings) {
-    for (const std::string& input : {options.definition, settings.profile, settings.file}) {
-        std::error_code ignored;
-        if (!input.empty() && std::filesystem::equivalent(input, options.output, ignored))
+/// True if both names lead to one file, or will once it is there.
+bool isSameFile(const std::string& left, const std::string& right) {
+    namespace fs = std::filesystem;
+    std::error_code ignored;
+    if (fs::equivalent(left, right, ignored))
+        return true;
+    std::error_code failed;
+    const fs::path first = fs::weakly_canonical(left, failed);
+    return !failed && first == fs::weakly_canonical(right, failed) && !failed;
+}
+
+/// Finds out before the first patch what would stop the result at the last one, and protects the
+/// files that are read.
+void checkOutput(const std::string& output, const std::vector<std::string>& inputs) {
+    for (const std::string& input : inputs)
+        if (!input.empty() && isSameFile(input, output))
             throw Failure(Status::BadOptions, "the measurement would replace " + input);
-    }
     struct stat status {};
-    if (lstat(options.output.c_str(), &status) == 0 && !S_ISREG(status.st_mode))
-        throw Failure(Status::NotWritten, options.output + " is no ordinary file");
-    const std::filesystem::path parent = std::filesystem::path(options.output).parent_path();
+    if (lstat(output.c_str(), &status) == 0 && !S_ISREG(status.st_mode))
+        throw Failure(Status::NotWritten, output + " is no ordinary file");
+    const std::filesystem::path parent = std::filesystem::path(output).parent_path();
     const std::string folder = parent.empty() ? "./" : parent.string();
     if (access(folder.c_str(), W_OK | X_OK) != 0)
         throw Failure(Status::NotWritten, "nothing can be written in " + folder);
 }
 
 std::unique_ptr<Instrument> connect(const Settings& settings, const Options& options,
-                                    const colour::DataSet& chart, Progress& progress) {
+                                    const Definition& definition, Operator& person) {
     if (settings.instrument == Settings::Instrument::Virtual)
-        return std::make_unique<VirtualInstrument>(settings, options.instrument, chart);
-    if (settings.wait.count() > 0)
-        progress.say(("Waiting for " + settings.file).c_str());
-    return std::make_unique<ExportedMeasurement>(settings, chart);
+        return std::make_unique<VirtualInstrument>(settings, options.instrument, definition.chart);
+    return std::make_unique<ExportedMeasurement>(settings, definition, person);
 }
 
-std::string timeNow() {
-    const std::time_t now = std::time(nullptr);
-    std::tm parts{};
-    gmtime_r(&now, &parts);
-    char text[sizeof "2024-05-01T12:34:56Z"];
-    std::strftime(text, sizeof text, "%Y-%m-%dT%H:%M:%SZ", &parts);
-    return text;
-}
-
-void measure(const Options& options) {
+/// Each step that reads can be cancelled, since each may meet a share whose server is gone.
+void measure(const std::string& optionsFile, RunLog& log) {
     listenForCancel();
-    const Settings settings = readSettings(settingsPath());
-    checkOutput(options, settings);
-    const colour::DataSet chart = readDefinition(options.definition);
+    const Options options = unlessCancelled([optionsFile] { return readOptions(optionsFile); });
+    const char* const named = std::getenv("TINTGATE_MEASURE");
+    log.start(options.output,
+              {optionsFile, options.definition, std::string(named == nullptr ? "" : named)});
+    const std::string settingsFile = unlessCancelled([] { return settingsPath(); });
+    const Settings settings =
+        unlessCancelled([settingsFile] { return readSettings(settingsFile); });
+    unlessCancelled([output = options.output, inputs = std::vector<std::string>{
+                                                  optionsFile, settingsFile, options.definition,
+                                                  settings.profile, settings.file}] {
+        checkOutput(output, inputs);
+        return true;
+    });
+    const Definition definition =
+        unlessCancelled([path = options.definition] { return readDefinition(path); });
     Progress progress;
-    const auto instrument = connect(settings, options, chart, progress);
-    colour::DataSet measurement = measureAll(chart, *instrument, settings, progress);
+    colour::DataSet measurement = [&] {
+        Operator person(options.title, progress, log);
+        const auto instrument = connect(settings, options, definition, person);
+        return measureAll(definition.chart, *instrument, settings, progress);
+    }();
     if (measurement.descriptor.empty())
         measurement.descriptor = options.title;
     if (measurement.created.empty())
-        measurement.created = timeNow();
+        measurement.created = timeText(std::chrono::system_clock::now());
     checkCancelled();
     std::string problem;
     if (!report::replacePage(options.output, colour::writeCgats(measurement), problem))
         throw Failure(Status::NotWritten, "can't write " + options.output + ": " + problem);
 }
 
-int run(const std::vector<std::string_view>& words) {
+int run(const std::vector<std::string_view>& words, RunLog& log) {
     if (words.size() != 1)
-        return fail(Status::BadCommand, "not understood; --help tells how it is called");
+        return fail(Status::BadCommand, "not understood; --help tells how it is called", log);
     if (words[0] == "--help" || words[0] == "-h")
         return end(std::fputs((std::string(help) + nerovaMeasureStatusHelp).c_str(), stdout) < 0
                        ? Status::NotWritten
                        : Status::Done);
-    measure(readOptions(std::string(words[0])));
+    measure(std::string(words[0]), log);
     return end(Status::Done);
+}
+
+int runAndReport(const std::vector<std::string_view>& words) {
+    RunLog log;
+    try {
+        return run(words, log);
+    } catch (const Failure& failure) {
+        return fail(failure.status, failure.what(), log);
+    } catch (const std::bad_alloc&) {
+        return fail(Status::OutOfMemory, "out of memory", log);
+    } catch (const std::length_error&) {
+        return fail(Status::OutOfMemory, "out of memory", log);
+    } catch (const std::system_error& error) { // neither a thread nor a descriptor is left
+        return fail(Status::OutOfMemory, error.what(), log);
+    }
 }
 
 } // namespace
 
 int main(int argumentCount, char** arguments) {
-    try {
-        return run({arguments + (argumentCount > 0), arguments + argumentCount});
-    } catch (const Failure& failure) {
-        return fail(failure.status, failure.what());
-    } catch (const std::bad_alloc&) {
-        return fail(Status::OutOfMemory, "out of memory");
-    } catch (const std::length_error&) {
-        return fail(Status::OutOfMemory, "out of memory");
-    }
+    const int status = runAndReport({arguments + (argumentCount > 0), arguments + argumentCount});
+    if (!hasLeftWork())
+        return status;
+    std::fflush(stdout);
+    _exit(status);
 }

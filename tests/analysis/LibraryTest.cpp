@@ -267,8 +267,13 @@ TEST_F(Library, WritesTheLabThatAProfileGives) {
 
 TEST_F(Library, NamesInstruments) {
     setenv("TINTGATE_INSTRUMENTS",
-           scratch.write("names", "# own names\n33 = Gro\xc3\x9f = A \r\n7=\nx = y\n").c_str(), 1);
+           scratch
+               .write("names", "\xEF\xBB\xBF"
+                               "12 = First\n# own names\n33 = Gro\xc3\x9f = A \r\n7=\nx = y\n")
+               .c_str(),
+           1);
     EXPECT_EQ(GetInstrumentNameFromID(7), "Instrument 7");
+    EXPECT_EQ(GetInstrumentNameFromID(12), "First"); // Its line follows a byte order mark.
     EXPECT_EQ(GetInstrumentNameFromID(4294967295u), "Instrument 4294967295");
     const auto nameIn = [&](const char* definition, wxString* name) {
         return getDeviceNameFromIt8ControlStripFile(scratch.write("d", definition), name);

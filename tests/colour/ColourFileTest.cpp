@@ -1,5 +1,6 @@
 #include "colour/ColourFile.h"
 
+#include <chrono>
 #include <cstdlib>
 #include <string>
 
@@ -68,5 +69,12 @@ TEST(ColourFile, WaitsForPipes) {
     const std::string pieces =
         "(head -c 20 " + file + "; sleep 0.02; tail -c +21 " + file + ") > " + path + " &";
     ASSERT_EQ(std::system(pieces.c_str()), 0);
+    EXPECT_EQ(load(path), Failure::None);
+    const auto start = std::chrono::steady_clock::now();
+    EXPECT_EQ(load(path), Failure::Unreadable); // Nobody writes, so nobody ever will.
+    EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
+    // A writer that is there but slow has more time than one that is not.
+    const std::string late = "(sleep 2.5; cat " + file + ") > " + path + " &";
+    ASSERT_EQ(std::system(late.c_str()), 0);
     EXPECT_EQ(load(path), Failure::None);
 }

@@ -37,7 +37,8 @@ ARROWS = {
     "colour": "",
     "report": "colour",
     "viewer": "report platform",
-    "NerovaMeasure": "colour report platform",
+    "measuring": "base colour platform",
+    "NerovaMeasure": "measuring report",
     "analysis": "colour records",  # libTintgate without its ten functions' names
     "libTintgate": "analysis colour records",
     "ticketengine": "ticketrecords",
@@ -55,6 +56,7 @@ EXPOSES = {
     "comm": "commrecords ticket",
     "platform": "platformrecords",
     "report": "colour",
+    "measuring": "colour",
     "analysis": "records",
     "ticket": "ticketrecords",
     "ticketengine": "ticketrecords",
