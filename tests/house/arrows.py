@@ -45,7 +45,8 @@ ARROWS = {
     "store": "base StoreEngine",
     "ComGUI": "commrecords ticketrecords ticketengine StoreEngine store",
     "bytes": "",
-    "tintgate-store": "bytes store",
+    "diagnosis": "base job comm records log helper libTintgate platform store",
+    "tintgate-store": "bytes diagnosis store",
     "tintgate-report": "report analysis libTintgate bytes store platform",
 }
 
