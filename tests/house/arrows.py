@@ -45,7 +45,7 @@ ARROWS = {
     "store": "base StoreEngine",
     "ComGUI": "commrecords ticketrecords ticketengine StoreEngine store",
     "bytes": "",
-    "diagnosis": "base job comm records log helper libTintgate platform store",
+    "diagnosis": "base job comm records logger log helper libTintgate platform store",
     "tintgate-store": "bytes diagnosis store",
     "tintgate-report": "report analysis libTintgate bytes store platform",
 }
@@ -57,7 +57,7 @@ EXPOSES = {
     "platform": "platformrecords",
     "report": "colour",
     "analysis": "records",
-    "ticket": "ticketrecords",
+    "ticket": "ticketrecords text",
     "ticketengine": "ticketrecords",
     "StoreEngine": "ticketengine",
     "store": "StoreEngine",
