@@ -1,14 +1,9 @@
 #include "companions/diagnosis/Diagnosis.h"
 
 #include <algorithm>
-#include <cctype>
 #include <clocale>
 #include <cstdlib>
 #include <filesystem>
-#include <fstream>
-#include <functional>
-#include <iterator>
-#include <map>
 #include <memory>
 #include <optional>
 #include <string_view>
@@ -16,7 +11,6 @@
 #include <utility>
 
 #include <langinfo.h>
-#include <sys/stat.h>
 #include <unistd.h>
 
 #include <wx/debug.h>
@@ -26,11 +20,15 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "base/WideBytes.h"
+#include "companions/diagnosis/FileRules.h"
 #include "companions/diagnosis/KeyRules.h"
+#include "companions/diagnosis/Machine.h"
 #include "companions/diagnosis/ReadOnlyServer.h"
+#include "companions/diagnosis/SimilarKeys.h"
+#include "companions/diagnosis/ValueRules.h"
+#include "companions/diagnosis/Words.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "job/StripKeys.h"
-#include "measure/Helper.h"
 #include "platform/TemporaryFolder.h"
 
 namespace diagnosis {
@@ -40,33 +38,6 @@ namespace {
 namespace fs = std::filesystem;
 
 constexpr int oneCodeForAll = 255; ///< What a run's -1 becomes as the exit code of a process.
-constexpr int mostPatches = 1'000'000;
-
-std::string bytesOf(const wxString& text) {
-    return base::bytesFromWide(text.ToStdWstring());
-}
-
-std::string number(int value) {
-    return std::to_string(value);
-}
-
-std::string fileName(const std::string& path) {
-    return path.substr(path.rfind('/') + 1);
-}
-
-const ExitCodeText* textOf(int code) {
-    const auto found = std::find_if(std::begin(exitCodeTexts), std::end(exitCodeTexts),
-                                    [&](const ExitCodeText& text) { return text.code == code; });
-    return found == std::end(exitCodeTexts) ? nullptr : &*found;
-}
-
-/// "22, An input is neither CGATS text nor an ICC profile. The first bytes are ..."
-std::string explained(int code) {
-    const ExitCodeText* const text = textOf(code);
-    return number(code) + (text == nullptr
-                               ? std::string()
-                               : std::string(", ") + text->meaning + ". " + text->cause);
-}
 
 /// The temporary folder of this process until the object ends: what the tool writes goes there.
 class PrivateTemporaryFolder {
@@ -100,62 +71,6 @@ void prepareProcess() {
     wxLog::EnableLogging(false);
 }
 
-/// Names of a job's folder that the tool itself writes, and what becomes of a job's file there.
-struct ReservedName {
-    const char* name;
-    std::vector<int> codes;
-    bool spoilsResult;
-    const char* consequence;
-};
-
-const std::vector<ReservedName>& reservedNames() {
-    static const std::vector<ReservedName> all = {
-        {"Measured sample.txt",
-         {exitReferenceMissing, 38, exitSampleMissing},
-         true,
-         "The measurement is written to this name, so that it would be compared with itself."},
-        {"Measured reference.txt",
-         {},
-         false,
-         "References from the ticket are written to this name and replace the file."},
-        {"NMPatchSetDefinition.it8",
-         {exitReferenceMissing, exitMeasuringFailed},
-         false,
-         "The definition for the measuring tool has this name; it replaces the file and is removed "
-         "after the measurement."},
-        {"NMPatchSetDefinition.dcf",
-         {exitReferenceMissing},
-         false,
-         "A definition for the measuring tool has this name and replaces the file."},
-        {"output.json", {}, false, "The result is written to this name and replaces the file."},
-        {"meta.json", {}, false, "The meta file is written to this name and replaces the file."},
-    };
-    return all;
-}
-
-/// The lesser of the distance of two keys and 3. Keys are short, so the plain table will do.
-std::size_t distanceOf(const std::string& a, const std::string& b) {
-    constexpr std::size_t far = 3;
-    if (a.size() > b.size() + 2 || b.size() > a.size() + 2) {
-        return far;
-    }
-    std::vector<std::size_t> row(b.size() + 1);
-    for (std::size_t j = 0; j <= b.size(); ++j) {
-        row[j] = j;
-    }
-    for (std::size_t i = 1; i <= a.size(); ++i) {
-        std::size_t diagonal = std::exchange(row[0], i);
-        for (std::size_t j = 1; j <= b.size(); ++j) {
-            const bool same = std::tolower(static_cast<unsigned char>(a[i - 1])) ==
-                              std::tolower(static_cast<unsigned char>(b[j - 1]));
-            const std::size_t value =
-                std::min({row[j] + 1, row[j - 1] + 1, diagonal + (same ? 0 : 1)});
-            diagonal = std::exchange(row[j], value);
-        }
-    }
-    return std::min(row[b.size()], far);
-}
-
 /// One examination, whose steps fill its result.
 class Examination {
   public:
@@ -165,7 +80,6 @@ class Examination {
     Diagnosis result();
 
   private:
-    void checkMachine();
     bool checkCall();
     bool openStore();
     bool logIn();
@@ -175,20 +89,17 @@ class Examination {
     void compare();
     void measure();
     bool checkInputs();
+    void checkPairing();
 
-    void judgeFiles();
-    void judgeFile(const AskedFile& file);
-    void judgeNames();
-    void judgeValues();
-    void judgeInstrument();
+    void judgeReads();
     void sortFindings();
     void listAsked();
 
-    const AskedKey* asked(const std::string& key, int type = jobType) const;
-    template<class T>
-    const T* valueOf(const std::string& key, int type = jobType) const;
-    std::string similarKey(const AskedKey& asked);
-    bool wasAskedBefore(const std::string& key, std::size_t index) const;
+    const AskedKey* asked(const std::string& key) const {
+        return findKey(m_server->keys(), jobType, m_request.job, key);
+    }
+    /// "file /server/x" for a local file, or its name if it did not come from the server.
+    std::string placeOf(const wxString& local) const;
 
     void add(std::string where, std::string text, std::vector<int> codes = {},
              bool spoilsResult = false) {
@@ -210,7 +121,6 @@ class Examination {
     std::unique_ptr<KZVerifyJobProcessor> m_processor;
     KZJobDataStruct m_job;
     Strip m_strip = Strip::first;
-    std::map<std::pair<int, int>, std::vector<std::string>> m_keyNames; ///< Of tickets.
     std::vector<Finding> m_findings;
     Diagnosis m_result;
 };
@@ -228,66 +138,18 @@ Diagnosis Examination::result() {
         }
         m_server->removePlaceholder();
         m_server->throwFailure();
-        judgeFiles();
-        judgeNames();
-        judgeValues();
+        judgeReads();
         m_processor->FreeMeasurementData(m_job);
         std::free(m_job.childJobIDs);
-    }
-    if (m_server != nullptr) {
+    } else if (m_server != nullptr) {
         m_server->throwFailure();
-        const std::vector<Finding> keys =
-            judgeKeys(m_server->keys(), m_request.job, m_strip,
-                      [this](const AskedKey& key) { return similarKey(key); });
-        m_findings.insert(m_findings.begin(), keys.begin(), keys.end());
+        judgeReads();
     }
     sortFindings();
     listAsked();
-    checkMachine();
+    m_result.machine = judgeMachine(m_temporaryFolder, m_result.measures);
     m_processor.reset();
     return std::move(m_result);
-}
-
-/// What is wrong with this machine's installation. The client may run on another one.
-void Examination::checkMachine() {
-    const auto tell = [&](std::string where, std::string text, std::vector<int> codes) {
-        m_result.machine.push_back({std::move(where), std::move(text), std::move(codes)});
-    };
-    const std::string bundle = base::bytesFromWide(ComGUIManager::PlugInPath());
-    if (!fs::is_directory(bundle)) {
-        tell(bundle, "is missing. Without the comm plug-in no login succeeds.",
-             {exitLoginNoServer});
-    }
-    const std::string tool =
-        m_result.measures ? bytesOf(Helper::GetNerovaMeasurePath(true)) : std::string();
-    if (m_result.measures && access(tool.c_str(), X_OK) != 0) {
-        tell(tool.empty() ? "measuring tool" : tool,
-             "is missing or can't be executed. The job can't be measured.",
-             {exitMeasuringFailed, exitSampleMissing});
-    } else if (m_result.measures && Helper::IsNMRunning()) {
-        tell(tool, "runs now. A second measurement can't start until it ends.",
-             {exitMeasuringFailed});
-    }
-    const std::string viewer = bytesOf(Helper::GetNerovaVerifyPath().GetFullPath());
-    if (access(viewer.c_str(), X_OK) != 0) {
-        tell(viewer, "is missing or can't be executed. The result is written but not shown.",
-             {exitViewerNotStarted});
-    }
-    const std::string& folder = m_temporaryFolder;
-    if (folder.find_first_of("\"'\\") != std::string::npos ||
-        folder.find("  ") != std::string::npos) {
-        tell(folder,
-             "contains a quote, a backslash or two blanks in a row: the viewer gets a wrong "
-             "path and shows no page.",
-             {});
-    }
-    struct stat status;
-    const std::string working = folder + "/Tintgate";
-    if (folder.empty() || (lstat(working.c_str(), &status) == 0 &&
-                           (!S_ISDIR(status.st_mode) || status.st_uid != geteuid()))) {
-        tell(folder.empty() ? "/tmp" : working,
-             "is not a folder of this user. A run can keep no files.", {exitJdfMissing});
-    }
 }
 
 bool Examination::checkCall() {
@@ -361,10 +223,11 @@ bool Examination::logIn() {
     if (m_processor->m_connector != nullptr) {
         return true;
     }
-    const int* const version = valueOf<int>("System/Product/MajorVersion", systemType);
-    if (version != nullptr) {
+    const std::optional<int> version =
+        numberIn(findKey(m_server->keys(), systemType, 0, "System/Product/MajorVersion"));
+    if (version) {
         add("system System/Product/MajorVersion",
-            "is " + number(*version) + ". A login needs a server of version 5 or above.",
+            "is " + std::to_string(*version) + ". A login needs a server of version 5 or above.",
             {exitLoginRefused});
     }
     return end(exitLoginRefused);
@@ -386,12 +249,12 @@ bool Examination::checkList() {
     }
     const auto text = [&](const char* key) {
         const AskedKey* const found = asked(key);
-        const int* const value = valueOf<int>(key);
-        const std::string problem = found == nullptr ? "is missing" : problemOf(*found, false);
-        return value != nullptr ? "is " + number(*value) : problem;
+        const std::optional<int> value = numberIn(found);
+        return value              ? "is " + std::to_string(*value)
+               : found == nullptr ? "is missing"
+                                  : problemOf(*found, false);
     };
-    const int* const type = valueOf<int>("Input/FileType");
-    if (type != nullptr && *type == 4096) {
+    if (numberIn(asked("Input/FileType")) == 4096) {
         add(jobKey("Input/FileType"), "is 4096, which keeps a job from being verified.", codes);
     }
     const std::string status = text("Job/Display/Status");
@@ -422,11 +285,7 @@ bool Examination::checkPreset() {
         return true;
     }
     if (!m_job.tolerance.filePath.empty()) {
-        const auto& files = m_server->files();
-        const auto file = std::find_if(files.begin(), files.end(), [&](const AskedFile& asked) {
-            return asked.localPath == bytesOf(m_job.tolerance.filePath);
-        });
-        add("file " + (file == files.end() ? std::string() : file->serverPath),
+        add(placeOf(m_job.tolerance.filePath),
             "is the preset, and the library refuses it with " + explained(code) + ".",
             {exitPresetFailed});
     }
@@ -443,11 +302,7 @@ bool Examination::checkInputs() {
         }
         const int code = validateInputFile(path.ToStdWstring());
         if (code != 0) {
-            const auto& files = m_server->files();
-            const auto file = std::find_if(files.begin(), files.end(), [&](const AskedFile& asked) {
-                return asked.localPath == bytesOf(path);
-            });
-            add(file == files.end() ? fileName(bytesOf(path)) : "file " + file->serverPath,
+            add(placeOf(path),
                 std::string("is the ") + what + ", and the library refuses it with " +
                     explained(code) + ".",
                 {code});
@@ -463,7 +318,7 @@ void Examination::compare() {
     end(code);
     if (code == exitSampleMissing) {
         add(jobKey(measurementKey(m_strip, "Numpatches")),
-            "is " + number(m_job.measurement.numPatches) +
+            "is " + std::to_string(m_job.measurement.numPatches) +
                 ". A stored measurement needs 1 to 1,000,000 patches.",
             {exitSampleMissing});
     } else if (code != exitDone && code != exitStoredDataFailed && checkInputs() &&
@@ -499,226 +354,53 @@ void Examination::measure() {
         end(exitReferenceMissing);
     } else if (!checkInputs()) {
         end(m_findings.back().codes.front());
+    } else {
+        checkPairing();
     }
 }
 
-const AskedKey* Examination::asked(const std::string& key, int type) const {
-    const auto& keys = m_server->keys();
-    const auto found = std::find_if(keys.begin(), keys.end(), [&](const AskedKey& asked) {
-        return asked.type == type && asked.key == key &&
-               (type != jobType || asked.id == m_request.job);
-    });
-    return found == keys.end() ? nullptr : &*found;
-}
-
-/// The value that a read has given. Null if it was not asked or not found.
-template<class T>
-const T* Examination::valueOf(const std::string& key, int type) const {
-    const AskedKey* const found = asked(key, type);
-    return found == nullptr || !found->found ? nullptr : std::get_if<T>(found->stored->first());
-}
-
-/// A key of the ticket that nobody asks for and that differs from this one in at most two letters,
-/// or is that of the other strip.
-std::string Examination::similarKey(const AskedKey& wanted) {
-    auto& names = m_keyNames[{wanted.type, wanted.id}];
-    if (names.empty()) {
-        const auto content = m_engine->content(wanted.type, wanted.id, store::KeyFilter());
-        if (content != nullptr) {
-            for (const auto& [key, elements] : content->keys()) {
-                names.push_back(key);
-            }
-        }
+/// The strip's file has the device values that the measurement will have. Colours of its own it
+/// need not have, so that only what the library says about pairing counts.
+void Examination::checkPairing() {
+    std::wstring ignored;
+    const int code = analyzeMeasurements(m_job.referenceFile.ToStdWstring(),
+                                         m_job.controlStripFile.ToStdWstring(), std::wstring(),
+                                         m_job.tolerance, nullptr, &ignored, nullptr);
+    if (code == exitNothingToPair || code == exitNoDeviceValues) {
+        add("control strip " + fileName(bytesOf(m_job.controlStripFile)),
+            "does not go with the reference " + fileName(bytesOf(m_job.referenceFile)) +
+                ": the library refuses them with " + explained(code) + ".",
+            {code});
+        end(code);
     }
-    std::string best;
-    std::size_t least = 3;
-    for (const std::string& name : names) {
-        const bool isAsked = std::any_of(
-            m_server->keys().begin(), m_server->keys().end(), [&](const AskedKey& asked) {
-                return asked.key == name && asked.type == wanted.type && asked.id == wanted.id;
-            });
-        const std::size_t distance = isAsked ? least : distanceOf(wanted.key, name);
-        if (distance < least) {
-            least = distance;
-            best = name;
-        }
-    }
-    return best;
 }
 
-bool Examination::wasAskedBefore(const std::string& key, std::size_t index) const {
-    const auto& keys = m_server->keys();
-    return std::any_of(keys.begin(), keys.begin() + static_cast<std::ptrdiff_t>(index),
-                       [&](const AskedKey& asked) { return asked.key == key; });
-}
-
-void Examination::judgeFiles() {
+std::string Examination::placeOf(const wxString& local) const {
+    const std::string path = bytesOf(local);
     for (const AskedFile& file : m_server->files()) {
-        if (!file.problem.empty()) {
-            judgeFile(file);
+        if (file.localPath == path) {
+            return "file " + file.serverPath;
         }
     }
+    return fileName(path);
 }
 
-void Examination::judgeFile(const AskedFile& file) {
-    struct Role {
-        const char* key; ///< The key that names the file, as the first strip has it.
-        const char* what;
-        std::vector<int> codes;
-        bool spoilsResult;
+/// Keys first: what they lack explains most of the rest.
+void Examination::judgeReads() {
+    SimilarKeys similar(*m_engine, m_server->keys());
+    const auto append = [&](std::vector<Finding> findings) {
+        m_findings.insert(m_findings.end(), findings.begin(), findings.end());
     };
-    static const Role roles[] = {
-        {"Output/Jdf/FileName", "JDF", {exitJdfMissing}, false},
-        {"System/Folders/Temp", "JDF", {exitJdfMissing}, false},
-        {"Workflow/RemoteOutFolder", "JDF", {exitJdfMissing}, false},
-        {"Remote/JDFName", "JDF", {exitJdfMissing}, false},
-        {"Footer/Dynstrip/IT8", "dynamic control strip", {exitMeasuringFailed, 20}, false},
-        {"Footer/Dynstrip/File", "picture of the dynamic strip, which no run needs", {}, false},
-        {"Footer/ControlstripIT8", "control strip", {exitMeasuringFailed}, false},
-        {"Footer/ControlstripFile", "control strip", {exitMeasuringFailed}, false},
-        {"Footer/Nesting/ControlstripFile", "control strip", {exitMeasuringFailed}, false},
-    };
-    const std::string preset = "/tickets/" + bytesOf(m_job.presetFile);
-    Role role = {nullptr, "reference", {exitReferenceMissing, 20}, false};
-    const bool readsReferences = wasAskedBefore("Workflow/Name", file.asked) &&
-                                 !wasAskedBefore("Footer/ControlstripIT8", file.asked);
-    if (!m_job.presetFile.empty() && file.serverPath.ends_with(preset)) {
-        role = {nullptr, "preset", {exitPresetFailed}, false};
-    } else if (file.serverPath.ends_with(".dcf")) {
-        return; // The definition beside a dynamic strip is optional.
-    } else if (wasAskedBefore("Footer/Nesting/PSDAssessment", file.asked) &&
-               !wasAskedBefore("Output/Jdf/FileName", file.asked)) {
-        role = {nullptr,
-                "strip that the parent's jobs share; the job uses its own, and the result goes to "
-                "this job alone",
-                {},
-                true};
-    } else if (!readsReferences || wasAskedBefore("Output/Jdf/FileName", file.asked)) {
-        for (const Role& known : roles) {
-            if (file.namedBy == known.key || file.namedBy == stripKey(m_strip, known.key)) {
-                role = known;
-            }
-        }
-    }
-    add("file " + file.serverPath,
-        "does not come: " + file.problem + ". It is the " + role.what +
-            (role.what == std::string_view("preset") || file.namedBy.empty()
-                 ? ""
-                 : ", named by " + file.namedBy) +
-            ".",
-        role.codes, role.spoilsResult);
-}
-
-/// All files of a job come into one folder under the last parts of their paths.
-void Examination::judgeNames() {
-    std::map<std::string, std::string> first; // Local name to server path.
-    for (const AskedFile& file : m_server->files()) {
-        const std::string name = fileName(file.localPath);
-        for (const ReservedName& reserved : reservedNames()) {
-            const bool isOwn = file.serverPath.ends_with(".dcf"); // Brought for this very name.
-            if (name == reserved.name && !isOwn) {
-                add("file " + file.serverPath,
-                    "has a name that is reserved in the job's folder. " +
-                        std::string(reserved.consequence),
-                    reserved.codes, reserved.spoilsResult);
-            }
-        }
-        const auto [other, isNew] = first.emplace(name, file.serverPath);
-        if (!isNew && other->second != file.serverPath) {
-            // A comparison needs the reference alone, which only nesting and the JDF come after.
-            const bool spoils = m_result.measures || wasAskedBefore("General/ParentID", file.asked);
-            add("file " + file.serverPath,
-                "has the same name as " + other->second +
-                    ". In the job's folder the one that comes later replaces the other.",
-                {exitReferenceMissing, exitMeasuringFailed, exitPresetFailed}, spoils);
-        }
-    }
-}
-
-void Examination::judgeValues() {
-    const auto workflowKey = stripKey(m_strip, "Workflow/Verify/MeasurementWorkflow");
-    const int* const workflow = valueOf<int>(workflowKey);
-    const int* const esko = valueOf<int>("Job/FromEsko");
-    const bool isEsko = esko != nullptr && *esko == 1;
-    const bool isDynamic = m_job.useDynstrip == 1 && m_strip == Strip::first;
-    if (workflow != nullptr && (*workflow < 1 || *workflow > 3) && !isDynamic &&
-        !(isEsko && *workflow == 4)) {
-        add(jobKey(workflowKey),
-            "is " + number(*workflow) +
-                ". References come with 1 (profile), 2 (characterisation data), 3 (ticket or "
-                "profile), and with 4 if Job/FromEsko is 1. Without references the preset is not "
-                "loaded.",
-            {exitPresetFailed});
-    }
-    for (const char* name : {"Reference/Numpatches", "Numpatches"}) {
-        const int* const patches = valueOf<int>(measurementKey(m_strip, name));
-        if (patches != nullptr && *patches > mostPatches) {
-            add(jobKey(measurementKey(m_strip, name)),
-                "is " + number(*patches) + ". More than 1,000,000 patches are not loaded.",
-                {exitPresetFailed, exitSampleMissing});
-        }
-    }
-    const int* const length = valueOf<int>(measurementKey(m_strip, "SpectralValues/Length"));
-    if (length != nullptr && (*length < 0 || *length > spectralValueCount)) {
-        add(jobKey(measurementKey(m_strip, "SpectralValues/Length")),
-            "is " + number(*length) +
-                ", not 0 to 36. The measurement counts as one without spectra.");
-    }
-    const int* const formula = valueOf<int>(stripKey(m_strip, "Workflow/Verify/DeltaEMode"));
-    if (formula != nullptr && *formula != 0 && (*formula < 2 || *formula > 5)) {
-        add(jobKey(stripKey(m_strip, "Workflow/Verify/DeltaEMode")),
-            "is " + number(*formula) +
-                ", which counts as CIE76. The formulas are 0, 2, 3, 4 and 5.",
-            {}, true);
-    }
-    if (valueOf<int>(stripKey(m_strip, "Workflow/Verify/ComparisonMethod")) != nullptr &&
-        !m_engine->exists(presetType, m_job.presetID)) {
-        add(jobKey(stripKey(m_strip, "Workflow/Verify/ComparisonMethod")),
-            "is " + number(m_job.presetID) + ", but there is no ticket " +
-                ticketName(presetType, m_job.presetID) + ".",
-            {exitPresetFailed});
-    }
-    const int* const active = valueOf<int>("Workflow/Verify/Active");
-    if (m_strip == Strip::second && (active == nullptr || *active != 3)) {
-        add(jobKey("Workflow/Verify/Active"), "is not 3: the job counts as one with a single "
-                                              "strip, and a run on the second closes it.");
-    }
-    const auto status = measurementKey(m_strip, "Status");
-    if (m_result.measures && !m_request.remeasure && m_job.measurementStatus < 1 &&
-        m_engine->key(jobType, m_request.job, measurementKey(m_strip, "Numpatches")) != nullptr) {
-        add(jobKey(status),
-            "is missing or 0, so that the job is measured although the ticket has " +
-                measurementKey(m_strip, "Numpatches") + ".");
-    }
-    judgeInstrument();
-}
-
-/// A control strip whose instrument can't be read.
-void Examination::judgeInstrument() {
-    if (m_job.deviceID != 0 || m_job.controlStripFile.empty() || m_job.useDynstrip == 1) {
-        return;
-    }
-    std::ifstream strip(bytesOf(m_job.controlStripFile));
-    std::string line;
-    std::string found = "no line has the word DEVICE";
-    while (std::getline(strip, line)) {
-        if (line.find("DEVICE") != std::string::npos) {
-            line.erase(std::find_if(line.begin(), line.end(),
-                                    [](unsigned char c) { return c < ' ' && c != '\t'; }),
-                       line.end());
-            found = "the first line with the word DEVICE is \"" + line +
-                    "\", and has to be the word, "
-                    "one blank and a number";
-            break;
-        }
-    }
-    const bool isInline = m_job.inlineVerifyJob == 1;
-    add("control strip " + fileName(bytesOf(m_job.controlStripFile)),
-        "The number of the instrument reads as 0: " + found + "." +
-            (isInline ? " With sub type 96 such a job counts as one that an inline instrument has "
-                        "measured: it is compared and never measured."
-                      : ""),
-        isInline ? std::vector<int>{exitStoredDataFailed, exitSampleMissing} : std::vector<int>{});
+    std::vector<Finding> earlier = std::exchange(m_findings, {});
+    append(judgeKeys(m_server->keys(), m_request.job, m_strip,
+                     [&](const AskedKey& key) { return similar.like(key); }));
+    append(std::move(earlier));
+    append(judgeFiles(*m_server, m_job, m_result.measures));
+    append(judgeValues({.server = *m_server,
+                        .engine = *m_engine,
+                        .job = m_job,
+                        .measures = m_result.measures,
+                        .remeasure = m_request.remeasure}));
 }
 
 void Examination::sortFindings() {
@@ -759,9 +441,9 @@ void Examination::listAsked() {
         if (answer.empty()) {
             const store::Value& value = *key.stored->first();
             if (key.isArray) {
-                answer = number(key.stored->count()) + " elements";
+                answer = std::to_string(key.stored->count()) + " elements";
             } else if (const int* const whole = std::get_if<int>(&value)) {
-                answer = number(*whole);
+                answer = std::to_string(*whole);
             } else if (const auto* const text = std::get_if<store::Text>(&value)) {
                 answer = '"' + text->bytes->text + '"';
             }

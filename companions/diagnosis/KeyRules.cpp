@@ -145,13 +145,6 @@ bool isUtf8(const std::string& text) {
     return text.empty() || !wxString::FromUTF8(text).empty();
 }
 
-/// The whole number that a read has given; 0 if it gave none.
-int numberOf(const AskedKey& asked) {
-    const store::Value* const value = asked.found ? asked.stored->first() : nullptr;
-    const int* const number = value == nullptr ? nullptr : std::get_if<int>(value);
-    return number == nullptr ? 0 : *number;
-}
-
 /// Two keys are asked twice in a load: the strip's name for itself and for a nested job.
 bool applies(const Rule& rule, const std::vector<AskedKey>& keys, std::size_t index, Strip strip) {
     const AskedKey& asked = keys[index];
@@ -171,7 +164,7 @@ bool applies(const Rule& rule, const std::vector<AskedKey>& keys, std::size_t in
     }
     const AskedKey& before = keys[index - 1];
     return before.key == modeKey
-               ? numberOf(before) == 1
+               ? numberIn(&before) == 1
                : before.key == rule.previous || before.key == stripKey(strip, rule.previous);
 }
 
@@ -229,6 +222,21 @@ std::string keyName(const AskedKey& asked) {
     return ticketName(asked.type, asked.id) + " " + asked.key;
 }
 
+const AskedKey* findKey(const std::vector<AskedKey>& keys, int type, int id,
+                        const std::string& key) {
+    const auto found = std::find_if(keys.begin(), keys.end(), [&](const AskedKey& asked) {
+        return asked.type == type && asked.id == id && asked.key == key;
+    });
+    return found == keys.end() ? nullptr : &*found;
+}
+
+std::optional<int> numberIn(const AskedKey* asked) {
+    const store::Value* const value =
+        asked != nullptr && asked->found ? asked->stored->first() : nullptr;
+    const int* const number = value == nullptr ? nullptr : std::get_if<int>(value);
+    return number == nullptr ? std::nullopt : std::optional(*number);
+}
+
 std::string problemOf(const AskedKey& asked, bool emptyCounts) {
     const store::Value* const value = asked.stored == nullptr ? nullptr : asked.stored->first();
     if (value == nullptr) {
@@ -264,9 +272,9 @@ std::vector<Finding> judgeKeys(const std::vector<AskedKey>& keys, int job, Strip
             continue;
         }
         if (asked.key.ends_with("/Numpatches")) {
-            patches = numberOf(asked);
+            patches = numberIn(&asked).value_or(0);
         } else if (asked.key.ends_with("SpectralValues/Length")) {
-            samples = numberOf(asked);
+            samples = numberIn(&asked).value_or(0);
         }
         for (const Rule& rule : rules()) {
             if (!applies(rule, keys, i, strip)) {

@@ -2,6 +2,7 @@
 #pragma once
 
 #include <functional>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -20,6 +21,13 @@ std::string ticketName(int type, int id);
 
 /// "job/7 Input/SubType".
 std::string keyName(const AskedKey& asked);
+
+/// The first read of a key, or null.
+const AskedKey* findKey(const std::vector<AskedKey>& keys, int type, int id,
+                        const std::string& key);
+
+/// The whole number that a read has given. Nothing if it gave none; null is no read.
+std::optional<int> numberIn(const AskedKey* asked);
 
 /// What keeps a key from being read, as a clause such as "is missing" or "is stored as a double,
 /// but an int is read". Empty if it was read. An empty text counts if emptyCounts is true.

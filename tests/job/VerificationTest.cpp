@@ -36,6 +36,7 @@ using support::Call;
 using support::Place;
 using support::profile;
 using support::sideBySide;
+using support::viewer;
 using testing::HasSubstr;
 
 struct Case {
