@@ -34,6 +34,8 @@ constexpr bool emptyToo = true;
 const char* const ownStrip = "Footer/ControlstripFile";
 const char* const modeKey = "Footer/Nesting/ControlstripMode";
 const char* const characterisation = "Workflow/Verify/CharacterizationData";
+const char* const assessment = "Footer/Nesting/PSDAssessment";
+const char* const jdfFolder = "System/Folders/Temp";
 const char* const profile = "Footer/ControlstripInputProfile";
 const char* const dynamicEnds =
     "The lookup of the dynamic strip ends with it: there is no control strip, and the workflow is "
@@ -66,8 +68,7 @@ const std::vector<Rule>& rules() {
         {jobType, Shared, "Footer/Dynstrip/File", nullptr, Always, emptyIsFine, true, {},
          "The workflow is not read after it: the references come from the strip, and the JDF is not updated."},
         {jobType, Suffix, "Footer/Nesting/ControlstripFile", ownStrip, Always, emptyIsFine, false, {103, 106},
-         "The job names no control strip of at least 4 bytes in Footer/ControlstripFile, and none here. "
-         "Without a strip the workflow is not read, and then neither references nor a preset are looked for."},
+         "One of them has to name the control strip, with at least 4 bytes. Without a strip the workflow is not read, and then neither references nor a preset are looked for."},
 
         {jobType, Suffix, "Workflow/Verify/MeasurementWorkflow", nullptr, Always, emptyIsFine, false, {103},
          "It counts as 0: a fixed control strip then has no references, and without references the preset is not loaded."},
@@ -78,8 +79,7 @@ const std::vector<Rule>& rules() {
         {jobType, Suffix, characterisation, nullptr, Always, emptyToo, false, {103},
          "There are no references without it, and without references the preset is not loaded."},
         {jobType, Shared, "Remote/UsedICCProfile", profile, Always, emptyToo, false, {103},
-         "The job names a reference profile neither in Footer/ControlstripInputProfile of its strip nor here. "
-         "Without references the preset is not loaded."},
+         "One of them has to name the reference profile. Without references the preset is not loaded."},
         {jobType, Shared, "Footer/ControlstripIT8", nullptr, Always, emptyToo, false, {103},
          "A packaging job (Job/FromEsko 1, workflow 4) needs its strip's server path here."},
         {jobType, Suffix, "Workflow/Verify/DeltaEMode", nullptr, Always, emptyIsFine, false, {103},
@@ -98,10 +98,10 @@ const std::vector<Rule>& rules() {
          "It counts as 0: the job is not nested."},
         {jobType, Shared, modeKey, nullptr, IfSuspicious, emptyIsFine, true, {},
          "It counts as 0: the job uses its own strip, and the result goes to this job alone."},
-        {jobType, Shared, "Footer/Nesting/PSDAssessment", modeKey, Always, emptyIsFine, true, {},
+        {jobType, Shared, assessment, modeKey, Always, emptyIsFine, true, {},
          "The strip that the parent's jobs share is not looked for without it, not even with an empty text, "
          "and the result goes to this job alone."},
-        {jobType, Suffix, "Footer/Nesting/ControlstripFile", "Footer/Nesting/PSDAssessment", Always, emptyIsFine, true, {},
+        {jobType, Suffix, "Footer/Nesting/ControlstripFile", assessment, Always, emptyIsFine, true, {},
          "The strip that the parent's jobs share is not found: the job uses its own, and the result goes to this job alone."},
 
         {jobType, Shared, "Output/Prn/Specific/Measurement/VerifyMode", nullptr, Always, emptyIsFine, false, {},
@@ -109,8 +109,8 @@ const std::vector<Rule>& rules() {
 
         {jobType, Shared, "Output/Jdf/FileName", nullptr, Always, emptyToo, false, {255, 111},
          "Every job needs the name of its JDF, whatever its workflow."},
-        {jobType, Shared, "Workflow/RemoteOutFolder", "System/Folders/Temp", Always, emptyToo, false, {255, 111},
-         "The JDF's folder is neither in System/Folders/Temp nor here."},
+        {jobType, Shared, "Workflow/RemoteOutFolder", jdfFolder, Always, emptyToo, false, {255, 111},
+         "One of them has to name the folder of the JDF."},
         {jobType, Shared, "Remote/JDFName", nullptr, Always, emptyToo, false, {255, 111},
          "A job of sub type 80, 81 or 86 names the server path of its JDF here."},
 
@@ -166,6 +166,11 @@ bool applies(const Rule& rule, const std::vector<AskedKey>& keys, std::size_t in
     return before.key == modeKey
                ? numberIn(&before) == 1
                : before.key == rule.previous || before.key == stripKey(strip, rule.previous);
+}
+
+/// Whether the key is asked because the one before it was of no use.
+bool isFallback(const Rule& rule) {
+    return rule.previous == ownStrip || rule.previous == profile || rule.previous == jdfFolder;
 }
 
 /// What the elements of an array lack, or an empty text.
@@ -283,14 +288,24 @@ std::vector<Finding> judgeKeys(const std::vector<AskedKey>& keys, int job, Strip
             const std::string problem = problemOf(asked, rule.emptyCounts);
             const std::string other = asked.found ? "" : similar(asked);
             const bool isSuspicious = asked.stored != nullptr || !other.empty();
-            if (!problem.empty() && (rule.report == Report::Always || isSuspicious)) {
-                findings.push_back({.where = keyName(asked),
-                                    .text = problem +
-                                            (other.empty() ? "" : "; the ticket has " + other) +
-                                            ". " + rule.consequence,
-                                    .codes = rule.codes,
-                                    .spoilsResult = rule.spoilsResult});
+            if (problem.empty() || (rule.report == Report::IfSuspicious && !isSuspicious)) {
+                continue;
             }
+            std::string where = keyName(asked);
+            std::string text = problem + (other.empty() ? "" : "; the ticket has " + other);
+            if (isFallback(rule)) {
+                const AskedKey& first = keys[i - 1];
+                const std::string likeFirst = first.found ? "" : similar(first);
+                const std::string fault = problemOf(first, true);
+                where = keyName(first) + " and " + asked.key;
+                text = "The former " + (fault.empty() ? "is too short" : fault) +
+                       (likeFirst.empty() ? "" : "; the ticket has " + likeFirst) +
+                       ". The latter " + text;
+            }
+            findings.push_back({.where = where,
+                                .text = text + ". " + rule.consequence,
+                                .codes = rule.codes,
+                                .spoilsResult = rule.spoilsResult});
         }
     }
     return findings;
