@@ -165,8 +165,7 @@ bool Examination::checkCall() {
     if (*selector != 0 && *selector != 1) {
         add(where,
             "is neither 0, the first strip, nor 1, the second. The run reads the keys of the "
-            "second "
-            "strip, writes no result to the ticket and can close the job all the same.",
+            "second strip, writes no result to the ticket and can close the job all the same.",
             {}, true);
     }
     constexpr std::size_t longestAddress = 127;
@@ -197,7 +196,7 @@ bool Examination::openStore() {
 bool Examination::logIn() {
     const std::vector<store::User> users = m_engine->users();
     const auto named = std::find_if(users.begin(), users.end(), [&](const store::User& user) {
-        return user.name == m_request.user;
+        return user.name == m_request.login;
     });
     const bool anybody = std::any_of(users.begin(), users.end(),
                                      [](const store::User& user) { return !user.disabled; });
@@ -218,8 +217,7 @@ bool Examination::logIn() {
     m_processor = std::make_unique<KZVerifyJobProcessor>();
     constexpr int anyApplication = 0;
     m_processor->m_connector = m_processor->ConnectToKZWithLoginCredentials(
-        base::wideFromBytes(m_address), base::wideFromBytes(m_request.user), L"", anyApplication,
-        true);
+        base::wideFromBytes(m_address), L"", L"", anyApplication, true);
     if (m_processor->m_connector != nullptr) {
         return true;
     }
@@ -267,8 +265,7 @@ bool Examination::checkList() {
         add(jobKey("Job/Display/Status"),
             status + ", and Remote/ShowInVerifier " + text("Remote/ShowInVerifier") +
                 ". A job is verified if the former is 208 or the latter 1. A job that lacks a key "
-                "is "
-                "judged by the value of the job that precedes it.",
+                "is judged by the value of the job that precedes it.",
             codes);
     }
     return end(exitJobNotListed);
@@ -377,12 +374,11 @@ void Examination::checkPairing() {
 
 std::string Examination::placeOf(const wxString& local) const {
     const std::string path = bytesOf(local);
-    for (const AskedFile& file : m_server->files()) {
-        if (file.localPath == path) {
-            return "file " + file.serverPath;
-        }
-    }
-    return fileName(path);
+    const auto& files = m_server->files();
+    // Of files with one name the last one is there.
+    const auto file = std::find_if(files.rbegin(), files.rend(),
+                                   [&](const AskedFile& asked) { return asked.localPath == path; });
+    return file == files.rend() ? fileName(path) : "file " + file->serverPath;
 }
 
 /// Keys first: what they lack explains most of the rest.

@@ -12,7 +12,8 @@ struct Request {
     int job = 0;
     std::string selector = "0"; ///< Strip selector as a client passes it.
     bool remeasure = false;
-    std::string user; ///< Name of the user who logs in, or empty.
+    std::string user;  ///< Name of the user who logs in, as a person writes it, or empty.
+    std::string login; ///< The same name in the bytes of a login.
 };
 
 /// Something about the job that differs from what a run needs or a person expects.

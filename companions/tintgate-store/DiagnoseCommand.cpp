@@ -6,6 +6,7 @@
 #include "companions/diagnosis/Diagnosis.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
@@ -109,7 +110,10 @@ void diagnoseJob(const Invocation& invocation, const DiagnoseOptions& options) {
         request.selector = options.selector;
     }
     request.remeasure = options.remeasure;
-    request.user = options.user;
+    if (!options.user.empty()) {
+        request.user = options.user;
+        request.login = userName(options.user);
+    }
     const Diagnosis diagnosis = diagnosis::diagnose(invocation.givenAddress(), request);
     if (invocation.json) {
         showObject(diagnosisJson(request.job, request.selector, diagnosis, options.all), true);

@@ -166,6 +166,8 @@ void expectCauses(const std::vector<Case>& cases) {
         }
         EXPECT_EQ(reports[i].output.find("the result is wrong") != std::string::npos,
                   row.code == 0 && row.then == Then::IsWrong);
+        EXPECT_TRUE(!isSound || row.words.front() == "Also noticed" ||
+                    reports[i].output.find("Also noticed") == std::string::npos);
         const std::string part = partOf(reports[i].output, row.code != 0 ? "Cause:\n"
                                                            : row.then == Then::IsWrong
                                                                ? "The result is wrong because of:\n"
@@ -313,6 +315,12 @@ TEST(Diagnosis, NamesWhyAComparisonFails) {
          set("Footer/Nesting/ControlstripFile='other.it8", 11), {.job = "11"}, Then::IsWrong},
         {"sound job", 0, {"the run succeeds"}, {}, {}, Then::Succeeds},
         {"sound nested job", 0, {"the run succeeds"}, {}, {.job = "11"}, Then::Succeeds},
+        {"sound second strip", 0, {"the run succeeds"}, {}, {.job = "10", .strip = "1"},
+         Then::Succeeds},
+        {"second strip of one", 0, {"Also noticed", "Workflow/Verify/Active", "is not 3"},
+         set("Workflow/Verify/Active=1", 10), {.job = "10", .strip = "1"}, Then::Succeeds},
+        {"long spectra", 0, {"Also noticed", "SpectralValues/Length", "is 37"},
+         set(measured + "SpectralValues/Length=37"), {}, Then::Succeeds},
         // clang-format on
     });
 }
