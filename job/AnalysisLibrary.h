@@ -3,6 +3,7 @@
 // members are a contract, those of members that nothing here touches included.
 #pragma once
 
+#include <cstddef>
 #include <string>
 
 #include <wx/string.h>
@@ -21,7 +22,8 @@ struct tolerancePresetParameterRecord {
     int editable = 0;
     int showInClient = 0;
     int usedForDynamicWedge = 0;
-    int deltaEMode = 0; ///< Colour-difference formula, numbered as measurementDataRecord::deltaEType.
+    int deltaEMode =
+        0; ///< Colour-difference formula, numbered as measurementDataRecord::deltaEType.
     int illuminationCondition = 0;
     int fograPSDPreset = 0; ///< Above 0: judged by the PSD arrays.
     int reserved1 = 0;
@@ -40,6 +42,31 @@ struct analyseResultsRecord {
     bool decimals[presetValueCount] = {};
     bool overallPassed = false;
 };
+
+// Sizes and offsets as libraries built elsewhere know them, with a wxString of 48 bytes.
+static_assert(sizeof(wxString) == 48);
+static_assert(sizeof(tolerancePresetParameterRecord) == 1008);
+static_assert(offsetof(tolerancePresetParameterRecord, filePath) == 0);
+static_assert(offsetof(tolerancePresetParameterRecord, presetID) == 48);
+static_assert(offsetof(tolerancePresetParameterRecord, name) == 56);
+static_assert(offsetof(tolerancePresetParameterRecord, editable) == 104);
+static_assert(offsetof(tolerancePresetParameterRecord, showInClient) == 108);
+static_assert(offsetof(tolerancePresetParameterRecord, usedForDynamicWedge) == 112);
+static_assert(offsetof(tolerancePresetParameterRecord, deltaEMode) == 116);
+static_assert(offsetof(tolerancePresetParameterRecord, illuminationCondition) == 120);
+static_assert(offsetof(tolerancePresetParameterRecord, fograPSDPreset) == 124);
+static_assert(offsetof(tolerancePresetParameterRecord, reserved1) == 128);
+static_assert(offsetof(tolerancePresetParameterRecord, reserved2) == 132);
+static_assert(offsetof(tolerancePresetParameterRecord, presetValues) == 136);
+static_assert(offsetof(tolerancePresetParameterRecord, psdPresetValues) == 392);
+static_assert(offsetof(tolerancePresetParameterRecord, usedForResult) == 632);
+static_assert(offsetof(tolerancePresetParameterRecord, decimalPlaces) == 760);
+static_assert(offsetof(tolerancePresetParameterRecord, usedForPSDResult) == 888);
+static_assert(sizeof(analyseResultsRecord) == 928);
+static_assert(offsetof(analyseResultsRecord, values) == 0);
+static_assert(offsetof(analyseResultsRecord, approvals) == 856);
+static_assert(offsetof(analyseResultsRecord, decimals) == 888);
+static_assert(offsetof(analyseResultsRecord, overallPassed) == 920);
 
 #if defined(TINTGATE_LIBRARY)
 #define TINTGATE_API __attribute__((visibility("default")))

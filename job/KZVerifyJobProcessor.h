@@ -94,13 +94,17 @@ class KZVerifyJobProcessor {
     CKZConnector* m_connector = nullptr; ///< Owned; null until a login has succeeded.
     int m_lastRetCode = 0;               ///< Last return code of the connector.
 
+    /// Whether the loaded job's ticket contains the measurement to compare. If not, or if a new
+    /// measurement is asked for, the job is measured.
+    static bool IsToBeCompared(const KZJobDataStruct& job, bool remeasure);
+    /// Compares the measurement that the ticket holds. Writes nothing to the ticket.
+    int CompareStoredData(KZJobDataStruct* job, std::wstring* json);
+
   private:
     /// Whether the server lists the job among those to be verified or remeasured.
     bool IsListed(int jobID, bool remeasure);
     /// All that follows once a job is loaded.
     int VerifyLoadedJob(KZJobDataStruct* job, bool remeasure);
-    /// Compares the measurement that the ticket holds. Writes nothing to the ticket.
-    int CompareStoredData(KZJobDataStruct* job, std::wstring* json);
     /// Compares referenceFile with sampleFile. *results may be null.
     int AnalyzeJob(KZJobDataStruct* job, analyseResultsRecord* results, std::wstring* json);
     /// A new measurement and its comparison.

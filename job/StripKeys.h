@@ -4,10 +4,22 @@
 // are used.
 #pragma once
 
+#include <optional>
+#include <stdexcept>
 #include <string>
 #include <string_view>
 
 enum class Strip { first, second };
+
+/// The strip selector of a call. Nothing if the text does not start with a whole number, or if the
+/// number does not fit an int.
+inline std::optional<int> stripSelectorOf(const std::wstring& text) {
+    try {
+        return std::stoi(text);
+    } catch (const std::logic_error&) {
+        return std::nullopt;
+    }
+}
 
 /// Of KZJobDataStruct::secondStrip: 0 is the first strip, any other value the second.
 inline Strip stripOf(int secondStrip) {

@@ -3,7 +3,6 @@
 #include <chrono>
 #include <iterator>
 #include <optional>
-#include <stdexcept>
 #include <string>
 #include <thread>
 
@@ -23,15 +22,6 @@ namespace {
 using std::chrono::steady_clock;
 
 constexpr int applicationID = 0x5071103;
-
-/// Nothing where the text is no whole number or beyond what an int holds.
-std::optional<int> numberOf(const std::wstring& text) {
-    try {
-        return std::stoi(text);
-    } catch (const std::logic_error&) {
-        return std::nullopt;
-    }
-}
 
 /// Bytes that were widened one by one become text again.
 wxString textOf(const std::wstring& text) {
@@ -59,14 +49,6 @@ std::chrono::milliseconds pauseAfter(steady_clock::duration login) {
     constexpr double longest = 5000.0;
     const double pause = std::chrono::duration<double>(login).count() * 1000.0 / 3.0;
     return std::chrono::milliseconds(static_cast<int>(std::min(pause, longest)));
-}
-
-/// Whether the ticket holds what is to be shown; else the job is measured.
-bool isMeasured(const KZJobDataStruct& job) {
-    constexpr int inlineDevices[] = {40, 45, 46, 47};
-    return job.jobType == 2 || job.jobType == 3 ||
-           (job.secondStrip == 1 &&
-            std::count(std::begin(inlineDevices), std::end(inlineDevices), job.deviceID) != 0);
 }
 
 /// Writes a file for the viewer, logging where that fails.
@@ -112,7 +94,7 @@ int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std:
         Helper::LaunchNerovaVerify(result, false, wxString(), true);
         return result;
     }
-    const std::optional<int> stripNumber = numberOf(strip);
+    const std::optional<int> stripNumber = stripSelectorOf(strip);
     if (host.empty() || user.empty() || !stripNumber) {
         return exitWrongArguments;
     }
@@ -177,7 +159,7 @@ int KZVerifyJobProcessor::VerifyLoadedJob(KZJobDataStruct* job, bool remeasure) 
     }
     CLogger::GetLogger()->Log("m_jobType is = %d", job->jobType);
     std::wstring json;
-    if (!remeasure && isMeasured(*job)) {
+    if (IsToBeCompared(*job, remeasure)) {
         result = CompareStoredData(job, &json);
         return result == exitDone ? showResult(*job, json) : result;
     }
@@ -189,6 +171,15 @@ int KZVerifyJobProcessor::VerifyLoadedJob(KZJobDataStruct* job, bool remeasure) 
         job->measurement = measurementDataRecord(); // Its arrays went with the write-back.
     }
     return result;
+}
+
+bool KZVerifyJobProcessor::IsToBeCompared(const KZJobDataStruct& job, bool remeasure) {
+    constexpr int inlineDevices[] = {40, 45, 46, 47};
+    const bool isMeasured =
+        job.jobType == 2 || job.jobType == 3 ||
+        (job.secondStrip == 1 &&
+         std::count(std::begin(inlineDevices), std::end(inlineDevices), job.deviceID) != 0);
+    return !remeasure && isMeasured;
 }
 
 // A missing reference file is logged and does not end this road: the analysis says what is wrong.

@@ -152,6 +152,23 @@ class ChildSignalKept {
     struct sigaction m_before;
 };
 
+// A child that is started meanwhile ignores the end of its terminal. The viewer outlives the tool,
+// and so may be told of that end before it can ignore it by itself.
+class HangUpIgnored {
+  public:
+    HangUpIgnored() {
+        struct sigaction ignored = {};
+        ignored.sa_handler = SIG_IGN;
+        sigaction(SIGHUP, &ignored, &m_before);
+    }
+    ~HangUpIgnored() { sigaction(SIGHUP, &m_before, nullptr); }
+    HangUpIgnored(const HangUpIgnored&) = delete;
+    HangUpIgnored& operator=(const HangUpIgnored&) = delete;
+
+  private:
+    struct sigaction m_before;
+};
+
 // One word of a command line, which eats backslashes and quotes.
 wxString quoted(const wxString& word) {
     wxString escaped = word;
@@ -295,6 +312,7 @@ bool Helper::LaunchNerovaVerify(int& exitCode, bool wait, const wxString& argume
         return false;
     }
     const wxString path = viewer.GetFullPath();
+    const HangUpIgnored hangUp;
     long code = CheckFileValidity(path) ? execute(path, arguments, wait) : -1;
     if (code == 255) {
         code = -1;

@@ -86,10 +86,11 @@ int lookUpEskoReferences(const JobLoad& load) {
     if (!path.empty()) {
         fetchFile(load, path, usualWait, &load.job->referenceFile);
     }
-    if (load.ticket.read("Footer/ControlstripIT8", &path) != 0 || path.empty()) {
+    std::string strip; // As for a profile: a path that is no UTF-8 is one.
+    if (load.ticket.read("Footer/ControlstripIT8", &strip) != 0 || strip.empty()) {
         return noReference;
     }
-    fetchFile(load, path, usualWait, &load.job->controlStripFile);
+    fetchFile(load, wxString::FromUTF8(strip), usualWait, &load.job->controlStripFile);
     return 0;
 }
 

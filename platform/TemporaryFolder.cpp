@@ -1,6 +1,8 @@
 #include "platform/TemporaryFolder.h"
 
 #include <cstdlib>
+#include <filesystem>
+#include <system_error>
 
 #include <sys/stat.h>
 #include <unistd.h>
@@ -12,6 +14,13 @@ namespace {
 bool isFolder(const char* path) {
     struct stat status;
     return stat(path, &status) == 0 && S_ISDIR(status.st_mode);
+}
+
+/// The path as seen from the current folder; unchanged if there is none any more.
+std::string absolute(const std::string& path) {
+    std::error_code failure;
+    const std::filesystem::path folder = std::filesystem::current_path(failure);
+    return failure ? path : (folder / path).string();
 }
 
 } // namespace
@@ -27,7 +36,9 @@ std::string temporaryFolder() {
     for (const char* variable : {"TMPDIR", "TMP", "TEMP"}) {
         const char* path = std::getenv(variable);
         if (path != nullptr && isFolder(path)) {
-            return path;
+            const std::string folder = absolute(path);
+            setenv(variable, folder.c_str(), 1);
+            return folder;
         }
     }
     std::string path = "/tmp/tintgate-" + std::to_string(geteuid());

@@ -7,7 +7,8 @@ namespace platform {
 
 /// The folder for temporary files, as bytes, or empty if there is none that may be used.
 ///
-/// The first of TMPDIR, TMP and TEMP that names a folder. Else /tmp/tintgate-UID, made with mode
+/// The first of TMPDIR, TMP and TEMP that names a folder. A relative path is made absolute, in the
+/// variable too: the viewer and other children run in folders of their own. Else /tmp/tintgate-UID, made with mode
 /// 0700 where it is missing, used only if it is a folder of this user, and exported as TMPDIR so
 /// that wxFileName::GetTempDir and every child process find the same one.
 ///

@@ -37,6 +37,9 @@ void addJobCommands(Command program, Invocation& invocation);    ///< jobs, rese
 void addJdfCommands(Command program, Invocation& invocation);    ///< jdf ...
 void addCopyCommand(Command program, Invocation& invocation);    ///< copy
 
+/// diagnose
+void addDiagnoseCommand(Command program, Invocation& invocation);
+
 /// A command with its options' values, which it is given when it is run.
 template<class Options>
 Command addCommand(Command group, Invocation& invocation, const std::string& name,

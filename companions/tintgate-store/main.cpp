@@ -35,6 +35,7 @@ Examples:
   tintgate-store file versions /jobs/7/job.jdf
   tintgate-store reset 7 --strip 1
   tintgate-store jdf ready 7 --updates 6
+  tintgate-store diagnose 7 --strip 2
 
 Each command has a --help of its own. docs/stores.md shows how to set up a whole job.
 
@@ -128,6 +129,7 @@ int main(int argumentCount, char** arguments) {
     admin::addJobCommands(commands, invocation);
     admin::addJdfCommands(commands, invocation);
     admin::addCopyCommand(commands, invocation);
+    admin::addDiagnoseCommand(commands, invocation);
     program.footer(std::string(footer) + tintgateStoreStatusHelp);
     unmarkOptions(program);
     auto words = markedArguments(argumentCount, arguments);

@@ -1,6 +1,7 @@
 // Shows a verified job: makes a page of its result and opens it. Below the system root this program
 // stands at "/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify", where the tool
 // looks for it.
+#include <csignal>
 #include <cstdio>
 #include <new>
 #include <optional>
@@ -119,6 +120,8 @@ int run(const std::vector<std::string_view>& words) {
 } // namespace
 
 int main(int argumentCount, char** arguments) {
+    // The page is wanted also if the terminal of the run that it shows is closed meanwhile.
+    std::signal(SIGHUP, SIG_IGN);
     try {
         return run({arguments + (argumentCount > 0), arguments + argumentCount});
     } catch (const std::bad_alloc&) {

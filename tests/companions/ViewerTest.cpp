@@ -128,9 +128,11 @@ TEST_F(Viewer, ListsAPageARunAndPassesOverWhatIsNone) {
 }
 
 TEST_F(Viewer, OpensThePageWhereThereIsADisplay) {
-    const std::string opener = m_scratch.write(
-        "xdg-open",
-        "#!/bin/sh\nprintf '%s' \"$*\" > \"$OPENED.part\" && mv \"$OPENED.part\" \"$OPENED\"\n");
+    const std::string opener =
+        m_scratch.write("xdg-open",
+                        // Neither the viewer nor the browser ends with the terminal.
+                        "#!/bin/sh\nkill -HUP $$\nprintf '%s' \"$*\" > \"$OPENED.part\" && mv "
+                        "\"$OPENED.part\" \"$OPENED\"\n");
     std::filesystem::permissions(opener, std::filesystem::perms::owner_all);
     const std::string opened = m_scratch.path("opened");
     support::RunOptions options = withoutDisplay();

@@ -46,7 +46,8 @@ ARROWS = {
     "store": "base StoreEngine",
     "ComGUI": "commrecords ticketrecords ticketengine StoreEngine store",
     "bytes": "",
-    "tintgate-store": "bytes store",
+    "diagnosis": "base job comm records logger log helper libTintgate platform store",
+    "tintgate-store": "bytes diagnosis store",
     "tintgate-report": "report analysis libTintgate bytes store platform",
 }
 
@@ -58,7 +59,7 @@ EXPOSES = {
     "report": "colour",
     "measuring": "colour",
     "analysis": "records",
-    "ticket": "ticketrecords",
+    "ticket": "ticketrecords text",
     "ticketengine": "ticketrecords",
     "StoreEngine": "ticketengine",
     "store": "StoreEngine",

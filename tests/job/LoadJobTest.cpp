@@ -222,6 +222,7 @@ TEST_F(LoadJob, FindsReferences) {
         {esko, "formula=0 jdf= preset=none reference= workflow=4"},
         {esko + "Footer/ControlstripIT8='/s/in/esko.it8",
          "jdf= reference= strip=/s/in/esko.it8 workflow=4"},
+        {esko + "Footer/ControlstripIT8='\xff", "jdf= reference= workflow=4"},
         {esko + "Footer/ControlstripIT8='/s/in/esko.it8 " + chart + "-",
          "jdf= reference=/s/ControlCharts/strip.it8 strip=/s/in/esko.it8 workflow=4"},
     });

@@ -180,6 +180,19 @@ TEST_F(Viewer, IsStartedInItsFolder) {
     EXPECT_EQ(fs::current_path(), m_folder) << "it is left where there is no viewer";
 }
 
+// Its terminal may close before it has come as far as to ignore that by itself.
+TEST_F(Viewer, SurvivesTheEndOfItsTerminal) {
+    writeViewer(m_viewer);
+    const std::string lines = support::contentsOf(m_root.path(m_viewer));
+    writeScript(m_viewer, "kill -HUP $$\n" + lines);
+    int exitCode = 7;
+    EXPECT_TRUE(Helper::LaunchNerovaVerify(exitCode, false, " -x", true));
+    EXPECT_EQ(report(), m_folder + "\nNerova Verify\n-x\n");
+    struct sigaction own;
+    sigaction(SIGHUP, nullptr, &own);
+    EXPECT_EQ(own.sa_handler, SIG_DFL) << "of the tool";
+}
+
 TEST_F(Viewer, TakesThePlaceOfOneThatRuns) {
     const support::RunningProgram old(m_root.copyProgram("/bin/sleep", m_nwjs));
     const support::RunningProgram other(m_root.copyProgram("/bin/sleep", "Other.app/x"));

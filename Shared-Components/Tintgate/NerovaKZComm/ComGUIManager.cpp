@@ -52,6 +52,7 @@ const MTICKET_ADMIN* adminOf(const MTICKET_ACCESS* container) {
 
 ComGUIManager* ComGUIManager::m_pInstance = nullptr;
 bool ComGUIManager::m_bAcceptNotification = false;
+ComGUIModuleInterface** ComGUIManager::m_givenInterface = nullptr;
 
 ComGUIManager* ComGUIManager::GetInstance(bool privateManager) {
     if (privateManager) {
@@ -63,11 +64,13 @@ ComGUIManager* ComGUIManager::GetInstance(bool privateManager) {
     return m_pInstance;
 }
 
+void ComGUIManager::UseInterface(ComGUIModuleInterface** interface) {
+    m_givenInterface = interface;
+}
+
 ComGUIManager::ComGUIManager() : m_record(std::make_unique<ComSessionRecord>()) {
-    __CFBundle* plugIn = nullptr;
-    RegisterPlugIn(&plugIn); // What it failed at, it has said.
     bool usable = false;
-    if (CreateComGUIModuleInterface(plugIn, &m_interface) == 0) {
+    if (FindInterface()) {
         m_table = **m_interface;
         usable = (*m_interface)->CreateInstance(&m_instance) == 0;
         if (usable) {
@@ -84,6 +87,16 @@ ComGUIManager::ComGUIManager() : m_record(std::make_unique<ComSessionRecord>()) 
 
 ComGUIManager::~ComGUIManager() = default;
 
+bool ComGUIManager::FindInterface() {
+    if (m_givenInterface != nullptr) {
+        m_interface = m_givenInterface;
+        return true;
+    }
+    __CFBundle* plugIn = nullptr;
+    RegisterPlugIn(&plugIn); // What it failed at, it has said.
+    return CreateComGUIModuleInterface(plugIn, &m_interface) == 0;
+}
+
 void ComGUIManager::RefuseFromNowOn() {
     static ComGUIModuleInterface* interface = &refusingPlugIn;
     m_interface = &interface;
@@ -91,16 +104,18 @@ void ComGUIManager::RefuseFromNowOn() {
     m_instance = nullptr;
 }
 
-int ComGUIManager::RegisterPlugIn(__CFBundle** plugIn) {
+std::wstring ComGUIManager::PlugInPath() {
     std::wstring suite = Helper::GetHWBInstallationPath().ToStdWstring();
     if (suite.empty()) {
         suite =
             base::wideFromBytes(platform::systemRoot()); // What follows is a fixed path then.
     }
-    const std::wstring path =
-        suite + static_cast<wchar_t>(wxFileName::GetPathSeparator()) + L"lib/" + pszLibName;
+    return suite + static_cast<wchar_t>(wxFileName::GetPathSeparator()) + L"lib/" + pszLibName;
+}
+
+int ComGUIManager::RegisterPlugIn(__CFBundle** plugIn) {
     const OwnedString string(CFStringCreateWithCString(
-        kCFAllocatorDefault, StringUtilsComGUI::stringFromwstring(path).c_str(),
+        kCFAllocatorDefault, StringUtilsComGUI::stringFromwstring(PlugInPath()).c_str(),
         kCFStringEncodingMacRoman));
     if (string == nullptr) {
         complain("CFStringCreateWithCString failed\n");

@@ -41,6 +41,12 @@ class ComGUIManager {
     /// by each call, which belongs to the caller.
     static ComGUIManager* GetInstance(bool privateManager);
 
+    /// Managers made after this call use this interface and load no bundle. It must outlive them.
+    /// For a program that is its own server, such as one that examines a store.
+    static void UseInterface(ComGUIModuleInterface** interface);
+    /// Path of the bundle that a manager loads.
+    static std::wstring PlugInPath();
+
     ComGUIManager();
     /// Neither logs out nor releases the plug-in.
     ~ComGUIManager();
@@ -154,6 +160,8 @@ class ComGUIManager {
     int SendJob(TJobIdentification* job, const char* first, const char* second);
 
   private:
+    /// Sets m_interface to the given interface, or to the bundle's. False if there is neither.
+    bool FindInterface();
     void RefuseFromNowOn();
     template<class Array, class Value>
     Array ReadArray(int type, int id, const char* key, PARAM_TYPE ptype,
@@ -161,6 +169,7 @@ class ComGUIManager {
 
     static ComGUIManager* m_pInstance;
     static bool m_bAcceptNotification; ///< Written only.
+    static ComGUIModuleInterface** m_givenInterface; ///< Of UseInterface, or null.
 
     std::unique_ptr<ComSessionRecord> m_record;
     ComGUIModuleInterface m_table; ///< A copy: an operation costs one indirect call.
