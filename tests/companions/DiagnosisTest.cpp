@@ -334,6 +334,11 @@ TEST(Diagnosis, NamesWhyAMeasurementFails) {
          all({put("/server/d.it8", "DEVICE 33\n"), set(dynamic + path + "/server/d.it8", 9)}),
          job9},
         {"missing chart", 10, {chart, "No such file", "reference"}, removeFile(chart), job9},
+        {"no references of a packaging job", 10,
+         {"/server/ControlCharts/other.it8", "It is the reference"},
+         set("Job/FromEsko=1 Workflow/Verify/MeasurementWorkflow=4 "
+             "Workflow/Verify/CharacterizationData=- Footer/ControlstripFile='other.it8 "
+             "Footer/ControlstripIT8='/server/ControlCharts/example.it8", 9), job9},
         {"damaged chart", 22, {chart, "22, "}, put(chart, "a;b\n"), job9},
         {"one name for two files", 106, {"NUMBER_OF_COLS", "example.it8", "same name as", strip},
          all({putFile("/server/IT8_CharacterizationData/example.it8", fogra39),
