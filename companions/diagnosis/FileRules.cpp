@@ -23,7 +23,7 @@ struct ReservedName {
 const std::vector<ReservedName>& reservedNames() {
     static const std::vector<ReservedName> all = {
         {"Measured sample.txt",
-         {exitReferenceMissing, 38, exitSampleMissing},
+         {exitReferenceMissing, exitTargetIsMeasurement, exitSampleMissing},
          true,
          "The measurement is written to this name, so that it would be compared with itself."},
         {"Measured reference.txt",

@@ -11,7 +11,6 @@
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
 
-#include "ExitCodes.h"
 #include "store/StoreEngine.h"
 #include "tests/job/JobPlace.h"
 
@@ -92,13 +91,6 @@ constexpr char strip[] = "/server/ControlCharts/example.it8";
 constexpr char preset[] = "/server/tickets/CVP_0001.xml";
 constexpr char chart[] = "/server/IT8_CharacterizationData/FOGRA39L.ti3";
 constexpr char fogra39[] = "/usr/share/color/icc/FOGRA39L.ti3";
-
-/// 0 if the library has no code of this name.
-int codeNamed(const std::string& name) {
-    const auto found = std::find_if(std::begin(exitCodeTexts), std::end(exitCodeTexts),
-                                    [&](const ExitCodeText& text) { return text.name == name; });
-    return found == std::end(exitCodeTexts) ? 0 : found->code;
-}
 
 /// Tickets, files and users of a store.
 std::string everything(const Place& place) {
@@ -269,7 +261,6 @@ TEST(Diagnosis, NamesWhyAComparisonFails) {
     const std::string profile = "Workflow/Verify/MeasurementWorkflow=1 Remote/UsedICCProfile=";
     const std::string measured = "Remote/Measurement/";
     const std::string dataKey = "Workflow/Verify/CharacterizationData";
-    const int sameFile = codeNamed("TargetIsMeasurement");
     const std::string data = "Workflow/Verify/MeasurementWorkflow=2 "
                              "Workflow/Verify/CharacterizationData='";
     expectCauses({
@@ -293,11 +284,11 @@ TEST(Diagnosis, NamesWhyAComparisonFails) {
         {"inline job", 107, {"Numpatches", "example.it8", "reads as 0", "KEYWORD DEVICE"},
          all({replaceIn(strip, "DEVICE 33", "KEYWORD DEVICE\r\nDEVICE 33"), set("Input/SubType=96",
          9)}), {.job = "9"}},
+        {"a name of the tool's own", 38, {"Measured sample.txt", "reserved", "with itself"},
+         all({putFile("/server/a(TEMP)/Measured sample.txt", fogra39),
+              setText(dataKey, "/server/a(TEMP)/Measured sample.txt"),
+              set("Workflow/Verify/MeasurementWorkflow=2")})},
         // These succeed, and should not.
-        {"a name of the tool's own", sameFile, {"Measured sample.txt", "reserved", "with itself"},
-         all({putFile("/server/a(TEMP)/Measured sample.txt", fogra39), setText(dataKey,
-         "/server/a(TEMP)/Measured sample.txt"), set("Workflow/Verify/MeasurementWorkflow=2")}), {},
-         Then::IsWrong},
         {"ints", 0, {measured + "XYZValues/YValues", "contains an int as element 0"}, set(measured +
          "XYZValues/YValues=1,2,3"), {}, Then::IsWrong},
         {"short array", 0, {measured + "LabValues/AValues", "contains 2 of 48 elements"},
@@ -343,6 +334,11 @@ TEST(Diagnosis, NamesWhyAMeasurementFails) {
          all({put("/server/d.it8", "DEVICE 33\n"), set(dynamic + path + "/server/d.it8", 9)}),
          job9},
         {"missing chart", 10, {chart, "No such file", "reference"}, removeFile(chart), job9},
+        {"no references of a packaging job", 10,
+         {"/server/ControlCharts/other.it8", "It is the reference"},
+         set("Job/FromEsko=1 Workflow/Verify/MeasurementWorkflow=4 "
+             "Workflow/Verify/CharacterizationData=- Footer/ControlstripFile='other.it8 "
+             "Footer/ControlstripIT8='/server/ControlCharts/example.it8", 9), job9},
         {"damaged chart", 22, {chart, "22, "}, put(chart, "a;b\n"), job9},
         {"one name for two files", 106, {"NUMBER_OF_COLS", "example.it8", "same name as", strip},
          all({putFile("/server/IT8_CharacterizationData/example.it8", fogra39),
