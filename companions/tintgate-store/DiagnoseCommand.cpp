@@ -27,7 +27,7 @@ struct DiagnoseOptions {
 using diagnosis::Diagnosis;
 using diagnosis::Finding;
 
-/// "103, The job's tolerance preset could not be read".
+/// "103, The job's tolerance preset could not be loaded".
 std::string codeText(int code) {
     const auto found = std::find_if(std::begin(exitCodeTexts), std::end(exitCodeTexts),
                                     [&](const ExitCodeText& text) { return text.code == code; });
