@@ -88,8 +88,7 @@ class NewFile {
 
     /// Puts it in place of the target.
     bool replace(const std::string& target) {
-        if (!giveName() || !m_file.close() ||
-            std::rename(m_name.c_str(), target.c_str()) != 0) {
+        if (!giveName() || !m_file.close() || std::rename(m_name.c_str(), target.c_str()) != 0) {
             return false;
         }
         m_name.clear();

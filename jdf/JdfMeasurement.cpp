@@ -47,8 +47,8 @@ double percent(double value) {
 }
 
 /// Writes pieces at one place of a buffer. Meanwhile the text after that place is at the buffer's
-/// end, so that it moves twice, whatever the number of pieces, and nothing has to be allocated. Each
-/// piece is counted against the limit as if it were inserted by itself.
+/// end, so that it moves twice, whatever the number of pieces, and nothing has to be allocated.
+/// Each piece is counted against the limit as if it were inserted by itself.
 class Pieces {
   public:
     Pieces(char* at, char* buffer, char* limit, long* length)
