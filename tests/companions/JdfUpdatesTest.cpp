@@ -355,6 +355,19 @@ TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     EXPECT_EQ(measurements(stored()), "");
 }
 
+TEST_F(JdfUpdates, OfStripsAtOverlappingTimesAreBroughtTogether) {
+    put(delivered);
+    answer({"jdf", "ready", "7"});
+    const std::string downloaded = stored(); // By the second strip's run, before the first ends.
+    runJobs("s1");
+    m_folder.write("local.jdf", downloaded);
+    update('s', '2');
+    put(support::contentsOf(m_folder.path("local.jdf")));
+    ASSERT_EQ(measurements(stored()), "2:02");
+    answer({"jdf", "rebuild", "7"});
+    expectWhole(prepared, "1:01 2:02");
+}
+
 TEST_F(JdfUpdates, RefuseTextsThatTakeMoreThanTheirShare) {
     std::string many = "<JDF>";
     for (int i = 0; i < 2'000'000; ++i) {

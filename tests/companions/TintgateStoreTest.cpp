@@ -251,7 +251,8 @@ TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
 }
 
 TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
-    const std::string measured = " Remote/Measurement/Status=1 Remote/Measurement/Approval=1 ";
+    const std::string measured = " Remote/Measurement/Status=1 Remote/Measurement/Approval=1 "
+                                 "Remote/Measurement/Values/Decimal=2 ";
     const std::string closed = "Job/Display/Status=211 Remote/ShowInVerifier=0" + measured;
     std::pair<std::string, std::string> jobs[] = {
         {"Job/Display/Status=208", "waiting 208 - - -"},
@@ -264,8 +265,10 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
         {"Job/Display/Status=208 Remote/ShowInVerifier=0 General/ParentID=5" + measured,
          "waiting 208 passed - 5"},
         {closed + "General/ParentID=5 Remote/Measurement2/Status=1 Remote/Measurement2/Approval=0",
-         "passed 211 passed failed 5"},
-        {closed + "General/ParentID=4", "passed 211 passed - 4"},
+         "passed 211 passed cut off 5"},
+        {closed + "General/ParentID=4 Workflow/Verify/Active=3 Remote/Measurement2/Approval=0 "
+                  "Remote/Measurement2/Values/PSDDecimal=1",
+         "passed 211 passed failed 4"},
     };
     for (const auto& job : jobs) {
         makeTicket(3, static_cast<int>(&job - jobs) + 1, contentOf(job.first));
@@ -288,6 +291,42 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
     jobs[6].second = "waiting 211 - - 5";
     expectList();
     expectRefusal({"reset", "9"}, 1, "there is no job 9");
+}
+
+TEST_F(TintgateStore, AResetWarnsOfRunsThatCannotSucceed) {
+    const std::string waits = "Job/Display/Status=208 ";
+    const std::string strip = "Footer/ControlstripFile='abcd ";
+    const std::string fine = waits + strip + "Workflow/Verify/MeasurementWorkflow=";
+    const struct {
+        std::string keys, words; ///< No words: no warning.
+    } cases[] = {
+        {fine + "1 Remote/UsedICCProfile='p", ""},
+        {fine + "3 Footer/ControlstripInputProfile='p", ""},
+        {fine + "2 Workflow/Verify/CharacterizationData='d", ""},
+        {fine + "4 Job/FromEsko=1", ""},
+        {waits + "Footer/Dynstrip/UseDynstrip=1 Footer/Dynstrip/IT8='s", ""},
+        {fine + "1", "strip 1: it has no profile as reference (Footer/ControlstripInputProfile"},
+        {fine + "3 Remote/Measurement/Reference/Numpatches=1 Remote/UsedICCProfile='",
+         "references in the ticket count only for a strip that is measured"},
+        {fine + "2", "strip 1: it has no reference (Workflow/Verify/CharacterizationData)"},
+        {fine + "4", "no reference (Workflow/Verify/MeasurementWorkflow)"},
+        {fine + "1 Remote/UsedICCProfile='p Footer/ControlstripFile='abc",
+         "strip 1: it has no control strip (Footer/ControlstripFile, Footer/Nesting/"},
+        {fine + "1 Remote/UsedICCProfile='p Workflow/Verify/Active=3",
+         "strip 2: it has no reference (Workflow/Verify/MeasurementWorkflow2)"},
+        {fine + "1 Remote/UsedICCProfile='p Input/FileType=4096", "never verified"},
+        {"Job/Display/Status=211 " + strip, "only a remeasure finds it"},
+        {waits + "Footer/Dynstrip/UseDynstrip=1", "no control strip (Footer/Dynstrip/IT8)"},
+    };
+    for (const auto& [keys, words] : cases) {
+        SCOPED_TRACE(keys);
+        makeTicket(3, 7, contentOf(keys + " Remote/Measurement/Status=1"));
+        const support::Outcome outcome = run({"reset", "7"});
+        EXPECT_EQ(outcome.exitCode, 0);
+        EXPECT_THAT(outcome.output, HasSubstr("removed Remote/Measurement/Status"));
+        EXPECT_THAT(outcome.error, words.empty() ? testing::Eq(words)
+                                                 : testing::Matcher<std::string>(HasSubstr(words)));
+    }
 }
 
 TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
