@@ -10,6 +10,8 @@
 #include <string>
 #include <vector>
 
+#include <unistd.h>
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -327,6 +329,40 @@ TEST_F(TintgateStore, AResetWarnsOfRunsThatCannotSucceed) {
         EXPECT_THAT(outcome.error, words.empty() ? testing::Eq(words)
                                                  : testing::Matcher<std::string>(HasSubstr(words)));
     }
+}
+
+TEST_F(TintgateStore, AStoreOfAGroupIsForAllItsMembersAndNobodyElse) {
+    expectRefusal({"-s", m_folder.path("new"), "make", "--group", "no such group"}, 3, "no group");
+    expectRefusal({"make", "--group", "games"}, 2, "exists");
+    expectRefusal({"-s", "service", "make", "--group", "games"}, 64, "folder");
+    if (geteuid() != 0) {
+        GTEST_SKIP() << "only root can be several people";
+    }
+    const std::string store = m_folder.path("shared");
+    answer({"-s", store, "make", "--group", "games"});
+    std::filesystem::permissions(m_folder.path(), std::filesystem::perms(0755));
+    const std::string file = m_folder.write("file", "text");
+    std::filesystem::permissions(file, std::filesystem::perms(0644));
+    // As a person of this number and group whose umask keeps everything to themselves.
+    const auto as = [&](int user, const char* group, const std::string& words) {
+        const std::string number = std::to_string(user);
+        return support::run({"setpriv", "--reuid=" + number, "--regid=" + number,
+                             std::string("--groups=") + group, "sh", "-c",
+                             "umask 077; exec \"$0\" -s \"$1\" " + words, TINTGATE_STORE_PROGRAM,
+                             store});
+    };
+    for (const int user : {4001, 4002}) {
+        const std::string put = "file put " + file + " /";
+        for (const std::string& words :
+             {put + "a/b/file", put + std::to_string(user) + "/file",
+              std::string("ticket create job"), std::string("key set system Note int 1")}) {
+            const auto outcome = as(user, "games", words);
+            EXPECT_EQ(outcome.exitCode, 0) << user << words << outcome.error;
+        }
+    }
+    EXPECT_EQ(as(4002, "games", "file put " + file + " /4001/file").exitCode, 0);
+    EXPECT_EQ(as(4001, "games", "file restore /a/b/file 1").exitCode, 0);
+    EXPECT_EQ(as(4003, "4003", "info").exitCode, 4);
 }
 
 TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
