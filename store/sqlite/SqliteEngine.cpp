@@ -335,6 +335,9 @@ class SqliteEngine : public StoreEngine {
     bool change(int type, int id, const Scope& scope,
                 const std::function<void(TicketContent&)>& work) override {
         Transaction transaction(m_database);
+        if (scope.make) {
+            insert(type, id);
+        }
         std::int64_t ticket = 0;
         {
             auto run = m_lock.run(type, id);
@@ -355,10 +358,11 @@ class SqliteEngine : public StoreEngine {
         }
         const TicketContent before = content; // Shares the elements: a change makes others.
         work(content);
-        if (write(ticket, scope, before, content)) {
-            if (type == jobType) {
-                writeOverview(id, scope, content);
-            }
+        const bool written = write(ticket, scope, before, content);
+        if (written && type == jobType) {
+            writeOverview(id, scope, content);
+        }
+        if (written || scope.make) {
             transaction.commit();
         }
         return true;

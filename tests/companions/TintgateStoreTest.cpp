@@ -77,7 +77,7 @@ class TintgateStore : public StoreProgram {
     void makeTicket(int type, int id, const store::TicketContent& content) const {
         const auto engine = open();
         engine->create(type, id);
-        engine->change(type, id, store::Scope{true, {}},
+        engine->change(type, id, store::Scope{.everything = true},
                        [&](store::TicketContent& stored) { stored.transfer(content, true); });
     }
 };
