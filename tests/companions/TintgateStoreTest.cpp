@@ -224,6 +224,11 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     EXPECT_EQ(answer({"key", "get", "job/7", "B", "--raw"}), bytes);
     answer({"key", "set", "job/7", "Escape", "string", "\x1b[2J"});
     EXPECT_THAT(answer({"key", "list", "job/7", "E"}), HasSubstr("\\x1B[2J"));
+    EXPECT_EQ(answer({"key", "get", "job/7", "Escape"}), "\x1b[2J\n");
+    const auto shown =
+        support::run({"python3", "-c", "import pty, sys; pty.spawn(sys.argv[1:])",
+                      TINTGATE_STORE_PROGRAM, "-s", m_address, "key", "get", "job/7", "Escape"});
+    EXPECT_EQ(shown.output, "\\x1B[2J\r\n");
 }
 
 TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
@@ -379,6 +384,15 @@ TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
     const auto warned = run({"-s", m_folder.makeFolder(std::string(128, 'd')) + "/store", "make"});
     EXPECT_EQ(warned.exitCode, 0);
     EXPECT_THAT(warned.error, HasSubstr("a job can name at most 127"));
+    for (const char* command : {"make", "info"}) {
+        EXPECT_EQ(run({"-s", m_folder.path("K\xC3\xB6ln"), command}).error, "");
+        EXPECT_THAT(run({"-s",
+                         m_folder.path("\xC5\x81\xC3\xB3"
+                                       "d\xC5\xBA"),
+                         command})
+                        .error,
+                    HasSubstr("characters that a job can't name"));
+    }
 }
 
 /// The fixture's store is a folder, and there is a database for a copy of it.
