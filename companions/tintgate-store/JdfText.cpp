@@ -5,6 +5,7 @@
 
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/XmlMap.h"
 
 namespace admin {
@@ -96,13 +97,13 @@ class Preparation {
         : m_text(text), m_map(map), m_declaration(declares ? namespaceDeclaration : "") {}
 
     PreparedJdf run() {
-        for (const char* const party : parties) {
-            const auto* const element = m_map.first(party);
-            if (element != nullptr) {
-                emptyDates(*element);
+        for (std::size_t i = 0; i < std::size(parties); ++i) {
+            if (m_parties[i] != nullptr) {
+                emptyDates(*m_parties[i]);
             }
-            hideDatesOfOthers(party, element);
+            hideDatesOfOthers(parties[i], m_parties[i]);
         }
+        tellHidden();
         ensureHolder();
         if (m_map.first(linkName) == nullptr) {
             addTo("ResourceLinkPool", "<tazo:MeasurementDataLink" + m_declaration +
@@ -154,33 +155,46 @@ class Preparation {
     /// from it.
     void hideDatesOfOthers(const std::string& party, const XmlElement* element) {
         const std::size_t from = m_text.find("<" + party);
-        if (from == std::string_view::npos) {
-            return;
-        }
         const std::size_t end = element == nullptr ? m_text.size() : element->tag;
         for (const std::string_view token : {dateToken, timeToken}) {
-            for (auto at = m_text.find(token, from); at < end; at = m_text.find(token, at + 1)) {
-                hide(at, at + token.find('='));
+            std::size_t at = from;
+            while ((at = m_text.find(token, at)) < end) {
+                const auto* const around = m_map.withTagAround(at);
+                if (around == nullptr || around->name.empty()) {
+                    at += token.size();
+                    continue;
+                }
+                if (std::find(std::begin(m_parties), std::end(m_parties), around) ==
+                    std::end(m_parties)) {
+                    hideIn(*around, token);
+                }
+                at = around->tagEnd;
             }
         }
     }
 
-    /// If it is the name of another element's attribute, which ends there.
-    void hide(std::size_t at, std::size_t nameEnd) {
-        const auto* const element = m_map.withTagAround(at);
-        if (element == nullptr || element->name.empty() || element == m_map.first("Sender") ||
-            element == m_map.first("Receiver") || m_hidden.count(at) != 0) {
-            return;
-        }
-        for (const XmlAttribute& attribute : m_map.attributesOf(*element)) {
-            if (attribute.nameBegin + attribute.name.size() == nameEnd) {
-                m_hidden.insert(at);
+    void hideIn(const XmlElement& element, std::string_view token) {
+        const std::string_view name = token.substr(0, token.find('='));
+        for (const XmlAttribute& attribute : m_map.attributesOf(element)) {
+            const std::size_t nameEnd = attribute.nameBegin + attribute.name.size();
+            if (attribute.name.ends_with(name) &&
+                m_text.substr(nameEnd).starts_with(token.substr(name.size())) &&
+                m_hidden.insert(nameEnd).second) {
                 m_edits.insert(nameEnd, " ");
-                m_changes.push_back("put a blank behind " + std::string(attribute.name) + " of " +
-                                    std::string(element->name) +
-                                    ", so that no update puts a date into it");
             }
         }
+    }
+
+    void tellHidden() {
+        if (m_hidden.empty()) {
+            return;
+        }
+        const auto* const first = m_map.withTagAround(*m_hidden.begin());
+        m_changes.push_back("put a blank after the name of " +
+                            counted(std::ssize(m_hidden), "date") +
+                            " of other elements, so that no update finds " +
+                            (m_hidden.size() == 1 ? "it" : "them") + " (the first is in " +
+                            std::string(first->name) + ")");
     }
 
     void ensureHolder() {
@@ -248,7 +262,8 @@ class Preparation {
     const std::string_view m_text;
     const XmlMap& m_map;
     const std::string m_declaration;
-    std::set<std::size_t> m_hidden; ///< Places of attributes.
+    const XmlElement* const m_parties[2] = {m_map.first(parties[0]), m_map.first(parties[1])};
+    std::set<std::size_t> m_hidden; ///< Ends of attributes' names.
     Edits m_edits;
     std::vector<std::string> m_changes;
 };
