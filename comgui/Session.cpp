@@ -4,6 +4,7 @@
 #include <cstdio>
 #include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <filesystem>
 #include <fstream>
 #include <utility>
@@ -11,6 +12,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "platform/TemporaryFolder.h"
+#include "store/WriteFailures.h"
 #include "store/tickets/SingleTicket.h"
 
 namespace store {
@@ -119,7 +122,18 @@ std::unique_ptr<StoreEngine> openStoreAt(const std::string& address) {
 
 Session::Session(std::string address, std::unique_ptr<StoreEngine> engine)
     : m_address(std::move(address)), m_engine(std::move(engine)),
-      m_keep(std::make_shared<StoreKeep>(m_engine)), m_container(m_keep) {}
+      m_keep(std::make_shared<StoreKeep>(
+          m_engine,
+          [this](int type, int id, const std::string& key, const std::string& reason) {
+              noteFailure(ticketNameOf(type, id), key, reason);
+          })),
+      m_container(m_keep) {}
+
+void Session::noteFailure(const std::string& target, const std::string& key,
+                          const std::string& reason) const {
+    WriteFailures(platform::temporaryFolder())
+        .add({std::time(nullptr), m_address, target, key, reason});
+}
 
 Code Session::getTicketData(int type, int kind, int index, int* size, void* buffer) {
     constexpr int numberKind = 0;
@@ -193,7 +207,12 @@ Code Session::putFile(const std::string& local, const std::string& server) {
     if (!from) {
         return codeNoFile;
     }
-    m_engine->putFile(server, from);
+    try {
+        m_engine->putFile(server, from);
+    } catch (const StoreFailure& failure) {
+        noteFailure("file", server, failure.what());
+        throw;
+    }
     return codeDone;
 }
 

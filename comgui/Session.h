@@ -54,6 +54,8 @@ class Session {
 
   private:
     Code setCallback(void* ticket);
+    void noteFailure(const std::string& target, const std::string& key,
+                     const std::string& reason) const;
 
     const std::string m_address;
     const std::shared_ptr<StoreEngine> m_engine;

@@ -22,6 +22,11 @@ class Descriptor {
     bool isOpen() const { return m_number >= 0; }
     int number() const { return m_number; }
 
+    void reset(int number) {
+        close();
+        m_number = number;
+    }
+
     /// Closing can be the first to tell of a failed write.
     bool close() {
         const int number = m_number;
@@ -54,6 +59,66 @@ std::string withoutLinks(const std::string& path) {
                                                            &std::free);
     return real == nullptr ? path : std::string(real.get());
 }
+
+/// A new file in a folder. It has no name while it is written, so that a process that is killed
+/// leaves nothing, or has one where there are no such files.
+class NewFile {
+  public:
+    NewFile(std::string folder, bool isNamed) : m_folder(std::move(folder)), m_file(-1) {
+        std::string name = nameFor("XXXXXX");
+        m_file.reset(isNamed ? mkostemp(name.data(), O_CLOEXEC)
+                             : open(m_folder.c_str(), O_TMPFILE | O_WRONLY | O_CLOEXEC, 0600));
+        if (isNamed && m_file.isOpen()) {
+            m_name = name;
+        }
+    }
+    ~NewFile() {
+        if (!m_name.empty()) {
+            unlink(m_name.c_str());
+        }
+    }
+    NewFile(const NewFile&) = delete;
+    NewFile& operator=(const NewFile&) = delete;
+
+    bool write(const Contents& contents, mode_t mode) {
+        return m_file.isOpen() &&
+               transfer<const void>(::write, m_file, contents.start, contents.length) &&
+               fchmod(m_file.number(), mode) == 0;
+    }
+
+    /// Puts it in place of the target.
+    bool replace(const std::string& target) {
+        if (!giveName() || !m_file.close() || std::rename(m_name.c_str(), target.c_str()) != 0) {
+            return false;
+        }
+        m_name.clear();
+        return true;
+    }
+
+  private:
+    /// Independent of the target's name, which may be as long as names can be.
+    std::string nameFor(const std::string& ending) const {
+        return m_folder + "/.tintgate-jdf-" + ending;
+    }
+
+    bool giveName() {
+        if (!m_name.empty()) {
+            return true;
+        }
+        const std::string open = "/proc/self/fd/" + std::to_string(m_file.number());
+        const std::string name = nameFor(std::to_string(getpid()));
+        unlink(name.c_str()); // Of a process that was killed between the next two steps.
+        if (linkat(AT_FDCWD, open.c_str(), AT_FDCWD, name.c_str(), AT_SYMLINK_FOLLOW) != 0) {
+            return false;
+        }
+        m_name = name;
+        return true;
+    }
+
+    const std::string m_folder;
+    Descriptor m_file;
+    std::string m_name; ///< Empty without one.
+};
 
 } // namespace
 
@@ -89,17 +154,12 @@ bool replaceFile(const std::string& path, const Contents& contents) {
     if (!old.isOpen() || fstat(old.number(), &status) != 0) {
         return false;
     }
-    std::string name = target + ".XXXXXX";
-    Descriptor file(mkostemp(name.data(), O_CLOEXEC));
-    if (!file.isOpen()) {
-        return false;
+    for (const bool isNamed : {false, true}) {
+        NewFile file(target.substr(0, target.rfind('/') + 1) + ".", isNamed);
+        if (file.write(contents, status.st_mode & 07777) && file.replace(target)) {
+            return true;
+        }
     }
-    if (transfer<const void>(::write, file, contents.start, contents.length) &&
-        fchmod(file.number(), status.st_mode & 07777) == 0 && file.close() &&
-        std::rename(name.c_str(), target.c_str()) == 0) {
-        return true;
-    }
-    unlink(name.c_str());
     return false;
 }
 

@@ -21,9 +21,11 @@ struct Contents {
 /// block if that can't be done.
 Contents readFile(const std::string& path, long smallest, long more);
 
-/// Replaces a file by the contents, through a file of another name beside it; its permissions stay,
-/// and a symbolic link goes on leading to it. False, with the file untouched, if it can't be opened
-/// for writing or the contents can't be written to their end.
+/// Replaces a file by the contents, as a whole, through a new file in its folder. Its permissions
+/// stay, and a symbolic link still leads to it. A process that is killed on the way leaves the file
+/// as it was, and nothing beside it where the file system knows files without a name (ext4, XFS,
+/// Btrfs and tmpfs do). False, with the file untouched, if it can't be opened for writing or the
+/// contents can't be written to their end.
 bool replaceFile(const std::string& path, const Contents& contents);
 
 } // namespace jdf

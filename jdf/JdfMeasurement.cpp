@@ -17,7 +17,7 @@
 namespace {
 
 constexpr std::size_t longestText = 180;
-constexpr std::size_t longestSpectralPiece = 200;
+constexpr long longestSpectralPiece = 200;
 
 template<std::size_t N>
 std::string_view textOf(const char (&field)[N]) {
@@ -46,45 +46,58 @@ double percent(double value) {
     return static_cast<double>(whole & 0xFFFF);
 }
 
-/// Gathers the pieces that go in at one place, so that what stands behind is moved once. Each is
-/// counted against the buffer as if it were inserted by itself.
+/// Writes pieces at one place of a buffer. Meanwhile the text after that place is at the buffer's
+/// end, so that it moves twice, whatever the number of pieces, and nothing has to be allocated.
+/// Each piece is counted against the limit as if it were inserted by itself.
 class Pieces {
   public:
-    Pieces(const char* buffer, const char* limit, long length) : m_room(limit - buffer - length) {
-        m_text.reserve(static_cast<std::size_t>(std::max(m_room, 0L)));
+    Pieces(char* at, char* buffer, char* limit, long* length)
+        : m_at(std::min(at, buffer + *length)), m_room(std::max(limit - buffer - *length, 0L)),
+          m_after(buffer + *length - m_at), m_length(*length) {
+        std::memmove(m_at + m_room, m_at, static_cast<std::size_t>(m_after));
     }
+    ~Pieces() {
+        std::memmove(m_at + m_done, m_at + m_room, static_cast<std::size_t>(m_after));
+        m_length += m_done;
+    }
+    Pieces(const Pieces&) = delete;
+    Pieces& operator=(const Pieces&) = delete;
 
     Pieces& operator<<(std::string_view text) {
-        m_text += text;
+        const auto size = static_cast<long>(text.size());
+        if (m_used + size < m_room) {
+            std::memcpy(m_at + m_used, text.data(), text.size());
+        }
+        m_used += size;
         return *this;
     }
 
     Pieces& operator<<(long number) {
         char digits[24];
         const auto end = std::to_chars(std::begin(digits), std::end(digits), number).ptr;
-        m_text.append(digits, static_cast<std::size_t>(end - digits));
-        return *this;
+        return *this << std::string_view(digits, static_cast<std::size_t>(end - digits));
     }
 
-    /// Length of the piece begun.
-    std::size_t size() const { return m_text.size() - m_begun; }
+    /// Length of the unfinished piece.
+    long size() const { return m_used - m_done; }
 
-    /// Ends the piece begun. 0, or -30 and it is gone.
+    /// Ends the piece. 0, or -30 and the piece is dropped.
     int end() {
-        if (static_cast<long>(m_text.size()) >= m_room) {
-            m_text.resize(m_begun);
+        if (m_used >= m_room) {
+            m_used = m_done;
             return jdf::BufferFull;
         }
-        m_begun = m_text.size();
+        m_done = m_used;
         return jdf::Done;
     }
 
-    const std::string& text() const { return m_text; }
-
   private:
+    char* const m_at;
     const long m_room;
-    std::string m_text;
-    std::size_t m_begun = 0;
+    const long m_after; ///< Length of the text after the place.
+    long& m_length;
+    long m_done = 0; ///< Length of the finished pieces.
+    long m_used = 0; ///< With the unfinished piece, which may be longer than the room.
 };
 
 std::string_view boolean(bool value) {
@@ -215,8 +228,6 @@ int WriteJDFMeasureData(char* at, char* buffer, char* limit, long* length,
     const wxCharBuffer narrow = comment.mb_str(wxConvLibc);
     const std::string text(narrow.data(), strnlen(narrow.data(), longestText));
 
-    Pieces pieces(buffer, limit, *length);
-    const int error = writeElement(pieces, measurement, *header, text);
-    InsertCStringIntoBuffer(pieces.text().c_str(), at, buffer, limit, length);
-    return error;
+    Pieces pieces(at, buffer, limit, length);
+    return writeElement(pieces, measurement, *header, text);
 }

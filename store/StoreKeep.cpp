@@ -59,6 +59,16 @@ Scope scopeOf(const SETMULTIPAR* table) {
     return scope;
 }
 
+std::vector<std::string> keysIn(const SETMULTIPAR* table) {
+    std::vector<std::string> keys;
+    for (; table->key != nullptr; ++table) {
+        if (keys.empty() || keys.back() != table->key) {
+            keys.emplace_back(table->key);
+        }
+    }
+    return keys;
+}
+
 void clearResults(SETMULTIPAR* table) {
     for (; table->key != nullptr; ++table) {
         table->result = 0;
@@ -67,22 +77,35 @@ void clearResults(SETMULTIPAR* table) {
 
 } // namespace
 
-StoreKeep::StoreKeep(std::shared_ptr<StoreEngine> engine) : m_engine(std::move(engine)) {}
+StoreKeep::StoreKeep(std::shared_ptr<StoreEngine> engine, NoteFailure note)
+    : m_engine(std::move(engine)), m_note(std::move(note)) {}
 
-/// Writes to a ticket, unless a former write to it was lost.
-template<class Write>
-bool StoreKeep::write(int type, int id, Write write) {
+/// Writes to a ticket, unless a former write to it was lost. False, with each key noted, if the
+/// store did not take it.
+template<class Keys, class Write>
+bool StoreKeep::write(int type, int id, Keys keys, Write write) {
     const std::pair address = {type, id};
-    if (m_cutOff.contains(address)) {
-        return false;
+    std::string reason = "an earlier write to this ticket was lost";
+    if (!m_cutOff.contains(address)) {
+        // In front of the write: it is not to fail for want of memory behind it.
+        const auto cutOff = m_cutOff.insert(address).first;
+        try {
+            const bool written = write();
+            m_cutOff.erase(cutOff);
+            if (written) {
+                return true;
+            }
+            reason = "there is no such ticket";
+        } catch (const StoreFailure& failure) {
+            reason = failure.what();
+        }
     }
-    // In front of the write: it is not to fail for want of memory behind it.
-    const auto cutOff = m_cutOff.insert(address).first;
-    return orElse(false, [&] {
-        const bool written = write();
-        m_cutOff.erase(cutOff);
-        return written;
-    });
+    if (m_note) {
+        for (const std::string& key : keys()) {
+            m_note(type, id, key, reason);
+        }
+    }
+    return false;
 }
 
 std::vector<int> StoreKeep::ids(int type) {
@@ -114,7 +137,8 @@ int StoreKeep::createNext(int type) {
 }
 
 bool StoreKeep::remove(int type, int id) {
-    return write(type, id, [&] { return m_engine->remove(type, id); });
+    const auto none = [] { return std::vector<std::string>(); };
+    return write(type, id, none, [&] { return m_engine->remove(type, id); });
 }
 
 std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_view key) {
@@ -211,10 +235,12 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
         return exists(type, id);
     }
     try {
-        const bool done = write(type, id, [&] {
-            return m_engine->change(type, id, scopeOf(table),
-                                    [&](TicketContent& content) { content.apply(table); });
-        });
+        const bool done = write(
+            type, id, [&] { return keysIn(table); },
+            [&] {
+                return m_engine->change(type, id, scopeOf(table),
+                                        [&](TicketContent& content) { content.apply(table); });
+            });
         if (!done) {
             clearResults(table);
         }
@@ -232,7 +258,14 @@ bool StoreKeep::transfer(int type, int id, const TicketContent& source, bool rep
     for (const auto& [key, elements] : source.keys()) {
         scope.keys.emplace(key, false);
     }
-    return write(type, id, [&] {
+    const auto keys = [&] {
+        std::vector<std::string> names;
+        for (const auto& [key, elements] : source.keys()) {
+            names.push_back(key);
+        }
+        return names;
+    };
+    return write(type, id, keys, [&] {
         return m_engine->change(type, id, scope,
                                 [&](TicketContent& content) { content.transfer(source, replace); });
     });

@@ -4,6 +4,7 @@
 #include <array>
 #include <chrono>
 #include <cstdint>
+#include <functional>
 #include <memory>
 #include <set>
 #include <string>
@@ -34,7 +35,11 @@ namespace store {
 /// commit.
 class StoreKeep : public TicketKeep {
   public:
-    explicit StoreKeep(std::shared_ptr<StoreEngine> engine);
+    /// Shown each key that a table or a transfer did not write, and why, for people.
+    using NoteFailure =
+        std::function<void(int type, int id, const std::string& key, const std::string& reason)>;
+
+    explicit StoreKeep(std::shared_ptr<StoreEngine> engine, NoteFailure note = {});
 
     std::vector<int> ids(int type) override;
     /// The same, but that a failure of the store is thrown: none is not the same as not known.
@@ -62,14 +67,15 @@ class StoreKeep : public TicketKeep {
         std::uint64_t commits = 0;
     };
 
-    template<class Write>
-    bool write(int type, int id, Write write);
+    template<class Keys, class Write>
+    bool write(int type, int id, Keys keys, Write write);
     bool goesOn(int id, std::size_t overviewKey);
     bool wantsOverview(std::uint64_t commits, bool listing);
     void fetchOverview(std::uint64_t commits);
     const SharedElements& elementsOf(std::size_t key, int number);
 
     const std::shared_ptr<StoreEngine> m_engine;
+    const NoteFailure m_note;
     std::set<std::pair<int, int>> m_cutOff; ///< Types and ids of tickets that lost a write.
     Fetched m_fetched;
     JobOverview m_overview;

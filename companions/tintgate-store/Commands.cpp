@@ -1,11 +1,13 @@
 #include "companions/tintgate-store/Commands.h"
 
+#include <algorithm>
 #include <chrono>
 #include <cstdio>
 #include <filesystem>
 
 #include <unistd.h>
 
+#include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Failure.h"
 
 namespace admin {
@@ -45,6 +47,14 @@ std::string completeAddress(const std::string& typed) {
                      "tintgate-store: warning: the store's address has %zu bytes; a job can name "
                      "at most %zu\n",
                      address.size(), longestAddress);
+    }
+    // A login carries one byte for each character. Lead bytes from C4 on are those of others.
+    const bool isLatin1 =
+        isUtf8(address) &&
+        std::all_of(address.begin(), address.end(), [](unsigned char byte) { return byte < 0xC4; });
+    if (!isLatin1) {
+        std::fprintf(stderr, "tintgate-store: warning: the store's address has characters that a "
+                             "job can't name; its run ends with 150\n");
     }
     return address;
 }

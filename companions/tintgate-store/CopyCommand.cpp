@@ -126,9 +126,9 @@ class Copy {
         }
         store::Scope everything;
         everything.everything = true;
+        everything.make = true;
         for (const auto& [type, id] : tickets) {
             if (const auto content = m_from.content(type, id, store::KeyFilter())) {
-                m_to.create(type, id);
                 m_to.change(type, id, everything,
                             [&](store::TicketContent& stored) { stored.transfer(*content, true); });
             }

@@ -15,7 +15,7 @@ namespace {
 struct JdfOptions {
     std::string job;
     std::string updates;
-    std::string from = "1";
+    std::string from; ///< Empty: all versions, if they are of one delivery.
 };
 
 /// As given, else as the store has it for deliveries, else the usual number.
@@ -56,7 +56,9 @@ void ready(const Invocation& invocation, const JdfOptions& options) {
 
 void rebuild(const Invocation& invocation, const JdfOptions& options) {
     const int job = jobNumber(options.job);
-    const int from = wholeNumber(options.from, 1, std::numeric_limits<int>::max(), "version");
+    const int from = options.from.empty()
+                         ? 0
+                         : wholeNumber(options.from, 1, std::numeric_limits<int>::max(), "version");
     const auto store = invocation.open();
     const int updates = updatesOf(*store, options);
     std::vector<Row> rows;
@@ -98,9 +100,10 @@ void addJdfCommands(Command program, Invocation& invocation) {
                 "version.");
     auto rebuilding = command(
         "rebuild", "Put the measurements of all versions into the oldest sound one", rebuild);
-    rebuilding.option("--from", options->from, "Leave out versions below this one").showDefault();
+    rebuilding.option("--from", options->from, "Leave out versions below this one");
     rebuilding.footer("For a JDF that updates have damaged. The result is made ready, and what it "
-                      "replaces is kept as a\nversion.");
+                      "replaces is kept as a\nversion. If several JDFs were delivered under one "
+                      "name, --from is the number of the first version of\nthe one that counts.");
 }
 
 } // namespace admin

@@ -1,9 +1,11 @@
 #include "companions/tintgate-store/JdfText.h"
 
 #include <algorithm>
+#include <set>
 
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/XmlMap.h"
 
 namespace admin {
@@ -95,11 +97,13 @@ class Preparation {
         : m_text(text), m_map(map), m_declaration(declares ? namespaceDeclaration : "") {}
 
     PreparedJdf run() {
-        for (const char* const party : parties) {
-            if (const auto* const element = m_map.first(party)) {
-                emptyDates(*element);
+        for (std::size_t i = 0; i < std::size(parties); ++i) {
+            if (m_parties[i] != nullptr) {
+                emptyDates(*m_parties[i]);
             }
+            hideDatesOfOthers(parties[i], m_parties[i]);
         }
+        tellHidden();
         ensureHolder();
         if (m_map.first(linkName) == nullptr) {
             addTo("ResourceLinkPool", "<tazo:MeasurementDataLink" + m_declaration +
@@ -146,6 +150,53 @@ class Preparation {
         }
     }
 
+    /// The update starts at the first text of this kind, which may be in another element's name
+    /// (<SenderInfo>) or in a comment, and takes the next date. A blank hides other elements' dates
+    /// from it.
+    void hideDatesOfOthers(const std::string& party, const XmlElement* element) {
+        const std::size_t from = m_text.find("<" + party);
+        const std::size_t end = element == nullptr ? m_text.size() : element->tag;
+        for (const std::string_view token : {dateToken, timeToken}) {
+            std::size_t at = from;
+            while ((at = m_text.find(token, at)) < end) {
+                const auto* const around = m_map.withTagAround(at);
+                if (around == nullptr || around->name.empty()) {
+                    at += token.size();
+                    continue;
+                }
+                if (std::find(std::begin(m_parties), std::end(m_parties), around) ==
+                    std::end(m_parties)) {
+                    hideIn(*around, token);
+                }
+                at = around->tagEnd;
+            }
+        }
+    }
+
+    void hideIn(const XmlElement& element, std::string_view token) {
+        const std::string_view name = token.substr(0, token.find('='));
+        for (const XmlAttribute& attribute : m_map.attributesOf(element)) {
+            const std::size_t nameEnd = attribute.nameBegin + attribute.name.size();
+            if (attribute.name.ends_with(name) &&
+                m_text.substr(nameEnd).starts_with(token.substr(name.size())) &&
+                m_hidden.insert(nameEnd).second) {
+                m_edits.insert(nameEnd, " ");
+            }
+        }
+    }
+
+    void tellHidden() {
+        if (m_hidden.empty()) {
+            return;
+        }
+        const auto* const first = m_map.withTagAround(*m_hidden.begin());
+        m_changes.push_back("put a blank after the name of " +
+                            counted(std::ssize(m_hidden), "date") +
+                            " of other elements, so that no update finds " +
+                            (m_hidden.size() == 1 ? "it" : "them") + " (the first is in " +
+                            std::string(first->name) + ")");
+    }
+
     void ensureHolder() {
         const auto* const holder = m_map.first(holderName);
         if (holder == nullptr) {
@@ -155,7 +206,7 @@ class Preparation {
             return;
         }
         if (holder->hasEmptyTag()) {
-            open(*holder, "");
+            openHolder(*holder);
             m_changes.emplace_back("opened the element of measurements");
         } else if (!m_text.substr(holder->endTag).starts_with(holderEnd)) { // </tazo:... >
             m_edits.replace(holder->endTag, m_text.find('>', holder->endTag) + 1 - holder->endTag,
@@ -196,9 +247,23 @@ class Preparation {
                         ">" + inside + "</" + std::string(element.name) + ">");
     }
 
+    /// The update's own tag is reordered, since its search must not find that.
+    void openHolder(const XmlElement& holder) {
+        const auto tag = m_text.substr(holder.tag, holder.tagEnd - holder.tag - 2);
+        if (tag == fullTag.substr(0, fullTag.size() - 1)) {
+            m_edits.replace(holder.tag, holder.tagEnd - holder.tag,
+                            "<tazo:MeasurementData" + std::string(reorderedAttributes) +
+                                std::string(holderEnd));
+        } else {
+            open(holder, "");
+        }
+    }
+
     const std::string_view m_text;
     const XmlMap& m_map;
     const std::string m_declaration;
+    const XmlElement* const m_parties[2] = {m_map.first(parties[0]), m_map.first(parties[1])};
+    std::set<std::size_t> m_hidden; ///< Ends of attributes' names.
     Edits m_edits;
     std::vector<std::string> m_changes;
 };
@@ -214,13 +279,21 @@ void checkSearches(std::string_view text, const XmlMap& map) {
         failMisled(text, tag, "the text of its own opening tag stands there");
     }
     for (const std::string party : parties) {
+        const auto* const element = map.first(party);
+        const auto attributes =
+            element == nullptr ? std::vector<XmlAttribute>() : map.attributesOf(*element);
         std::size_t from = text.find("<" + party);
         for (const std::string_view token : {dateToken, timeToken}) {
             const std::size_t at = text.find(token, from);
             if (from == std::string_view::npos || at == std::string_view::npos) {
                 continue;
             }
-            if (text[at + token.size()] != '"') {
+            const bool isOwn = std::any_of(
+                attributes.begin(), attributes.end(), [&](const XmlAttribute& attribute) {
+                    return attribute.nameBegin == at &&
+                           attribute.name == token.substr(0, token.find('='));
+                });
+            if (!isOwn) {
                 failMisled(text, at, "a date is there that is not the " + party + "'s");
             }
             from = at;
@@ -251,6 +324,12 @@ void checkLimits(std::size_t size, int updates) {
     }
 }
 
+void checkCount(const XmlMap& map) {
+    if (map.hasTooManyElements()) {
+        throw Failure(Status::JdfTooLarge, "it has " + map.fault());
+    }
+}
+
 /// A text of more than one byte a sign.
 bool isWide(std::string_view text) {
     return text.find('\0') != std::string_view::npos;
@@ -275,6 +354,7 @@ PreparedJdf prepared(const std::string& jdf, int updates) {
     const std::string text = judged(jdf);
     const XmlMap map(text);
     std::string fault = map.fault();
+    checkCount(map);
     if (!fault.empty()) {
         throw Failure(Status::JdfNotSound, "it is not well-formed, " + fault);
     }
@@ -282,6 +362,7 @@ PreparedJdf prepared(const std::string& jdf, int updates) {
         PreparedJdf result = Preparation(jdf, map, declares).run();
         const std::string after = judged(result.text);
         const XmlMap mapAfter(after);
+        checkCount(mapAfter);
         fault = mapAfter.fault();
         if (fault.empty()) {
             checkSearches(result.text, mapAfter);
@@ -290,6 +371,32 @@ PreparedJdf prepared(const std::string& jdf, int updates) {
         }
     }
     throw Failure(Status::JdfNotSound, "it would not be well-formed with measurements, " + fault);
+}
+
+std::string unchangedPart(std::string_view prepared) {
+    const std::string text = judged(prepared);
+    const XmlMap map(text);
+    std::string part;
+    std::size_t done = 0;
+    for (const XmlElement& element : map.elements()) {
+        if ((element.name == holderName || element.name == linkName) && element.tag >= done) {
+            part.append(text, done, element.tag - done);
+            done = element.hasEmptyTag() ? element.tagEnd : text.find('>', element.endTag) + 1;
+        }
+    }
+    part.append(text, done);
+    std::erase_if(
+        part, [](char c) { return std::string_view(" \t\r\n").find(c) != std::string_view::npos; });
+    for (const std::string_view token : {dateToken, timeToken}) {
+        std::string dateless;
+        std::size_t from = 0;
+        for (auto at = part.find(token); at != std::string::npos; at = part.find(token, from)) {
+            dateless.append(part, from, at + token.size() - from);
+            from = std::min(part.find('"', at + token.size()), part.size());
+        }
+        part = dateless.append(part, from);
+    }
+    return part;
 }
 
 std::vector<std::string> measurementsIn(std::string_view jdf) {

@@ -46,9 +46,16 @@ struct PreparedJdf {
 };
 
 /// Prepares a text for so many updates, of which each may be that of any strip or job. The rest of
-/// it stays byte for byte. Throws Failure: JdfNotSound for a text that is not well-formed or in
-/// which the update would find its tokens in the wrong place, JdfTooLarge beyond the limits above.
+/// it stays byte for byte, except for one blank: an attribute of another element that the update
+/// would take for a date of the Sender or Receiver is written as `printdate =""`. Throws Failure:
+/// JdfNotSound for a text that is not well-formed, or in which the update would find its tokens in
+/// the wrong place all the same; JdfTooLarge beyond the limits above and for more than
+/// mostXmlElements.
 PreparedJdf prepared(const std::string& jdf, int updates);
+
+/// The part of a prepared text that no update changes: without measurements, the elements that
+/// contain them and link to them, dates, and all blanks. Two texts of one delivery have the same.
+std::string unchangedPart(std::string_view prepared);
 
 /// The measurements in a text, well-formed or not, as they were written; those that are cut off
 /// are left out.

@@ -20,13 +20,16 @@ struct ResetOptions {
 struct NoOptions {};
 
 Row stripJson(const Strip& strip) {
-    const bool judged = strip.approval.value_or(-1) >= 0;
     return {{"measurements", strip.measurements},
-            {"passed", judged ? Row(*strip.approval > 0) : Row()}};
+            {"passed", strip.isJudged() ? Row(*strip.approval > 0) : Row()},
+            {"cutOff", strip.isCutOff()}};
 }
 
 Row stripText(const Strip& strip) {
-    if (strip.approval.value_or(-1) < 0) {
+    if (strip.isCutOff()) {
+        return "cut off";
+    }
+    if (!strip.isJudged()) {
         return strip.measurements > 0 ? Row("measured") : Row();
     }
     return *strip.approval > 0 ? "passed" : "failed";
@@ -57,6 +60,10 @@ void list(const Invocation& invocation) {
 }
 
 void tellReset(const ResetResult& result) {
+    for (const auto& obstacle : result.obstacles) {
+        std::cerr << "tintgate-store: warning: " << textOf({jobType, result.id})
+                  << ": the next run can't succeed: " << obstacle << '\n';
+    }
     std::cout << textOf({jobType, result.id}) << ": ";
     if (!result.there) {
         std::cout << "there is no such ticket\n";
@@ -91,7 +98,8 @@ void reset(const Invocation& invocation, const ResetOptions& options) {
         rows.push_back({{"job", result.id},
                         {"there", result.there},
                         {"removed", result.removed},
-                        {"reopened", result.reopened}});
+                        {"reopened", result.reopened},
+                        {"obstacles", result.obstacles}});
     }
     showRows({}, rows, true);
 }
@@ -102,9 +110,11 @@ void addJobCommands(Command program, Invocation& invocation) {
     addCommand<NoOptions>(
         program, invocation, "jobs", "List jobs and how far their verification is",
         std::make_shared<NoOptions>(), [&](const NoOptions&) { list(invocation); })
-        .footer("STATE: waiting, passed, failed, or - for a job that is not verified. CODE is the "
-                "number that the\njob shows (211 passed, 212 failed). A strip that is measured "
-                "without a result was cut off.");
+        .footer(
+            "STATE: waiting, passed, failed, or - for a job that is not verified. CODE is the "
+            "number that the\njob shows (211 passed, 212 failed). A strip is \"measured\" if it "
+            "has a measurement without a result,\nand \"cut off\" if its result is not "
+            "complete: see \"A job whose run was cut off\" in docs/stores.md.");
 
     const auto options = std::make_shared<ResetOptions>();
     auto command = addCommand<ResetOptions>(
@@ -116,7 +126,8 @@ void addJobCommands(Command program, Invocation& invocation) {
     command.footer(
         "For a job whose results were written in part only. Takes away the strip's count "
         "of measurements and\nits approval, and offers the job to the verifier again if "
-        "it was closed. Measured values stay until\nnew ones take their place.");
+        "it was closed. Measured values stay until\nnew ones take their place. The next "
+        "run measures; a warning says why it can't succeed, as far as\nthe ticket shows it.");
 }
 
 } // namespace admin

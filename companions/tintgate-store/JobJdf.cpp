@@ -1,7 +1,10 @@
 #include "companions/tintgate-store/JobJdf.h"
 
 #include <algorithm>
+#include <iterator>
+#include <ostream>
 #include <sstream>
+#include <streambuf>
 
 #include <strings.h>
 
@@ -18,28 +21,55 @@ namespace {
 /// Sub types of jobs whose JDF has a place of its own until they have been measured.
 constexpr int remoteSubTypes[] = {80, 81, 86};
 
+/// Collects what is written to it, up to the largest JDF that is worked on. Throws Failure
+/// (JdfTooLarge) at more.
+class JdfContent : private std::streambuf {
+  public:
+    JdfContent() : m_stream(this) { m_stream.exceptions(std::ios::badbit); }
+    std::ostream& stream() { return m_stream; }
+    std::string text() { return std::move(m_text); }
+
+  private:
+    int_type overflow(int_type byte) override {
+        const char one = traits_type::to_char_type(byte);
+        xsputn(&one, 1);
+        return byte;
+    }
+    std::streamsize xsputn(const char* bytes, std::streamsize count) override {
+        if (m_text.size() + static_cast<std::size_t>(count) > largestJdf) {
+            throw Failure(Status::JdfTooLarge, "a JDF has at most 256 MiB");
+        }
+        m_text.append(bytes, static_cast<std::size_t>(count));
+        return count;
+    }
+
+    std::string m_text;
+    std::ostream m_stream;
+};
+
 std::string contentOf(store::StoreEngine& store, const std::string& path) {
-    std::ostringstream content;
-    store.getFile(path, content);
-    return std::move(content).str();
+    JdfContent content;
+    store.getFile(path, content.stream());
+    return content.text();
 }
 
 std::string versionOf(store::StoreEngine& store, const std::string& path, int number) {
-    std::ostringstream content;
-    store.getVersion(path, number, content);
-    return std::move(content).str();
+    JdfContent content;
+    store.getVersion(path, number, content.stream());
+    return content.text();
 }
 
 bool isThere(store::StoreEngine& store, const std::string& path) {
     try {
         contentOf(store, path);
-        return true;
     } catch (const store::StoreFailure& failure) {
         if (failure.fault != store::Fault::NoFile) {
             throw;
         }
         return false;
+    } catch (const Failure&) { // Too large, which is told where it is worked on.
     }
+    return true;
 }
 
 /// Throws Failure (Busy), with the file as others wrote it, where it was not `before` any more.
@@ -70,10 +100,11 @@ auto about(const std::string& path, Work work) {
     }
 }
 
-/// By number, and the file as it stands behind them with the number 0.
-std::vector<std::pair<int, std::string>> allVersions(store::StoreEngine& store,
-                                                     const std::string& path, int from) {
-    std::vector<std::pair<int, std::string>> versions;
+using Versions = std::vector<std::pair<int, std::string>>;
+
+/// By number, and then the file as it is, with the number 0.
+Versions allVersions(store::StoreEngine& store, const std::string& path, int from) {
+    Versions versions;
     for (const auto& version : store.versions(path)) {
         if (version.number >= from) {
             versions.emplace_back(version.number, versionOf(store, path, version.number));
@@ -81,6 +112,38 @@ std::vector<std::pair<int, std::string>> allVersions(store::StoreEngine& store,
     }
     versions.emplace_back(0, contentOf(store, path));
     return versions;
+}
+
+std::string shownVersion(int number) {
+    return number == 0 ? "the file as it is" : "version " + std::to_string(number);
+}
+
+/// Whether a version is the delivery of this unchanged part, before or after updates.
+bool isOfDelivery(const std::string& text, const std::string& unchanged, int updates) {
+    try {
+        return unchangedPart(prepared(text, updates).text) == unchanged;
+    } catch (const Failure& failure) {
+        if (failure.status != Status::JdfNotSound) {
+            throw;
+        }
+        return false;
+    }
+}
+
+/// Throws Failure (JdfAmbiguous) if sound versions after the base are not of its delivery: whether
+/// they or what is damaged were delivered last can't be known.
+void checkDelivery(const Versions& versions, Versions::const_iterator base,
+                   const std::string& sound, int updates) {
+    const std::string unchanged = unchangedPart(sound);
+    for (auto next = std::next(base); next != versions.end(); ++next) {
+        if (isSound(next->second) && !isOfDelivery(next->second, unchanged, updates)) {
+            throw Failure(Status::JdfAmbiguous,
+                          shownVersion(base->first) + " and " + shownVersion(next->first) +
+                              " differ in more than measurements, dates and blanks: say with "
+                              "--from the number of the first version that counts (see file "
+                              "versions)");
+        }
+    }
 }
 
 } // namespace
@@ -153,6 +216,9 @@ Rebuilt rebuildJdf(store::StoreEngine& store, const std::string& path, int from,
             throw Failure(Status::JdfNotSound, "no version of it is well-formed");
         }
         const std::string sound = prepared(base->second, updates).text;
+        if (from == 0) {
+            checkDelivery(versions, base, sound, updates);
+        }
         std::vector<std::string> added;
         for (const auto& [number, text] : versions) {
             for (auto& measurement : measurementsIn(text)) {

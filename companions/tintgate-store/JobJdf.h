@@ -26,14 +26,16 @@ int updatesAtDelivery(store::StoreEngine& store);
 std::vector<std::string> readyJdf(store::StoreEngine& store, const std::string& path, int updates);
 
 struct Rebuilt {
-    int base = 0;         ///< Number of the version that was taken; 0 is the file as it stands.
+    int base = 0;         ///< Number of the version that was taken; 0 is the file as it is.
     int measurements = 0; ///< In the file now.
     bool changed = false;
 };
 
-/// Puts the measurements of all versions from this number on, and of the file as it stands, into
-/// the oldest of them that is sound, prepared for so many updates. Equal ones are one. Throws as
-/// readyJdf does.
+/// Puts the measurements of all versions, and of the file as it is, into the oldest of them that is
+/// sound, prepared for so many updates. Equal measurements are one. With from above 0, versions of
+/// lower numbers do not count. Throws as readyJdf does; and without from also JdfAmbiguous, with
+/// nothing changed, if sound versions differ in more than updates change: they are of different
+/// deliveries.
 Rebuilt rebuildJdf(store::StoreEngine& store, const std::string& path, int from, int updates);
 
 } // namespace admin

@@ -1,6 +1,7 @@
 #include "companions/tintgate-store/Jobs.h"
 
 #include <algorithm>
+#include <functional>
 #include <set>
 
 #include "companions/tintgate-store/KeyValue.h"
@@ -30,9 +31,17 @@ std::string approvalKey(int strip) {
     return roots[strip] + std::string("/Approval");
 }
 
+/// The last key of a result, and that of a result under a PSD preset.
+constexpr const char* lastKeys[] = {"/Values/Decimal", "/Values/PSDDecimal"};
+
 using Elements = std::shared_ptr<const store::Elements>;
 
-/// What each key says about a job.
+template<int strip>
+void noteLastKey(Job& job, const Elements& value) {
+    job.strips[strip].hasLastKey = job.strips[strip].hasLastKey || value != nullptr;
+}
+
+/// The meaning of each key for a job.
 const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> readers = {
     {"Input/Title",
      [](Job& job, const Elements& value) { job.title = textOf(value).value_or(""); }},
@@ -61,7 +70,20 @@ const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> reade
      [](Job& job, const Elements& value) { job.strips[0].approval = integerOf(value); }},
     {approvalKey(1),
      [](Job& job, const Elements& value) { job.strips[1].approval = integerOf(value); }},
+    {roots[0] + std::string(lastKeys[0]), noteLastKey<0>},
+    {roots[0] + std::string(lastKeys[1]), noteLastKey<0>},
+    {roots[1] + std::string(lastKeys[0]), noteLastKey<1>},
+    {roots[1] + std::string(lastKeys[1]), noteLastKey<1>},
 };
+
+Job jobOf(int id, const std::function<Elements(const std::string& key)>& valueOf) {
+    Job job;
+    job.id = id;
+    for (const auto& [key, read] : readers) {
+        read(job, valueOf(key));
+    }
+    return job;
+}
 
 std::set<int> familyOf(store::StoreEngine& store, int id) {
     const auto jobs = allJobs(store);
@@ -95,10 +117,7 @@ void removeKey(store::TicketContent& content, const std::string& key, ResetResul
 /// Writing results ends with a 0 for the verifier. Where that was not there before, the job had
 /// another way to be found, and keeps it.
 void reopen(store::TicketContent& content, ResetResult& result) {
-    Job job;
-    for (const auto& [key, read] : readers) {
-        read(job, content.find(key));
-    }
+    const Job job = jobOf(0, [&](const std::string& key) { return content.find(key); });
     if (job.waits() || !job.hasShowInVerifier) {
         return;
     }
@@ -106,6 +125,66 @@ void reopen(store::TicketContent& content, ResetResult& result) {
     shown->put(0, 1);
     content.put(showKey, shown);
     result.reopened = true;
+}
+
+/// Why a run that measures this strip would fail.
+std::vector<std::string> obstaclesOf(store::StoreEngine& store, int id, int strip) {
+    const std::string suffix = strip == 0 ? "" : "2";
+    const auto number = [&](const std::string& key) {
+        return integerOf(store.key(jobType, id, key)).value_or(0);
+    };
+    const auto hasText = [&](const std::string& key, std::size_t shortest = 1) {
+        return textOf(store.key(jobType, id, key)).value_or("").size() >= shortest;
+    };
+    const std::string name = "strip " + std::to_string(strip + 1) + ": ";
+    std::vector<std::string> obstacles;
+    const int workflow = number("Workflow/Verify/MeasurementWorkflow" + suffix);
+    const bool isEsko = number("Job/FromEsko") == 1 && workflow == 4;
+    const bool isDynamic = strip == 0 && number("Footer/Dynstrip/UseDynstrip") == 1;
+    const std::string profile = "Footer/ControlstripInputProfile" + suffix;
+    const std::string data = "Workflow/Verify/CharacterizationData" + suffix;
+    if (!isEsko && (workflow == 1 || workflow == 3)) {
+        if (!hasText(profile) && !hasText("Remote/UsedICCProfile")) {
+            obstacles.push_back(name + "it has no profile as reference (" + profile +
+                                ", Remote/UsedICCProfile)" +
+                                (workflow == 3 ? "; references in the ticket count only for a "
+                                                 "strip that is measured"
+                                               : ""));
+        }
+    } else if (!isEsko && !isDynamic && (workflow != 2 || !hasText(data))) {
+        obstacles.push_back(
+            name + "it has no reference (" +
+            (workflow == 2 ? data : "Workflow/Verify/MeasurementWorkflow" + suffix) + ")");
+    }
+    constexpr std::size_t shortestName = 4; // Shorter ones are passed over.
+    const std::string fixed = "Footer/ControlstripFile" + suffix;
+    const std::string nested = "Footer/Nesting/ControlstripFile" + suffix;
+    const std::string dynamic = "Footer/Dynstrip/IT8";
+    if (isDynamic ? !hasText(dynamic) : !hasText(fixed, shortestName) && !hasText(nested)) {
+        obstacles.push_back(name + "it has no control strip (" +
+                            (isDynamic ? dynamic : fixed + ", " + nested) + ")");
+    }
+    return obstacles;
+}
+
+std::vector<std::string> obstaclesOf(store::StoreEngine& store, int id,
+                                     const std::vector<int>& strips) {
+    const Job job = jobOf(id, [&](const std::string& key) { return store.key(jobType, id, key); });
+    std::vector<std::string> obstacles;
+    if (job.fileType == noVerification) {
+        obstacles.push_back("a file of this type is never verified (" + std::string(fileTypeKey) +
+                            ")");
+    } else if (!job.waits()) {
+        obstacles.push_back("it does not wait (" + std::string(displayKey) + " 208 or " + showKey +
+                            " 1), so that only a remeasure finds it");
+    }
+    for (const int strip : strips) {
+        if (strip == 0 || job.twoStrips) {
+            const auto more = obstaclesOf(store, id, strip);
+            obstacles.insert(obstacles.end(), more.begin(), more.end());
+        }
+    }
+    return obstacles;
 }
 
 ResetResult resetOne(store::StoreEngine& store, int id, const std::vector<int>& strips) {
@@ -126,6 +205,9 @@ ResetResult resetOne(store::StoreEngine& store, int id, const std::vector<int>& 
         }
         reopen(content, result);
     });
+    if (result.there) {
+        result.obstacles = obstaclesOf(store, id, strips);
+    }
     return result;
 }
 

@@ -10,10 +10,16 @@
 
 namespace admin {
 
-/// What a job's ticket says of one strip.
+/// One strip, as a job's ticket describes it.
 struct Strip {
     int measurements = 0;
     std::optional<int> approval; ///< 0 failed, above passed; there is no result below 0.
+    bool hasLastKey = false;     ///< The last key of a result.
+
+    bool isJudged() const { return approval.value_or(-1) >= 0; }
+    /// The run that wrote the result was cut off before its last key. Of a strip that was measured
+    /// before, the last key is that of the former result, so that this is not noticed.
+    bool isCutOff() const { return isJudged() && !hasLastKey; }
 };
 
 struct Job {
@@ -41,12 +47,15 @@ struct ResetResult {
     bool there = true; ///< False for a ticket that is missing.
     std::vector<std::string> removed;
     bool reopened = false;
+    std::vector<std::string> obstacles; ///< Why the next run can't succeed; each a sentence.
 };
 
 /// Takes the results of strips away, so that a job whose write-back was cut off can run again: the
 /// count of measurements, without which the job is measured anew, and the approval, which would
 /// close a job of two strips too early. A job that the run had closed, and that nobody would find
-/// any more, is offered to the verifier again. One step for each ticket.
+/// any more, is offered to the verifier again. One step for each ticket. Then looks for what is in
+/// the way of the next run, which measures: it has to find the job, its references, and its strip.
+/// Whether the files are there is not looked at.
 ///
 /// Strips are 0 and 1. With family: also for all jobs of the same parent, for the parent, and for
 /// all jobs whose parent this one is. The job itself comes first.

@@ -1,6 +1,8 @@
 #include <iostream>
 #include <iterator>
 
+#include <unistd.h>
+
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/ElementsJson.h"
 #include "companions/tintgate-store/Failure.h"
@@ -130,13 +132,16 @@ void get(const Invocation& invocation, const KeyOptions& options) {
         std::cout << elementsJson(*elements).dump(-1, ' ', true) << '\n';
         return;
     }
+    // What is stored must not act on a terminal; scripts read the bytes.
+    const bool escapes = isatty(STDOUT_FILENO) != 0;
     int next = 0;
     elements->visit([&](int position, const store::Value& value) {
         if (position != next) {
             std::cerr << "(nothing from " << next << " to " << position - 1 << ")\n";
         }
         const bool binary = std::holds_alternative<store::Binary>(value);
-        std::cout << (binary ? toBase64(valueText(value)) : valueText(value)) << '\n';
+        const std::string text = binary ? toBase64(valueText(value)) : valueText(value);
+        std::cout << (escapes ? printable(text) : text) << '\n';
         next = position + 1;
         return true;
     });
@@ -242,7 +247,9 @@ void addKeyCommands(Command program, Invocation& invocation) {
     auto getting = command("get", "Print what a key holds, an element a line", get);
     withPosition(getting);
     getting.flag("--raw", options->raw, "The bytes of one element, and nothing else");
-    getting.footer("Binaries are printed as base64. With --json, types and holes show.");
+    getting.footer(
+        "Binaries are printed as base64. With --json, types and holes show. On a terminal, "
+        "control characters\nare printed as \\xNN.");
 
     auto setting = command("set", "Set a key", set);
     withPosition(setting);

@@ -76,31 +76,20 @@ struct ImportOptions {
     bool merge = false;
 };
 
-/// Of one ticket, in one transaction but for a ticket that is made for it.
+/// One ticket, in one transaction, so that nobody sees it without its keys.
 void import(store::StoreEngine& store, const NamedTicket& ticket, bool merge) {
     const auto& [name, content] = ticket;
     store::Scope scope;
+    scope.make = true;
     scope.everything = !merge;
     if (merge) {
         for (const auto& [key, elements] : content.keys()) {
             scope.keys.emplace(key, false);
         }
     }
-    const bool made = store.create(name.type, name.id);
-    try {
-        const bool changed = store.change(name.type, name.id, scope,
-                                          [&, &content = content](store::TicketContent& stored) {
-                                              stored.transfer(content, !merge);
-                                          });
-        if (!changed) {
-            throw Failure(Status::Busy, "somebody else removed the ticket meanwhile");
-        }
-    } catch (...) {
-        if (made) {
-            store.remove(name.type, name.id);
-        }
-        throw;
-    }
+    store.change(name.type, name.id, scope, [&, &content = content](store::TicketContent& stored) {
+        stored.transfer(content, !merge);
+    });
 }
 
 void importAll(const Invocation& invocation, const ImportOptions& options) {

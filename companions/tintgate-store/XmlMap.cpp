@@ -1,6 +1,7 @@
 #include "companions/tintgate-store/XmlMap.h"
 
 #include <algorithm>
+#include <iterator>
 #include <memory>
 #include <new>
 
@@ -35,8 +36,11 @@ class XmlMap::Parser {
 
     void run() {
         const std::string_view text = m_map.m_text;
-        if (XML_Parse(m_parser.get(), text.data(), static_cast<int>(text.size()), 1) !=
-            XML_STATUS_OK) {
+        const auto result =
+            XML_Parse(m_parser.get(), text.data(), static_cast<int>(text.size()), 1);
+        if (m_map.hasTooManyElements()) {
+            m_map.m_fault = "more than " + std::to_string(mostXmlElements) + " elements";
+        } else if (result != XML_STATUS_OK) {
             m_map.m_fault = "line " + std::to_string(XML_GetCurrentLineNumber(m_parser.get())) +
                             ": " + XML_ErrorString(XML_GetErrorCode(m_parser.get()));
         }
@@ -60,6 +64,9 @@ class XmlMap::Parser {
         }
         m_open.push_back(static_cast<int>(m_map.m_elements.size()));
         m_map.m_elements.push_back(element);
+        if (m_map.hasTooManyElements()) {
+            XML_StopParser(m_parser.get(), XML_FALSE);
+        }
     }
 
     void end() {
@@ -86,6 +93,14 @@ const XmlElement* XmlMap::first(std::string_view name, const XmlElement* parent)
                    (parent == nullptr || element.parent == parent - m_elements.data());
         });
     return found == m_elements.end() ? nullptr : &*found;
+}
+
+const XmlElement* XmlMap::withTagAround(std::size_t place) const {
+    const auto next = std::upper_bound(
+        m_elements.begin(), m_elements.end(), place,
+        [](std::size_t wanted, const XmlElement& element) { return wanted < element.tag; });
+    const bool isFound = next != m_elements.begin() && place < std::prev(next)->tagEnd;
+    return isFound ? &*std::prev(next) : nullptr;
 }
 
 std::vector<XmlAttribute> XmlMap::attributesOf(const XmlElement& element) const {

@@ -1,5 +1,4 @@
-// Where the elements of an XML document stand in its text, for changes that leave all else as it
-// is.
+// The places of an XML document's elements in its text, for changes that leave all else as it is.
 #pragma once
 
 #include <cstddef>
@@ -29,6 +28,9 @@ struct XmlAttribute {
     std::size_t end = 0; ///< Behind the closing quote.
 };
 
+/// Of a document that is worked on. A map of so many takes about 200 MB.
+inline constexpr std::size_t mostXmlElements = 2'000'000;
+
 class XmlMap {
   public:
     /// The text must outlive this, and have less than 2 GiB. Namespaces count, as in XmlCheck.
@@ -38,12 +40,19 @@ class XmlMap {
     /// are there.
     const std::string& fault() const { return m_fault; }
 
+    /// The text has more than mostXmlElements, which is a fault too.
+    bool hasTooManyElements() const { return m_elements.size() > mostXmlElements; }
+
     /// In the order of their start tags.
     const std::vector<XmlElement>& elements() const { return m_elements; }
 
     /// Null where there is none. With a parent: only a child of this element.
     const XmlElement* first(std::string_view name, const XmlElement* parent = nullptr) const;
 
+    /// The element whose start tag contains this place; null if there is none.
+    const XmlElement* withTagAround(std::size_t place) const;
+
+    /// Of an element with a name.
     std::vector<XmlAttribute> attributesOf(const XmlElement& element) const;
 
   private:

@@ -18,6 +18,7 @@
 #include "report/Reports.h"
 #include "report/Result.h"
 #include "companions/viewer/Browser.h"
+#include "companions/viewer/MissingWrites.h"
 #include "platform/TemporaryFolder.h"
 
 namespace {
@@ -76,9 +77,13 @@ int showReport(const std::string& metaPath) {
     const std::string resultPath = folder + "/output.json";
     if (!read(resultPath, bytes))
         return fail(Status::ResultMissing, "can't read " + resultPath);
-    const std::optional<report::Result> result = report::readResult(bytes, problem);
+    std::optional<report::Result> result = report::readResult(bytes, problem);
     if (!result)
         return fail(Status::ResultBroken, resultPath + " is broken: " + problem);
+    const store::WriteFailures failures(platform::temporaryFolder());
+    const std::string missing = viewer::missingWrites(failures.all(), folder, *meta);
+    if (!missing.empty())
+        result->warnings.insert(result->warnings.begin(), missing);
     const std::string page =
         report::keepPage(folder, report::pageStem(*meta), report::pageOf(*result, &*meta), problem);
     if (page.empty())

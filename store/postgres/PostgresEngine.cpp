@@ -428,6 +428,10 @@ class PostgresEngine : public StoreEngine {
                     const std::function<void(TicketContent&)>& work) {
         noteChange();
         Transaction transaction(m_connection);
+        if (scope.make) {
+            sendCreate(type, id);
+            transaction.finish();
+        }
         m_connection.send(lockTicket, type, id);
         TicketContent content;
         Names needed;
@@ -446,7 +450,7 @@ class PostgresEngine : public StoreEngine {
         }
         const TicketContent before = content; // Shares the elements: a change makes others.
         work(content);
-        const bool writes = write(type, id, scope, before, content);
+        const bool writes = write(type, id, scope, before, content) || scope.make;
         if (!needed.empty()) {
             if (writes) {
                 transaction.commit();

@@ -19,6 +19,7 @@
 #include <unistd.h>
 
 #include "store/ServerPath.h"
+#include "store/sqlite/Permissions.h"
 
 namespace store {
 
@@ -85,20 +86,24 @@ void flush(const Descriptor& file, const std::string& what) {
     }
 }
 
-/// Walks down from a folder. With make, folders that are missing are made, and are on the disk when
-/// this returns.
+/// Walks down from the store's files. With make, folders that are missing are made, with the
+/// permissions of the files folder, and are on the disk when this returns.
 Descriptor walk(const Descriptor& from, const std::vector<std::string>& folders, bool make,
                 const std::string& what) {
     Descriptor folder = openFolder(from.get(), ".");
     for (const auto& name : folders) {
         Descriptor next = openFolder(folder.get(), name.c_str());
         if (!next.valid() && errno == ENOENT && make) {
-            if (mkdirat(folder.get(), name.c_str(), 0770) == 0) {
+            const bool isMade = mkdirat(folder.get(), name.c_str(), 0770) == 0;
+            if (isMade) {
                 flush(folder, what);
             } else if (errno != EEXIST) {
                 fail(errno, what);
             }
             next = openFolder(folder.get(), name.c_str());
+            if (isMade && next.valid() && !Permissions::of(from.get()).giveTo(next.get())) {
+                fail(errno, what);
+            }
         }
         if (!next.valid()) {
             fail(errno, what);
@@ -122,11 +127,16 @@ std::vector<std::string> namesIn(const Descriptor& folder) {
     }
     own.release();
     std::vector<std::string> names;
+    errno = 0;
     while (const dirent* const entry = readdir(stream.get())) {
         const std::string_view name = entry->d_name;
         if (name != "." && name != "..") {
             names.emplace_back(name);
         }
+        errno = 0;
+    }
+    if (errno != 0) {
+        fail(errno, "a folder of the store");
     }
     std::sort(names.begin(), names.end());
     return names;
@@ -214,7 +224,8 @@ Source sourceOf(std::istream& from, const Place& place) {
 class Delivery {
   public:
     /// Unless later, all of it is on the disk when it is in place.
-    Delivery(const Descriptor& folder, std::string what, bool later = false)
+    Delivery(const Descriptor& folder, const Permissions& permissions, std::string what,
+             bool later = false)
         : m_folder(folder), m_what(std::move(what)), m_later(later) {
         static int counter = 0;
         do {
@@ -227,6 +238,11 @@ class Delivery {
             fail(errno, m_what);
         }
         flock(m_file.get(), LOCK_EX | LOCK_NB);
+        if (!permissions.giveTo(m_file.get())) {
+            const int error = errno;
+            unlinkat(folder.get(), m_name.c_str(), 0);
+            fail(error, m_what);
+        }
     }
 
     ~Delivery() {
@@ -397,32 +413,122 @@ void keepVersion(const Descriptor& files, const Descriptor& folder, const Place&
 void deliver(const Descriptor& files, const Place& place, const Source& source) {
     const std::string what = place.text();
     const Descriptor folder = walk(files, place.folders(), true, what);
-    Delivery delivery(folder, what);
+    Delivery delivery(folder, Permissions::of(files.get()), what);
     delivery.fill(source);
     const ExchangeLock lock(files);
     keepVersion(files, folder, place);
     delivery.putInPlace(place.name());
 }
 
-/// Shows each entry below a folder, but for the versions: its folder, its name and its path.
+/// An entry that is no folder: its folder, its name, and its path below the files.
 using ShowEntry = std::function<void(const Descriptor& folder, const std::string& name,
                                      const std::string& path, const struct stat& status)>;
 
-void visitAll(const Descriptor& folder, const std::string& prefix, const ShowEntry& show) {
-    for (const auto& name : namesIn(folder)) {
-        struct stat status;
-        if (name == versionsFolder ||
-            fstatat(folder.get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
-            continue;
-        }
-        if (S_ISDIR(status.st_mode)) {
-            const Descriptor below = openFolder(folder.get(), name.c_str());
-            if (below.valid()) {
-                visitAll(below, prefix + name + "/", show);
+/// Folders that are still to be visited. Few are open at a time, however deep they are.
+class Visit {
+  public:
+    Visit(const Descriptor& files, std::string top) : m_files(files), m_pending{std::move(top)} {}
+
+    /// Goes to the next folder; false after the last one. Folders that are gone are passed over.
+    bool next() {
+        while (!m_pending.empty()) {
+            std::string path = std::move(m_pending.back());
+            m_pending.pop_back();
+            try {
+                m_folder = opened(path);
+                m_path = std::move(path);
+                return true;
+            } catch (const StoreFailure& failure) {
+                if (!isMissing(failure)) {
+                    throw;
+                }
             }
-        } else {
-            show(folder, name, prefix + name, status);
         }
+        return false;
+    }
+
+    const Descriptor& folder() const { return m_folder; }
+    std::string pathOf(const std::string& name) const {
+        return m_path.empty() ? name : m_path + "/" + name;
+    }
+    void add(std::string path) { m_pending.push_back(std::move(path)); }
+
+  private:
+    Descriptor opened(const std::string& path) const {
+        const std::string what = shownServerPath(path);
+        const std::size_t slash = path.rfind('/');
+        if (slash != std::string::npos && m_folder.valid() && path.substr(0, slash) == m_path) {
+            return walk(m_folder, {path.substr(slash + 1)}, false, what);
+        }
+        std::vector<std::string> folders;
+        for (std::size_t start = 0; start < path.size();) {
+            const std::size_t end = std::min(path.find('/', start), path.size());
+            folders.push_back(path.substr(start, end - start));
+            start = end + 1;
+        }
+        return walk(m_files, folders, false, what);
+    }
+
+    const Descriptor& m_files;
+    std::vector<std::string> m_pending;
+    Descriptor m_folder;
+    std::string m_path;
+};
+
+/// Shows each entry in the folder and below it, except for the versions below the files. A folder
+/// that can't be read is a failure.
+void visitAll(const Descriptor& files, const std::string& top, const ShowEntry& show) {
+    Visit visit(files, top);
+    while (visit.next()) {
+        for (const auto& name : namesIn(visit.folder())) {
+            const std::string path = visit.pathOf(name);
+            struct stat status;
+            if (name == versionsFolder) {
+                continue;
+            }
+            if (fstatat(visit.folder().get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) != 0) {
+                if (errno != ENOENT) {
+                    fail(errno, shownServerPath(path));
+                }
+            } else if (S_ISDIR(status.st_mode)) {
+                visit.add(path);
+            } else {
+                show(visit.folder(), name, path, status);
+            }
+        }
+    }
+}
+
+/// Removes deliveries that nobody is working on any more, if they are so old.
+int removeDeliveries(const Descriptor& files, const std::string& top, std::int64_t seconds) {
+    int removed = 0;
+    visitAll(files, top,
+             [&](const Descriptor& folder, const std::string& name, const std::string&,
+                 const struct stat& status) {
+                 if (!S_ISREG(status.st_mode) || !name.starts_with(deliveryPrefix) ||
+                     time(nullptr) - status.st_mtim.tv_sec < seconds) {
+                     return;
+                 }
+                 const Descriptor file(
+                     openat(folder.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC));
+                 if (file.valid() && flock(file.get(), LOCK_EX | LOCK_NB) == 0 &&
+                     unlinkat(folder.get(), name.c_str(), 0) == 0) {
+                     ++removed;
+                 }
+             });
+    return removed;
+}
+
+void makeFilesFolder(const std::string& storeFolder, const std::string& path) {
+    if (mkdir(path.c_str(), 0770) != 0) {
+        if (errno != EEXIST) {
+            fail(errno, path);
+        }
+        return;
+    }
+    const Descriptor folder = openFolder(AT_FDCWD, storeFolder.c_str());
+    if (!folder.valid() || !Permissions::of(folder.get()).giveTo(path)) {
+        fail(errno, path);
     }
 }
 
@@ -445,8 +551,8 @@ int Descriptor::release() {
 
 ServerFiles::ServerFiles(const std::string& storeFolder, bool create) {
     const std::string path = storeFolder + "/files";
-    if (create && mkdir(path.c_str(), 0770) != 0 && errno != EEXIST) {
-        fail(errno, path);
+    if (create) {
+        makeFilesFolder(storeFolder, path);
     }
     // A link in this place is the administrator's: the files may lie on a disk of their own.
     m_files = Descriptor(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
@@ -552,22 +658,8 @@ int ServerFiles::pruneVersions(std::string_view path, int keepNewest) {
 
 int ServerFiles::removeLeftovers() {
     constexpr std::int64_t youngestSeconds = 60; // Between making a file and locking it, say.
-    int removed = 0;
-    visitAll(m_files, "",
-             [&](const Descriptor& folder, const std::string& name, const std::string&,
-                 const struct stat& status) {
-                 if (!S_ISREG(status.st_mode) || !name.starts_with(deliveryPrefix) ||
-                     time(nullptr) - status.st_mtim.tv_sec < youngestSeconds) {
-                     return;
-                 }
-                 const Descriptor file(
-                     openat(folder.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC));
-                 if (file.valid() && flock(file.get(), LOCK_EX | LOCK_NB) == 0 &&
-                     unlinkat(folder.get(), name.c_str(), 0) == 0) {
-                     ++removed;
-                 }
-             });
-    return removed;
+    return removeDeliveries(m_files, "", youngestSeconds) +
+           removeDeliveries(m_files, versionsFolder, youngestSeconds);
 }
 
 void ServerFiles::placeVersion(std::string_view path, const FileVersion& version,
@@ -577,13 +669,16 @@ void ServerFiles::placeVersion(std::string_view path, const FileVersion& version
     const bool current = version.number == 0;
     const Descriptor folder =
         walk(m_files, current ? place.folders() : place.versions(), true, what);
-    Delivery delivery(folder, what, true);
+    Delivery delivery(folder, Permissions::of(m_files.get()), what, true);
     delivery.fill(sourceOf(from, place));
     delivery.setTime(version.time);
     delivery.putInPlace(current ? place.name() : versionName(version.number));
 }
 
-void ServerFiles::flushAll() {
+void ServerFiles::finishCopy() {
+    for (const char* const top : {"", versionsFolder}) {
+        removeDeliveries(m_files, top, 0);
+    }
     if (syncfs(m_files.get()) != 0) {
         fail(errno, "the store's files");
     }

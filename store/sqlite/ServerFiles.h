@@ -53,9 +53,11 @@ class ServerFiles {
     void restoreVersion(std::string_view path, int number);
     int pruneVersions(std::string_view path, int keepNewest);
     int removeLeftovers();
-    /// Not on the disk before flushAll.
+    /// Not on the disk before finishCopy.
     void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
-    void flushAll();
+    /// Brings all to the disk, and removes what copies left that were killed. Nobody else may be
+    /// at work.
+    void finishCopy();
 
   private:
     Descriptor m_files;

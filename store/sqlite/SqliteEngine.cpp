@@ -24,6 +24,7 @@
 #include "store/Engines.h"
 #include "store/JobOverview.h"
 #include "store/KeyBytes.h"
+#include "store/sqlite/Permissions.h"
 #include "store/sqlite/ServerFiles.h"
 #include "store/sqlite/Sqlite.h"
 #include "store/sqlite/WalWatch.h"
@@ -334,6 +335,9 @@ class SqliteEngine : public StoreEngine {
     bool change(int type, int id, const Scope& scope,
                 const std::function<void(TicketContent&)>& work) override {
         Transaction transaction(m_database);
+        if (scope.make) {
+            insert(type, id);
+        }
         std::int64_t ticket = 0;
         {
             auto run = m_lock.run(type, id);
@@ -354,10 +358,11 @@ class SqliteEngine : public StoreEngine {
         }
         const TicketContent before = content; // Shares the elements: a change makes others.
         work(content);
-        if (write(ticket, scope, before, content)) {
-            if (type == jobType) {
-                writeOverview(id, scope, content);
-            }
+        const bool written = write(ticket, scope, before, content);
+        if (written && type == jobType) {
+            writeOverview(id, scope, content);
+        }
+        if (written || scope.make) {
             transaction.commit();
         }
         return true;
@@ -645,9 +650,8 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
     const ServerFiles files(folder, true);
     Database database(databasePath(folder), Opening::New);
     // Log and index take the database's permissions. Password hashes are nobody else's.
-    const mode_t mask = umask(0);
-    umask(mask);
-    chmod(databasePath(folder).c_str(), 0660 & ~mask);
+    const Descriptor opened(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    Permissions::of(opened.get()).giveTo(databasePath(folder));
     database.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = FULL");
     Transaction transaction(database);
     if (database.number("SELECT count(*) FROM sqlite_schema") != 0) {
@@ -686,7 +690,7 @@ class SqliteCopy : public SqliteEngine {
     }
 
     void finishCopy() override {
-        serverFiles().flushAll();
+        serverFiles().finishCopy();
         database().run("PRAGMA synchronous = FULL"); // Of what is in the log so far as well.
         SqliteEngine::finishCopy();
     }

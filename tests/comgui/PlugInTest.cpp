@@ -1,5 +1,7 @@
 // The real bundle, loaded by the real loader and used through the connector.
+#include <cstdlib>
 #include <cstring>
+#include <ctime>
 #include <filesystem>
 #include <memory>
 #include <vector>
@@ -12,8 +14,9 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
 #include "StoreTest.h"
 #include "SuiteRoot.h"
-#include "store/Users.h"
 #include "base/WideBytes.h"
+#include "store/Users.h"
+#include "store/WriteFailures.h"
 
 namespace {
 
@@ -93,6 +96,52 @@ TEST_P(ComGUIPlugIn, LetsInWhoKnowsThePassword) {
     }
     EXPECT_TRUE(open()->removeUser("left"));
     EXPECT_FALSE(open()->removeUser("left"));
+}
+
+TEST_P(ComGUIPlugIn, NotesEachWriteThatTheStoreDoesNotTake) {
+    setenv("TMPDIR", folder.path().c_str(), 1);
+    const store::WriteFailures failures(folder.path());
+    open()->create(3, 7);
+    sql("INSERT INTO keys SELECT number, CAST('a\n' AS BLOB), x'010299' FROM tickets WHERE type = "
+        "3",
+        "INSERT INTO tintgate.keys (ticket, name, value, change)"
+        " SELECT number, '\\x610a', '\\x010299', 0 FROM tintgate.tickets WHERE type = 3");
+    const auto connector = connect(here);
+    int value = 1;
+    const auto set = [&](int id, const char* key, int position) {
+        return connector->SetJobTicketKeyValue(3, id, key, PARAM_INT, &value, position);
+    };
+    EXPECT_EQ(set(7, "fine", -1), 0);
+    EXPECT_FALSE(support::exists(failures.path()));
+    EXPECT_NE(set(7, "a\n", 1), 0);
+    EXPECT_NE(set(7, "fine", -1), 0);
+    EXPECT_NE(set(8, "b", -1), 0);
+    double values[] = {1, 2};
+    connector->SetJobArrayParameter(3, 8, "c", PARAM_DOUBLE, 2, values);
+    EXPECT_FALSE(connector->UploadFile(folder.write("local", "x"), "/x/../y"));
+    std::string noted;
+    for (const auto& [time, server, target, key, reason] : failures.all()) {
+        EXPECT_NEAR(static_cast<double>(time), static_cast<double>(std::time(nullptr)), 5);
+        EXPECT_EQ(server, address);
+        noted += target + " " + key + ": " + reason + "\n";
+    }
+    EXPECT_EQ(noted, "job/7 a\\x0A: a key of the store can't be read\n"
+                     "job/7 fine: an earlier write to this ticket was lost\n"
+                     "job/8 b: there is no such ticket\n"
+                     "job/8 c: there is no such ticket\n"
+                     "file /x/../y: server path \"/x/../y\" names no file of the store\n");
+    EXPECT_EQ(support::modeOf(failures.path()), 0600U);
+
+    // A large file is put aside, and another's is left alone.
+    std::filesystem::resize_file(failures.path(), 1 << 20);
+    set(8, "d", -1);
+    EXPECT_EQ(failures.all().size(), 1U);
+    EXPECT_TRUE(support::exists(failures.path() + ".old"));
+    std::filesystem::rename(failures.path(), folder.path("elsewhere"));
+    std::filesystem::create_symlink(folder.path("elsewhere"), failures.path());
+    set(8, "e", -1);
+    EXPECT_EQ(failures.all().size(), 1U);
+    unsetenv("TMPDIR");
 }
 
 TEST_F(ComGUISlots, AddressesArriveOneByteACharacterAndAreLimited) {

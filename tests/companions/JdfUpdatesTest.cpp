@@ -1,6 +1,8 @@
 // JDFs in a store, prepared by the administration tool and then updated as the job's results are
 // written back. An XML library judges what has become of them.
 
+#include <filesystem>
+#include <random>
 #include <regex>
 #include <sstream>
 #include <string>
@@ -91,7 +93,7 @@ class JdfUpdates : public StoreProgram {
         return answer({"file", "get", jdfPath, "-", "--version", std::to_string(lastVersion())});
     }
 
-    /// Updates the local copy as a result is written back, and uploads it. Each is of a day of its
+    /// Updates the local copy as a result is written back. Each update is of a day of its
     /// own, and those of odd days have spectra.
     void update(char party, char strip) {
         JDFMeasurementHeader header;
@@ -109,7 +111,6 @@ class JdfUpdates : public StoreProgram {
         job.measurement.hasSpectral = m_day % 2;
         job.measurement.spectral = m_day % 2 == 1 ? m_spectral : nullptr;
         ASSERT_EQ(JdfHandler::AppendJDFFileData(job, "Remote confirmation M1", &header, true), 0);
-        put(support::contentsOf(m_folder.path("local.jdf")));
     }
     /// Runs in a row, each a word. A run downloads the JDF, and writes to it once, or for each job
     /// of a sheet: s is for the sender, r for the receiver, that of a remeasure, with the strip
@@ -120,6 +121,7 @@ class JdfUpdates : public StoreProgram {
             m_folder.write("local.jdf", stored());
             for (std::size_t i = 0; i < run.size(); i += 2) {
                 update(run[i], run[i + 1]);
+                put(support::contentsOf(m_folder.path("local.jdf")));
             }
         }
     }
@@ -149,7 +151,7 @@ class JdfUpdates : public StoreProgram {
     /// The text without what updates put into it, and without the blanks behind its end.
     static std::string rest(const std::string& text) {
         const std::regex measurement("<tazo:Measurement(2?) [^]*?</tazo:Measurement\\1>\n");
-        const std::regex date("(<(?:Sender|Receiver)[^>]*\\sprint(?:date|time)=\")[^\"]+");
+        const std::regex date("(<(?:Sender|Receiver)(?=\\s)[^>]*\\sprint(?:date|time)=\")[^\"]+");
         auto result = std::regex_replace(withoutBlanks(text), measurement, "");
         result = std::regex_replace(result, date, "$1");
         return std::regex_replace(result, date, "$1");
@@ -221,6 +223,7 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
              "</j:ResourcePool><j:ResourceLinkPool a='/>' >" + linkTo(none) +
              "</j:ResourceLinkPool></j:JDF>"},
         {pooled(full + "</tazo:MeasurementData>"), pooled(holder())}, // As an update made it.
+        {pooled(full.substr(0, full.size() - 1) + "/>"), pooled(holder())},
         {pooled("<tazo:MeasurementData ID='a'/>"),
          pooled("<tazo:MeasurementData ID='a'></tazo:MeasurementData>")},
         {pooled(holder(), "<Sender printdate=\"\" printtime='1'/>"),
@@ -229,6 +232,12 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
         {pooled(holder(), "<SenderId/><Sender aprintdate=\"2020\" printtime='1' printdate=\"\"/>"),
          pooled(holder(),
                 "<SenderId/><Sender printdate=\"\" printtime=\"\" aprintdate=\"2020\"/>")},
+        // Dates of others, which an update would find first.
+        {pooled(holder(), "<Senders><Note printdate=\"\"/></Senders><Sender/>"),
+         pooled(holder(), "<Senders><Note printdate =\"\"/></Senders>"
+                          "<Sender printdate=\"\" printtime=\"\"/>")},
+        {pooled(holder(), "<SenderId aprintdate=\"2020\"/><Note printtime=\"\"/>"),
+         pooled(holder(), "<SenderId aprintdate =\"2020\"/><Note printtime =\"\"/>")},
     };
     for (const auto& [before, after] : cases) {
         SCOPED_TRACE(before);
@@ -243,6 +252,8 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
     const std::pair<std::string, const char*> refused[] = {
         {"<JDF>\n<!-- <Sender printdate=\"2020\"/> --><Sender/></JDF>",
          "line 2 would mislead the update: a date"},
+        {"<JDF><![CDATA[<Sender printdate=\"\"]]><Sender/></JDF>", "not the Sender's"},
+        {"<JDF><SenderId/><Receiver printdate=\"\"/></JDF>", "not the Sender's"},
         {"<JDF><!-- </tazo:MeasurementData> --><x/></JDF>", "no tag"},
         {"<JDF><!-- " + full + " --><x/></JDF>", "own opening tag"},
         {std::string("<\0a\0/\0>\0", 8), "UTF-16"},
@@ -252,6 +263,62 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
         expectRefusal({"jdf", "ready", "7"}, 15, words);
         EXPECT_EQ(stored(), text);
     }
+}
+
+// Pieces of a JDF in any order: one that is made ready takes updates, and can be made ready again.
+TEST_F(JdfUpdates, LeaveNoTraceInAnyJdfThatIsReady) {
+    const std::string pieces[] = {
+        "<Sender/>",
+        "<Sender printtime=\"1\" printdate='2'><Note printdate=\"3\"/></Sender>",
+        "<Receiver printdate=\"4\"/>",
+        "<Receiver x=\"\" printtime=\"\">",
+        "</Receiver>",
+        "<SenderInfo printdate=\"\"/>",
+        "<Senders>",
+        "</Senders>",
+        "<Note printdate=\"\" printtime=\"5\"/>",
+        "<ReceiverId/>",
+        "<!-- <Receiver -->",
+        "<ResourcePool>",
+        "</ResourcePool>",
+        "<ResourcePool/>",
+        "<ResourceLinkPool/>",
+        holder(),
+        "<tazo:MeasurementData ID=\"BJDFLink0000006\" Class=\"Parameter\" Status=\"Available\"/>",
+        "<tazo:MeasurementData ID=\"x\">\n</tazo:MeasurementData >",
+    };
+    std::mt19937 random(1);
+    int whole = 0;
+    for (int round = 0; round < 60; ++round) {
+        std::string text = "<JDF xmlns:tazo='t'>";
+        for (auto count = random() % 9; count > 0; --count) {
+            text += pieces[random() % std::size(pieces)] + (random() % 2 == 0 ? "\n  " : "");
+        }
+        text += "</JDF>";
+        if (!pugi::xml_document().load_string(text.c_str())) {
+            continue;
+        }
+        SCOPED_TRACE(text);
+        put(text);
+        const auto ready = run({"jdf", "ready", "7", "--updates", "4"});
+        if (ready.exitCode != 0) {
+            EXPECT_EQ(ready.exitCode, 15);
+            EXPECT_EQ(stored(), text);
+            continue;
+        }
+        const std::string before = rest(stored());
+        runJobs("s1");
+        for (const char party : {'r', 's', 'r'}) {
+            update(party, '2');
+        }
+        put(support::contentsOf(m_folder.path("local.jdf")));
+        EXPECT_EQ(rest(stored()), before);
+        answer({"jdf", "ready", "7", "--updates", "1"});
+        runJobs("r1");
+        EXPECT_EQ(rest(stored()), before);
+        ++whole;
+    }
+    EXPECT_GT(whole, 10);
 }
 
 TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
@@ -274,11 +341,46 @@ TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     answer({"jdf", "rebuild", "7", "--from", std::to_string(lastVersion())});
     expectWhole(whole, "1:01 2:02 2:03 1:04 1:05 1:06");
 
-    // Another document under the same name has nothing to do with what was before.
+    // Another document under the same name has nothing to do with what was before, and may be the
+    // one that is damaged: that is for people to say.
+    put("<JDF><new/></JDF>");
+    for (const std::string& current : {stored(), enlarged(delivered), std::string("<JDF><new>")}) {
+        put(current);
+        expectRefusal({"jdf", "rebuild", "7"}, 17, "version 1 and version ");
+        EXPECT_EQ(stored(), current);
+    }
     put("<JDF><new/></JDF>");
     answer({"jdf", "rebuild", "7", "--from", std::to_string(lastVersion() + 1)});
     EXPECT_THAT(stored(), HasSubstr("<JDF><new/>"));
     EXPECT_EQ(measurements(stored()), "");
+}
+
+TEST_F(JdfUpdates, OfStripsAtOverlappingTimesAreBroughtTogether) {
+    put(delivered);
+    answer({"jdf", "ready", "7"});
+    const std::string downloaded = stored(); // By the second strip's run, before the first ends.
+    runJobs("s1");
+    m_folder.write("local.jdf", downloaded);
+    update('s', '2');
+    put(support::contentsOf(m_folder.path("local.jdf")));
+    ASSERT_EQ(measurements(stored()), "2:02");
+    answer({"jdf", "rebuild", "7"});
+    expectWhole(prepared, "1:01 2:02");
+}
+
+TEST_F(JdfUpdates, RefuseTextsThatTakeMoreThanTheirShare) {
+    std::string many = "<JDF>";
+    for (int i = 0; i < 2'000'000; ++i) {
+        many += "<a/>";
+    }
+    many += "</JDF>";
+    put("");
+    m_folder.write("store/files" + jdfPath, many); // Without waiting for the disk.
+    expectRefusal({"jdf", "ready", "7"}, 16, "more than 2000000 elements");
+    std::filesystem::resize_file(m_address + "/files" + jdfPath, (256U << 20) + 1);
+    expectRefusal({"jdf", "ready", "7"}, 16, "256 MiB");
+    expectRefusal({"jdf", "rebuild", "7"}, 16, "256 MiB");
+    EXPECT_TRUE(m_store->versions(jdfPath).empty());
 }
 
 TEST_F(JdfUpdates, AreOfTheJdfsThatAJobNames) {

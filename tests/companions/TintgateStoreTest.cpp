@@ -10,6 +10,8 @@
 #include <string>
 #include <vector>
 
+#include <unistd.h>
+
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 #include <nlohmann/json.hpp>
@@ -75,7 +77,7 @@ class TintgateStore : public StoreProgram {
     void makeTicket(int type, int id, const store::TicketContent& content) const {
         const auto engine = open();
         engine->create(type, id);
-        engine->change(type, id, store::Scope{true, {}},
+        engine->change(type, id, store::Scope{.everything = true},
                        [&](store::TicketContent& stored) { stored.transfer(content, true); });
     }
 };
@@ -222,6 +224,11 @@ TEST_F(TintgateStore, KeysAreSetReadAndDeleted) {
     EXPECT_EQ(answer({"key", "get", "job/7", "B", "--raw"}), bytes);
     answer({"key", "set", "job/7", "Escape", "string", "\x1b[2J"});
     EXPECT_THAT(answer({"key", "list", "job/7", "E"}), HasSubstr("\\x1B[2J"));
+    EXPECT_EQ(answer({"key", "get", "job/7", "Escape"}), "\x1b[2J\n");
+    const auto shown =
+        support::run({"python3", "-c", "import pty, sys; pty.spawn(sys.argv[1:])",
+                      TINTGATE_STORE_PROGRAM, "-s", m_address, "key", "get", "job/7", "Escape"});
+    EXPECT_EQ(shown.output, "\\x1B[2J\r\n");
 }
 
 TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
@@ -251,7 +258,8 @@ TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
 }
 
 TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
-    const std::string measured = " Remote/Measurement/Status=1 Remote/Measurement/Approval=1 ";
+    const std::string measured = " Remote/Measurement/Status=1 Remote/Measurement/Approval=1 "
+                                 "Remote/Measurement/Values/Decimal=2 ";
     const std::string closed = "Job/Display/Status=211 Remote/ShowInVerifier=0" + measured;
     std::pair<std::string, std::string> jobs[] = {
         {"Job/Display/Status=208", "waiting 208 - - -"},
@@ -264,8 +272,10 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
         {"Job/Display/Status=208 Remote/ShowInVerifier=0 General/ParentID=5" + measured,
          "waiting 208 passed - 5"},
         {closed + "General/ParentID=5 Remote/Measurement2/Status=1 Remote/Measurement2/Approval=0",
-         "passed 211 passed failed 5"},
-        {closed + "General/ParentID=4", "passed 211 passed - 4"},
+         "passed 211 passed cut off 5"},
+        {closed + "General/ParentID=4 Workflow/Verify/Active=3 Remote/Measurement2/Approval=0 "
+                  "Remote/Measurement2/Values/PSDDecimal=1",
+         "passed 211 passed failed 4"},
     };
     for (const auto& job : jobs) {
         makeTicket(3, static_cast<int>(&job - jobs) + 1, contentOf(job.first));
@@ -290,6 +300,76 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
     expectRefusal({"reset", "9"}, 1, "there is no job 9");
 }
 
+TEST_F(TintgateStore, AResetWarnsOfRunsThatCannotSucceed) {
+    const std::string waits = "Job/Display/Status=208 ";
+    const std::string strip = "Footer/ControlstripFile='abcd ";
+    const std::string fine = waits + strip + "Workflow/Verify/MeasurementWorkflow=";
+    const struct {
+        std::string keys, words; ///< No words: no warning.
+    } cases[] = {
+        {fine + "1 Remote/UsedICCProfile='p", ""},
+        {fine + "3 Footer/ControlstripInputProfile='p", ""},
+        {fine + "2 Workflow/Verify/CharacterizationData='d", ""},
+        {fine + "4 Job/FromEsko=1", ""},
+        {waits + "Footer/Dynstrip/UseDynstrip=1 Footer/Dynstrip/IT8='s", ""},
+        {fine + "1", "strip 1: it has no profile as reference (Footer/ControlstripInputProfile"},
+        {fine + "3 Remote/Measurement/Reference/Numpatches=1 Remote/UsedICCProfile='",
+         "references in the ticket count only for a strip that is measured"},
+        {fine + "2", "strip 1: it has no reference (Workflow/Verify/CharacterizationData)"},
+        {fine + "4", "no reference (Workflow/Verify/MeasurementWorkflow)"},
+        {fine + "1 Remote/UsedICCProfile='p Footer/ControlstripFile='abc",
+         "strip 1: it has no control strip (Footer/ControlstripFile, Footer/Nesting/"},
+        {fine + "1 Remote/UsedICCProfile='p Workflow/Verify/Active=3",
+         "strip 2: it has no reference (Workflow/Verify/MeasurementWorkflow2)"},
+        {fine + "1 Remote/UsedICCProfile='p Input/FileType=4096", "never verified"},
+        {"Job/Display/Status=211 " + strip, "only a remeasure finds it"},
+        {waits + "Footer/Dynstrip/UseDynstrip=1", "no control strip (Footer/Dynstrip/IT8)"},
+    };
+    for (const auto& [keys, words] : cases) {
+        SCOPED_TRACE(keys);
+        makeTicket(3, 7, contentOf(keys + " Remote/Measurement/Status=1"));
+        const support::Outcome outcome = run({"reset", "7"});
+        EXPECT_EQ(outcome.exitCode, 0);
+        EXPECT_THAT(outcome.output, HasSubstr("removed Remote/Measurement/Status"));
+        EXPECT_THAT(outcome.error, words.empty() ? testing::Eq(words)
+                                                 : testing::Matcher<std::string>(HasSubstr(words)));
+    }
+}
+
+TEST_F(TintgateStore, AStoreOfAGroupIsForAllItsMembersAndNobodyElse) {
+    expectRefusal({"-s", m_folder.path("new"), "make", "--group", "no such group"}, 3, "no group");
+    expectRefusal({"make", "--group", "games"}, 2, "exists");
+    expectRefusal({"-s", "service", "make", "--group", "games"}, 64, "folder");
+    if (geteuid() != 0) {
+        GTEST_SKIP() << "only root can be several people";
+    }
+    const std::string store = m_folder.path("shared");
+    answer({"-s", store, "make", "--group", "games"});
+    std::filesystem::permissions(m_folder.path(), std::filesystem::perms(0755));
+    const std::string file = m_folder.write("file", "text");
+    std::filesystem::permissions(file, std::filesystem::perms(0644));
+    // As a person of this number and group whose umask keeps everything to themselves.
+    const auto as = [&](int user, const char* group, const std::string& words) {
+        const std::string number = std::to_string(user);
+        return support::run({"setpriv", "--reuid=" + number, "--regid=" + number,
+                             std::string("--groups=") + group, "sh", "-c",
+                             "umask 077; exec \"$0\" -s \"$1\" " + words, TINTGATE_STORE_PROGRAM,
+                             store});
+    };
+    for (const int user : {4001, 4002}) {
+        const std::string put = "file put " + file + " /";
+        for (const std::string& words :
+             {put + "a/b/file", put + std::to_string(user) + "/file",
+              std::string("ticket create job"), std::string("key set system Note int 1")}) {
+            const auto outcome = as(user, "games", words);
+            EXPECT_EQ(outcome.exitCode, 0) << user << words << outcome.error;
+        }
+    }
+    EXPECT_EQ(as(4002, "games", "file put " + file + " /4001/file").exitCode, 0);
+    EXPECT_EQ(as(4001, "games", "file restore /a/b/file 1").exitCode, 0);
+    EXPECT_EQ(as(4003, "4003", "info").exitCode, 4);
+}
+
 TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
     expectRefusal({"make"}, 2);
     expectRefusal({"-s", m_folder.path("none"), "jobs"}, 4, "none");
@@ -304,6 +384,15 @@ TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
     const auto warned = run({"-s", m_folder.makeFolder(std::string(128, 'd')) + "/store", "make"});
     EXPECT_EQ(warned.exitCode, 0);
     EXPECT_THAT(warned.error, HasSubstr("a job can name at most 127"));
+    for (const char* command : {"make", "info"}) {
+        EXPECT_EQ(run({"-s", m_folder.path("K\xC3\xB6ln"), command}).error, "");
+        EXPECT_THAT(run({"-s",
+                         m_folder.path("\xC5\x81\xC3\xB3"
+                                       "d\xC5\xBA"),
+                         command})
+                        .error,
+                    HasSubstr("characters that a job can't name"));
+    }
 }
 
 /// The fixture's store is a folder, and there is a database for a copy of it.

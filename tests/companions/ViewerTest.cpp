@@ -1,7 +1,9 @@
 #include <algorithm>
 #include <filesystem>
+#include <fstream>
 #include <string>
 #include <unistd.h>
+#include <utime.h>
 #include <vector>
 
 #include <gmock/gmock.h>
@@ -74,6 +76,38 @@ TEST_F(Viewer, ShowsTheVerdictAndRunsNothingOfATicket) {
                              "55.00 -37.00 -50.00", "52.00 -35.00 -46.00", ">-3.00<", ">+2.00<",
                              ">+4.00<", "difference\">4.75</td>", "beyond what an sRGB screen"})
         EXPECT_THAT(first, HasSubstr(part));
+}
+
+TEST_F(Viewer, NamesWhatTheServerDoesNotHave) {
+    support::RunOptions options = withoutDisplay();
+    options.environment.insert({"TMPDIR", m_scratch.path()});
+    const std::string file =
+        m_scratch.path("tintgate-failed-writes-" + std::to_string(geteuid()) + ".txt");
+    const auto shown = [&](const std::vector<const char*>& times) {
+        std::string lines = "no line of ours\n";
+        for (const char* time : times) {
+            lines +=
+                std::string(time) + "\t/srv/<b>\tjob/7\tRemote/Measurement/Date\tit was lost\n";
+        }
+        m_scratch.write(file.substr(m_scratch.path().size() + 1), lines);
+        std::filesystem::remove(m_page);
+        EXPECT_EQ(show(options).exitCode, 0);
+        return support::contentsOf(m_page);
+    };
+    // The run of the meta file was at 10:34:56 UTC, and its measurement half an hour before.
+    const utimbuf made = {0, 1'714'557'600}; // 10:00 UTC
+    const std::string sample = m_folder + "/Measured sample.txt";
+    const char* const within[] = {"2024-05-01T10:00:00Z", "2024-05-01T10:34:57Z"};
+    EXPECT_THAT(shown({within[0]}), Not(HasSubstr("failed, first"))) << "nothing was measured";
+    std::ofstream(sample).close();
+    utime(sample.c_str(), &made);
+    EXPECT_THAT(shown({"2024-05-01T09:59:59Z", "2024-05-01T10:34:58Z"}),
+                Not(HasSubstr("failed, first")));
+    EXPECT_THAT(shown({within[0], "2024-05-01T10:34:58Z"}), HasSubstr("1 write failed, first"));
+    const std::string page = shown({within[0], within[1]});
+    EXPECT_THAT(page, HasSubstr("does not have all of this result: 2 writes failed, first job/7 "
+                                "Remote/Measurement/Date (it was lost)."));
+    EXPECT_THAT(page, Not(HasSubstr("/srv/<b>")));
 }
 
 TEST_F(Viewer, SortsFindsAndSavesPatches) {

@@ -1,7 +1,12 @@
 #include "jdf/JdfHandler.h"
 
+#include <csignal>
 #include <filesystem>
 #include <vector>
+
+#include <sys/resource.h>
+#include <sys/wait.h>
+#include <unistd.h>
 
 #include <gtest/gtest.h>
 
@@ -148,5 +153,52 @@ TEST_F(JdfFile, IsReplacedBehindALinkWithItsPermissions) {
     EXPECT_NE(support::contentsOf(path).find(element), std::string::npos);
     EXPECT_EQ(support::modeOf(path), 0640U);
 }
+
+TEST_F(JdfFile, TakesNamesAsLongAsNamesGet) {
+    const std::string path = folder.write(std::string(255, 'j'), fresh);
+    ASSERT_EQ(update(path), 0);
+    EXPECT_NE(support::contentsOf(path).find(element), std::string::npos);
+    EXPECT_EQ(std::distance(fs::directory_iterator(folder.path()), {}), 1);
+}
+
+TEST_F(JdfFile, IsWholeAndAloneAfterARunThatWasKilled) {
+    header.party = 0;
+    const std::string path = folder.write("job.jdf", fresh + std::string(30'000'000, ' '));
+    ASSERT_EQ(update(path, false), 0);
+    const auto size = fs::file_size(path);
+    for (int round = 0; round < 20; ++round) {
+        const pid_t child = fork();
+        if (child == 0) {
+            while (update(path, false) == 0) {
+            }
+            _exit(1);
+        }
+        usleep(20'000 + round * 2'500U);
+        kill(child, SIGKILL);
+        waitpid(child, nullptr, 0);
+        EXPECT_EQ(std::distance(fs::directory_iterator(folder.path()), {}), 1) << round;
+        EXPECT_EQ((fs::file_size(path) - size) % element.size(), 0U) << round;
+    }
+}
+
+#ifndef __SANITIZE_ADDRESS__ // Which takes more room for addresses than a limit may leave.
+TEST_F(JdfFile, GoesWithoutAnUpdateThatMemoryIsTooSmallFor) {
+    const std::string path = folder.write("job.jdf", fresh);
+    job.measurement.numPatches = 1'000'000; // Which may need 900 MB.
+    job.measurement.xyz = nullptr;
+    const std::pair<rlim_t, int> limits[] = {{500'000'000, -1}, {1'200'000'000, 0}};
+    for (const auto& [room, code] : limits) {
+        const pid_t child = fork();
+        if (child == 0) {
+            const rlimit limit = {room, room};
+            setrlimit(RLIMIT_AS, &limit);
+            _exit(update(path) == code ? 0 : 1);
+        }
+        int status = 0;
+        waitpid(child, &status, 0);
+        EXPECT_TRUE(WIFEXITED(status) && WEXITSTATUS(status) == 0) << room << ": " << status;
+    }
+}
+#endif
 
 } // namespace

@@ -2,6 +2,7 @@
 
 #include <filesystem>
 
+#include <sys/resource.h>
 #include <sys/stat.h>
 #include <unistd.h>
 #include <utime.h>
@@ -110,8 +111,13 @@ TEST_F(FilesInFolder, LeftoversGoWhileDeliveriesStay) {
     const utimbuf old = {1, 1};
     utime(left.c_str(), &old);
     EXPECT_EQ(engine->files().size(), 1u);
-    EXPECT_EQ(engine->removeLeftovers(), 1);
+    folder.makeFolder("store/files/.tintgate-versions/b");
+    const std::string copied =
+        folder.write("store/files/.tintgate-versions/b/.tintgate-new-1-1", "by a copy");
+    utime(copied.c_str(), &old);
+    EXPECT_EQ(engine->removeLeftovers(), 2);
     EXPECT_FALSE(support::exists(left));
+    EXPECT_FALSE(support::exists(copied));
 
     // A process that was killed after it had kept a version, and before the exchange.
     std::filesystem::create_directories(address + "/files/.tintgate-versions/a/file");
@@ -120,4 +126,82 @@ TEST_F(FilesInFolder, LeftoversGoWhileDeliveriesStay) {
     EXPECT_TRUE(engine->versions("a/file").empty());
     putFile(*engine, "a/file", "y");
     EXPECT_EQ(versions(*engine, "a/file"), std::vector<std::string>{"x"});
+}
+
+TEST_P(ServerFiles, FoldersMayBeAsDeepAsPathsAreLong) {
+    std::string deep;
+    for (int i = 0; i < 1'023; ++i) {
+        deep += "a/";
+    }
+    const rlimit limit = {1'024, 1'024}; // As many accounts have it.
+    rlimit before;
+    getrlimit(RLIMIT_NOFILE, &before);
+    setrlimit(RLIMIT_NOFILE, &limit);
+    if (!room) { // Without waiting for the disk at each.
+        support::run({"python3", "-c",
+                      "import os, sys\n"
+                      "os.chdir(sys.argv[1])\n"
+                      "for i in range(1023):\n    os.mkdir('a')\n    os.chdir('a')",
+                      address + "/files"});
+    }
+    putFile(*engine, deep + "b", "deep");
+    putFile(*engine, "a/a/b", "x");
+    std::vector<std::string> paths;
+    for (const auto& entry : engine->files()) {
+        paths.push_back(entry.path);
+    }
+    EXPECT_EQ(paths, (std::vector<std::string>{deep + "b", "a/a/b"}));
+    EXPECT_EQ(engine->removeLeftovers(), 0);
+    EXPECT_EQ(file(*engine, deep + "b"), "deep");
+    setrlimit(RLIMIT_NOFILE, &before);
+}
+
+TEST_F(FilesInFolder, AFolderThatCannotBeReadIsNamed) {
+    putFile(*engine, "a/open", "x");
+    putFile(*engine, "a/closed/file", "x");
+    const std::string closed = address + "/files/a/closed";
+    const pid_t child = startProcess([&] {
+        chmod(closed.c_str(), 0);
+        if (geteuid() == 0) { // Who may read any folder.
+            const auto mine = [](const std::string& path) { return chown(path.c_str(), 1, 1); };
+            for (const char* each : {"", "/files", "/files/a", "/files/a/closed"}) {
+                EXPECT_EQ(mine(address + each), 0);
+            }
+            EXPECT_EQ(setegid(1) | seteuid(1), 0);
+        }
+        try {
+            engine->files();
+        } catch (const store::StoreFailure& failure) {
+            EXPECT_EQ(failure.fault, Fault::ReadOnly);
+            EXPECT_STREQ(failure.what(), "server path \"a/closed\": Permission denied");
+            return HasFailure() ? 1 : 0;
+        }
+        return 2;
+    });
+    EXPECT_EQ(endOf(child), 0);
+}
+
+TEST_F(FilesInFolder, PermissionsAreThoseOfTheStoresFolderWhateverTheUmask) {
+    for (const mode_t mode : {02770U, 0750U, 0700U, 02777U}) {
+        const std::string path = folder.makeFolder("s" + std::to_string(mode));
+        chmod(path.c_str(), mode);
+        const mode_t former = umask(027);
+        store::makeStore(path, "x");
+        {
+            const auto made = store::openStore(path);
+            made->create(3, 1);
+            for (const char* text : {"1", "2"}) {
+                umask(mode % 2 == 0 ? 077 : 0);
+                putFile(*made, "a/b", text);
+            }
+            for (const char* each : {"/files", "/files/a", "/files/.tintgate-versions/a/b"}) {
+                EXPECT_EQ(support::modeOf(path + each), mode & 02770) << each << std::oct << mode;
+            }
+            for (const char* each : {"/files/a/b", "/files/.tintgate-versions/a/b/.tintgate-1",
+                                     "/tickets.db", "/tickets.db-wal", "/tickets.db-shm"}) {
+                EXPECT_EQ(support::modeOf(path + each), mode & 0660) << each << std::oct << mode;
+            }
+        }
+        umask(former);
+    }
 }

@@ -127,6 +127,35 @@ TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
     EXPECT_EQ(ticket(*open(), 3, 1), std::end(tables)[-1].ticket);
 }
 
+TEST_P(StoreEngine, AChangeMakesItsTicketWithAllKeysOrNone) {
+    const auto engine = open();
+    const auto other = open();
+    for (const bool replace : {true, false}) {
+        const store::Scope scope{.everything = replace, .make = true, .keys = {{"a", false}}};
+        const auto put = [&](const char* records) {
+            return [=](store::TicketContent& content) {
+                content.apply(support::RecordTable(records).records());
+            };
+        };
+        EXPECT_THROW(engine->change(3, 7, scope,
+                                    [&](store::TicketContent& content) {
+                                        put("a=1")(content);
+                                        EXPECT_FALSE(other->exists(3, 7));
+                                        throw std::runtime_error("on the way");
+                                    }),
+                     std::runtime_error);
+        EXPECT_FALSE(other->exists(3, 7));
+        EXPECT_TRUE(engine->change(3, 7, scope, put("a=1")));
+        EXPECT_EQ(ticket(*other, 3, 7), "a[0]=1");
+        EXPECT_TRUE(engine->change(3, 7, scope, put("a=2"))) << "one that is there";
+        EXPECT_EQ(ticket(*other, 3, 7), "a[0]=2");
+        EXPECT_EQ(engine->createNext(3), replace ? 8 : 9);
+        engine->remove(3, 7);
+    }
+    EXPECT_TRUE(engine->change(3, 20, {.make = true}, [](auto&) {}));
+    EXPECT_EQ(ticket(*other, 3, 20), "");
+}
+
 TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
     // The first two are held of all jobs at once, from when a reader asks for the ids.
     const std::string keys[] = {"Job/Display/Status", "Input/FileType", "Other"};

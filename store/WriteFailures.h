@@ -1,0 +1,45 @@
+// Writes that a server did not take, kept for people: exit codes and a run's log do not mention
+// them. A text file in the temporary folder has a line for each, with tabs between its parts:
+//
+//   2024-05-01T12:34:56Z  /srv/tintgate  job/7  Remote/Measurement/Status  the store is locked
+//
+// Bytes that are no printable ASCII character, and backslashes, are written as \xNN.
+#pragma once
+
+#include <cstdint>
+#include <string>
+#include <vector>
+
+namespace store {
+
+struct WriteFailure {
+    std::int64_t time = 0; ///< Seconds since 1970.
+    std::string server;    ///< The address that the client gave.
+    std::string target;    ///< A ticket, such as job/7 or 27/1; "file" for an upload.
+    std::string key;       ///< Of the ticket; the server path of an upload; may be empty.
+    std::string reason;
+};
+
+/// The name of a ticket in such a line.
+std::string ticketNameOf(int type, int id);
+
+class WriteFailures {
+  public:
+    /// Of a user, in a folder for temporary files. With an empty folder nothing is kept.
+    explicit WriteFailures(const std::string& folder);
+
+    const std::string& path() const { return m_path; }
+
+    /// Appends a line, in one piece. The file is made with mode 0600. If it has a megabyte, it is
+    /// put aside first, under its name and ".old". What fails here is passed over, and a file of
+    /// another user or a link is left alone.
+    void add(const WriteFailure& failure) const;
+
+    /// All that the file contains, with \xNN as it is. Lines that make no sense are left out.
+    std::vector<WriteFailure> all() const;
+
+  private:
+    std::string m_path;
+};
+
+} // namespace store
