@@ -247,6 +247,7 @@ class TextReader {
     std::size_t m_tables = 0;
     Table m_table;
     DataSet m_texts; ///< Header texts alone.
+    std::string m_printConditions;
     ScaleHint m_scaleHint = ScaleHint::None;
     ConditionFinder m_conditions;
 };
@@ -269,6 +270,7 @@ Failure TextReader::read(DataSet& set) {
     set.descriptor = std::move(m_texts.descriptor);
     set.created = std::move(m_texts.created);
     set.instrumentation = std::move(m_texts.instrumentation);
+    set.printing = std::move(m_texts.printing.empty() ? m_printConditions : m_texts.printing);
     set.conditions = m_conditions.result();
     const Conditions& stated = set.conditions;
     const bool otherLight = !stated.illuminant.empty() && stated.illuminant != "D50";
@@ -406,6 +408,10 @@ void TextReader::seeHeader(const KeywordLine& line) {
         keep(m_texts.instrumentation);
     else if (line.keyword == "DESCRIPTOR" || line.keyword == "FILE_DESCRIPTOR")
         keep(m_texts.descriptor);
+    else if (line.keyword == "PRINTER")
+        keep(m_texts.printing);
+    else if (line.keyword == "PRINT_CONDITIONS" && !sameWord(line.value, "Not specified"))
+        keep(m_printConditions);
     else if (line.keyword == "TINTGATE_SCALES" && line.value == "device 100, XYZ 100, spectra 1")
         m_scaleHint = ScaleHint::Stated;
     else if (m_scaleHint == ScaleHint::None &&

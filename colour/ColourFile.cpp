@@ -173,21 +173,28 @@ Failure loadProfile(const std::string& path, Profile& profile) {
     }
 }
 
+Failure readColourFile(std::string_view bytes, const CgatsWants& wants, ColourFile& file) {
+    try {
+        ColourFile loaded;
+        const Failure failure = looksLikeProfile(bytes)
+                                    ? loaded.profile.emplace().open(bytes)
+                                    : readCgats(bytes, wants, loaded.set.emplace());
+        if (failure == Failure::None) {
+            file = std::move(loaded);
+        }
+        return failure;
+    } catch (const std::bad_alloc&) {
+        return Failure::OutOfMemory;
+    } catch (const std::length_error&) {
+        return Failure::OutOfMemory;
+    }
+}
+
 Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file) {
     try {
         std::string bytes;
-        if (const Failure failure = readBytes(path, maxCgatsBytes, textOrProfile, bytes);
-            failure != Failure::None)
-            return failure;
-        ColourFile loaded;
-        Failure failure = Failure::None;
-        if (looksLikeProfile(bytes))
-            failure = loaded.profile.emplace().open(bytes);
-        else
-            failure = readCgats(bytes, wants, loaded.set.emplace());
-        if (failure == Failure::None)
-            file = std::move(loaded);
-        return failure;
+        const Failure failure = readBytes(path, maxCgatsBytes, textOrProfile, bytes);
+        return failure == Failure::None ? readColourFile(bytes, wants, file) : failure;
     } catch (const std::bad_alloc&) {
         return Failure::OutOfMemory;
     } catch (const std::length_error&) {
