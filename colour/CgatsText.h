@@ -21,6 +21,8 @@ struct CgatsWants {
     bool spectra = true; ///< False: spectra are kept only if they are the sole colour values.
 };
 
+/// In all of this, text is UTF-8, Latin-1 or Windows-1252, or UTF-16 with a byte order mark.
+
 /// True if the bytes could be CGATS text: no NUL, and a known first line, a keyword, or a format.
 bool looksLikeCgats(std::string_view bytes);
 

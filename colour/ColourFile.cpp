@@ -11,6 +11,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "colour/TextEncoding.h"
+
 namespace colour {
 
 namespace {
@@ -80,7 +82,8 @@ bool anything(std::string_view) {
 
 /// Text without NULs or a profile: all else need not be read to its end.
 bool textOrProfile(std::string_view head) {
-    return looksLikeProfile(head) || std::memchr(head.data(), 0, head.size()) == nullptr;
+    return looksLikeProfile(head) || isUtf16(head) ||
+           std::memchr(head.data(), 0, head.size()) == nullptr;
 }
 
 /// NotRecognised where the first bytes are not worth the rest.
