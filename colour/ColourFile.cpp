@@ -11,6 +11,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "colour/Cxf.h"
 #include "colour/TextEncoding.h"
 
 namespace colour {
@@ -179,8 +180,9 @@ Failure loadProfile(const std::string& path, Profile& profile) {
 Failure readColourFile(std::string_view bytes, const CgatsWants& wants, ColourFile& file) {
     try {
         ColourFile loaded;
-        const Failure failure = looksLikeProfile(bytes)
-                                    ? loaded.profile.emplace().open(bytes)
+        const Failure failure = looksLikeProfile(bytes) ? loaded.profile.emplace().open(bytes)
+                                : looksLikeCxf(bytes)
+                                    ? readCxf(bytes, wants, loaded.set.emplace())
                                     : readCgats(bytes, wants, loaded.set.emplace());
         if (failure == Failure::None) {
             file = std::move(loaded);

@@ -1,4 +1,5 @@
-// A file that names colour: CGATS text or ICC profile, told apart by its bytes, never by its name.
+// A file that names colour: CGATS text, CxF3 or ICC profile, told apart by its bytes, never by its
+// name.
 #pragma once
 
 #include <optional>
