@@ -25,6 +25,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <cstdint>
 #include <new>
 #include <numbers>
 #include <set>
@@ -34,6 +35,7 @@
 #include <vector>
 
 #include "colour/CgatsLines.h"
+#include "colour/CgatsNumbers.h"
 #include "colour/CgatsTables.h"
 #include "colour/CxfObjects.h"
 #include "colour/Spectra.h"
@@ -62,55 +64,56 @@ struct Patch {
 
 // Measurement conditions ------------------------------------------------------------------------
 
-/// The condition whose values are read; empty if the file states none.
-std::string chosenCondition(const Content& content, const std::string& wanted,
-                            cgats::Notes& notes) {
-    std::set<std::string_view> stated;
-    for (const Value& value : content.values) {
-        stated.insert(value.condition);
-    }
-    stated.erase(std::string_view());
-    if (stated.empty()) {
-        return {};
-    }
-    std::string chosen(*stated.begin());
-    for (const std::string_view condition : {std::string_view(wanted), std::string_view("M1"),
-                                             std::string_view("M0"), std::string_view("M2")}) {
-        if (stated.count(condition) > 0) {
-            chosen = condition;
-            break;
-        }
-    }
-    if (stated.size() > 1) {
-        std::string list;
-        for (const std::string_view condition : stated) {
-            list.append(list.empty() ? "" : ", ").append(condition);
-        }
-        notes.add("There are measurements under " + list + ": those under " + chosen +
-                  " are used.");
-    }
-    return chosen;
+std::string conditionName(int condition) {
+    return condition == unstated ? "" : "M" + std::to_string(condition);
 }
 
-/// True if the light and observer are those of a data set, as far as they are stated.
-bool isUsual(const Conditions& conditions) {
-    return (conditions.illuminant.empty() || conditions.illuminant == "D50") &&
-           (conditions.observer.empty() || conditions.observer == "2");
+/// The condition whose values are read; `unstated` if the file states none.
+std::int8_t chosenCondition(const Content& content, const std::string& wanted,
+                            cgats::Notes& notes) {
+    bool stated[4] = {};
+    for (const Value& value : content.values) {
+        if (value.condition != unstated) {
+            stated[value.condition] = true;
+        }
+    }
+    constexpr std::int8_t order[] = {1, 0, 2, 3};
+    std::int8_t chosen = unstated;
+    std::string list;
+    int count = 0;
+    for (const std::int8_t condition : order) {
+        if (!stated[condition]) {
+            continue;
+        }
+        ++count;
+        if (chosen == unstated || conditionName(condition) == wanted) {
+            chosen = condition;
+        }
+    }
+    if (count > 1) {
+        for (std::int8_t condition = 0; condition < 4; ++condition) {
+            if (stated[condition]) {
+                list += (list.empty() ? "" : ", ") + conditionName(condition);
+            }
+        }
+        notes.add("There are measurements under " + list + ": those under " +
+                  conditionName(chosen) + " are used.");
+    }
+    return chosen;
 }
 
 /// The best of an object's values of one kind: under the condition, then under none that is stated;
 /// among these for D50 and 2 degrees first. Null if there is none.
 const Value* valueOf(const Content& content, const Object& object, Value::Kind kind,
-                     std::string_view condition) {
+                     std::int8_t condition) {
     const Value* best = nullptr;
     int bestRank = 0;
     for (std::size_t i = object.firstValue; i < object.firstValue + object.valueCount; ++i) {
         const Value& value = content.values[i];
-        if (value.kind != kind || (!value.condition.empty() && value.condition != condition)) {
+        if (value.kind != kind || (value.condition != unstated && value.condition != condition)) {
             continue;
         }
-        const bool usual =
-            value.specification == nullptr || isUsual(value.specification->conditions);
+        const bool usual = value.specification == nullptr || value.specification->usual;
         const int rank = 1 + (value.condition == condition ? 2 : 0) + (usual ? 1 : 0);
         if (rank > bestRank) {
             best = &value;
@@ -120,10 +123,10 @@ const Value* valueOf(const Content& content, const Object& object, Value::Kind k
     return best;
 }
 
-bool isUnder(const Content& content, const Object& object, std::string_view condition) {
+bool isUnder(const Content& content, const Object& object, std::int8_t condition) {
     for (std::size_t i = object.firstValue; i < object.firstValue + object.valueCount; ++i) {
-        const std::string_view stated = content.values[i].condition;
-        if (stated.empty() || stated == condition) {
+        const std::int8_t stated = content.values[i].condition;
+        if (stated == unstated || stated == condition) {
             return true;
         }
     }
@@ -133,31 +136,47 @@ bool isUnder(const Content& content, const Object& object, std::string_view cond
 // Targets and measurements ----------------------------------------------------------------------
 
 using Objects = std::vector<const Object*>;
-using Key = std::string_view (*)(const Object&);
+using Labels = std::vector<std::string>;
 
-constexpr Key keys[] = {
-    [](const Object& object) -> std::string_view { return object.location; },
-    [](const Object& object) { return object.sampleId; },
-    [](const Object& object) { return object.name; },
-    [](const Object& object) { return object.id; },
-};
+/// What may tell which measurement belongs to which target, the surest first.
+Labels labelsOf(const Document& document, const Objects& objects, int kind) {
+    Labels labels;
+    labels.reserve(objects.size());
+    for (const Object* object : objects) {
+        switch (kind) {
+        case 0:
+            labels.push_back(placeOf(document, *object).position);
+            break;
+        case 1:
+            labels.emplace_back(placeOf(document, *object).sampleId);
+            break;
+        case 2:
+            labels.emplace_back(object->name);
+            break;
+        default:
+            labels.emplace_back(object->id);
+            break;
+        }
+    }
+    return labels;
+}
+constexpr int labelKinds = 4;
 
-/// For each measurement the index of the target of the same key, or -1. Nothing if two targets
-/// share a key.
-std::vector<std::ptrdiff_t> joined(const Objects& targets, const Objects& measurements, Key key) {
-    std::unordered_map<std::string_view, std::ptrdiff_t> byKey;
-    for (const Object* target : targets) {
-        const std::string_view name = key(*target);
-        if (name.empty() ||
-            !byKey.try_emplace(name, static_cast<std::ptrdiff_t>(byKey.size())).second) {
+/// For each measurement the index of the target of the same label, or -1. Nothing if a target has
+/// none, or two share one.
+std::vector<std::ptrdiff_t> joined(const Labels& targets, const Labels& measurements) {
+    std::unordered_map<std::string_view, std::ptrdiff_t> byLabel;
+    for (std::size_t i = 0; i < targets.size(); ++i) {
+        if (targets[i].empty() ||
+            !byLabel.try_emplace(targets[i], static_cast<std::ptrdiff_t>(i)).second) {
             return {};
         }
     }
     std::vector<std::ptrdiff_t> partners;
     partners.reserve(measurements.size());
-    for (const Object* measurement : measurements) {
-        const auto found = byKey.find(key(*measurement));
-        partners.push_back(found != byKey.end() ? found->second : -1);
+    for (const std::string& label : measurements) {
+        const auto found = byLabel.find(label);
+        partners.push_back(found != byLabel.end() ? found->second : -1);
     }
     return partners;
 }
@@ -167,16 +186,19 @@ std::size_t partnerCount(const std::vector<std::ptrdiff_t>& partners) {
         partners.begin(), partners.end(), [](std::ptrdiff_t partner) { return partner >= 0; }));
 }
 
-std::vector<std::ptrdiff_t> bestJoin(const Objects& targets, const Objects& measurements,
+/// Order counts only for targets without colours: beside others, a measurement may be of anything.
+std::vector<std::ptrdiff_t> bestJoin(const Document& document, const Objects& targets,
+                                     const Objects& measurements, bool orderCounts,
                                      cgats::Notes& notes) {
     std::vector<std::ptrdiff_t> best;
-    for (const Key key : keys) {
-        std::vector<std::ptrdiff_t> partners = joined(targets, measurements, key);
+    for (int kind = 0; kind < labelKinds && partnerCount(best) < measurements.size(); ++kind) {
+        std::vector<std::ptrdiff_t> partners =
+            joined(labelsOf(document, targets, kind), labelsOf(document, measurements, kind));
         if (partnerCount(partners) > partnerCount(best)) {
             best = std::move(partners);
         }
     }
-    if (best.empty() && targets.size() == measurements.size()) {
+    if (best.empty() && orderCounts && targets.size() == measurements.size()) {
         for (std::size_t i = 0; i < targets.size(); ++i) {
             best.push_back(static_cast<std::ptrdiff_t>(i));
         }
@@ -187,8 +209,8 @@ std::vector<std::ptrdiff_t> bestJoin(const Objects& targets, const Objects& meas
 }
 
 /// Joins device values and colours to patches.
-std::vector<Patch> patchesOf(const Content& content, const std::string& condition,
-                             cgats::Notes& notes) {
+std::vector<Patch> patchesOf(const Document& document, const Content& content,
+                             std::int8_t condition, cgats::Notes& notes) {
     Objects targets;      // Device values, perhaps with colours.
     Objects measurements; // Colours alone.
     std::size_t complete = 0;
@@ -207,9 +229,9 @@ std::vector<Patch> patchesOf(const Content& content, const std::string& conditio
         }
         return patches;
     }
-    const std::vector<std::ptrdiff_t> partners = measurements.empty()
-                                                     ? std::vector<std::ptrdiff_t>()
-                                                     : bestJoin(targets, measurements, notes);
+    const std::vector<std::ptrdiff_t> partners =
+        measurements.empty() ? std::vector<std::ptrdiff_t>()
+                             : bestJoin(document, targets, measurements, complete == 0, notes);
     const std::size_t joinedCount = partnerCount(partners);
 
     // The measurements of each target, in the file's order.
@@ -225,6 +247,10 @@ std::vector<Patch> patchesOf(const Content& content, const std::string& conditio
             patches.push_back({targets[i], measurement});
         }
         if (!ofTarget[i].empty()) {
+            if (targets[i]->hasColour()) {
+                notes.add("Objects with device values and colours have measurements of their own, "
+                          "which count.");
+            }
             continue;
         }
         if (targets[i]->hasColour() && isUnder(content, *targets[i], condition)) {
@@ -250,9 +276,10 @@ std::vector<Patch> patchesOf(const Content& content, const std::string& conditio
 
 class SetReader {
   public:
-    SetReader(const Document& document, const Content& content, const std::string& condition,
+    SetReader(const Document& document, const Content& content, std::int8_t condition, bool ascii,
               cgats::Notes& notes)
-        : m_document(document), m_content(content), m_condition(condition), m_notes(notes) {}
+        : m_document(document), m_content(content), m_condition(condition), m_notes(notes),
+          m_ascii(ascii) {}
 
     /// On success the table is as a reader of CGATS text makes one: scales are not decided yet.
     Failure read(const std::vector<Patch>& patches, cgats::Table& table) {
@@ -308,19 +335,18 @@ class SetReader {
         DataSet& set = m_table->set;
         set.deviceSpace = DeviceSpace::Rgb;
         set.channels.assign(std::begin(rgbNames), std::end(rgbNames));
-        constexpr double usualRange = 255;
+        return takeDevice(patches, set.channels.size());
+    }
+
+    Failure takeDevice(const std::vector<Patch>& patches, std::size_t channels) {
+        DataSet& set = m_table->set;
+        set.device.reserve(patches.size() * channels);
         for (const Patch& patch : patches) {
-            const pugi::xml_node node = patch.device->device;
-            const bool states = static_cast<bool>(m_document.child(node, "MaxRange"));
-            const std::optional<double> range =
-                states ? number(node, "MaxRange") : std::optional(usualRange);
-            for (const std::string_view part : rgbParts) {
-                const std::optional<double> value = number(node, part);
-                if (!value || !range || *range <= 0) {
-                    return Failure::NotNumeric;
-                }
-                set.device.push_back(*value * 100 / *range);
+            if (!patch.device->deviceSound) {
+                return Failure::NotNumeric;
             }
+            const double* const device = patch.device->device;
+            set.device.insert(set.device.end(), device, device + channels);
         }
         return Failure::None;
     }
@@ -332,43 +358,52 @@ class SetReader {
             m_inks.assign(std::begin(processInks), std::end(processInks));
         }
         const std::size_t fixed = m_inks.size();
+        if (const Failure failure = takeDevice(patches, fixed); failure != Failure::None) {
+            return failure;
+        }
         struct Amount {
             std::size_t patch;
             std::size_t ink;
             double percent;
         };
         std::vector<Amount> amounts;
-        for (std::size_t i = 0; i < patches.size(); ++i) {
-            const pugi::xml_node node = patches[i].device->device;
-            for (std::size_t ink = 0; ink < fixed; ++ink) {
-                const std::optional<double> percent = number(node, m_inks[ink]);
-                if (!percent) {
-                    return Failure::NotNumeric;
-                }
-                amounts.push_back({i, ink, *percent});
-            }
-            for (pugi::xml_node spot = node.first_child(); spot; spot = spot.next_sibling()) {
-                if (!m_document.is(spot, "SpotColor")) {
-                    continue;
-                }
+        bool sound = true;
+        for (std::size_t i = 0; i < patches.size() && m_inks.size() <= mostInks; ++i) {
+            m_document.forEach(patches[i].device->inks, m_spotColor, [&](pugi::xml_node spot) {
                 const std::optional<double> percent = number(spot, "Percentage");
                 const std::string name = text(spot, "Name");
-                if (!percent || name.empty()) {
-                    return Failure::NotNumeric;
-                }
-                amounts.push_back({i, inkNamed(name, fixed), *percent});
-                if (m_inks.size() > mostInks) {
-                    return Failure::TooLarge;
-                }
-            }
+                sound = sound && percent && !name.empty();
+                amounts.push_back({i, inkNamed(name, fixed), percent.value_or(0)});
+            });
         }
-        DataSet& set = m_table->set;
-        set.device.assign(patches.size() * m_inks.size(), 0);
+        if (!sound) {
+            return Failure::NotNumeric;
+        }
+        if (m_inks.size() > mostInks) {
+            return Failure::TooLarge;
+        }
+        if (!amounts.empty()) {
+            widenDevice(fixed);
+        }
         for (const Amount& amount : amounts) {
-            set.device[amount.patch * m_inks.size() + amount.ink] = amount.percent;
+            m_table->set.device[amount.patch * m_inks.size() + amount.ink] = amount.percent;
+        }
+        if (m_inks.empty()) {
+            return Failure::NoDeviceValues;
         }
         nameChannels(kind);
-        return m_inks.empty() ? Failure::NoDeviceValues : Failure::None;
+        return Failure::None;
+    }
+
+    /// Makes room for all inks behind the first `fixed` ones of each patch.
+    void widenDevice(std::size_t fixed) {
+        DataSet& set = m_table->set;
+        std::vector<double> wide(set.patchCount * m_inks.size(), 0);
+        for (std::size_t patch = 0; patch < set.patchCount; ++patch) {
+            std::copy_n(set.device.begin() + static_cast<std::ptrdiff_t>(patch * fixed), fixed,
+                        wide.begin() + static_cast<std::ptrdiff_t>(patch * m_inks.size()));
+        }
+        set.device = std::move(wide);
     }
 
     /// Place of a named ink, which may be new. C, M, Y and K of the first `fixed` places are no
@@ -459,59 +494,55 @@ class SetReader {
     }
 
     bool addLab(const Value& value) {
-        const auto L = number(value.node, "L");
-        const auto a = number(value.node, "A");
-        const auto b = number(value.node, "B");
-        if (!L || !a || !b) {
-            return false;
-        }
-        m_table->set.lab.push_back({*L, *a, *b});
+        const auto& [L, a, b] = value.numbers;
+        m_table->set.lab.push_back({L, a, b});
         see(value);
-        return true;
+        return value.sound;
     }
 
     bool addLch(const Value& value) {
-        const auto L = number(value.node, "L");
-        const auto chroma = number(value.node, "C");
-        const auto hue = number(value.node, "H");
-        if (!L || !chroma || !hue) {
-            return false;
-        }
-        const double angle = *hue * std::numbers::pi / 180;
-        m_table->set.lab.push_back({*L, *chroma * std::cos(angle), *chroma * std::sin(angle)});
+        const auto& [L, chroma, hue] = value.numbers;
+        const double angle = hue * std::numbers::pi / 180;
+        m_table->set.lab.push_back({L, chroma * std::cos(angle), chroma * std::sin(angle)});
         see(value);
-        return true;
+        return value.sound;
     }
 
     bool addXyz(const Value& value) {
-        const auto X = number(value.node, "X");
-        const auto Y = number(value.node, "Y");
-        const auto Z = number(value.node, "Z");
-        if (!X || !Y || !Z) {
-            return false;
-        }
-        m_table->set.xyz.push_back({*X, *Y, *Z});
+        const auto& [X, Y, Z] = value.numbers;
+        m_table->set.xyz.push_back({X, Y, Z});
         see(value);
-        return true;
+        return value.sound;
     }
 
     bool addSpectrum(const Value& value) {
         std::vector<double>& spectra = m_table->set.spectra;
         const std::size_t before = spectra.size();
-        std::string_view rest = textOf(value.node, m_storage);
-        constexpr std::string_view blanks = " \t\r\n";
-        while (true) {
-            rest.remove_prefix(std::min(rest.find_first_not_of(blanks), rest.size()));
-            if (rest.empty()) {
-                break;
+        const std::string_view text = textOf(value.spectrum, m_storage);
+        const char* const end = text.data() + text.size();
+        const cgats::CharTable& chars = cgats::blanksSeparate;
+        const auto skip = [&](const char* at) {
+            while (at != end && !chars.isPlain(*at)) {
+                ++at;
             }
-            const std::string_view word = rest.substr(0, rest.find_first_of(blanks));
-            const std::optional<double> reflectance = numberOf(word);
-            if (!reflectance) {
-                return false;
+            return at;
+        };
+        for (const char* at = skip(text.data()); at != end; at = skip(at)) {
+            double reflectance = 0;
+            if (!m_numbers.readPlain(at, end, reflectance)) {
+                const char* const start = at;
+                at = std::find_if_not(at, end, [&](char c) { return chars.isPlain(c); });
+                const std::optional<double> number =
+                    numberOf({start, static_cast<std::size_t>(at - start)});
+                if (!number) {
+                    return false;
+                }
+                reflectance = *number;
             }
-            spectra.push_back(*reflectance);
-            rest.remove_prefix(word.size());
+            spectra.push_back(reflectance);
+        }
+        if (m_numbers.sawCommas()) {
+            return false;
         }
         const SpectralAxis axis = axisOf(value, spectra.size() - before);
         if (m_spectrumCount++ == 0) {
@@ -529,7 +560,7 @@ class SetReader {
     SpectralAxis axisOf(const Value& value, std::size_t count) const {
         const auto length = static_cast<int>(std::min<std::size_t>(count, 100'000));
         const Specification* const specification = value.specification;
-        const auto own = value.node.attribute("StartWL").as_int(0);
+        const auto own = value.spectrum.attribute("StartWL").as_int(0);
         int base = own > 0                    ? own
                    : specification != nullptr ? specification->firstWavelength.value_or(0)
                                               : 0;
@@ -552,13 +583,17 @@ class SetReader {
 
     /// Keeps what the colorimetric values are stated for. Statements that differ cancel out.
     void see(const Value& value) {
+        if (m_seen && value.specification == m_lastSpecification) {
+            return;
+        }
+        m_lastSpecification = value.specification;
         const Conditions stated =
             value.specification != nullptr ? value.specification->conditions : Conditions{};
         if (!m_seen) {
             m_stated = stated;
             m_seen = true;
         }
-        m_lastSpecification = value.specification;
+        m_usual = m_usual && (value.specification == nullptr || value.specification->usual);
         if (m_stated.illuminant != stated.illuminant) {
             m_stated.illuminant.clear();
         }
@@ -591,8 +626,8 @@ class SetReader {
             m_table->unevenSpectra = true;
         }
         set.conditions = m_stated;
-        set.conditions.measurement = m_condition;
-        if (!isUsual(m_stated) && !set.spectra.empty() && spectraUsable(set.axis)) {
+        set.conditions.measurement = conditionName(m_condition);
+        if (!m_usual && !set.spectra.empty() && spectraUsable(set.axis)) {
             set.lab.clear();
             set.xyz.clear();
             m_notes.add("The colour values are stated for " + describe(m_stated) +
@@ -617,14 +652,19 @@ class SetReader {
 
     // Texts
 
+    /// Character references apart, text of an ASCII file is UTF-8 as it stands.
+    std::string labelOf(std::string_view text) const {
+        return m_ascii ? std::string(text) : cgats::toUtf8(text);
+    }
+
     void readLabels(const std::vector<Patch>& patches) {
         DataSet& set = m_table->set;
-        std::set<std::string_view> sampleIds;
         const auto labels = [](const Patch& patch) -> const Object& {
             return patch.device != nullptr ? *patch.device : *patch.colour;
         };
+        std::set<std::string_view> sampleIds;
         for (const Patch& patch : patches) {
-            const std::string_view id = labels(patch).sampleId;
+            const std::string_view id = placeOf(m_document, labels(patch)).sampleId;
             if (id.empty() || !sampleIds.insert(id).second) {
                 sampleIds.clear();
                 break;
@@ -634,9 +674,9 @@ class SetReader {
         set.names.reserve(patches.size());
         for (const Patch& patch : patches) {
             const Object& object = labels(patch);
-            set.ids.push_back(cgats::toUtf8(sampleIds.empty() ? object.id : object.sampleId));
-            set.names.push_back(
-                cgats::toUtf8(object.sampleName.empty() ? object.name : object.sampleName));
+            const Place place = object.location ? placeOf(m_document, object) : Place{};
+            set.ids.push_back(labelOf(sampleIds.empty() ? object.id : place.sampleId));
+            set.names.push_back(labelOf(place.sampleName.empty() ? object.name : place.sampleName));
         }
         const auto allEmpty = [](const std::vector<std::string>& texts) {
             return std::all_of(texts.begin(), texts.end(),
@@ -672,14 +712,18 @@ class SetReader {
 
     const Document& m_document;
     const Content& m_content;
-    const std::string& m_condition;
+    const std::int8_t m_condition;
     cgats::Notes& m_notes;
+    const bool m_ascii;
     cgats::Table* m_table = nullptr;
+    const Name m_spotColor = m_document.name("SpotColor");
     std::vector<std::string> m_inks;
     std::string m_storage;
+    cgats::NumberReader m_numbers{cgats::blanksSeparate};
     std::size_t m_spectrumCount = 0;
     bool m_axesDiffer = false;
     bool m_seen = false;
+    bool m_usual = true; ///< All colour values are for D50 and 2 degrees.
     Conditions m_stated;
     const Specification* m_lastSpecification = nullptr;
     const Specification* m_spectralSpecification = nullptr;
@@ -695,10 +739,10 @@ Failure readFile(std::string_view utf8, const CgatsWants& wants, DataSet& set) {
         return Failure::TooLarge;
     }
     cgats::Notes notes;
-    const std::string condition = chosenCondition(content, wants.condition, notes);
+    const std::int8_t condition = chosenCondition(content, wants.condition, notes);
     cgats::Table table;
-    SetReader reader(document, content, condition, notes);
-    if (const Failure failure = reader.read(patchesOf(content, condition, notes), table);
+    SetReader reader(document, content, condition, cgats::isAscii(utf8), notes);
+    if (const Failure failure = reader.read(patchesOf(document, content, condition, notes), table);
         failure != Failure::None) {
         return failure;
     }

@@ -1,8 +1,10 @@
 #include "colour/CxfXml.h"
 
 #include <algorithm>
+#include <bit>
 #include <charconv>
 #include <cmath>
+#include <cstdint>
 
 namespace colour::cxf {
 namespace {
@@ -18,77 +20,114 @@ std::string_view localName(std::string_view name) {
     return name.substr(name.find(':') + 1);
 }
 
-/// Goes from tag to tag, past comments, CDATA sections and processing instructions.
+/// The first quote or ">" of a tag, eight bytes at a time.
+const char* nextSign(const char* at, const char* end) {
+    constexpr std::uint64_t ones = 0x0101010101010101;
+    constexpr std::uint64_t tops = 0x8080808080808080;
+    // The top bit of every byte that is zero, exact up to the first of them.
+    const auto zeros = [](std::uint64_t word) { return (word - ones) & ~word & tops; };
+    while (std::endian::native == std::endian::little && end - at >= 8) {
+        std::uint64_t word = 0;
+        std::memcpy(&word, at, sizeof word);
+        const std::uint64_t found =
+            zeros(word ^ ones * '>') | zeros(word ^ ones * '"') | zeros(word ^ ones * '\'');
+        if (found != 0) {
+            return at + std::countr_zero(found) / 8;
+        }
+        at += sizeof word;
+    }
+    return std::find_if(at, end, [](char c) { return c == '>' || c == '"' || c == '\''; });
+}
+
+/// Goes from tag to tag, past comments, CDATA sections and processing instructions. Whether the
+/// text is well-formed is for the parser to say.
 class Tags {
   public:
     enum Kind { Start, End, Empty, Declaration, Broken, Nothing };
 
-    explicit Tags(std::string_view text) : m_text(text) {}
+    explicit Tags(std::string_view text)
+        : m_start(text.data()), m_at(m_start), m_end(m_start + text.size()) {}
 
-    /// The next tag; `name` is that of a start. Declaration is a document type and its like.
+    /// The next tag; `name` is what follows the "<" of a start. Declaration is a document type and
+    /// its like.
     Kind next(std::string_view& name) {
         while (true) {
-            const std::size_t at = m_text.find('<', m_at);
-            if (at == m_text.npos) {
+            const void* const found =
+                m_at == m_end ? nullptr
+                              : std::memchr(m_at, '<', static_cast<std::size_t>(m_end - m_at));
+            if (found == nullptr) {
                 return Nothing;
             }
-            const std::string_view rest = m_text.substr(at);
-            if (rest.starts_with("<!--")) {
-                skipTo("-->", at + 4);
-            } else if (rest.starts_with("<![CDATA[")) {
-                skipTo("]]>", at + 9);
-            } else if (rest.starts_with("<?")) {
-                skipTo("?>", at + 2);
-            } else if (rest.starts_with("<!")) {
-                return Declaration;
-            } else {
-                return tagAt(at, name);
+            m_at = static_cast<const char*>(found) + 1;
+            switch (m_at == m_end ? '\0' : *m_at) {
+            case '\0':
+                return Broken;
+            case '/':
+                return End;
+            case '?':
+                skipBehind("?>");
+                break;
+            case '!':
+                if (!skipSection()) {
+                    return Declaration;
+                }
+                break;
+            default:
+                return startTag(name);
             }
         }
     }
 
     /// Where the last tag ended.
-    std::size_t at() const { return m_at; }
+    std::size_t at() const { return static_cast<std::size_t>(m_at - m_start); }
 
   private:
-    void skipTo(std::string_view end, std::size_t from) {
-        const std::size_t at = m_text.find(end, from);
-        m_at = at == m_text.npos ? m_text.size() : at + end.size();
+    void skipBehind(std::string_view end) {
+        const std::string_view rest(m_at, static_cast<std::size_t>(m_end - m_at));
+        const std::size_t at = rest.find(end);
+        m_at = at == rest.npos ? m_end : m_at + at + end.size();
     }
 
-    Kind tagAt(std::size_t start, std::string_view& name) {
-        std::size_t at = start + 1;
-        const bool isEnd = at < m_text.size() && m_text[at] == '/';
-        char quote = 0;
-        for (; at < m_text.size() && (quote != 0 || m_text[at] != '>'); ++at) {
-            const char c = m_text[at];
-            if (c == quote) {
-                quote = 0;
-            } else if (quote == 0 && (c == '"' || c == '\'')) {
-                quote = c;
+    /// Skips a comment or CDATA section; false if it is neither.
+    bool skipSection() {
+        const std::string_view rest(m_at, static_cast<std::size_t>(m_end - m_at));
+        for (const auto& [begin, end] : {std::pair{"!--", "-->"}, std::pair{"![CDATA[", "]]>"}}) {
+            if (rest.starts_with(begin)) {
+                m_at += std::strlen(begin);
+                skipBehind(end);
+                return true;
             }
         }
-        m_at = std::min(at + 1, m_text.size());
-        if (at == m_text.size()) {
-            return Broken;
-        }
-        if (isEnd) {
-            return End;
-        }
-        const std::size_t end = m_text.find_first_of(" \t\r\n/>", start + 1);
-        name = m_text.substr(start + 1, end - start - 1);
-        return m_text[at - 1] == '/' ? Empty : Start;
+        return false;
     }
 
-    std::string_view m_text;
-    std::size_t m_at = 0;
+    /// To the tag's '>': one in a quoted value is none.
+    Kind startTag(std::string_view& name) {
+        const char* const start = m_at;
+        while ((m_at = nextSign(m_at, m_end)) != m_end && *m_at != '>') {
+            m_at = std::find(m_at + 1, m_end, *m_at);
+            if (m_at == m_end) {
+                return Broken;
+            }
+            ++m_at;
+        }
+        if (m_at == m_end) {
+            return Broken;
+        }
+        name = {start, static_cast<std::size_t>(m_at - start)};
+        return *m_at++ == '>' && m_at[-2] == '/' ? Empty : Start;
+    }
+
+    const char* m_start;
+    const char* m_at;
+    const char* m_end;
 };
 
 /// What must be known before a parser makes a tree of it. `endOfRootTag` is where the start tag of
-/// the root ends.
-Failure checkStructure(std::string_view utf8, std::size_t& endOfRootTag) {
+/// the root ends, `elements` their number.
+Failure checkStructure(std::string_view utf8, std::size_t& endOfRootTag, std::size_t& elements) {
     Tags tags(utf8);
-    std::size_t elements = 0;
+    elements = 0;
     int depth = 0;
     std::string_view name;
     endOfRootTag = 0;
@@ -136,6 +175,15 @@ std::string_view namespaceOf(pugi::xml_node node, std::string_view prefix) {
     return {};
 }
 
+std::size_t declarationsIn(std::string_view tag) {
+    std::size_t count = 0;
+    for (std::size_t at = tag.find("xmlns"); at != tag.npos; at = tag.find("xmlns", at + 5)) {
+        const bool ofSchemas = tag.substr(at).starts_with("xmlns:xsi=");
+        count += ofSchemas ? 0 : 1;
+    }
+    return count;
+}
+
 std::string_view prefixOf(std::string_view name) {
     return name.substr(0, name.size() - localName(name).size());
 }
@@ -153,6 +201,7 @@ bool hasRoot(std::string_view utf8) {
     if (kind == Tags::Declaration) { // Refused later, with a code of its own.
         return utf8.find("<CxF") != utf8.npos || utf8.find(":CxF") != utf8.npos;
     }
+    name = name.substr(0, name.find_first_of(" \t\r\n/"));
     return (kind == Tags::Start || kind == Tags::Empty) && localName(name) == rootName;
 }
 
@@ -164,10 +213,13 @@ Failure Document::load(std::string_view utf8) {
         return Failure::TooLarge;
     }
     std::size_t endOfRootTag = 0;
-    if (const Failure failure = checkStructure(utf8, endOfRootTag); failure != Failure::None) {
+    if (const Failure failure = checkStructure(utf8, endOfRootTag, m_elementCount);
+        failure != Failure::None) {
         return failure;
     }
-    m_redeclares = utf8.find("xmlns", endOfRootTag) != utf8.npos;
+    // The instance namespace of XML Schema, which roots declare as well, is no element's.
+    m_manyNamespaces = utf8.find("xmlns", endOfRootTag) != utf8.npos ||
+                       declarationsIn(utf8.substr(0, endOfRootTag)) > 1;
     constexpr unsigned flags = pugi::parse_cdata | pugi::parse_escapes |
                                pugi::parse_wconv_attribute | pugi::parse_embed_pcdata;
     const pugi::xml_parse_result result =
@@ -186,25 +238,28 @@ Failure Document::load(std::string_view utf8) {
     return localName(name) == rootName && known ? Failure::None : Failure::NotRecognised;
 }
 
-bool Document::is(pugi::xml_node node, std::string_view name) const {
+Name Document::name(std::string_view local) const {
+    Name name;
+    name.m_whole = m_prefix + std::string(local);
+    name.m_local = local;
+    return name;
+}
+
+bool Document::resolvesTo(pugi::xml_node node, const Name& name) const {
     const std::string_view whole = node.name();
-    if (!whole.ends_with(name)) {
+    if (!whole.ends_with(name.m_local)) {
         return false;
     }
-    const std::string_view prefix = whole.substr(0, whole.size() - name.size());
-    if (prefix == m_prefix && !m_redeclares) {
-        return true;
-    }
+    const std::string_view prefix = whole.substr(0, whole.size() - name.m_local.size());
     return (prefix.empty() || prefix.back() == ':') && namespaceOf(node, prefix) == m_namespace;
 }
 
-pugi::xml_node Document::child(pugi::xml_node parent, std::string_view name) const {
-    for (pugi::xml_node node = parent.first_child(); node; node = node.next_sibling()) {
-        if (is(node, name)) {
-            return node;
-        }
+pugi::xml_node Document::child(pugi::xml_node parent, const Name& name) const {
+    pugi::xml_node node = parent.first_child();
+    while (node && !is(node, name)) {
+        node = node.next_sibling();
     }
-    return {};
+    return node;
 }
 
 std::string_view textOf(pugi::xml_node element, std::string& storage) {

@@ -1,6 +1,7 @@
 // XML of colour exchange files: checked before it is parsed, and its elements known by namespace.
 #pragma once
 
+#include <cstring>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -19,6 +20,14 @@ inline constexpr int maxDepth = 64; ///< The format needs about ten.
 /// True if the root element is named CxF, in whatever namespace.
 bool hasRoot(std::string_view utf8);
 
+/// The name of an element as one document spells it. Made once and compared often.
+class Name {
+  private:
+    friend class Document;
+    std::string m_whole; ///< With the root's prefix.
+    std::string_view m_local;
+};
+
 /// A parsed file. Nodes live as long as the document.
 class Document {
   public:
@@ -27,16 +36,30 @@ class Document {
     Failure load(std::string_view utf8);
 
     pugi::xml_node root() const { return m_root; }
+    std::size_t elementCount() const { return m_elementCount; }
     bool hasNamespace() const { return !m_namespace.empty(); }
 
+    /// `local` must outlive the name.
+    Name name(std::string_view local) const;
+
     /// True for an element of this local name in the root's namespace.
-    bool is(pugi::xml_node node, std::string_view name) const;
+    bool is(pugi::xml_node node, const Name& name) const {
+        const bool same = std::strcmp(node.name(), name.m_whole.c_str()) == 0;
+        return m_manyNamespaces ? resolvesTo(node, name) : same;
+    }
     /// The first such child; null if there is none.
-    pugi::xml_node child(pugi::xml_node parent, std::string_view name) const;
+    pugi::xml_node child(pugi::xml_node parent, const Name& name) const;
+    pugi::xml_node child(pugi::xml_node parent, std::string_view local) const {
+        return child(parent, name(local));
+    }
 
     /// Calls `take(child)` for each child element in the root's namespace that has the local name.
     template<class Take>
-    void forEach(pugi::xml_node parent, std::string_view name, const Take& take) const {
+    void forEach(pugi::xml_node parent, std::string_view local, const Take& take) const {
+        forEach(parent, name(local), take);
+    }
+    template<class Take>
+    void forEach(pugi::xml_node parent, const Name& name, const Take& take) const {
         for (pugi::xml_node node = parent.first_child(); node; node = node.next_sibling()) {
             if (is(node, name)) {
                 take(node);
@@ -45,11 +68,14 @@ class Document {
     }
 
   private:
+    bool resolvesTo(pugi::xml_node node, const Name& name) const;
+
     pugi::xml_document m_document;
     pugi::xml_node m_root;
+    std::size_t m_elementCount = 0;
     std::string m_prefix; ///< Of the root, with its colon.
     std::string m_namespace;
-    bool m_redeclares = false; ///< An element below the root declares a namespace, too.
+    bool m_manyNamespaces = false; ///< There is a second declaration of a namespace.
 };
 
 /// The whole text of an element: comments and CDATA sections split it into several nodes. The view
