@@ -225,6 +225,16 @@ std::optional<unsigned long long> countIn(const std::string& value) {
     return count;
 }
 
+/// Some exporters write the time of a date as a comment: CREATED "11/21/2026"  # Time: 09:15
+std::string timeBehind(std::string_view line) {
+    constexpr std::string_view mark = "# Time:";
+    constexpr std::size_t longest = 40;
+    const std::size_t at = line.rfind(mark);
+    const std::size_t quote = line.rfind('"');
+    const bool inQuotes = quote != line.npos && quote > at;
+    return at == line.npos || inQuotes ? "" : " " + toUtf8(line.substr(at, longest));
+}
+
 /// Reads one text from its first line to its last.
 class TextReader {
   public:
@@ -304,12 +314,15 @@ Failure TextReader::readLine(std::string_view line) {
     if (isStructure(word))
         return Failure::None;
 
-    const KeywordLine keyword = keywordLine(line);
+    KeywordLine keyword = keywordLine(line);
     if (keyword.keyword == "NUMBER_OF_FIELDS") {
         m_fieldCount = countIn(keyword.value);
     } else if (keyword.keyword == "NUMBER_OF_SETS") {
         m_setCount = countIn(keyword.value);
     } else if (keyword.keyword != "KEYWORD") {
+        if (keyword.keyword == "CREATED") {
+            keyword.value += timeBehind(line);
+        }
         seeHeader(keyword);
         return seeUnannounced(line);
     }

@@ -48,7 +48,6 @@ using namespace cxf;
 
 constexpr std::string_view processInks[] = {"Cyan", "Magenta", "Yellow", "Black"};
 constexpr const char* processNames[] = {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
-constexpr std::string_view rgbParts[] = {"R", "G", "B"};
 constexpr const char* rgbNames[] = {"RGB_R", "RGB_G", "RGB_B"};
 constexpr std::size_t mostInks = 64;
 

@@ -105,11 +105,13 @@ class Tags {
     Kind startTag(std::string_view& name) {
         const char* const start = m_at;
         while ((m_at = nextSign(m_at, m_end)) != m_end && *m_at != '>') {
-            m_at = std::find(m_at + 1, m_end, *m_at);
-            if (m_at == m_end) {
+            const void* const closing =
+                std::memchr(m_at + 1, *m_at, static_cast<std::size_t>(m_end - m_at - 1));
+            if (closing == nullptr) {
+                m_at = m_end;
                 return Broken;
             }
-            ++m_at;
+            m_at = static_cast<const char*>(closing) + 1;
         }
         if (m_at == m_end) {
             return Broken;

@@ -221,6 +221,12 @@ TEST(CgatsText, KeepsHeaderTextsAsUtf8) {
     EXPECT_EQ(set.descriptor, "ß 5” \"x\""); // 94 is a quote in Windows-1252
     EXPECT_EQ(set.created, "3 May 2024");
     EXPECT_EQ(set.instrumentation, "a\tb, € 5");
+    // The time of day follows as a comment of a form of its own.
+    const auto createdOf = [](const std::string& line) {
+        return readWell(table(labNames, "1 50 0 0\n", "CGATS.17\n" + line + "\n")).created;
+    };
+    EXPECT_EQ(createdOf("CREATED \"11/21/2026\"  # Time: 09:15"), "11/21/2026 # Time: 09:15");
+    EXPECT_EQ(createdOf("CREATED \"11/21/2026  # Time: 09:15\""), "11/21/2026  # Time: 09:15");
 }
 
 // The columns stand before those of Lab; a row with tabs has its cells by them alone.

@@ -130,6 +130,40 @@ TEST_F(Trend, TakesWhatTheFiltersLetThrough) {
     }
 }
 
+// The forms in which measuring programs state a date. What may mean two days counts as unstated.
+TEST(TrendTimes, AreThoseOfTheMeasurementsIfTheyCannotBeMistaken) {
+    const support::ScratchFolder scratch;
+    const std::string result = support::contentsOf(data + "output.json");
+    const std::string undated = "\"path\":\"/m/measured.txt\",\"kind\":\"text\",\"patches\":4,"
+                                "\"description\":null,\"originator\":null,\"created\":";
+    const struct {
+        const char* created;
+        const char* shown; ///< Empty if the file's own time is to stand in.
+    } cases[] = {{"2026-11-25T09:15:00+01:00", "25 November 2026, 09:15"},
+                 {"Wed Nov 25 09:15:07 2026", "25 November 2026, 09:15"},
+                 {"11/21/2026  # Time: 09:15", "21 November 2026, 09:15"},
+                 {"11/05/2026 # Time: 9:15", "5 November 2026, 09:15"},
+                 {"11/21/2026", "21 November 2026, 00:00"},
+                 {"21/11/2026 09:15", "21 November 2026, 09:15"},
+                 {"11/11/2026", "11 November 2026, 00:00"},
+                 {"11/05/2026", ""},
+                 {"2013/10/29", "29 October 2013, 00:00"},
+                 {"August 21, 2018  15:47", "21 August 2018, 15:47"},
+                 {"20.11.2026", "20 November 2026, 00:00"},
+                 {"05.11.2026", ""},
+                 {"31/31/2026", ""},
+                 {"December 2006", ""},
+                 {"11/21/26", ""}};
+    for (const auto& [created, shown] : cases) {
+        const std::string file =
+            scratch.write("dated.json", replaced(result, undated + "null",
+                                                 undated + "\"" + std::string(created) + "\""));
+        const std::string text = report({"--trend", "--text", file}).output;
+        EXPECT_THAT(text, HasSubstr(shown)) << created;
+        EXPECT_EQ(text.find("does not tell its time") != text.npos, *shown == '\0') << created;
+    }
+}
+
 // Results of two versions of a target, two printers and three folders: whatever differs parts them.
 TEST(TrendSeries, JoinNothingThatWasAimedAtOtherColours) {
     const support::ScratchFolder scratch;
