@@ -157,8 +157,8 @@ bool isEmptyOrCgats(const std::string& path) {
     }
     const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
     std::string head(headBytes, '\0');
-    const ssize_t count =
-        file.number() < 0 ? -1 : readSome(file.number(), false, head.data(), head.size());
+    Source source{file.number(), false, false};
+    const ssize_t count = file.number() < 0 ? -1 : readSome(source, head.data(), head.size());
     return count >= 0 && looksLikeCgats({head.data(), static_cast<std::size_t>(count)});
 }
 
