@@ -12,21 +12,20 @@ namespace {
 using colour::DataSet;
 using colour::Lab;
 
-int load(const std::wstring& path, bool spectra, Input& input) {
+int load(const std::wstring& path, const colour::CgatsWants& wants, Input& input) {
     input.path = path;
-    return statusOf(
-        colour::loadColourFile(narrowed(path), colour::CgatsWants{.spectra = spectra}, input.file));
+    return statusOf(colour::loadColourFile(narrowed(path), wants, input.file));
 }
 
-int loadSide(const std::wstring& path, bool spectra, Input& input) {
-    if (const int status = load(path, spectra, input))
+int loadSide(const std::wstring& path, const colour::CgatsWants& wants, Input& input) {
+    if (const int status = load(path, wants, input))
         return status;
     return input.file.set && !input.file.set->hasColour() ? exitNoColourValues : exitDone;
 }
 
 /// A patch set selects by process colours, so it must be a text that has them.
 int loadPatchSet(const std::wstring& path, Input& input) {
-    if (const int status = load(path, false, input))
+    if (const int status = load(path, {.spectra = false}, input))
         return status;
     if (input.file.profile)
         return exitPatchSetNotText;
@@ -34,9 +33,10 @@ int loadPatchSet(const std::wstring& path, Input& input) {
 }
 
 int loadAll(const ComparisonPaths& paths, bool keepSpectra, Comparison& c) {
-    if (const int status = loadSide(paths.target, false, c.target))
+    const std::string& condition = paths.condition;
+    if (const int status = loadSide(paths.target, {false, condition}, c.target))
         return status;
-    if (const int status = loadSide(paths.measurement, keepSpectra, c.measurement))
+    if (const int status = loadSide(paths.measurement, {keepSpectra, condition}, c.measurement))
         return status;
     return paths.patchSet.empty() ? exitDone : loadPatchSet(paths.patchSet, c.patchSet);
 }

@@ -69,6 +69,7 @@ struct ComparisonPaths {
     std::wstring target;
     std::wstring measurement;
     std::wstring patchSet; ///< May be empty.
+    std::string condition; ///< "M1": read from files with several; empty: CgatsWants decides.
 };
 
 /// Loads, pairs and compares. `keepSpectra`: the measurement's spectra are wanted too.

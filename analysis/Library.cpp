@@ -103,8 +103,12 @@ int analyzeMeasurements(std::wstring target, std::wstring measurement, std::wstr
                         tolerancePresetParameterRecord tolerance, analyseResultsRecord* results,
                         std::wstring* json, KZJobDataStruct* job) {
     return guarded([&] {
-        return analyse({std::move(target), std::move(measurement), std::move(patchSet)}, tolerance,
-                       results, json, job);
+        // 0 to 3 are M0 to M3; any other number leaves the choice to the reader.
+        const int number = tolerance.illuminationCondition;
+        const std::string condition =
+            number >= 0 && number <= 3 ? "M" + std::to_string(number) : "";
+        return analyse({std::move(target), std::move(measurement), std::move(patchSet), condition},
+                       tolerance, results, json, job);
     });
 }
 

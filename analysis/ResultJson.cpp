@@ -3,6 +3,7 @@
 #include "analysis/JsonWriter.h"
 #include "analysis/Text.h"
 #include "analysis/Version.h"
+#include "colour/Identity.h"
 
 namespace analysis {
 namespace {
@@ -42,9 +43,13 @@ void writeInput(JsonWriter& json, const char* key, const Input& input) {
     json.key(key);
     if (!input.file.set && !input.file.profile)
         return json.null();
+    const bool isTarget = std::string_view(key) == "target";
     json.beginObject();
     json.member("path", documentText(input.path));
     json.member("kind", input.file.profile ? "profile" : "text");
+    if (isTarget) {
+        optionalMember(json, "identity", colour::identityOf(input.file));
+    }
     json.key("patches");
     if (!input.file.set) {
         json.null();
@@ -58,6 +63,7 @@ void writeInput(JsonWriter& json, const char* key, const Input& input) {
     optionalMember(json, "originator", set.originator);
     optionalMember(json, "created", set.created);
     optionalMember(json, "instrumentation", set.instrumentation);
+    optionalMember(json, "printing", set.printing);
     optionalMember(json, "illuminant", set.conditions.illuminant);
     optionalMember(json, "observer", set.conditions.observer);
     optionalMember(json, "measurementCondition", set.conditions.measurement);

@@ -15,6 +15,7 @@ constexpr struct {
     {Failure::Missing, exitInputMissing},
     {Failure::Unreadable, exitInputUnreadable},
     {Failure::NotRecognised, exitInputNotRecognised},
+    {Failure::XmlRefused, exitInputXmlRefused},
     {Failure::Damaged, exitInputDamaged},
     {Failure::TooLarge, exitInputTooLarge},
     {Failure::NoPatches, exitNoPatches},

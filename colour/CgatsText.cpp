@@ -27,14 +27,13 @@
 
 #include "colour/CgatsConditions.h"
 #include "colour/CgatsTables.h"
+#include "colour/TextEncoding.h"
 
 namespace colour {
 
 namespace {
 
 using namespace cgats;
-
-constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
 
 /// So much of a header, in bytes, is searched for keywords and for a line of names that no
 /// BEGIN_DATA_FORMAT announces.
@@ -60,10 +59,6 @@ constexpr std::string_view knownKeywords[] = {
     "PRINT_CONDITIONS",
     "WEIGHTING_FUNCTION",
 };
-
-std::string_view withoutMark(std::string_view bytes) {
-    return bytes.starts_with(byteOrderMark) ? bytes.substr(byteOrderMark.size()) : bytes;
-}
 
 /// Goes through the lines of a header: neither blank nor comment, without blanks in front.
 class Lines {
@@ -125,6 +120,7 @@ bool isStructure(std::string_view word) {
 struct NameList {
     std::vector<std::string> names;
     const CharTable* chars = &blanksSeparate;
+    std::vector<std::string> others; ///< The same line parted in the other way, if that differs.
 };
 
 std::size_t knownNames(const std::vector<std::string>& names) {
@@ -140,6 +136,12 @@ std::vector<std::string> textsOf(const std::vector<Word>& words) {
     for (const Word& word : words)
         texts.push_back(toUtf8(wordText(word)));
     return texts;
+}
+
+void dropEmptyEnd(std::vector<Word>& cells) {
+    while (!cells.empty() && cells.back().text.empty()) {
+        cells.pop_back();
+    }
 }
 
 /// What separates the names of a line: that which gives the most names that mean something.
@@ -173,15 +175,23 @@ bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount
     if (!splitWords(line, *list.chars, room, words))
         return false;
     std::vector<std::string> names = textsOf(words);
+    if (names.empty()) {
+        return true;
+    }
 
-    // Names may have blanks in them: tabs alone part them where that gives the count stated, or
-    // names that mean more.
-    if (isFirst && fieldCount != names.size() && splitCells(line, *list.chars, room, words)) {
-        while (!words.empty() && words.back().text.empty())
-            words.pop_back();
+    // Names may have blanks in them: tabs alone part them if that gives the count stated, or names
+    // that mean more. The rows may decide otherwise.
+    list.others.clear();
+    if (isFirst && splitCells(line, *list.chars, room, words)) {
+        dropEmptyEnd(words);
         std::vector<std::string> cells = textsOf(words);
-        if (fieldCount == cells.size() || knownNames(cells) > knownNames(names))
-            names = std::move(cells);
+        if (fieldCount != names.size() &&
+            (fieldCount == cells.size() || knownNames(cells) > knownNames(names))) {
+            std::swap(names, cells);
+        }
+        if (cells.size() != names.size() && cells.size() > 1) {
+            list.others = std::move(cells);
+        }
     }
     std::move(names.begin(), names.end(), std::back_inserter(list.names));
     return true;
@@ -215,6 +225,16 @@ std::optional<unsigned long long> countIn(const std::string& value) {
     return count;
 }
 
+/// Some exporters write the time of a date as a comment: CREATED "11/21/2026"  # Time: 09:15
+std::string timeBehind(std::string_view line) {
+    constexpr std::string_view mark = "# Time:";
+    constexpr std::size_t longest = 40;
+    const std::size_t at = line.rfind(mark);
+    const std::size_t quote = line.rfind('"');
+    const bool inQuotes = quote != line.npos && quote > at;
+    return at == line.npos || inQuotes ? "" : " " + toUtf8(line.substr(at, longest));
+}
+
 /// Reads one text from its first line to its last.
 class TextReader {
   public:
@@ -229,6 +249,7 @@ class TextReader {
     Failure readFormat(std::string_view line);
     Failure readRows(const char* at, bool hasBegin);
     Failure findNames(Lines& rows);
+    void letRowDecide(Lines rows);
     void seeHeader(const KeywordLine& line);
     Failure seeUnannounced(std::string_view line);
 
@@ -247,6 +268,7 @@ class TextReader {
     std::size_t m_tables = 0;
     Table m_table;
     DataSet m_texts; ///< Header texts alone.
+    std::string m_printConditions;
     ScaleHint m_scaleHint = ScaleHint::None;
     ConditionFinder m_conditions;
 };
@@ -269,6 +291,7 @@ Failure TextReader::read(DataSet& set) {
     set.descriptor = std::move(m_texts.descriptor);
     set.created = std::move(m_texts.created);
     set.instrumentation = std::move(m_texts.instrumentation);
+    set.printing = std::move(m_texts.printing.empty() ? m_printConditions : m_texts.printing);
     set.conditions = m_conditions.result();
     const Conditions& stated = set.conditions;
     const bool otherLight = !stated.illuminant.empty() && stated.illuminant != "D50";
@@ -291,12 +314,15 @@ Failure TextReader::readLine(std::string_view line) {
     if (isStructure(word))
         return Failure::None;
 
-    const KeywordLine keyword = keywordLine(line);
+    KeywordLine keyword = keywordLine(line);
     if (keyword.keyword == "NUMBER_OF_FIELDS") {
         m_fieldCount = countIn(keyword.value);
     } else if (keyword.keyword == "NUMBER_OF_SETS") {
         m_setCount = countIn(keyword.value);
     } else if (keyword.keyword != "KEYWORD") {
+        if (keyword.keyword == "CREATED") {
+            keyword.value += timeBehind(line);
+        }
         seeHeader(keyword);
         return seeUnannounced(line);
     }
@@ -367,11 +393,34 @@ Failure TextReader::findNames(Lines& rows) {
     return Failure::None;
 }
 
+/// A line of names that mixes blanks and tabs can be parted in two ways, and a wrong
+/// NUMBER_OF_FIELDS picks the wrong one. The cells of the first row decide.
+void TextReader::letRowDecide(Lines rows) {
+    std::string_view line;
+    if (m_names.others.empty() || !rows.next(line)) {
+        return;
+    }
+    std::vector<Word> cells;
+    splitCells(line, *m_names.chars, maxCgatsColumns, cells);
+    dropEmptyEnd(cells);
+    std::vector<Word> words;
+    splitWords(line, *m_names.chars, maxCgatsColumns, words);
+    const auto fits = [&](const std::vector<std::string>& names) {
+        return names.size() == cells.size() || names.size() == words.size();
+    };
+    const bool meansMore = knownNames(m_names.others) == m_names.others.size() &&
+                           knownNames(m_names.names) < m_names.names.size();
+    if (fits(m_names.others) && (!fits(m_names.names) || meansMore)) {
+        std::swap(m_names.names, m_names.others);
+    }
+}
+
 Failure TextReader::readRows(const char* at, bool hasBegin) {
     Lines rows = m_lines;
     rows.moveTo(at);
     if (const Failure failure = findNames(rows); failure != Failure::None)
         return failure;
+    letRowDecide(rows);
 
     const TableHeader header{m_names.names, m_names.chars, m_fieldCount, m_setCount, hasBegin};
     Table table;
@@ -406,6 +455,10 @@ void TextReader::seeHeader(const KeywordLine& line) {
         keep(m_texts.instrumentation);
     else if (line.keyword == "DESCRIPTOR" || line.keyword == "FILE_DESCRIPTOR")
         keep(m_texts.descriptor);
+    else if (line.keyword == "PRINTER")
+        keep(m_texts.printing);
+    else if (line.keyword == "PRINT_CONDITIONS" && !sameWord(line.value, "Not specified"))
+        keep(m_printConditions);
     else if (line.keyword == "TINTGATE_SCALES" && line.value == "device 100, XYZ 100, spectra 1")
         m_scaleHint = ScaleHint::Stated;
     else if (m_scaleHint == ScaleHint::None &&
@@ -420,8 +473,9 @@ bool isBlack(const DataSet& set) {
 
 } // namespace
 
-bool looksLikeCgats(std::string_view bytes) {
-    bytes = withoutMark(bytes);
+namespace {
+
+bool isCgats(std::string_view bytes) {
     if (bytes.empty() || std::memchr(bytes.data(), 0, bytes.size()) != nullptr)
         return false;
     Lines lines(bytes.substr(0, searchedHeader));
@@ -449,13 +503,21 @@ bool looksLikeCgats(std::string_view bytes) {
     return false;
 }
 
+} // namespace
+
+bool looksLikeCgats(std::string_view bytes) {
+    std::string decoded;
+    return isCgats(withoutUtf16(bytes, decoded));
+}
+
 Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set) {
     if (bytes.size() > maxCgatsBytes)
         return Failure::TooLarge;
     try {
-        if (!looksLikeCgats(bytes))
+        std::string decoded;
+        bytes = withoutUtf16(bytes, decoded);
+        if (!isCgats(bytes))
             return Failure::NotRecognised;
-        bytes = withoutMark(bytes);
         DataSet result;
         const Failure failure = TextReader(bytes, wants).read(result);
         if (failure != Failure::None)
@@ -476,7 +538,8 @@ Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set)
 }
 
 std::optional<std::string> cgatsKeyword(std::string_view bytes, std::string_view keyword) {
-    Lines lines(withoutMark(bytes));
+    std::string decoded;
+    Lines lines(withoutUtf16(bytes, decoded));
     std::string_view line;
     bool inRows = false;
     while (lines.next(line)) {

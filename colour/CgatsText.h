@@ -16,10 +16,13 @@ inline constexpr std::size_t maxCgatsBytes = std::size_t{4} << 30;
 inline constexpr std::size_t maxCgatsColumns = 4096;
 inline constexpr std::size_t maxCgatsPatches = 10'000'000;
 
-/// What a caller needs of a text; the reader skips the rest.
+/// What a caller needs of a file; the reader skips the rest.
 struct CgatsWants {
     bool spectra = true; ///< False: spectra are kept only if they are the sole colour values.
+    std::string condition = {}; ///< "M1": read this one of several that a file has (readCxf).
 };
+
+/// In all of this, text is UTF-8, Latin-1 or Windows-1252, or UTF-16 with a byte order mark.
 
 /// True if the bytes could be CGATS text: no NUL, and a known first line, a keyword, or a format.
 bool looksLikeCgats(std::string_view bytes);

@@ -11,6 +11,9 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "colour/Cxf.h"
+#include "colour/TextEncoding.h"
+
 namespace colour {
 
 namespace {
@@ -80,7 +83,8 @@ bool anything(std::string_view) {
 
 /// Text without NULs or a profile: all else need not be read to its end.
 bool textOrProfile(std::string_view head) {
-    return looksLikeProfile(head) || std::memchr(head.data(), 0, head.size()) == nullptr;
+    return looksLikeProfile(head) || isUtf16(head) ||
+           std::memchr(head.data(), 0, head.size()) == nullptr;
 }
 
 /// NotRecognised where the first bytes are not worth the rest.
@@ -173,21 +177,29 @@ Failure loadProfile(const std::string& path, Profile& profile) {
     }
 }
 
+Failure readColourFile(std::string_view bytes, const CgatsWants& wants, ColourFile& file) {
+    try {
+        ColourFile loaded;
+        const Failure failure = looksLikeProfile(bytes) ? loaded.profile.emplace().open(bytes)
+                                : looksLikeCxf(bytes)
+                                    ? readCxf(bytes, wants, loaded.set.emplace())
+                                    : readCgats(bytes, wants, loaded.set.emplace());
+        if (failure == Failure::None) {
+            file = std::move(loaded);
+        }
+        return failure;
+    } catch (const std::bad_alloc&) {
+        return Failure::OutOfMemory;
+    } catch (const std::length_error&) {
+        return Failure::OutOfMemory;
+    }
+}
+
 Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file) {
     try {
         std::string bytes;
-        if (const Failure failure = readBytes(path, maxCgatsBytes, textOrProfile, bytes);
-            failure != Failure::None)
-            return failure;
-        ColourFile loaded;
-        Failure failure = Failure::None;
-        if (looksLikeProfile(bytes))
-            failure = loaded.profile.emplace().open(bytes);
-        else
-            failure = readCgats(bytes, wants, loaded.set.emplace());
-        if (failure == Failure::None)
-            file = std::move(loaded);
-        return failure;
+        const Failure failure = readBytes(path, maxCgatsBytes, textOrProfile, bytes);
+        return failure == Failure::None ? readColourFile(bytes, wants, file) : failure;
     } catch (const std::bad_alloc&) {
         return Failure::OutOfMemory;
     } catch (const std::length_error&) {

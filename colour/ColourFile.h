@@ -1,8 +1,10 @@
-// A file that names colour: CGATS text or ICC profile, told apart by its bytes, never by its name.
+// A file that names colour: CGATS text, CxF3 or ICC profile, told apart by its bytes, never by its
+// name.
 #pragma once
 
 #include <optional>
 #include <string>
+#include <string_view>
 
 #include "colour/CgatsText.h"
 #include "colour/DataSet.h"
@@ -23,6 +25,9 @@ Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourF
 /// Loads the file at `path` as a profile; NotRecognised if it is anything else. It need not be read
 /// to its end for that. On failure `profile` may hold no profile.
 Failure loadProfile(const std::string& path, Profile& profile);
+
+/// The same of a file's bytes.
+Failure readColourFile(std::string_view bytes, const CgatsWants& wants, ColourFile& file);
 
 /// Whole contents of a file; Missing, Unreadable, TooLarge (above `limit`) or OutOfMemory. Devices
 /// and pipes are read to their end, but no more than 512 MB of them (TooLarge), and a pipe that

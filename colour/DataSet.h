@@ -64,6 +64,7 @@ struct DataSet {
     std::string descriptor;
     std::string created;
     std::string instrumentation;
+    std::string printing; ///< The printer, otherwise the printing conditions.
     Conditions conditions;
 
     std::vector<std::string> notes; ///< What the reader had to assume or mend, for a person to read.

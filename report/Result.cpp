@@ -72,10 +72,14 @@ Input input(const Json& json) {
     Input input;
     input.path = json.at("path");
     input.kind = json.at("kind");
+    if (const auto found = json.find("identity"); found != json.end() && found->is_string()) {
+        input.identity = found->get<std::string>();
+    }
     for (const auto& [key, title] :
          {std::pair{"description", "Description"}, std::pair{"originator", "Originator"},
           std::pair{"created", "Created"}, std::pair{"instrumentation", "Instrumentation"},
-          std::pair{"illuminant", "Illuminant"}, std::pair{"observer", "Observer"},
+          std::pair{"printing", "Printing"}, std::pair{"illuminant", "Illuminant"},
+          std::pair{"observer", "Observer"},
           std::pair{"measurementCondition", "Measurement condition"}})
         if (const auto found = json.find(key); found != json.end() && found->is_string())
             input.statements.emplace_back(title, found->get<std::string>());

@@ -43,6 +43,7 @@ struct Patch {
 struct Input {
     std::string path;
     std::string kind; ///< "text" or "profile".
+    std::string identity; ///< Of a target's colours; empty in results of versions before it.
     std::vector<std::pair<std::string, std::string>> statements;
 };
 

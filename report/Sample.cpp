@@ -20,20 +20,31 @@ bool near(double value, double wanted) {
     return std::abs(value - wanted) <= deviceTolerance;
 }
 
-InkColours inksOf(const Result& result) {
+void addInks(Sample& sample, const Result& result) {
     const std::size_t channels = result.channels.size();
-    InkMeans means;
-    for (std::size_t i = 0; i < result.patches.size(); ++i)
-        if (const auto ink = inkOf(result.device.data() + i * channels, channels))
-            means.add(*ink, result.patches[i].measured);
-    return means.means();
+    InkMeans measured;
+    InkMeans aimed;
+    for (std::size_t i = 0; i < result.patches.size(); ++i) {
+        if (const auto ink = inkOf(result.device.data() + i * channels, channels)) {
+            measured.add(*ink, result.patches[i].measured);
+            aimed.add(*ink, result.patches[i].target);
+        }
+    }
+    sample.inks = measured.means();
+    sample.aims = aimed.means();
 }
 
-std::string instrumentationOf(const Input& input) {
-    for (const auto& [label, text] : input.statements)
-        if (label == "Instrumentation")
+std::string statementOf(const Input& input, const char* wanted) {
+    for (const auto& [label, text] : input.statements) {
+        if (label == wanted) {
             return text;
+        }
+    }
     return {};
+}
+
+std::string fileName(const std::string& path) {
+    return path.substr(path.rfind('/') + 1);
 }
 
 } // namespace
@@ -81,9 +92,14 @@ InkColours InkMeans::means() const {
 
 Sample sampleOf(const Result& result, const Meta* meta) {
     Sample sample;
-    const std::string& path = result.measurement.path;
-    sample.title = path.substr(path.rfind('/') + 1);
-    sample.instrument = instrumentationOf(result.measurement);
+    sample.title = fileName(result.measurement.path);
+    sample.instrument = statementOf(result.measurement, "Instrumentation");
+    sample.printer = statementOf(result.measurement, "Printing");
+    sample.target = fileName(result.target.path);
+    sample.targetKey = result.target.identity;
+    if (sample.targetKey.empty()) {
+        sample.targetKey = sample.target + '\n' + statementOf(result.target, "Description");
+    }
     if (meta != nullptr) {
         sample.title = meta->title.empty() ? "Job " + std::to_string(meta->jobId) : meta->title;
         sample.jobId = meta->jobId;
@@ -101,7 +117,7 @@ Sample sampleOf(const Result& result, const Meta* meta) {
     // RGB and the like have channels that are no process inks.
     if (result.channels.size() >= 4 && result.channels[0].ends_with("C") &&
         result.channels[3].ends_with("K"))
-        sample.inks = inksOf(result);
+        addInks(sample, result);
     return sample;
 }
 

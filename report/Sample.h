@@ -59,9 +59,15 @@ struct Sample {
     std::string preset;
     std::int64_t presetId = 0;
     std::string formula; ///< Such as "CIE2000".
+    std::string target;  ///< Name of its file.
+    /// Equal for the same target: its identity; without one, its name and what it says of itself.
+    std::string targetKey;
+    std::string printer; ///< Or printing conditions, as the measurement states them.
+    std::string folder;  ///< Of one printer's results, where folders tell printers apart.
     Verdict verdict = Verdict::Incomplete;
     std::vector<Criterion> criteria; ///< Their worstPatch says nothing here.
     InkColours inks;                 ///< As measured.
+    InkColours aims;                 ///< Of the same patches in the target.
     std::string page;                ///< Bytes: where the job's page is, relative to the trend's.
 };
 

@@ -7,6 +7,7 @@
 #include <limits>
 #include <map>
 #include <numeric>
+#include <optional>
 #include <tuple>
 
 #include "colour/Difference.h"
@@ -82,8 +83,8 @@ std::string shiftText(const Drift (&drifts)[3]) {
         if (drifts[i].significant)
             parts.push_back((drifts[i].shift > 0 ? axes[i].more : axes[i].less) +
                             std::string(" (") + axes[i].symbol +
-                            (drifts[i].shift > 0 ? " +" : " ") + fixedText(drifts[i].shift, 2) +
-                            ")");
+                            (drifts[i].shift > 0 ? "\u00a0+" : "\u00a0") +
+                            fixedText(drifts[i].shift, 2) + ")");
     return listText(parts);
 }
 
@@ -119,23 +120,65 @@ void addLatest(InkTrend& trend, const std::vector<const Sample*>& samples) {
 /// Without colours the difference from the target has to do, which tells less: where to is unknown.
 void sayByDifference(InkTrend& trend, const std::vector<const Sample*>& samples) {
     std::vector<double> values;
+    std::string unit;
     std::size_t known = 0;
     for (const Sample* sample : samples) {
         const Criterion* const criterion = criterionOf(*sample, inkCriterion(trend.ink));
         values.push_back(criterion != nullptr ? judgedValue(*criterion) : none);
         known += std::isfinite(values.back());
+        if (criterion != nullptr) {
+            unit = unitOf(*criterion, sample->formula);
+        }
     }
     const Drift drift = driftOf(values);
     trend.shift = std::abs(drift.shift);
     sayMovement(trend, drift.significant, known);
-    if (known != 0)
-        trend.sentence = "Its difference is " + fixedText(trend.shift, 2) +
-                         (drift.shift < 0 ? " smaller" : " larger") + " than at first";
+    if (known == 0) {
+        return;
+    }
+    trend.averageOff = fixedText(drift.averages.back(), 2) + " " + unit;
+    trend.sentence = "moving average of its difference " + fixedText(std::abs(drift.shift), 2) +
+                     (drift.shift < 0 ? " smaller" : " larger") +
+                     " than the mean of the first jobs";
+}
+
+std::optional<colour::Formula> formulaNamed(const std::string& name) {
+    using enum colour::Formula;
+    for (const colour::Formula formula : {Cie76, Cmc11, Cie94, Ciede2000, Cmc21}) {
+        if (name == colour::formulaName(formula)) {
+            return formula;
+        }
+    }
+    return std::nullopt;
+}
+
+/// What a person would correct by: where the average stands against the aim.
+void addCorrection(InkTrend& trend, const std::vector<const Sample*>& samples) {
+    const auto latest = std::find_if(samples.rbegin(), samples.rend(), [&](const Sample* sample) {
+        return sample->aims[static_cast<std::size_t>(trend.ink)].has_value();
+    });
+    const auto formula = formulaNamed(samples.back()->formula);
+    if (latest == samples.rend() || !formula) {
+        return;
+    }
+    trend.aim = *(*latest)->aims[static_cast<std::size_t>(trend.ink)];
+    trend.aimSwatch = swatch(trend.aim);
+    Criterion difference;
+    difference.unit = "dE";
+    trend.averageOff = fixedText(colour::difference(*formula, trend.aim, trend.now), 2) + " " +
+                       unitOf(difference, samples.back()->formula);
+    for (std::size_t i = 0; i < 3; ++i) {
+        const double exact = axisOf(trend.now, i) - axisOf(trend.aim, i);
+        const double off = std::round(exact * 100) / 100 + 0.0; // No "-0.00".
+        trend.correction += std::string(i == 0 ? "" : ", ") + axes[i].symbol +
+                            (std::signbit(off) ? "\u00a0" : "\u00a0+") + fixedText(off, 2);
+    }
 }
 
 InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
     InkTrend trend;
     trend.ink = ink;
+    trend.aim = {none, none, none};
     std::array<std::vector<double>, 3> values;
     std::size_t known = 0;
     for (const Sample* sample : samples) {
@@ -164,7 +207,9 @@ InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
     sayMovement(trend,
                 std::any_of(drifts, drifts + 3, [](const Drift& d) { return d.significant; }),
                 known);
-    trend.sentence = fixedText(trend.shift, 2) + " from where it began";
+    addCorrection(trend, samples);
+    trend.sentence =
+        "moving average " + fixedText(trend.shift, 2) + " ΔE*ab from the mean of the first jobs";
     if (trend.movement == Movement::Drifting)
         trend.sentence += ": " + shiftText(drifts);
     return trend;
@@ -219,16 +264,50 @@ std::vector<CriterionTrend> criterionTrends(const std::vector<const Sample*>& sa
 
 /// Results with equal keys may be compared with each other.
 auto keyOf(const Sample& s) {
-    return std::tie(s.paper, s.preset, s.presetId, s.formula, s.instrument, s.workflow, s.strip);
+    return std::tie(s.paper, s.preset, s.presetId, s.formula, s.instrument, s.workflow, s.strip,
+                    s.targetKey, s.printer, s.folder);
 }
 
 std::string nameOf(const Sample& sample) {
     std::string name;
-    for (const std::string& part : {sample.paper, sample.preset, sample.instrument, sample.workflow,
-                                    std::string(sample.strip == 2 ? "second strip" : "")})
+    for (const std::string& part :
+         {sample.folder, sample.printer, sample.paper, sample.target, sample.preset,
+          sample.instrument, sample.workflow, std::string(sample.strip == 2 ? "second strip" : "")})
         if (!part.empty())
             name += (name.empty() ? "" : " · ") + part;
     return name.empty() ? "Without paper, preset and instrument" : name;
+}
+
+/// Targets of one name are told apart by the beginning of their identity, formulas by theirs.
+void tellApart(std::vector<Series>& all, const std::vector<Sample>& samples) {
+    std::map<std::string, std::vector<Series*>> byName;
+    for (Series& series : all) {
+        byName[series.name].push_back(&series);
+    }
+    constexpr std::size_t enoughDigits = 8;
+    constexpr std::size_t identityDigits = 64;
+    for (const auto& [name, alike] : byName) {
+        const Sample& first = samples[alike[0]->samples[0]];
+        for (Series* const series : alike) {
+            const Sample& sample = samples[series->samples[0]];
+            const bool targetsDiffer =
+                std::any_of(alike.begin(), alike.end(), [&](const Series* other) {
+                    return samples[other->samples[0]].targetKey != sample.targetKey;
+                });
+            const bool formulasDiffer =
+                std::any_of(alike.begin(), alike.end(), [&](const Series* other) {
+                    return samples[other->samples[0]].formula != first.formula;
+                });
+            if (targetsDiffer) {
+                series->name += sample.targetKey.size() == identityDigits
+                                    ? " · target " + sample.targetKey.substr(0, enoughDigits)
+                                    : " · target known by its name only";
+            }
+            if (formulasDiffer) {
+                series->name += " · " + sample.formula;
+            }
+        }
+    }
 }
 
 std::string recentText(const Series& series, const std::vector<const Sample*>& samples) {
@@ -256,17 +335,27 @@ std::string recentText(const Series& series, const std::vector<const Sample*>& s
            (worst != nullptr ? (recent == 1 ? ", by " : ", most often by ") + worst->title : "");
 }
 
+/// "; to correct: 3.10 ΔE00 from the aim (L* +1.20, a* -0.40, b* +0.00)"
+std::string correctionText(const InkTrend& ink) {
+    if (ink.averageOff.empty()) {
+        return {};
+    }
+    return "; it is " + ink.averageOff + " from the aim" +
+           (ink.correction.empty() ? "" : " (" + ink.correction + ")");
+}
+
 void sayDrifting(Series& series) {
     std::vector<std::string> names;
     for (const InkTrend& ink : series.inks) {
         if (ink.movement != Movement::Drifting)
             continue;
         names.push_back(lower(inkName(ink.ink)));
-        series.reasons.push_back(inkName(ink.ink) + std::string(": ") + ink.sentence);
+        series.reasons.push_back(inkName(ink.ink) + std::string(": ") + ink.sentence +
+                                 correctionText(ink));
     }
     series.word = "Drifting: " + listText(names);
-    series.sentence = "The latest jobs no longer stand where the first " +
-                      std::to_string(series.beginning) + " stood.";
+    series.sentence = "The moving average of the latest jobs has left the mean of the first " +
+                      std::to_string(series.beginning) + " jobs.";
 }
 
 void saySteady(Series& series) {
@@ -275,11 +364,16 @@ void saySteady(Series& series) {
         if (!ink.tolerance.empty() && (nearest == nullptr || ink.fill > nearest->fill))
             nearest = &ink;
     series.word = series.failing ? "Steady, but the latest job failed" : "Steady";
-    series.sentence = "Paper and solids stand where the first " + std::to_string(series.beginning) +
-                      " jobs stood.";
-    if (nearest != nullptr)
-        series.sentence += " Nearest to its limit: " + lower(inkName(nearest->ink)) + ", " +
-                           nearest->value + " of " + nearest->tolerance + ".";
+    series.sentence = "The moving averages of paper and solids stay at the means of the first " +
+                      std::to_string(series.beginning) + " jobs.";
+    if (nearest != nullptr) {
+        series.sentence +=
+            " Nearest to its limit in the latest job: " + lower(inkName(nearest->ink)) + ", " +
+            nearest->value + " of " + nearest->tolerance +
+            (nearest->averageOff.empty()
+                 ? "."
+                 : "; its moving average is " + nearest->averageOff + " from the aim.");
+    }
 }
 
 void sayState(Series& series, const std::vector<const Sample*>& samples) {
@@ -371,6 +465,7 @@ TrendModel makeTrend(std::vector<Sample> samples, const std::string& source,
         groups[keyOf(model.samples[i])].push_back(i);
     for (auto& [key, indices] : groups)
         model.series.push_back(seriesOf(model.samples, std::move(indices)));
+    tellApart(model.series, model.samples);
     std::stable_sort(model.series.begin(), model.series.end(), [](const auto& a, const auto& b) {
         const bool first = a.movement == Movement::Drifting;
         const bool second = b.movement == Movement::Drifting;

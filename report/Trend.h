@@ -21,17 +21,26 @@ struct InkTrend {
     Ink ink = Ink::Paper;
     Movement movement = Movement::Unknown;
     std::string word;     ///< "Drifting", "Steady", "Too few jobs", "No data".
-    std::string sentence; ///< Where it has gone: "1.84 from where it began: lighter (L* +1.20)".
-    colour::Lab began;    ///< Mean of the first jobs; NaN without colours, as is `now`.
-    colour::Lab now;      ///< Average of the latest jobs.
+    /// What the moving average has done: "moving average 1.84 from the mean of the first jobs:
+    /// lighter (L* +1.20)".
+    std::string sentence;
+    colour::Lab began; ///< Mean of the first jobs; NaN without colours, as is `now`.
+    colour::Lab now;   ///< Moving average at the latest job.
+    colour::Lab aim;   ///< The target's; NaN where it is not known.
     Swatch beganSwatch;
     Swatch nowSwatch;
+    Swatch aimSwatch;
+    /// How far `now` is from `aim`, which is what a person would correct by: "3.10 ΔE00" and "L*
+    /// +1.20, a* -0.40, b* +0.00" (`now` less `aim`). Empty if either is not known; `correction`
+    /// also if only differences are known, as their moving average.
+    std::string averageOff;
+    std::string correction;
     double shift = 0; ///< Distance of the two in CIELAB; without colours, change of the difference.
     /// L*, a*, b* of each job less `began`: as measured, and averaged. NaN where nothing is known;
     /// empty without any colours.
     std::array<std::vector<double>, 3> changes;
     std::array<std::vector<double>, 3> averages;
-    /// The latest difference from the target with its tolerance; empty where not judged.
+    /// The latest job's difference from the target with its tolerance; empty where not judged.
     std::string value;
     std::string tolerance;
     double fill = 0;    ///< Value as a share of twice the tolerance, 0 to 1.
@@ -54,10 +63,10 @@ struct CriterionTrend {
     std::string tolerance; ///< The last one.
 };
 
-/// Results that may be compared with each other: of one paper, preset, formula, instrument,
-/// workflow and strip.
+/// Results that may be compared with each other: aimed at the same colours, and of one paper,
+/// preset, formula, instrument, printer, folder, workflow and strip.
 struct Series {
-    std::string name; ///< These six in words.
+    std::string name; ///< These in words, as many as tell the series of a trend apart.
     std::string preset;
     std::string paper;
     Movement movement = Movement::Unknown;

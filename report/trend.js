@@ -76,12 +76,14 @@
     const card = make("div", `ink ${ink.movement}${ink.above ? " above" : ""}`);
     card.append(make("h3", "", ink.name));
     if (ink.began) {
-      card.append(swatchPair([[`Beginning: ${ink.began}`, ink.beganSwatch],
-        [`Latest: ${ink.now}`, ink.nowSwatch]]));
+      card.append(swatchPair([[`Aim: ${ink.aim}`, ink.aimSwatch],
+        [`Mean of the first ${series.beginning} jobs: ${ink.began}`, ink.beganSwatch],
+        [`Moving average: ${ink.now}`, ink.nowSwatch]].filter(([, swatch]) => swatch)));
     }
     card.append(badge(ink.movement, ink.word));
     if (ink.value) {
-      const value = card.appendChild(make("div", "value", ink.value));
+      const value = card.appendChild(make("div", "value"));
+      value.append(make("span", "label", "Latest job"), ink.value);
       if (ink.tolerance) {
         value.append(make("span", "unit", ` of ${ink.tolerance}`));
         const bar = card.appendChild(make("div", ink.above ? "failed" : ""))
@@ -90,7 +92,13 @@
       }
       if (ink.above) value.append(make("span", "unit", ", above"));
     }
-    card.append(make("p", "", ink.sentence));
+    if (ink.averageOff) {
+      const off = card.appendChild(make("div", "off"));
+      off.append(make("span", "label", "Moving average to aim"), make("b", "", ink.averageOff));
+      if (ink.correction) off.append(make("span", "correction", ink.correction));
+    }
+    const sentence = ink.sentence;
+    card.append(make("p", "", sentence.charAt(0).toUpperCase() + sentence.slice(1)));
     return card;
   }
 
@@ -207,7 +215,7 @@
     const limit = criterion.tolerance ? ` of ${criterion.tolerance}` : "";
     const above = criterion.tolerance
       ? ` · ${criterion.failed} of ${criterion.answered} above` : "";
-    return `latest ${criterion.latest}${limit} ${criterion.unit}${above}`;
+    return `latest job ${criterion.latest}${limit} ${criterion.unit}${above}`;
   }
 
   function drawCriterion(parent, criterion) {
@@ -292,7 +300,8 @@
 
   function drawInk(ink, range) {
     const canvas = addFigure(byId("drift"), ink.name,
-      `${ink.word}${ink.now ? ` · L*a*b* ${ink.began} → ${ink.now}` : ""}`);
+      `${ink.word}${ink.now ? ` · L*a*b* first jobs ${ink.began} → moving average ${ink.now}${
+        ink.aim ? `, aim ${ink.aim}` : ""}` : ""}`);
     const signed = (value) => (value > 0 ? "+" : "") + (value ?? NaN).toFixed(2);
     const many = ink.changeL.length > crowd;
     const measured = axes.map((axis, i) => ({

@@ -32,6 +32,7 @@
 
 #include "colour/CgatsText.h"
 #include "colour/ColourFile.h"
+#include "colour/TextEncoding.h"
 #include "companions/measure-tool/CutLines.h"
 #include "companions/measure-tool/Failure.h"
 
@@ -205,6 +206,10 @@ std::string conditionIn(const std::string& bytes) {
 Definition readDefinition(const std::string& path) {
     std::string bytes;
     expectUsable(colour::readWholeFile(path, largestFile, bytes), Status::BadDefinition, path);
+    if (std::string decoded; colour::isUtf16(bytes)) {
+        colour::withoutUtf16(bytes, decoded);
+        bytes = std::move(decoded);
+    }
     Lines lines = linesOf(bytes);
     const Lines numbers = prepare(lines);
     colour::DataSet set;

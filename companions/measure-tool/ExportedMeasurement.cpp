@@ -59,10 +59,13 @@ void checkFolder(const std::string& path) {
                   folder + ", the folder of the export, can't be used: " + reason);
 }
 
-/// Loads a file that has colours. Throws Failure (BadExport) if it has none.
-colour::DataSet load(const std::string& path) {
+/// Loads a file that has colours: of several measurement conditions the one that is asked for.
+/// Throws Failure (BadExport) if it has none.
+colour::DataSet load(const std::string& path, const std::string& condition) {
     colour::ColourFile file;
-    expectUsable(colour::loadColourFile(path, {}, file), Status::BadExport, path);
+    colour::CgatsWants wants;
+    wants.condition = condition;
+    expectUsable(colour::loadColourFile(path, wants, file), Status::BadExport, path);
     if (!file.set || !file.set->hasColour())
         throw Failure(Status::BadExport, path + " holds no measured colours");
     return std::move(*file.set);
@@ -131,7 +134,10 @@ class Wait {
 
     std::optional<Accepted> attempt() {
         try {
-            auto set = resultBefore(m_end, [path = m_settings.file] { return load(path); });
+            auto set =
+                resultBefore(m_end, [path = m_settings.file, condition = m_definition.condition] {
+                    return load(path, condition);
+                });
             if (!set)
                 return std::nullopt;
             return accept(std::move(*set), m_settings, m_definition);
@@ -179,10 +185,12 @@ ExportedMeasurement::ExportedMeasurement(const Settings& settings, const Definit
         checkFolder(path);
         return true;
     });
-    Accepted accepted =
-        settings.wait.count() > 0
-            ? Wait(settings, definition, person).run()
-            : accept(unlessCancelled([path] { return load(path); }), settings, definition);
+    Accepted accepted = settings.wait.count() > 0
+                            ? Wait(settings, definition, person).run()
+                            : accept(unlessCancelled([path, condition = definition.condition] {
+                                         return load(path, condition);
+                                     }),
+                                     settings, definition);
     m_set = std::move(accepted.set);
     m_rows = std::move(accepted.rows);
     if (!definition.condition.empty() && m_set.conditions.measurement.empty())

@@ -57,6 +57,20 @@ std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {
     return place.name + page.substr(folder.size());
 }
 
+/// The folder that the results of one printer share, as seen from here: that of the result, or of
+/// a job's result that of the job's own folder (JobID_7).
+std::string printersFolder(const LoadedResult& loaded) {
+    std::error_code failure;
+    fs::path folder = fs::canonical(loaded.folder(), failure);
+    if (failure) {
+        return loaded.folder();
+    }
+    if (loaded.meta && folder.filename().string().starts_with("JobID_")) {
+        folder = folder.parent_path();
+    }
+    return fs::proximate(folder).string();
+}
+
 std::string counted(std::size_t count, const std::string& one, const std::string& many) {
     return std::to_string(count) + (count == 1 ? one : many);
 }
@@ -64,7 +78,8 @@ std::string counted(std::size_t count, const std::string& one, const std::string
 } // namespace
 
 Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& filter,
-                     const PagePlace& place, const std::function<void(const std::string&)>& say) {
+                     SeriesBy seriesBy, const PagePlace& place,
+                     const std::function<void(const std::string&)>& say) {
     Gathered gathered;
     std::size_t byFile = 0;
     for (const std::string& path : filesOf(arguments)) {
@@ -74,6 +89,9 @@ Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& fi
             if (!note.empty())
                 say(note);
             report::Sample sample = report::sampleOf(loaded.result, loaded.metaOrNull());
+            if (seriesBy == SeriesBy::Folders) {
+                sample.folder = printersFolder(loaded);
+            }
             bool guessed = false;
             sample.time = timeOfResult(loaded, guessed);
             if (!filter.takes(sample))

@@ -2,6 +2,7 @@
 
 #include <algorithm>
 #include <charconv>
+#include <cstdio>
 #include <ctime>
 
 namespace reporting {
@@ -19,17 +20,60 @@ bool holds(const std::string& text, const std::string& part) {
                        [](char a, char b) { return lower(a) == lower(b); }) != text.end();
 }
 
+/// Dates of numbers alone, in which day and month may have changed places: 11/21/2026, 20.11.2026.
+/// Counts only if one of the two is above 12 or both are equal. A time that an exporter of charts
+/// writes behind it, as in "11/05/2026 # Time: 09:15", proves that the month is in front.
+std::optional<std::int64_t> timeOfNumbers(const std::string& text) {
+    int first = 0;
+    int second = 0;
+    int year = 0;
+    char separator[2] = {};
+    int used = 0;
+    if (std::sscanf(text.c_str(), " %2d%1[./]%2d%*1[./]%4d%n", &first, separator, &second, &year,
+                    &used) != 4 ||
+        year < 1970) {
+        return std::nullopt;
+    }
+    std::tm parts{};
+    const bool exporters =
+        std::sscanf(text.c_str() + used, " # Time: %2d:%2d", &parts.tm_hour, &parts.tm_min) == 2;
+    if (!exporters) {
+        parts = {};
+        std::sscanf(text.c_str() + used, " %2d:%2d", &parts.tm_hour, &parts.tm_min);
+    }
+    constexpr int months = 12;
+    const bool monthFirst = exporters || second > months;
+    if (!exporters && first <= months && second <= months && first != second) {
+        return std::nullopt;
+    }
+    const int month = monthFirst ? first : second;
+    const int day = monthFirst ? second : first;
+    constexpr int longestMonth = 31;
+    if (month < 1 || month > months || day < 1 || day > longestMonth || parts.tm_hour > 23 ||
+        parts.tm_min > 59) {
+        return std::nullopt;
+    }
+    parts.tm_year = year - 1900;
+    parts.tm_mon = month - 1;
+    parts.tm_mday = day;
+    return timegm(&parts);
+}
+
 } // namespace
 
 std::optional<std::int64_t> timeOf(const std::string& text) {
-    // What follows the last field, such as a zone, is let be.
-    for (const char* form : {"%Y-%m-%dT%H:%M:%S", "%Y-%m-%d %H:%M:%S", "%Y-%m-%dT%H:%M",
-                             "%Y-%m-%d %H:%M", "%Y-%m-%d", "%a %b %d %H:%M:%S %Y"}) {
+    // What follows the last field, such as a zone, is ignored.
+    for (const char* form :
+         {"%Y-%m-%dT%H:%M:%S", "%Y-%m-%d %H:%M:%S", "%Y-%m-%dT%H:%M", "%Y-%m-%d %H:%M", "%Y-%m-%d",
+          "%Y/%m/%d %H:%M:%S", "%Y/%m/%d %H:%M", "%Y/%m/%d", "%a %b %d %H:%M:%S %Y",
+          "%B %d, %Y %H:%M:%S", "%B %d, %Y %H:%M", "%B %d, %Y", "%d %B %Y"}) {
         std::tm parts{};
-        if (strptime(text.c_str(), form, &parts) != nullptr)
+        constexpr int earliestYear = 70; // 11/05/2026 would be a day of the year 11.
+        if (strptime(text.c_str(), form, &parts) != nullptr && parts.tm_year >= earliestYear) {
             return timegm(&parts);
+        }
     }
-    return std::nullopt;
+    return timeOfNumbers(text);
 }
 
 std::int64_t localTime(std::int64_t secondsSince1970) {

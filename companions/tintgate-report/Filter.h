@@ -10,8 +10,9 @@
 namespace reporting {
 
 /// Seconds since 1970 on the room's own clock of a text such as "2026-11-24", "2026-11-24 21:53",
-/// "2026-11-24T21:53:07+01:00" (the zone counts for nothing) or "Tue Nov 24 21:53:07 2026"; nothing
-/// for any other.
+/// "2026-11-24T21:53:07+01:00" (the zone counts for nothing), "Tue Nov 24 21:53:07 2026",
+/// "2026/11/24", "November 24, 2026  21:53", "11/24/2026 # Time: 21:53" or "24.11.2026"; nothing
+/// for any other, nor for one whose day and month may have changed places.
 std::optional<std::int64_t> timeOf(const std::string& text);
 
 /// The same of a time of this machine, in its own zone.

@@ -9,6 +9,7 @@
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/LocalPages.h"
 #include "companions/tintgate-report/ServerFiles.h"
+#include "companions/tintgate-report/Targets.h"
 #include "companions/tintgate-report/TicketKeys.h"
 #include "companions/tintgate-report/Trend.h"
 #include "store/StoreEngine.h"
@@ -53,7 +54,8 @@ constexpr const char* measuredKeys[] = {"Approval",
                                         "CMYKValues/KValues"};
 
 store::KeyFilter keysOf(const StripKeys& keys) {
-    std::vector<std::string> names(std::begin(sharedKeys), std::end(sharedKeys));
+    std::vector<std::string> names = Targets::keys(keys);
+    names.insert(names.end(), std::begin(sharedKeys), std::end(sharedKeys));
     for (const char* key : stripOnlyKeys)
         names.push_back(keys.own(key));
     for (const char* name : measuredKeys)
@@ -244,7 +246,7 @@ report::Sample sampleOf(const store::TicketContent& job, const Verified& verifie
 class Gatherer {
   public:
     Gatherer(store::StoreEngine& store, const Filter& filter, const PagePlace& place)
-        : m_store(store), m_filter(filter), m_place(place), m_server(store) {}
+        : m_store(store), m_filter(filter), m_place(place), m_server(store), m_targets(store) {}
 
     void add(const Verified& verified) {
         const SharedContent job =
@@ -270,6 +272,10 @@ class Gatherer {
         sample.verdict =
             verdictOf(sample, integerOf(job->find(keys.measured("Approval"))).value_or(0));
         sample.inks = inksOf(*job, keys);
+        Target target = m_targets.of(*job, verified.strip, verified.time);
+        sample.target = std::move(target.name);
+        sample.targetKey = std::move(target.key);
+        sample.aims = target.aims;
         m_gathered.samples.push_back(std::move(sample));
     }
 
@@ -307,6 +313,7 @@ class Gatherer {
     const Filter& m_filter;
     const PagePlace& m_place;
     Server m_server;
+    Targets m_targets;
     const LocalPages m_pages;
     const store::KeyFilter m_keys[2] = {keysOf(StripKeys(1)), keysOf(StripKeys(2))};
     std::map<std::tuple<int, int, std::string>, std::size_t> m_known;

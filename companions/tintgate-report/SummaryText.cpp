@@ -82,8 +82,18 @@ std::string inksText(const report::Series& series, const Painter& paint) {
                          {ink.value, Tone::Bold, true},
                          {ink.tolerance.empty() ? "" : "of " + ink.tolerance, Tone::Plain, true},
                          {ink.above ? "above" : "", Tone::Failed},
+                         {ink.averageOff, Tone::Bold, true},
+                         {ink.correction},
                          {ink.sentence, Tone::Soft}});
     }
+    lines.insert(lines.begin(), {{""},
+                                 {""},
+                                 {"latest job", Tone::Soft, true},
+                                 {""},
+                                 {""},
+                                 {"average to aim", Tone::Soft, true},
+                                 {""},
+                                 {""}});
     return tableText(lines, paint);
 }
 

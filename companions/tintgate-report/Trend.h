@@ -24,11 +24,15 @@ struct PagePlace {
         name; ///< Of the folder of jobs' pages in it, made for the first; empty: none is made.
 };
 
+/// What tells printers apart, beside what measurements state.
+enum class SeriesBy { Statements, Folders };
+
 /// Reads result files, or all below folders, and makes the page of each job where the viewer has
 /// not made it already. What can't be read is told through `say` and left out. Throws Failure
 /// (Unreadable for a folder, NotWritten).
 Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& filter,
-                     const PagePlace& place, const std::function<void(const std::string&)>& say);
+                     SeriesBy seriesBy, const PagePlace& place,
+                     const std::function<void(const std::string&)>& say);
 
 /// Reads the results that the jobs of a store hold. Links lead to the pages that lie in the tool's
 /// folder on this machine. Throws Failure (Store).

@@ -46,8 +46,10 @@ Examples:
   tintgate-report --check-preset my-preset.xml    what is wrong with a preset, and where
   tintgate-report --tidy 30 --dry-run
 
-A trend compares only results of one paper, preset, instrument, workflow and strip
-with each other, and says which ink drifts. Its table of jobs leads to their pages,
+A trend compares only results that were aimed at the same colours, and of one printer,
+paper, preset, instrument, workflow and strip, with each other, and says which ink
+drifts. A printer is known by what the measurement states (PRINTER), or by the folder
+of its results with --series folder. Its table of jobs leads to their pages,
 which stand in a folder beside it (trend.html has trend-jobs), or where the viewer
 has made them. The times are those of the jobs, else those that the measurements
 tell, else those of the files.
@@ -66,6 +68,7 @@ struct Options {
     std::string store;
     std::string since;
     std::string until;
+    std::string series;
     reporting::Filter filter;
     std::optional<int> code;
     std::optional<int> tidyDays;
@@ -163,8 +166,12 @@ void writeTrend(const Options& options, const report::TrendModel& trend) {
 Status reportTrend(const Options& options) {
     const reporting::PagePlace place = placeOf(options);
     reporting::Gathered gathered =
-        options.fromStore() ? reporting::gatherStore(options.store, options.filter, place)
-                            : reporting::gatherFiles(options.results, options.filter, place, say);
+        options.fromStore()
+            ? reporting::gatherStore(options.store, options.filter, place)
+            : reporting::gatherFiles(options.results, options.filter,
+                                     options.series == "folder" ? reporting::SeriesBy::Folders
+                                                                : reporting::SeriesBy::Statements,
+                                     place, say);
     if (gathered.samples.empty())
         throw Failure(gathered.leftOut != 0 ? Status::Unreadable : Status::NothingFound,
                       "there is no result that fits what was asked for");
@@ -267,6 +274,12 @@ void addOptions(CLI::App& program, Options& options) {
                      "Of workflows whose names hold this text"}})
         program.add_option(name, *value, what)->type_name("TEXT")->group(trend);
     program
+        .add_option("--series", options.series,
+                    "\"folder\": results in different folders are of\ndifferent printers")
+        ->type_name("WHAT")
+        ->check(CLI::IsMember({"folder"}))
+        ->group(trend);
+    program
         .add_flag("--no-pages", options.noPages,
                   "Make no pages of jobs; lead to those that are\nthere")
         ->group(trend);
@@ -322,6 +335,8 @@ void settle(Options& options) {
         throw CLI::ValidationError("--tidy", "takes 1 to 36500 days");
     if (options.dryRun && !options.tidyDays)
         throw CLI::RequiresError("--dry-run", "--tidy");
+    if (options.fromStore() && !options.series.empty())
+        throw CLI::ExcludesError("--series", "--store");
     if ((options.csv || options.verdict || !options.meta.empty()) && wantsTrend(options))
         throw CLI::ValidationError("--csv, --verdict and --meta", "are for one result");
 }

@@ -10,6 +10,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
+#include "Utf16.h"
 #include "colour/Difference.h"
 
 using namespace colour;
@@ -119,6 +120,8 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
         {"CRLF", with("\n", "\r\n"), ""},
         {"CR alone", with("\n", "\r"), ""},
         {"byte order mark", "\xEF\xBB\xBF" + plain, ""},
+        {"UTF-16, low byte first", support::utf16(plain, "LE"), ""},
+        {"UTF-16, high byte first, CRLF", support::utf16(with("\n", "\r\n"), "BE"), ""},
         {"aligned with blanks and tabs", with(" ", " \t  "), ""},
         {"comments", with("\n", " # one, \"two\n# three\n"), ""},
         {"end of text sign", plain + "\x1A", ""},
@@ -173,6 +176,41 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
     }
 }
 
+TEST(CgatsText, LetsTheFirstRowPartNamesOfBlanksAndTabs) {
+    const struct {
+        const char* what;
+        std::string format; ///< With the stated number of fields in front of it.
+        std::string row;
+        std::string id;
+        std::string name;
+    } cases[] = {
+        {"rows of tabs",
+         "10 SAMPLE_ID SAMPLE_NAME|CMYK_C|CMYK_M|CMYK_Y|CMYK_K|LAB_L|LAB_A|LAB_B|NOTE",
+         "1|A1|100|0|0|0|55|-37|-50|7", "1", "A1"},
+        {"the same, names with blanks",
+         "9 SAMPLE_ID SAMPLE_NAME|CMYK_C|CMYK_M|CMYK_Y|CMYK_K|LAB_L|LAB_A|LAB_B",
+         "1|Cyan solid|100|0|0|0|55|-37|-50", "1", "Cyan solid"},
+        {"rows like the names",
+         "8 SAMPLE_ID SAMPLE_NAME|CMYK_C|CMYK_M|CMYK_Y|CMYK_K|LAB_L|LAB_A|LAB_B",
+         "1 A1|100|0|0|0|55|-37|-50", "1", "A1"},
+        {"a name of two words, a count of words",
+         "9 Patch label|CMYK_C|CMYK_M|CMYK_Y|CMYK_K|LAB_L|LAB_A|LAB_B", "Cyan|100|0|0|0|55|-37|-50",
+         "", ""},
+    };
+    for (const auto& c : cases) {
+        SCOPED_TRACE(c.what);
+        const std::size_t blank = c.format.find(' ');
+        const DataSet set = readWell(
+            replaced(table(c.format.substr(blank + 1), c.row + "\n",
+                           "CGATS.17\nNUMBER_OF_FIELDS " + c.format.substr(0, blank) + "\n"),
+                     "|", "\t"));
+        EXPECT_EQ(deviceOf(set), "cmyk CMYK 100 0 0 0");
+        EXPECT_THAT(labsOf(set), ElementsAre(55, -37, -50));
+        EXPECT_EQ(set.ids.empty() ? "" : set.ids[0], c.id);
+        EXPECT_EQ(set.names.empty() ? "" : set.names[0], c.name);
+    }
+}
+
 TEST(CgatsText, KeepsHeaderTextsAsUtf8) {
     const DataSet set =
         readWell(table(labNames, "1 50 0 0\n",
@@ -183,6 +221,12 @@ TEST(CgatsText, KeepsHeaderTextsAsUtf8) {
     EXPECT_EQ(set.descriptor, "ß 5” \"x\""); // 94 is a quote in Windows-1252
     EXPECT_EQ(set.created, "3 May 2024");
     EXPECT_EQ(set.instrumentation, "a\tb, € 5");
+    // The time of day follows as a comment of a form of its own.
+    const auto createdOf = [](const std::string& line) {
+        return readWell(table(labNames, "1 50 0 0\n", "CGATS.17\n" + line + "\n")).created;
+    };
+    EXPECT_EQ(createdOf("CREATED \"11/21/2026\"  # Time: 09:15"), "11/21/2026 # Time: 09:15");
+    EXPECT_EQ(createdOf("CREATED \"11/21/2026  # Time: 09:15\""), "11/21/2026  # Time: 09:15");
 }
 
 // The columns stand before those of Lab; a row with tabs has its cells by them alone.
@@ -447,6 +491,7 @@ TEST(CgatsText, FindsKeywordsInUnfinishedTexts) {
         {"KEYWORD DEVICE\rDEVICE 5 # chosen\rDEVICE 6\r", "5"},
         {"\"DEVICE \"\"Spectro, big\"\"\"\t\t\n", "Spectro, big"},
         {"KEYWORD\tDEVICE\n", std::nullopt},
+        {support::utf16("DEVICE \"Grün 𝄞\"\r\n", "BE"), "Grün 𝄞"},
         {"# DEVICE 7\nORIGINATOR \"DEVICE 9\"\n", std::nullopt},
         {replaced(plain, "A1 0 0", "DEVICE 3 0") + "DEVICE  M\xFC X  \n", "Mü X"},
     };

@@ -10,6 +10,7 @@
 #include <gtest/gtest.h>
 
 #include "ScratchFolder.h"
+#include "Utf16.h"
 
 using namespace colour;
 
@@ -39,6 +40,11 @@ TEST(ColourFile, TellsFilesByTheirBytes) {
     EXPECT_EQ(load(folder.write("cut.icc", profile.substr(0, 200))), Failure::ProfileDamaged);
     EXPECT_EQ(load(folder.write("other", std::string(100, '\0'))), Failure::NotRecognised);
     EXPECT_EQ(load(folder.write("empty", "")), Failure::NotRecognised);
+    EXPECT_EQ(load(folder.write("utf16", support::utf16(text, "LE"))), Failure::None);
+    EXPECT_EQ(load(folder.write("utf16", std::string("\xFF\xFE\0\xDC"
+                                                     "1",
+                                                     5))),
+              Failure::NotRecognised);
     EXPECT_EQ(load("/dev/zero"), Failure::NotRecognised);
     EXPECT_TRUE(file.profile); // as it was
 }

@@ -15,6 +15,7 @@
 #include <gtest/gtest.h>
 
 #include "MeasureRuns.h"
+#include "Utf16.h"
 
 namespace {
 
@@ -74,7 +75,8 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
-        m_folder.write("export.txt", c.text);
+        const bool wide = std::string(c.what) == "in another order";
+        m_folder.write("export.txt", wide ? support::utf16(c.text, "LE") : c.text);
         // A relative path starts from the settings.
         const std::string settings = "instrument = file\nfile = export.txt\n";
         if (c.exitCode != 0) {
@@ -90,6 +92,33 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         const bool states = c.text.starts_with(made);
         EXPECT_EQ(set.conditions.measurement, states ? "M1" : "");
         EXPECT_EQ(m_log.find("does not state its measurement condition") == m_log.npos, states);
+    }
+    // Of an export with several conditions, the one that the job asks for.
+    const auto object = [](const char* cyan, const char* condition, const char* L) {
+        return std::string("<Object Id='1'><DeviceColorValues><ColorCMYK><Cyan>") + cyan +
+               "</Cyan><Magenta>0</Magenta><Yellow>0</Yellow><Black>0</Black></ColorCMYK>"
+               "</DeviceColorValues><ColorValues><ColorCIELab ColorSpecification='" +
+               condition + "'><L>" + L +
+               "</L><A>1</A><B>2</B></ColorCIELab></ColorValues></Object>";
+    };
+    const auto specification = [](const char* id, const char* light) {
+        return std::string("<ColorSpecification Id='") + id +
+               "'><MeasurementSpec><Device><DeviceIllumination>" + light +
+               "</DeviceIllumination></Device></MeasurementSpec></ColorSpecification>";
+    };
+    m_folder.write("export.cxf", "<CxF xmlns='http://colorexchangeformat.com/CxF3-core'><Resources>"
+                                 "<ObjectCollection>" +
+                                     object("100", "m0", "55") + object("100", "m2", "56") +
+                                     "</ObjectCollection><ColorSpecificationCollection>" +
+                                     specification("m0", "M0_Incandescent") +
+                                     specification("m2", "M2_UVExcluded") +
+                                     "</ColorSpecificationCollection></Resources></CxF>");
+    for (const auto& [number, L] : {std::pair{"2", 56}, std::pair{"0", 55}}) {
+        const std::string one = crlf(head + format(cmyk) + "DEVICE 33\nILLUMINATION_CONDITION " +
+                                     number + "\n" + begin + "1\t100\t0\t0\t0\n" + end);
+        const colour::DataSet set = measured(one, "instrument = file\nfile = export.cxf\n");
+        EXPECT_EQ(set.lab[0].L, L);
+        EXPECT_EQ(set.conditions.measurement, std::string("M") + number);
     }
     // What the settings permit, and what the definition leaves open.
     m_folder.write("export.txt",

@@ -16,6 +16,7 @@
 #include "RunProgram.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "SuiteRoot.h"
+#include "Utf16.h"
 #include "colour/Difference.h"
 #include "colour/Spectra.h"
 #include "measure/Helper.h"
@@ -93,6 +94,8 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
         else
             EXPECT_EQ(patchesText(measured(crlf(text), virtualPrint)), patches);
     }
+    const std::string two = table(cmyk, "1\t100\t0\t0\t0\n2\t40\t27\t27\t0\n" + end);
+    EXPECT_EQ(patchesText(measured(support::utf16(crlf(two), "BE"), virtualPrint)), simple);
 }
 
 TEST_F(MeasureTool, SpectraHaveTheColourMeasured) {

@@ -34,7 +34,7 @@ ARROWS = {
     "jobform": "",
     "Tintgate": "base jobform logger log records platform libTintgate",
     "TintgateJob": "job jobform log records libTintgate",
-    "colour": "",
+    "colour": "base",
     "report": "colour",
     "viewer": "report platform writefailures",
     "measuring": "base colour platform",

@@ -9,6 +9,7 @@
 #include <gtest/gtest.h>
 
 #include "ScratchFolder.h"
+#include "Utf16.h"
 #include "job/KZVerifyJobProcessor.h"
 
 namespace {
@@ -80,6 +81,20 @@ TEST_F(DefinitionFile, TakesTheRowsOfAFixedStrip) {
     const std::string rows = "|BEGIN_DATA|1\t0\t0\t0\t0|2|END_DATA|behind||";
     expect(body, definition + "\t33" + rows);
     expect("NUMBER_OF_COLS 40 |" + body, definition + " 40 " + rows);
+}
+
+TEST_F(DefinitionFile, IsUtf8WhateverTheStripIs) {
+    const std::string strip = "DEVICE 21|NUMBER_OF_STRIPS 1|NUMBER_OF_COLS 1|BEGIN_DATA_FORMAT|"
+                              "SAMPLE_ID|END_DATA_FORMAT|BEGIN_DATA|Grün|END_DATA|";
+    ASSERT_TRUE(define(strip));
+    const std::string expected = support::contentsOf(m_definition);
+    for (const char* order : {"LE", "BE"}) {
+        m_folder.write("strip.it8", support::utf16(lines(strip), order));
+        EXPECT_EQ(KZVerifyJobProcessor().WriteTemporaryMeasurementDefinitionFile(
+                      m_folder.path("strip.it8"), &m_job),
+                  m_definition);
+        EXPECT_EQ(support::contentsOf(m_definition), expected);
+    }
 }
 
 TEST_F(DefinitionFile, TellsEachInstrumentWhatItNeeds) {

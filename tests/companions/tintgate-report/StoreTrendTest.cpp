@@ -1,6 +1,11 @@
+#include <algorithm>
+#include <chrono>
+#include <ctime>
 #include <map>
 #include <regex>
+#include <set>
 #include <string>
+#include <thread>
 #include <vector>
 
 #include <gmock/gmock.h>
@@ -163,8 +168,107 @@ TEST_F(StoreTrend, KnowsPresetsOfThePsdKindAndJobsWithoutColours) {
     }
     importJobs(changes);
     EXPECT_THAT(text(), AllOf(ContainsRegex("patches, average +1.13 +of 4.50 +ΔE00 +1 of 11 above"),
-                              HasSubstr("Drifting: cyan"), HasSubstr("Cyan: Its difference is "),
+                              HasSubstr("Drifting: cyan"),
+                              HasSubstr("Cyan: moving average of its difference "),
+                              ContainsRegex("Cyan +3.60 +of 4.50 +2.58 ΔE00 "),
                               HasSubstr("The file of preset 2 can't be read")));
+}
+
+std::string charted(double cyan) {
+    return "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B\n"
+           "END_DATA_FORMAT\nBEGIN_DATA\n1 0 0 0 0 95 0 -2\n2 100 0 0 0 " +
+           std::to_string(cyan) + " -37 -50\nEND_DATA\n";
+}
+
+TEST_F(StoreTrend, PartsJobsByWhatTheyWereAimedAt) {
+    const std::string charts = "/server/IT8_CharacterizationData/";
+    answer({"file", "put", m_folder.write("1", charted(55)), charts + "old.txt"});
+    answer({"file", "put", m_folder.write("2", charted(55)), charts + "same.txt"});
+    answer({"file", "put", m_folder.write("3", charted(56)), "/x(TEMP)/other.txt"});
+    answer({"file", "put", m_folder.write("4", charted(57)),
+            charts + "Fogra_MKCheck11/MKCheck11.txt"});
+    answer({"file", "put", "/usr/share/color/icc/ghostscript/default_cmyk.icc", "/p/press.icc"});
+    const std::string two = "Workflow/Verify/CharacterizationData";
+    const auto aim = [](int workflow, const std::string& key, const std::string& path) {
+        return json{{"Workflow/Verify/MeasurementWorkflow", {{"int", workflow}}},
+                    {key, {{"string", path}}}};
+    };
+    const std::string own = "Remote/Measurement/Reference/";
+    const json stored = {{"Workflow/Verify/MeasurementWorkflow", {{"int", 3}}},
+                         {own + "Numpatches", {{"int", 2}}},
+                         {own + "CMYKValues/CValues", {{"int", {0, 255}}}},
+                         {own + "LabValues/LValues", {{"double", {95.0, 54.0}}}},
+                         {own + "LabValues/AValues", {{"double", {0.0, -37.0}}}},
+                         {own + "LabValues/BValues", {{"double", {-2.0, -50.0}}}}};
+    json others = stored;
+    others[own + "LabValues/LValues"] = {{"double", {95.0, 54.5}}};
+    json dynamic = aim(2, "Footer/Dynstrip/IT8", charts + "same.txt");
+    dynamic["Footer/Dynstrip/UseDynstrip"] = {{"int", 1}};
+    dynamic["Footer/Dynstrip/DeviceID"] = {{"int", 33}};
+    json esko = aim(4, two, charts + "old.txt");
+    esko["Job/FromEsko"] = {{"int", 1}};
+    importJobs({{1, aim(2, two, "old.txt")},
+                {2, aim(2, two, "same.txt")}, // The same colours.
+                {3, aim(2, two, "/x(TEMP)/other.txt")},
+                {4, aim(2, two, "MKCheck11.txt")},
+                {5, aim(1, "Footer/ControlstripInputProfile", "/p/press.icc")},
+                {6, aim(3, "Remote/UsedICCProfile", "/p/press.icc")},
+                {7, stored},
+                {8, stored},
+                {9, others},
+                {10, dynamic},
+                {11, esko},
+                {12, aim(2, two, "gone.txt")}});
+    const std::string shown = text();
+    const std::regex head("  Matt <b> · (.*)\n([0-9]+) results?,");
+    std::multiset<std::string> series;
+    for (auto at = std::sregex_iterator(shown.begin(), shown.end(), head);
+         at != std::sregex_iterator(); ++at) {
+        series.insert((*at)[2].str() + " " + (*at)[1].str());
+    }
+    EXPECT_EQ(series.size(), 7U) << shown;
+    const auto of = [&](const std::string& beginning) {
+        return std::count_if(series.begin(), series.end(),
+                             [&](const std::string& name) { return name.starts_with(beginning); });
+    };
+    for (const char* beginning :
+         {"1 other.txt · ", "1 MKCheck11.txt · ", "2 press.icc · ",
+          "2 stored references · Contract proof · Bench 3 · Press 2 · target ", "1 gone.txt · "}) {
+        EXPECT_EQ(of(beginning), 1) << beginning << shown;
+    }
+    EXPECT_EQ(of("4 old.txt"), 1) << shown;
+    EXPECT_THAT(shown, HasSubstr("L* +3.20, a* +0.00")); // Job 9: 57.7 for 54.5.
+}
+
+// A run judged by what the file was then, so a file that is replaced begins a series.
+TEST_F(StoreTrend, TakesATargetAsItWasWhenTheJobWasMeasured) {
+    const std::string path = "/server/IT8_CharacterizationData/aim.txt";
+    const auto put = [&](double cyan) {
+        answer({"file", "put", m_folder.write("aim", charted(cyan)), path});
+    };
+    const auto now = [](int secondsAgo) {
+        const std::time_t time = std::time(nullptr) - secondsAgo;
+        std::tm parts{};
+        localtime_r(&time, &parts);
+        char day[32];
+        char clock[32];
+        std::strftime(day, sizeof day, "%Y-%m-%d", &parts);
+        std::strftime(clock, sizeof clock, "%H:%M:%S", &parts);
+        return json{{"Workflow/Verify/MeasurementWorkflow", {{"int", 2}}},
+                    {"Workflow/Verify/CharacterizationData", {{"string", "aim.txt"}}},
+                    {"Remote/Measurement/Date", {{"string", day}}},
+                    {"Remote/Measurement/Time", {{"string", clock}}}};
+    };
+    put(55);
+    const json early = now(0);
+    std::this_thread::sleep_for(std::chrono::milliseconds(2100));
+    put(56);
+    const json late = now(0);
+    importJobs({{1, now(1000)}, {2, early}, {3, late}});
+    const std::string page = report({"-o", "-"}).output;
+    EXPECT_THAT(text(), ContainsRegex("aim.txt · Contract proof · Bench 3 · Press 2 · target "));
+    EXPECT_THAT(page, HasSubstr("\"aim\":\"55.0 -37.0 -50.0\""));
+    EXPECT_THAT(page, HasSubstr("\"aim\":\"56.0 -37.0 -50.0\""));
 }
 
 TEST_F(StoreTrend, CountsTheResultOfASheetOnce) {

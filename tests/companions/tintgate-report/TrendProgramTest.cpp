@@ -1,4 +1,6 @@
+#include <algorithm>
 #include <filesystem>
+#include <sstream>
 #include <string>
 #include <vector>
 
@@ -82,14 +84,18 @@ TEST_F(Trend, ShowsADriftAndLeadsToEachJob) {
         choose(0);)");
     EXPECT_THAT(seen.error, Not(HasSubstr("CONSOLE")));
     for (const char* part :
-         {"<h2 id=\"word\">Drifting: cyan</h2>", "lighter (L* +",
+         {"<h2 id=\"word\">Drifting: cyan</h2>", "lighter (L*&nbsp;+",
           // Each job keeps the tolerance that it was judged by.
           "\"tolerances\":[[0,3.0],[5,2.25]]", "19 of the last 19 failed, most often by Solid cyan",
-          "<b>Solid cyan</b><span>latest 4.75 of 2.25 ΔE00 · 19 of 19 above</span>",
-          "<b>All patches, average</b><span>latest 2.50 of 2.50 ΔE00 · 0 of 19 above</span>",
-          "aria-label=\"Solid cyan: latest 4.75 of 2.25 ΔE00 · 19 of 19 above\"",
-          "<b>Cyan</b><span>Drifting · L*a*b* ", "1–19 of 19</output>",
-          "19 jobs, 6 May 2024 to 24 May 2024: 0 passed, 19 failed",
+          "<b>Solid cyan</b><span>latest job 4.75 of 2.25 ΔE00 · 19 of 19 above</span>",
+          "<b>All patches, average</b><span>latest job 2.50 of 2.50 ΔE00 · 0 of 19 above</span>",
+          "aria-label=\"Solid cyan: latest job 4.75 of 2.25 ΔE00 · 19 of 19 above\"",
+          "<b>Cyan</b><span>Drifting · L*a*b* first jobs ", ", aim 55.0 -37.0 -50.0</span>",
+          // The latest job, and the average that one corrects by, each under its own name.
+          "<span class=\"label\">Latest job</span>4.75<span class=\"unit\"> of 2.25</span>",
+          "<span class=\"label\">Moving average to aim</span><b>6.45 ΔE00</b>",
+          "<span class=\"correction\">L*&nbsp;+7.05, a*&nbsp;+2.00, b*&nbsp;+4.00</span>",
+          "1–19 of 19</output>", "19 jobs, 6 May 2024 to 24 May 2024: 0 passed, 19 failed",
           "<a href=\"./trend-jobs/job-24-strip2-2024-05-24-123456.html\">Größe \"7\" "
           "&lt;/script&gt;",
           "<a href=\"./rooms%20%231/JobID_7/report-strip2-2024-05-07-123456.html\">",
@@ -122,6 +128,99 @@ TEST_F(Trend, TakesWhatTheFiltersLetThrough) {
         EXPECT_EQ(outcome.exitCode, exitCode) << words.back() << outcome.error;
         EXPECT_THAT(outcome.output, HasSubstr(jobs));
     }
+}
+
+// The forms in which measuring programs state a date. What may mean two days counts as unstated.
+TEST(TrendTimes, AreThoseOfTheMeasurementsIfTheyCannotBeMistaken) {
+    const support::ScratchFolder scratch;
+    const std::string result = support::contentsOf(data + "output.json");
+    const std::string undated = "\"path\":\"/m/measured.txt\",\"kind\":\"text\",\"patches\":4,"
+                                "\"description\":null,\"originator\":null,\"created\":";
+    const struct {
+        const char* created;
+        const char* shown; ///< Empty if the file's own time is to stand in.
+    } cases[] = {{"2026-11-25T09:15:00+01:00", "25 November 2026, 09:15"},
+                 {"Wed Nov 25 09:15:07 2026", "25 November 2026, 09:15"},
+                 {"11/21/2026  # Time: 09:15", "21 November 2026, 09:15"},
+                 {"11/05/2026 # Time: 9:15", "5 November 2026, 09:15"},
+                 {"11/21/2026", "21 November 2026, 00:00"},
+                 {"21/11/2026 09:15", "21 November 2026, 09:15"},
+                 {"11/11/2026", "11 November 2026, 00:00"},
+                 {"11/05/2026", ""},
+                 {"2013/10/29", "29 October 2013, 00:00"},
+                 {"August 21, 2018  15:47", "21 August 2018, 15:47"},
+                 {"20.11.2026", "20 November 2026, 00:00"},
+                 {"05.11.2026", ""},
+                 {"31/31/2026", ""},
+                 {"December 2006", ""},
+                 {"11/21/26", ""}};
+    for (const auto& [created, shown] : cases) {
+        const std::string file =
+            scratch.write("dated.json", replaced(result, undated + "null",
+                                                 undated + "\"" + std::string(created) + "\""));
+        const std::string text = report({"--trend", "--text", file}).output;
+        EXPECT_THAT(text, HasSubstr(shown)) << created;
+        EXPECT_EQ(text.find("does not tell its time") != text.npos, *shown == '\0') << created;
+    }
+}
+
+// Results of two versions of a target, two printers and three folders: whatever differs parts them.
+TEST(TrendSeries, JoinNothingThatWasAimedAtOtherColours) {
+    const support::ScratchFolder scratch;
+    const std::string result = support::contentsOf(data + "output.json");
+    const std::string first(64, 'a');
+    const std::string second(64, 'b');
+    const struct {
+        const char* file;
+        std::string identity;
+        std::string printer;
+        const char* path = "/t/aim.txt";
+    } results[] = {{"a/1", first, "P1"},
+                   {"a/2", second, "P1"},
+                   {"b/3", second, "P1"},
+                   {"b/4", second, "P2"},
+                   {"c/5", "", "P1"},
+                   {"c/6", "", "P1"},
+                   {"c/7", first, "P1"},
+                   {"c/8", "", "P1", "/t/other.txt"},
+                   {"c/9", first, "P1", "/elsewhere/aim.txt"}};
+    for (const auto& [file, identity, printer, path] : results) {
+        std::string text = replaced(result, "/t/<img src=x onerror=hostile()>.txt", path);
+        if (!identity.empty()) {
+            text = replaced(text, "\"kind\"", "\"identity\":\"" + identity + "\",\"kind\"");
+        }
+        const std::string measured = "\"path\":\"/m/measured.txt\",";
+        text = replaced(text, measured, measured + "\"printing\":\"" + printer + "\",");
+        scratch.write(std::string(file) + ".json", text);
+    }
+    const auto namesOf = [&](std::vector<std::string> words) {
+        words.insert(words.begin(), {TINTGATE_REPORT, scratch.path("a"), scratch.path("b"),
+                                     scratch.path("c"), "--text"});
+        support::RunOptions options;
+        options.folder = scratch.path();
+        std::vector<std::string> names;
+        std::istringstream lines(support::run(words, options).output);
+        for (std::string line, above; std::getline(lines, line); above = line) {
+            if (line.find(" results, ") != line.npos || line.find(" result, ") != line.npos) {
+                names.push_back(line.substr(0, 1) + above.substr(above.find("  ") + 1));
+            }
+        }
+        std::sort(names.begin(), names.end());
+        return names;
+    };
+    const std::string preset = " · aim.txt · Proof \"A\" <b>";
+    const auto p1 = [&](const char* count, const std::string& rest) {
+        return std::string(count) + " P1" + preset + rest;
+    };
+    EXPECT_THAT(namesOf({}), testing::ElementsAre("1 P1 · other.txt · Proof \"A\" <b>",
+                                                  "1 P2" + preset, p1("2", " · target bbbbbbbb"),
+                                                  p1("2", " · target known by its name only"),
+                                                  p1("3", " · target aaaaaaaa")));
+    const std::vector<std::string> byFolder = namesOf({"--series", "folder"});
+    EXPECT_EQ(byFolder.size(), 7U);
+    EXPECT_THAT(byFolder, testing::Contains("1 a · P1" + preset + " · target bbbbbbbb"));
+    EXPECT_THAT(byFolder, testing::Contains("1 b · P1" + preset));
+    EXPECT_EQ(report({"--store", "/nowhere", "--series", "folder"}).exitCode, 64);
 }
 
 TEST_F(Trend, GoesOnWithoutWhatItCantRead) {

@@ -1,0 +1,75 @@
+// The objects of a CxF3 file: what each one holds, under which conditions it was measured.
+#pragma once
+
+#include <cstdint>
+#include <optional>
+#include <string>
+#include <string_view>
+#include <unordered_map>
+#include <vector>
+
+#include "colour/CxfXml.h"
+#include "colour/DataSet.h"
+
+namespace colour::cxf {
+
+/// A measurement condition of ISO 13655 by its number, 0 to 3.
+inline constexpr std::int8_t unstated = -1;
+
+/// A ColorSpecification.
+struct Specification {
+    Conditions conditions; ///< Illuminant and observer alone.
+    bool usual = true;     ///< They are D50 and 2 degrees, as far as they are stated.
+    std::int8_t condition = unstated;
+    std::optional<int> firstWavelength;
+    std::optional<int> increment;
+    std::string instrument; ///< Maker, model and serial number.
+};
+
+/// One element below an object's ColorValues.
+struct Value {
+    enum Kind : std::uint8_t { Spectrum, Lab, LCh, Xyz };
+    Kind kind = Lab;
+    bool sound = false; ///< The numbers are there and are numbers; a spectrum's text is not read.
+    double numbers[3] = {};                       ///< In the order of the kind's name.
+    pugi::xml_node spectrum;                      ///< Of a Spectrum alone.
+    const Specification* specification = nullptr; ///< Null if it names none that is there.
+    std::int8_t condition = unstated;             ///< Also by the object's type.
+};
+
+/// What the values of an object's DeviceColorValues are.
+enum class DeviceKind : std::uint8_t { None, Cmyk, Rgb, Custom };
+
+struct Object {
+    std::string_view id;
+    std::string_view name;
+    std::size_t firstValue = 0; ///< Into Content::values.
+    std::uint32_t valueCount = 0;
+    DeviceKind deviceKind = DeviceKind::None;
+    bool deviceSound = false; ///< The numbers of `device` are there and are numbers.
+    double device[4] = {};    ///< C, M, Y, K in percent, or R, G, B in percent of their range.
+    pugi::xml_node inks;      ///< The element with spot colours; null if there are none.
+    pugi::xml_node location;  ///< The tags of the place on the sheet; may be null.
+
+    bool hasDevice() const { return deviceKind != DeviceKind::None; }
+    bool hasColour() const { return valueCount > 0; }
+};
+
+/// What the tags of an object's place state. Views point into the document.
+struct Place {
+    std::string position; ///< "page/row/column/"; empty if it is not stated.
+    std::string_view sampleId;
+    std::string_view sampleName;
+};
+Place placeOf(const Document& document, const Object& object);
+
+/// All of a file, in its order. Views and nodes point into the document.
+struct Content {
+    std::unordered_map<std::string_view, Specification> specifications;
+    std::vector<Object> objects; ///< With device values or colours that are known; no others.
+    std::vector<Value> values;
+};
+
+Content contentOf(const Document& document);
+
+} // namespace colour::cxf

@@ -1,0 +1,23 @@
+// Which colours a file asks for, as one short text: equal texts are equal targets.
+#pragma once
+
+#include <string>
+
+#include "colour/ColourFile.h"
+
+namespace colour {
+
+/// 64 hexadecimal digits: SHA-256 over the number of device channels, then for each patch in order
+/// its device values in 1/10000 percent and its L*a*b* in 1/1000, all as 32-bit little-endian
+/// integers. Headers, ids, names, spectra and the file format do not count. A set without colour
+/// values has no identity (empty).
+std::string identityOf(const DataSet& set);
+
+/// The identity of the patches of all combinations of 0, 20, ... 100 percent C, M, Y, K (K varies
+/// fastest) as the profile evaluates them; empty if it can't.
+std::string identityOf(const Profile& profile);
+
+/// Of either kind.
+std::string identityOf(const ColourFile& file);
+
+} // namespace colour

@@ -1,0 +1,258 @@
+#include "companions/tintgate-report/Targets.h"
+
+#include <algorithm>
+#include <cmath>
+#include <ctime>
+#include <sstream>
+
+#include "colour/ColourFile.h"
+#include "colour/Difference.h"
+#include "colour/Identity.h"
+
+namespace reporting {
+namespace {
+
+constexpr const char* storedReferences = "stored references";
+constexpr const char* labNames[] = {"LabValues/LValues", "LabValues/AValues", "LabValues/BValues"};
+constexpr const char* xyzNames[] = {"XYZValues/XValues", "XYZValues/YValues", "XYZValues/ZValues"};
+constexpr const char* cmykNames[] = {"CMYKValues/CValues", "CMYKValues/MValues",
+                                     "CMYKValues/YValues", "CMYKValues/KValues"};
+
+std::string nameOf(const std::string& path) {
+    return path.substr(path.rfind('/') + 1);
+}
+
+std::string inControlCharts(const std::string& install, const std::string& strip) {
+    std::string name = nameOf(strip);
+    name.resize(std::min(name.rfind('.'), name.size()));
+    return install + "/ControlCharts/" + name + ".it8";
+}
+
+std::string characterisation(const std::string& install, const std::string& value) {
+    if (value.empty() || value.find("(TEMP)/") != value.npos) {
+        return value;
+    }
+    std::string folder = install + "/IT8_CharacterizationData/";
+    for (const char* version : {"MKCheck10", "MKCheck11"}) {
+        if (value.find(version) != value.npos) {
+            return folder + "Fogra_" + version + "/" + value;
+        }
+    }
+    return folder + value;
+}
+
+/// Server path of a job's references; empty if the ticket names none.
+std::string pathOf(const store::TicketContent& job, const StripKeys& keys, int strip,
+                   bool hasStored) {
+    const auto text = [&](const std::string& key) { return textOf(job.find(key)); };
+    const auto number = [&](const std::string& key) {
+        return integerOf(job.find(key)).value_or(0);
+    };
+    const std::string install = text("System/InstallFolder");
+    const int workflow = number(keys.own("Workflow/Verify/MeasurementWorkflow"));
+    if (number("Job/FromEsko") == 1 && workflow == 4) {
+        constexpr const char* data = "Workflow/Verify/CharacterizationData";
+        return job.find(data) ? text(data)
+                              : inControlCharts(install, text("Footer/ControlstripFile"));
+    }
+    if (workflow == 1 || (workflow == 3 && !hasStored)) {
+        const std::string own = text(keys.own("Footer/ControlstripInputProfile"));
+        return own.empty() ? text("Remote/UsedICCProfile") : own;
+    }
+    if (strip == 1 && number("Footer/Dynstrip/UseDynstrip") == 1) {
+        return text("Footer/Dynstrip/IT8");
+    }
+    return workflow == 2
+               ? characterisation(install, text(keys.own("Workflow/Verify/CharacterizationData")))
+               : "";
+}
+
+report::InkColours aimsOf(const colour::DataSet& set) {
+    report::InkMeans means;
+    for (std::size_t i = 0; set.hasCmyk() && i < set.patchCount; ++i) {
+        const std::size_t channels = set.channels.size();
+        if (const auto ink = report::inkOf(&set.device[i * channels], channels)) {
+            means.add(*ink, set.lab[i]);
+        }
+    }
+    return means.means();
+}
+
+report::InkColours aimsOf(const colour::Profile& profile) {
+    constexpr double patches[report::inkCount][4] = {
+        {0, 0, 0, 0}, {100, 0, 0, 0}, {0, 100, 0, 0}, {0, 0, 100, 0}, {0, 0, 0, 100}};
+    colour::Lab lab[report::inkCount];
+    report::InkColours aims;
+    if (profile.evaluate(&patches[0][0], report::inkCount, 4, lab) == colour::Failure::None) {
+        std::copy(std::begin(lab), std::end(lab), aims.begin());
+    }
+    return aims;
+}
+
+std::vector<double> percents(const store::TicketContent& job, const std::string& key) {
+    std::vector<double> values;
+    for (const int value : integersOf(job.find(key))) {
+        values.push_back(std::floor(value / 2.55 + 0.5)); // The ticket has 0 to 255.
+    }
+    return values;
+}
+
+/// References in the ticket itself.
+Target targetInTicket(const store::TicketContent& job, const StripKeys& keys, int patches) {
+    const auto count = static_cast<std::size_t>(patches);
+    const auto columns = [&](const char* const(&names)[3]) {
+        std::vector<std::vector<double>> read;
+        for (const char* name : names) {
+            read.push_back(doublesOf(job.find(keys.measured(std::string("Reference/") + name))));
+            read.back().resize(count);
+        }
+        return read;
+    };
+    const bool hasLab = job.find(keys.measured("Reference/LabValues/LValues")) != nullptr;
+    const auto colours = hasLab ? columns(labNames) : columns(xyzNames);
+    colour::DataSet set;
+    set.patchCount = count;
+    set.deviceSpace = colour::DeviceSpace::Cmyk;
+    set.channels = {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
+    set.device.resize(count * set.channels.size());
+    for (std::size_t ink = 0; ink < set.channels.size(); ++ink) {
+        const auto column =
+            percents(job, keys.measured(std::string("Reference/") + cmykNames[ink]));
+        for (std::size_t i = 0; i < std::min(column.size(), count); ++i) {
+            set.device[i * set.channels.size() + ink] = column[i];
+        }
+    }
+    for (std::size_t i = 0; i < count; ++i) {
+        const double values[] = {colours[0][i], colours[1][i], colours[2][i]};
+        set.lab.push_back(hasLab ? colour::Lab{values[0], values[1], values[2]}
+                                 : colour::labFromXyz({values[0], values[1], values[2]}));
+    }
+    return {storedReferences, colour::identityOf(set), aimsOf(set)};
+}
+
+/// A time of the room's own clock as seconds since 1970 in UTC.
+std::int64_t utcOf(std::int64_t roomTime) {
+    const std::time_t seconds = roomTime;
+    std::tm parts{};
+    gmtime_r(&seconds, &parts);
+    parts.tm_isdst = -1;
+    return std::mktime(&parts);
+}
+
+} // namespace
+
+std::vector<std::string> Targets::keys(const StripKeys& strip) {
+    std::vector<std::string> names = {"Job/FromEsko",
+                                      "System/InstallFolder",
+                                      "Footer/ControlstripFile",
+                                      "Footer/Dynstrip/UseDynstrip",
+                                      "Footer/Dynstrip/IT8",
+                                      "Remote/UsedICCProfile",
+                                      "Workflow/Verify/CharacterizationData",
+                                      strip.own("Workflow/Verify/MeasurementWorkflow"),
+                                      strip.own("Workflow/Verify/CharacterizationData"),
+                                      strip.own("Footer/ControlstripInputProfile"),
+                                      strip.measured("Status"),
+                                      strip.measured("Reference/Numpatches")};
+    for (const auto* group : {labNames, xyzNames}) {
+        for (int i = 0; i < 3; ++i) {
+            names.push_back(strip.measured(std::string("Reference/") + group[i]));
+        }
+    }
+    for (const char* name : cmykNames) {
+        names.push_back(strip.measured(std::string("Reference/") + name));
+    }
+    return names;
+}
+
+Target Targets::of(const store::TicketContent& job, int strip, std::int64_t time) {
+    const StripKeys keys(strip);
+    const auto number = [&](const std::string& key) {
+        return integerOf(job.find(key)).value_or(0);
+    };
+    const int patches = number(keys.measured("Reference/Numpatches"));
+    constexpr int mostPatches = 1'000'000;
+    const bool hasStored = number(keys.own("Workflow/Verify/MeasurementWorkflow")) == 3 &&
+                           number(keys.measured("Status")) > 0 && patches > 0 &&
+                           patches <= mostPatches;
+    const std::string path = pathOf(job, keys, strip, hasStored);
+    if (!path.empty()) {
+        return ofFile(path, time);
+    }
+    return hasStored ? targetInTicket(job, keys, patches) : Target{};
+}
+
+Target Targets::ofFile(const std::string& path, std::int64_t time) {
+    std::vector<Content>& contents = contentsOf(path);
+    if (contents.empty()) {
+        return {nameOf(path), path, {}};
+    }
+    const std::int64_t utc = utcOf(time);
+    auto at =
+        std::upper_bound(contents.begin(), contents.end(), utc,
+                         [](std::int64_t wanted, const Content& c) { return wanted < c.time; });
+    Content& content = at == contents.begin() ? *at : *(at - 1);
+    if (!content.target) {
+        content.target = read(path, content.version);
+    }
+    return *content.target;
+}
+
+std::vector<Targets::Content>& Targets::contentsOf(const std::string& path) {
+    const auto [at, fresh] = m_contents.try_emplace(path);
+    std::vector<Content>& contents = at->second;
+    if (!fresh) {
+        return contents;
+    }
+    if (!m_times) {
+        m_times.emplace();
+        for (const store::FileEntry& entry : m_store.files()) {
+            m_times->emplace(entry.path, entry.time);
+        }
+    }
+    try {
+        for (const store::FileVersion& version : m_store.versions(path)) {
+            contents.push_back({version.time, version.number, std::nullopt});
+        }
+    } catch (const store::StoreFailure& failure) {
+        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath) {
+            throw;
+        }
+    }
+    const std::string inStore = path.substr(std::min(path.find_first_not_of('/'), path.size()));
+    if (const auto current = m_times->find(inStore); current != m_times->end()) {
+        contents.push_back({current->second, 0, std::nullopt});
+    }
+    std::stable_sort(contents.begin(), contents.end(),
+                     [](const Content& a, const Content& b) { return a.time < b.time; });
+    return contents;
+}
+
+Target Targets::read(const std::string& path, int version) {
+    // What can't be read is no other target than before: its path and version stand for it.
+    Target target{nameOf(path), path + (version != 0 ? " " + std::to_string(version) : ""), {}};
+    std::ostringstream bytes;
+    try {
+        if (version != 0) {
+            m_store.getVersion(path, version, bytes);
+        } else {
+            m_store.getFile(path, bytes);
+        }
+    } catch (const store::StoreFailure& failure) {
+        if (failure.fault != store::Fault::NoFile) {
+            throw;
+        }
+        return target;
+    }
+    colour::ColourFile file;
+    if (colour::readColourFile(std::move(bytes).str(), {}, file) != colour::Failure::None) {
+        return target;
+    }
+    if (std::string identity = colour::identityOf(file); !identity.empty()) {
+        target.key = std::move(identity);
+    }
+    target.aims = file.profile ? aimsOf(*file.profile) : aimsOf(*file.set);
+    return target;
+}
+
+} // namespace reporting
