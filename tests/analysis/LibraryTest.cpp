@@ -78,7 +78,8 @@ TEST_F(Library, WritesSoundResults) {
         int formula;
         const char* shows;
     } cases[] = {
-        {fogra, sets + "TR002.ti3", "", 5, "\"patchesUnpaired\""},
+        {fogra, sets + "TR002.ti3", "", 5, "\"unpairedTarget\": 755"},
+        {sets + "TR002.ti3", fogra, "", 5, "\"patchesUnpaired\""},
         {profile, few, "", 2, "\"selection\": \"measurement\""},
         {few, profile, "", 3, "\"measurement\": \"profile\""},
         {profile, profile, strip, 4, "\"Gr\\u00e4y\""},
