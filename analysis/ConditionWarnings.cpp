@@ -23,41 +23,47 @@ Side sideOf(const char* role, const Input& input) {
         side.calculated = input.file.set->calculated;
     }
     side.counted = side.stated;
-    if (side.calculated || side.counted.illuminant.empty())
+    if (side.calculated || side.counted.illuminant.empty()) {
         side.counted.illuminant = usualIlluminant;
-    if (side.calculated || side.counted.observer.empty())
+    }
+    if (side.calculated || side.counted.observer.empty()) {
         side.counted.observer = usualObserver;
+    }
     return side;
 }
 
 /// "D65, 10 degrees"
 std::string lightOf(const Conditions& conditions) {
     std::string text = conditions.illuminant;
-    if (!conditions.observer.empty())
+    if (!conditions.observer.empty()) {
         text += (text.empty() ? "" : ", ") + conditions.observer + " degrees";
+    }
     return text;
 }
 
 void warnOfLight(const Side& side, std::vector<Warning>& warnings) {
     const std::string what = std::string("The ") + side.role + " states " + lightOf(side.stated);
-    if (side.calculated)
+    if (side.calculated) {
         warnings.push_back(
             {"calculatedFromSpectra", what + "; its colours were calculated from its spectra for "
                                              "D50, 2 degrees instead."});
-    else if (side.counted.illuminant != usualIlluminant || side.counted.observer != usualObserver)
+    } else if (side.counted.illuminant != usualIlluminant ||
+               side.counted.observer != usualObserver) {
         warnings.push_back({"otherLightOrObserver",
                             what + " and has no spectra to calculate from, so its colours are not "
                                    "those for D50, 2 degrees that the tolerances are meant for."});
+    }
 }
 
 void warnOfDifference(const Side& target, const Side& measured, std::vector<Warning>& warnings) {
     const auto warn = [&](const char* code, const char* what, const std::string& a,
                           const std::string& b, const char* unit) {
-        if (a != b)
+        if (a != b) {
             warnings.push_back({code,
                                 std::string("Target and measurement are for different ") + what +
                                     ": " + a + " and " + b + unit + ".",
                                 true});
+        }
     };
     warn("illuminantsDiffer", "illuminants", target.counted.illuminant, measured.counted.illuminant,
          "");
@@ -70,27 +76,32 @@ void warnOfMeasuring(const Side& target, const Side& measured,
                      std::vector<Warning>& warnings) {
     const std::string& ofTarget = target.stated.measurement;
     const std::string& ofMeasured = measured.stated.measurement;
-    if (!ofTarget.empty() && !ofMeasured.empty() && ofTarget != ofMeasured)
+    if (!ofTarget.empty() && !ofMeasured.empty() && ofTarget != ofMeasured) {
         warnings.push_back({"measurementConditionsDiffer",
                             "Target and measurement state different measurement conditions: " +
                                 ofTarget + " and " + ofMeasured + ".",
                             required});
+    }
     const int wanted = preset.illuminationCondition;
-    if (wanted < 0 || wanted > largestMeasuringCondition)
+    if (wanted < 0 || wanted > largestMeasuringCondition) {
         return;
+    }
     const std::string asked = "M" + std::to_string(wanted);
-    for (const Side* side : {&target, &measured})
+    for (const Side* side : {&target, &measured}) {
         if (const std::string& stated = side->stated.measurement;
-            !stated.empty() && stated != asked)
+            !stated.empty() && stated != asked) {
             warnings.push_back({"presetConditionDiffers",
                                 "The preset is meant for the measurement condition " + asked +
                                     ", and the " + side->role + " states " + stated + ".",
                                 required});
-    if (required && ofMeasured.empty())
+        }
+    }
+    if (required && ofMeasured.empty()) {
         warnings.push_back({"measurementConditionUnknown",
                             "The preset requires the measurement condition " + asked +
                                 ", and the measurement states none.",
                             true});
+    }
 }
 
 } // namespace

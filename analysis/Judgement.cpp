@@ -54,7 +54,9 @@ Statistics statisticsOf(const Comparison& c, std::size_t& worst) {
         return *nth;
     };
     s.percentile95 = at(rank95(s.count) - 1);
-    s.median = (at((s.count - 1) / 2) + at(s.count / 2)) / 2;
+    const double lower = at((s.count - 1) / 2);
+    const auto above = sorted.begin() + static_cast<std::ptrdiff_t>(s.count / 2);
+    s.median = s.count % 2 == 1 ? lower : (lower + *std::min_element(above, sorted.end())) / 2;
     return s;
 }
 

@@ -6,7 +6,6 @@
 
 #include <algorithm>
 #include <array>
-#include <cmath>
 #include <cstdint>
 
 namespace analysis {
@@ -40,8 +39,9 @@ struct List {
     std::array<std::uint32_t, outerGamutCount + 1> keys{};
     std::size_t count = 0;
     constexpr void add(std::uint32_t key) {
-        if (count < keys.size())
+        if (count < keys.size()) {
             keys[count++] = key;
+        }
     }
 };
 
@@ -49,19 +49,26 @@ constexpr List listOfAll() {
     List list;
     list.add(keyOf(0, 0, 0, 0));
     for (int a = 0; a < 3; ++a) {
-        for (const int x : ramp)
+        for (const int x : ramp) {
             list.add(keyOfPair(a, x, (a + 1) % 3, 0, 0));
-        for (int b = a + 1; b < 3; ++b)
-            for (const int x : pairs)
-                for (const int y : pairs)
+        }
+        for (int b = a + 1; b < 3; ++b) {
+            for (const int x : pairs) {
+                for (const int y : pairs) {
                     list.add(keyOfPair(a, x, b, y, 0));
-        for (const auto& [black, second] : withBlack)
-            for (const int x : second)
+                }
+            }
+        }
+        for (const auto& [black, second] : withBlack) {
+            for (const int x : second) {
                 for (int b = 0; b < 3; ++b) {
                     const bool once = x == 0 ? b == (a + 1) % 3 : x == 100 ? b > a : b != a;
-                    if (x >= 0 && once)
+                    if (x >= 0 && once) {
                         list.add(keyOfPair(a, 100, b, x, black));
+                    }
                 }
+            }
+        }
     }
     std::sort(list.keys.begin(), list.keys.begin() + list.count);
     return list;
@@ -70,24 +77,25 @@ constexpr List listOfAll() {
 constexpr List all = listOfAll();
 static_assert(all.count == outerGamutCount);
 
-/// The whole percent within 0.5 of a value that is a level of an ink; of two the level. -1: none.
-constexpr std::array<bool, 101> levels = [] {
+constexpr std::array<bool, 101> isLevel = [] {
     std::array<bool, 101> is{};
     is[0] = true;
-    for (const int level : ramp)
+    for (const int level : ramp) {
         is[static_cast<std::size_t>(level)] = true;
+    }
     return is;
 }();
 
+/// The level of an ink within 0.5 of a value, or -1. A value of a half is near two whole numbers.
 int levelOf(double value) {
-    if (!(value >= -0.5 && value <= 100.5))
+    if (!(value >= -0.5 && value <= 100.5)) {
         return -1;
-    const int up = static_cast<int>(std::floor(value + 0.5));
-    const int down = static_cast<int>(std::ceil(value - 0.5));
-    for (const int level : {up, down})
-        if (level <= 100 && levels[static_cast<std::size_t>(level)])
-            return level;
-    return -1;
+    }
+    const int up = static_cast<int>(value + 0.5); // below 0 it is cut to 0 as well
+    if (up <= 100 && isLevel[static_cast<std::size_t>(up)]) {
+        return up;
+    }
+    return up > 0 && up - value == 0.5 && isLevel[static_cast<std::size_t>(up - 1)] ? up - 1 : -1;
 }
 
 } // namespace
@@ -96,14 +104,16 @@ std::optional<std::size_t> outerGamutEntry(const double* cmyk) {
     int inks[4];
     for (int i = 0; i < 4; ++i) {
         inks[i] = levelOf(cmyk[i]);
-        if (inks[i] < 0)
+        if (inks[i] < 0) {
             return std::nullopt;
+        }
     }
     const std::uint32_t key = keyOf(inks[0], inks[1], inks[2], inks[3]);
     const auto end = all.keys.begin() + all.count;
     const auto found = std::lower_bound(all.keys.begin(), end, key);
-    if (found == end || *found != key)
+    if (found == end || *found != key) {
         return std::nullopt;
+    }
     return static_cast<std::size_t>(found - all.keys.begin());
 }
 

@@ -27,46 +27,55 @@ bool near(double value, double wanted) {
 }
 
 bool isGrey(const double* cmyk) {
+    if (std::abs(cmyk[1] - cmyk[2]) > 2 * deviceTolerance) { // magenta and yellow are alike in all
+        return false;
+    }
     return std::any_of(std::begin(greyTriplets), std::end(greyTriplets), [&](const double* grey) {
         return near(cmyk[0], grey[0]) && near(cmyk[1], grey[1]) && near(cmyk[2], grey[2]);
     });
 }
 
-/// Kinds of a patch by process inks alone.
-KindSet kindsOfProcess(const double* cmyk) {
+/// Kinds of a patch by process inks alone, most of them by the inks that are 0 or 100.
+KindSet kindsOfProcess(const double* cmyk, std::bitset<outerGamutCount>& outerGamut) {
+    constexpr unsigned c = 1, m = 2, y = 4, k = 8;
     unsigned none = 0;
     unsigned full = 0;
     for (unsigned ink = 0; ink < 4; ++ink) {
         none |= near(cmyk[ink], 0) ? 1u << ink : 0;
         full |= near(cmyk[ink], 100) ? 1u << ink : 0;
     }
-    const bool pure = (none | full) == 15; // every ink is either 0 or 100
-    const auto isPure = [&](unsigned inks) { return pure && full == inks; };
-    constexpr unsigned c = 1, m = 2, y = 4, k = 8;
-
-    if (isPure(0))
-        return kind(Patches::Paper);
     KindSet kinds = 0;
-    constexpr struct {
-        unsigned inks;
-        KindSet kinds;
-    } pureKinds[] = {
-        {c, kind(Patches::SolidCyan) | kind(Patches::Solids) | kind(Patches::ChromaticSolids)},
-        {m, kind(Patches::SolidMagenta) | kind(Patches::Solids) | kind(Patches::ChromaticSolids)},
-        {y, kind(Patches::SolidYellow) | kind(Patches::Solids) | kind(Patches::ChromaticSolids)},
-        {k, kind(Patches::SolidBlack) | kind(Patches::Solids)},
-        {m | y, kind(Patches::Red) | kind(Patches::Secondaries)},
-        {c | y, kind(Patches::Green) | kind(Patches::Secondaries)},
-        {c | m, kind(Patches::Blue) | kind(Patches::Secondaries)},
-    };
-    for (const auto& entry : pureKinds)
-        if (isPure(entry.inks))
-            kinds |= entry.kinds;
-    if (none & k) {
-        if (none & (c | m | y))
+    if ((none | full) == (c | m | y | k)) {
+        constexpr struct {
+            unsigned inks;
+            KindSet kinds;
+        } pureKinds[] = {
+            {0, kind(Patches::Paper)},
+            {c, kind(Patches::SolidCyan) | kind(Patches::Solids) | kind(Patches::ChromaticSolids)},
+            {m,
+             kind(Patches::SolidMagenta) | kind(Patches::Solids) | kind(Patches::ChromaticSolids)},
+            {y,
+             kind(Patches::SolidYellow) | kind(Patches::Solids) | kind(Patches::ChromaticSolids)},
+            {k, kind(Patches::SolidBlack) | kind(Patches::Solids)},
+            {m | y, kind(Patches::Red) | kind(Patches::Secondaries)},
+            {c | y, kind(Patches::Green) | kind(Patches::Secondaries)},
+            {c | m, kind(Patches::Blue) | kind(Patches::Secondaries)},
+        };
+        for (const auto& entry : pureKinds) {
+            kinds |= full == entry.inks ? entry.kinds : 0;
+        }
+    }
+    const bool isPaper = kinds == kind(Patches::Paper);
+    if ((none & (c | m | y)) != 0) { // never a grey, which has all three
+        if ((none & k) != 0 && !isPaper) {
             kinds |= kind(Patches::SurfaceGamut);
-        if (isGrey(cmyk))
-            kinds |= kind(Patches::Greys);
+        }
+        if (const auto entry = outerGamutEntry(cmyk)) {
+            outerGamut.set(*entry);
+            kinds |= kind(Patches::OuterGamut);
+        }
+    } else if ((none & k) != 0 && isGrey(cmyk)) {
+        kinds |= kind(Patches::Greys);
     }
     return kinds;
 }
@@ -80,16 +89,12 @@ KindSet kindsOf(const double* device, std::size_t channels,
     const auto inked = static_cast<std::size_t>(end - spots) -
                        static_cast<std::size_t>(std::count_if(spots, end, off));
     if (inked == 0) {
-        KindSet kinds = kindsOfProcess(device);
-        if (const auto entry = outerGamutEntry(device)) {
-            outerGamut.set(*entry);
-            kinds |= kind(Patches::OuterGamut);
-        }
-        return kinds;
+        return kindsOfProcess(device, outerGamut);
     }
     if (inked == 1 && std::all_of(device, spots, off) &&
-        std::any_of(spots, end, [](double value) { return near(value, 100); }))
+        std::any_of(spots, end, [](double value) { return near(value, 100); })) {
         return kind(Patches::Spots);
+    }
     return 0;
 }
 
@@ -97,14 +102,17 @@ KindSet kindsOf(const double* device, std::size_t channels,
 
 Selections selectionsOf(const Comparison& c) {
     Selections selections;
-    if (!c.devices || !c.devices->file.set->hasCmyk())
+    if (!c.devices || !c.devices->file.set->hasCmyk()) {
         return selections;
+    }
     const std::size_t channels = c.devices->file.set->channels.size();
     for (std::size_t patch = 0; patch < c.patchCount(); ++patch) {
         KindSet kinds = kindsOf(c.deviceOf(patch), channels, selections.outerGamut);
-        for (std::size_t i = 0; kinds; ++i, kinds >>= 1)
-            if (kinds & 1)
+        for (std::size_t i = 0; kinds; ++i, kinds >>= 1) {
+            if (kinds & 1) {
                 selections.lists[i].push_back(patch);
+            }
+        }
     }
     return selections;
 }

@@ -12,6 +12,7 @@ struct Lab {
     double L = 0;
     double a = 0;
     double b = 0;
+    bool operator==(const Lab&) const = default;
 };
 
 /// CIE XYZ under D50 for the 2 degree observer; Y of the perfect diffuser is 100.
