@@ -345,8 +345,7 @@ void addRepeats(Model& model, const Result& result) {
     const Repeats& repeats = result.repeats;
     if (repeats.patches == 0 || !repeats.largestDistance)
         return;
-    model.statistics.emplace_back("Measured repeatedly",
-                                  counted(repeats.patches, "patch", "patches"));
+    model.statistics.emplace_back("Read repeatedly", std::to_string(repeats.patches));
     model.statistics.emplace_back("Spread of repeats", fixedText(*repeats.largestDistance, 2));
 }
 

@@ -215,6 +215,7 @@
   }
 
   function showPatches() {
+    byId("patches").classList.toggle("relabelled", isRelabelled);
     showHeadings();
     showRows();
     byId("find").addEventListener("input", choose);
