@@ -248,10 +248,12 @@ Pairing pairByDevice(const DataSet& left, const DataSet& right) {
     return pairing;
 }
 
-bool allDiffer(const std::vector<std::string>& labels) {
+/// True if labels tell patches apart: at most one in ten repeats another, as paper does in a wedge.
+bool mostlyDiffer(const std::vector<std::string>& labels) {
     std::vector<std::string_view> sorted(labels.begin(), labels.end());
     std::sort(sorted.begin(), sorted.end());
-    return std::adjacent_find(sorted.begin(), sorted.end()) == sorted.end();
+    const auto different = std::unique(sorted.begin(), sorted.end()) - sorted.begin();
+    return static_cast<std::size_t>(different) * 10 >= labels.size() * 9;
 }
 
 /// Pairs by the labels of one kind on each side.
@@ -295,10 +297,10 @@ Pairing pairByBestLabels(const DataSet& left, const DataSet& right) {
         if (leftLabels.empty() || rightLabels.empty())
             continue;
         Pairing pairing = pairByLabels(leftLabels, rightLabels);
-        // Ids are often no more than the numbers of the rows, names that differ are meant.
+        // Ids are often no more than the numbers of the rows; names that differ are meant.
         const bool better =
             pairing.paired > best.paired || (i == names && pairing.paired == best.paired &&
-                                             allDiffer(leftLabels) && allDiffer(rightLabels));
+                                             mostlyDiffer(leftLabels) && mostlyDiffer(rightLabels));
         if (better) {
             best = std::move(pairing);
             bestAt = i;

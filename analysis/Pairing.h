@@ -45,8 +45,8 @@ struct Pairing {
 /// values are other patches, whatever their ids. They are compared at 0.0001 percent, what is left
 /// at 0.01 and then at 1, since tickets keep two decimals on the first strip and whole percents on
 /// the second. Without such values labels decide: of the four combinations of ids and names the one
-/// that pairs most rows, and of two that pair equally many the names, if no name of either set
-/// repeats, else the earlier of id to id, name to name, id to name, name to id. If the sets have no
+/// that pairs most rows, and of two that pair equally many the names, if nine in ten of either set
+/// differ, else the earlier of id to id, name to name, id to name, name to id. If the sets have no
 /// label in common, their order decides, provided that they are of one size or that one of them has
 /// neither ids nor names. `paired` is 0 if nothing goes together.
 ///
