@@ -218,7 +218,7 @@ std::string patches(std::size_t count) {
     return std::to_string(count) + (count == 1 ? " patch" : " patches");
 }
 
-/// How the patches of one side were found, where that leaves a doubt.
+/// Warns of ways of finding the patches of one side that leave a doubt.
 void warnOfPairing(Comparison& c, const Input& side) {
     const std::string role = roleOf(c, side);
     const Pairing& pairing = side.pairing;

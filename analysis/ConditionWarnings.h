@@ -11,8 +11,8 @@ namespace analysis {
 /// Compares what both sides state of illuminant and observer, and what both sides and the preset
 /// state of the measuring condition (M0 to M3).
 ///
-/// A side that states no illuminant or observer counts as D50, 2 degrees, and so does one whose
-/// values were calculated from spectra. The verdict is kept open by illuminants or observers that
+/// A side that states no illuminant or observer counts as D50, 2 degrees. So does a side with
+/// values calculated from spectra. The verdict is kept open by illuminants or observers that
 /// differ, and by a measuring condition that the preset requires and does not find.
 std::vector<Warning> conditionWarnings(const Comparison& comparison,
                                        const tolerancePresetParameterRecord& preset,

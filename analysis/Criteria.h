@@ -60,8 +60,8 @@ struct Criterion {
     Statistic statistic;
 };
 
-/// All criteria, by rising index; after them those without an entry, whose settings are in
-/// PresetOptions::named. The indices that are absent have no meaning: their tolerances are ignored
+/// All criteria, by rising index. After them come those without an entry; PresetOptions::named has
+/// their settings. The indices that are absent have no meaning: their tolerances are ignored
 /// and their approvals are false.
 ///
 /// The server's table of results fixes which of its entries take which value: values 0 to 7 go with

@@ -50,8 +50,8 @@ struct Pairing {
 /// label in common, their order decides, provided that they are of one size or that one of them has
 /// neither ids nor names. `paired` is 0 if nothing goes together.
 ///
-/// A row left over whose key is that of a paired row of its own set is a repeat, and pairs with the
-/// partners of these in turn. Repeats of the left set get a `partner`, without counting as
+/// A row left over that has the key of paired rows of its own set is a repeat. It pairs with the
+/// partners of these rows in turn. Repeats of the left set get a `partner`, without counting as
 /// `paired`; those of the right set are in `again`.
 ///
 /// REQUIRES: fewer than 2^32 - 1 rows a set.

@@ -29,7 +29,7 @@ struct Selections {
     }
 };
 
-/// Sorts the patches of a comparison. All lists are empty where no file has process colours.
+/// Sorts the patches of a comparison. All lists are empty if no file has process colours.
 Selections selectionsOf(const Comparison& comparison);
 
 } // namespace analysis

@@ -100,8 +100,8 @@ std::vector<std::vector<std::uint32_t>> severalOf(const Comparison& c, std::size
     return several;
 }
 
-/// Of some patches those that stand for different rows of a file, the first of each. Where the file
-/// is a profile its values are alike, and one is enough.
+/// The patches that are of different rows of a file, the first of each row. A profile gives equal
+/// values for all of them, so one is enough.
 std::vector<std::uint32_t> differentRows(const Input& side,
                                          const std::vector<std::uint32_t>& patches) {
     if (!side.file.set) {

@@ -230,7 +230,7 @@ void writeColumns(JsonWriter& json, const Comparison& c) {
     json.endArray();
 }
 
-/// The labels of a patch on the sheet, where they are not those that its row begins with.
+/// The labels of a patch on the sheet, unless its row already begins with them.
 void writeMeasuredLabels(JsonWriter& json, const DataSet& selection, std::size_t selectedRow,
                          const DataSet& measurement, std::size_t measuredRow) {
     const std::string_view id = labelOf(measurement.ids, measuredRow);

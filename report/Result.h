@@ -110,7 +110,7 @@ struct Result {
 };
 
 /// Reads a whole result, patches row by row without a tree of them. Members that older versions of
-/// the library did not write have their initial values. Nothing where the text is no
+/// the library did not write have their initial values. Nothing if the text is no
 /// result of a format that this version knows; `problem` then says why.
 std::optional<Result> readResult(std::string_view json, std::string& problem);
 

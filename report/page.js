@@ -95,7 +95,7 @@
   const byNumber = (get) => (a, b) => (get(a) ?? -Infinity) - (get(b) ?? -Infinity);
   const channels = data.channels.map((name) => name.replace(/^[A-Z0-9]+_(?=.)/, "")).join(" ");
 
-  // Labels of the sheet are left out of rows where they are those of the target.
+  // A row has labels of the sheet only if they differ from those of the target.
   const sheetId = (row) => (row.length > SHEET_ID ? row[SHEET_ID] : row[ID]);
   const sheetName = (row) => (row.length > SHEET_ID ? row[SHEET_NAME] : row[NAME]);
   const isRelabelled = data.rows.some((row) => row.length > SHEET_ID);
