@@ -1,8 +1,12 @@
 #include "analysis/Comparison.h"
 
 #include <algorithm>
+#include <cmath>
+#include <map>
 
 #include "ExitCodes.h"
+#include "analysis/PatchKinds.h"
+#include "analysis/Repeats.h"
 #include "analysis/Status.h"
 #include "analysis/Text.h"
 
@@ -108,8 +112,57 @@ int pair(const Comparison& c, Input& input) {
     return input.pairing.paired > 0 ? exitDone : exitNothingToPair;
 }
 
-bool has(const Input& input, std::uint32_t selectedRow) {
-    return input.file.profile || input.pairing.partner[selectedRow] != noRow;
+/// A CMYK profile knows nothing of inks beside the four.
+bool isProcessOnly(const DataSet& set, std::uint32_t row) {
+    const std::size_t channels = set.channels.size();
+    const double* const device = &set.device[row * channels];
+    return std::all_of(device + 4, device + channels,
+                       [](double value) { return std::abs(value) <= deviceTolerance; });
+}
+
+bool has(const Comparison& c, const Input& input, std::uint32_t selectedRow) {
+    if (input.file.profile)
+        return isProcessOnly(*c.selection->file.set, selectedRow);
+    return input.pairing.partner[selectedRow] != noRow;
+}
+
+/// The k-th of the rows that a file has for a row of the selection: its partner, then the repeats,
+/// then from the first on again.
+std::uint32_t rowInTurn(const Input& input, std::uint32_t selectedRow,
+                        const std::vector<std::uint32_t>& again, std::size_t k) {
+    if (!input.file.set)
+        return noRow;
+    k %= again.size() + 1;
+    return k == 0 ? input.pairing.partner[selectedRow] : again[k - 1];
+}
+
+void addPatch(Comparison& c, std::uint32_t selectedRow, std::uint32_t targetRow,
+              std::uint32_t measuredRow) {
+    c.selectedRow.push_back(selectedRow);
+    if (c.target.file.set)
+        c.target.rows.push_back(targetRow);
+    if (c.measurement.file.set)
+        c.measurement.rows.push_back(measuredRow);
+}
+
+/// Every row that a file has beside the partner of a row of the selection makes a further patch.
+void addRepeatedRows(Comparison& c) {
+    struct Again {
+        std::vector<std::uint32_t> target, measurement;
+    };
+    std::map<std::uint32_t, Again> repeats;
+    for (const RowPair& pair : c.target.pairing.again)
+        repeats[pair.left].target.push_back(pair.right);
+    for (const RowPair& pair : c.measurement.pairing.again)
+        repeats[pair.left].measurement.push_back(pair.right);
+    for (const auto& [row, again] : repeats) {
+        if (!has(c, c.target, row) || !has(c, c.measurement, row))
+            continue;
+        const std::size_t count = std::max(again.target.size(), again.measurement.size());
+        for (std::size_t k = 1; k <= count; ++k)
+            addPatch(c, row, rowInTurn(c.target, row, again.target, k),
+                     rowInTurn(c.measurement, row, again.measurement, k));
+    }
 }
 
 /// The patches are those of the selection that both sides have.
@@ -125,12 +178,17 @@ int selectPatches(Comparison& c) {
 
     const auto rows = static_cast<std::uint32_t>(c.selection->file.set->patchCount);
     c.selectedRow.reserve(rows);
+    for (Input* side : {&c.target, &c.measurement})
+        if (side->file.set)
+            side->rows.reserve(rows);
     for (std::uint32_t row = 0; row < rows; ++row) {
-        if (has(c.target, row) && has(c.measurement, row))
-            c.selectedRow.push_back(row);
+        if (has(c, c.target, row) && has(c, c.measurement, row))
+            addPatch(c, row, rowInTurn(c.target, row, {}, 0), rowInTurn(c.measurement, row, {}, 0));
         else
             c.selection->unpaired.push_back(row);
     }
+    addRepeatedRows(c);
+    c.patchSet.rows = c.patchSet.file.set ? c.selectedRow : std::vector<std::uint32_t>();
     // A patch set picks from the files, so what it leaves there is not missed.
     if (c.selection == &c.target && c.measurement.file.set)
         c.measurement.unpaired =
@@ -144,7 +202,7 @@ int labOf(const Comparison& c, const Input& side, std::vector<Lab>& lab) {
     lab.resize(count);
     if (side.file.set) {
         for (std::size_t i = 0; i < count; ++i)
-            lab[i] = side.file.set->lab[c.rowOf(side, i)];
+            lab[i] = side.file.set->lab[side.rows[i]];
         return exitDone;
     }
     const DataSet& selection = *c.selection->file.set;
@@ -160,46 +218,41 @@ std::string patches(std::size_t count) {
     return std::to_string(count) + (count == 1 ? " patch" : " patches");
 }
 
-void warnOfPairing(Comparison& c) {
-    for (const Input* input : {&c.target, &c.measurement}) {
-        const std::string role = roleOf(c, *input);
-        if (input->pairing.by == PairedBy::Order)
-            c.warnings.push_back(
-                {"pairedByOrder", "The patches of the " + role +
-                                      " were taken in their order: neither device values nor ids "
-                                      "could tell them apart."});
-        if (input->pairing.rounded > 0)
-            c.warnings.push_back({"pairedByRoundedValues",
-                                  patches(input->pairing.rounded) + " of the " + role +
-                                      " matched in whole percents of the device values only."});
-    }
-    for (const Input* input : {&c.target, &c.measurement, &c.patchSet})
-        if (!input->unpaired.empty())
-            c.warnings.push_back({"patchesUnpaired", patches(input->unpaired.size()) + " of the " +
-                                                         roleOf(c, *input) +
-                                                         " had no counterpart."});
+/// Warns of ways of finding the patches of one side that leave a doubt.
+void warnOfPairing(Comparison& c, const Input& side) {
+    const std::string role = roleOf(c, side);
+    const Pairing& pairing = side.pairing;
+    if (pairing.spacesDiffer)
+        c.warnings.push_back({"deviceSpacesDiffer",
+                              "The device values of the " + role + " and of the " +
+                                  roleOf(c, *c.selection) +
+                                  " are of different kinds, so nothing proves that equal labels "
+                                  "or places mean equal patches.",
+                              true});
+    if (pairing.by == PairedBy::Order)
+        c.warnings.push_back({"pairedByOrder",
+                              "The patches of the " + role +
+                                  " were taken in their order: neither device values nor ids "
+                                  "could tell them apart.",
+                              true});
+    if (pairing.by == PairedBy::Labels && (pairing.spacesDiffer || pairing.contradicted > 0))
+        c.warnings.push_back(
+            {"pairedByLabels",
+             "The patches of the " + role + " were found by their labels alone" +
+                 (pairing.contradicted > 0 ? ", and ids and names contradict each other for " +
+                                                 patches(pairing.contradicted) + "."
+                                           : ", although both files have device values.")});
+    if (pairing.rounded > 0)
+        c.warnings.push_back(
+            {"pairedByRoundedValues", patches(pairing.rounded) + " of the " + role +
+                                          " matched in whole percents of the device values only."});
 }
 
-colour::Conditions conditionsOf(const Input& input) {
-    if (input.file.set)
-        return input.file.set->conditions;
-    return {.illuminant = "D50", .observer = "2", .measurement = {}}; // as profiles are evaluated
-}
-
-/// Differences between sets under different conditions are no differences of print.
-void warnOfConditions(Comparison& c) {
-    const colour::Conditions target = conditionsOf(c.target);
-    const colour::Conditions measured = conditionsOf(c.measurement);
-    const auto warn = [&](const char* code, const char* what, const std::string& a,
-                          const std::string& b) {
-        if (!a.empty() && !b.empty() && a != b)
-            c.warnings.push_back({code, std::string("Target and measurement state different ") +
-                                            what + ": " + a + " and " + b + "."});
-    };
-    warn("illuminantsDiffer", "illuminants", target.illuminant, measured.illuminant);
-    warn("observersDiffer", "observers", target.observer, measured.observer);
-    warn("measurementConditionsDiffer", "measurement conditions", target.measurement,
-         measured.measurement);
+/// Of a target, which may be a chart larger than the strip, rows without counterpart are no news.
+void warnOfUnpaired(Comparison& c, const Input& input) {
+    if (!input.unpaired.empty() && &input != &c.target)
+        c.warnings.push_back({"patchesUnpaired", patches(input.unpaired.size()) + " of the " +
+                                                     roleOf(c, input) + " had no counterpart."});
 }
 
 void passOnNotes(Comparison& c) {
@@ -212,10 +265,14 @@ void passOnNotes(Comparison& c) {
 
 } // namespace
 
-int compare(const ComparisonPaths& paths, colour::Formula formula, bool keepSpectra,
-            Comparison& c) {
-    c.formula = formula;
-    if (const int status = loadAll(paths, keepSpectra, c))
+const char* repeatModeName(RepeatMode mode) {
+    return mode == RepeatMode::Mean ? "mean" : "each";
+}
+
+int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparison& c) {
+    c.formula = wants.formula;
+    c.repeatMode = wants.repeats;
+    if (const int status = loadAll(paths, wants.spectra, c))
         return status;
     dropPlaceholders(c);
     if (const int status = selectPatches(c))
@@ -224,13 +281,18 @@ int compare(const ComparisonPaths& paths, colour::Formula formula, bool keepSpec
         return status;
     if (const int status = labOf(c, c.measurement, c.measuredLab))
         return status;
+    findRepeats(c);
+    if (wants.repeats == RepeatMode::Mean)
+        averageRepeats(c);
 
     c.difference.resize(c.selectedRow.size());
     for (std::size_t i = 0; i < c.difference.size(); ++i)
-        c.difference[i] = colour::difference(formula, c.targetLab[i], c.measuredLab[i]);
+        c.difference[i] = colour::difference(wants.formula, c.targetLab[i], c.measuredLab[i]);
 
-    warnOfConditions(c);
-    warnOfPairing(c);
+    for (const Input* side : {&c.target, &c.measurement})
+        warnOfPairing(c, *side);
+    for (const Input* input : {&c.target, &c.measurement, &c.patchSet})
+        warnOfUnpaired(c, *input);
     passOnNotes(c);
     return exitDone;
 }

@@ -1,6 +1,8 @@
 // What a comparison is judged by: one table, from which presets, results and docs take their words.
 #pragma once
 
+#include <cstddef>
+#include <iterator>
 #include <string_view>
 
 #include "job/AnalysisLibrary.h"
@@ -20,10 +22,12 @@ enum class Patches {
     Red,             ///< Two of cyan, magenta and yellow at 100, the rest 0.
     Green,
     Blue,
-    Secondaries, ///< The three overprints.
-    Greys,       ///< The triplets of greyTriplets.
-    OuterGamut,  ///< No black, at most two of cyan, magenta and yellow, and not paper.
-    Spots,       ///< One spot colour at 100, the rest 0.
+    Secondaries,  ///< The three overprints.
+    Greys,        ///< The triplets of greyTriplets.
+    OuterGamut,   ///< The list of analysis/OuterGamut.h.
+    SurfaceGamut, ///< No black, at most two of cyan, magenta and yellow, and not paper.
+    Spots,        ///< One spot colour at 100, the rest 0.
+    Repeated,     ///< Measured more than once.
 };
 
 /// What is taken of each patch.
@@ -31,6 +35,7 @@ enum class Quantity {
     DeltaE,  ///< By the formula of the preset.
     DeltaH,  ///< CIELAB hue difference, whatever the formula.
     DeltaCh, ///< CIELAB chromaticness difference, whatever the formula.
+    Spread,  ///< Of a reading from the mean of its patch's readings, by the formula of the preset.
 };
 
 /// How the patches of a criterion become one figure.
@@ -39,6 +44,10 @@ enum class Statistic {
     Maximum,
     Percentile95, ///< Nearest rank: the ceil(0.95 n)-th smallest.
 };
+
+/// Of a criterion that the records at the boundary have no entry for: it is known by its name
+/// alone, in presets and in results.
+inline constexpr int noEntry = -1;
 
 struct Criterion {
     int index;        ///< Entry of presetValues, usedForResult, decimalPlaces, approvals, decimals.
@@ -51,8 +60,9 @@ struct Criterion {
     Statistic statistic;
 };
 
-/// All criteria, by rising index. The indices that are absent have no meaning: their tolerances are
-/// ignored and their approvals are false.
+/// All criteria, by rising index. After them come those without an entry; PresetOptions::named has
+/// their settings. The indices that are absent have no meaning: their tolerances are ignored
+/// and their approvals are false.
 ///
 /// The server's table of results fixes which of its entries take which value: values 0 to 7 go with
 /// criteria 6 to 9, 4, 0, 1 and 5; 12, 13, 14, 19 and 20 with 10, 11, 12, 13 and 3; 26 to 30 with
@@ -99,7 +109,18 @@ inline constexpr Criterion criteria[] = {
      Statistic::Maximum},
     {22, "greyHueAverage", "CMY greys, average hue difference", 30, 22, Patches::Greys,
      Quantity::DeltaH, Statistic::Mean},
+    {noEntry, "surfaceGamutAverage", "Surface of the gamut, average", noEntry, noEntry,
+     Patches::SurfaceGamut, Quantity::DeltaE, Statistic::Mean},
+    {noEntry, "repeatSpread", "Repeated readings, largest distance from their mean", noEntry,
+     noEntry, Patches::Repeated, Quantity::Spread, Statistic::Maximum},
 };
+
+inline constexpr std::size_t criterionCount = std::size(criteria);
+
+/// Place of a criterion in the table.
+inline std::size_t placeOf(const Criterion& criterion) {
+    return static_cast<std::size_t>(&criterion - criteria);
+}
 
 /// "dE", "dH" or "dCh".
 constexpr const char* unit(Quantity quantity) {
@@ -109,6 +130,7 @@ constexpr const char* unit(Quantity quantity) {
     case Quantity::DeltaCh:
         return "dCh";
     case Quantity::DeltaE:
+    case Quantity::Spread:
         break;
     }
     return "dE";

@@ -24,6 +24,10 @@ constexpr auto digitPairs = [] {
     return pairs;
 }();
 
+bool needsNoEscape(char c) {
+    return c >= 0x20 && c < 0x7F && c != '"' && c != '\\';
+}
+
 char* writePair(char* at, std::uint32_t below100) {
     std::memcpy(at, &digitPairs[below100 * 2], 2);
     return at + 2;
@@ -203,21 +207,35 @@ void JsonWriter::escaped(int character) {
     unit(0xDC00 | (beyond & 0x3FF));
 }
 
+/// Writes the characters that need no escape, up to the first other one or the block's end.
+void JsonWriter::plain(const char*& from, const char* end) {
+    const char* const last = m_block.data() + m_block.size();
+    char* at = m_at;
+    while (from != end && at != last && needsNoEscape(*from)) {
+        *at++ = *from++;
+    }
+    m_at = at;
+}
+
 void JsonWriter::text(std::string_view utf8) {
     separate();
-    raw("\"");
+    room(1);
+    *m_at++ = '"';
     const char* from = utf8.data();
     const char* const end = from + utf8.size();
-    while (from != end) {
-        const int character = decodeUtf8(from, end);
-        if (character >= 0x20 && character < 0x7F && character != '"' && character != '\\') {
-            room(1);
-            *m_at++ = static_cast<char>(character);
-        } else {
+    while (true) {
+        room(1);
+        plain(from, end);
+        if (from == end) {
+            break;
+        }
+        if (!needsNoEscape(*from)) {
+            const int character = decodeUtf8(from, end);
             escaped(character < 0 ? 0xFFFD : character);
         }
     }
-    raw("\"");
+    room(1);
+    *m_at++ = '"';
 }
 
 void JsonWriter::number(double value) {

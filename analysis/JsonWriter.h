@@ -62,6 +62,7 @@ class JsonWriter {
     void lineBreak();
     void open(char bracket);
     void close(char bracket);
+    void plain(const char*& from, const char* end);
     void escaped(int character);
 
     std::wstring m_text;

@@ -66,14 +66,21 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
     if (isSameFile && job) {
         return exitTargetIsMeasurement;
     }
-    Comparison comparison;
-    const auto formula = colour::formulaFromNumber(preset.deltaEMode);
-    if (const int status = compare(paths, formula, job != nullptr, comparison))
+    PresetOptions options;
+    if (const int status = readPresetOptions(preset, options)) {
         return status;
+    }
+    Comparison comparison;
+    const ComparisonWants wants{.formula = colour::formulaFromNumber(preset.deltaEMode),
+                                .repeats = options.repeats,
+                                .spectra = job != nullptr};
+    if (const int status = compare(paths, wants, comparison)) {
+        return status;
+    }
     if (isSameFile) {
         comparison.warnings.push_back({"sameFile", "Target and measurement are the same file."});
     }
-    const Judgement judgement = judge(comparison, preset);
+    const Judgement judgement = judge(comparison, preset, options);
 
     // All that can fail comes before the first byte that a caller sees.
     MeasuredPatches patches;
@@ -86,7 +93,7 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
     }
     std::wstring text;
     if (json)
-        text = resultJson(comparison, judgement, preset);
+        text = resultJson(comparison, judgement, preset, options);
 
     if (job)
         storeMeasurement(std::move(patches), preset.deltaEMode, job->measurement);

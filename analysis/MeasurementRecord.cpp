@@ -59,8 +59,14 @@ std::vector<Origin> originsOf(const Comparison& c) {
         for (std::uint32_t row = 0; row < origins.size(); ++row)
             origins[row].row = row;
     for (std::uint32_t patch = 0; patch < c.patchCount(); ++patch) {
-        const std::uint32_t row = isSet ? c.rowOf(c.measurement, patch) : noRow;
+        const std::uint32_t row = isSet ? c.measurement.rows[patch] : noRow;
         origins[asCompared ? patch : row] = {row, patch};
+    }
+    for (const FurtherReading& reading : c.furtherReadings) {
+        if (asCompared)
+            origins.push_back({reading.row, reading.patch});
+        else
+            origins[reading.row].patch = reading.patch;
     }
     return origins;
 }

@@ -23,10 +23,11 @@ class RowIndex {
         : m_mask(std::bit_ceil(std::max<std::size_t>(rows, 8) * 2) - 1), m_slots(m_mask + 1),
           m_next(rows, noRow) {}
 
-    /// REQUIRES: rows are added in rising order. `same(a, b)`: rows a and b have equal keys.
+    /// REQUIRES: rows are added in rising order. `same(b)`: the row added and row b have equal
+    /// keys.
     template<class Same>
     void add(std::uint64_t hash, std::uint32_t row, Same same) {
-        Slot& slot = find(hash, [&](std::uint32_t other) { return same(row, other); });
+        Slot& slot = find(hash, same);
         if (slot.key == noRow) {
             slot = {hash, row, row, row};
         } else {
@@ -40,6 +41,16 @@ class RowIndex {
     std::uint32_t take(std::uint64_t hash, Same same) {
         Slot& slot = find(hash, same);
         const std::uint32_t row = slot.first;
+        if (row != noRow)
+            slot.first = m_next[row];
+        return row;
+    }
+
+    /// As take, but begins anew when all rows of a key were taken; noRow for an unknown key.
+    template<class Same>
+    std::uint32_t takeInTurn(std::uint64_t hash, Same same) {
+        Slot& slot = find(hash, same);
+        const std::uint32_t row = slot.first == noRow ? slot.key : slot.first;
         if (row != noRow)
             slot.first = m_next[row];
         return row;
@@ -75,20 +86,72 @@ std::uint64_t mixed(std::uint64_t h) {
     return h ^ h >> 32;
 }
 
+/// Device values of a set in whole quanta, `width` channels a row. Channels that the set lacks are
+/// 0: a process chart goes with one that has unused spot channels.
+class DeviceKeys {
+  public:
+    DeviceKeys(const DataSet& set, std::size_t width, double perPercent)
+        : m_width(width), m_keys(set.patchCount * width) {
+        const std::size_t own = set.channels.size();
+        for (std::size_t row = 0; row < set.patchCount; ++row)
+            for (std::size_t channel = 0; channel < own; ++channel) {
+                const double value = set.device[row * own + channel] * perPercent;
+                // In this order of arguments not-a-number is bounded too.
+                const double bounded = std::min(std::max(-2e9, value), 2e9);
+                m_keys[row * width + channel] =
+                    static_cast<std::int32_t>(std::floor(bounded + 0.5));
+            }
+    }
+
+    std::uint64_t hash(std::uint32_t row) const {
+        std::uint64_t h = m_width;
+        for (const std::int32_t *at = key(row), *end = at + m_width; at != end; ++at)
+            h = mixed(h + static_cast<std::uint32_t>(*at));
+        return h;
+    }
+
+    bool same(std::uint32_t row, const DeviceKeys& other, std::uint32_t otherRow) const {
+        return std::equal(key(row), key(row) + m_width, other.key(otherRow));
+    }
+
+  private:
+    const std::int32_t* key(std::uint32_t row) const { return &m_keys[row * m_width]; }
+
+    std::size_t m_width;
+    std::vector<std::int32_t> m_keys;
+};
+
+class LabelKeys {
+  public:
+    explicit LabelKeys(const std::vector<std::string>& labels) : m_labels(labels) {}
+
+    std::uint64_t hash(std::uint32_t row) const {
+        return mixed(std::hash<std::string_view>{}(m_labels[row]));
+    }
+
+    bool same(std::uint32_t row, const LabelKeys& other, std::uint32_t otherRow) const {
+        return m_labels[row] == other.m_labels[otherRow];
+    }
+
+  private:
+    const std::vector<std::string>& m_labels;
+};
+
 /// Pairs the rows that are still alone on both sides.
-template<class LeftHash, class RightHash, class SameRight, class SameBoth>
-std::size_t pairRest(Pairing& pairing, std::vector<bool>& taken, LeftHash leftHash,
-                     RightHash rightHash, SameRight sameRight, SameBoth sameBoth) {
+template<class Keys>
+std::size_t pairRest(Pairing& pairing, std::vector<bool>& taken, const Keys& left,
+                     const Keys& right) {
     RowIndex index(taken.size());
     for (std::uint32_t row = 0; row < taken.size(); ++row)
         if (!taken[row])
-            index.add(rightHash(row), row, sameRight);
+            index.add(right.hash(row), row,
+                      [&](std::uint32_t other) { return right.same(row, right, other); });
     std::size_t found = 0;
     for (std::uint32_t row = 0; row < pairing.partner.size(); ++row) {
         if (pairing.partner[row] != noRow)
             continue;
-        const std::uint32_t other =
-            index.take(leftHash(row), [&](std::uint32_t right) { return sameBoth(row, right); });
+        const std::uint32_t other = index.take(
+            left.hash(row), [&](std::uint32_t key) { return left.same(row, right, key); });
         if (other == noRow)
             continue;
         pairing.partner[row] = other;
@@ -99,57 +162,50 @@ std::size_t pairRest(Pairing& pairing, std::vector<bool>& taken, LeftHash leftHa
     return found;
 }
 
-/// Device values of a set in whole quanta, `width` channels a row. Channels that the set lacks are
-/// 0: a process chart goes with one that has unused spot channels.
-std::vector<std::int32_t> quantised(const DataSet& set, std::size_t width, double perPercent) {
-    const std::size_t own = set.channels.size();
-    std::vector<std::int32_t> keys(set.patchCount * width);
-    for (std::size_t row = 0; row < set.patchCount; ++row)
-        for (std::size_t channel = 0; channel < own; ++channel) {
-            const double value = set.device[row * own + channel] * perPercent;
-            // In this order of arguments not-a-number is bounded too.
-            const double bounded = std::min(std::max(-2e9, value), 2e9);
-            keys[row * width + channel] = static_cast<std::int32_t>(std::floor(bounded + 0.5));
-        }
-    return keys;
-}
-
-std::uint64_t hashOf(const std::int32_t* key, std::size_t width) {
-    std::uint64_t h = width;
-    for (std::size_t i = 0; i < width; ++i)
-        h = mixed(h + static_cast<std::uint32_t>(key[i]));
-    return h;
-}
-
-std::size_t pairByDevice(Pairing& pairing, std::vector<bool>& taken, const DataSet& left,
-                         const DataSet& right, double perPercent) {
-    const std::size_t width = std::max(left.channels.size(), right.channels.size());
-    const std::vector<std::int32_t> leftKeys = quantised(left, width, perPercent);
-    const std::vector<std::int32_t> rightKeys = quantised(right, width, perPercent);
-    const auto leftKey = [&](std::uint32_t row) { return &leftKeys[row * width]; };
-    const auto rightKey = [&](std::uint32_t row) { return &rightKeys[row * width]; };
-    return pairRest(
-        pairing, taken, [&](std::uint32_t row) { return hashOf(leftKey(row), width); },
-        [&](std::uint32_t row) { return hashOf(rightKey(row), width); },
-        [&](std::uint32_t a, std::uint32_t b) {
-            return std::equal(rightKey(a), rightKey(a) + width, rightKey(b));
-        },
-        [&](std::uint32_t a, std::uint32_t b) {
-            return std::equal(leftKey(a), leftKey(a) + width, rightKey(b));
-        });
-}
-
-std::size_t pairByLabels(Pairing& pairing, std::vector<bool>& taken,
-                         const std::vector<std::string>& left,
-                         const std::vector<std::string>& right) {
-    const auto hash = [](const std::string& label) {
-        return mixed(std::hash<std::string_view>{}(label));
+/// Gives each row without a partner that of a row with the same key, in turn if there are several.
+/// Calls found(row, partner) for each.
+template<class Keys, class Found>
+void pairRepeats(const std::vector<std::uint32_t>& partner, const Keys& keys, Found found) {
+    RowIndex index(partner.size());
+    const auto sameAs = [&](std::uint32_t row) {
+        return [&keys, row](std::uint32_t other) { return keys.same(row, keys, other); };
     };
-    return pairRest(
-        pairing, taken, [&](std::uint32_t row) { return hash(left[row]); },
-        [&](std::uint32_t row) { return hash(right[row]); },
-        [&](std::uint32_t a, std::uint32_t b) { return right[a] == right[b]; },
-        [&](std::uint32_t a, std::uint32_t b) { return left[a] == right[b]; });
+    for (std::uint32_t row = 0; row < partner.size(); ++row)
+        if (partner[row] != noRow)
+            index.add(keys.hash(row), row, sameAs(row));
+    for (std::uint32_t row = 0; row < partner.size(); ++row) {
+        if (partner[row] != noRow)
+            continue;
+        const std::uint32_t like = index.takeInTurn(keys.hash(row), sameAs(row));
+        if (like != noRow)
+            found(row, partner[like]);
+    }
+}
+
+/// Adds the repeats of both sets by their keys. May be called again with other keys, for the rows
+/// that are left then.
+template<class Keys>
+void addRepeats(Pairing& pairing, std::size_t rightCount, const Keys& left, const Keys& right) {
+    std::vector<std::uint32_t> inverse(rightCount, noRow);
+    std::size_t leftPaired = 0;
+    for (std::uint32_t row = 0; row < pairing.partner.size(); ++row)
+        if (pairing.partner[row] != noRow) {
+            std::uint32_t& first = inverse[pairing.partner[row]];
+            first = std::min(first, row); // noRow is the largest
+            ++leftPaired;
+        }
+    for (const RowPair& pair : pairing.again)
+        inverse[pair.right] = pair.left;
+    if (pairing.paired + pairing.again.size() < rightCount)
+        pairRepeats(inverse, right, [&](std::uint32_t row, std::uint32_t partner) {
+            pairing.again.push_back({partner, row});
+        });
+    if (leftPaired < pairing.partner.size()) {
+        const std::vector<std::uint32_t> partners = pairing.partner;
+        pairRepeats(partners, left, [&](std::uint32_t row, std::uint32_t partner) {
+            pairing.partner[row] = partner;
+        });
+    }
 }
 
 bool comparableDevices(const DataSet& left, const DataSet& right) {
@@ -162,6 +218,104 @@ void pairByOrder(Pairing& pairing, std::size_t rightCount) {
     pairing.paired = std::min(pairing.partner.size(), rightCount);
     std::iota(pairing.partner.begin(),
               pairing.partner.begin() + static_cast<std::ptrdiff_t>(pairing.paired), 0u);
+}
+
+Pairing pairByDevice(const DataSet& left, const DataSet& right) {
+    Pairing pairing;
+    pairing.by = PairedBy::DeviceValues;
+    pairing.partner.assign(left.patchCount, noRow);
+    // Most pairs of files are one chart in one order, where nothing needs looking up.
+    if (left.channels.size() == right.channels.size() && left.device == right.device) {
+        pairByOrder(pairing, right.patchCount);
+        return pairing;
+    }
+    const std::size_t width = std::max(left.channels.size(), right.channels.size());
+    constexpr double perPercent[] = {10000, 100, 1};
+    std::vector<bool> taken(right.patchCount);
+    for (const double scale : perPercent) {
+        const std::size_t found = pairRest(pairing, taken, DeviceKeys(left, width, scale),
+                                           DeviceKeys(right, width, scale));
+        if (scale == 1)
+            pairing.rounded = found;
+        if (pairing.paired == std::min(left.patchCount, right.patchCount))
+            break;
+    }
+    for (const double scale : {perPercent[0], perPercent[1]})
+        if (pairing.paired > 0 && (pairing.paired < left.patchCount ||
+                                   pairing.paired + pairing.again.size() < right.patchCount))
+            addRepeats(pairing, right.patchCount, DeviceKeys(left, width, scale),
+                       DeviceKeys(right, width, scale));
+    return pairing;
+}
+
+/// True if labels tell patches apart: at most one in ten repeats another, as paper does in a wedge.
+bool mostlyDiffer(const std::vector<std::string>& labels) {
+    std::vector<std::string_view> sorted(labels.begin(), labels.end());
+    std::sort(sorted.begin(), sorted.end());
+    const auto different = std::unique(sorted.begin(), sorted.end()) - sorted.begin();
+    return static_cast<std::size_t>(different) * 10 >= labels.size() * 9;
+}
+
+/// Pairs by the labels of one kind on each side.
+Pairing pairByLabels(const std::vector<std::string>& left, const std::vector<std::string>& right) {
+    Pairing pairing;
+    pairing.by = PairedBy::Labels;
+    pairing.partner.assign(left.size(), noRow);
+    std::vector<bool> taken(right.size());
+    pairRest(pairing, taken, LabelKeys(left), LabelKeys(right));
+    return pairing;
+}
+
+/// Rows that a pairing puts together although labels of the other kind name another row.
+std::size_t contradictionsOf(const Pairing& pairing, const std::vector<std::string>& left,
+                             const std::vector<std::string>& right) {
+    if (left.empty() || right.empty())
+        return 0;
+    const Pairing other = pairByLabels(left, right);
+    std::size_t count = 0;
+    for (std::size_t row = 0; row < left.size(); ++row)
+        if (pairing.partner[row] != noRow && other.partner[row] != noRow &&
+            left[row] != right[pairing.partner[row]])
+            ++count;
+    return count;
+}
+
+/// `paired` is 0 if the sets have no label in common.
+Pairing pairByBestLabels(const DataSet& left, const DataSet& right) {
+    const struct {
+        const std::vector<std::string>& left;
+        const std::vector<std::string>& right;
+    } combinations[] = {{left.ids, right.ids},
+                        {left.names, right.names},
+                        {left.ids, right.names},
+                        {left.names, right.ids}};
+    constexpr std::size_t ids = 0, names = 1;
+    Pairing best;
+    std::size_t bestAt = ids;
+    for (std::size_t i = 0; i < std::size(combinations); ++i) {
+        const auto& [leftLabels, rightLabels] = combinations[i];
+        if (leftLabels.empty() || rightLabels.empty())
+            continue;
+        Pairing pairing = pairByLabels(leftLabels, rightLabels);
+        // Ids are often no more than the numbers of the rows; names that differ are meant.
+        const bool better =
+            pairing.paired > best.paired || (i == names && pairing.paired == best.paired &&
+                                             mostlyDiffer(leftLabels) && mostlyDiffer(rightLabels));
+        if (better) {
+            best = std::move(pairing);
+            bestAt = i;
+        }
+    }
+    if (best.paired == 0)
+        return best;
+    if (bestAt == ids)
+        best.contradicted = contradictionsOf(best, left.names, right.names);
+    else if (bestAt == names)
+        best.contradicted = contradictionsOf(best, left.ids, right.ids);
+    const auto& [leftLabels, rightLabels] = combinations[bestAt];
+    if (best.paired < std::max(left.patchCount, right.patchCount))
+        addRepeats(best, right.patchCount, LabelKeys(leftLabels), LabelKeys(rightLabels));
+    return best;
 }
 
 } // namespace
@@ -183,46 +337,19 @@ const char* pairedByName(PairedBy by) {
 }
 
 Pairing pairSets(const DataSet& left, const DataSet& right) {
-    Pairing pairing;
-    pairing.partner.assign(left.patchCount, noRow);
-
-    if (comparableDevices(left, right)) {
-        pairing.by = PairedBy::DeviceValues;
-        // Most pairs of files are one chart in one order, where nothing needs looking up.
-        if (left.channels.size() == right.channels.size() && left.device == right.device) {
-            pairByOrder(pairing, right.patchCount);
-            return pairing;
-        }
-        std::vector<bool> taken(right.patchCount);
-        const auto complete = [&] {
-            return pairing.paired == std::min(left.patchCount, right.patchCount);
+    if (comparableDevices(left, right))
+        return pairByDevice(left, right);
+    Pairing pairing = pairByBestLabels(left, right);
+    if (pairing.paired == 0) {
+        const auto isLabelled = [](const DataSet& set) {
+            return !set.ids.empty() || !set.names.empty();
         };
-        pairByDevice(pairing, taken, left, right, 10000);
-        if (!complete())
-            pairByDevice(pairing, taken, left, right, 100);
-        if (!complete())
-            pairing.rounded = pairByDevice(pairing, taken, left, right, 1);
-        return pairing;
+        pairing = {};
+        pairing.partner.assign(left.patchCount, noRow);
+        if (left.patchCount == right.patchCount || !isLabelled(left) || !isLabelled(right))
+            pairByOrder(pairing, right.patchCount);
     }
-
-    const std::vector<std::string>* const leftLabels[] = {&left.ids, &left.names, &left.ids,
-                                                          &left.names};
-    const std::vector<std::string>* const rightLabels[] = {&right.ids, &right.names, &right.names,
-                                                           &right.ids};
-    bool bothLabelled = false;
-    for (std::size_t i = 0; i < std::size(leftLabels); ++i) {
-        if (leftLabels[i]->empty() || rightLabels[i]->empty())
-            continue;
-        bothLabelled = true;
-        std::vector<bool> taken(right.patchCount);
-        if (pairByLabels(pairing, taken, *leftLabels[i], *rightLabels[i]) > 0) {
-            pairing.by = PairedBy::Labels;
-            return pairing;
-        }
-    }
-
-    if (!bothLabelled || left.patchCount == right.patchCount)
-        pairByOrder(pairing, right.patchCount);
+    pairing.spacesDiffer = left.hasDevice() && right.hasDevice();
     return pairing;
 }
 
@@ -239,6 +366,8 @@ std::vector<std::uint32_t> rowsLeft(const Pairing& pairing, std::size_t count) {
     for (const std::uint32_t row : pairing.partner)
         if (row != noRow)
             taken[row] = true;
+    for (const RowPair& pair : pairing.again)
+        taken[pair.right] = true;
     std::vector<std::uint32_t> rows;
     for (std::uint32_t row = 0; row < count; ++row)
         if (!taken[row])

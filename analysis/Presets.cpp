@@ -6,15 +6,17 @@
 //   <editable>no</editable>
 //   <showInClient>yes</showInClient>
 //   <usedForDynamicWedge>yes</usedForDynamicWedge>
-//   <illuminationCondition>-1</illuminationCondition>
+//   <illuminationCondition required="yes">1</illuminationCondition>     or without required: no
 //   <psd>no</psd>
+//   <repeats>mean</repeats>               may be absent: each
+//   <minimumGreys>5</minimumGreys>        may be absent: 5
 //   <criteria>
 //     <average tolerance="2.5" used="yes" decimals="1"/>
 //     <paperWhite tolerance="3" used="yes" decimals="1" psdTolerance="3" psdUsed="no"/>
 //   </criteria>
 // </tolerancePreset>
 //
-// Everything outside criteria must be there once, in any order; within criteria each name of
+// Everything else outside criteria must be there once, in any order; within criteria each name of
 // analysis/Criteria.h may be there once. What is not known is refused rather than passed over: it
 // is most likely a slip of the pen in something that was meant to count.
 #include "analysis/Presets.h"
@@ -41,6 +43,7 @@ constexpr int formatVersion = 1;
 constexpr double largestTolerance = 1000;
 constexpr int largestDecimals = 10;
 constexpr int largestCondition = 999;
+constexpr int mostGreys = 1000;
 constexpr int largestId = 2147483647;
 
 using Status = int; // of ExitCodes.h; exitDone goes on
@@ -100,27 +103,52 @@ Status readName(std::string_view text, wxString& name) {
     return exitDone;
 }
 
+Status readRepeats(std::string_view text, RepeatMode& mode) {
+    text = trimmed(text);
+    if (text.empty())
+        return exitPresetValueMissing;
+    for (const RepeatMode each : {RepeatMode::Each, RepeatMode::Mean})
+        if (text == repeatModeName(each)) {
+            mode = each;
+            return exitDone;
+        }
+    return exitPresetOutOfRange;
+}
+
 using Record = tolerancePresetParameterRecord;
+
+/// All that a file states.
+struct Preset : Record {
+    PresetOptions options;
+};
 
 /// The elements beside criteria, each with what its text becomes.
 constexpr struct Field {
     const char* name;
-    Status (*read)(std::string_view text, Record& preset);
+    Status (*read)(std::string_view text, Preset& preset);
+    bool optional = false;
 } fields[] = {
     {"id",
-     [](auto text, Record& preset) { return readNumber(text, 0, largestId, preset.presetID); }},
-    {"name", [](auto text, Record& preset) { return readName(text, preset.name); }},
-    {"formula", [](auto text, Record& preset) { return readFormula(text, preset.deltaEMode); }},
-    {"editable", [](auto text, Record& preset) { return readSwitch(text, preset.editable); }},
+     [](auto text, Preset& preset) { return readNumber(text, 0, largestId, preset.presetID); }},
+    {"name", [](auto text, Preset& preset) { return readName(text, preset.name); }},
+    {"formula", [](auto text, Preset& preset) { return readFormula(text, preset.deltaEMode); }},
+    {"editable", [](auto text, Preset& preset) { return readSwitch(text, preset.editable); }},
     {"showInClient",
-     [](auto text, Record& preset) { return readSwitch(text, preset.showInClient); }},
+     [](auto text, Preset& preset) { return readSwitch(text, preset.showInClient); }},
     {"usedForDynamicWedge",
-     [](auto text, Record& preset) { return readSwitch(text, preset.usedForDynamicWedge); }},
+     [](auto text, Preset& preset) { return readSwitch(text, preset.usedForDynamicWedge); }},
     {"illuminationCondition",
-     [](auto text, Record& preset) {
+     [](auto text, Preset& preset) {
          return readNumber(text, -1, largestCondition, preset.illuminationCondition);
      }},
-    {"psd", [](auto text, Record& preset) { return readSwitch(text, preset.fograPSDPreset); }},
+    {"psd", [](auto text, Preset& preset) { return readSwitch(text, preset.fograPSDPreset); }},
+    {"repeats", [](auto text, Preset& preset) { return readRepeats(text, preset.options.repeats); },
+     true},
+    {"minimumGreys",
+     [](auto text, Preset& preset) {
+         return readNumber(text, 1, mostGreys, preset.options.minimumGreys);
+     },
+     true},
 };
 
 /// The fault that reading meets, with its place.
@@ -184,11 +212,8 @@ class Finding {
     std::string m_description;
 };
 
-/// The text of an element that holds nothing else.
+/// The text of an element without child elements.
 Status textOf(const pugi::xml_node& element, std::string& text, Finding& finding) {
-    if (const pugi::xml_attribute attribute = element.first_attribute()) {
-        return finding.atAttribute(exitPresetUnknownEntry, element, attribute.name());
-    }
     for (const pugi::xml_node& part : element) {
         if (part.type() == pugi::node_element) {
             return finding.at(exitPresetUnknownEntry, part);
@@ -218,8 +243,37 @@ Status attributesOf(const pugi::xml_node& element, const char* const (&names)[co
     return exitDone;
 }
 
-Status readCriterion(const pugi::xml_node& element, const Criterion& criterion, Record& preset,
-                     Finding& finding) {
+/// Reads the attributes of an element beside criteria: only the condition may have one.
+Status readAttributes(const pugi::xml_node& element, Preset& preset, Finding& finding) {
+    if (element.name() != std::string_view("illuminationCondition")) {
+        const pugi::xml_attribute attribute = element.first_attribute();
+        return attribute ? finding.atAttribute(exitPresetUnknownEntry, element, attribute.name())
+                         : exitDone;
+    }
+    constexpr const char* names[] = {"required"};
+    std::array<const char*, 1> values{};
+    const Status status = attributesOf(element, names, values, finding);
+    if (status != exitDone || !values[0]) {
+        return status;
+    }
+    int required = 0;
+    if (const Status read = readSwitch(values[0], required); read != exitDone) {
+        return finding.atAttribute(read, element, names[0], values[0]);
+    }
+    preset.options.conditionRequired = required != 0;
+    return exitDone;
+}
+
+/// Where the settings of a criterion go: into the record, or beside it.
+struct Places {
+    double& tolerance;
+    int& used;
+    int& decimals;
+    double& psdTolerance;
+    int& psdUsed;
+};
+
+Status readSettings(const pugi::xml_node& element, bool isPsd, Places places, Finding& finding) {
     constexpr const char* names[] = {"tolerance", "used", "decimals", "psdTolerance", "psdUsed"};
     std::array<const char*, std::size(names)> values{};
     if (const Status status = attributesOf(element, names, values, finding); status != exitDone) {
@@ -228,26 +282,25 @@ Status readCriterion(const pugi::xml_node& element, const Criterion& criterion, 
     if (const pugi::xml_node part = element.first_child()) {
         return finding.at(exitPresetUnknownEntry, part);
     }
-    const bool hasPsd = values[3] || values[4] || preset.fograPSDPreset > 0;
+    const bool hasPsd = values[3] || values[4] || isPsd;
     for (std::size_t i = 0; i < (hasPsd ? std::size(names) : 3); ++i) {
         const char* const text = values[i] ? values[i] : "";
         Status status = exitDone;
         switch (i) {
         case 0:
-            status = readNumber(text, 0.0, largestTolerance, preset.presetValues[criterion.index]);
+            status = readNumber(text, 0.0, largestTolerance, places.tolerance);
             break;
         case 1:
-            status = readSwitch(text, preset.usedForResult[criterion.index]);
+            status = readSwitch(text, places.used);
             break;
         case 2:
-            status = readNumber(text, 0, largestDecimals, preset.decimalPlaces[criterion.index]);
+            status = readNumber(text, 0, largestDecimals, places.decimals);
             break;
         case 3:
-            status =
-                readNumber(text, 0.0, largestTolerance, preset.psdPresetValues[criterion.psdEntry]);
+            status = readNumber(text, 0.0, largestTolerance, places.psdTolerance);
             break;
         default:
-            status = readSwitch(text, preset.usedForPSDResult[criterion.psdEntry]);
+            status = readSwitch(text, places.psdUsed);
         }
         if (status != exitDone) {
             return finding.atAttribute(status, element, names[i], text);
@@ -256,19 +309,39 @@ Status readCriterion(const pugi::xml_node& element, const Criterion& criterion, 
     return exitDone;
 }
 
+Status readCriterion(const pugi::xml_node& element, const Criterion& criterion, Preset& preset,
+                     Finding& finding) {
+    const bool isPsd = preset.fograPSDPreset > 0;
+    if (criterion.index != noEntry) {
+        return readSettings(
+            element, isPsd,
+            {preset.presetValues[criterion.index], preset.usedForResult[criterion.index],
+             preset.decimalPlaces[criterion.index], preset.psdPresetValues[criterion.psdEntry],
+             preset.usedForPSDResult[criterion.psdEntry]},
+            finding);
+    }
+    double tolerance = 0, psdTolerance = 0;
+    int used = 0, psdUsed = 0, decimals = 0;
+    const Status status =
+        readSettings(element, isPsd, {tolerance, used, decimals, psdTolerance, psdUsed}, finding);
+    preset.options.named[placeOf(criterion)] = isPsd ? Setting{psdTolerance, psdUsed != 0, decimals}
+                                                     : Setting{tolerance, used != 0, decimals};
+    return status;
+}
+
 /// REQUIRES: preset.fograPSDPreset is read: a PSD preset must state its values for each criterion.
-Status readCriteria(const pugi::xml_node& section, Record& preset, Finding& finding) {
+Status readCriteria(const pugi::xml_node& section, Preset& preset, Finding& finding) {
     if (const pugi::xml_attribute attribute = section.first_attribute()) {
         return finding.atAttribute(exitPresetUnknownEntry, section, attribute.name());
     }
-    std::array<bool, presetValueCount> seen{};
+    std::array<bool, criterionCount> seen{};
     for (const pugi::xml_node& element : section) {
         const Criterion* criterion =
             element.type() == pugi::node_element ? criterionOfName(element.name()) : nullptr;
         if (!criterion) {
             return finding.at(exitPresetUnknownEntry, element);
         }
-        if (std::exchange(seen[criterion->index], true)) {
+        if (std::exchange(seen[placeOf(*criterion)], true)) {
             return finding.at(exitPresetValueRepeated, element);
         }
         if (const Status status = readCriterion(element, *criterion, preset, finding);
@@ -291,7 +364,7 @@ Status readVersion(const pugi::xml_node& root, Finding& finding) {
                                names[0], text);
 }
 
-Status readRoot(const pugi::xml_node& root, Record& preset, Finding& finding) {
+Status readRoot(const pugi::xml_node& root, Preset& preset, Finding& finding) {
     if (const Status status = readVersion(root, finding); status != exitDone) {
         return status;
     }
@@ -312,16 +385,27 @@ Status readRoot(const pugi::xml_node& root, Record& preset, Finding& finding) {
         place = element;
     }
     for (std::size_t i = 0; i < std::size(fields); ++i) {
+        if (!found[i] && fields[i].optional) {
+            continue;
+        }
         if (!found[i]) {
             return finding.missing(root, fields[i].name);
         }
         std::string text;
-        Status status = textOf(found[i], text, finding);
+        Status status = readAttributes(found[i], preset, finding);
+        if (status == exitDone) {
+            status = textOf(found[i], text, finding);
+        }
         if (status == exitDone) {
             status = finding.at(fields[i].read(text, preset), found[i], trimmed(text));
         }
         if (status != exitDone) {
             return status;
+        }
+        const bool isUnmeetable = preset.options.conditionRequired &&
+                                  preset.illuminationCondition > largestMeasuringCondition;
+        if (isUnmeetable) {
+            return finding.at(exitPresetOutOfRange, found[i], trimmed(text));
         }
     }
     return criteriaSection ? readCriteria(criteriaSection, preset, finding)
@@ -365,7 +449,7 @@ std::size_t lineOf(std::string_view bytes, std::ptrdiff_t offset, bool isLatin1)
     return line;
 }
 
-Status parse(std::string_view bytes, Record& preset, pugi::xml_document& document,
+Status parse(std::string_view bytes, Preset& preset, pugi::xml_document& document,
              pugi::xml_encoding& encoding, Finding& finding) {
     if (bytes.size() > maxPresetBytes) {
         return finding.document(exitPresetWrongKind, -1, "the file has more than 1 MB");
@@ -389,36 +473,23 @@ Status parse(std::string_view bytes, Record& preset, pugi::xml_document& documen
     return status == exitDone ? readRoot(root, preset, finding) : status;
 }
 
-} // namespace
-
-int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParameterRecord& preset,
-                PresetFault* fault) {
-    tolerancePresetParameterRecord read;
+/// Parses, and describes a fault.
+Status parse(std::string_view bytes, Preset& preset, PresetFault* fault) {
     pugi::xml_document document;
     pugi::xml_encoding encoding = pugi::encoding_utf8;
     Finding finding;
-    if (const Status status = parse(bytes, read, document, encoding, finding); status != exitDone) {
-        if (fault) {
-            const bool hasPlace = finding.offset() >= 0;
-            fault->line =
-                hasPlace ? lineOf(bytes, finding.offset(), encoding == pugi::encoding_latin1) : 0;
-            fault->description = finding.description();
-        }
-        return status;
+    const Status status = parse(bytes, preset, document, encoding, finding);
+    if (status != exitDone && fault) {
+        const bool hasPlace = finding.offset() >= 0;
+        fault->line =
+            hasPlace ? lineOf(bytes, finding.offset(), encoding == pugi::encoding_latin1) : 0;
+        fault->description = finding.description();
     }
-    read.filePath = preset.filePath;
-    read.reserved1 = preset.reserved1;
-    read.reserved2 = preset.reserved2;
-    if (keepJobChoice) {
-        read.presetID = preset.presetID;
-        read.deltaEMode = preset.deltaEMode;
-    }
-    preset = read;
-    return exitDone;
+    return status;
 }
 
-int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParameterRecord& preset,
-               PresetFault* fault) {
+/// The same from a file.
+Status parseFile(const std::string& path, Preset& preset, PresetFault* fault) {
     std::string bytes;
     const auto fail = [&](int status, const char* description) {
         if (fault) {
@@ -428,7 +499,7 @@ int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParam
     };
     switch (colour::readWholeFile(path, maxPresetBytes, bytes)) {
     case colour::Failure::None:
-        break;
+        return parse(bytes, preset, fault);
     case colour::Failure::Missing:
         return fail(exitPresetMissing, "there is no file");
     case colour::Failure::TooLarge:
@@ -438,11 +509,83 @@ int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParam
     default:
         return fail(exitPresetUnreadable, "the file can't be read");
     }
-    const int status = parsePreset(bytes, keepJobChoice, preset, fault);
-    if (status == exitDone && preset.filePath.empty()) {
-        preset.filePath = wxString(widened(path));
+}
+
+/// What the last preset that was read states beyond its record, under the record's filePath. A
+/// preset may come through a pipe, which can be read only once.
+struct LastRead {
+    std::string path;
+    PresetOptions options;
+};
+
+LastRead& lastRead() {
+    static LastRead last;
+    return last;
+}
+
+/// Takes over what a file states, but for what a job chooses itself.
+void take(const Preset& read, bool keepJobChoice, Record& preset) {
+    Record taken = read;
+    taken.filePath = preset.filePath;
+    taken.reserved1 = preset.reserved1;
+    taken.reserved2 = preset.reserved2;
+    if (keepJobChoice) {
+        taken.presetID = preset.presetID;
+        taken.deltaEMode = preset.deltaEMode;
+    }
+    preset = taken;
+}
+
+} // namespace
+
+int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParameterRecord& preset,
+                PresetFault* fault) {
+    Preset read;
+    const Status status = parse(bytes, read, fault);
+    if (status == exitDone) {
+        take(read, keepJobChoice, preset);
     }
     return status;
+}
+
+int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParameterRecord& preset,
+               PresetFault* fault) {
+    Preset read;
+    if (const Status status = parseFile(path, read, fault); status != exitDone) {
+        return status;
+    }
+    take(read, keepJobChoice, preset);
+    if (preset.filePath.empty()) {
+        preset.filePath = wxString(widened(path));
+    }
+    lastRead() = {narrowed(preset.filePath.ToStdWstring()), read.options};
+    return exitDone;
+}
+
+int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOptions& options) {
+    const std::string path = narrowed(preset.filePath.ToStdWstring());
+    if (path.empty() || path == lastRead().path) {
+        options = path.empty() ? PresetOptions() : lastRead().options;
+        return exitDone;
+    }
+    Preset read;
+    const Status status = parseFile(path, read, nullptr);
+    if (status == exitDone) {
+        options = read.options;
+    }
+    return status;
+}
+
+Setting settingOf(const Criterion& criterion, const tolerancePresetParameterRecord& preset,
+                  const PresetOptions& options) {
+    if (criterion.index == noEntry)
+        return options.named[placeOf(criterion)];
+    const int decimals = preset.decimalPlaces[criterion.index];
+    if (preset.fograPSDPreset > 0)
+        return {preset.psdPresetValues[criterion.psdEntry],
+                preset.usedForPSDResult[criterion.psdEntry] != 0, decimals};
+    return {preset.presetValues[criterion.index], preset.usedForResult[criterion.index] != 0,
+            decimals};
 }
 
 } // namespace analysis

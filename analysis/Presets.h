@@ -1,13 +1,37 @@
 // Tolerance presets as XML files. docs/presets.md states the format for whoever writes one.
 #pragma once
 
+#include <array>
 #include <cstddef>
 #include <string>
 #include <string_view>
 
+#include "analysis/Comparison.h"
+#include "analysis/Criteria.h"
 #include "job/AnalysisLibrary.h"
 
 namespace analysis {
+
+/// illuminationCondition 0 to 3 is M0 to M3 of ISO 13655, -1 is any. Higher numbers are allowed,
+/// for the sake of older presets, and mean nothing.
+inline constexpr int largestMeasuringCondition = 3;
+
+/// How one criterion is judged.
+struct Setting {
+    double tolerance = 0; ///< 0 also if the preset does not name the criterion.
+    bool used = false;    ///< Takes part in the verdict.
+    int decimals = 0;
+};
+
+/// What a preset's file states beyond the record, which has no room for it.
+struct PresetOptions {
+    RepeatMode repeats = RepeatMode::Each;
+    bool conditionRequired = false; ///< The measuring condition decides, and does not only warn.
+    int minimumGreys = 5;           ///< Fewer CMY greys give no answer.
+
+    /// Settings of the criteria without an entry, by their place in `criteria`.
+    std::array<Setting, criterionCount> named{};
+};
 
 /// A longer file is no preset.
 inline constexpr std::size_t maxPresetBytes = std::size_t{1} << 20;
@@ -31,5 +55,14 @@ int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParam
 /// The same from the contents of a file; filePath stays.
 int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParameterRecord& preset,
                 PresetFault* fault = nullptr);
+
+/// What the file of a record states beyond the record. filePath leads to it; a file that readPreset
+/// has just read for this filePath is not read again. Without a filePath the options are the usual
+/// ones. Gives the codes of readPreset; `options` is left as it was on failure.
+int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOptions& options);
+
+/// How a criterion is judged. With fograPSDPreset above 0 the PSD values of the record decide.
+Setting settingOf(const Criterion& criterion, const tolerancePresetParameterRecord& preset,
+                  const PresetOptions& options);
 
 } // namespace analysis

@@ -20,6 +20,15 @@ void optionalMember(JsonWriter& json, std::string_view name, const std::string& 
         json.text(text);
 }
 
+template<class Write>
+void memberIf(JsonWriter& json, bool given, std::string_view name, Write write) {
+    json.key(name);
+    if (given)
+        write();
+    else
+        json.null();
+}
+
 void writeProgram(JsonWriter& json, const char* key, const char* name, const char* version) {
     json.key(key);
     json.beginCompactObject();
@@ -28,7 +37,8 @@ void writeProgram(JsonWriter& json, const char* key, const char* name, const cha
     json.endObject();
 }
 
-void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset) {
+void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset,
+                 const PresetOptions& options) {
     json.key("preset");
     json.beginObject();
     json.member("id", std::int64_t{preset.presetID});
@@ -36,6 +46,9 @@ void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset)
     json.member("file", documentText(preset.filePath.ToStdWstring()));
     json.member("psd", preset.fograPSDPreset > 0);
     json.member("illuminationCondition", std::int64_t{preset.illuminationCondition});
+    json.member("conditionRequired", options.conditionRequired);
+    json.member("repeats", repeatModeName(options.repeats));
+    json.member("minimumGreys", std::int64_t{options.minimumGreys});
     json.endObject();
 }
 
@@ -67,6 +80,7 @@ void writeInput(JsonWriter& json, const char* key, const Input& input) {
     optionalMember(json, "illuminant", set.conditions.illuminant);
     optionalMember(json, "observer", set.conditions.observer);
     optionalMember(json, "measurementCondition", set.conditions.measurement);
+    json.member("calculatedFromSpectra", set.calculated);
     json.endObject();
 }
 
@@ -86,6 +100,18 @@ void writePairing(JsonWriter& json, const Comparison& c) {
     json.endObject();
 }
 
+void writeRepeats(JsonWriter& json, const RepeatSpread& spread) {
+    json.key("repeats");
+    json.beginObject();
+    json.member("patches", static_cast<std::int64_t>(spread.patches));
+    json.member("readings", static_cast<std::int64_t>(spread.readings));
+    memberIf(json, spread.patches > 0, "meanDistance", [&] { json.number(spread.mean); });
+    memberIf(json, spread.patches > 0, "largestDistance", [&] { json.number(spread.largest); });
+    memberIf(json, spread.patches > 0, "worstPatch",
+             [&] { json.integer(static_cast<std::int64_t>(spread.worst)); });
+    json.endObject();
+}
+
 void writeStatistics(JsonWriter& json, const Statistics& s) {
     json.key("statistics");
     json.beginObject();
@@ -96,15 +122,6 @@ void writeStatistics(JsonWriter& json, const Statistics& s) {
     json.member("maximum", s.maximum);
     json.member("standardDeviation", s.standardDeviation);
     json.endObject();
-}
-
-template<class Write>
-void memberIf(JsonWriter& json, bool given, std::string_view name, Write write) {
-    json.key(name);
-    if (given)
-        write();
-    else
-        json.null();
 }
 
 /// A criterion that the preset does not name is a figure and no judgement, whatever its tolerance
@@ -121,7 +138,7 @@ void writeFinding(JsonWriter& json, const Finding& finding) {
     const Criterion& criterion = *finding.criterion;
     const bool named = finding.used || finding.tolerance != 0;
     json.beginCompactObject();
-    json.member("index", std::int64_t{criterion.index});
+    memberIf(json, criterion.index != noEntry, "index", [&] { json.integer(criterion.index); });
     json.member("name", criterion.name);
     json.member("title", criterion.title);
     json.member("unit", unit(criterion.quantity));
@@ -134,6 +151,10 @@ void writeFinding(JsonWriter& json, const Finding& finding) {
     json.member("patches", static_cast<std::int64_t>(finding.patches));
     memberIf(json, finding.answered, "worstPatch",
              [&] { json.integer(static_cast<std::int64_t>(finding.worst)); });
+    json.member("needed", static_cast<std::int64_t>(finding.needed));
+    json.member("found", static_cast<std::int64_t>(finding.found));
+    memberIf(json, finding.listed > 0, "listed",
+             [&] { json.integer(static_cast<std::int64_t>(finding.listed)); });
     json.endObject();
 }
 
@@ -154,6 +175,7 @@ void writeWarnings(JsonWriter& json, const std::vector<Warning>& ofComparison,
             json.beginCompactObject();
             json.member("code", warning.code);
             json.member("text", warning.text);
+            json.member("keepsOpen", warning.keepsOpen);
             json.endObject();
         }
     json.endArray();
@@ -174,16 +196,21 @@ void writeDevice(JsonWriter& json, const double* device, std::size_t channels) {
     json.endArray();
 }
 
-void writeIdAndName(JsonWriter& json, const DataSet& set, std::size_t row) {
-    json.text(set.ids.empty() ? std::string_view() : set.ids[row]);
-    json.text(set.names.empty() ? std::string_view() : set.names[row]);
+std::string_view labelOf(const std::vector<std::string>& labels, std::size_t row) {
+    return labels.empty() ? std::string_view() : labels[row];
 }
 
-/// Rows of one file that nothing was compared with.
-void writeUnpaired(JsonWriter& json, const char* key, const Input& input) {
+void writeIdAndName(JsonWriter& json, const DataSet& set, std::size_t row) {
+    json.text(labelOf(set.ids, row));
+    json.text(labelOf(set.names, row));
+}
+
+/// Rows of one file that nothing was compared with; of a target, which may be a chart larger than
+/// the strip, none are listed.
+void writeUnpaired(JsonWriter& json, const char* key, const Input& input, bool isListed) {
     json.key(key);
     json.beginArray();
-    for (const std::uint32_t row : input.unpaired) {
+    for (const std::uint32_t row : isListed ? input.unpaired : std::vector<std::uint32_t>()) {
         const DataSet& set = *input.file.set;
         const std::size_t channels = set.channels.size();
         json.beginCompactArray();
@@ -197,7 +224,8 @@ void writeUnpaired(JsonWriter& json, const char* key, const Input& input) {
 void writeColumns(JsonWriter& json, const Comparison& c) {
     json.key("patchColumns");
     json.beginCompactArray();
-    for (const char* column : {"id", "name", "device", "target", "measured", "difference"})
+    for (const char* column :
+         {"id", "name", "device", "target", "measured", "difference", "measuredId", "measuredName"})
         json.text(column);
     json.endArray();
     json.key("deviceChannels");
@@ -208,8 +236,20 @@ void writeColumns(JsonWriter& json, const Comparison& c) {
     json.endArray();
 }
 
+/// The labels of a patch on the sheet, unless its row already begins with them.
+void writeMeasuredLabels(JsonWriter& json, const DataSet& selection, std::size_t selectedRow,
+                         const DataSet& measurement, std::size_t measuredRow) {
+    const std::string_view id = labelOf(measurement.ids, measuredRow);
+    const std::string_view name = labelOf(measurement.names, measuredRow);
+    if (id == labelOf(selection.ids, selectedRow) && name == labelOf(selection.names, selectedRow))
+        return;
+    json.text(id);
+    json.text(name);
+}
+
 void writePatches(JsonWriter& json, const Comparison& c) {
     const DataSet& labels = *c.selection->file.set;
+    const DataSet* const onSheet = c.measurement.file.set ? &*c.measurement.file.set : nullptr;
     const std::size_t channels = c.devices ? c.devices->file.set->channels.size() : 0;
     json.key("patches");
     json.beginArray();
@@ -220,6 +260,9 @@ void writePatches(JsonWriter& json, const Comparison& c) {
         writeLab(json, c.targetLab[patch]);
         writeLab(json, c.measuredLab[patch]);
         json.number(c.difference[patch]);
+        if (onSheet && onSheet != &labels)
+            writeMeasuredLabels(json, labels, c.selectedRow[patch], *onSheet,
+                                c.measurement.rows[patch]);
         json.endArray();
     }
     json.endArray();
@@ -228,7 +271,8 @@ void writePatches(JsonWriter& json, const Comparison& c) {
 } // namespace
 
 std::wstring resultJson(const Comparison& c, const Judgement& judgement,
-                        const tolerancePresetParameterRecord& preset) {
+                        const tolerancePresetParameterRecord& preset,
+                        const PresetOptions& options) {
     constexpr std::size_t charactersOfHead = 8192;
     constexpr std::size_t charactersOfPatch = 96;
     JsonWriter json(charactersOfHead + c.patchCount() * charactersOfPatch);
@@ -244,7 +288,7 @@ std::wstring resultJson(const Comparison& c, const Judgement& judgement,
     json.member("name", colour::formulaName(c.formula));
     json.member("number", static_cast<std::int64_t>(c.formula));
     json.endObject();
-    writePreset(json, preset);
+    writePreset(json, preset, options);
     json.key("inputs");
     json.beginObject();
     writeInput(json, "target", c.target);
@@ -253,13 +297,14 @@ std::wstring resultJson(const Comparison& c, const Judgement& judgement,
     json.endObject();
     writePairing(json, c);
     writeStatistics(json, judgement.statistics);
+    writeRepeats(json, c.spread);
     writeFindings(json, judgement.findings);
     writeWarnings(json, c.warnings, judgement.warnings);
     json.key("unpaired");
     json.beginObject();
-    writeUnpaired(json, "target", c.target);
-    writeUnpaired(json, "measurement", c.measurement);
-    writeUnpaired(json, "patchSet", c.patchSet);
+    writeUnpaired(json, "target", c.target, false);
+    writeUnpaired(json, "measurement", c.measurement, true);
+    writeUnpaired(json, "patchSet", c.patchSet, true);
     json.endObject();
     writeColumns(json, c);
     writePatches(json, c);

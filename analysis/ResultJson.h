@@ -11,6 +11,6 @@ namespace analysis {
 
 /// ASCII JSON with a line end. The same inputs give the same text.
 std::wstring resultJson(const Comparison& comparison, const Judgement& judgement,
-                        const tolerancePresetParameterRecord& preset);
+                        const tolerancePresetParameterRecord& preset, const PresetOptions& options);
 
 } // namespace analysis

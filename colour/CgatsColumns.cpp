@@ -3,6 +3,7 @@
 #include <algorithm>
 #include <array>
 #include <optional>
+#include <utility>
 
 #include "colour/CgatsLines.h"
 
@@ -128,22 +129,29 @@ std::optional<ColumnMeaning> spectralMeaning(std::string_view squeezedName) {
     return ColumnMeaning{Quantity::Spectral, *wavelength, known->unit};
 }
 
-/// 7CLR_1, CLR_1, PC7_1: the number of the ink from 0.
+/// Numbers above nine as one letter, as in PCA_A: A is 10, D is 13.
+std::optional<int> inkLetter(std::string_view text) {
+    if (text.size() != 1 || text[0] < 'A' || text[0] > 'D')
+        return std::nullopt;
+    return text[0] - 'A' + 10;
+}
+
+/// 7CLR_1, CLR_1, PC7_1, PCA_A: the number of the ink from 0.
 std::optional<int> colorantIndex(std::string_view name) {
     while (!name.empty() && isDigit(name.front()))
         name.remove_prefix(1);
     if (name.starts_with("CLR")) {
         name.remove_prefix(3);
-    } else if (name.size() > 3 && name.starts_with("PC") && isDigit(name[2])) {
+    } else if (name.size() > 4 && name.starts_with("PC") && name[3] == '_' &&
+               (isDigit(name[2]) || inkLetter(name.substr(2, 1)))) {
         name.remove_prefix(3);
-        if (!name.starts_with('_'))
-            return std::nullopt;
     } else {
         return std::nullopt;
     }
     if (name.starts_with('_'))
         name.remove_prefix(1);
-    const std::optional<int> number = smallNumber(name);
+    const std::optional<int> letter = inkLetter(name);
+    const std::optional<int> number = letter ? letter : smallNumber(name);
     if (!number || *number == 0)
         return std::nullopt;
     return *number - 1;
@@ -252,19 +260,41 @@ Group addGroup(Layout& layout, const std::vector<std::size_t>& columns) {
     return group;
 }
 
-void layOutDevice(const Names& names, const Meanings& meanings, Layout& layout) {
+/// Five or more numbered inks are C, M, Y, K and what is printed beside them. Of four nobody knows.
+void takeProcessInks(Meanings& meanings) {
+    constexpr int fewest = 5;
+    if (columnsOf(meanings, Quantity::Cmyk, 4).empty() &&
+        columnsOf(meanings, Quantity::Colorant, fewest).size() == fewest)
+        for (ColumnMeaning& meaning : meanings)
+            if (meaning.quantity == Quantity::Colorant && meaning.index < 4)
+                meaning.quantity = Quantity::Cmyk;
+}
+
+/// The columns of the inks beside C, M, Y, K: numbered ones in their order, then by place.
+std::vector<std::size_t> furtherInks(const Meanings& meanings) {
+    std::vector<std::size_t> columns;
+    for (std::size_t i = 0; i < meanings.size(); ++i)
+        if (meanings[i].quantity == Quantity::Spot ||
+            (meanings[i].quantity == Quantity::Colorant && meanings[i].index > 3))
+            columns.push_back(i);
+    const auto place = [&](std::size_t column) {
+        return std::pair(meanings[column].quantity == Quantity::Spot, meanings[column].index);
+    };
+    std::stable_sort(columns.begin(), columns.end(),
+                     [&](std::size_t a, std::size_t b) { return place(a) < place(b); });
+    return columns;
+}
+
+void layOutDevice(const Names& names, Meanings meanings, Layout& layout) {
+    takeProcessInks(meanings);
     std::vector<std::size_t> columns = columnsOf(meanings, Quantity::Cmyk, 4);
     const std::vector<std::size_t> rgb = columnsOf(meanings, Quantity::Rgb, 3);
     if (columns.size() == 4) {
         layout.deviceSpace = DeviceSpace::Cmyk;
         layout.channels.assign(std::begin(processNames), std::end(processNames));
-        for (std::size_t i = 0; i < meanings.size(); ++i) {
-            const bool fifthInk =
-                meanings[i].quantity == Quantity::Colorant && meanings[i].index > 3;
-            if (meanings[i].quantity == Quantity::Spot || fifthInk) {
-                columns.push_back(i);
-                layout.channels.push_back(toUtf8(names[i]));
-            }
+        for (const std::size_t column : furtherInks(meanings)) {
+            columns.push_back(column);
+            layout.channels.push_back(toUtf8(names[column]));
         }
     } else if (rgb.size() == 3) {
         layout.deviceSpace = DeviceSpace::Rgb;

@@ -5,7 +5,9 @@
 //     MEASUREMENT_CONDITION "M1"                    ILLUMINATION_CONDITION 1
 //     INSTRUMENTATION "D50, 2 degree, geometry 45/0, no polarisation filter, white backing"
 //     MEASUREMENT_SOURCE "Illumination=D50  ObserverAngle=2  WhiteBase=Abs  Filter=UVcut"
-//     FILTER "POL"
+//     MEASUREMENT_SOURCE "MeasurementCondition=M1	Filter=D50"
+//     MEASUREMENT_GEOMETRY "ISO 13655 - Reflection, M1"
+//     FILTER "POL"                                  FILTER "D50"
 #include "colour/CgatsConditions.h"
 
 #include <algorithm>
@@ -153,43 +155,68 @@ void ConditionFinder::see(std::string_view keyword, std::string_view value) {
                 m_measurement.add(Keyword, word);
         }
     }
-    if (is({"INSTRUMENTATION", "MEASUREMENT_SOURCE", "MEASUREMENT_GEOMETRY",
-            "MEASUREMENT_CONDITION", "MEASUREMENT_CONDITIONS", "COMPUTATIONAL_PARAMETER"}))
+    if (keyword == "MEASUREMENT_GEOMETRY")
+        seeProse(Geometry, value);
+    if (is({"INSTRUMENTATION", "MEASUREMENT_SOURCE", "MEASUREMENT_CONDITION",
+            "MEASUREMENT_CONDITIONS", "COMPUTATIONAL_PARAMETER"}))
         seeProse(Prose, value);
+    if (keyword == "MEASUREMENT_SOURCE" && upper.find("TUNGSTEN") != std::string::npos)
+        m_measurement.add(Hint, "M0");
     if (is({"FILTER", "FILTER_STATUS"}))
         seeFilter(value);
     if (is({"POLARIZATION", "POLARISATION"}) && (upper == "YES" || upper == "TRUE" || upper == "1"))
         m_measurement.add(Filter, "M3");
 }
 
-/// Looks for all three in a text, and for parts of the form Filter=UVcut.
+/// Looks for all three in a text, and for named parts such as Filter=UVcut.
 void ConditionFinder::seeProse(Rank rank, std::string_view text) {
-    for (const std::string& word : wordsOf(text)) {
+    std::string rest; // without the named parts
+    for (std::size_t at = 0; at < text.size();) {
+        const std::size_t end = std::min(text.find_first_of(" \t,;", at), text.size());
+        const std::string_view part = text.substr(at, end - at);
+        const std::size_t equals = part.find('=');
+        if (equals == std::string_view::npos)
+            rest.append(part);
+        else
+            seeNamed(upperCase(part.substr(0, equals)), part.substr(equals + 1));
+        if (end < text.size())
+            rest += text[end];
+        at = end + 1;
+    }
+    for (const std::string& word : wordsOf(rest)) {
         if (isIlluminant(word, false))
             m_illuminant.add(rank, word);
         else if (isMeasurementCondition(word))
             m_measurement.add(rank, word);
     }
-    if (const auto observer = observerIn(text))
+    if (const auto observer = observerIn(rest))
         m_observer.add(rank, *observer);
+}
 
-    for (std::size_t at = 0; (at = text.find('=', at)) != std::string_view::npos; ++at) {
-        std::size_t start = at;
-        while (start > 0 && isWordSign(text[start - 1]))
-            --start;
-        const std::string name = upperCase(text.substr(start, at - start));
-        const std::string_view value =
-            text.substr(at + 1, text.find_first_of(" \t,;", at + 1) - at - 1);
-        if (name == "OBSERVERANGLE" || name == "OBSERVER") {
-            if (const auto observer = observerAlone(value))
-                m_observer.add(rank, *observer);
-        } else if (name == "FILTER") {
-            seeFilter(value);
+/// `name` in capitals.
+void ConditionFinder::seeNamed(std::string_view name, std::string_view value) {
+    if (name.ends_with("OBSERVERANGLE") || name.ends_with("OBSERVER")) {
+        if (const auto observer = observerAlone(value))
+            m_observer.add(Named, *observer);
+    } else if (name.ends_with("MEASUREMENTCONDITION")) {
+        for (const std::string& word : wordsOf(value)) {
+            if (isMeasurementCondition(word))
+                m_measurement.add(Named, word);
         }
+    } else if (name.ends_with("ILLUMINATION") || name.ends_with("ILLUMINANT")) {
+        for (const std::string& word : wordsOf(value)) {
+            if (isIlluminant(word, true))
+                m_illuminant.add(Named, word);
+            else if (isMeasurementCondition(word))
+                m_measurement.add(Named, word);
+        }
+    } else if (name.ends_with("FILTER")) {
+        seeFilter(value);
     }
 }
 
-/// ISO 13655: M2 is without ultraviolet, M3 polarised besides. No filter at all may be M0 or M1.
+/// ISO 13655: M1 is daylight, which some software calls a D50 filter, M2 is without ultraviolet, M3
+/// polarised. No filter is the word for M0, but devices that only know M1 write it too.
 void ConditionFinder::seeFilter(std::string_view text) {
     const std::vector<std::string> words = wordsOf(text);
     const auto holds = [&](std::initializer_list<std::string_view> names) {
@@ -197,12 +224,21 @@ void ConditionFinder::seeFilter(std::string_view text) {
             return std::find(names.begin(), names.end(), word) != names.end();
         });
     };
-    if (holds({"NO", "NONE", "INCLUDED", "UVIN", "UVINC"}))
+    for (const std::string& word : words) {
+        if (isMeasurementCondition(word))
+            m_measurement.add(Filter, word);
+    }
+    if (holds({"NO"}))
+        m_measurement.add(Hint, "M0");
+    else if (holds({"NONE", "INCLUDED", "UVIN", "UVINC"}))
         return;
-    if (holds({"POL", "POLARIZED", "POLARISED", "POLARIZATION", "POLARISATION", "POLARIZER"}))
+    else if (holds({"POL", "POLARIZED", "POLARISED", "POLARIZATION", "POLARISATION", "POLARIZER",
+                    "POLARISER"}))
         m_measurement.add(Filter, "M3");
     else if (holds({"UV", "UVCUT", "UVEX", "UVEXCLUDED", "UVFILTER"}))
         m_measurement.add(Filter, "M2");
+    else if (holds({"D50"}))
+        m_measurement.add(Filter, "M1");
 }
 
 Conditions ConditionFinder::result() const {

@@ -8,8 +8,8 @@
 
 namespace colour::cgats {
 
-/// Gathers statements. The plainest kind of statement counts: a keyword of its own before a text
-/// about the instrument, that before a filter. Statements of one kind that differ cancel out.
+/// Gathers statements. The plainest kind of statement counts, in the order of Rank. Statements of
+/// one kind that differ cancel out.
 class ConditionFinder {
   public:
     /// `keyword` in capitals, `value` UTF-8.
@@ -18,7 +18,15 @@ class ConditionFinder {
     Conditions result() const;
 
   private:
-    enum Rank { Keyword, Prose, Filter, None };
+    enum Rank {
+        Keyword,  ///< A keyword of its own, such as MEASUREMENT_CONDITION.
+        Named,    ///< A named part of a text, such as MeasurementCondition=M1.
+        Filter,   ///< A filter that is in the way of the light.
+        Geometry, ///< A word in MEASUREMENT_GEOMETRY.
+        Prose,    ///< A word in a text about the instrument.
+        Hint,     ///< No filter at all, or a lamp: M0 in practice.
+        None
+    };
     struct Statement {
         Rank rank = None;
         std::string value;
@@ -28,6 +36,7 @@ class ConditionFinder {
     };
 
     void seeProse(Rank rank, std::string_view text);
+    void seeNamed(std::string_view name, std::string_view value);
     void seeFilter(std::string_view text);
 
     Statement m_illuminant;

@@ -281,7 +281,6 @@ Failure TextReader::read(DataSet& set) {
     }
     if (m_tables == 0)
         return Failure::Damaged; // breaks off before its rows
-    const bool hadColour = !m_table.set.lab.empty() || !m_table.set.xyz.empty();
     if (const Failure failure = complete(m_table, m_scaleHint, m_wants, m_notes);
         failure != Failure::None)
         return failure;
@@ -293,11 +292,6 @@ Failure TextReader::read(DataSet& set) {
     set.instrumentation = std::move(m_texts.instrumentation);
     set.printing = std::move(m_texts.printing.empty() ? m_printConditions : m_texts.printing);
     set.conditions = m_conditions.result();
-    const Conditions& stated = set.conditions;
-    const bool otherLight = !stated.illuminant.empty() && stated.illuminant != "D50";
-    const bool otherObserver = !stated.observer.empty() && stated.observer != "2";
-    if (hadColour && (otherLight || otherObserver))
-        m_notes.add("The colour values are stated for other conditions than D50 and 2 degrees.");
     set.notes = m_notes.take();
     return Failure::None;
 }
@@ -527,6 +521,18 @@ Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set)
             DataSet withSpectra;
             if (TextReader(bytes, {}).read(withSpectra) == Failure::None && !isBlack(withSpectra))
                 result = std::move(withSpectra);
+        }
+        if (!result.conditions.areUsual() && result.hasColour() && !wants.calculated) {
+            DataSet calculated;
+            const CgatsWants again{.spectra = true, .calculated = true};
+            if (TextReader(bytes, again).read(calculated) == Failure::None &&
+                calculated.calculated) {
+                result = std::move(calculated);
+                if (!wants.spectra) {
+                    result.spectra = {};
+                    result.axis = {};
+                }
+            }
         }
         set = std::move(result);
         return Failure::None;

@@ -18,7 +18,8 @@ inline constexpr std::size_t maxCgatsPatches = 10'000'000;
 
 /// What a caller needs of a file; the reader skips the rest.
 struct CgatsWants {
-    bool spectra = true; ///< False: spectra are kept only if they are the sole colour values.
+    bool spectra = true;     ///< False: spectra are kept only if they are the sole colour values.
+    bool calculated = false; ///< True: usable spectra take the place of stated colour values.
     std::string condition = {}; ///< "M1": read this one of several that a file has (readCxf).
 };
 
@@ -33,6 +34,9 @@ bool looksLikeCgats(std::string_view bytes);
 /// Rows stay in the text's order, repeated ids included. Scales are decided by whole columns. What
 /// had to be assumed or mended is in the set's notes, but a text that breaks off is Damaged:
 /// without END_DATA it must hold the stated number of rows, the last one with its line end.
+///
+/// A text that states another illuminant than D50 or another observer than 2 degrees is read as if
+/// `wants.calculated` were true.
 ///
 /// Gives a data set with colour values, device values, or both, all of them finite; which of them a
 /// caller needs is the caller's affair. On failure `set` is left as it was.

@@ -59,7 +59,11 @@ void addHeader(std::string& text, const DataSet& set) {
     addHeaderText(text, "DESCRIPTOR", set.descriptor);
     addHeaderText(text, "CREATED", set.created);
     addHeaderText(text, "INSTRUMENTATION", set.instrumentation);
-    const Conditions& conditions = set.conditions;
+    Conditions conditions = set.conditions;
+    if (set.calculated) { // the colours are no longer for what the source stated
+        conditions.illuminant = "D50";
+        conditions.observer = "2";
+    }
     if (!conditions.illuminant.empty())
         addHeaderText(text, "WEIGHTING_FUNCTION", "ILLUMINANT, " + conditions.illuminant);
     if (!conditions.observer.empty())

@@ -12,6 +12,7 @@ struct Lab {
     double L = 0;
     double a = 0;
     double b = 0;
+    bool operator==(const Lab&) const = default;
 };
 
 /// CIE XYZ under D50 for the 2 degree observer; Y of the perfect diffuser is 100.
@@ -42,6 +43,11 @@ struct Conditions {
     std::string observer;    ///< "2" or "10" (degrees)
     std::string measurement; ///< "M0" to "M3"
     bool operator==(const Conditions&) const = default;
+
+    /// False if the illuminant or observer stated is another than D50 or 2 degrees.
+    bool areUsual() const {
+        return (illuminant.empty() || illuminant == "D50") && (observer.empty() || observer == "2");
+    }
 };
 
 /// Structure of arrays: row i of every array that is not empty belongs to patch i.
@@ -54,20 +60,26 @@ struct DataSet {
     std::vector<std::string> channels; ///< Names of the device channels, such as "CMYK_C".
     std::vector<double> device;        ///< channels.size() values a patch, 0 to 100.
 
+    // Of a file that states another illuminant than D50 or observer than 2 degrees both are from
+    // the spectra, if it has any that can be used.
     std::vector<Lab> lab; ///< As stated by the file, else from xyz, else from spectra.
     std::vector<Xyz> xyz; ///< As stated by the file, else from spectra, else from lab.
 
     SpectralAxis axis;
-    std::vector<double> spectra; ///< axis.length reflectances a patch, 0 to 1 (brighteners exceed 1).
+    std::vector<double>
+        spectra; ///< axis.length reflectances a patch, 0 to 1 (brighteners exceed 1).
 
     std::string originator; ///< Header texts, UTF-8, empty where absent.
     std::string descriptor;
     std::string created;
     std::string instrumentation;
     std::string printing; ///< The printer, otherwise the printing conditions.
-    Conditions conditions;
+    Conditions conditions;   ///< As stated.
+    bool calculated = false; ///< lab and xyz are from the spectra, since those that the file states
+                             ///< are for another illuminant than D50 or observer than 2 degrees.
 
-    std::vector<std::string> notes; ///< What the reader had to assume or mend, for a person to read.
+    std::vector<std::string>
+        notes; ///< What the reader had to assume or mend, for a person to read.
 
     bool hasColour() const { return !lab.empty(); }
     bool hasDevice() const { return deviceSpace != DeviceSpace::None; }

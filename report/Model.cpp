@@ -76,6 +76,15 @@ std::string deviceText(const Result& result, std::size_t patch) {
     return text.empty() ? text : text + ")";
 }
 
+/// Why a criterion has no answer.
+std::string missingText(const Criterion& criterion) {
+    if (criterion.found > 0)
+        return "only " + std::to_string(criterion.found) + " of the " +
+               std::to_string(criterion.needed) + " different patches that it needs";
+    return criterion.name == "repeatSpread" ? "no patch was measured more than once"
+                                            : "the data hold no such patches";
+}
+
 Figure figureOf(const Criterion& criterion, const Result& result) {
     Figure figure;
     figure.title = criterion.title;
@@ -89,6 +98,11 @@ Figure figureOf(const Criterion& criterion, const Result& result) {
     figure.tolerance = dash;
     if (criterion.worstPatch)
         figure.worstLabel = labelOf(result, *criterion.worstPatch);
+    if (criterion.outcome == Outcome::Unanswered)
+        figure.missing = missingText(criterion);
+    if (criterion.listed > criterion.found && criterion.found > 0)
+        figure.title += " (" + std::to_string(criterion.found) + " of " +
+                        std::to_string(criterion.listed) + " patches)";
     if (!criterion.tolerance)
         return figure;
 
@@ -117,7 +131,8 @@ void putInOrder(std::vector<Figure>& judged) {
     });
 }
 
-void sayVerdict(Model& model, Verdict verdict) {
+void sayVerdict(Model& model, const Result& result) {
+    const Verdict verdict = result.verdict;
     model.verdict = verdict;
     std::size_t failed = 0;
     std::size_t open = 0;
@@ -128,9 +143,12 @@ void sayVerdict(Model& model, Verdict verdict) {
                                     figure.distance + " the tolerance of " + figure.tolerance);
         } else if (figure.outcome != Outcome::Pass) {
             ++open;
-            model.reasons.push_back(figure.title + ": the data hold no such patches");
+            model.reasons.push_back(figure.title + ": " + figure.missing);
         }
     }
+    for (const Warning& warning : result.warnings)
+        (warning.keepsOpen && verdict == Verdict::Incomplete ? model.doubts : model.warnings)
+            .push_back(warning.text);
     const std::size_t all = model.judged.size();
     model.word = report::wordOf(verdict);
     switch (verdict) {
@@ -151,6 +169,10 @@ void sayVerdict(Model& model, Verdict verdict) {
     case Verdict::Incomplete:
         if (all == 0)
             model.sentence = "The preset judges no criterion, so nothing can pass.";
+        else if (open == 0 && failed == 0 && !model.doubts.empty())
+            model.sentence =
+                "Every figure is within its tolerance, but the comparison itself is in "
+                "doubt, so it can't pass.";
         else
             model.sentence =
                 std::to_string(open) + " of " + counted(all, "criterion", "criteria") +
@@ -158,6 +180,25 @@ void sayVerdict(Model& model, Verdict verdict) {
                 (failed == 0 ? std::string(".") : ", " + std::to_string(failed) + " failed.");
         return;
     }
+}
+
+/// "Measured M1, target M0, preset asks for M1 and requires it"
+std::string conditionText(const Result& result) {
+    const std::string& measured = result.measurement.measurementCondition;
+    const std::string& target = result.target.measurementCondition;
+    const bool isAsked = result.presetCondition >= 0 && result.presetCondition <= 3;
+    if (measured.empty() && target.empty() && !isAsked)
+        return {};
+    const auto stated = [](const std::string& condition) {
+        return condition.empty() ? std::string("not stated") : condition;
+    };
+    std::string text =
+        "Measuring condition: measurement " + stated(measured) + ", target " + stated(target);
+    if (isAsked)
+        text += std::string(", preset ") +
+                (result.conditionRequired ? "requires M" : "asks for M") +
+                std::to_string(result.presetCondition);
+    return text;
 }
 
 /// Largest first; what is no number comes last; equals stay in the result's order.
@@ -237,10 +278,11 @@ std::string foundBy(const std::string& how) {
 std::string listed(const Unpaired& unpaired) {
     if (unpaired.count == 0)
         return {};
-    std::string text = std::to_string(unpaired.count) + ":";
+    std::string text = std::to_string(unpaired.count) + (unpaired.labels.empty() ? "" : ":");
     for (const std::string& label : unpaired.labels)
         text += ' ' + label;
-    return unpaired.count > unpaired.labels.size() ? text + " ..." : text;
+    return !unpaired.labels.empty() && unpaired.count > unpaired.labels.size() ? text + " ..."
+                                                                               : text;
 }
 
 Facts factsOf(const Input& input) {
@@ -279,12 +321,32 @@ void addSections(Model& model, const Result& result, const Meta* meta) {
             result.selection == "patchSet" ? "the patch set" : "the " + result.selection);
     addFact(pairing, "Target values from", foundBy(result.targetBy));
     addFact(pairing, "Measured values from", foundBy(result.measurementBy));
-    addFact(pairing, "Without counterpart in the target", listed(result.unpairedTarget));
-    addFact(pairing, "Without counterpart in the measurement", listed(result.unpairedMeasurement));
-    addFact(pairing, "Without counterpart in the patch set", listed(result.unpairedPatchSet));
+    addFact(pairing, "Patches of the target that were not measured", listed(result.unpairedTarget));
+    addFact(pairing, "Measured patches without a target", listed(result.unpairedMeasurement));
+    addFact(pairing, "Patches of the patch set that the files lack",
+            listed(result.unpairedPatchSet));
+    if (result.repeats.patches > 0) {
+        addFact(pairing, "Measured more than once",
+                counted(result.repeats.patches, "patch", "patches") + ", " +
+                    counted(result.repeats.readings, "reading", "readings") +
+                    (result.repeats.averaged ? "; their means are compared"
+                                             : "; each is compared by itself"));
+        if (result.repeats.worstPatch && result.repeats.largestDistance)
+            addFact(pairing, "Furthest from the mean of its readings",
+                    fixedText(*result.repeats.largestDistance, 2) + " " + model.unit + ", " +
+                        labelOf(result, *result.repeats.worstPatch));
+    }
     model.sections.emplace_back("Pairing", pairing);
     model.sections.emplace_back(
         "Made by", Facts{{"Tintgate", result.toolVersion}, {"libTintgate", result.libraryVersion}});
+}
+
+void addRepeats(Model& model, const Result& result) {
+    const Repeats& repeats = result.repeats;
+    if (repeats.patches == 0 || !repeats.largestDistance)
+        return;
+    model.statistics.emplace_back("Read repeatedly", std::to_string(repeats.patches));
+    model.statistics.emplace_back("Spread of repeats", fixedText(*repeats.largestDistance, 2));
 }
 
 void addHead(Model& model, const Result& result, const Meta* meta) {
@@ -315,11 +377,16 @@ const char* wordOf(Verdict verdict) {
 
 std::string labelOf(const Result& result, std::size_t index) {
     const Patch& patch = result.patches[index];
+    const auto joined = [](const std::string& id, const std::string& name) {
+        return id.empty() || name.empty() || name == id ? id + (name == id ? "" : name)
+                                                        : id + " " + name;
+    };
+    const std::string inTarget = joined(patch.id, patch.name);
+    const std::string onSheet = joined(patch.measuredId, patch.measuredName);
     const std::string device = deviceText(result, index);
-    if (patch.id.empty())
-        return (patch.name.empty() ? "row " + std::to_string(index + 1) : patch.name) + device;
-    return (patch.name.empty() || patch.name == patch.id ? patch.id : patch.id + " " + patch.name) +
-           device;
+    if (onSheet.empty() || onSheet == inTarget)
+        return (inTarget.empty() ? "row " + std::to_string(index + 1) : inTarget) + device;
+    return onSheet + device + (inTarget.empty() ? "" : ", in the target " + inTarget);
 }
 
 std::string fixedText(double value, int decimals) {
@@ -384,7 +451,8 @@ Model makeModel(const Result& result, const Meta* meta) {
     for (const Criterion& criterion : result.criteria)
         (criterion.used ? model.judged : model.others).push_back(figureOf(criterion, result));
     putInOrder(model.judged);
-    sayVerdict(model, result.verdict);
+    sayVerdict(model, result);
+    model.condition = conditionText(result);
     const Statistics& s = result.statistics;
     model.statistics = {{"Patches", std::to_string(result.patches.size())},
                         {"Average", fixedText(s.mean, 2)},
@@ -392,7 +460,7 @@ Model makeModel(const Result& result, const Meta* meta) {
                         {"95th percentile", fixedText(s.percentile95, 2)},
                         {"Largest", fixedText(s.maximum, 2)},
                         {"Standard deviation", fixedText(s.standardDeviation, 2)}};
-    model.warnings = result.warnings;
+    addRepeats(model, result);
     drawHistogram(model, result);
     for (const std::size_t patch : worstFirst(result.patches))
         model.rows.push_back(

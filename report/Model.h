@@ -27,6 +27,7 @@ struct Figure {
     double fill = 0; ///< Value as a share of twice the tolerance, 0 to 1: half is the limit.
     std::size_t patches = 0;
     std::string worstLabel; ///< Worst patch with its device values, or empty.
+    std::string missing;    ///< Why there is no data; empty with an answer.
     double excess = 0;      ///< Value over tolerance, for the order; infinite for a tolerance of 0.
 };
 
@@ -58,13 +59,15 @@ struct Model {
     Verdict verdict = Verdict::Incomplete;
     std::string word;                 ///< "Passed", "Failed", "Incomplete".
     std::string sentence;             ///< What the verdict rests on.
+    std::vector<std::string> doubts;  ///< Of an incomplete verdict: warnings that keep it open.
     std::vector<std::string> reasons; ///< Failed criteria, the furthest above first; then those
                                       ///< without data.
-    std::string unit;                 ///< Of the differences, such as "ΔE00".
-    std::vector<Figure> judged;       ///< Used criteria: failed, without data, passed.
-    std::vector<Figure> others;       ///< The rest, in the result's order.
+    std::string condition; ///< Measuring condition of measurement, target and preset; may be empty.
+    std::string unit;      ///< Of the differences, such as "ΔE00".
+    std::vector<Figure> judged; ///< Used criteria: failed, without data, passed.
+    std::vector<Figure> others; ///< The rest, in the result's order.
     Facts statistics;
-    std::vector<std::string> warnings;
+    std::vector<std::string> warnings; ///< Without the doubts.
     std::vector<Bin> histogram;
     std::vector<Mark> marks;
     std::string histogramText;      ///< The same in words, for those who can't see it.
@@ -89,7 +92,8 @@ std::vector<Bin> histogramOf(const std::vector<double>& values);
 /// "Passed", "Failed", "Incomplete".
 const char* wordOf(Verdict verdict);
 
-/// A patch for a person: its id and name or, without either, its row; then its device values.
+/// A patch for a person who looks for it on the sheet: its id and name there or, without either, in
+/// the target, or its row; its device values; and its label in the target if that is another.
 std::string labelOf(const Result& result, std::size_t patch);
 
 /// Fixed decimals with a point in every locale; "–" where not finite.

@@ -20,7 +20,8 @@ double less(double measured, double target) {
 
 /// Rows are the bulk of a page, so they are written without a tree:
 /// [index, id, name, [device], [target Lab], [measured Lab], [measured less target], difference,
-///  target swatch, measured swatch]; a swatch is "#rrggbb", with "!" behind it where it is clipped.
+///  target swatch, measured swatch, measured id, measured name]; a swatch is "#rrggbb", with "!"
+/// after it if it is clipped. The last two are left out if they are the id and name.
 void appendRow(std::string& text, const Result& result, const Row& row) {
     const Patch& patch = result.patches[row.patch];
     const auto list = [&](std::initializer_list<double> values) {
@@ -47,7 +48,10 @@ void appendRow(std::string& text, const Result& result, const Row& row) {
           less(patch.measured.b, patch.target.b)});
     appendNumber(text, patch.difference);
     text += ',';
-    text += '"' + swatchText(row.target) + "\",\"" + swatchText(row.measured) + "\"]";
+    text += '"' + swatchText(row.target) + "\",\"" + swatchText(row.measured) + '"';
+    if (patch.measuredId != patch.id || patch.measuredName != patch.name)
+        text += ',' + inScript(patch.measuredId) + ',' + inScript(patch.measuredName);
+    text += ']';
 }
 
 Json figures(const std::vector<Figure>& figures) {
@@ -100,7 +104,9 @@ std::string dataOf(const Model& model, const Result& result) {
                        {"verdict", keyOf(model.verdict)},
                        {"word", model.word},
                        {"sentence", model.sentence},
+                       {"doubts", model.doubts},
                        {"reasons", model.reasons},
+                       {"condition", model.condition},
                        {"unit", model.unit},
                        {"judged", figures(model.judged)},
                        {"others", figures(model.others)},

@@ -35,6 +35,12 @@ std::optional<double> optionalNumber(const Json& value) {
     return value.is_null() ? std::nullopt : std::optional(value.get<double>());
 }
 
+/// Nothing if the member is null or absent, as in results of older versions.
+std::optional<std::size_t> optionalCount(const Json& json, const char* key) {
+    const auto found = json.find(key);
+    return found == json.end() || found->is_null() ? std::nullopt : std::optional(count(*found));
+}
+
 template<class Value>
 Value oneOf(const Json& text, const std::map<std::string, Value>& words) {
     const auto found = words.find(text.get<std::string>());
@@ -65,6 +71,11 @@ Criterion criterion(const Json& json) {
     c.patches = count(json.at("patches"));
     if (const Json& worst = json.at("worstPatch"); !worst.is_null())
         c.worstPatch = count(worst);
+    if (const auto found = json.find("found"); found != json.end()) {
+        c.found = count(*found);
+        c.needed = count(json.at("needed"));
+        c.listed = optionalCount(json, "listed").value_or(0);
+    }
     return c;
 }
 
@@ -83,6 +94,11 @@ Input input(const Json& json) {
           std::pair{"measurementCondition", "Measurement condition"}})
         if (const auto found = json.find(key); found != json.end() && found->is_string())
             input.statements.emplace_back(title, found->get<std::string>());
+    if (json.value("calculatedFromSpectra", false))
+        input.statements.emplace_back("Colours", "calculated from the spectra for D50, 2 degrees");
+    if (const auto found = json.find("measurementCondition");
+        found != json.end() && found->is_string())
+        input.measurementCondition = *found;
     return input;
 }
 
@@ -121,8 +137,10 @@ class Rows {
 
   private:
     void takePatch(const Json& row) {
-        m_result.patches.push_back(
-            {row.at(0), row.at(1), lab(row.at(3)), lab(row.at(4)), number(row.at(5))});
+        const bool isRelabelled = row.size() > 7; // else the sheet has the same labels
+        m_result.patches.push_back({row.at(0), row.at(1), lab(row.at(3)), lab(row.at(4)),
+                                    number(row.at(5)), row.at(isRelabelled ? 6 : 0),
+                                    row.at(isRelabelled ? 7 : 1)});
         const Json& device = row.at(2);
         if (m_result.patches.size() == 1)
             m_channels = device.size();
@@ -164,7 +182,11 @@ void fill(Result& result, const Json& json) {
                                                          {"incomplete", Verdict::Incomplete}});
     result.formula = json.at("formula").at("name");
     result.presetName = json.at("preset").at("name");
-    result.presetId = whole(json.at("preset").at("id"));
+    const Json& preset = json.at("preset");
+    result.presetId = whole(preset.at("id"));
+    result.presetCondition = whole(preset.at("illuminationCondition"));
+    result.conditionRequired = preset.value("conditionRequired", false);
+    result.repeats.averaged = preset.value("repeats", "each") == "mean";
     const Json& inputs = json.at("inputs");
     result.target = input(inputs.at("target"));
     result.measurement = input(inputs.at("measurement"));
@@ -174,11 +196,19 @@ void fill(Result& result, const Json& json) {
     result.selection = pairing.at("selection");
     result.targetBy = pairing.at("target");
     result.measurementBy = pairing.at("measurement");
+    if (const auto listed = pairing.find("unpairedTarget"); listed != pairing.end())
+        result.unpairedTarget.count = count(*listed); // which are not listed
     result.statistics = statistics(json.at("statistics"));
+    if (const auto repeats = json.find("repeats"); repeats != json.end()) {
+        result.repeats.patches = count(repeats->at("patches"));
+        result.repeats.readings = count(repeats->at("readings"));
+        result.repeats.largestDistance = optionalNumber(repeats->at("largestDistance"));
+        result.repeats.worstPatch = optionalCount(*repeats, "worstPatch");
+    }
     for (const Json& item : json.at("criteria"))
         result.criteria.push_back(criterion(item));
     for (const Json& item : json.at("warnings"))
-        result.warnings.push_back(item.at("text"));
+        result.warnings.push_back({item.at("text"), item.value("keepsOpen", false)});
     for (const Json& item : json.at("deviceChannels"))
         result.channels.push_back(item);
 }
@@ -187,6 +217,8 @@ void checkWorstPatches(const Result& result) {
     for (const Criterion& c : result.criteria)
         if (c.worstPatch && *c.worstPatch >= result.patches.size())
             throw std::runtime_error("a criterion names a patch that is not there");
+    if (result.repeats.worstPatch && *result.repeats.worstPatch >= result.patches.size())
+        throw std::runtime_error("the repeats name a patch that is not there");
 }
 
 } // namespace

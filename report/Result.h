@@ -28,6 +28,9 @@ struct Criterion {
     int decimals = 2;              ///< 0 to 6.
     std::size_t patches = 0;
     std::optional<std::size_t> worstPatch; ///< Index into `patches`.
+    std::size_t needed = 1;                ///< Different patches that an answer takes.
+    std::size_t found = 0;                 ///< Different patches that there are.
+    std::size_t listed = 0; ///< Length of the list that they are chosen by; 0 without one.
 };
 
 /// Numbers are NaN where the result has null.
@@ -37,6 +40,8 @@ struct Patch {
     colour::Lab target;
     colour::Lab measured;
     double difference = 0;
+    std::string measuredId = {}; ///< On the sheet; often the same as the id and name.
+    std::string measuredName = {};
 };
 
 /// One side of the comparison, with what its file says of itself. Empty where it says nothing.
@@ -45,6 +50,22 @@ struct Input {
     std::string kind; ///< "text" or "profile".
     std::string identity; ///< Of a target's colours; empty in results of versions before it.
     std::vector<std::pair<std::string, std::string>> statements;
+    std::string measurementCondition; ///< "M0" to "M3", or empty.
+};
+
+struct Warning {
+    std::string text;
+    bool keepsOpen = false; ///< Because of this the verdict is at best "incomplete".
+};
+
+/// Patches that were measured more than once. Distances are of a reading from the mean of its
+/// patch's readings.
+struct Repeats {
+    bool averaged = false; ///< Their means were compared, not each reading by itself.
+    std::size_t patches = 0;
+    std::size_t readings = 0; ///< Of these patches.
+    std::optional<double> largestDistance;
+    std::optional<std::size_t> worstPatch; ///< Index into `patches` of the result.
 };
 
 struct Statistics {
@@ -69,6 +90,8 @@ struct Result {
     std::string formula; ///< Such as "CIE2000".
     std::string presetName;
     std::int64_t presetId = 0;
+    std::int64_t presetCondition = -1; ///< 0 to 3 are M0 to M3; others ask for none.
+    bool conditionRequired = false;
     Input target;
     Input measurement;
     std::optional<Input> patchSet;
@@ -77,7 +100,8 @@ struct Result {
     std::string targetBy;
     Statistics statistics;
     std::vector<Criterion> criteria;
-    std::vector<std::string> warnings;
+    std::vector<Warning> warnings;
+    Repeats repeats;
     Unpaired unpairedTarget;
     Unpaired unpairedMeasurement;
     Unpaired unpairedPatchSet;
@@ -86,7 +110,8 @@ struct Result {
     std::vector<double> device;        ///< Percent; channels.size() for each patch.
 };
 
-/// Reads a whole result, patches row by row without a tree of them. Nothing where the text is no
+/// Reads a whole result, patches row by row without a tree of them. Members that older versions of
+/// the library did not write have their initial values. Nothing if the text is no
 /// result of a format that this version knows; `problem` then says why.
 std::optional<Result> readResult(std::string_view json, std::string& problem);
 

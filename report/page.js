@@ -8,7 +8,7 @@
 
   // Fields of a row.
   const [INDEX, ID, NAME, DEVICE, TARGET, MEASURED, DELTA, DIFFERENCE, TARGET_SWATCH,
-    MEASURED_SWATCH] = Array(10).keys();
+    MEASURED_SWATCH, SHEET_ID, SHEET_NAME] = Array(12).keys();
 
   const fixed = (value, decimals) =>
     value === null ? "–" : value.toFixed(decimals).replace(/^-(0\.?0*)$/, "$1");
@@ -24,12 +24,16 @@
     document.querySelector("#verdict .sign").textContent = signs[data.verdict];
     byId("word").textContent = data.word;
     byId("sentence").textContent = data.sentence;
+    for (const doubt of data.doubts) byId("reasons").append(make("li", "", doubt));
     const shown = data.reasons.length > 4 ? 3 : data.reasons.length;
     for (const reason of data.reasons.slice(0, shown)) {
       byId("reasons").append(make("li", "", reason));
     }
     if (data.reasons.length > shown) {
       byId("reasons").append(make("li", "", `${data.reasons.length - shown} more below`));
+    }
+    if (data.condition) {
+      byId("reasons").after(make("p", "condition", data.condition));
     }
     for (const warning of data.warnings) byId("warnings").append(make("p", "", warning));
     byId("warnings").hidden = data.warnings.length === 0;
@@ -91,16 +95,26 @@
   const byNumber = (get) => (a, b) => (get(a) ?? -Infinity) - (get(b) ?? -Infinity);
   const channels = data.channels.map((name) => name.replace(/^[A-Z0-9]+_(?=.)/, "")).join(" ");
 
+  // A row has labels of the sheet only if they differ from those of the target.
+  const sheetId = (row) => (row.length > SHEET_ID ? row[SHEET_ID] : row[ID]);
+  const sheetName = (row) => (row.length > SHEET_ID ? row[SHEET_NAME] : row[NAME]);
+  const isRelabelled = data.rows.some((row) => row.length > SHEET_ID);
+  const labelled = (title, id, name, text, hidden) => ({
+    title, kind: "patch", hidden,
+    order: (a, b) => natural.compare(text(a), text(b)) || a[INDEX] - b[INDEX],
+    fill(cell, row) {
+      cell.textContent = text(row);
+      if (id(row) !== "" && name(row) !== "" && name(row) !== id(row)) {
+        cell.append(" ", make("span", "name", name(row)));
+      }
+    } });
+
   // Title, class of the cells, order of rows (falling first where `falls`), cell.
   const columns = [
-    { title: "Patch", kind: "patch",
-      order: (a, b) => natural.compare(patchText(a), patchText(b)) || a[INDEX] - b[INDEX],
-      fill(cell, row) {
-        cell.textContent = patchText(row);
-        if (row[ID] !== "" && row[NAME] !== "" && row[NAME] !== row[ID]) {
-          cell.append(" ", make("span", "name", row[NAME]));
-        }
-      } },
+    labelled("On the sheet", sheetId, sheetName, (row) => sheetId(row) || sheetName(row) || "–",
+      !isRelabelled),
+    labelled(isRelabelled ? "In the target" : "Patch", (row) => row[ID], (row) => row[NAME],
+      patchText, false),
     { title: "Target, measured", kind: "swatches", order: byNumber((row) => row[TARGET][0]),
       fill(cell, row) {
         cell.append(swatchPair([["Target", row[TARGET_SWATCH]],
@@ -148,7 +162,9 @@
   function choose() {
     const wanted = byId("find").value.trim().toLowerCase();
     rows = data.rows.filter((row) => wanted === "" || row[ID].toLowerCase().includes(wanted) ||
-      row[NAME].toLowerCase().includes(wanted) || device(row).join(" ") === wanted ||
+      row[NAME].toLowerCase().includes(wanted) ||
+      sheetId(row).toLowerCase().includes(wanted) ||
+      sheetName(row).toLowerCase().includes(wanted) || device(row).join(" ") === wanted ||
       patchText(row) === wanted);
     rows.sort((a, b) => (falling ? sorted.order(b, a) : sorted.order(a, b)));
     start = 0;
@@ -183,9 +199,10 @@
       return /[",\r\n]/.test(safe) ? `"${safe.replaceAll("\"", "\"\"")}"` : safe;
     };
     const head = ["id", "name", ...data.channels, "target_L", "target_a", "target_b",
-      "measured_L", "measured_a", "measured_b", "difference"];
+      "measured_L", "measured_a", "measured_b", "difference", "measured_id", "measured_name"];
     const lines = [...data.rows].sort((a, b) => a[INDEX] - b[INDEX]).map((row) =>
-      [row[ID], row[NAME], ...row[DEVICE], ...row[TARGET], ...row[MEASURED], row[DIFFERENCE]]);
+      [row[ID], row[NAME], ...row[DEVICE], ...row[TARGET], ...row[MEASURED], row[DIFFERENCE],
+        sheetId(row), sheetName(row)]);
     return [head, ...lines].map((line) => line.map(cell).join(",")).join("\r\n") + "\r\n";
   }
 
@@ -198,6 +215,7 @@
   }
 
   function showPatches() {
+    byId("patches").classList.toggle("relabelled", isRelabelled);
     showHeadings();
     showRows();
     byId("find").addEventListener("input", choose);

@@ -36,7 +36,8 @@ std::string patchesCsv(const report::Result& result) {
         appendText(csv, channel);
         csv += ',';
     }
-    csv += "target_L,target_a,target_b,measured_L,measured_a,measured_b,difference\n";
+    csv += "target_L,target_a,target_b,measured_L,measured_a,measured_b,difference,"
+           "measured_id,measured_name\n";
     const std::size_t channels = result.channels.size();
     for (std::size_t i = 0; i < result.patches.size(); ++i) {
         const report::Patch& patch = result.patches[i];
@@ -53,6 +54,10 @@ std::string patchesCsv(const report::Result& result) {
             for (const double value : {lab.L, lab.a, lab.b})
                 number(value);
         number(patch.difference);
+        for (const std::string& label : {patch.measuredId, patch.measuredName}) {
+            csv += ',';
+            appendText(csv, label);
+        }
         csv += '\n';
     }
     return csv;

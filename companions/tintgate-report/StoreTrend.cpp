@@ -178,7 +178,8 @@ bool addCriteria(report::Sample& sample, const Results& results, const Preset& p
         const auto position = static_cast<std::size_t>(at - std::begin(criterionAt));
         const bool holdsAverage = position == spotPosition && preset.psd() &&
                                   preset.values->usedForPSDResult[psdSpotMaximum] != 1;
-        if (at == std::end(criterionAt) || position >= results.measured.size() || holdsAverage)
+        if (known.index == analysis::noEntry || at == std::end(criterionAt) ||
+            position >= results.measured.size() || holdsAverage)
             continue;
         report::Criterion criterion = criterionOf(known, preset);
         changed |= judge(criterion, results.measured[position],

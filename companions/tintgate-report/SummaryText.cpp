@@ -38,7 +38,7 @@ std::string criteriaText(const report::Model& model, const Painter& paint) {
                          {"of " + figure.tolerance, Tone::Plain, true},
                          {figure.unit, Tone::Soft},
                          {figure.distance},
-                         {figure.worstLabel, Tone::Soft}});
+                         {figure.worstLabel + figure.missing, Tone::Soft}});
     }
     return lines.empty() ? "" : '\n' + tableText(lines, paint);
 }
@@ -157,6 +157,10 @@ std::string summaryText(const report::Result& result, const report::Meta* meta,
     std::string text = paint(mark.tone, mark.sign + model.word) + "  " +
                        paint(Tone::Bold, model.title) + '\n' + paint(Tone::Soft, model.subtitle) +
                        '\n' + model.sentence + '\n';
+    for (const std::string& doubt : model.doubts)
+        text += "  " + paint(Tone::Open, "? ") + paint(Tone::Plain, doubt) + '\n';
+    if (!model.condition.empty())
+        text += paint(Tone::Soft, model.condition) + '\n';
     text += criteriaText(model, paint) + '\n';
     std::string statistics;
     for (const auto& [label, value] : model.statistics)

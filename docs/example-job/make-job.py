@@ -84,6 +84,8 @@ def preset_keys(path):
     used, tolerances, decimals = [0] * 32, [0.0] * 32, [0] * 32
     entries = criteria_entries()
     for criterion in preset.find("criteria"):
+        if criterion.tag not in entries:
+            continue  # known by its name alone: the library takes it from the file
         entry = entries[criterion.tag]
         used[entry] = int(criterion.get("used") == "yes")
         tolerances[entry] = float(criterion.get("tolerance"))

@@ -78,8 +78,12 @@ TEST_F(Library, WritesSoundResults) {
         int formula;
         const char* shows;
     } cases[] = {
-        {fogra, sets + "TR002.ti3", "", 5, "\"patchesUnpaired\""},
+        {fogra, sets + "TR002.ti3", "", 5, "\"unpairedTarget\": 755"},
+        {sets + "TR002.ti3", fogra, "", 5, "\"patchesUnpaired\""},
         {profile, few, "", 2, "\"selection\": \"measurement\""},
+        {profile, // which knows nothing of a fifth ink
+         chart(inksAndLab + " SPOT_1", "1 100 0 0 0 55 -36 -50 0\n2 0 0 0 0 60 50 50 100\n"), "", 2,
+         "\"unpairedMeasurement\": 1"},
         {few, profile, "", 3, "\"measurement\": \"profile\""},
         {profile, profile, strip, 4, "\"Gr\\u00e4y\""},
         {profile, profile, strip, 4, "\"sameFile\""},
@@ -194,6 +198,25 @@ TEST_F(Library, StoresTheMeasurementIntoTheJob) {
     EXPECT_EQ(record.hasSpectral, 0);
     EXPECT_NEAR(record.cmyk[0], 255, 1e-9);
     EXPECT_NEAR(record.xyz[1], 100 * std::pow((record.lab[0] + 16) / 116, 3), 1e-6);
+}
+
+TEST_F(Library, StoresEachReadingOfAMean) {
+    std::string text = support::contentsOf(TINTGATE_SOURCE_DIR "/presets/CVP_0001.xml");
+    text.insert(text.find("<criteria>"), "<repeats>mean</repeats>");
+    preset.filePath = wxString(stringToWstring(scratch.write("mean.xml", text)));
+    const std::string target = chart(inksAndLab, "1 0 0 0 40 66 0 0\n2 100 0 0 0 55 -36 -50\n");
+    const std::string twice =
+        chart("SAMPLE_ID LAB_L LAB_A LAB_B", "2 54 -36 -50\n2 56 -36 -50\n1 66 0 0\n");
+    ASSERT_EQ(analyse(target, twice), 0);
+    EXPECT_EQ(results.values[5], results.values[6] / 2); // two patches, one without a difference
+    EXPECT_NEAR(results.values[0], 0, 0.02);             // the mean is taken in XYZ
+    ASSERT_EQ(record.numPatches, 3);
+    EXPECT_EQ(record.lab[0], 54);
+    EXPECT_EQ(record.lab[3], 56);
+    for (const int reading : {0, 1}) {
+        EXPECT_NEAR(record.cmyk[4 * reading], 255, 1e-9);
+    }
+    EXPECT_NEAR(record.cmyk[11], 102, 1e-9);
 }
 
 TEST_F(Library, MetaTellsOfTheJobButNotItsPassword) {

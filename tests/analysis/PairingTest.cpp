@@ -32,11 +32,13 @@ DataSet setOf(const std::string& line) {
     return set;
 }
 
-/// "deviceValues 0 - 2": how, and each left row's partner.
+/// "deviceValues 0 - 2 +0:3": how, each left row's partner, and the right rows that pair again.
 std::string said(const analysis::Pairing& pairing) {
     std::string text = pairedByName(pairing.by);
     for (const std::uint32_t row : pairing.partner)
         text += " " + (row == analysis::noRow ? "-" : std::to_string(row));
+    for (const auto& [left, right] : pairing.again)
+        text += " +" + std::to_string(left) + ":" + std::to_string(right);
     return text;
 }
 
@@ -49,7 +51,14 @@ TEST(Pairing, GoesFromTheSurestToTheWeakest) {
     } cases[] = {
         {"other ids and order", ramp, "cmyk 3:50,0,0,0 2:0,7,0,0 1:0,0,0,0", "deviceValues 2 0 1"},
         {"duplicates in their order", "cmyk 1:0,0,0,0 2:9,0,0,0 3:0,0,0,0",
-         "cmyk 7:9,0,0,0 8:0,0,0,0 9:0,0,0,0 10:0,0,0,0", "deviceValues 1 0 2"},
+         "cmyk 7:9,0,0,0 8:0,0,0,0 9:0,0,0,0 10:0,0,0,0", "deviceValues 1 0 2 +0:3"},
+        {"more on either side", "cmyk 1:0,0,0,0 2:9,0,0,0 3:0,0,0,0",
+         "cmyk 1:9,0,0,0 2:0,0,0,0 3:9,0,0,0", "deviceValues 1 0 1 +1:2"},
+        {"repeats in turn", "cmyk 1:9,0,0,0 2:9,0,0,0",
+         "cmyk 1:9,0,0,0 2:9,0,0,0 3:9,0,0,0 4:9,0,0,0 5:9.001,0,0,0",
+         "deviceValues 0 1 +0:2 +1:3 +0:4"},
+        {"nearly a repeat", "cmyk 1:3.1,2.2,2.2,0", "cmyk 1:3.1,2.2,2.2,0 2:3,2.24,2.24,0",
+         "deviceValues 0"},
         {"an id for two patches", ramp, "cmyk 1:60,0,0,0 2:0,7,0,0", "deviceValues - - 1"},
         {"two decimals", "cmyk 1:12.3444,0,0,0", "cmyk 1:12.34,0,0,0", "deviceValues 0"},
         {"the nearest first, then whole percents", "cmyk 1:3,2.24,2.24,0 2:3.1,2.2,2.2,0",

@@ -1,6 +1,7 @@
 #include "analysis/Presets.h"
 
 #include <algorithm>
+#include <filesystem>
 #include <string>
 
 #include <gtest/gtest.h>
@@ -142,6 +143,15 @@ TEST(Presets, OneCodeForOneCause) {
         {"<psd>", "<colour/><psd>", exitPresetUnknownEntry},
         {"<average", "<avarage", exitPresetUnknownEntry},
         {"<psd>", "true <psd>", exitPresetUnknownEntry},
+        {"<psd>", "<repeats/><psd>", exitPresetValueMissing},
+        {"<psd>", "<repeats>both</repeats><psd>", exitPresetOutOfRange},
+        {"<psd>", "<repeats>mean</repeats><repeats>mean</repeats><psd>", exitPresetValueRepeated},
+        {"<psd>", "<minimumGreys>0</minimumGreys><psd>", exitPresetOutOfRange},
+        {"<psd>", "<psd required=\"yes\">", exitPresetUnknownEntry},
+        {"Condition>-1", "Condition required=\"1\">-1", exitPresetOutOfRange},
+        {"Condition>-1", "Condition required=\"yes\">4", exitPresetOutOfRange},
+        {"<average", "<repeatSpread tolerance=\"1\" decimals=\"0\"/><average",
+         exitPresetValueMissing},
     };
     const auto expect = [](const std::string& text, int code) {
         Record record = filled();
@@ -182,4 +192,53 @@ TEST(Presets, Files) {
         EXPECT_EQ(record.usedForResult[0], 1);
         EXPECT_EQ(record.fograPSDPreset, id == 7 ? 1 : 0);
     }
+}
+
+// Options without a place in the record follow it by its filePath.
+TEST(Presets, StateMoreThanTheRecordHolds) {
+    const support::ScratchFolder folder;
+    std::string text = goodText;
+    const auto change = [&](const std::string& from, const std::string& to) {
+        text.replace(text.find(from), from.size(), to);
+    };
+    change("Condition>-1", "Condition required=\"yes\">3");
+    change("<psd>", "<minimumGreys> 3 </minimumGreys><repeats>mean</repeats><psd>");
+    change("<average", "<repeatSpread tolerance=\"1.5\" used=\"yes\" decimals=\"1\" "
+                       "psdTolerance=\"2.5\" psdUsed=\"no\"/><average");
+    const auto spread = [](const Record& record, const PresetOptions& options) {
+        return settingOf(*criterionOfName("repeatSpread"), record, options);
+    };
+    const std::string path = folder.write("p.xml", text);
+    Record record;
+    PresetOptions options;
+    ASSERT_EQ(readPreset(path, false, record), exitDone);
+    for (const bool isThere : {true, false}) { // what was read is not read again
+        options = {};
+        ASSERT_EQ(readPresetOptions(record, options), exitDone);
+        EXPECT_TRUE(options.conditionRequired);
+        EXPECT_EQ(options.repeats, RepeatMode::Mean);
+        EXPECT_EQ(options.minimumGreys, 3);
+        EXPECT_EQ(spread(record, options).tolerance, 1.5);
+        EXPECT_TRUE(spread(record, options).used);
+        EXPECT_EQ(spread(record, options).decimals, 1);
+        EXPECT_EQ(settingOf(*criterionOfName("average"), record, options).tolerance, 2.5);
+        if (isThere)
+            std::filesystem::remove(path);
+    }
+    // Another file than the last one is read, and must be there.
+    change("<psd>no", "<psd>yes");
+    change("decimals=\"2\"/>", "decimals=\"2\" psdTolerance=\"7\" psdUsed=\"no\"/>");
+    Record other;
+    other.filePath = wxString(widened(folder.write("q.xml", text)));
+    other.fograPSDPreset = 1;
+    ASSERT_EQ(readPresetOptions(other, options), exitDone);
+    EXPECT_EQ(spread(other, options).tolerance, 2.5);
+    EXPECT_FALSE(spread(other, options).used);
+    other.filePath += "x";
+    EXPECT_EQ(readPresetOptions(other, options), exitPresetMissing);
+    EXPECT_EQ(options.minimumGreys, 3);
+    ASSERT_EQ(readPresetOptions(Record(), options), exitDone);
+    EXPECT_EQ(options.minimumGreys, 5);
+    EXPECT_FALSE(options.conditionRequired);
+    EXPECT_EQ(options.repeats, RepeatMode::Each);
 }

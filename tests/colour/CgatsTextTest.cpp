@@ -263,6 +263,10 @@ TEST(CgatsText, TellsDeviceChannelsAndTheirScales) {
         {"CMYKOG_1 CMYKOG_2 CMYKOG_3 CMYKOG_4 CMYKOG_5 CMYKOG_6", six,
          "cmyk CMYK CMYKOG_5 CMYKOG_6 10 20 30 40 50 60"},
         {"a b 4CLR_1 4CLR_2 4CLR_3 4CLR_4", six, "other 4CLR_1 4CLR_2 4CLR_3 4CLR_4 30 40 50 60"},
+        {"6CLR_6 6CLR_1 6CLR_2 6CLR_3 6CLR_4 6CLR_5", six,
+         "cmyk CMYK 6CLR_5 6CLR_6 20 30 40 50 60 10"},
+        {"PC6_1 PC6_2 PC6_3 PC6_4 PC6_5 PC6_6", six, "cmyk CMYK PC6_5 PC6_6 10 20 30 40 50 60"},
+        {"PCA_1 PCA_2 PCA_3 PCA_4 PCA_A PCA_5", six, "cmyk CMYK PCA_5 PCA_A 10 20 30 40 60 50"},
         {"a b c d e f", six, "none"},
         {"R G B", "100 50 0", "rgb RGB_R RGB_G RGB_B 100 50 0"},
         {"R G B", "51 0 0 \n255 255 255", "rgb RGB_R RGB_G RGB_B 20 0 0 100 100 100"},
@@ -372,16 +376,39 @@ TEST(CgatsText, JoinsTables) {
     }
 }
 
+// Spellings of measuring software, of data sets that are published and of our own measuring tool.
 TEST(CgatsText, FindsConditions) {
+    const std::string source = "MEASUREMENT_SOURCE \"";
     const std::pair<std::string, Conditions> cases[] = {
         {"ILLUMINANT \"D50\"\nOBSERVER \"CIE 2 degree\"\n", {"D50", "2", ""}},
+        {"ILLUMINATION_NAME D50\nOBSERVER_ANGLE 2.0\n", {"D50", "2", ""}},
+        {"OBSERVER_ANGLE \"10\"\n", {"", "10", ""}},
         {"WEIGHTING_FUNCTION \"ILLUMINANT, D65\"\nWEIGHTING_FUNCTION \"OBSERVER, 10 degree\"\n",
          {"D65", "10", ""}},
-        {"MEASUREMENT_SOURCE \"Illumination=D65 ObserverAngle=10 Filter=UVcut\"\n",
-         {"D65", "10", "M2"}},
+        {"WEIGHTING_FUNCTION \"ILLUMINANT,D65\"\nWEIGHTING_FUNCTION\t\"OBSERVER. 10 degree\"\n",
+         {"D65", "10", ""}},
+        {source + "Illumination=D65 ObserverAngle=10 Filter=UVcut\"\n", {"D65", "10", "M2"}},
+        {source + "Illumination=D50\tObserverAngle=2\xB0\tWhiteBase=Absolute\tFilter=Unknow\"\n",
+         {"D50", "2", ""}},
+        {source + "\"Illumination=D50 ObserverAngle=2degree WhiteBase=Abs Filter=No\"\"\n",
+         {"D50", "2", "M0"}},
+        {source + "MeasurementCondition=M1\tFilter=D50\"\n", {"", "", "M1"}},
+        {source + "MeasurementCondition=M1\tFilter=no\"\n", {"", "", "M1"}},
+        {source + "MeasurementCondition=M2 Filter=UVcut\"\nFILTER \"D50\"\n", {"", "", "M2"}},
+        {source + "GAS-FILLED TUNGSTEN\"\n", {"", "", "M0"}},
+        {source + "GAS-FILLED TUNGSTEN\"\nINSTRUMENTATION \"M2\"\n", {"", "", "M2"}},
+        {"MEASUREMENT_CONDITION \"Unknown\"\nFILTER \"UV\"\n", {"", "", "M2"}},
         {"MEASUREMENT_CONDITION \"M1\"\nFILTER \"UVcut\"\n", {"", "", "M1"}},
+        {"FILTER \"M1\"\nINSTRUMENTATION \"x, ISO 13655:2009 M0\"\n", {"", "", "M1"}},
         {"FILTER \"Pol\"\n", {"", "", "M3"}},
-        {"FILTER \"No UV cut\"\n", {"", "", ""}},
+        {source + "Filter=Polarizer\"\n", {"", "", "M3"}},
+        {"POLARIZATION \"yes\"\n", {"", "", "M3"}},
+        {"FILTER \"No UV cut\"\n", {"", "", "M0"}},
+        {"FILTER \"None\"\nFILTER \"Unknown\"\n", {"", "", ""}},
+        {"MEASUREMENT_GEOMETRY \"ISO 13655 - Reflection, M1\"\nINSTRUMENTATION \"M0\"\n",
+         {"", "", "M1"}},
+        {"INSTRUMENTATION \"D50, 2 degree, no polarisation filter, ISO 13655:2009 M1\"\n",
+         {"D50", "2", "M1"}},
         {"KEYWORD ILLUMINATION_CONDITION\nILLUMINATION_CONDITION 2\n", {"", "", "M2"}},
         {"INSTRUMENTATION \"M0, M1 and M2, D50 or D65, 2 degree or 10 degree\"\n", {"", "", ""}},
     };
@@ -389,8 +416,43 @@ TEST(CgatsText, FindsConditions) {
         const DataSet set = readWell(table(labNames, "1 50 0 0\n", "CGATS.17\n" + header));
         EXPECT_EQ(set.conditions, expected) << header;
     }
-    EXPECT_THAT(notesOf(readWell(table(labNames, "1 50 0 0\n", "CGATS.17\nILLUMINANT D65\n"))),
-                HasSubstr("other conditions than D50"));
+}
+
+// The spectrum is a flat grey of 50 %, whatever the text states for it.
+TEST(CgatsText, CalculatesColoursThatAreStatedForOtherLight) {
+    const std::string spectrum = "SPECTRAL_400 SPECTRAL_420 SPECTRAL_440 SPECTRAL_460 SPECTRAL_480 "
+                                 "SPECTRAL_500 SPECTRAL_520 SPECTRAL_540 SPECTRAL_560 SPECTRAL_580 "
+                                 "SPECTRAL_600 SPECTRAL_620 SPECTRAL_640 SPECTRAL_660 SPECTRAL_680 "
+                                 "SPECTRAL_700";
+    std::string halves;
+    for (int i = 0; i < 16; ++i)
+        halves += " 0.5";
+    const struct {
+        const char* header;
+        std::string columns, row;
+        bool calculated;
+    } cases[] = {
+        {"ILLUMINANT D65\n", spectrum, halves, true},
+        {"OBSERVER 10\n", spectrum, halves, true},
+        {"ILLUMINANT D50\nOBSERVER 2\n", spectrum, halves, false},
+        {"ILLUMINANT D65\n", "", "", false},
+        {"ILLUMINANT D65\n", "SPECTRAL_400 SPECTRAL_700", " 0.5 0.5", false}, // too coarse
+    };
+    for (const auto& c : cases)
+        for (const bool wanted : {false, true}) {
+            const DataSet set =
+                readWell(table(labNames + " " + c.columns, "1 70 9 9" + c.row + "\n",
+                               std::string("CGATS.17\n") + c.header),
+                         wanted);
+            SCOPED_TRACE(c.header + c.columns);
+            EXPECT_EQ(set.calculated, c.calculated);
+            EXPECT_NEAR(set.lab[0].L, c.calculated ? 76.0693 : 70, 1e-4); // 116 cbrt(0.5) - 16
+            EXPECT_NEAR(set.lab[0].a, c.calculated ? 0 : 9, 1e-2);
+            EXPECT_EQ(set.spectra.empty(), !wanted || c.columns.empty());
+            const DataSet again = readWell(writeCgats(set));
+            EXPECT_NEAR(again.lab[0].L, set.lab[0].L, 1e-9);
+            EXPECT_EQ(again.conditions.areUsual(), c.calculated || set.conditions.areUsual());
+        }
 }
 
 TEST(CgatsText, NamesOneCauseForEachFailure) {

@@ -62,7 +62,7 @@ TEST(CgatsWriter, IsReadBackToTheLastBit) {
     set.descriptor = "a\ttab, a # and 5\"";
     set.created = "2024-05-03T10:11:12+02:00";
     set.instrumentation = "none";
-    set.conditions = {"F11", "10", "M2"};
+    set.conditions = {"D50", "2", "M2"};
     set.names.assign(200, "plain");
     set.names[1] = "";
     set.names[2] = "Paper white";

@@ -135,11 +135,45 @@ TEST_F(Viewer, SortsFindsAndSavesPatches) {
          {"[worst: =2+5|row 3|A1|A4]", "[best: A4|A1|row 3|=2+5]", "[labels: =2+5|A1|A4|row 3]",
           "[lighter: A1|row 3|=2+5|A4]", "[100 0 0 0: =2+5]", "[PAPER: A1]", "[none: None found]",
           "id,name,CMYK_C,CMYK_M,CMYK_Y,CMYK_K,target_L,target_a,target_b,measured_L,measured_a,"
-          "measured_b,difference",
-          "\nA1,paper,0,0,0,0,95,0,-2,95,0.5,-3,1.25",
+          "measured_b,difference,measured_id,measured_name",
+          "\nA1,paper,0,0,0,0,95,0,-2,95,0.5,-3,1.25,A1,paper",
           "\n'=2+5,\"\"\"&gt;&lt;img src=x "
           "onerror=hostile()&gt;\",100,0,0,0,55,-37,-50,52,-35,-46,4.75",
-          "\n,,0,0,100,0,89,-5,93,88,-4,90,1.5", "\nA4,,0,0,0,100,16,0,0,,0,0,\r\n"})
+          "\n,,0,0,100,0,89,-5,93,88,-4,90,1.5", "\nA4,,0,0,0,100,16,0,0,,0,0,,A4,\r\n"})
+        EXPECT_THAT(seen.output, HasSubstr(part));
+}
+
+// As results are written now: a patch with other labels on the sheet, and what leaves a doubt.
+TEST_F(Viewer, ShowsWhereAPatchIsOnTheSheetAndWhatIsInDoubt) {
+    std::string result = support::contentsOf(data + "output.json");
+    const auto change = [&](const std::string& from, const std::string& to) {
+        ASSERT_NE(result.find(from), result.npos) << from;
+        result.replace(result.find(from), from.size(), to);
+    };
+    change("[88,-4,90],1.5]", "[88,-4,90],1.5,\"B3\",\"<b>Gelb\"]");
+    change("\"verdict\": \"failed\"", "\"verdict\": \"incomplete\"");
+    change("\"used\":true,\"outcome\":\"fail\"", "\"used\":false,\"outcome\":\"fail\"");
+    change("have no counterpart.\"", "have no counterpart.\",\"keepsOpen\":true");
+    change("\"illuminationCondition\":-1",
+           "\"illuminationCondition\":2,\"conditionRequired\":true");
+    change("\"statistics\"", "\"repeats\": {\"patches\":1,\"readings\":2,\"meanDistance\":0.4,"
+                             "\"largestDistance\":0.5,\"worstPatch\":2},\n\"statistics\"");
+    m_scratch.write("Größe a b/output.json", result);
+    ASSERT_EQ(show().exitCode, 0);
+    const support::Outcome seen = support::browseHandled(m_scratch, m_page, R"(
+        seen("columns", [...document.querySelectorAll("#patches th button")].map((button) =>
+            button.textContent).slice(0, 2).join("|"));
+        find("gelb");
+        seen("cells", [...document.querySelectorAll("#patches tbody td.patch")].map((cell) =>
+            cell.textContent).join("|"));)");
+    EXPECT_THAT(seen.error, Not(HasSubstr("CONSOLE")));
+    for (const char* part : {"[columns: On the sheet|In the target]",
+                             "[cells: B3 &lt;b&gt;Gelb|row 3]", "the comparison itself is in doubt",
+                             "<li>2 patches &lt;svg onload=hostile()&gt; have no "
+                             "counterpart.</li>",
+                             "measurement not stated, target M1, preset requires M2</p>",
+                             "1 patch, 2 readings; each is compared by itself",
+                             "0.50 ΔE00, B3 &lt;b&gt;Gelb (0&nbsp;0&nbsp;100&nbsp;0)"})
         EXPECT_THAT(seen.output, HasSubstr(part));
 }
 

@@ -127,6 +127,15 @@ TEST(Model, SaysFirstWhatFailedAndByHowMuch) {
                        criterion("missing", 3, none, Outcome::Unanswered)};
     EXPECT_EQ(makeModel(result, nullptr).sentence,
               "1 of 2 criteria can't be answered from these data, 1 failed.");
+    result.criteria[1].needed = 5;
+    result.criteria[1].found = 3;
+    result.warnings = {{"in doubt", true}, {"a remark", false}};
+    model = makeModel(result, nullptr);
+    EXPECT_THAT(model.reasons[1], HasSubstr("only 3 of the 5 different patches"));
+    EXPECT_THAT(model.doubts, ElementsAre("in doubt"));
+    EXPECT_THAT(model.warnings, ElementsAre("a remark"));
+    result.criteria = {criterion("near", 3, 2.9, Outcome::Pass)};
+    EXPECT_THAT(makeModel(result, nullptr).sentence, HasSubstr("comparison itself is in doubt"));
     result.criteria.clear();
     EXPECT_THAT(makeModel(result, nullptr).sentence, HasSubstr("judges no criterion"));
 }
@@ -141,6 +150,9 @@ TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
           with(whole, "\"formatVersion\": 1", "\"formatVersion\": 2"),
           with(whole, "\"failed\"", "\"won\""), with(whole, "[100,0,0,0]", "[100,0,0]"),
           with(whole, "\"worstPatch\":1", "\"worstPatch\":4"),
+          with(whole, "\"statistics\"",
+               "\"repeats\":{\"patches\":1,\"readings\":2,"
+               "\"largestDistance\":1,\"worstPatch\":4},\"statistics\""),
           with(whole, "\"decimals\":2", "\"decimals\":1e300"),
           with(whole, "[55,-37,-50]", "[55,\"x\",-50]")}) {
         problem.clear();

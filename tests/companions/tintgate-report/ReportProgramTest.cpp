@@ -67,11 +67,12 @@ TEST_F(ReportProgram, MakesTheVeryPageOfTheViewer) {
 TEST_F(ReportProgram, GivesThePatchesThatThePageExports) {
     EXPECT_EQ(report({"--csv", m_result}).output,
               "id,name,CMYK_C,CMYK_M,CMYK_Y,CMYK_K,target_L,target_a,target_b,measured_L,"
-              "measured_a,measured_b,difference\n"
-              "A1,paper,0,0,0,0,95,0,-2,95,0.5,-3,1.25\n"
-              "'=2+5,\"\"\"><img src=x onerror=hostile()>\",100,0,0,0,55,-37,-50,52,-35,-46,4.75\n"
-              ",,0,0,100,0,89,-5,93,88,-4,90,1.5\n"
-              "A4,,0,0,0,100,16,0,0,,0,0,\n");
+              "measured_a,measured_b,difference,measured_id,measured_name\n"
+              "A1,paper,0,0,0,0,95,0,-2,95,0.5,-3,1.25,A1,paper\n"
+              "'=2+5,\"\"\"><img src=x onerror=hostile()>\",100,0,0,0,55,-37,-50,52,-35,-46,4.75,"
+              "'=2+5,\"\"\"><img src=x onerror=hostile()>\"\n"
+              ",,0,0,100,0,89,-5,93,88,-4,90,1.5,,\n"
+              "A4,,0,0,0,100,16,0,0,,0,0,,A4,\n");
 }
 
 TEST_F(ReportProgram, SummarisesForATerminal) {
