@@ -38,9 +38,10 @@ int loadPatchSet(const std::wstring& path, Input& input) {
 
 int loadAll(const ComparisonPaths& paths, bool keepSpectra, Comparison& c) {
     const std::string& condition = paths.condition;
-    if (const int status = loadSide(paths.target, {false, condition}, c.target))
+    if (const int status = loadSide(paths.target, {.spectra = false, .condition = condition}, c.target))
         return status;
-    if (const int status = loadSide(paths.measurement, {keepSpectra, condition}, c.measurement))
+    if (const int status = loadSide(
+            paths.measurement, {.spectra = keepSpectra, .condition = condition}, c.measurement))
         return status;
     return paths.patchSet.empty() ? exitDone : loadPatchSet(paths.patchSet, c.patchSet);
 }
