@@ -26,6 +26,7 @@
 #include <stdexcept>
 
 #include "colour/CgatsConditions.h"
+#include "colour/CgatsInks.h"
 #include "colour/CgatsTables.h"
 #include "colour/TextEncoding.h"
 
@@ -271,6 +272,7 @@ class TextReader {
     std::string m_printConditions;
     ScaleHint m_scaleHint = ScaleHint::None;
     ConditionFinder m_conditions;
+    InkNames m_inks;
 };
 
 Failure TextReader::read(DataSet& set) {
@@ -292,6 +294,7 @@ Failure TextReader::read(DataSet& set) {
     set.instrumentation = std::move(m_texts.instrumentation);
     set.printing = std::move(m_texts.printing.empty() ? m_printConditions : m_texts.printing);
     set.conditions = m_conditions.result();
+    m_inks.name(set);
     set.notes = m_notes.take();
     return Failure::None;
 }
@@ -459,6 +462,7 @@ void TextReader::seeHeader(const KeywordLine& line) {
              (line.keyword == "CTI1" || line.keyword == "CTI2" || line.keyword == "CTI3"))
         m_scaleHint = ScaleHint::NeverOfOne;
     m_conditions.see(line.keyword, line.value);
+    m_inks.see(line.keyword, line.value);
 }
 
 bool isBlack(const DataSet& set) {

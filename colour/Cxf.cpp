@@ -423,11 +423,13 @@ class SetReader {
         set.deviceSpace = DeviceSpace::Cmyk;
         if (kind == DeviceKind::Custom && !bringProcessInksToFront()) {
             set.deviceSpace = DeviceSpace::Other;
-            set.channels = m_inks;
-            return;
+        } else {
+            set.channels.assign(std::begin(processNames), std::end(processNames));
         }
-        set.channels.assign(std::begin(processNames), std::end(processNames));
-        set.channels.insert(set.channels.end(), m_inks.begin() + 4, m_inks.end());
+        // As columns of CGATS text are named, so that the names survive there.
+        for (std::size_t ink = set.channels.size(); ink < m_inks.size(); ++ink) {
+            set.channels.push_back("SPOT_" + m_inks[ink]);
+        }
     }
 
     bool bringProcessInksToFront() {

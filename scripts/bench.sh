@@ -8,7 +8,7 @@ scripts/setup.sh
 cmake --preset release >/dev/null
 
 # Each prints a ratio against a peer or a bare loop that it times in the same run.
-benches=(colour_cgats_bench colour_difference_bench ticket_list_bench ticket_flush_bench jdf_bench
+benches=(colour_cgats_bench colour_cxf_bench colour_difference_bench ticket_list_bench ticket_flush_bench jdf_bench
   store_bench measure_bench job_bench)
 cmake --build --preset release --target Tintgate empty_wx store_postgres_bench "${benches[@]}"
 for bench in "${benches[@]}"; do

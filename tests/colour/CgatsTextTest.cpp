@@ -283,6 +283,35 @@ TEST(CgatsText, TellsDeviceChannelsAndTheirScales) {
     }
 }
 
+TEST(CgatsText, NamesInksFromWhereTheyCanBeTrusted) {
+    const auto channel = [](int number, const std::string& name) {
+        return "LGOMCCHANNEL0" + std::to_string(number) + " \"InkName = '" + name +
+               "' InkSample = '[1 2 3]'\"\n";
+    };
+    const std::string process =
+        channel(1, "Cyan") + channel(2, "MAGENTA") + channel(3, "Yellow") + channel(4, "Black");
+    const std::string columns = " CMYK_C CMYK_M CMYK_Y CMYK_K CMYKOG_O CMYKOG_G";
+    const std::string plus = "PLUS_1_COLOR Red|87|0|0|1|2|50|50|1\n";
+    const std::pair<std::string, std::vector<std::string>> cases[] = {
+        {process + channel(5, "Gold") + channel(6, "Deep Sea") + "COLOR_REP \"CMYKOG\"\n",
+         {"SPOT_Gold", "SPOT_Deep Sea"}},
+        {"COLOR_REP \"CMYKOG_LAB\"\n", {"SPOT_Orange", "SPOT_Green"}},
+        {"COLOR_REP \"CMYKcm\"\n", {"SPOT_Light cyan", "SPOT_Light magenta"}},
+        {process + channel(5, "Gold"), {"CMYKOG_O", "CMYKOG_G"}}, // One is not named,
+        {"COLOR_REP \"CMYKOGV\"\n", {"CMYKOG_O", "CMYKOG_G"}},    // one is too many,
+        {"COLOR_REP \"CMYKXZ\"\n", {"CMYKOG_O", "CMYKOG_G"}},     // unknown letters,
+        {channel(1, "Gold") + process.substr(process.find('\n') + 1) + channel(5, "Cyan") +
+             channel(6, "x"),
+         {"CMYKOG_O", "CMYKOG_G"}},        // another order,
+        {plus, {"CMYKOG_O", "CMYKOG_G"}}}; // an exporter's defaults.
+    for (const auto& [header, expected] : cases) {
+        const DataSet set =
+            readWell(table(labNames + columns, "1 50 0 0 0 0 0 0 5 6\n", "CGATS.17\n" + header));
+        ASSERT_EQ(set.channels.size(), 6U) << header;
+        EXPECT_EQ(std::vector(set.channels.begin() + 4, set.channels.end()), expected) << header;
+    }
+}
+
 TEST(CgatsText, TellsSpectralColumns) {
     for (const char* name : {"SPECTRAL_NM*", "SPECTRAL_NM_*", "SPEC_*", "nm*", "*nm", "R_*", "*_NM",
                              "spectral_dec*", "*", "nm*.00"}) {

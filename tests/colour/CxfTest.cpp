@@ -115,7 +115,7 @@ TEST(Cxf, IsReadAsTheSameMeasurementInCgats) {
         EXPECT_EQ(cxf.set->patchCount, 1617U);
         EXPECT_EQ(cxf.set->ids, text.set->ids);
         EXPECT_EQ(cxf.set->deviceSpace, text.set->deviceSpace);
-        EXPECT_EQ(cxf.set->channels.size(), text.set->channels.size());
+        EXPECT_EQ(cxf.set->channels, text.set->channels);
         EXPECT_TRUE(cxf.set->device == text.set->device);
         EXPECT_TRUE(cxf.set->spectra == text.set->spectra);
         EXPECT_EQ(cxf.set->axis.base, text.set->axis.base);
@@ -420,6 +420,21 @@ TEST(Cxf, ChoosesAmongConditionsAndLights) {
         EXPECT_EQ(lightness(set), c.L);
         EXPECT_EQ(set.conditions.measurement, c.condition);
         EXPECT_EQ(set.conditions.illuminant, c.illuminant);
+    }
+}
+
+// The L*a*b* form writes what it reads.
+TEST(Cxf, KeepsItsInksInCgats) {
+    for (const std::string& objects :
+         {object(lab("50") + cmyk("0", spot("Deep \"Sea\" 485", "7") + spot("Orange", "5"))),
+          object(lab("50") + "<DeviceColorValues><ColorCustom>" + spot("Gold", "9") +
+                 spot("Grün", "8") + "</ColorCustom></DeviceColorValues>")}) {
+        const DataSet set = readWell(file(objects));
+        DataSet back;
+        ASSERT_EQ(readCgats(writeCgats(set), {}, back), Failure::None) << writeCgats(set);
+        EXPECT_EQ(back.channels, set.channels);
+        EXPECT_EQ(back.device, set.device);
+        EXPECT_EQ(back.deviceSpace, set.deviceSpace);
     }
 }
 
