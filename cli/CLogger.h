@@ -18,7 +18,7 @@ class __attribute__((visibility("default"))) CLogger {
     ///
     /// Logs hold passwords: the file is for its owner alone (mode 0600), and it stays closed where
     /// the name is a symbolic link, belongs to somebody else or is no regular file. A file that
-    /// can't be opened is not reported; lines then vanish.
+    /// can't be opened is not reported; lines then vanish (C10).
     static CLogger* InitLogger(std::string fileName);
 
     /// Null while no log is open.
@@ -37,7 +37,7 @@ class __attribute__((visibility("default"))) CLogger {
     /// One line with the text as it stands.
     static void Log(char* text);
 
-    /// An empty line, then one line with the text. REQUIRES: a log is open.
+    /// An empty line, then one line with the text (C11). REQUIRES: a log is open.
     CLogger& operator<<(const std::string& text);
 
   private:
@@ -48,5 +48,5 @@ class __attribute__((visibility("default"))) CLogger {
 
     static CLogger* m_pThis;
     static std::ofstream m_Logfile;
-    static std::string m_sFileName; ///< Never read: the name comes from the caller of InitLogger.
+    static std::string m_sFileName; ///< Never read (C110): InitLogger gets the name.
 };

@@ -1,4 +1,4 @@
-// What "-help" prints. Callers have come to know it to the byte, its spelling included.
+// What "-help" prints. Callers know it to the byte, its spelling included (C1).
 #pragma once
 
 inline constexpr char helpText[] =
@@ -30,7 +30,7 @@ Where:
 
 **************************************************************************************
 )"
-    // The blank at the end of this line is required.
+    // The blank at the end of this line stays (C1).
     "For L*ab calculation from reference CMYK values and an icc profile: \n"
     R"(Tintgate.exe [ <reference> <profile> <output> ]
 Where:

@@ -14,7 +14,7 @@
 
 namespace {
 
-/// What follows the last ":" of an argument, or all of it if there is none.
+/// What follows the last ":" of an argument, or all of it if there is none (C6).
 std::wstring valueOf(const char* argument) {
     const std::wstring text = stringToWstring(argument);
     return text.substr(text.rfind(L':') + 1); // Without a ":", from the start.

@@ -4,7 +4,7 @@
 namespace cli {
 
 /// Verifies the job that the tool's own arguments name (count as in main). Returns the process's
-/// exit code. An exception passes through: a job id that is not a number ends the process.
+/// exit code. An exception passes through: a job id that is not a number ends the run (C8).
 using VerifyJob = int (*)(int count, char* arguments[]);
 
 /// The name under which the module exports a VerifyJob.

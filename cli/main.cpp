@@ -1,6 +1,6 @@
 // Entry point. There is no option parser: the number of arguments alone decides what is done, and
 // each argument is read by its position. All that is printed goes to standard output, and a failure
-// shows as the exit code only: the callers rely on both.
+// shows as the exit code only. Callers rely on both (C2).
 
 #include <clocale>
 #include <cstdio>
@@ -43,7 +43,7 @@ void keepFreedMemory() {
     mallopt(M_TOP_PAD, piece / 4);
 }
 
-/// Leaves the arguments of this run, a job's password among them, in a log of its own.
+/// Leaves the arguments of this run, a job's password among them, in its own log (C5).
 void logArguments(int count, char* arguments[]) {
     const std::string folder = platform::temporaryFolder();
     if (folder.empty()) {
@@ -113,8 +113,8 @@ cli::VerifyJob loadJobForm() {
     return nullptr;
 }
 
-/// A client application starts one run for each job, and looks at nothing but its exit code. An
-/// exception is not caught: a job id that is no number ends the process by one.
+/// A client application starts one run for each job and looks at nothing but its exit code (C9). An
+/// exception is not caught: a job id that is not a number ends the process by one (C8).
 int verifyJob(int count, char* arguments[]) {
     if (std::strstr(arguments[1], "KEY_KZ_HOST") == nullptr) {
         return exitJobFormRefused;
@@ -134,7 +134,7 @@ int main(int argc, char* argv[]) {
     case 2:
         return answerWord(argv[1]);
     case 3:
-        return exitDone; // Required: two arguments are no form and no mistake either.
+        return exitDone; // Two arguments are not a form and not a mistake (C3).
     case 4:
         return writeLabFromReferencesAndICCProfile(
             stringToWstring(argv[1]), stringToWstring(argv[2]), stringToWstring(argv[3]));

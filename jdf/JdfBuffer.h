@@ -24,17 +24,17 @@ enum Code : int {
 /// never behind end. Returns 0.
 int SkipToNextLine(char* start, char* end, char** out);
 
-/// Back over the blanks and tabs in front of start. It does not stop at the buffer's start: the
-/// buffer needs a byte in front of it that is neither.
+/// Back over the blanks and tabs in front of start. It does not stop at the buffer's start (C73):
+/// the buffer needs a byte in front of it that is neither.
 void SkipWhiteSpacesToStartOfLine(char* start, char** out);
 
-/// Looks for a token that ends before end; one that ends exactly there is not found. Gives its
-/// position and length, or start and 0. Returns 0.
+/// Looks for a token that ends before end; one that ends exactly there is not found (C72).
+/// Gives its position and length, or start and 0. Returns 0.
 int FindToken(const char* token, char* start, char* end, char** found, long* foundLength);
 
-/// By requirement no delete at all: the text behind the position moves up by count and the length
-/// falls by count. What stood at the position stays and follows once more, and twice count bytes
-/// are lost at the end. Deleting 2 at position 1 of `abcdefghijkl` gives `abcbcdefgh`.
+/// Not a delete at all (C71): the text after the position moves up by count and the length falls
+/// by count. What was at the position stays and follows once more, and twice count bytes are lost
+/// at the end. Deleting 2 at position 1 of `abcdefghijkl` gives `abcbcdefgh`.
 ///
 /// 0, or -31 with nothing changed for a negative count or a range that is not within the contents.
 int DeleteCharactersFromBuffer(long count, char* at, char* buffer, char* limit, long* length);

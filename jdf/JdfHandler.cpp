@@ -10,7 +10,7 @@
 
 namespace {
 
-constexpr long smallestFile = 5000;
+constexpr long smallestFile = 5000; // A smaller one counts as missing (C81).
 constexpr int mostPatches = 1'000'000;
 constexpr long roomForAll = 2048;
 constexpr long roomForPatch = 200 + 700; // Colour values, and spectral ones.
@@ -36,7 +36,7 @@ class Update {
         : m_contents(std::move(contents)), m_position(m_contents.start) {}
 
     /// Stamps date and time into the first element of this name. The search for the attributes is
-    /// not bounded by the element's end.
+    /// not bounded by the element's end (C75).
     void stamp(const char* element, const std::string& date, const std::string& time) {
         if (find(element)) {
             stampAttribute("printdate=\"", date);
@@ -199,7 +199,7 @@ int JdfHandler::AppendJDFFileData(KZJobDataStruct job, wxString comment,
     char* const at = update.insertionPoint(job.secondStrip == 1);
 
     // From here on only the result of this step counts: after -13 and -14 the measurement is
-    // written all the same, and the file too.
+    // written all the same, and the file too (C74).
     jdf::Contents& all = update.contents();
     const int code = WriteJDFMeasureData(at, all.start, all.limit, &all.length, job.measurement,
                                          header, comment);

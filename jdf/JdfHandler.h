@@ -16,7 +16,7 @@ class JdfHandler {
     /// Updates the file at job.jdfLocalFile: stamps the print date and time on the header's party,
     /// sees to the resource link and the resource that hold measurements, and appends the job's
     /// measurement to that resource. With replace, old measurements are to go first; since the
-    /// delete is none (see JdfBuffer.h), a file that has some is damaged by requirement.
+    /// delete is none (see JdfBuffer.h), a file that has some is damaged (C71).
     ///
     /// Returns a code of JdfBuffer.h. The file changes only with code 0, and then as a whole: it is
     /// written under another name in the same folder and renamed.

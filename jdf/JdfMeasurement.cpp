@@ -104,7 +104,7 @@ std::string_view boolean(bool value) {
     return value ? "true" : "false";
 }
 
-/// The element's name, or nothing for a strip that has none.
+/// The element's name, or nothing for a strip that has none (C80).
 std::string_view elementName(const JDFMeasurementHeader& header) {
     constexpr std::string_view names[] = {"tazo:Measurement", "tazo:Measurement2"};
     return header.secondStrip < std::size(names) ? names[header.secondStrip] : "";
@@ -124,7 +124,7 @@ int writeOpening(Pieces& pieces, const JDFMeasurementHeader& header, std::string
     return pieces.end();
 }
 
-/// What each of the next parts returns is lost to the one after it: only the last counts.
+/// What each of the next parts returns is lost to the one after it: only the last counts (C78).
 int writeAttributes(Pieces& pieces, const measurementDataRecord& measurement,
                     JDFMeasurementHeader& header) {
     pieces << "Approval=\"" << boolean(header.approval) << "\" MaxDeltaE=\""

@@ -14,7 +14,7 @@
 // It is one line up to FileSpec, and that is one too. The second strip's element is
 // tazo:Measurement2. Tolerances, differences, device values in percent and reflectances are whole
 // numbers of millionths, XYZ values of hundredths. The misspelt names and the missing blank between
-// spectral values are what readers of the file expect.
+// spectral values are what readers of the file expect (C76).
 #pragma once
 
 #include <wx/string.h>
@@ -27,7 +27,7 @@ struct JDFMeasurementHeader {
     char printTime[16] = {};
     char measureDate[16] = {}; ///< With both empty, the time of writing.
     char measureTime[16] = {};
-    char deltaEType[16] = {}; ///< Writing turns "CIELAB" into "CIE Lab", here too.
+    char deltaEType[16] = {}; ///< "CIELAB" becomes "CIE Lab", here too (C79).
     char cmmVersion[16] = {};
     unsigned char secondStrip =
         0;                   ///< 0 first strip, 1 second; others have no element of their own.
@@ -50,7 +50,7 @@ struct JDFMeasurementHeader {
 /// patches on the first refused piece ends the work.
 ///
 /// The measurement's arrays may be null; then they give no lines. Spectra have 36 values whatever
-/// their length says. The comment is narrowed to the C library's 8 bits and cut to 180 bytes.
+/// their length says (C77). The comment is narrowed to the C library's 8 bits and cut to 180 bytes.
 ///
 /// Returns 0 or -30.
 int WriteJDFMeasureData(char* at, char* buffer, char* limit, long* length,

@@ -31,7 +31,7 @@ wxString makeWorkingDir() {
 } // namespace
 
 KZVerifyJobProcessor::KZVerifyJobProcessor() : m_workingDir(SetWorkingDir()) {
-    // A second processor of a process has no folder, by requirement.
+    // A second processor of a process has no folder (C13).
     CLogger::InitLogger((m_workingDir.empty() ? nowhere : GetNerovaKZJobDataDir()) +
                         "/TintgateKZ.log");
 }

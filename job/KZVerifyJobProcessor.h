@@ -29,8 +29,8 @@ class KZVerifyJobProcessor {
 
     /// Finds the program's folder in the temporary folder, making it where it is missing. Where
     /// that is a link or somebody else's, a name below which nothing can be made: what a job writes
-    /// holds passwords. By requirement only the first call in a process looks; a later one returns
-    /// an empty text.
+    /// holds passwords. Only the first call in a process looks; a later one returns an empty text
+    /// (C13).
     wxString SetWorkingDir();
     /// m_workingDir as bytes.
     std::string GetNerovaKZJobDataDir() const;
@@ -65,7 +65,7 @@ class KZVerifyJobProcessor {
     int GetDeviceIDFromIt8ControlStripFileEx(wxString path, int* deviceID);
 
     /// Writes the record's measurement as CGATS text to its referenceFile or sampleFile. -1 without
-    /// device values; a file that can't be opened is not reported.
+    /// device values; a file that can't be opened is not reported (C48).
     int WriteTemporarySampleFile(KZJobDataStruct job, bool reference);
 
     /// Makes the measuring tool's definition from a control-strip file, in the same folder. Returns
@@ -73,21 +73,21 @@ class KZVerifyJobProcessor {
     wxString WriteTemporaryMeasurementDefinitionFile(wxString path, KZJobDataStruct* job);
 
     /// Has the measuring tool measure the job's control strip, and waits for it. 0, or -1 if it was
-    /// running already, -2 if it could not be started, -3 without a control strip, -4 or -5 if
-    /// there is no definition.
+    /// running already, -2 if it could not be started, -3 without a control strip, -4 or -5
+    /// (C65) if there is no definition.
     int ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job);
 
-    /// Writes a result and its measurement to a job's JDF and ticket. Returns the code of the last
-    /// write that counts.
+    /// Writes a result and its measurement to a job's JDF and ticket (C84). Returns the code of
+    /// the last write that counts (C86).
     int CopyResulDataToJobTicket(int jobID, KZJobDataStruct job, analyseResultsRecord results,
                                  bool remeasure);
-    /// Adds an error to a job's messages. Returns the code of the write.
+    /// Adds an error to a job's messages (C93). Returns the code of the write.
     int WrietErrorToJobTicket(int errorCode, int jobID);
     /// Closes a job, unless it has two strips and one of them still lacks a result. 0, or the code
     /// of the read that should have told the number of strips.
     int SetJobStatus(int jobID, bool approved);
 
-    /// Frees the arrays of the job's measurement. The caller's own pointers to them stay set.
+    /// Frees the arrays of the job's measurement. The caller's pointers to them stay set (C25).
     void FreeMeasurementData(KZJobDataStruct job);
 
     wxString m_workingDir;
@@ -97,7 +97,7 @@ class KZVerifyJobProcessor {
     /// Whether the loaded job's ticket contains the measurement to compare. If not, or if a new
     /// measurement is asked for, the job is measured.
     static bool IsToBeCompared(const KZJobDataStruct& job, bool remeasure);
-    /// Compares the measurement that the ticket holds. Writes nothing to the ticket.
+    /// Compares the measurement that the ticket holds. Writes nothing to the ticket (C21).
     int CompareStoredData(KZJobDataStruct* job, std::wstring* json);
 
   private:
@@ -115,6 +115,6 @@ class KZVerifyJobProcessor {
                           const analyseResultsRecord& results, bool remeasure);
 };
 
-/// Does what KZVerifyJobProcessor::SetWorkingDir does, once per process as well. Nothing in the
-/// flow calls it.
+/// Does what KZVerifyJobProcessor::SetWorkingDir does, once per process as well (C13). Nothing
+/// in the flow calls it (C171).
 wxString myMkTmpDirName();

@@ -1,6 +1,6 @@
 // Loading a job: what its ticket says, and the files that it names.
 //
-// The steps are required in this order, and so is what becomes of their codes: most reads replace
+// The steps keep this order (C29), and so does what becomes of their codes: most reads replace
 // the code of the one before, and the step of the JDF, which comes last, replaces them all. What a
 // failed step leaves out is found later, by whatever needs it.
 #include <algorithm>
@@ -22,7 +22,7 @@
 
 namespace {
 
-constexpr int presetIncomplete = 102; ///< Never leaves a load.
+constexpr int presetIncomplete = 102; ///< Never leaves a load (C29).
 constexpr int fileWait = 1000;        ///< Milliseconds that a preset or a JDF is waited for.
 
 template<class Values>
@@ -54,7 +54,7 @@ int loadControlStrip(JobLoad& load) {
 }
 
 /// Of these reads only the workflow's depends on what came before: without a control strip the job
-/// has none. None of their failures stands.
+/// has none (C31). None of their failures stands (C37).
 void readMeasurementKeys(JobLoad& load, int code) {
     constexpr int devicesOfModeZero[] = {5, 11, 13, 15, 25};
     KZJobDataStruct& job = *load.job;
@@ -93,8 +93,8 @@ wxString presetFileName(int id) {
     return wxString::Format("CVP_%s%i.xml", zeros, id);
 }
 
-/// Values of the preset's ticket. The first that is missing ends the row, by requirement without a
-/// consequence.
+/// Values of the preset's ticket. The first that is missing ends the row, without a consequence
+/// (C39).
 void readPresetKeys(const JobTicket& ticket, tolerancePresetParameterRecord& tolerance) {
     const struct {
         const char* key;
@@ -129,8 +129,8 @@ int loadTolerance(JobLoad& load) {
     fetchFile(load, load.installFolder + "/tickets/" + job.presetFile, fileWait,
               &tolerance.filePath);
     readPresetKeys(ticket, tolerance);
-    // By requirement the ticket's "FograPSDPreset" does not count and the arrays of the plain kind
-    // are read in any case: only the preset's file can make it one of the PSD kind.
+    // The ticket's "FograPSDPreset" does not count, and the arrays of the plain kind are read in
+    // any case (C38): only the preset's file can make it one of the PSD kind.
     tolerance.fograPSDPreset = 0;
     ticket.readArray("Values/UsedForResult", presetValueCount, tolerance.usedForResult);
     ticket.readArray("Values/Preset", presetValueCount, tolerance.presetValues);
@@ -148,7 +148,7 @@ void loadNesting(JobLoad& load) {
     }
     int mode = 0;
     load.ticket.read("Footer/Nesting/ControlstripMode", 0, &mode);
-    // Required: a job without this text keeps its own strip.
+    // A job without this text keeps its own strip (C40).
     int code = load.ticket.read("Footer/Nesting/PSDAssessment", &job.psdAssessment);
     if (mode == 1 && code == 0) {
         wxString name;
@@ -167,7 +167,7 @@ void readInlineValues(JobLoad& load) {
         0) {
         job.illuminationMode = -1;
     }
-    // Missing values stay 0: -1 is for a server that refuses the read, which this one never does.
+    // Missing values stay 0 (C42): -1 is for a server that refuses the read, which this never does.
     load.ticket.readArray(measurementKey(load.strip, "Values/Measured"), presetValueCount,
                           job.measuredValues);
 }
@@ -192,7 +192,7 @@ void decideJobType(JobLoad& load) {
     } else if (isInline) {
         readInlineValues(load);
         job.jobType = typeFor(std::max(job.measurementStatus, 1)); // Never one to be measured.
-    } else if (job.measurementStatus >= 0) { // Else it stays as the references left it.
+    } else if (job.measurementStatus >= 0) { // Else as the references left it (C43).
         job.jobType = typeFor(job.measurementStatus);
     }
 }

@@ -16,8 +16,8 @@ void freeArray(T*& values) {
 
 } // namespace
 
-// A missing reference file ends this road, though not that of stored measurements. Where both files
-// are missing the measurement's code stands.
+// A missing reference file ends this road, though not that of stored measurements. If both files
+// are missing the measurement's code stands (C19).
 int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord* results,
                                      std::wstring* json) {
     CLogger::GetLogger()->Log("Veryfing existing measurement job");
@@ -36,8 +36,8 @@ int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord*
     return result == exitDone ? AnalyzeJob(job, results, json) : result;
 }
 
-// A nested job is among its parent's jobs, as long as it is open, and the parent comes last. Which
-// of the writes succeed does not matter to the run.
+// A nested job is among its parent's jobs, as long as it is open, and the parent comes last
+// (C23). Which of the writes succeed does not matter to the run (C24).
 void KZVerifyJobProcessor::WriteBackResults(int jobID, const KZJobDataStruct& job,
                                             const analyseResultsRecord& results, bool remeasure) {
     const auto writeTo = [&](int id) {

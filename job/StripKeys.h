@@ -21,7 +21,7 @@ inline std::optional<int> stripSelectorOf(const std::wstring& text) {
     }
 }
 
-/// Of KZJobDataStruct::secondStrip: 0 is the first strip, any other value the second.
+/// Of KZJobDataStruct::secondStrip: 0 is the first strip, any other value the second (C28).
 inline Strip stripOf(int secondStrip) {
     return secondStrip == 0 ? Strip::first : Strip::second;
 }

@@ -28,7 +28,7 @@ wxString textOf(const std::wstring& text) {
     return stringToWstring(wstringToString(text));
 }
 
-/// Result of a login, by the connector's code.
+/// Result of a login, by the connector's code (C16).
 int loginFailure(int code) {
     switch (code) {
     case -2005:
@@ -44,7 +44,7 @@ int loginFailure(int code) {
     }
 }
 
-/// How long a job waits for its server: a third of the time that the login took.
+/// How long a job waits for its server: a third of the time that the login took (C15).
 std::chrono::milliseconds pauseAfter(steady_clock::duration login) {
     constexpr double longest = 5000.0;
     const double pause = std::chrono::duration<double>(login).count() * 1000.0 / 3.0;
@@ -61,7 +61,7 @@ bool writeForViewer(const wxString& path, const std::wstring& text, const char* 
     return written;
 }
 
-/// The viewer is ended first where one runs.
+/// The viewer is ended first where one runs (C18).
 int showResult(KZJobDataStruct& job, const std::wstring& json) {
     if (!writeForViewer(job.tempDir + "/output.json", json, "json")) {
         return exitResultNotWritten;
@@ -81,7 +81,7 @@ int showResult(KZJobDataStruct& job, const std::wstring& json) {
 
 } // namespace
 
-// By requirement a job id that is no number ends the process by an uncaught exception.
+// A job id that is not a number ends the process by an uncaught exception (C8).
 int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std::wstring password,
                                       std::wstring jobID, std::wstring strip, std::wstring language,
                                       bool remeasure) {
@@ -182,7 +182,7 @@ bool KZVerifyJobProcessor::IsToBeCompared(const KZJobDataStruct& job, bool remea
     return !remeasure && isMeasured;
 }
 
-// A missing reference file is logged and does not end this road: the analysis says what is wrong.
+// A missing reference file is logged and does not end this road: the analysis reports it (C19).
 int KZVerifyJobProcessor::CompareStoredData(KZJobDataStruct* job, std::wstring* json) {
     CLogger::GetLogger()->Log("Comparing existing data");
     const int loaded = LoadKZJobMeasurements(job);

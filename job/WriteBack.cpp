@@ -32,8 +32,8 @@ constexpr int paperWhite = 4;    ///< Of analyseResultsRecord::approvals.
 constexpr int averageDeltaE = 5; ///< Of analyseResultsRecord::values.
 constexpr int maximumDeltaE = 6;
 
-/// What the server shows at one position: an entry of analyseResultsRecord::values, and the entry
-/// of approvals and decimals that goes with it.
+/// What the server shows at one position (C87): an entry of analyseResultsRecord::values, and the
+/// entry of approvals and decimals that goes with it.
 struct ResultPosition {
     int value;
     int verdict;
@@ -122,7 +122,7 @@ const char* formulaName(int deltaEType) {
 }
 
 /// A device value of 0 to 255 in percent: of the first strip with two decimals, of the second one,
-/// as a 16-bit number, without any. The difference is required.
+/// as a 16-bit number, without any (C85).
 double percentOf(double value, Strip strip) {
     if (strip == Strip::first) {
         return round_(value / 2.55, 2);
@@ -141,7 +141,7 @@ Bytes bytesOf(const bool (&flags)[presetValueCount]) {
     return bytes;
 }
 
-/// The JDF calls every measurement approved; whether it passed is another attribute.
+/// The JDF calls every measurement approved (C82); whether it passed is another attribute.
 JDFMeasurementHeader headerOf(KZJobDataStruct& job, const analyseResultsRecord& results) {
     JDFMeasurementHeader header;
     JdfHandler::SetJDFMeasurementHeaderDefaults(&header);
@@ -161,7 +161,7 @@ JDFMeasurementHeader headerOf(KZJobDataStruct& job, const analyseResultsRecord& 
     return header;
 }
 
-/// What fails here changes nothing of the rest.
+/// What fails here changes nothing of the rest (C83).
 void updateJdf(CKZConnector& connector, KZJobDataStruct& job, const analyseResultsRecord& results) {
     JDFMeasurementHeader header = headerOf(job, results);
     JdfHandler::AppendJDFFileData(job, commentOf(stripOf(job.secondStrip)), &header, true);
@@ -169,11 +169,11 @@ void updateJdf(CKZConnector& connector, KZJobDataStruct& job, const analyseResul
 }
 
 int oneMore(int count) {
-    return static_cast<int>(static_cast<unsigned>(count) + 1U); // After the largest, the smallest.
+    return static_cast<int>(static_cast<unsigned>(count) + 1U); // It wraps (C89).
 }
 
-/// The verdict, and when it was found. By requirement date and time are read one after the other,
-/// so that midnight can fall between them, and the code is that of the last write.
+/// The verdict, and when it was found. Date and time are read one after the other, so that midnight
+/// can fall between them, and the code is that of the last write (C86).
 int writeVerdict(const StripTicket& ticket, bool passed) {
     ticket.write("Approval", passed ? 1 : 0);
     ticket.write("Comment", commentOf(ticket.strip()));
@@ -206,8 +206,8 @@ void writeColumns(const StripTicket& ticket, std::span<const char* const> names,
     }
 }
 
-/// Only a measurement with spectra has its patches written, XYZ, Lab and device values included.
-/// The first patch tells the range of all spectra.
+/// Only a measurement with spectra has its patches written, XYZ, Lab and device values included
+/// (C88). The first patch tells the range of all spectra.
 void writePatches(const StripTicket& ticket, const measurementDataRecord& measurement) {
     const spectralRow& first = measurement.spectral[0];
     const int patches = measurement.numPatches;
@@ -269,7 +269,7 @@ void writeVerdicts(const StripTicket& ticket, const std::string& name, bool isPs
 
 } // namespace
 
-// What can't be written is passed over: the job goes on without it.
+// What can't be written is passed over: the job goes on without it (C90).
 int KZVerifyJobProcessor::CopyResulDataToJobTicket(int jobID, KZJobDataStruct job,
                                                    analyseResultsRecord results, bool remeasure) {
     if (jobID < 0 || (job.secondStrip != 0 && job.secondStrip != 1)) {

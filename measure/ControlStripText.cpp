@@ -39,7 +39,7 @@ bool findStringInFile(wxTextFile* file, wxString needle, wxString* line) {
     return false;
 }
 
-// Required as it is: the walk starts at an index that counts characters, and looks at bytes.
+// The walk starts at an index that counts characters, and looks at bytes (C50).
 wxString StringConditioning(wxString line) {
     std::string bytes = firstBytes(line);
     for (std::size_t end = std::min(line.length(), longestLine); end > 0; --end) {

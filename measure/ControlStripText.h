@@ -10,15 +10,15 @@
 
 /// Finds the first line of the file that contains the needle. The file's current line stays there,
 /// or at the file's end where there is none; then false, and *line is left alone. The system itself
-/// walks strips with measure::StripText, which does the same in less memory.
+/// walks strips with measure::StripText, which does the same in less memory (C171).
 bool findStringInFile(wxTextFile* file, wxString needle, wxString* line);
 
 /// The line without the control characters at its end, and with "\r\n" there.
 ///
 /// It is cut at 511 bytes of UTF-8, so that a list of 36 spectral columns with long names arrives
-/// short. By requirement a line with characters of several bytes loses as many bytes at its end as
-/// it has more bytes than characters, and what is no ASCII character behind those; a line of
-/// control characters alone keeps them.
+/// short. A line with characters of several bytes loses one byte at its end for each byte that it
+/// has more than characters, then any trailing bytes that are not ASCII (C50). A line of control
+/// characters alone keeps them.
 wxString StringConditioning(wxString line);
 
 namespace measure {

@@ -42,7 +42,7 @@ namespace {
 constexpr long mostSets = 1'000'000; ///< A strip of more patches is taken for damage.
 
 // Where the number of a keyword's line starts. The last one leaves the separator to the number,
-// which may have blanks in front.
+// which may have blanks in front (C52).
 constexpr std::size_t behindStrips = 17;
 constexpr std::size_t behindSets = 15;
 constexpr std::size_t behindColumns = 14;
@@ -125,7 +125,7 @@ class Definition {
         add("END_DATA_FORMAT\r\n");
     }
 
-    /// By requirement an instrument that the strip does not name gets no KEYWORD line.
+    /// An instrument that the strip does not name gets no KEYWORD line (C51).
     void addDevice() {
         for (std::wstring_view line = m_strip.firstLine(); !m_strip.atEnd();
              line = m_strip.nextLine()) {
@@ -152,7 +152,7 @@ class Definition {
         }
     }
 
-    /// The first line with the word, where there is one. It becomes m_line.
+    /// The first line with the word, where there is one (C53). It becomes m_line.
     bool addLineOf(const char* word) {
         const bool found = find(word);
         if (found) {
@@ -171,7 +171,7 @@ class Definition {
         add("KEYWORD " + word + "\r\n" + word + "\t" + std::to_string(number) + "\r\n");
     }
 
-    /// A dynamic strip has as many patches as its grid has places, whatever it says itself.
+    /// A dynamic strip has as many patches as its grid has places, whatever it says (C54).
     bool addDynamicSize(long strips) {
         const long columns = addNumberOf("NUMBER_OF_COLS", behindColumns);
         if (columns < 1 || strips < 1 || columns > mostSets / strips) {
@@ -208,7 +208,7 @@ class Definition {
         }
     }
 
-    /// All that follows, and an empty line: what comes behind the last line is one.
+    /// All that follows, and an empty line: what comes behind the last line is one (C55).
     void addRows() {
         while (!m_strip.atEnd()) {
             addLine(m_strip.nextLine());
@@ -223,7 +223,7 @@ class Definition {
             if (contains(line, {L"END_DATA"})) {
                 break;
             }
-            ++rows; // By requirement also the empty line behind the last one.
+            ++rows; // The empty line after the last one counts too (C55).
             addLine(line);
         }
         const char* const white =
@@ -231,7 +231,7 @@ class Definition {
         for (long row = rows + 1; row <= m_sets; ++row) {
             add(std::to_string(row) + white);
         }
-        add("END_DATA"); // By requirement without a line end.
+        add("END_DATA"); // Without a line end (C56).
     }
 
     measure::StripText& m_strip;
@@ -243,7 +243,7 @@ class Definition {
 };
 
 /// The head of a strip for those instruments that are set up by a file of their own beside the
-/// definition: what stands in front of its table.
+/// definition (C58): what stands in front of its table.
 std::string headOf(measure::StripText& strip) {
     std::string text;
     std::wstring_view line = strip.firstLine();
@@ -257,7 +257,7 @@ std::string headOf(measure::StripText& strip) {
     return text;
 }
 
-/// In place of what was there. That it can't be written shows when the tool looks for it.
+/// In place of what was there. That it can't be written shows when the tool looks for it (C57).
 void write(const wxString& path, const std::string& text) {
     const std::string bytes = measure::pathBytes(path);
     unlink(bytes.c_str());

@@ -61,7 +61,7 @@ wxString plistCommandWord() {
     return platform::systemRoot().empty() ? word : "\"" + word + "\"";
 }
 
-// The first line that a command prints, up to 255 bytes; empty if it prints none.
+// The first line that a command prints, up to 255 bytes; empty if it prints none (C69).
 std::string firstLineOf(const std::string& command) {
     FILE* const pipe = popen(command.c_str(), "r");
     if (pipe == nullptr) {
@@ -84,8 +84,8 @@ bool isFolder(const wxString& path) {
     return !path.empty() && wxFileName::DirExists(path);
 }
 
-// A folder, if something of this name lies in it. By requirement the test is the one for regular
-// files, although the names are those of bundles: it is the property lists that count.
+// A folder, if something of this name lies in it. The test is the one for regular files, although
+// the names are those of bundles: it is the property lists that count (C68).
 bool holds(const wxString& folder, const char* name) {
     return wxFileExists(folder + name);
 }
@@ -276,7 +276,7 @@ bool Helper::LaunchNerovaMeasure(const NerovaMeasureParams& params, int& exitCod
     while (IsNMRunning()) {
         std::this_thread::sleep_for(std::chrono::seconds(1));
     }
-    exitCode = 0; // Its own code is never known.
+    exitCode = 0; // Its own code is never known (C62).
     return true;
 }
 

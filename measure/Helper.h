@@ -25,12 +25,12 @@ class Helper {
     static bool CheckFileValidity(const wxString& path);
 
     /// Runs the measuring tool with these options, and waits until it has gone away, two seconds at
-    /// least. A tool that takes longer to show up is not waited for.
+    /// least. A tool that takes longer to show up is not waited for (C63).
     ///
     /// True once it was started, with exitCode 0 whatever became of it: only its files tell. False
     /// with 1015 if the tool was running already, with 1000 if there is no such tool or no place
-    /// for the options, and with exitCode left alone if there is not even its folder. The options
-    /// are a file in the temporary folder, which stays there. The last argument is not used.
+    /// for the options, and with exitCode left alone if not even its folder exists (C64). The
+    /// options file stays in the temporary folder. The last argument is not used (C119).
     static bool LaunchNerovaMeasure(const NerovaMeasureParams& params, int& exitCode, bool);
 
     /// Whether the measuring tool runs. Takes about 2 seconds while it does.
@@ -38,12 +38,12 @@ class Helper {
 
     /// Whether an application of this name was seen running; with kill, it is asked to end.
     ///
-    /// It looks up to three times, a second apart, and stops looking when there is nothing to see.
+    /// It looks up to three times, a second apart, and stops when there is nothing to see (C67).
     /// With an empty name it looks for the applications of the suite, and ends none.
     static bool IsHWBAppsRunning(const wxString& processName, bool kill);
 
-    /// Whether the viewer was running. By requirement it ends a viewer that is, whatever the
-    /// argument says, so that the viewer to be started takes its place.
+    /// Whether the viewer was running. It ends a viewer that is, whatever the argument says, so
+    /// that the viewer to be started takes its place (C66).
     static bool IsNerovaVerifyRunning(bool);
 
     /// Starts the viewer, in place of one that runs. The arguments go behind its path as they are:
@@ -51,7 +51,7 @@ class Helper {
     ///
     /// Without wait, true if it was started; with wait, true if it ended with a code below 255.
     /// exitCode becomes 0, or -1 if there is no viewer, in which case the working folder stays that
-    /// of the applications. The last argument is not used.
+    /// of the applications (C70). The last argument is not used.
     static bool LaunchNerovaVerify(int& exitCode, bool wait, const wxString& arguments, bool);
 
     /// The viewer's executable: of its two forms the first that exists, else the second.

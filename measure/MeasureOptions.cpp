@@ -1,5 +1,5 @@
 // An option's name and its value take a line each. The password is always there, and it alone is
-// quoted:
+// quoted (C60):
 //
 //     -apnm
 //     Nerova Verify

@@ -3,5 +3,5 @@
 
 struct KZJobDataStruct;
 
-/// The measuring tool's number of the job's language, such as "de_DE"; that of any other one is 57.
+/// The measuring tool's number of the job's language, such as "de_DE"; any other is 57 (C59).
 int GetLanguageID(KZJobDataStruct* job);

@@ -7,7 +7,7 @@
 /// that the option is not given.
 ///
 /// The order is that in which the options are written. Each field's option is its own name behind a
-/// hyphen, but for `unassigned`, which has none.
+/// hyphen, but for `unassigned`, which has none (C61).
 struct NerovaMeasureParams {
     wxString apnm; ///< Name of the calling application.
     wxString l;    ///< Language, as a decimal number.

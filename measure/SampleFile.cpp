@@ -88,8 +88,8 @@ class Row {
     int m_precision = 6;
 };
 
-/// By requirement the precision that one row ends with is the one that the next row's device and
-/// Lab values get: only the first row has them with 6 digits.
+/// The precision that one row ends with is the one that the next row's device and Lab values get:
+/// only the first row has them with 6 digits (C47).
 void writeRows(const measurementDataRecord& measurement, std::ofstream& file) {
     const auto length = static_cast<std::size_t>(spectralLength(measurement));
     Row row;

@@ -96,7 +96,7 @@ bool fillSpectra(const StoredSet& stored, int patches, spectralRow* rows) {
 }
 
 /// Returns the code of the first read that failed: what stands behind it is not read, and 0.
-/// Without all values of all spectra only the first row's range is set.
+/// Without all values of all spectra only the first row's range is set (C45).
 int loadSpectra(const StoredSet& stored, measurementDataRecord* record) {
     auto rows = makeRows<spectralRow>(record->numPatches, 1);
     if (rows == nullptr) {
@@ -127,13 +127,13 @@ double rowValue(double stored) {
     return stored;
 }
 
-/// Device values of references are kept in 0 to 255, and used in whole percent.
+/// Device values of references are kept in 0 to 255, and used in whole percent (C46).
 double rowValue(int stored) {
     const auto percent = static_cast<std::int64_t>(std::floor(stored / 2.55 + 0.5));
     return static_cast<std::uint16_t>(percent);
 }
 
-/// Rows of a column each. Values that the ticket lacks stay 0, and without mayRead all of them do.
+/// Rows of a column each. Values that the ticket lacks stay 0 (C44), without mayRead all of them.
 template<class Stored>
 double* loadRows(const StoredSet& stored, Columns columns, int patches, bool mayRead) {
     auto rows = makeRows<double>(patches, columns.size());

@@ -32,7 +32,7 @@ bool isDynamic(const JobLoad& load) {
 }
 
 /// The definition that the server made of a dynamic strip lies beside the strip, and takes the name
-/// that a definition of ours would have. It need not be there.
+/// that a definition of ours would have. It need not be there (C34).
 void fetchDynamicDefinition(const JobLoad& load, wxString stripServerPath) {
     stripServerPath.Replace(".it8", ".dcf");
     load.processor->m_connector->DownloadFile(load.job->tempDir + "/NMPatchSetDefinition.dcf",
@@ -60,7 +60,7 @@ int lookUpDynamicStrip(const JobLoad& load) {
 }
 
 int lookUpFixedStrip(const JobLoad& load) {
-    constexpr std::size_t shortestName = 4; // In bytes.
+    constexpr std::size_t shortestName = 4; // In bytes (C33).
     std::string name;
     int code = load.ticket.read(stripKey(load.strip, "Footer/ControlstripFile"), &name);
     if (code != 0 || name.size() < shortestName) {
@@ -74,7 +74,7 @@ int lookUpFixedStrip(const JobLoad& load) {
 }
 
 /// A job of a packaging workflow: characterisation data, else the values of its strip. The last
-/// read alone decides: where it finds a strip, references that were not found are no failure.
+/// read alone decides: if it finds a strip, references that were not found are no failure (C35).
 int lookUpEskoReferences(const JobLoad& load) {
     wxString path;
     if (load.ticket.read("Workflow/Verify/CharacterizationData", &path) != 0) {
@@ -153,7 +153,7 @@ int takeStoredReferences(const JobLoad& load) {
     }
     if (load.processor->WriteTemporarySampleFile(job, true) != 0 ||
         !fileExists(job.referenceFile)) {
-        // By requirement the line names the other file.
+        // The line names the other file (C36).
         CLogger::GetLogger()->Log("Temporary Reference file not found = %s",
                                   measure::pathBytes(job.sampleFile).c_str());
         return noReference;

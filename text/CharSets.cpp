@@ -34,7 +34,7 @@ bool startsSequence(const char* p) {
     if ((*p & 0xF0) == 0xE0) {
         return isContinuation(p[1]) && isContinuation(p[2]);
     }
-    // 0xF8 would be the mask of the encoding; 0xF1 is the required one.
+    // 0xF8 would be the mask of the encoding (C149).
     if ((*p & 0xF1) == 0xF0) {
         return isContinuation(p[1]) && isContinuation(p[2]) && isContinuation(p[3]);
     }

@@ -1,6 +1,6 @@
 // Between the code page of the user interface and the text on the wire, and small byte filters.
 //
-// On this platform the code page conversions are empty by requirement: text passes unchanged, and
+// On this platform the code page conversions are empty (C147): text passes unchanged, and
 // CharSetsWx does the real work. The interface is the one that a port with a native code page
 // needs.
 #pragma once
@@ -16,15 +16,14 @@ enum ALLOC_METHOD : int { ALLOC_MALLOC, ALLOC_NEW }; ///< Any value but 0 means 
 ///
 /// One pass for each character, in the order of the bytes, and each pass starts behind the last
 /// replacement of all passes before it. So `&"` becomes `&&quot;`: the ampersand lies in front of
-/// the quote that went first. That is required, and text that must be escaped in full needs
-/// another function.
+/// the quote that went first (C148). Text that must be escaped in full needs another function.
 void ReplaceConflictingXMLDataInString(std::string& text);
 
 /// True when the text, up to its terminator, holds a well-formed multi-byte sequence: false for
 /// ASCII and for null.
 ///
-/// The lead byte of four is tested with the mask 0xF1, by requirement: 0xF0, F2, F4, F6, F8, FA,
-/// FC and FE pass, the odd ones don't.
+/// The lead byte of four is tested with the mask 0xF1 (C149): 0xF0, F2, F4, F6, F8, FA, FC and FE
+/// pass, the odd ones don't.
 bool IsUtf8Coded(const char* text);
 bool IsUtf8Coded(const std::string& text);
 
@@ -54,7 +53,7 @@ char* stracpy(char* target, const char* source, unsigned long size);
 
 namespace DBCS {
 
-/// Every byte `from` becomes `to`. In spite of the name nothing here knows double bytes.
+/// Every byte `from` becomes `to`. In spite of the name nothing here knows double bytes (C150).
 void ReplaceAll(std::string& text, char from, char to);
 
 /// Length minus one; std::string::npos for an empty text.

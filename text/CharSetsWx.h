@@ -31,14 +31,14 @@ bool Translate(char* target, long size, const char* source, unsigned int targetE
 
 // Each of these returns
 //   0  no conversion was needed, the target is unchanged;
-//   1  the target holds the converted text, of at most 4094 bytes;
+//   1  the target holds the converted text, of at most 4094 bytes (C152);
 //   2  the conversion failed, the target is unchanged.
 
 /// To UTF-8. A text that holds a multi-byte sequence is taken as UTF-8 already.
 int Controls2Io(void* context, std::string& target, const char* source);
 
-/// From UTF-8, by requirement with the same test: the only text that would change is left alone
-/// with 0, ASCII comes back equal with 1, stray high bytes give 2.
+/// From UTF-8, with the same test (C151): the only text that would change is left alone with 0,
+/// ASCII comes back equal with 1, stray high bytes give 2.
 int Io2Controls(void* context, std::string& target, const char* source);
 
 /// From one encoding to another. The same encoding assigns the source and gives 0; a null source

@@ -64,8 +64,8 @@ constexpr Range languageIdentifiers[] = {
 };
 constexpr int englishIdentifier = 1033;
 
-/// Dutch, 55 and 56, has the Central European encoding by requirement. The Chinese, Japanese and
-/// Korean encodings are numbers without a name in this program, since nothing converts them.
+/// Dutch, 55 and 56, has the Central European encoding (C155). The Chinese, Japanese and Korean
+/// encodings are numbers without a name in this program, since nothing converts them.
 constexpr Range macEncodings[] = {
     {41, 41, kCFStringEncodingMacCyrillic},
     {44, 44, 2},

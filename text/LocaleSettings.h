@@ -12,7 +12,7 @@ int MacGetUserLocale();
 /// The same.
 int GetSystemLanguagewX();
 
-/// Windows language identifier (and no code page, in spite of the name) of the user's language.
+/// Windows language identifier of the user's language, and not a code page (C155).
 int GetSystemCodePage();
 
 /// The same for a language number; a negative one means the user's language. 1033, English, for

@@ -13,7 +13,7 @@ inline constexpr double NOT_A_DOUBLE_NUMBER =
     std::bit_cast<double>(std::uint64_t{0x7FF8000000000000});
 inline constexpr float NOT_A_FLOAT_NUMBER = std::bit_cast<float>(std::uint32_t{0x7FC00000});
 
-/// True for NaNs and for both infinities.
+/// True for NaNs and for both infinities (C156).
 bool IsNotANumber(double value);
 bool IsNotANumber(float value);
 
@@ -58,7 +58,7 @@ int EpsilonCeilToInt(double value, double epsilon);
 unsigned int EpsilonFloorToUnsigned(double value, double epsilon);
 unsigned int EpsilonCeilToUnsigned(double value, double epsilon);
 
-/// Relative to b alone, so not symmetric.
+/// Relative to b alone, so not symmetric (C157).
 bool EpsilonEqual(double a, double b, double epsilon);
 /// Absolute.
 bool ExplicitEpsilonEqual(double a, double b, double epsilon);
@@ -79,6 +79,6 @@ double ResolutionToEncoderGranularity(double resolution, double encoder);
 } // namespace MathLib
 
 /// To `digits` decimals, halves up, for negative values too: -2.5 gives -2. The result is the
-/// product with a power of ten and keeps that product's binary remainder. Not to be merged with
-/// MathLib::RoundToSmallGranularity, which rounds halves away from zero and divides.
+/// product with a power of ten and keeps that product's binary remainder (C157). Not to be merged
+/// with MathLib::RoundToSmallGranularity, which rounds halves away from zero and divides.
 double round_(double value, int digits);

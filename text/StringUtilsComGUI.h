@@ -6,7 +6,7 @@
 namespace StringUtilsComGUI {
 
 // The plain pair: no conversion. For text below U+0080 only; above, the two are not each other's
-// inverse, and that is required.
+// inverse (C153).
 
 /// Cuts each character to its low 8 bits.
 std::string stringFromwstring(const std::wstring& text);
@@ -23,8 +23,8 @@ std::string::size_type UnicodeToUTF8(const std::wstring& text, std::string& targ
 std::string UTF8FromUni(const std::wstring& text);
 
 /// The 16-bit units of a UTF-8 text, which ends at its first zero. The target gets as many
-/// characters as the text has bytes, by requirement: behind the units of multi-byte sequences
-/// zeros remain. Returns this length; 0, with the target untouched, for invalid UTF-8.
+/// characters as the text has bytes (C154): after the units of multi-byte sequences zeros
+/// remain. Returns this length; 0, with the target untouched, for invalid UTF-8.
 std::wstring::size_type UTF8ToUnicode(const std::string& text, std::wstring& target);
 
 /// The same; an empty text where it fails.

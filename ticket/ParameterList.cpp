@@ -63,7 +63,7 @@ void SETMULTIPAR_LIST::Append(const SETMULTIPAR& record) {
     DropTable();
 }
 
-/// What is no finite number has no place in the ordered cache, so all such share one constant.
+/// What is not a finite number has no place in the cache, so all such share one constant (C131).
 const void* SETMULTIPAR_LIST::OwnDouble(const void* value) {
     if (value != nullptr && MathLib::IsNotANumber(*static_cast<const double*>(value))) {
         return &MathLib::NOT_A_DOUBLE_NUMBER;
@@ -225,7 +225,7 @@ bool SETMULTIPAR_LIST::CollectAction(void* context, const char* key, PARAM_TYPE 
 bool SETMULTIPAR_LIST::FilterAction(void* context, const char* key, PARAM_TYPE type,
                                     const void* value, int position) {
     auto* list = static_cast<SETMULTIPAR_LIST*>(context);
-    // Required: each call on a copy, so that a predicate starts every time as it was given.
+    // Each call on a copy (C133), so that a predicate starts every time as it was given.
     auto filter = list->m_filter;
     if (filter(key)) {
         list->ySetParameter(key, type, value, position);

@@ -36,7 +36,7 @@ class SETMULTIPAR_LIST {
     /// True if a record with that key was ever added since the last Clear, a deletion included.
     bool ParameterExists(const char* key) const { return m_keys.find(key); }
 
-    /// Adds a record, also where the key has one already. Always true.
+    /// Adds a record, also where the key has one already (C129). Always true.
     ///
     /// Key and value are copied, but a value of PARAM_POINTER or of a type without values stays the
     /// caller's pointer. A double that is no finite number becomes MathLib::NOT_A_DOUBLE_NUMBER. A
@@ -48,8 +48,8 @@ class SETMULTIPAR_LIST {
     /// a count of 0 or less adds nothing either, and is true.
     bool xSetNumbers(const char* key, PARAM_TYPE type, const void* values, int count);
 
-    /// Adds a record as a walk shows it: position 0 becomes -1, for a scalar as for a vector, and
-    /// values are copied as deep as the list is. Always true.
+    /// Adds a record as a walk shows it: position 0 becomes -1 (C130), for a scalar as for a
+    /// vector, and values are copied as deep as the list is (C132). Always true.
     bool ySetParameter(const char* key, PARAM_TYPE type, const void* value, int position);
 
     bool DelParameter(const char* key, int position);

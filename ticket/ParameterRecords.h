@@ -1,5 +1,5 @@
 // The records in which parameters cross the plug-in boundary. Values, sizes and offsets are a
-// contract with plug-ins that were built without these headers.
+// contract with plug-ins that were built without these headers (C95).
 #pragma once
 
 #include <cstddef>

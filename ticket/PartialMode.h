@@ -19,8 +19,8 @@ class PARTIAL_MODE {
     /// with the empty string takes its further keys out of the mode instead.
     void set(const char* const* table);
 
-    /// Adds the keys, or removes them. No keys at all clear the mode, whatever is asked: required,
-    /// since callers use it as a reset.
+    /// Adds the keys, or removes them. No keys at all clear the mode, whatever is asked: callers
+    /// use it as a reset (C124).
     void set(const std::set<std::string>& keys, bool remove);
 
     void insert(std::string key);

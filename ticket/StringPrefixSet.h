@@ -27,10 +27,10 @@ class STRINGPREFIXSET {
     /// Stores a prefix, unless a shorter one covers it.
     ///
     /// Of several longer prefixes the first alone gives way, and then the others keep the new one
-    /// out: that is required. `ab` to a set of `abc` and `abd` leaves `abd`.
+    /// out (C122). `ab` to a set of `abc` and `abd` leaves `abd`.
     void insert(const std::string& prefix);
 
-    /// Removes what find() finds, so that erasing `abc` removes a stored `ab`: that is required.
+    /// Removes what find() finds, so that erasing `abc` removes a stored `ab` (C123).
     /// The number removed.
     std::size_t erase(const std::string& prefix);
 

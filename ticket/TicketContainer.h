@@ -27,7 +27,7 @@ class MTICKET_READ : public MTICKET_ACCESS {
     bool GetParameter(int type, int id, const char* key, std::string& out, int position) const;
 
     int GetIntParameter(int type, int id, const char* key, int fallback) const;
-    /// Note the position in front of the key.
+    /// Note the position in front of the key (C128).
     int GetIntParameter(int type, int id, int position, const char* key, int fallback) const;
 
     std::string GetStringParameter(int type, int id, const char* key,

@@ -37,7 +37,7 @@ bool ValueDiffers(const SETMULTIPAR& x, const SETMULTIPAR& y) {
     case PARAM_UINT64:
         return numbersDiffer<std::int64_t>(x, y);
     default:
-        return true; // Binary values are never compared, so they are always sent.
+        return true; // Binary values are never compared, so they are always sent (C144).
     }
 }
 

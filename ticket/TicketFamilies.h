@@ -65,7 +65,7 @@ int readInt(const Place& place, const char* key, int fallback, int position) {
 }
 
 /// True when the vector is not empty. It keeps its content where the key has no elements. Elements
-/// that can't be read are left out, so those of a vector with holes don't carry their positions.
+/// that can't be read are left out (C127), so those after a hole don't carry their positions.
 template<class Place, Element T>
 bool readVector(const Place& place, const char* key, std::vector<T>& out) {
     unsigned long count = 0;
@@ -220,7 +220,7 @@ bool writeArray(const Place& place, const char* key, const T* values, unsigned l
     return writeElements(place, key, values, count);
 }
 
-/// Required to differ: without elements the key is left alone, where every other form deletes it.
+/// Without elements the key is left alone (C126), where every other form deletes it.
 template<class Place>
 bool writeArray(const Place& place, const char* key, const bool* values, unsigned long count) {
     if (count == 0) {

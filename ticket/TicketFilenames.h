@@ -7,7 +7,7 @@
 /// The name with every backslash made a forward slash.
 std::string FilenameToTicket(const std::string& name);
 
-/// The same and not its reverse, by requirement: file names have forward slashes on both ways.
+/// The same and not its reverse (C125): file names have forward slashes on both ways.
 std::string FilenameFromTicket_C(const std::string& name);
 
 /// FilenameToTicket of each name, in order; `out` is cleared first.

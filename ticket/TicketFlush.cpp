@@ -68,7 +68,7 @@ bool TICKET_UPDATE_LIST::FlushToContainer(const MTICKET_ACCESS* container, unsig
                                 scratch.view(), type, id, entry, anyOk);
         }
     }
-    Clear(); // Required: what failed is gone too, and is not tried again.
+    Clear(); // What failed is gone too, and is not tried again (C142).
     return anyOk;
 }
 
@@ -132,8 +132,8 @@ void TICKET_UPDATE_LIST::OneFlushToContainer(const MTICKET_ADMIN& admin, unsigne
         return;
     }
 
-    // With no key deleted the second set empties the mode, so that the whole ticket is copied. That
-    // is required: binary values and NaNs that nobody touched are then sent again.
+    // With no key deleted the second set empties the mode, so that the whole ticket is copied:
+    // binary values and NaNs that nobody touched are then sent again (C144).
     PARTIAL_MODE mode;
     mode.set(entry.changedKeys, false);
     mode.set(entry.deletedKeys, false);

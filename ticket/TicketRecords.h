@@ -1,5 +1,5 @@
 // The records of functions through which a plug-in gives out its tickets. Each is an array of
-// 64-bit words whose numbers are a contract; words that are not named here belong to the plug-in.
+// 64-bit words whose numbers are a contract (C95); words not named here belong to the plug-in.
 #pragma once
 
 #include <cstddef>
@@ -89,7 +89,7 @@ struct Factory {
 /// The word behind which every record but the factory keeps what it passes to its functions.
 inline constexpr int handleWord = 2;
 
-/// A bool that comes from a slot is defined in bit 0 only, so slots have integer results, and this
+/// A bool from a slot is defined in bit 0 only (C120), so slots have integer results, and this
 /// makes a bool of them. A C++ bool would let the compiler assume the other bits.
 constexpr bool bit0(int result) {
     return (result & 1) != 0;

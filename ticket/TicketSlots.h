@@ -59,7 +59,7 @@ class Contained {
 
 /// Shows the callback every value of the ticket.
 inline void walk(const STICKET_ACCESS& access, SCollect callback, void* context) {
-    // Text and number mean something to the plug-in alone, which has never been given others.
+    // Text and number mean something to the plug-in alone, which never got others (C121).
     single::Walk::call(access, callback, context, "", 8000);
 }
 

@@ -248,7 +248,7 @@ void TICKET_UPDATE_LIST::KeepDeleted(const ENTRY& kept, int type, int id, const 
     case PARAM_STRING:
         value = source.get(key, ptype, &text, position) ? text : nullptr;
         break;
-    default: // Required: values of other types are not kept.
+    default: // Values of other types are not kept (C138).
         break;
     }
     if (value != nullptr) {
@@ -313,7 +313,7 @@ int TICKET_UPDATE_LIST::xGetParameter(int type, int id, const char* key, PARAM_T
 }
 
 void TICKET_UPDATE_LIST::ConvertHandedOut(const char*& text) {
-    LocaleSettings::GetMacSystemEncoding(); // Asked for by requirement; nothing looks at it.
+    LocaleSettings::GetMacSystemEncoding(); // Nothing looks at the result (C139).
     std::string converted;
     if (CharSetsWx::Io2Controls(CharSetsWx::Context, converted, text) == 1) {
         const wxCriticalSectionLocker lock(m_cacheLock);
@@ -458,7 +458,7 @@ bool TICKET_UPDATE_LIST::Clear(int type, int id) {
     if (!EraseDeletedMap(type, id)) {
         return false;
     }
-    // Required to follow the kept values alone, be there changes of other tickets or not.
+    // It follows the kept values alone, be there changes of other tickets or not (C137).
     m_empty = m_toDelete.empty();
     return true;
 }

@@ -49,7 +49,7 @@ class TICKET_UPDATE_LIST {
         const STICKET_ACCESS* ticket = nullptr; ///< The new values; a work ticket, owned.
 
         ENTRY() = default;
-        /// Copies nothing, by requirement, so that the work ticket has one owner only.
+        /// Copies nothing, so that the work ticket has one owner only (C134).
         ENTRY(const ENTRY&) : ENTRY() {}
         ENTRY& operator=(const ENTRY&) = delete;
         ~ENTRY() { destruct(); }
@@ -67,7 +67,7 @@ class TICKET_UPDATE_LIST {
     TICKET_UPDATE_LIST(const TICKET_UPDATE_LIST&) = delete;
     TICKET_UPDATE_LIST& operator=(const TICKET_UPDATE_LIST&) = delete;
 
-    /// -9999, -9998, ... -2000, and from the start again, whether an id is in use or not.
+    /// -9999, -9998, ... -2000, and from the start again, even while an id is in use (C135).
     static int NextTicketID();
 
     /// The id that the last flush gave the virtual one; false, and -1, where it gave none.
@@ -110,7 +110,7 @@ class TICKET_UPDATE_LIST {
     int xGetParameter(int type, int id, const char* key, PARAM_TYPE ptype, void* out, int position);
 
     /// As xGetParameter for a whole key, T int, double or std::string; but a deleted key gives 1,
-    /// by requirement, with `out` as it was.
+    /// with `out` as it was (C136).
     template<class T>
     int xGetVectorParameter(int type, int id, const char* key, std::vector<T>& out) const;
 
@@ -142,8 +142,8 @@ class TICKET_UPDATE_LIST {
 
     /// Forgets all changes. Virtual ids can still be translated.
     void Clear();
-    /// Forgets one ticket. True if deleted values were kept for it; then, by requirement, whether
-    /// the list counts as empty follows those of other tickets alone.
+    /// Forgets one ticket. True if deleted values were kept for it; then whether the list counts as
+    /// empty follows those of other tickets alone (C137).
     bool Clear(int type, int id);
 
     /// Sends all changes to a container, which need not be the list's own, and forgets them, also
@@ -151,12 +151,12 @@ class TICKET_UPDATE_LIST {
     /// first.
     ///
     /// True if a record of any ticket was accepted, and for a list without changes; false also when
-    /// no ticket differs from the server's. Without a container or a work ticket false, and the
-    /// list stays as it is. Count, if not null, receives the number of records sent.
+    /// no ticket differs from the server's (C143). Without a container or a work ticket false, and
+    /// the list stays as it is. Count, if not null, receives the number of records sent.
     bool FlushToContainer(const MTICKET_ACCESS* container, unsigned long* count,
                           const TICKET_UPDATE_CALLBACK& callback);
     /// The same for one ticket; type and id become those that it was sent to. TICKET_TYPE_LOCAL is
-    /// true and stays in the list.
+    /// true and stays in the list (C146).
     bool FlushToContainer(const MTICKET_ACCESS* container, int& type, int& id, unsigned long* count,
                           const TICKET_UPDATE_CALLBACK& callback);
 
@@ -166,7 +166,7 @@ class TICKET_UPDATE_LIST {
     std::map<TICKET_TYPE_ID, ENTRY> m_toDelete; ///< Deleted values; the sets stay empty.
     std::map<int, int> m_idMap;                 ///< Virtual ids of the last flush.
     bool m_empty = true;                        ///< Nothing to flush.
-    int m_defaultType = -1; ///< Of tickets without a valid type, in a flush. Nothing sets it.
+    int m_defaultType = -1; ///< Of tickets without a valid type. Nothing sets it (C145).
     TranslateFunction m_translate = CharSetsWx::TulControls2IO; ///< Of texts that are set, or null.
     void* m_translateContext = CharSetsWx::Context;
     const MTICKET_ACCESS* m_container;

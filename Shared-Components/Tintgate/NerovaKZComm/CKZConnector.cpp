@@ -163,7 +163,7 @@ int CKZConnector::GetJobTicketKeyValue(int type, int id, const char* key, PARAM_
     if (Read(type, id, key, ptype, out, position) == 1) {
         return 0;
     }
-    // Required as it is: an int's default is the pointer itself, a double's is what it points to.
+    // An int's default is the pointer itself, a double's is what it points to (C112).
     if (ptype == PARAM_INT) {
         *static_cast<int*>(out) = static_cast<int>(reinterpret_cast<std::intptr_t>(fallback));
     } else if (ptype == PARAM_DOUBLE && fallback != nullptr) {
@@ -223,12 +223,12 @@ int CKZConnector::GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure)
     *ids = selected.release();
     size = number * static_cast<int>(sizeof(int));
     if (m_manager->GetTicketData(jobTickets, idsKind, 0, &size, all.get()) != 0) {
-        return -1; // *ids stays with the caller.
+        return -1; // *ids stays with the caller (C115).
     }
     // Jobs may have gone since they were counted.
     number = std::clamp(size / static_cast<int>(sizeof(int)), 0, number);
 
-    JobStatus status; // By requirement a job that lacks a value is judged by the one before it.
+    JobStatus status; // A job that lacks a value is judged by the one before it (C114).
     for (int i = 0; i < number; ++i) {
         GetJobStatus(all[i], &status.displayStatus, &status.subType, &status.fileType,
                      &status.showInVerifier, &status.verifyActive);

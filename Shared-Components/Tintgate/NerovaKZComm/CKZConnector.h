@@ -20,11 +20,11 @@ class CKZConnector {
   public:
     /// The whole login: Initialize, IsAlive, Login, and a server of major version 5 at least. How
     /// it went is told by IsLoggedIn and getLastRetCode: -2005 when the server does not answer, the
-    /// plug-in's code for what it refused, and 0 with no login for an older server. An empty
+    /// plug-in's code for what it refused, and 0 with no login for an older server (C117). An empty
     /// address gives an object that does nothing.
     ///
     /// Names and passwords reach the plug-in as the low 8 bits of each character, up to a first
-    /// zero and 127 of them at most. A private manager is not destroyed with the connector.
+    /// zero and 127 of them at most (C97). A private manager is not destroyed with the connector.
     CKZConnector(std::wstring serverAddress, std::wstring userName, std::wstring password,
                  int applicationID, bool unused, bool privateManager);
     /// Logs out.
@@ -55,8 +55,8 @@ class CKZConnector {
     int GetJobTicketKeyValue(int type, int id, const char* key, PARAM_TYPE ptype, void* out,
                              void* fallback, int position);
 
-    /// Always 0: *count tells what came. At most `maximum` elements are stored in values, as ints
-    /// for PARAM_INT and doubles for PARAM_DOUBLE; other types touch nothing.
+    /// Always 0 (C113): *count tells what came. At most `maximum` elements are stored in values, as
+    /// ints for PARAM_INT and doubles for PARAM_DOUBLE; other types touch nothing.
     int GetJobTicketKeyArrayValues(int type, int id, const char* key, PARAM_TYPE ptype, int maximum,
                                    int* count, void* values);
 
@@ -70,13 +70,13 @@ class CKZConnector {
     /// same, with *count 0.
     int GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure);
 
-    /// Fetches a file, waiting for it up to the limit, which it must not reach. An old file of that
-    /// name is removed first. False where that is not possible, too.
+    /// Fetches a file, waiting for it up to the limit, which it must not reach (C116). An old file
+    /// of that name is removed first. False where that is not possible, too.
     bool DownloadFile(wxString localPath, wxString serverPath, int limitInMilliseconds);
     bool UploadFile(wxString first, wxString second);
 
     /// The reference profile of the control strip 1 or 2, else the job's. Without a server that
-    /// answers 0 and an empty path; -1 where there is none.
+    /// answers 0 and an empty path (C118); -1 where there is none.
     int GetReferenceProfilePath(int jobID, int strip, std::wstring* path);
 
     /// As ComGUIManager::SetTicketParameter; -1 without a manager.

@@ -257,7 +257,7 @@ int ComGUIManager::SetCallback(void* user) {
         m_notificationID =
             ticket::as<STICKET_READ>(*work).GetIntParameter("iGUINotificationID", -1);
     }
-    // Whatever became of the command, so with a former id or -1 too.
+    // Whatever became of the command (C100), so with a former id or -1 too.
     if (m_container != nullptr) {
         m_container->DisableNotification(jobs, TICKET_ID_ALL, m_notificationID);
         m_container->EnableNotification(jobs, TICKET_ID_NEW, m_notificationID, jobKeys);

@@ -25,14 +25,14 @@ enum COMERR : int {
 
 /// The order of a session is GetInstance, Initialize, IsAlive, Login, ..., Logout, Uninitialize.
 ///
-/// Without a usable bundle there is a manager all the same: it says on standard error what is
+/// Without a usable bundle there is a manager all the same (C94): it says on standard error what is
 /// missing, and its operations fail as those of a server that does not answer.
 ///
 /// Tickets are named by type and id; (0, 0) is the system ticket, and type 3 a job's ticket whose
 /// id is the job's. The tickets are the plug-in's: the manager holds none. Each operation has a
-/// result convention of its own, which callers rely on. Operations marked raw use the container
-/// that is held since the login and must not be called without one; the others go through
-/// GetClientContainer and tell what they give without a container.
+/// result convention of its own, which callers rely on (C101). Operations marked raw use the
+/// container that is held since the login and must not be called without one (C111); the others go
+/// through GetClientContainer and tell what they give without a container.
 ///
 /// One thread at a time. Only the string cache is locked.
 class ComGUIManager {
@@ -79,7 +79,7 @@ class ComGUIManager {
     int IsAlive(const char* host, int port);
 
     /// The session's tickets, or null. Where none are held the plug-in is asked again, and what it
-    /// gives is kept if it has a system ticket; if it has none, the session is logged out.
+    /// gives is kept if it has a system ticket; if it has none, the session is logged out (C99).
     const MTICKET_ADMIN* GetClientContainer();
 
     /// Registers for the notifications of jobs, after a login. 0, or the plug-in's code.
@@ -88,7 +88,7 @@ class ComGUIManager {
     std::wstring GetServerName() const { return m_serverName; } ///< Empty before a first login.
     std::wstring GetServerIP() const { return m_serverIP; }     ///< Empty before a first login.
     void FreeDll() {}
-    int IsServerOnline() { return 1; } ///< Whether there is a server or not.
+    int IsServerOnline() { return 1; } ///< With or without a server (C110).
 
     // Reading parameters. Positions: POSITION_WHOLE or an element.
 
@@ -100,28 +100,28 @@ class ComGUIManager {
 
     int GetIntParameter(int type, int id, const char* key); ///< -1 where it is missing.
     int GetIntParameter(int type, int id, const char* key, int position, int fallback);
-    /// By requirement reads an int; -1.0 where it is missing. Doubles are read by GetParameter.
+    /// Reads an int (C102); -1.0 where it is missing. Doubles are read by GetParameter.
     double GetDoubleParameter(int type, int id, const char* key);
     /// Empty where the text is missing or not UTF-8.
     std::wstring GetStringParameter(int type, int id, const char* key);
 
-    // As GetParameter. Elements that can't be read repeat the one before them (0, 0.0, "" at the
-    // start); a key that can't be read is an empty array. Texts are taken one byte a character.
+    // As GetParameter. Elements that can't be read repeat the one before them (C104; 0, 0.0, "" at
+    // the start); a key that can't be read is an empty array. Texts are taken one byte a character.
     wxArrayInt GetIntArray(int type, int id, const char* key);
     wxArrayDouble GetDoubleArray(int type, int id, const char* key);
     wxArrayString GetStringArray(int type, int id, const char* key);
 
     // Changing parameters.
 
-    /// 0 done, -1 refused; 0 too without a container.
+    /// 0 done, -1 refused; 0 too without a container (C101).
     int SetTicketParameter(int type, int id, const char* key, PARAM_TYPE ptype, const void* value,
                            int position);
     /// True if the ticket took the list's table; false too for an empty list, and for a ticket or
     /// container that is not there.
     bool SetMultiParameter(int type, int id, SETMULTIPAR_LIST& list);
     /// Replaces a key by `count` values: an array of int, double or const char*, as ptype says. An
-    /// empty one deletes the key. Note that the id comes before the type. False without a
-    /// container.
+    /// empty one deletes the key. Note that the id comes before the type (C105). False
+    /// without a container.
     bool SetMultiParameter(int id, int type, PARAM_TYPE ptype, const char* key, int count,
                            void* values);
     /// Flushes the list into the container that is held: true if a ticket was changed, or there was
@@ -134,14 +134,14 @@ class ComGUIManager {
 
     bool CreateOrOpenTicket(int type, int id, const char* const* keys); ///< Raw.
     int CreateTkt(int type); ///< The new ticket's id, or -1. Raw.
-    /// For TICKET_ID_ALL deletes all tickets of the type, and is true always.
+    /// For TICKET_ID_ALL deletes all tickets of the type, and is true always (C107).
     bool DeleteTicketOfType(int type, int id);
     int Delete_all_Tickets(const MTICKET_ADMIN* container, int type); ///< Always 0.
     /// The first ticket in which the text stands under the key, or -1. Raw.
     int SearchTicket(int type, const char* key, std::string value);
     /// The tickets in which a value (an int, or a NUL-terminated text, as ptype says) stands under
     /// the key, or, inArray, as one of its elements. Of texts only the type's first ticket is
-    /// examined. Raw.
+    /// examined (C106). Raw.
     std::vector<int> SearchTickets(int type, const char* key, PARAM_TYPE ptype, void* value,
                                    bool inArray);
 
@@ -149,13 +149,13 @@ class ComGUIManager {
 
     int GetTicketData(int type, int kind, int index, int* size, void* buffer);
     /// For kinds 10 and 11 the plug-in gets a buffer of 12040 bytes or more, zero where nothing was
-    /// copied: data of a larger size than that is not copied at all.
+    /// copied: data of a larger size than that is not copied at all (C108).
     int SetTicketData(int type, int kind, int index, int* size, void* buffer);
-    /// For the two commands that set a folder, size is taken from the text in data.
+    /// For the two commands that set a folder, size is taken from the text in data (C109).
     int SendCommand(const char* command, int size, void* data);
     /// Raw paths go unconverted through another operation of the plug-in.
     int PutFile(const char* first, const char* second, bool raw);
-    /// Paths are converted in both cases; raw chooses another operation of the plug-in.
+    /// Paths are converted in both cases (C109); raw chooses another operation of the plug-in.
     int GetFile(const char* first, const char* second, bool raw);
     int SendJob(TJobIdentification* job, const char* first, const char* second);
 
@@ -168,7 +168,7 @@ class ComGUIManager {
                     void (*append)(Array&, Value));
 
     static ComGUIManager* m_pInstance;
-    static bool m_bAcceptNotification; ///< Written only.
+    static bool m_bAcceptNotification; ///< Written only (C110).
     static ComGUIModuleInterface** m_givenInterface; ///< Of UseInterface, or null.
 
     std::unique_ptr<ComSessionRecord> m_record;
@@ -184,7 +184,7 @@ class ComGUIManager {
     std::wstring m_reservedText;
 };
 
-/// The shape of a receiver of notifications. -1 if the fourth integer is 0, else 0.
+/// The shape of a receiver of notifications (C110). -1 if the fourth integer is 0, else 0.
 int notificationTypeCallback(void* user, int number1, int number2, int number3, int number4,
                              int number5, int number6, char* text);
 

@@ -33,8 +33,8 @@ wxString fromUtf8(const std::string& text) {
     return isUtf8(text) ? wxString(text.c_str(), wxConvUTF8) : wxString();
 }
 
-// By requirement two more decodings are tried where UTF-8 gives nothing, and UTF-8 is what counts
-// in the end: text that is not UTF-8 comes back empty.
+// Two more decodings are tried where UTF-8 gives nothing, and UTF-8 is what counts in the end
+// (C103): text that is not UTF-8 comes back empty.
 wxString decoded(const std::string& text) {
     wxString result = fromUtf8(text);
     if (result.empty()) {

@@ -1,6 +1,6 @@
 // The table of operations that the comm plug-in "ComGUI.Bundle" gives out: 44 slots of one machine
 // word each, whose numbers and arguments are a contract with plug-ins that were built without this
-// header.
+// header (C95).
 #pragma once
 
 #include <cstddef>

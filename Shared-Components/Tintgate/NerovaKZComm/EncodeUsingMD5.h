@@ -3,5 +3,5 @@
 #include <string>
 
 /// The MD5 digest (RFC 1321) of exactly the text's bytes, as 32 upper-case hexadecimal digits.
-/// Nothing in the login uses it: passwords reach the plug-in as they are.
+/// Nothing in the login uses it (C170): passwords reach the plug-in as they are.
 std::string EncodeUsingMD5(std::string text);

@@ -29,6 +29,6 @@ bool WalkGetTicketIds(void* context, int type, int id, const STICKET_ACCESS* tic
 /// Of an stSearchKey. Ends the walk at the first match.
 bool WalkSearchTicket(void* context, int type, int id, const STICKET_ACCESS* ticket);
 
-/// Of an stSearchTickets. By requirement only integers are looked for in every ticket: for a text
-/// the walk ends after the first ticket, whether it matched or not.
+/// Of an stSearchTickets. Only integers are looked for in every ticket: for a text the walk ends
+/// after the first ticket, whether it matched or not (C106).
 bool WalkSearchTickets(void* context, int type, int id, const STICKET_ACCESS* ticket);
