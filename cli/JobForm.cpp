@@ -24,6 +24,7 @@ std::wstring valueOf(const char* argument) {
 
 extern "C" __attribute__((visibility("default"))) int tintgateVerifyJob(int count,
                                                                         char* arguments[]) {
+    // Any other text is false (C7).
     const bool remeasure = count == 9 && std::strcmp(arguments[8], "KEY_KZ_REMEASURE:=:true") == 0;
     wxDisableAsserts();
     wxLog::EnableLogging(false); // wx would report failed opens on standard error.
@@ -33,6 +34,7 @@ extern "C" __attribute__((visibility("default"))) int tintgateVerifyJob(int coun
     unsigned int minor = 0;
     unsigned int patch = 0;
     getLibVersion(major, minor, patch);
+    // Spelt like this in every log (C12).
     CLogger::GetLogger()->Log("Tintgate.exe verion = %d.%d.%d", cli::toolVersion[0],
                               cli::toolVersion[1], cli::toolVersion[2]);
     CLogger::GetLogger()->Log("TintgateLib.dll verion = %u.%u.%u", major, minor, patch);

@@ -73,7 +73,7 @@ int answerWord(const std::string& word) {
         std::printf("%u.%u.%u\n", major, minor, patch);
         return exitDone;
     }
-    return validateInputFile(stringToWstring(word));
+    return validateInputFile(stringToWstring(word)); // Any other word is a path (C4).
 }
 
 /// The output is opened in place, so that links and /dev/stdout work, and not before there is

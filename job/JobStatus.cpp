@@ -8,7 +8,7 @@ namespace {
 
 constexpr int activeForTwoStrips = 3; ///< Of "Workflow/Verify/Active".
 
-/// A strip's result, and so its number; an approval of 0 is one, too (C91).
+/// A strip's result, and so its number; an approval of 0 is one, too (C91). It is logged (C92).
 bool hasResult(const JobTicket& ticket, Strip strip) {
     int approval = -1;
     const int code = ticket.read(measurementKey(strip, "Approval"), -1, &approval);

@@ -41,7 +41,7 @@ class KZVerifyJobProcessor {
                                                   bool flag);
 
     /// Verifies one job; the result is the process's exit code. With job id -1 it starts the viewer
-    /// and does nothing else. `strip` is 1 for the second strip.
+    /// and does nothing else (C14). `strip` is 1 for the second strip.
     int VerifyKZJob(std::wstring host, std::wstring user, std::wstring password, std::wstring jobID,
                     std::wstring strip, std::wstring language, bool remeasure);
 
@@ -49,7 +49,7 @@ class KZVerifyJobProcessor {
     /// REQUIRES: secondStrip of the record is set.
     int LoadKZJobData(int jobID, KZJobDataStruct* job);
     /// Fills childJobIDs (from malloc, freed by VerifyKZJob) with all jobs to verify that name this
-    /// job's parent, itself included.
+    /// job's parent, itself included (C41).
     void GetChildJobIDsFromParent(KZJobDataStruct* job);
     /// Fills jdfServerFile, or empties it and returns the code of the read that failed.
     int GetJobJDFFileName(KZJobDataStruct* job);
@@ -60,8 +60,8 @@ class KZVerifyJobProcessor {
     /// The same for the stored references, CMYK in whole percent, never with spectra.
     int LoadKZJobReferences(KZJobDataStruct* job);
 
-    /// The instrument of a control-strip file, 0 where it names none. Returns 10 if there is no
-    /// such file.
+    /// The instrument of a control-strip file, 0 where it names none (C49). Returns 10 if there
+    /// is no such file.
     int GetDeviceIDFromIt8ControlStripFileEx(wxString path, int* deviceID);
 
     /// Writes the record's measurement as CGATS text to its referenceFile or sampleFile. -1 without

@@ -39,7 +39,8 @@ void makeJobFolder(JobLoad& load, const wxString& workingDir) {
     job.sampleFile = job.tempDir + "/Measured sample.txt";
 }
 
-/// The control strip is looked up whatever could be read before it.
+/// The control strip is looked up whatever could be read before it. The install folder is one of
+/// the job's keys (C32).
 int loadControlStrip(JobLoad& load) {
     KZJobDataStruct& job = *load.job;
     int code = load.ticket.read("System/InstallFolder", &load.installFolder);

@@ -24,7 +24,7 @@ int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord*
     const int launched = ConfigureAndLaunchNerovaMeasure(job);
     CLogger::GetLogger()->Log("ConfigureAndLaunchNerovaMeasure returns = %d", launched);
     if (launched != 0) {
-        return exitMeasuringFailed;
+        return exitMeasuringFailed; // For every failure (C20).
     }
     int result = exitDone;
     if (!isThere(job->referenceFile, "Reference")) {

@@ -1,4 +1,4 @@
-// The way of a job from its arguments to its result code.
+// The way of a job from its arguments to its result code. Its folder stays (C26).
 #include <algorithm>
 #include <chrono>
 #include <iterator>
@@ -126,6 +126,7 @@ int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std:
         return exitJobNotListed;
     }
 
+    // Spelt like this in every log (C17).
     CLogger::GetLogger()->Log("Veryfing Job ID = %s", wstringToString(jobID).c_str());
     int result = LoadKZJobData(id, &job);
     const ticket::Block<int> children(job.childJobIDs);
@@ -174,7 +175,7 @@ int KZVerifyJobProcessor::VerifyLoadedJob(KZJobDataStruct* job, bool remeasure) 
 }
 
 bool KZVerifyJobProcessor::IsToBeCompared(const KZJobDataStruct& job, bool remeasure) {
-    constexpr int inlineDevices[] = {40, 45, 46, 47};
+    constexpr int inlineDevices[] = {40, 45, 46, 47}; // Not all inline devices (C22).
     const bool isMeasured =
         job.jobType == 2 || job.jobType == 3 ||
         (job.secondStrip == 1 &&

@@ -31,7 +31,7 @@ enum LookupFailure : int {
 
 /// Fetches a file into the job's folder, under the last part of its server path. Where it comes
 /// within the limit in milliseconds, *localFile becomes its path; else *localFile stays. A file
-/// that does not come is no failure: what needs it finds the gap.
+/// that does not come is no failure (C30): what needs it finds the gap.
 bool fetchFile(const JobLoad& load, const wxString& serverPath, int limit, wxString* localFile);
 
 /// Sets controlStripFile and deviceID, for a dynamic strip dynstripFile too. Returns the code of

@@ -1,4 +1,4 @@
-// Between the code page of the user interface and the text on the wire, and small byte filters.
+// Between the user interface's code page and the text on the wire, and byte filters (C164).
 //
 // On this platform the code page conversions are empty (C147): text passes unchanged, and
 // CharSetsWx does the real work. The interface is the one that a port with a native code page

@@ -1,4 +1,4 @@
-// The language of the machine's user, in three numberings.
+// The language of the machine's user, in three numberings (C167).
 #pragma once
 
 #include <wx/string.h>

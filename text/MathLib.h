@@ -1,4 +1,4 @@
-// Rounding, comparing with a tolerance, and turning doubles into integers without overflow.
+// Rounding, comparing with a tolerance, and turning doubles into integers without overflow (C168).
 #pragma once
 
 #include <bit>

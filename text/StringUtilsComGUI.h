@@ -1,4 +1,4 @@
-// Strings between wide characters (one 32-bit unit each) and 8 bits, and small helpers.
+// Strings between wide characters (one 32-bit unit each) and 8 bits, and small helpers (C166).
 #pragma once
 
 #include <string>

@@ -1,4 +1,4 @@
-// A table of parameters in the making, which owns all that it points to.
+// A table of parameters in the making, which owns all that it points to (C162).
 #pragma once
 
 #include <functional>

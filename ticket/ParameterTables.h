@@ -1,4 +1,4 @@
-// Tables of parameter records: making, copying, and asking what became of them.
+// Tables of parameter records: making, copying, and asking what became of them (C158).
 #pragma once
 
 #include <cstdlib>

@@ -1,4 +1,4 @@
-// Which keys of a ticket are of interest: exact keys, and prefixes written with a trailing `*`.
+// Which keys of a ticket are of interest: exact keys, and prefixes with a trailing `*` (C159).
 #pragma once
 
 #include <memory>

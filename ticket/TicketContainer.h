@@ -1,4 +1,4 @@
-// Views on the container of a session: the parameters of its tickets, and the tickets themselves.
+// Views on the container of a session: the parameters of its tickets, and the tickets (C161).
 #pragma once
 
 #include <string>

@@ -1,4 +1,4 @@
-// Tickets that belong to no container: scratch and delta tickets.
+// Tickets that belong to no container: scratch and delta tickets (C160).
 #pragma once
 
 #include "ticket/TicketRecords.h"

@@ -1,4 +1,4 @@
-// Changes to tickets, held back until a flush sends what differs to the server.
+// Changes to tickets, held back until a flush sends what differs to the server (C163).
 #pragma once
 
 #include <functional>
@@ -85,7 +85,7 @@ class TICKET_UPDATE_LIST {
     ///
     /// False for a text that can't be translated (nothing is stored, nobody told), an invalid
     /// address, a null key, and what the plug-in refuses. With broadcast the callback is told, also
-    /// of what the plug-in refused.
+    /// of what the plug-in refused (C140).
     bool xSetParameter(int type, int id, const char* key, PARAM_TYPE ptype, const void* value,
                        int position, bool broadcast);
     bool DelParameter(int type, int id, const char* key, int position, bool broadcast);

@@ -160,7 +160,7 @@ int ComGUIManager::CreateComGUIModuleInterface(__CFBundle* plugIn,
 
 int ComGUIManager::Initialize(const char* user, const char* password, const char* server, int port,
                               int applicationID) {
-    static std::int32_t localPort = firstLocalPort;
+    static std::int32_t localPort = firstLocalPort; // Of the process (C96).
     m_record->clientLevelCompanion = 1;
     m_record->clientLevel = applicationID == verifierApplication ? 7 : 5;
     m_record->reservedFlag = 0;

@@ -1,5 +1,5 @@
 // The client side of the comm plug-in: loads it, keeps the session, and passes ticket and file
-// traffic on.
+// traffic on. Much of it serves other programs only (C169).
 #pragma once
 
 #include <memory>
@@ -74,8 +74,8 @@ class ComGUIManager {
     void Logout();
     /// Result of the plug-in.
     int Uninitialize();
-    /// 0 if the server answers, else COMERR_NOT_ALIVE. Needs no login. A null host stands for the
-    /// record's server, port 0 for 50005.
+    /// 0 if the server answers (C98), else COMERR_NOT_ALIVE. Needs no login. A null host stands for
+    /// the record's server, port 0 for 50005.
     int IsAlive(const char* host, int port);
 
     /// The session's tickets, or null. Where none are held the plug-in is asked again, and what it
