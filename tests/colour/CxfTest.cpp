@@ -134,8 +134,8 @@ TEST(Cxf, IsReadAsTheSameMeasurementInCgats) {
     // The measurement under M2 reflects a tenth less.
     ColourFile m1;
     ColourFile m2;
-    ASSERT_EQ(loadColourFile(folder.path("spectra.cxf"), {true, "M3"}, m1), Failure::None);
-    ASSERT_EQ(loadColourFile(folder.path("spectra.cxf"), {true, "M2"}, m2), Failure::None);
+    ASSERT_EQ(loadColourFile(folder.path("spectra.cxf"), {.condition = "M3"}, m1), Failure::None);
+    ASSERT_EQ(loadColourFile(folder.path("spectra.cxf"), {.condition = "M2"}, m2), Failure::None);
     EXPECT_EQ(m1.set->conditions.measurement, "M1"); // There is no M3.
     EXPECT_EQ(m2.set->conditions.measurement, "M2");
     EXPECT_NEAR(m2.set->spectra[0], 0.9 * m1.set->spectra[0], 1e-6);
@@ -416,7 +416,7 @@ TEST(Cxf, ChoosesAmongConditionsAndLights) {
                  {object(lab("80", "none")), "M2", {80}, "", ""}};
     for (const auto& c : cases) {
         SCOPED_TRACE(c.objects + c.wanted);
-        const DataSet set = readWell(file(c.objects), {true, c.wanted});
+        const DataSet set = readWell(file(c.objects), {.condition = c.wanted});
         EXPECT_EQ(lightness(set), c.L);
         EXPECT_EQ(set.conditions.measurement, c.condition);
         EXPECT_EQ(set.conditions.illuminant, c.illuminant);
