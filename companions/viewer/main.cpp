@@ -83,7 +83,7 @@ int showReport(const std::string& metaPath) {
     const store::WriteFailures failures(platform::temporaryFolder());
     const std::string missing = viewer::missingWrites(failures.all(), folder, *meta);
     if (!missing.empty())
-        result->warnings.insert(result->warnings.begin(), missing);
+        result->warnings.insert(result->warnings.begin(), report::Warning{missing, false});
     const std::string page =
         report::keepPage(folder, report::pageStem(*meta), report::pageOf(*result, &*meta), problem);
     if (page.empty())
