@@ -38,7 +38,6 @@
 #include "colour/CgatsNumbers.h"
 #include "colour/CgatsTables.h"
 #include "colour/CxfObjects.h"
-#include "colour/Spectra.h"
 #include "colour/TextEncoding.h"
 
 namespace colour {
@@ -294,6 +293,10 @@ class SetReader {
         }
         return failure;
     }
+
+    /// False if colour values were read that are stated for another light than D50 or another
+    /// observer than 2 degrees.
+    bool isUsual() const { return m_usual; }
 
   private:
     std::string text(pugi::xml_node parent, std::string_view name) const {
@@ -628,22 +631,10 @@ class SetReader {
         }
         set.conditions = m_stated;
         set.conditions.measurement = conditionName(m_condition);
-        if (!m_usual && !set.spectra.empty() && spectraUsable(set.axis)) {
-            set.lab.clear();
-            set.xyz.clear();
-            m_notes.add("The colour values are stated for " + describe(m_stated) +
-                        ": those of the spectra are used.");
-        }
         const bool none = set.lab.empty() && set.xyz.empty() && set.spectra.empty();
         return none && (partial || measured > 0) && !m_table->unevenSpectra
                    ? (partial ? Failure::Damaged : Failure::NoColourValues)
                    : Failure::None;
-    }
-
-    static std::string describe(const Conditions& conditions) {
-        std::string words = conditions.illuminant.empty() ? "D50" : conditions.illuminant;
-        return words + " and " + (conditions.observer.empty() ? "2" : conditions.observer) +
-               " degrees";
     }
 
     void dropSpectra() {
@@ -747,7 +738,9 @@ Failure readFile(std::string_view utf8, const CgatsWants& wants, DataSet& set) {
         failure != Failure::None) {
         return failure;
     }
-    if (const Failure failure = complete(table, cgats::ScaleHint::None, wants, notes);
+    CgatsWants completion = wants;
+    completion.calculated = wants.calculated || !reader.isUsual();
+    if (const Failure failure = complete(table, cgats::ScaleHint::None, completion, notes);
         failure != Failure::None) {
         return failure;
     }
