@@ -372,9 +372,10 @@ TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
         const auto& [table, column] = places[below(std::size(places))];
         const std::string name = column;
         const support::BarePostgres bare("room");
-        // The row by its place; the same statement, at its new place, takes the change back.
+        // Short names might become each other. The row by its place; the same statement, at its new
+        // place, takes the change back.
         std::string place = bare.run("SELECT ctid FROM tintgate." + std::string(table) +
-                                     " ORDER BY random() LIMIT 1");
+                                     " WHERE length(" + name + ") > 4 ORDER BY random() LIMIT 1");
         const std::string at = std::to_string(below(1'000));
         const auto change = [&] {
             place = bare.run("UPDATE tintgate." + std::string(table) + " SET " + name +
