@@ -13,72 +13,45 @@ import subprocess
 import sys
 from pathlib import Path
 
-# What stands behind each target's arrows. A new target, or a new arrow, is stated here first.
-ARROWS = {
-    "base": "",
-    "propertylist": "base",
-    "plist-reader": "propertylist",
-    "platformrecords": "",
-    "platform": "base platformrecords propertylist",
-    "text": "platform",
-    "ticketrecords": "",
-    "ticket": "ticketrecords text",
-    "log": "",
-    "helper": "base platform",
-    "commrecords": "platformrecords ticketrecords",
-    "comm": "base commrecords ticket text helper platform",
-    "records": "",
-    "jdf": "records",
-    "job": "base comm jdf records log helper text libTintgate platform",
-    "logger": "log",
-    "jobform": "",
-    "Tintgate": "base jobform logger log records platform libTintgate",
-    "TintgateJob": "job jobform log records libTintgate",
-    "colour": "base",
-    "report": "colour",
-    "viewer": "report platform writefailures",
-    "measuring": "base colour platform",
-    "NerovaMeasure": "measuring report",
-    "analysis": "colour records",  # libTintgate without its ten functions' names
-    "libTintgate": "analysis colour records",
-    "ticketengine": "ticketrecords",
-    "StoreEngine": "ticketengine",
-    "writefailures": "base",
-    "store": "base StoreEngine",
-    "ComGUI": "commrecords ticketrecords ticketengine StoreEngine store platform writefailures",
-    "bytes": "",
-    "diagnosis": "base job comm records logger log helper libTintgate platform store",
-    "tintgate-store": "bytes diagnosis store",
-    "tintgate-report": "report analysis libTintgate bytes store platform",
-}
+# The table of docs/architecture.md is the one place that states what each target may see.
+ROW = re.compile(r"^\| `([\w-]+)` \| `[^`]*` \|([^|]*)\|([^|]*)\|[^|]+\|$", re.MULTILINE)
 
-# Arrows that go on through a target, because a header that it publishes needs them itself.
-EXPOSES = {
-    "commrecords": "platformrecords ticketrecords",
-    "comm": "commrecords ticket",
-    "platform": "platformrecords",
-    "report": "colour",
-    "measuring": "colour",
-    "analysis": "records",
-    "ticket": "ticketrecords text",
-    "ticketengine": "ticketrecords",
-    "StoreEngine": "ticketengine",
-    "store": "StoreEngine",
-}
+
+def read_table(source_dir):
+    """Of each target, the names of the targets that it sees, and of those that it passes on."""
+    rows = ROW.findall((source_dir / "docs" / "architecture.md").read_text(encoding="utf-8"))
+    if not rows:
+        sys.exit("docs/architecture.md has no table of targets")
+    return ({name: sees.split() for name, sees, _ in rows},
+            {name: passes.split() for name, _, passes in rows})
+
 
 # Made by the build for everybody who returns or explains an exit code or a status.
 FOR_ALL = {"ExitCodes.h", "CompanionStatuses.h"}
 
 
-def seen_by(target):
+def seen_by(target, arrows, exposes):
     """The targets whose published headers `target` sees."""
-    seen, ahead = set(), ARROWS[target].split()
+    seen, ahead = set(), list(arrows[target])
     while ahead:
         name = ahead.pop()
         if name not in seen:
             seen.add(name)
-            ahead += EXPOSES.get(name, "").split()
+            ahead += exposes.get(name, [])
     return seen | {target}
+
+
+def check_circles(arrows):
+    """Yields a sentence for each target that can be reached from itself."""
+    for start in arrows:
+        seen, ahead = set(), list(arrows[start])
+        while ahead:
+            name = ahead.pop()
+            if name not in seen:
+                seen.add(name)
+                ahead += arrows.get(name, [])
+        if start in seen:
+            yield f"{start} is part of a circle of arrows"
 
 
 def headers_under(folder):
@@ -98,7 +71,7 @@ def found(compiler, include_path, headers):
     return {line.split()[1] for line in result.stdout.splitlines() if line.startswith("found ")}
 
 
-def check_arrows(compiler, binary_dir, targets):
+def check_arrows(compiler, binary_dir, targets, arrows, exposes):
     """Yields a sentence for each header that a target sees and should not, or the reverse."""
     see = binary_dir / "see"
     published = {
@@ -111,11 +84,11 @@ def check_arrows(compiler, binary_dir, targets):
     for header in {header for header in everything if everything.count(header) > 1}:
         yield f"{header} is published more than once"
     for target in targets:
-        if target not in ARROWS:
+        if target not in arrows:
             yield f"{target} has no row in the table of arrows"
             continue
         expected = set(private[target])
-        for name in seen_by(target):
+        for name in seen_by(target, arrows, exposes):
             expected.update(published.get(name, []))
         include_path = (binary_dir / "arrows" / target).read_text().split()
         actual = found(compiler, include_path, everything)
@@ -146,7 +119,12 @@ def check_includes(source_dir):
 
 
 def main(compiler, source_dir, binary_dir, *targets):
-    faults = [*check_arrows(compiler, Path(binary_dir), targets), *check_includes(Path(source_dir))]
+    arrows, exposes = read_table(Path(source_dir))
+    faults = [
+        *check_circles(arrows),
+        *check_arrows(compiler, Path(binary_dir), targets, arrows, exposes),
+        *check_includes(Path(source_dir)),
+    ]
     print("\n".join(faults) or f"{len(targets)} targets see what they should")
     return 1 if faults or not targets else 0
 
