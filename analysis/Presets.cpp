@@ -10,6 +10,7 @@
 //   <psd>no</psd>
 //   <repeats>mean</repeats>               may be absent: each
 //   <minimumGreys>5</minimumGreys>        may be absent: 5
+//   <inks>Orange, Green, Violet</inks>    may be absent; the inks after C, M, Y, K
 //   <criteria>
 //     <average tolerance="2.5" used="yes" decimals="1"/>
 //     <paperWhite tolerance="3" used="yes" decimals="1" psdTolerance="3" psdUsed="no"/>
@@ -45,6 +46,8 @@ constexpr int largestDecimals = 10;
 constexpr int largestCondition = 999;
 constexpr int mostGreys = 1000;
 constexpr int largestId = 2147483647;
+constexpr std::size_t mostInks = 60;
+constexpr std::size_t longestInk = 100; // bytes
 
 using Status = int; // of ExitCodes.h; exitDone goes on
 
@@ -92,14 +95,57 @@ Status readFormula(std::string_view text, int& number) {
     return exitPresetOutOfRange;
 }
 
+bool isUtf8(const std::wstring& widenedText) {
+    const auto isStrayByte = [](wchar_t unit) { return unit >= 0xDC80 && unit <= 0xDCFF; };
+    return std::none_of(widenedText.begin(), widenedText.end(), isStrayByte);
+}
+
 Status readName(std::string_view text, wxString& name) {
     const std::wstring wide = widened(trimmed(text));
     if (wide.empty())
         return exitPresetValueMissing;
-    const auto isStrayByte = [](wchar_t unit) { return unit >= 0xDC80 && unit <= 0xDCFF; };
-    if (std::any_of(wide.begin(), wide.end(), isStrayByte))
+    if (!isUtf8(wide))
         return exitPresetNotXml;
     name = wxString(wide);
+    return exitDone;
+}
+
+/// Equal but for the case of ASCII letters.
+bool sameWord(std::string_view left, std::string_view right) {
+    const auto lower = [](char c) { return c >= 'A' && c <= 'Z' ? static_cast<char>(c | 32) : c; };
+    return std::equal(left.begin(), left.end(), right.begin(), right.end(),
+                      [&](char a, char b) { return lower(a) == lower(b); });
+}
+
+/// Names separated by commas. C, M, Y and K are not among them: a list that begins with these
+/// would name every further ink wrong.
+Status readInks(std::string_view text, std::vector<std::string>& inks) {
+    std::vector<std::string> names;
+    for (bool more = true; more;) {
+        const std::size_t comma = text.find(',');
+        const std::string_view name = trimmed(text.substr(0, comma));
+        more = comma != text.npos;
+        text.remove_prefix(more ? comma + 1 : 0);
+        if (name.empty())
+            return exitPresetValueMissing;
+        if (!isUtf8(widened(name)))
+            return exitPresetNotXml;
+        const auto isControl = [](char c) { return static_cast<unsigned char>(c) < ' '; };
+        if (names.size() == mostInks || name.size() > longestInk ||
+            std::any_of(name.begin(), name.end(), isControl))
+            return exitPresetOutOfRange;
+        for (const char* process : {"Cyan", "Magenta", "Yellow", "Black"})
+            if (sameWord(name, process))
+                return exitPresetOutOfRange;
+        for (const char* letter : {"C", "M", "Y", "K"}) // small letters are those of light inks
+            if (name == letter)
+                return exitPresetOutOfRange;
+        for (const std::string& other : names)
+            if (sameWord(name, other))
+                return exitPresetValueRepeated;
+        names.emplace_back(name);
+    }
+    inks = std::move(names);
     return exitDone;
 }
 
@@ -149,6 +195,7 @@ constexpr struct Field {
          return readNumber(text, 1, mostGreys, preset.options.minimumGreys);
      },
      true},
+    {"inks", [](auto text, Preset& preset) { return readInks(text, preset.options.inks); }, true},
 };
 
 /// The fault that reading meets, with its place.

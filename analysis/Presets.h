@@ -5,6 +5,7 @@
 #include <cstddef>
 #include <string>
 #include <string_view>
+#include <vector>
 
 #include "analysis/Comparison.h"
 #include "analysis/Criteria.h"
@@ -28,6 +29,10 @@ struct PresetOptions {
     RepeatMode repeats = RepeatMode::Each;
     bool conditionRequired = false; ///< The measuring condition decides, and does not only warn.
     int minimumGreys = 5;           ///< Fewer CMY greys give no answer.
+
+    /// Names of the inks after C, M, Y and K, in the order of the channels. UTF-8, different, none
+    /// empty. For data that do not name them; they may be more or fewer than the data have inks.
+    std::vector<std::string> inks;
 
     /// Settings of the criteria without an entry, by their place in `criteria`.
     std::array<Setting, criterionCount> named{};

@@ -1,5 +1,6 @@
 #include "analysis/ResultJson.h"
 
+#include "analysis/InkNames.h"
 #include "analysis/JsonWriter.h"
 #include "analysis/Text.h"
 #include "analysis/Version.h"
@@ -49,6 +50,11 @@ void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset,
     json.member("conditionRequired", options.conditionRequired);
     json.member("repeats", repeatModeName(options.repeats));
     json.member("minimumGreys", std::int64_t{options.minimumGreys});
+    json.key("inks");
+    json.beginCompactArray();
+    for (const std::string& ink : options.inks)
+        json.text(ink);
+    json.endArray();
     json.endObject();
 }
 
@@ -221,7 +227,7 @@ void writeUnpaired(JsonWriter& json, const char* key, const Input& input, bool i
     json.endArray();
 }
 
-void writeColumns(JsonWriter& json, const Comparison& c) {
+void writeColumns(JsonWriter& json, const Comparison& c, const PresetOptions& options) {
     json.key("patchColumns");
     json.beginCompactArray();
     for (const char* column :
@@ -230,9 +236,8 @@ void writeColumns(JsonWriter& json, const Comparison& c) {
     json.endArray();
     json.key("deviceChannels");
     json.beginCompactArray();
-    if (c.devices)
-        for (const std::string& channel : c.devices->file.set->channels)
-            json.text(channel);
+    for (const std::string& channel : channelNames(c, options.inks))
+        json.text(channel);
     json.endArray();
 }
 
@@ -306,7 +311,7 @@ std::wstring resultJson(const Comparison& c, const Judgement& judgement,
     writeUnpaired(json, "measurement", c.measurement, true);
     writeUnpaired(json, "patchSet", c.patchSet, true);
     json.endObject();
-    writeColumns(json, c);
+    writeColumns(json, c, options);
     writePatches(json, c);
     json.endObject();
     json.endLine();

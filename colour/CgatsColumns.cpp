@@ -425,6 +425,20 @@ std::vector<ColumnMeaning> meaningsOf(const std::vector<std::string>& names) {
     return meanings;
 }
 
+bool isNumberedInk(std::string_view channel) {
+    std::string name = normalised(channel);
+    if (colorantIndex(name)) {
+        return true;
+    }
+    const std::size_t digits = name.find_last_not_of("0123456789") + 1;
+    constexpr std::size_t mostDigits = 2; // More are a name, such as that of an ink in a fan.
+    if (digits == name.size() || name.size() - digits > mostDigits) {
+        return false;
+    }
+    name = squeezed(name.substr(0, digits));
+    return name == "SPOT" || name.starts_with("CMYK");
+}
+
 bool holdWholeGroup(const std::vector<ColumnMeaning>& meanings) {
     return columnsOf(meanings, Quantity::Cmyk, 4).size() == 4 ||
            columnsOf(meanings, Quantity::Rgb, 3).size() == 3 ||

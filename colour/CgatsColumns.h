@@ -42,6 +42,10 @@ struct ColumnMeaning {
 /// count only where the whole group stands side by side.
 std::vector<ColumnMeaning> meaningsOf(const std::vector<std::string>& names);
 
+/// True if the name of a channel only numbers its ink: 7CLR_5, PC7_5, PCA_A, CMYK_5, SPOT_5. Others
+/// name it, such as CMYKOG_O and SPOT_Gold.
+bool isNumberedInk(std::string_view channel);
+
 /// True if the names hold a whole group of colour or device values. Only this tells a line of names
 /// from prose.
 bool holdWholeGroup(const std::vector<ColumnMeaning>& meanings);

@@ -93,7 +93,8 @@
   const lab = (values) => values.map((value) => fixed(value, 2)).join(" ");
   const natural = new Intl.Collator("en", { numeric: true });
   const byNumber = (get) => (a, b) => (get(a) ?? -Infinity) - (get(b) ?? -Infinity);
-  const channels = data.channels.map((name) => name.replace(/^[A-Z0-9]+_(?=.)/, "")).join(" ");
+  const inks = data.channels.map((name) => name.replace(/^[A-Z0-9]+_(?=.)/, ""));
+  const channels = inks.join(inks.some((name) => name.includes(" ")) ? ", " : " ");
 
   // A row has labels of the sheet only if they differ from those of the target.
   const sheetId = (row) => (row.length > SHEET_ID ? row[SHEET_ID] : row[ID]);

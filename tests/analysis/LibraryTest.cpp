@@ -295,6 +295,59 @@ TEST_F(Library, WritesTheLabThatAProfileGives) {
     EXPECT_THAT(json, HasSubstr("\"paired\": 1617"));
 }
 
+// Names of inks are read by people and decide nothing: all pairs have the same differences.
+TEST_F(Library, NamesInksFromWhereTheNamesCanBeTrusted) {
+    const auto inkChart = [&](const std::string& columns, const std::string& header) {
+        return chart(columns + " " + labNames,
+                     "100 0 0 0 0 0 0 55 -36 -50\n0 0 0 0 100 0 0 65 50 60\n"
+                     "0 0 0 0 0 0 0 95 0 -2\n0 0 0 0 0 0 100 25 40 -50\n",
+                     "CGATS.17\n" + header);
+    };
+    const std::string plus = "PLUS_1_COLOR Red|87|0|0|1|2|50|50|1\n"; // an exporter's defaults
+    const std::string process = "CMYK_C CMYK_M CMYK_Y CMYK_K ";
+    const std::string numbered =
+        inkChart("7CLR_1 7CLR_2 7CLR_3 7CLR_4 7CLR_5 7CLR_6 7CLR_7", plus);
+    const std::string letters =
+        inkChart("PC7_1 PC7_2 PC7_3 PC7_4 PC7_5 PC7_6 PC7_7", "COLOR_REP \"CMYKOGV\"\n");
+    const std::string spots = inkChart(process + "SPOT_5 SPOT_Gold SPOT_485", "");
+    const std::string columns = inkChart(process + "CMYKOGV_O CMYKOGV_G CMYK_7", "");
+    const std::string text = support::contentsOf(TINTGATE_SOURCE_DIR "/presets/CVP_0001.xml");
+    const std::string end = "</psd>";
+    const auto presetFile = [&](const char* inks) {
+        const std::string element = *inks == '\0' ? "" : "<inks>" + std::string(inks) + "</inks>";
+        return scratch.write("inks" + std::to_string(++charts),
+                             std::string(text).insert(text.find(end) + end.size(), element));
+    };
+    const std::string none = presetFile("");
+    const std::string two = presetFile("Grün, Deep Sea");
+    const std::string four = presetFile("A, B, D, E");
+    const struct {
+        std::string target, measurement, preset, shows;
+    } cases[] = {
+        {numbered, numbered, none, R"("Channel 5","Channel 6","Channel 7"])"},
+        {numbered, numbered, two, R"("SPOT_Gr\u00fcn","SPOT_Deep Sea","Channel 7"])"},
+        {numbered, numbered, four, R"("SPOT_A","SPOT_B","SPOT_D"])"},
+        {letters, numbered, four, R"("SPOT_Orange","SPOT_Green","SPOT_Violet"])"},
+        {numbered, letters, four, R"("SPOT_Orange","SPOT_Green","SPOT_Violet"])"},
+        {spots, numbered, none, R"("Channel 5","SPOT_Gold","SPOT_485"])"},
+        {spots, letters, none, R"("SPOT_Orange","SPOT_Gold","SPOT_485"])"},
+        {columns, numbered, two, R"("CMYKOGV_O","CMYKOGV_G","Channel 7"])"},
+    };
+    std::vector<std::string> texts;
+    for (const auto& c : cases) {
+        preset = {};
+        ASSERT_EQ(parsePresetParameterXMLFile(stringToWstring(c.preset), &preset, false), 0);
+        ASSERT_EQ(analyse(c.target, c.measurement, "", nullptr), 0);
+        EXPECT_THAT(json, HasSubstr(R"("CMYK_C","CMYK_M","CMYK_Y","CMYK_K",)" + c.shows));
+        EXPECT_THAT(json, HasSubstr("\"measurement\": \"deviceValues\""));
+        EXPECT_THAT(json, HasSubstr("\"paired\": 4,"));
+        EXPECT_EQ(results.values[0], 0);
+        texts.push_back(json);
+    }
+    EXPECT_THAT(texts[2], HasSubstr(R"("inks": ["A","B","D","E"])"));
+    expectSound("result.schema.json", texts);
+}
+
 TEST_F(Library, NamesInstruments) {
     setenv("TINTGATE_INSTRUMENTS",
            scratch

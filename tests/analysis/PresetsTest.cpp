@@ -147,6 +147,16 @@ TEST(Presets, OneCodeForOneCause) {
         {"<psd>", "<repeats>both</repeats><psd>", exitPresetOutOfRange},
         {"<psd>", "<repeats>mean</repeats><repeats>mean</repeats><psd>", exitPresetValueRepeated},
         {"<psd>", "<minimumGreys>0</minimumGreys><psd>", exitPresetOutOfRange},
+        {"<psd>", "<inks> </inks><psd>", exitPresetValueMissing},
+        {"<psd>", "<inks>Orange,,Violet</inks><psd>", exitPresetValueMissing},
+        {"<psd>", "<inks>Orange,</inks><psd>", exitPresetValueMissing},
+        {"<psd>", "<inks>Orange, Violet, ORANGE</inks><psd>", exitPresetValueRepeated},
+        {"<psd>", "<inks>cyan, Orange</inks><psd>", exitPresetOutOfRange},
+        {"<psd>", "<inks>Orange, K</inks><psd>", exitPresetOutOfRange},
+        {"<psd>", "<inks>Orange\nViolet</inks><psd>", exitPresetOutOfRange},
+        {"<psd>", "<inks>" + std::string(101, 'a') + "</inks><psd>", exitPresetOutOfRange},
+        {"<psd>", "<inks>Gr\xFCn</inks><psd>", exitPresetNotXml},
+        {"<psd>", "<inks><ink>Orange</ink></inks><psd>", exitPresetUnknownEntry},
         {"<psd>", "<psd required=\"yes\">", exitPresetUnknownEntry},
         {"Condition>-1", "Condition required=\"1\">-1", exitPresetOutOfRange},
         {"Condition>-1", "Condition required=\"yes\">4", exitPresetOutOfRange},
@@ -202,7 +212,8 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
         text.replace(text.find(from), from.size(), to);
     };
     change("Condition>-1", "Condition required=\"yes\">3");
-    change("<psd>", "<minimumGreys> 3 </minimumGreys><repeats>mean</repeats><psd>");
+    change("<psd>", "<minimumGreys> 3 </minimumGreys><repeats>mean</repeats>"
+                    "<inks>\n Deep Sea,485,k\t, Grün\n</inks><psd>");
     change("<average", "<repeatSpread tolerance=\"1.5\" used=\"yes\" decimals=\"1\" "
                        "psdTolerance=\"2.5\" psdUsed=\"no\"/><average");
     const auto spread = [](const Record& record, const PresetOptions& options) {
@@ -218,6 +229,7 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
         EXPECT_TRUE(options.conditionRequired);
         EXPECT_EQ(options.repeats, RepeatMode::Mean);
         EXPECT_EQ(options.minimumGreys, 3);
+        EXPECT_THAT(options.inks, testing::ElementsAre("Deep Sea", "485", "k", "Grün"));
         EXPECT_EQ(spread(record, options).tolerance, 1.5);
         EXPECT_TRUE(spread(record, options).used);
         EXPECT_EQ(spread(record, options).decimals, 1);
