@@ -112,7 +112,8 @@ const Value* valueOf(const Content& content, const Object& object, Value::Kind k
         if (value.kind != kind || (value.condition != unstated && value.condition != condition)) {
             continue;
         }
-        const bool usual = value.specification == nullptr || value.specification->conditions.areUsual();
+        const bool usual =
+            value.specification == nullptr || value.specification->conditions.areUsual();
         const int rank = 1 + (value.condition == condition ? 2 : 0) + (usual ? 1 : 0);
         if (rank > bestRank) {
             best = &value;
@@ -601,8 +602,7 @@ class SetReader {
         light.last = m_lastSpecification = value.specification;
         const Conditions stated =
             value.specification != nullptr ? value.specification->conditions : Conditions{};
-        if (!std::exchange(light.seen, true) ||
-            (light.stated.areUsual() && !stated.areUsual())) {
+        if (!std::exchange(light.seen, true) || (light.stated.areUsual() && !stated.areUsual())) {
             light.stated = stated;
         } else if (light.stated.areUsual()) {
             cancel(light.stated, stated);

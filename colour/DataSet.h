@@ -73,7 +73,7 @@ struct DataSet {
     std::string descriptor;
     std::string created;
     std::string instrumentation;
-    std::string printing; ///< The printer, otherwise the printing conditions.
+    std::string printing;    ///< The printer, otherwise the printing conditions.
     Conditions conditions;   ///< As stated.
     bool calculated = false; ///< lab and xyz are from the spectra, since the file states another
                              ///< illuminant than D50 or observer than 2 degrees.

@@ -305,8 +305,7 @@ TEST_F(Library, NamesInksFromWhereTheNamesCanBeTrusted) {
     };
     const std::string plus = "PLUS_1_COLOR Red|87|0|0|1|2|50|50|1\n"; // an exporter's defaults
     const std::string process = "CMYK_C CMYK_M CMYK_Y CMYK_K ";
-    const std::string numbered =
-        inkChart("7CLR_1 7CLR_2 7CLR_3 7CLR_4 7CLR_5 7CLR_6 7CLR_7", plus);
+    const std::string numbered = inkChart("7CLR_1 7CLR_2 7CLR_3 7CLR_4 7CLR_5 7CLR_6 7CLR_7", plus);
     const std::string letters =
         inkChart("PC7_1 PC7_2 PC7_3 PC7_4 PC7_5 PC7_6 PC7_7", "COLOR_REP \"CMYKOGV\"\n");
     const std::string spots = inkChart(process + "SPOT_5 SPOT_Gold SPOT_485", "");
