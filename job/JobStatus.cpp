@@ -2,7 +2,9 @@
 #include "cli/CLogger.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/StripKeys.h"
+
+using namespace jobkeys;
 
 namespace {
 
@@ -12,8 +14,8 @@ constexpr int activeForTwoStrips = 3; ///< Of "Workflow/Verify/Active".
 bool hasResult(const JobTicket& ticket, Strip strip) {
     int approval = -1;
     const int code = ticket.read(measurementKey(strip, "Approval"), -1, &approval);
-    CLogger::GetLogger()->Log("Read Approvals%d, err=%d, iTmp==%d", strip == Strip::first ? 1 : 2,
-                              code, approval);
+    CLogger::GetLogger()->Log("Read Approvals%d, err=%d, iTmp==%d", numberOf(strip), code,
+                              approval);
     if (code != 0 || approval < 0) {
         return false;
     }

@@ -6,6 +6,7 @@
 #include <wx/string.h>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "jobkeys/Tickets.h"
 
 /// A view on the connector's reads and writes of one ticket, at the key as a whole.
 ///
@@ -13,10 +14,7 @@
 /// nothing was found or done. It owns nothing and must not outlive the connector.
 class JobTicket {
   public:
-    static constexpr int jobType = 3;     ///< The id is that of the job.
-    static constexpr int presetType = 27; ///< The id is that of the tolerance preset.
-
-    JobTicket(CKZConnector* connector, int id, int type = jobType)
+    JobTicket(CKZConnector* connector, int id, int type = jobkeys::jobType)
         : m_connector(connector), m_type(type), m_id(id) {}
 
     /// Where there is none, *value becomes the fallback.

@@ -15,10 +15,13 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/StripKeys.h"
+#include "jobkeys/Tickets.h"
 #include "measure/ControlStripText.h"
 #include "measure/StripLookups.h"
 #include "ticket/ParameterTables.h"
+
+using namespace jobkeys;
 
 namespace {
 
@@ -32,7 +35,7 @@ bool isOneOf(const Values& values, int number) {
 
 void makeJobFolder(JobLoad& load, const wxString& workingDir) {
     KZJobDataStruct& job = *load.job;
-    job.tempDir = workingDir + wxString::Format("/JobID_%i", job.jobID);
+    job.tempDir = workingDir + "/" + jobFolderName(job.jobID);
     load.ticket.read("Job/FromEsko", 0, &load.fromEsko);
     std::error_code ignored;
     std::filesystem::create_directories(measure::pathBytes(job.tempDir), ignored);
@@ -88,12 +91,6 @@ int readComparison(JobLoad& load) {
                                         &job.presetID);
 }
 
-/// The digits fill up to four.
-wxString presetFileName(int id) {
-    const char* zeros = id <= 9 ? "000" : id <= 99 ? "00" : id <= 999 ? "0" : "";
-    return wxString::Format("CVP_%s%i.xml", zeros, id);
-}
-
 /// Values of the preset's ticket. The first that is missing ends the row, without a consequence
 /// (C39).
 void readPresetKeys(const JobTicket& ticket, tolerancePresetParameterRecord& tolerance) {
@@ -119,7 +116,7 @@ void readPresetKeys(const JobTicket& ticket, tolerancePresetParameterRecord& tol
 int loadTolerance(JobLoad& load) {
     KZJobDataStruct& job = *load.job;
     tolerancePresetParameterRecord& tolerance = job.tolerance;
-    const JobTicket ticket(load.processor->m_connector, job.presetID, JobTicket::presetType);
+    const JobTicket ticket(load.processor->m_connector, job.presetID, presetType);
     tolerance.presetID = job.presetID;
     ticket.read("Name", &tolerance.name);
     if (tolerance.name.empty()) {
@@ -127,8 +124,8 @@ int loadTolerance(JobLoad& load) {
     }
     job.presetFile = presetFileName(job.presetID);
     job.presetLocalFile = job.tempDir + "/" + job.presetFile;
-    fetchFile(load, load.installFolder + "/tickets/" + job.presetFile, fileWait,
-              &tolerance.filePath);
+    fetchFile(load, wxString::FromUTF8(presetPath(load.installFolder.utf8_string(), job.presetID)),
+              fileWait, &tolerance.filePath);
     readPresetKeys(ticket, tolerance);
     // The ticket's "FograPSDPreset" does not count, and the arrays of the plain kind are read in
     // any case (C38): only the preset's file can make it one of the PSD kind.

@@ -19,10 +19,13 @@
 #include "jdf/JdfHandler.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/PatchArrays.h"
-#include "job/StripKeys.h"
+#include "jobkeys/PatchArrays.h"
+#include "jobkeys/StripKeys.h"
+#include "jobkeys/Tickets.h"
 #include "text/CharSets.h"
 #include "text/MathLib.h"
+
+using namespace jobkeys;
 
 namespace {
 
@@ -297,8 +300,8 @@ int KZVerifyJobProcessor::CopyResulDataToJobTicket(int jobID, KZJobDataStruct jo
 int KZVerifyJobProcessor::WrietErrorToJobTicket(int errorCode, int jobID) {
     constexpr const char* key = "Process/ErrorMessage";
     std::vector<std::string> messages;
-    m_connector->GetJobTicketStringArray(JobTicket::jobType, jobID, key, &messages);
+    m_connector->GetJobTicketStringArray(jobType, jobID, key, &messages);
     std::string message = "k_TintgateError: " + std::to_string(errorCode);
-    return m_connector->SetJobTicketKeyValue(JobTicket::jobType, jobID, key, PARAM_STRING,
-                                             message.data(), static_cast<int>(messages.size()));
+    return m_connector->SetJobTicketKeyValue(jobType, jobID, key, PARAM_STRING, message.data(),
+                                             static_cast<int>(messages.size()));
 }

@@ -10,6 +10,8 @@
 #include "job/JobFiles.h"
 #include "measure/ControlStripText.h"
 
+using namespace jobkeys;
+
 namespace {
 
 // Milliseconds that a file is waited for.

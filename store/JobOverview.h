@@ -23,12 +23,12 @@
 #include <string_view>
 #include <vector>
 
+#include "jobkeys/Tickets.h"
 #include "store/tickets/TicketElements.h"
 
 namespace store {
 
-/// The type of the tickets that are jobs.
-inline constexpr int jobType = 3;
+using jobkeys::jobType;
 
 /// In the order in which a client reads them.
 inline constexpr std::array<std::string_view, 5> overviewKeys = {

@@ -28,7 +28,7 @@
 #include "companions/diagnosis/ValueRules.h"
 #include "companions/diagnosis/Words.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/StripKeys.h"
 #include "platform/TemporaryFolder.h"
 
 namespace diagnosis {
@@ -153,7 +153,8 @@ Diagnosis Examination::result() {
 }
 
 bool Examination::checkCall() {
-    const std::optional<int> selector = stripSelectorOf(base::wideFromBytes(m_request.selector));
+    const std::optional<int> selector =
+        jobkeys::stripSelectorOf(base::wideFromBytes(m_request.selector));
     const std::string where = "strip selector " + m_request.selector;
     if (!selector) {
         add(m_request.selector.empty() ? "strip selector" : where,
@@ -161,7 +162,7 @@ bool Examination::checkCall() {
         return end(exitWrongArguments);
     }
     m_job.secondStrip = *selector;
-    m_strip = stripOf(*selector);
+    m_strip = jobkeys::stripOf(*selector);
     if (*selector != 0 && *selector != 1) {
         add(where,
             "is neither 0, the first strip, nor 1, the second. The run reads the keys of the "

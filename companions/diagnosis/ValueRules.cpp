@@ -9,17 +9,17 @@
 #include "ExitCodes.h"
 #include "companions/diagnosis/KeyRules.h"
 #include "companions/diagnosis/Words.h"
+#include "jobkeys/PatchArrays.h"
 
 namespace diagnosis {
 
 namespace {
 
-constexpr int mostPatches = 1'000'000; ///< More are not loaded.
-
 /// The keys of one job, and what is found in their values.
 class Values {
   public:
-    explicit Values(const Examined& run) : m_run(run), m_strip(stripOf(run.job.secondStrip)) {}
+    explicit Values(const Examined& run)
+        : m_run(run), m_strip(jobkeys::stripOf(run.job.secondStrip)) {}
 
     void judgeReferences();
     void judgePatches();
@@ -63,7 +63,7 @@ void Values::judgePatches() {
     for (const char* name : {"Reference/Numpatches", "Numpatches"}) {
         const std::string key = measurementKey(m_strip, name);
         const std::optional<int> patches = numberOf(key);
-        if (patches && *patches > mostPatches) {
+        if (patches && *patches > jobkeys::mostPatches) {
             add(key,
                 "is " + std::to_string(*patches) + ". More than 1,000,000 patches are not loaded.",
                 {exitPresetFailed, exitSampleMissing});

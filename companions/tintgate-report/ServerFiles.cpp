@@ -1,17 +1,18 @@
 #include "companions/tintgate-report/ServerFiles.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <cstdlib>
 #include <sstream>
 
 #include "analysis/Presets.h"
 #include "colour/CgatsText.h"
+#include "jobkeys/Tickets.h"
 
 namespace reporting {
-namespace {
 
-constexpr int presetType = 27;
+using namespace jobkeys;
+
+namespace {
 
 std::string fileOf(store::StoreEngine& store, const std::string& path) {
     std::ostringstream bytes;
@@ -38,9 +39,7 @@ const Preset& Server::preset(int id, const std::string& installFolder) {
     if (!fresh || id <= 0)
         return at->second;
     at->second.name = textOf(m_store.key(presetType, id, "Name"));
-    char name[32];
-    std::snprintf(name, sizeof name, "CVP_%04d.xml", id);
-    const std::string bytes = fileOf(m_store, installFolder + "/tickets/" + name);
+    const std::string bytes = fileOf(m_store, presetPath(installFolder, id));
     tolerancePresetParameterRecord values;
     if (!bytes.empty() && analysis::parsePreset(bytes, true, values) == 0)
         at->second.values = values;
@@ -49,13 +48,13 @@ const Preset& Server::preset(int id, const std::string& installFolder) {
     return at->second;
 }
 
-std::string Server::instrument(const store::TicketContent& job, const StripKeys& keys, int strip) {
-    if (strip == 1 && integerOf(job.find("Footer/Dynstrip/UseDynstrip")) == 1)
+std::string Server::instrument(const store::TicketContent& job, Strip strip) {
+    if (strip == Strip::first && integerOf(job.find("Footer/Dynstrip/UseDynstrip")) == 1)
         return nameOf(integerOf(job.find("Footer/Dynstrip/DeviceID")).value_or(0));
     constexpr std::size_t shortestName = 4;
-    std::string file = textOf(job.find(keys.own("Footer/ControlstripFile")));
+    std::string file = textOf(job.find(stripKey(strip, "Footer/ControlstripFile")));
     if (file.size() < shortestName)
-        file = textOf(job.find(keys.own("Footer/Nesting/ControlstripFile")));
+        file = textOf(job.find(stripKey(strip, "Footer/Nesting/ControlstripFile")));
     file.erase(0, file.rfind('/') + 1);
     file.resize(std::min(file.rfind('.'), file.size()));
     if (file.empty())

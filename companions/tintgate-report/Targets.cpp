@@ -8,15 +8,15 @@
 #include "colour/ColourFile.h"
 #include "colour/Difference.h"
 #include "colour/Identity.h"
+#include "jobkeys/PatchArrays.h"
 
 namespace reporting {
+
+using namespace jobkeys;
+
 namespace {
 
 constexpr const char* storedReferences = "stored references";
-constexpr const char* labNames[] = {"LabValues/LValues", "LabValues/AValues", "LabValues/BValues"};
-constexpr const char* xyzNames[] = {"XYZValues/XValues", "XYZValues/YValues", "XYZValues/ZValues"};
-constexpr const char* cmykNames[] = {"CMYKValues/CValues", "CMYKValues/MValues",
-                                     "CMYKValues/YValues", "CMYKValues/KValues"};
 
 std::string nameOf(const std::string& path) {
     return path.substr(path.rfind('/') + 1);
@@ -42,28 +42,28 @@ std::string characterisation(const std::string& install, const std::string& valu
 }
 
 /// Server path of a job's references; empty if the ticket names none.
-std::string pathOf(const store::TicketContent& job, const StripKeys& keys, int strip,
-                   bool hasStored) {
+std::string pathOf(const store::TicketContent& job, Strip strip, bool hasStored) {
     const auto text = [&](const std::string& key) { return textOf(job.find(key)); };
     const auto number = [&](const std::string& key) {
         return integerOf(job.find(key)).value_or(0);
     };
     const std::string install = text("System/InstallFolder");
-    const int workflow = number(keys.own("Workflow/Verify/MeasurementWorkflow"));
+    const int workflow = number(stripKey(strip, "Workflow/Verify/MeasurementWorkflow"));
     if (number("Job/FromEsko") == 1 && workflow == 4) {
         constexpr const char* data = "Workflow/Verify/CharacterizationData";
         return job.find(data) ? text(data)
                               : inControlCharts(install, text("Footer/ControlstripFile"));
     }
     if (workflow == 1 || (workflow == 3 && !hasStored)) {
-        const std::string own = text(keys.own("Footer/ControlstripInputProfile"));
+        const std::string own = text(stripKey(strip, "Footer/ControlstripInputProfile"));
         return own.empty() ? text("Remote/UsedICCProfile") : own;
     }
-    if (strip == 1 && number("Footer/Dynstrip/UseDynstrip") == 1) {
+    if (strip == Strip::first && number("Footer/Dynstrip/UseDynstrip") == 1) {
         return text("Footer/Dynstrip/IT8");
     }
     return workflow == 2
-               ? characterisation(install, text(keys.own("Workflow/Verify/CharacterizationData")))
+               ? characterisation(install,
+                                  text(stripKey(strip, "Workflow/Verify/CharacterizationData")))
                : "";
 }
 
@@ -98,26 +98,25 @@ std::vector<double> percents(const store::TicketContent& job, const std::string&
 }
 
 /// References in the ticket itself.
-Target targetInTicket(const store::TicketContent& job, const StripKeys& keys, int patches) {
+Target targetInTicket(const store::TicketContent& job, Strip strip, int patches) {
     const auto count = static_cast<std::size_t>(patches);
     const auto columns = [&](const char* const(&names)[3]) {
         std::vector<std::vector<double>> read;
         for (const char* name : names) {
-            read.push_back(doublesOf(job.find(keys.measured(std::string("Reference/") + name))));
+            read.push_back(doublesOf(job.find(referenceKey(strip, name))));
             read.back().resize(count);
         }
         return read;
     };
-    const bool hasLab = job.find(keys.measured("Reference/LabValues/LValues")) != nullptr;
-    const auto colours = hasLab ? columns(labNames) : columns(xyzNames);
+    const bool hasLab = job.find(referenceKey(strip, labArrays[0])) != nullptr;
+    const auto colours = hasLab ? columns(labArrays) : columns(xyzArrays);
     colour::DataSet set;
     set.patchCount = count;
     set.deviceSpace = colour::DeviceSpace::Cmyk;
     set.channels = {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
     set.device.resize(count * set.channels.size());
     for (std::size_t ink = 0; ink < set.channels.size(); ++ink) {
-        const auto column =
-            percents(job, keys.measured(std::string("Reference/") + cmykNames[ink]));
+        const auto column = percents(job, referenceKey(strip, cmykArrays[ink]));
         for (std::size_t i = 0; i < std::min(column.size(), count); ++i) {
             set.device[i * set.channels.size() + ink] = column[i];
         }
@@ -141,7 +140,7 @@ std::int64_t utcOf(std::int64_t roomTime) {
 
 } // namespace
 
-std::vector<std::string> Targets::keys(const StripKeys& strip) {
+std::vector<std::string> Targets::keys(Strip strip) {
     std::vector<std::string> names = {"Job/FromEsko",
                                       "System/InstallFolder",
                                       "Footer/ControlstripFile",
@@ -149,37 +148,35 @@ std::vector<std::string> Targets::keys(const StripKeys& strip) {
                                       "Footer/Dynstrip/IT8",
                                       "Remote/UsedICCProfile",
                                       "Workflow/Verify/CharacterizationData",
-                                      strip.own("Workflow/Verify/MeasurementWorkflow"),
-                                      strip.own("Workflow/Verify/CharacterizationData"),
-                                      strip.own("Footer/ControlstripInputProfile"),
-                                      strip.measured("Status"),
-                                      strip.measured("Reference/Numpatches")};
-    for (const auto* group : {labNames, xyzNames}) {
+                                      stripKey(strip, "Workflow/Verify/MeasurementWorkflow"),
+                                      stripKey(strip, "Workflow/Verify/CharacterizationData"),
+                                      stripKey(strip, "Footer/ControlstripInputProfile"),
+                                      measurementKey(strip, "Status"),
+                                      referenceKey(strip, "Numpatches")};
+    for (const auto* group : {labArrays, xyzArrays}) {
         for (int i = 0; i < 3; ++i) {
-            names.push_back(strip.measured(std::string("Reference/") + group[i]));
+            names.push_back(referenceKey(strip, group[i]));
         }
     }
-    for (const char* name : cmykNames) {
-        names.push_back(strip.measured(std::string("Reference/") + name));
+    for (const char* name : cmykArrays) {
+        names.push_back(referenceKey(strip, name));
     }
     return names;
 }
 
-Target Targets::of(const store::TicketContent& job, int strip, std::int64_t time) {
-    const StripKeys keys(strip);
+Target Targets::of(const store::TicketContent& job, Strip strip, std::int64_t time) {
     const auto number = [&](const std::string& key) {
         return integerOf(job.find(key)).value_or(0);
     };
-    const int patches = number(keys.measured("Reference/Numpatches"));
-    constexpr int mostPatches = 1'000'000;
-    const bool hasStored = number(keys.own("Workflow/Verify/MeasurementWorkflow")) == 3 &&
-                           number(keys.measured("Status")) > 0 && patches > 0 &&
+    const int patches = number(referenceKey(strip, "Numpatches"));
+    const bool hasStored = number(stripKey(strip, "Workflow/Verify/MeasurementWorkflow")) == 3 &&
+                           number(measurementKey(strip, "Status")) > 0 && patches > 0 &&
                            patches <= mostPatches;
-    const std::string path = pathOf(job, keys, strip, hasStored);
+    const std::string path = pathOf(job, strip, hasStored);
     if (!path.empty()) {
         return ofFile(path, time);
     }
-    return hasStored ? targetInTicket(job, keys, patches) : Target{};
+    return hasStored ? targetInTicket(job, strip, patches) : Target{};
 }
 
 Target Targets::ofFile(const std::string& path, std::int64_t time) {

@@ -6,6 +6,7 @@
 
 #include "companions/tintgate-store/KeyValue.h"
 #include "companions/tintgate-store/TicketName.h"
+#include "jobkeys/StripKeys.h"
 
 namespace admin {
 
@@ -21,18 +22,20 @@ constexpr const char* displayKey = "Job/Display/Status";
 constexpr const char* showKey = "Remote/ShowInVerifier";
 constexpr const char* fileTypeKey = "Input/FileType";
 
-constexpr const char* roots[] = {"Remote/Measurement", "Remote/Measurement2"};
+std::string measured(int strip, const char* name) {
+    return jobkeys::measurementKey(jobkeys::strips[strip], name);
+}
 
 std::string statusKey(int strip) {
-    return roots[strip] + std::string("/Status");
+    return measured(strip, "Status");
 }
 
 std::string approvalKey(int strip) {
-    return roots[strip] + std::string("/Approval");
+    return measured(strip, "Approval");
 }
 
 /// The last key of a result, and that of a result under a PSD preset.
-constexpr const char* lastKeys[] = {"/Values/Decimal", "/Values/PSDDecimal"};
+constexpr const char* lastKeys[] = {"Values/Decimal", "Values/PSDDecimal"};
 
 using Elements = std::shared_ptr<const store::Elements>;
 
@@ -70,10 +73,10 @@ const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> reade
      [](Job& job, const Elements& value) { job.strips[0].approval = integerOf(value); }},
     {approvalKey(1),
      [](Job& job, const Elements& value) { job.strips[1].approval = integerOf(value); }},
-    {roots[0] + std::string(lastKeys[0]), noteLastKey<0>},
-    {roots[0] + std::string(lastKeys[1]), noteLastKey<0>},
-    {roots[1] + std::string(lastKeys[0]), noteLastKey<1>},
-    {roots[1] + std::string(lastKeys[1]), noteLastKey<1>},
+    {measured(0, lastKeys[0]), noteLastKey<0>},
+    {measured(0, lastKeys[1]), noteLastKey<0>},
+    {measured(1, lastKeys[0]), noteLastKey<1>},
+    {measured(1, lastKeys[1]), noteLastKey<1>},
 };
 
 Job jobOf(int id, const std::function<Elements(const std::string& key)>& valueOf) {

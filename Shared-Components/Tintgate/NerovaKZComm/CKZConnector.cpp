@@ -11,6 +11,7 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "base/WideBytes.h"
+#include "jobkeys/Tickets.h"
 #include "text/StringUtilsComGUI.h"
 #include "ticket/ParameterTables.h"
 
@@ -18,7 +19,6 @@ namespace {
 
 constexpr int serverPort = 50005;
 constexpr int oldestServer = 5;
-constexpr int jobTickets = 3;
 
 // UTF-8, but byte for byte where a path is none.
 std::string pathBytes(const wxString& path) {
@@ -147,7 +147,7 @@ int CKZConnector::Read(int type, int id, const char* key, PARAM_TYPE ptype, void
 int CKZConnector::GetJobStatus(int jobID, int* displayStatus, int* subType, int* fileType,
                                int* showInVerifier, int* verifyActive) {
     const auto read = [&](const char* key, int* out) {
-        Read(jobTickets, jobID, key, PARAM_INT, out, POSITION_WHOLE);
+        Read(jobkeys::jobType, jobID, key, PARAM_INT, out, POSITION_WHOLE);
     };
     read("Input/SubType", subType);
     read("Job/Display/Status", displayStatus);
@@ -212,7 +212,8 @@ int CKZConnector::GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure)
     }
     int number = 0;
     int size = sizeof number;
-    if (m_manager->GetTicketData(jobTickets, numberKind, 0, &size, &number) != 0 || number < 1) {
+    if (m_manager->GetTicketData(jobkeys::jobType, numberKind, 0, &size, &number) != 0 ||
+        number < 1) {
         return -1;
     }
     const ticket::Block<int> all = roomForIds(number);
@@ -222,7 +223,7 @@ int CKZConnector::GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure)
     }
     *ids = selected.release();
     size = number * static_cast<int>(sizeof(int));
-    if (m_manager->GetTicketData(jobTickets, idsKind, 0, &size, all.get()) != 0) {
+    if (m_manager->GetTicketData(jobkeys::jobType, idsKind, 0, &size, all.get()) != 0) {
         return -1; // *ids stays with the caller (C115).
     }
     // Jobs may have gone since they were counted.
@@ -275,7 +276,7 @@ int CKZConnector::GetReferenceProfilePath(int jobID, int strip, std::wstring* pa
     }
     const char* text = nullptr;
     const auto read = [&](const char* key) {
-        return GetJobTicketKeyValue(jobTickets, jobID, key, PARAM_STRING, &text, nullptr,
+        return GetJobTicketKeyValue(jobkeys::jobType, jobID, key, PARAM_STRING, &text, nullptr,
                                     POSITION_WHOLE);
     };
     int result = -1;
