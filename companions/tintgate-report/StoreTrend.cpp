@@ -14,6 +14,7 @@
 #include "companions/tintgate-report/TicketKeys.h"
 #include "companions/tintgate-report/Trend.h"
 #include "jobkeys/PatchArrays.h"
+#include "jobkeys/ResultPositions.h"
 #include "jobkeys/Tickets.h"
 #include "store/StoreEngine.h"
 
@@ -22,16 +23,6 @@ namespace reporting {
 using namespace jobkeys;
 
 namespace {
-
-/// The criterion whose value and approval stand at each of the server's positions for results; -1
-/// for none. Further positions have none.
-constexpr int criterionAt[] = {6,  7,  8,  9,  4,  0,  1,  5,  12, 10, 13, 3,  -1, 19,
-                               11, 20, 21, -1, -1, 22, -1, -1, -1, -1, -1, -1, 18};
-/// Where the server shows the largest difference of spot colours, or, of presets of the PSD kind
-/// that don't use it, the average, which has a place of its own, too.
-constexpr std::size_t spotPosition = 13;
-constexpr int psdSpotMaximum = 21;
-constexpr int psdApprovals = 10; ///< Of a preset of the PSD kind only these are kept, by entry.
 
 /// What a sample is made of, beside the strip's measurement.
 constexpr const char* sharedKeys[] = {"Input/Title",
@@ -139,12 +130,32 @@ struct Results {
     std::vector<int> approvals; ///< By the server's position, or by entry for the PSD kind.
 };
 
-std::optional<bool> approvalOf(const Results& results, std::size_t position, int entry, bool psd) {
-    const std::size_t at = psd ? static_cast<std::size_t>(entry) : position;
-    if (at >= results.approvals.size() || (psd && entry >= psdApprovals))
+std::optional<bool> approvalOf(const Results& results, int verdict, bool isPsd) {
+    const auto position = positionOfVerdict(verdict, isPsd);
+    if (!position || static_cast<std::size_t>(*position) >= results.approvals.size()) {
         return std::nullopt;
-    return results.approvals[at] != 0;
+    }
+    return results.approvals[static_cast<std::size_t>(*position)] != 0;
 }
+
+/// The measured value that belongs to a criterion. Nothing if the server does not show it.
+std::optional<double> measuredOf(const Results& results, const analysis::Criterion& known,
+                                 bool showsSpotMaximum) {
+    const auto position = positionOfVerdict(known.index, false);
+    if (!position || valueAt(*position, showsSpotMaximum) != known.value ||
+        static_cast<std::size_t>(*position) >= results.measured.size()) {
+        return std::nullopt;
+    }
+    return results.measured[static_cast<std::size_t>(*position)];
+}
+
+/// Whether the server's table pairs values and verdicts as the criteria do.
+constexpr bool agreesWithPositions(const analysis::Criterion& known) {
+    const auto position = positionOfVerdict(known.index, false);
+    return !position || valueAt(*position, true) == known.value;
+}
+static_assert(std::all_of(std::begin(analysis::criteria), std::end(analysis::criteria),
+                          agreesWithPositions));
 
 /// Fills in value and outcome as they were judged then. True where today's tolerance would say
 /// something else.
@@ -166,17 +177,15 @@ bool judge(report::Criterion& criterion, double value, std::optional<bool> appro
 
 bool addCriteria(report::Sample& sample, const Results& results, const Preset& preset) {
     bool changed = false;
+    const bool showsSpotMaximum =
+        !preset.psd() || preset.values->usedForPSDResult[psdSpotMaximum] == 1;
     for (const analysis::Criterion& known : analysis::criteria) {
-        const auto at = std::find(std::begin(criterionAt), std::end(criterionAt), known.index);
-        const auto position = static_cast<std::size_t>(at - std::begin(criterionAt));
-        const bool holdsAverage = position == spotPosition && preset.psd() &&
-                                  preset.values->usedForPSDResult[psdSpotMaximum] != 1;
-        if (known.index == analysis::noEntry || at == std::end(criterionAt) ||
-            position >= results.measured.size() || holdsAverage)
+        const auto measured = measuredOf(results, known, showsSpotMaximum);
+        if (!measured) {
             continue;
+        }
         report::Criterion criterion = criterionOf(known, preset);
-        changed |= judge(criterion, results.measured[position],
-                         approvalOf(results, position, known.index, preset.psd()));
+        changed |= judge(criterion, *measured, approvalOf(results, known.index, preset.psd()));
         if (criterion.value || criterion.used)
             sample.criteria.push_back(std::move(criterion));
     }
