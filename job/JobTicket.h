@@ -23,6 +23,15 @@ class JobTicket {
     /// The bytes of a text. Where there is none, *value is emptied.
     int read(const std::string& key, std::string* value) const;
 
+    /// A reader of texts for the lookups of jobkeys. *code becomes that of its latest read.
+    auto texts(int* code) const {
+        return [this, code](const std::string& key) {
+            std::string text;
+            *code = read(key, &text);
+            return text;
+        };
+    }
+
     /// A text as UTF-8; one that is not valid is empty. Where there is none, *value is emptied.
     int read(const std::string& key, wxString* value) const;
 

@@ -28,6 +28,8 @@
 #include "companions/diagnosis/ValueRules.h"
 #include "companions/diagnosis/Words.h"
 #include "job/KZVerifyJobProcessor.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
 #include "jobkeys/StripKeys.h"
 #include "platform/TemporaryFolder.h"
 
@@ -253,7 +255,7 @@ bool Examination::checkList() {
                : found == nullptr ? "is missing"
                                   : problemOf(*found, false);
     };
-    if (numberIn(asked("Input/FileType")) == 4096) {
+    if (numberIn(asked(jobkeys::fileTypeKey)) == jobkeys::unsuitableFileType) {
         add(jobKey("Input/FileType"), "is 4096, which keeps a job from being verified.", codes);
     }
     const std::string status = text("Job/Display/Status");
@@ -333,7 +335,7 @@ void Examination::measure() {
     }
     const wxString definition = m_processor->WriteTemporaryMeasurementDefinitionFile(strip, &m_job);
     if (definition.empty()) {
-        const bool dynamic = m_job.useDynstrip == 1 && m_strip == Strip::first;
+        const bool dynamic = jobkeys::isDynamic(m_strip, m_job.useDynstrip);
         add("control strip " + fileName(bytesOf(strip)),
             std::string("No definition for the measuring tool can be made from it: ") +
                 (dynamic ? "a dynamic strip needs NUMBER_OF_STRIPS and NUMBER_OF_COLS"

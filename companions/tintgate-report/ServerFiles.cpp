@@ -6,6 +6,8 @@
 
 #include "analysis/Presets.h"
 #include "colour/CgatsText.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/ServerPaths.h"
 #include "jobkeys/Tickets.h"
 
 namespace reporting {
@@ -49,18 +51,15 @@ const Preset& Server::preset(int id, const std::string& installFolder) {
 }
 
 std::string Server::instrument(const store::TicketContent& job, Strip strip) {
-    if (strip == Strip::first && integerOf(job.find("Footer/Dynstrip/UseDynstrip")) == 1)
+    if (isDynamic(strip, integerOf(job.find("Footer/Dynstrip/UseDynstrip")).value_or(0))) {
         return nameOf(integerOf(job.find("Footer/Dynstrip/DeviceID")).value_or(0));
-    constexpr std::size_t shortestName = 4;
-    std::string file = textOf(job.find(stripKey(strip, "Footer/ControlstripFile")));
-    if (file.size() < shortestName)
-        file = textOf(job.find(stripKey(strip, "Footer/Nesting/ControlstripFile")));
-    file.erase(0, file.rfind('/') + 1);
-    file.resize(std::min(file.rfind('.'), file.size()));
-    if (file.empty())
+    }
+    const std::string name =
+        fixedStripName(strip, [&](const std::string& key) { return textOf(job.find(key)); });
+    if (name.empty()) {
         return {};
-    const std::string path =
-        textOf(job.find("System/InstallFolder")) + "/ControlCharts/" + file + ".it8";
+    }
+    const std::string path = controlStripPath(textOf(job.find("System/InstallFolder")), name);
     const auto [at, fresh] = m_strips.try_emplace(path);
     if (fresh)
         if (const auto device = colour::cgatsKeyword(fileOf(m_store, path), "DEVICE"))

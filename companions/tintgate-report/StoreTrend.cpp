@@ -13,6 +13,7 @@
 #include "companions/tintgate-report/Targets.h"
 #include "companions/tintgate-report/TicketKeys.h"
 #include "companions/tintgate-report/Trend.h"
+#include "jobkeys/Lookups.h"
 #include "jobkeys/PatchArrays.h"
 #include "jobkeys/ResultPositions.h"
 #include "jobkeys/Tickets.h"
@@ -32,8 +33,8 @@ constexpr const char* sharedKeys[] = {"Input/Title",
                                       "Footer/Dynstrip/UseDynstrip",
                                       "Footer/Dynstrip/DeviceID"};
 constexpr const char* stripOnlyKeys[] = {"Workflow/Verify/ComparisonMethod",
-                                         "Workflow/Verify/DeltaEMode", "Footer/ControlstripFile",
-                                         "Footer/Nesting/ControlstripFile"};
+                                         "Workflow/Verify/DeltaEMode", stripFileKey,
+                                         nestedStripFileKey};
 constexpr const char* measuredKeys[] = {
     "Approval", "Date", "Time", "Values/Measured", "Values/Approval", "Values/PSDApproval"};
 

@@ -8,7 +8,9 @@
 #include "colour/ColourFile.h"
 #include "colour/Difference.h"
 #include "colour/Identity.h"
+#include "jobkeys/Lookups.h"
 #include "jobkeys/PatchArrays.h"
+#include "jobkeys/ServerPaths.h"
 
 namespace reporting {
 
@@ -22,25 +24,6 @@ std::string nameOf(const std::string& path) {
     return path.substr(path.rfind('/') + 1);
 }
 
-std::string inControlCharts(const std::string& install, const std::string& strip) {
-    std::string name = nameOf(strip);
-    name.resize(std::min(name.rfind('.'), name.size()));
-    return install + "/ControlCharts/" + name + ".it8";
-}
-
-std::string characterisation(const std::string& install, const std::string& value) {
-    if (value.empty() || value.find("(TEMP)/") != value.npos) {
-        return value;
-    }
-    std::string folder = install + "/IT8_CharacterizationData/";
-    for (const char* version : {"MKCheck10", "MKCheck11"}) {
-        if (value.find(version) != value.npos) {
-            return folder + "Fogra_" + version + "/" + value;
-        }
-    }
-    return folder + value;
-}
-
 /// Server path of a job's references; empty if the ticket names none.
 std::string pathOf(const store::TicketContent& job, Strip strip, bool hasStored) {
     const auto text = [&](const std::string& key) { return textOf(job.find(key)); };
@@ -48,23 +31,25 @@ std::string pathOf(const store::TicketContent& job, Strip strip, bool hasStored)
         return integerOf(job.find(key)).value_or(0);
     };
     const std::string install = text("System/InstallFolder");
-    const int workflow = number(stripKey(strip, "Workflow/Verify/MeasurementWorkflow"));
-    if (number("Job/FromEsko") == 1 && workflow == 4) {
-        constexpr const char* data = "Workflow/Verify/CharacterizationData";
-        return job.find(data) ? text(data)
-                              : inControlCharts(install, text("Footer/ControlstripFile"));
+    const bool dynamic = isDynamic(strip, number("Footer/Dynstrip/UseDynstrip"));
+    switch (referenceWay(number("Job/FromEsko") == 1, number(stripKey(strip, workflowKey)), dynamic,
+                         hasStored)) {
+    case ReferenceWay::Packaging:
+        return job.find(characterisationKey) ? text(characterisationKey)
+                                             : controlStripPath(install, text(stripFileKey));
+    case ReferenceWay::Profile:
+        return referenceProfile(strip, text);
+    case ReferenceWay::DynamicStrip:
+        return text(dynamicStripKey);
+    case ReferenceWay::Characterisation: {
+        const std::string value = text(stripKey(strip, characterisationKey));
+        return value.empty() ? "" : characterisationPath(install, value);
     }
-    if (workflow == 1 || (workflow == 3 && !hasStored)) {
-        const std::string own = text(stripKey(strip, "Footer/ControlstripInputProfile"));
-        return own.empty() ? text("Remote/UsedICCProfile") : own;
+    case ReferenceWay::Stored:
+    case ReferenceWay::None:
+        break;
     }
-    if (strip == Strip::first && number("Footer/Dynstrip/UseDynstrip") == 1) {
-        return text("Footer/Dynstrip/IT8");
-    }
-    return workflow == 2
-               ? characterisation(install,
-                                  text(stripKey(strip, "Workflow/Verify/CharacterizationData")))
-               : "";
+    return "";
 }
 
 report::InkColours aimsOf(const colour::DataSet& set) {
@@ -143,14 +128,14 @@ std::int64_t utcOf(std::int64_t roomTime) {
 std::vector<std::string> Targets::keys(Strip strip) {
     std::vector<std::string> names = {"Job/FromEsko",
                                       "System/InstallFolder",
-                                      "Footer/ControlstripFile",
+                                      stripFileKey,
                                       "Footer/Dynstrip/UseDynstrip",
-                                      "Footer/Dynstrip/IT8",
-                                      "Remote/UsedICCProfile",
-                                      "Workflow/Verify/CharacterizationData",
-                                      stripKey(strip, "Workflow/Verify/MeasurementWorkflow"),
-                                      stripKey(strip, "Workflow/Verify/CharacterizationData"),
-                                      stripKey(strip, "Footer/ControlstripInputProfile"),
+                                      dynamicStripKey,
+                                      usedProfileKey,
+                                      characterisationKey,
+                                      stripKey(strip, workflowKey),
+                                      stripKey(strip, characterisationKey),
+                                      stripKey(strip, stripProfileKey),
                                       measurementKey(strip, "Status"),
                                       referenceKey(strip, "Numpatches")};
     for (const auto* group : {labArrays, xyzArrays}) {
@@ -169,7 +154,7 @@ Target Targets::of(const store::TicketContent& job, Strip strip, std::int64_t ti
         return integerOf(job.find(key)).value_or(0);
     };
     const int patches = number(referenceKey(strip, "Numpatches"));
-    const bool hasStored = number(stripKey(strip, "Workflow/Verify/MeasurementWorkflow")) == 3 &&
+    const bool hasStored = number(stripKey(strip, workflowKey)) == 3 &&
                            number(measurementKey(strip, "Status")) > 0 && patches > 0 &&
                            patches <= mostPatches;
     const std::string path = pathOf(job, strip, hasStored);

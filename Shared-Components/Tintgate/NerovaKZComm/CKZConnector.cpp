@@ -11,6 +11,8 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "base/WideBytes.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
 #include "jobkeys/Tickets.h"
 #include "text/StringUtilsComGUI.h"
 #include "ticket/ParameterTables.h"
@@ -55,10 +57,10 @@ struct JobStatus {
 };
 
 bool isToBeVerified(const JobStatus& job, bool remeasure) {
-    constexpr int unsuitableFileType = 4096;
-    const bool suitable = job.fileType != unsuitableFileType;
-    const bool isWaiting = job.displayStatus == 208;
-    const bool isMeasured = job.displayStatus >= 209 && job.displayStatus <= 212;
+    const bool suitable = job.fileType != jobkeys::unsuitableFileType;
+    const bool isWaiting = job.displayStatus == jobkeys::waitingStatus;
+    const bool isMeasured =
+        job.displayStatus > jobkeys::waitingStatus && job.displayStatus <= jobkeys::failedStatus;
     return remeasure ? (isMeasured && suitable) || (isWaiting && job.verifyActive == 1)
                      : (isWaiting || job.showInVerifier == 1) && suitable;
 }
@@ -149,12 +151,12 @@ int CKZConnector::GetJobStatus(int jobID, int* displayStatus, int* subType, int*
     const auto read = [&](const char* key, int* out) {
         Read(jobkeys::jobType, jobID, key, PARAM_INT, out, POSITION_WHOLE);
     };
-    read("Input/SubType", subType);
-    read("Job/Display/Status", displayStatus);
-    read("Remote/ShowInVerifier", showInVerifier);
-    read("Input/FileType", fileType);
-    read("Workflow/Verify/Active", verifyActive);
-    *verifyActive = *verifyActive == 3 ? 1 : 0;
+    read(jobkeys::subTypeKey, subType);
+    read(jobkeys::displayStatusKey, displayStatus);
+    read(jobkeys::showInVerifierKey, showInVerifier);
+    read(jobkeys::fileTypeKey, fileType);
+    read(jobkeys::verifyActiveKey, verifyActive);
+    *verifyActive = *verifyActive == jobkeys::activeForTwoStrips ? 1 : 0;
     return 0;
 }
 
@@ -280,13 +282,13 @@ int CKZConnector::GetReferenceProfilePath(int jobID, int strip, std::wstring* pa
                                     POSITION_WHOLE);
     };
     int result = -1;
-    if (strip == 1) {
-        result = read("Footer/ControlstripInputProfile");
-    } else if (strip == 2) {
-        result = read("Footer/ControlstripInputProfile2");
+    for (const jobkeys::Strip known : jobkeys::strips) {
+        if (strip == numberOf(known)) {
+            result = read(stripKey(known, jobkeys::stripProfileKey).c_str());
+        }
     }
     if (result != 0 || text == nullptr || *text == '\0') {
-        result = read("Remote/UsedICCProfile");
+        result = read(jobkeys::usedProfileKey);
     }
     if (result == 0 && text != nullptr) {
         *path = StringUtilsComGUI::wstringFromstring(text);
