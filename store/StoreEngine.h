@@ -77,13 +77,13 @@ struct FileVersion {
 struct Scope {
     /// The ticket is emptied first; keys says nothing then.
     bool everything = false;
-    /// By name, whether what the key holds is needed. Keys that are not listed stay as they are.
-    std::map<std::string, bool, std::less<>> keys = {};
     /// The change may be made twice, as if it were made once: no appended elements, and none that
     /// are deleted by their position.
     bool repeatable = false;
     /// A ticket that is missing is made, in the same transaction.
     bool make = false;
+    /// By name, whether what the key holds is needed. Keys that are not listed stay as they are.
+    std::map<std::string, bool, std::less<>> keys = {};
 };
 
 /// An open store. All of it may throw StoreFailure, and std::bad_alloc. One thread at a time.
