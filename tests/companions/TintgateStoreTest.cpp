@@ -413,8 +413,11 @@ class StoreCopy : public TintgateStore {
         for (const std::string content : {"one", "", "three", "four"}) {
             std::istringstream from(content);
             engine->putFile("jobs/7.jdf", from);
+            from.seekg(0);
+            engine->putFile("jobs/8.jdf", from);
         }
         engine->pruneVersions("jobs/7.jdf", 2); // So that they do not start at 1.
+        engine->pruneVersions("jobs/8.jdf", 0);
     }
 
     /// All that a store holds.
@@ -443,12 +446,18 @@ class StoreCopy : public TintgateStore {
 TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
     const std::string before = allOf(m_address);
     EXPECT_THAT(answer({"copy", m_address, "room"}),
-                HasSubstr("3 tickets, 1001 files and 1 user\n"));
+                HasSubstr("3 tickets, 1002 files and 1 user\n"));
     EXPECT_TRUE(allOf("room") == before);
     answer({"copy", "room", back});
     EXPECT_TRUE(allOf(back) == before);
     for (const std::string& address : {m_address, std::string("room"), back}) {
         EXPECT_EQ(answer({"--store", address, "ticket", "create", "job"}), "job/91\n");
+        const auto engine = store::openStore(address);
+        for (const char* path : {"jobs/7.jdf", "jobs/8.jdf"}) {
+            std::istringstream from("five");
+            engine->putFile(path, from);
+            EXPECT_EQ(engine->versions(path).back().number, 4) << address << ' ' << path;
+        }
     }
     expectRefusal({"copy", m_address, "room"}, 2, "already");
     expectRefusal({"copy", m_folder.path("none"), m_folder.path("new")}, 4, "none");
