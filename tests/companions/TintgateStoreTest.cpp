@@ -395,6 +395,40 @@ TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
     }
 }
 
+TEST_F(TintgateStore, IsReadWhereItCannotBeWritten) {
+    makeTicket(3, 7, awkwardContent());
+    answer({"file", "put", m_folder.write("small", "old"), "chart"});
+    const std::string much = m_folder.write("much", std::string(300'000, 'x'));
+    const std::string exported = answer({"export"});
+    support::RunOptions options;
+    options.environment = {{"TINTGATE_STORE", m_address}};
+    const auto expectReadOnly = [&](const std::vector<std::string>& start, int refusal) {
+        const auto runThere = [&](std::vector<std::string> arguments) {
+            arguments.insert(arguments.begin(), TINTGATE_STORE_PROGRAM);
+            arguments.insert(arguments.begin(), start.begin(), start.end());
+            return support::run(arguments, options);
+        };
+        EXPECT_EQ(runThere({"file", "put", much, "chart"}).exitCode, refusal);
+        EXPECT_EQ(runThere({"key", "set", "job/7", "big", "string", std::string(120'000, 'x')})
+                      .exitCode,
+                  refusal);
+        EXPECT_TRUE(runThere({"export"}).output == exported);
+        EXPECT_EQ(runThere({"file", "get", "chart", "-"}).output, "old");
+        EXPECT_EQ(runThere({"info"}).exitCode, 0);
+    };
+    expectReadOnly({"prlimit", "--fsize=100000"}, 8);
+    EXPECT_EQ(open()->versions("chart").size(), 0u);
+
+    const std::string mount = "mount -o bind,ro \"$TINTGATE_STORE\" \"$TINTGATE_STORE\" && ";
+    const std::vector<std::string> mounted = {"unshare", "-m", "sh", "-c", mount + "\"$@\"", "sh"};
+    auto probe = mounted;
+    probe.emplace_back("true");
+    if (const auto tried = support::run(probe, options); tried.exitCode != 0) {
+        GTEST_SKIP() << "no mount of its own: " << tried.error;
+    }
+    expectReadOnly(mounted, 7);
+}
+
 /// The fixture's store is a folder, and there is a database for a copy of it.
 class StoreCopy : public TintgateStore {
   protected:
