@@ -1,7 +1,6 @@
 #include "analysis/Comparison.h"
 
 #include <algorithm>
-#include <cmath>
 #include <map>
 
 #include "ExitCodes.h"
@@ -111,14 +110,6 @@ int pair(const Comparison& c, Input& input) {
     }
     input.pairing = pairSets(selection, *input.file.set);
     return input.pairing.paired > 0 ? exitDone : exitNothingToPair;
-}
-
-/// A CMYK profile knows nothing of inks beside the four.
-bool isProcessOnly(const DataSet& set, std::uint32_t row) {
-    const std::size_t channels = set.channels.size();
-    const double* const device = &set.device[row * channels];
-    return std::all_of(device + 4, device + channels,
-                       [](double value) { return std::abs(value) <= deviceTolerance; });
 }
 
 bool has(const Comparison& c, const Input& input, std::uint32_t selectedRow) {

@@ -5,6 +5,7 @@
 
 #include "ExitCodes.h"
 #include "analysis/OutputFile.h"
+#include "analysis/PatchKinds.h"
 #include "analysis/Status.h"
 #include "colour/CgatsText.h"
 #include "colour/ColourFile.h"
@@ -34,6 +35,11 @@ int writeLab(const std::string& reference, const std::string& profile, const std
     }
     if (!file.set->hasCmyk()) {
         return exitNoDeviceValues;
+    }
+    for (std::size_t row = 0; row < file.set->patchCount; ++row) {
+        if (!isProcessOnly(*file.set, row)) {
+            return exitNoDeviceValues;
+        }
     }
     colour::DataSet chart = colour::chartOf(std::move(*file.set));
     chart.originator = "Tintgate";

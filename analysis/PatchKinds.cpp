@@ -100,6 +100,12 @@ KindSet kindsOf(const double* device, std::size_t channels,
 
 } // namespace
 
+bool isProcessOnly(const colour::DataSet& set, std::size_t row) {
+    const std::size_t channels = set.channels.size();
+    const double* const device = &set.device[row * channels];
+    return std::all_of(device + 4, device + channels, [](double value) { return near(value, 0); });
+}
+
 Selections selectionsOf(const Comparison& c) {
     Selections selections;
     if (!c.devices || !c.devices->file.set->hasCmyk()) {

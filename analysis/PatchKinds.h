@@ -16,6 +16,10 @@ namespace analysis {
 /// whole percents by 0.5.
 inline constexpr double deviceTolerance = 0.5;
 
+/// True if a patch has no ink beside C, M, Y and K. A CMYK profile has colours for no other patch.
+/// REQUIRES: set.hasCmyk().
+bool isProcessOnly(const colour::DataSet& set, std::size_t row);
+
 inline constexpr std::size_t patchKinds = static_cast<std::size_t>(Patches::Repeated) + 1;
 
 /// The patches of a comparison by kind, each list by rising index. Those of All and Repeated are

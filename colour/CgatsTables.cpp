@@ -370,7 +370,7 @@ Failure complete(Table& table, ScaleHint hint, const CgatsWants& wants, Notes& n
         return Failure::SpectraUnusable;
     if (!stated && set.spectra.empty())
         return set.device.empty() ? Failure::NoColourValues : Failure::None;
-    if (wants.calculated && stated && !set.spectra.empty() && spectraUsable(set.axis)) {
+    if (wants.calculated && !set.spectra.empty() && spectraUsable(set.axis)) {
         set.lab.clear();
         set.xyz.clear();
         set.calculated = true;

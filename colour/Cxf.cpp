@@ -32,6 +32,7 @@
 #include <stdexcept>
 #include <string>
 #include <unordered_map>
+#include <utility>
 #include <vector>
 
 #include "colour/CgatsLines.h"
@@ -111,7 +112,7 @@ const Value* valueOf(const Content& content, const Object& object, Value::Kind k
         if (value.kind != kind || (value.condition != unstated && value.condition != condition)) {
             continue;
         }
-        const bool usual = value.specification == nullptr || value.specification->usual;
+        const bool usual = value.specification == nullptr || value.specification->conditions.areUsual();
         const int rank = 1 + (value.condition == condition ? 2 : 0) + (usual ? 1 : 0);
         if (rank > bestRank) {
             best = &value;
@@ -294,7 +295,7 @@ class SetReader {
         return failure;
     }
 
-    /// False if colour values were read that are stated for another light than D50 or another
+    /// False if the colour values that count are stated for another light than D50 or another
     /// observer than 2 degrees.
     bool isUsual() const { return m_usual; }
 
@@ -500,7 +501,7 @@ class SetReader {
     bool addLab(const Value& value) {
         const auto& [L, a, b] = value.numbers;
         m_table->set.lab.push_back({L, a, b});
-        see(value);
+        see(value, m_labLight);
         return value.sound;
     }
 
@@ -508,14 +509,14 @@ class SetReader {
         const auto& [L, chroma, hue] = value.numbers;
         const double angle = hue * std::numbers::pi / 180;
         m_table->set.lab.push_back({L, chroma * std::cos(angle), chroma * std::sin(angle)});
-        see(value);
+        see(value, m_labLight);
         return value.sound;
     }
 
     bool addXyz(const Value& value) {
         const auto& [X, Y, Z] = value.numbers;
         m_table->set.xyz.push_back({X, Y, Z});
-        see(value);
+        see(value, m_xyzLight);
         return value.sound;
     }
 
@@ -585,25 +586,62 @@ class SetReader {
         return {base, 0, length};
     }
 
-    /// Keeps what the colorimetric values are stated for. Statements that differ cancel out.
-    void see(const Value& value) {
-        if (m_seen && value.specification == m_lastSpecification) {
+    /// What the values of one quantity are stated for.
+    struct Light {
+        bool seen = false;
+        Conditions stated; ///< If any value is not for D50 and 2 degrees, the first such statement.
+        const Specification* last = nullptr;
+    };
+
+    /// Usual statements that differ (one value states D50, another one nothing) cancel out.
+    void see(const Value& value, Light& light) {
+        if (light.seen && value.specification == light.last) {
             return;
         }
-        m_lastSpecification = value.specification;
+        light.last = m_lastSpecification = value.specification;
         const Conditions stated =
             value.specification != nullptr ? value.specification->conditions : Conditions{};
-        if (!m_seen) {
-            m_stated = stated;
-            m_seen = true;
+        if (!std::exchange(light.seen, true) ||
+            (light.stated.areUsual() && !stated.areUsual())) {
+            light.stated = stated;
+        } else if (light.stated.areUsual()) {
+            cancel(light.stated, stated);
         }
-        m_usual = m_usual && (value.specification == nullptr || value.specification->usual);
-        if (m_stated.illuminant != stated.illuminant) {
-            m_stated.illuminant.clear();
+    }
+
+    static void cancel(Conditions& kept, const Conditions& other) {
+        if (kept.illuminant != other.illuminant) {
+            kept.illuminant.clear();
         }
-        if (m_stated.observer != stated.observer) {
-            m_stated.observer.clear();
+        if (kept.observer != other.observer) {
+            kept.observer.clear();
         }
+    }
+
+    /// The conditions of the colour values that count. L*a*b* and XYZ of a file can be stated for
+    /// different ones: those for D50 and 2 degrees serve alone then.
+    Conditions settleLight() {
+        DataSet& set = m_table->set;
+        if (!set.lab.empty() && !set.xyz.empty() &&
+            m_labLight.stated.areUsual() != m_xyzLight.stated.areUsual()) {
+            m_notes.add("L*a*b* and XYZ are for different conditions: those for D50 and 2 degrees "
+                        "are used.");
+            if (m_labLight.stated.areUsual()) {
+                set.xyz.clear();
+            } else {
+                set.lab.clear();
+            }
+        }
+        if (set.lab.empty() || set.xyz.empty()) {
+            return !set.lab.empty()   ? m_labLight.stated
+                   : !set.xyz.empty() ? m_xyzLight.stated
+                                      : Conditions{};
+        }
+        Conditions both = m_labLight.stated;
+        if (both.areUsual()) {
+            cancel(both, m_xyzLight.stated);
+        }
+        return both;
     }
 
     /// A quantity counts if every measured patch has it.
@@ -629,7 +667,8 @@ class SetReader {
             dropSpectra();
             m_table->unevenSpectra = true;
         }
-        set.conditions = m_stated;
+        set.conditions = settleLight();
+        m_usual = set.conditions.areUsual();
         set.conditions.measurement = conditionName(m_condition);
         const bool none = set.lab.empty() && set.xyz.empty() && set.spectra.empty();
         return none && (partial || measured > 0) && !m_table->unevenSpectra
@@ -714,9 +753,9 @@ class SetReader {
     cgats::NumberReader m_numbers{cgats::blanksSeparate};
     std::size_t m_spectrumCount = 0;
     bool m_axesDiffer = false;
-    bool m_seen = false;
-    bool m_usual = true; ///< All colour values are for D50 and 2 degrees.
-    Conditions m_stated;
+    Light m_labLight;
+    Light m_xyzLight;
+    bool m_usual = true;
     const Specification* m_lastSpecification = nullptr;
     const Specification* m_spectralSpecification = nullptr;
 };

@@ -82,13 +82,13 @@ class Reader {
         Specification specification;
         const pugi::xml_node tristimulus = m_document.child(node, "TristimulusSpec");
         specification.conditions.illuminant = text(tristimulus, "Illuminant");
+        if (m_document.child(tristimulus, "CustomIlluminant")) {
+            specification.conditions.illuminant = "custom";
+        }
         const std::string observer = text(tristimulus, "Observer");
         specification.conditions.observer = observer == "2_Degree"    ? "2"
                                             : observer == "10_Degree" ? "10"
                                                                       : "";
-        const Conditions& stated = specification.conditions;
-        specification.usual =
-            (stated.illuminant.empty() || stated.illuminant == "D50") && stated.observer != "10";
         const pugi::xml_node measurement = m_document.child(node, "MeasurementSpec");
         const pugi::xml_node range = m_document.child(measurement, "WavelengthRange");
         specification.firstWavelength = wholeNumber(range.attribute("StartWL").value());

@@ -19,7 +19,6 @@ inline constexpr std::int8_t unstated = -1;
 /// A ColorSpecification.
 struct Specification {
     Conditions conditions; ///< Illuminant and observer alone.
-    bool usual = true;     ///< They are D50 and 2 degrees, as far as they are stated.
     std::int8_t condition = unstated;
     std::optional<int> firstWavelength;
     std::optional<int> increment;

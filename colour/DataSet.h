@@ -75,8 +75,8 @@ struct DataSet {
     std::string instrumentation;
     std::string printing; ///< The printer, otherwise the printing conditions.
     Conditions conditions;   ///< As stated.
-    bool calculated = false; ///< lab and xyz are from the spectra, since those that the file states
-                             ///< are for another illuminant than D50 or observer than 2 degrees.
+    bool calculated = false; ///< lab and xyz are from the spectra, since the file states another
+                             ///< illuminant than D50 or observer than 2 degrees.
 
     std::vector<std::string>
         notes; ///< What the reader had to assume or mend, for a person to read.

@@ -242,6 +242,11 @@ TEST_F(Library, WritesTheLabThatAProfileGives) {
     std::filesystem::create_symlink(reference, linkToReference);
     const std::string preset = scratch.write("preset.xml", "<?xml version=\"1.0\"?>\n<preset/>\n");
     const std::string cut = scratch.write("cut.icc", support::contentsOf(profile).substr(0, 999));
+    const std::string sevenInks = "7CLR_1 7CLR_2 7CLR_3 7CLR_4 7CLR_5 7CLR_6 7CLR_7";
+    const std::string further =
+        chart("SAMPLE_ID " + sevenInks, "1 0 0 0 0 0 0 0\n2 0 0 0 0 0 0 0.6\n");
+    const std::string unusedInks =
+        chart("SAMPLE_ID " + sevenInks, "1 0 0 0 0 0.5 0 0\n2 0 0 0 9 0 0 0.4\n");
     const auto write = [](const std::string& chart, const std::string& icc,
                           const std::string& output) {
         return writeLabFromReferencesAndICCProfile(stringToWstring(chart), stringToWstring(icc),
@@ -253,6 +258,8 @@ TEST_F(Library, WritesTheLabThatAProfileGives) {
     } cases[] = {
         {scratch.path("none"), profile, lab, exitInputMissing},
         {colours, profile, lab, exitNoDeviceValues},
+        {further, profile, lab, exitNoDeviceValues},
+        {unusedInks, profile, scratch.path("four inks"), 0},
         {profile, profile, lab, exitReferenceNotText},
         {preset, profile, lab, exitReferenceNotText},
         {reference, scratch.path("none"), lab, exitInputMissing},

@@ -482,6 +482,11 @@ TEST(CgatsText, CalculatesColoursThatAreStatedForOtherLight) {
             EXPECT_NEAR(again.lab[0].L, set.lab[0].L, 1e-9);
             EXPECT_EQ(again.conditions.areUsual(), c.calculated || set.conditions.areUsual());
         }
+    // Without other values, too: a reader of the set must not take the colours for those of D65.
+    const DataSet alone =
+        readWell(table("SAMPLE_ID " + spectrum, "1" + halves + "\n", "CGATS.17\nILLUMINANT D65\n"));
+    EXPECT_TRUE(alone.calculated);
+    EXPECT_NEAR(alone.lab[0].L, 76.0693, 1e-4);
 }
 
 TEST(CgatsText, NamesOneCauseForEachFailure) {

@@ -1,5 +1,6 @@
 #include "colour/Cxf.h"
 
+#include <cmath>
 #include <string>
 #include <vector>
 
@@ -19,15 +20,18 @@ namespace {
 
 const std::string core = "http://colorexchangeformat.com/CxF3-core";
 
-/// Objects in a file with the specifications "s" (D50, 2 degrees, 380 nm by 10, M1), "m0" and
-/// "d65".
+/// Objects in a file with the specifications "s" (D50, 2 degrees, 380 nm by 10, M1), "m0", "d65",
+/// "ten" (10 degrees) and "lamp" (an illuminant of its own).
 std::string file(const std::string& objects,
                  const std::string& start = "<CxF xmlns='" + core + "'>",
                  const std::string& end = "</CxF>") {
-    const auto specification = [](const char* id, const char* light, const char* condition) {
-        return std::string("<ColorSpecification Id='") + id + "'><TristimulusSpec><Illuminant>" +
-               light +
-               "</Illuminant><Observer>2_Degree</Observer></TristimulusSpec><MeasurementSpec>"
+    const auto specification = [](const char* id, const char* light, const char* condition,
+                                  const char* observer = "2_Degree") {
+        return std::string("<ColorSpecification Id='") + id + "'><TristimulusSpec>" +
+               (*light != '\0' ? "<Illuminant>" + std::string(light) + "</Illuminant>"
+                               : "<CustomIlluminant StartWL='380'>1 1 1</CustomIlluminant>") +
+               "<Observer>" + observer +
+               "</Observer></TristimulusSpec><MeasurementSpec>"
                "<MeasurementType>Spectrum_Reflectance</MeasurementType>"
                "<WavelengthRange StartWL='380' Increment='10'/><Device><DeviceIllumination>" +
                condition + "</DeviceIllumination></Device></MeasurementSpec></ColorSpecification>";
@@ -37,6 +41,8 @@ std::string file(const std::string& objects,
            specification("s", "D50", "M1_Daylight") +
            specification("m0", "D50", "M0_Incandescent") +
            specification("d65", "D65", "M1_Daylight") +
+           specification("ten", "D50", "M1_Daylight", "10_Degree") +
+           specification("lamp", "", "M1_Daylight") +
            "</ColorSpecificationCollection></Resources>" + end;
 }
 
@@ -251,7 +257,6 @@ TEST(Cxf, ReadsFilesAsTheyAreMet) {
         std::string text;
         std::vector<double> device;
         const char* note = "";
-        bool calculated = false;
     } cases[] = {
         {"plain", file(good), {10, 0, 100, 0}},
         {"another prefix", prefixed, {10, 0, 100, 0}},
@@ -298,12 +303,6 @@ TEST(Cxf, ReadsFilesAsTheyAreMet) {
                      "</ColorValues>" +
                      cmyk("10"))),
          {10, 0, 100, 0}},
-        {"values for D65 beside spectra",
-         file(object(lab("99", "d65") + spectrum(bands, "ColorSpecification='d65' StartWL='380'") +
-                     cmyk("10"))),
-         {10, 0, 100, 0},
-         "",
-         true},
         {"some objects without L*a*b*",
          file(object(lab("50") + spectrum(bands, "ColorSpecification='s'") + cmyk("10")) +
               object(spectrum(bands, "ColorSpecification='s'") + cmyk("20"))),
@@ -315,21 +314,65 @@ TEST(Cxf, ReadsFilesAsTheyAreMet) {
         EXPECT_TRUE(looksLikeCxf(c.text));
         const DataSet set = readWell(c.text);
         EXPECT_EQ(set.device, c.device);
-        EXPECT_EQ(set.calculated, c.calculated);
+        EXPECT_FALSE(set.calculated);
         std::string notes;
         for (const std::string& note : set.notes) {
             notes += note;
         }
         EXPECT_THAT(notes, HasSubstr(c.note));
         EXPECT_EQ(set.notes.empty(), *c.note == '\0') << notes;
-        if (set.hasColour() && notes.empty() && !c.calculated) {
+        if (set.hasColour() && notes.empty()) {
             EXPECT_NEAR(set.lab[0].L, 50, 1e-9);
             EXPECT_NEAR(set.lab[0].a, 1, 1e-4);
             EXPECT_NEAR(set.lab[0].b, -2.5, 1e-4);
         }
     }
-    // A grey of half the light: L* 76.07.
-    EXPECT_NEAR(readWell(cases[16].text).lab[0].L, 76.069, 0.001);
+}
+
+// The spectra are a flat grey of 50 %, whatever the file states beside them.
+TEST(Cxf, CalculatesColoursThatAreStatedForOtherLight) {
+    const double grey = 116 * std::cbrt(0.5) - 16;
+    const std::string bands = spectrum(repeated("0.5 ", 36), "ColorSpecification='s'");
+    const std::string coarse = spectrum("0.5 0.5", "ColorSpecification='s'");
+    const std::string xyz = "<ColorValues><ColorCIEXYZ ColorSpecification='s'><X>96.422</X>"
+                            "<Y>100</Y><Z>82.521</Z></ColorCIEXYZ></ColorValues>";
+    const struct {
+        const char* what;
+        std::string objects;
+        double L;
+        bool calculated;
+        const char* illuminant;
+        const char* observer;
+    } cases[] = {
+        {"D65", object(lab("70", "d65") + bands), grey, true, "D65", "2"},
+        {"10 degrees", object(lab("70", "ten") + bands), grey, true, "D50", "10"},
+        {"an illuminant of its own", object(lab("70", "lamp") + bands), grey, true, "custom", "2"},
+        {"the usual ones", object(lab("70", "s") + bands), 70, false, "D50", "2"},
+        {"nothing stated", object(lab("70", "none") + bands), 70, false, "", ""},
+        {"the usual ones beside others", object(lab("9", "d65") + lab("70", "s") + bands), 70,
+         false, "D50", "2"},
+        {"spectra alone", object(bands), grey, false, "", ""},
+        {"values that do not count", object(lab("70", "ten") + bands) + object(bands, "Id='2'"),
+         grey, false, "", ""},
+        {"D65 without spectra", object(lab("70", "d65")), 70, false, "D65", "2"},
+        {"10 degrees without spectra", object(lab("70", "ten")), 70, false, "D50", "10"},
+        {"spectra that are too coarse", object(lab("70", "ten") + coarse), 70, false, "D50", "10"},
+        {"an object of other conditions",
+         object(lab("70", "s")) + object(lab("71", "ten"), "Id='2'"), 70, false, "D50", "10"},
+        {"the same with the usual ones last",
+         object(lab("70", "ten")) + object(lab("71", "none"), "Id='2'"), 70, false, "D50", "10"},
+        {"L*a*b* for other light than XYZ", object(lab("70", "d65") + xyz), 100, false, "D50", "2"},
+    };
+    for (const auto& c : cases) {
+        for (const bool wantsSpectra : {false, true}) {
+            SCOPED_TRACE(c.what);
+            const DataSet set = readWell(file(c.objects), {.spectra = wantsSpectra});
+            EXPECT_NEAR(set.lab[0].L, c.L, 0.001);
+            EXPECT_EQ(set.calculated, c.calculated);
+            EXPECT_EQ(set.conditions.illuminant, c.illuminant);
+            EXPECT_EQ(set.conditions.observer, c.observer);
+        }
+    }
 }
 
 TEST(Cxf, JoinsTargetsAndMeasurements) {
