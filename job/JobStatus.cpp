@@ -2,18 +2,19 @@
 #include "cli/CLogger.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/StripKeys.h"
+
+using namespace jobkeys;
 
 namespace {
-
-constexpr int activeForTwoStrips = 3; ///< Of "Workflow/Verify/Active".
 
 /// A strip's result, and so its number; an approval of 0 is one, too (C91). It is logged (C92).
 bool hasResult(const JobTicket& ticket, Strip strip) {
     int approval = -1;
     const int code = ticket.read(measurementKey(strip, "Approval"), -1, &approval);
-    CLogger::GetLogger()->Log("Read Approvals%d, err=%d, iTmp==%d", strip == Strip::first ? 1 : 2,
-                              code, approval);
+    CLogger::GetLogger()->Log("Read Approvals%d, err=%d, iTmp==%d", numberOf(strip), code,
+                              approval);
     if (code != 0 || approval < 0) {
         return false;
     }
@@ -29,7 +30,7 @@ bool hasResult(const JobTicket& ticket, Strip strip) {
 int KZVerifyJobProcessor::SetJobStatus(int jobID, bool approved) {
     const JobTicket ticket(m_connector, jobID);
     int active = 0;
-    int result = ticket.read("Workflow/Verify/Active", 0, &active);
+    int result = ticket.read(verifyActiveKey, 0, &active);
     const bool hasTwoStrips = result == 0 && active == activeForTwoStrips;
     CLogger::GetLogger()->Log("Job With Two Strips = %d", hasTwoStrips ? 1 : 0);
     if (hasTwoStrips) {
@@ -38,11 +39,11 @@ int KZVerifyJobProcessor::SetJobStatus(int jobID, bool approved) {
             return result;
         }
     }
-    ticket.write("Remote/ShowInVerifier", 0);
-    const int status = approved ? 211 : 212;
+    ticket.write(showInVerifierKey, 0);
+    const int status = approved ? verifiedStatus : failedStatus;
     ticket.write("Process/InfoMessage", approved ? "Verified" : "Verification Failed");
     CLogger::GetLogger()->Log("Set Job Status = %d", status);
-    ticket.write("Job/Display/Status", status);
+    ticket.write(displayStatusKey, status);
     ticket.write("Job/Identification/Status", status);
     return result;
 }

@@ -6,6 +6,7 @@
 #include <wx/string.h>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "jobkeys/Tickets.h"
 
 /// A view on the connector's reads and writes of one ticket, at the key as a whole.
 ///
@@ -13,10 +14,7 @@
 /// nothing was found or done. It owns nothing and must not outlive the connector.
 class JobTicket {
   public:
-    static constexpr int jobType = 3;     ///< The id is that of the job.
-    static constexpr int presetType = 27; ///< The id is that of the tolerance preset.
-
-    JobTicket(CKZConnector* connector, int id, int type = jobType)
+    JobTicket(CKZConnector* connector, int id, int type = jobkeys::jobType)
         : m_connector(connector), m_type(type), m_id(id) {}
 
     /// Where there is none, *value becomes the fallback.
@@ -24,6 +22,15 @@ class JobTicket {
 
     /// The bytes of a text. Where there is none, *value is emptied.
     int read(const std::string& key, std::string* value) const;
+
+    /// A reader of texts for the lookups of jobkeys. *code becomes that of its latest read.
+    auto texts(int* code) const {
+        return [this, code](const std::string& key) {
+            std::string text;
+            *code = read(key, &text);
+            return text;
+        };
+    }
 
     /// A text as UTF-8; one that is not valid is empty. Where there is none, *value is emptied.
     int read(const std::string& key, wxString* value) const;

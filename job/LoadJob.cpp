@@ -15,10 +15,15 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/StripKeys.h"
+#include "jobkeys/Tickets.h"
 #include "measure/ControlStripText.h"
 #include "measure/StripLookups.h"
 #include "ticket/ParameterTables.h"
+
+using namespace jobkeys;
 
 namespace {
 
@@ -32,7 +37,7 @@ bool isOneOf(const Values& values, int number) {
 
 void makeJobFolder(JobLoad& load, const wxString& workingDir) {
     KZJobDataStruct& job = *load.job;
-    job.tempDir = workingDir + wxString::Format("/JobID_%i", job.jobID);
+    job.tempDir = workingDir + "/" + jobFolderName(job.jobID);
     load.ticket.read("Job/FromEsko", 0, &load.fromEsko);
     std::error_code ignored;
     std::filesystem::create_directories(measure::pathBytes(job.tempDir), ignored);
@@ -60,8 +65,7 @@ void readMeasurementKeys(JobLoad& load, int code) {
     constexpr int devicesOfModeZero[] = {5, 11, 13, 15, 25};
     KZJobDataStruct& job = *load.job;
     if (code == 0) {
-        load.ticket.read(stripKey(load.strip, "Workflow/Verify/MeasurementWorkflow"), 0,
-                         &job.measurementWorkflow);
+        load.ticket.read(stripKey(load.strip, workflowKey), 0, &job.measurementWorkflow);
     }
     load.ticket.read(measurementKey(load.strip, "Illumination/Mode"), 1, &job.illuminationMode);
     if (isOneOf(devicesOfModeZero, job.deviceID)) {
@@ -70,7 +74,7 @@ void readMeasurementKeys(JobLoad& load, int code) {
     load.ticket.read("CMM/PaperName", &job.paperName);
     load.ticket.read("Workflow/Name", &job.workflowName);
     load.ticket.read(measurementKey(load.strip, "Status"), 0, &job.measurementStatus);
-    load.ticket.read("Input/SubType", 0, &load.subType);
+    load.ticket.read(subTypeKey, 0, &load.subType);
     if (job.measurementWorkflow == 3 && job.measurementStatus > 0) {
         int patches = 0;
         load.ticket.read(measurementKey(load.strip, "Reference/Numpatches"), 0, &patches);
@@ -86,12 +90,6 @@ int readComparison(JobLoad& load) {
     return code != 0 ? code
                      : load.ticket.read(stripKey(load.strip, "Workflow/Verify/ComparisonMethod"), 0,
                                         &job.presetID);
-}
-
-/// The digits fill up to four.
-wxString presetFileName(int id) {
-    const char* zeros = id <= 9 ? "000" : id <= 99 ? "00" : id <= 999 ? "0" : "";
-    return wxString::Format("CVP_%s%i.xml", zeros, id);
 }
 
 /// Values of the preset's ticket. The first that is missing ends the row, without a consequence
@@ -119,7 +117,7 @@ void readPresetKeys(const JobTicket& ticket, tolerancePresetParameterRecord& tol
 int loadTolerance(JobLoad& load) {
     KZJobDataStruct& job = *load.job;
     tolerancePresetParameterRecord& tolerance = job.tolerance;
-    const JobTicket ticket(load.processor->m_connector, job.presetID, JobTicket::presetType);
+    const JobTicket ticket(load.processor->m_connector, job.presetID, presetType);
     tolerance.presetID = job.presetID;
     ticket.read("Name", &tolerance.name);
     if (tolerance.name.empty()) {
@@ -127,8 +125,8 @@ int loadTolerance(JobLoad& load) {
     }
     job.presetFile = presetFileName(job.presetID);
     job.presetLocalFile = job.tempDir + "/" + job.presetFile;
-    fetchFile(load, load.installFolder + "/tickets/" + job.presetFile, fileWait,
-              &tolerance.filePath);
+    fetchFile(load, wxString::FromUTF8(presetPath(load.installFolder.utf8_string(), job.presetID)),
+              fileWait, &tolerance.filePath);
     readPresetKeys(ticket, tolerance);
     // The ticket's "FograPSDPreset" does not count, and the arrays of the plain kind are read in
     // any case (C38): only the preset's file can make it one of the PSD kind.
@@ -153,7 +151,7 @@ void loadNesting(JobLoad& load) {
     int code = load.ticket.read("Footer/Nesting/PSDAssessment", &job.psdAssessment);
     if (mode == 1 && code == 0) {
         wxString name;
-        code = load.ticket.read(stripKey(load.strip, "Footer/Nesting/ControlstripFile"), &name);
+        code = load.ticket.read(stripKey(load.strip, nestedStripFileKey), &name);
         job.nestedStrip = code == 0 && fetchControlStrip(load, name, &job.controlStripFile) ? 1 : 0;
     }
     if (job.nestedStrip == 1) {
@@ -180,13 +178,12 @@ int typeFor(int measurements) {
 }
 
 void decideJobType(JobLoad& load) {
-    constexpr int verificationTypes[] = {80, 81, 86};
     constexpr int outputType = 96;
     KZJobDataStruct& job = *load.job;
     const bool isInline = job.deviceID == 0 || (job.deviceID >= 40 && job.deviceID <= 47);
 
     job.inlineVerifyJob = 0;
-    if (isOneOf(verificationTypes, load.subType) && job.jobType != 3) {
+    if (isVerification(load.subType) && job.jobType != 3) {
         job.jobType = 1;
     } else if (load.subType != outputType) {
         job.jobType = typeFor(job.measurementStatus);
@@ -267,20 +264,17 @@ int KZVerifyJobProcessor::GetJobJDFFileName(KZJobDataStruct* job) {
     const JobTicket ticket(m_connector, job->jobID);
     wxString name;
     job->jdfServerFile.clear();
-    int code = ticket.read("Output/Jdf/FileName", &name);
+    int code = ticket.read(jdfNameKey, &name);
     if (code != 0) {
         return code;
     }
     if (job->jobType == 0 || job->jobType == 2 || job->jobType == 3) {
-        std::string folder; // One that is no UTF-8 is still not missing: nothing takes its place.
-        code = ticket.read("System/Folders/Temp", &folder);
-        if (folder.empty()) {
-            code = ticket.read("Workflow/RemoteOutFolder", &folder);
-        }
+        // In bytes: a folder that is not valid UTF-8 is not missing, so nothing takes its place.
+        const std::string folder = jdfFolder(ticket.texts(&code));
         if (!folder.empty()) {
             job->jdfServerFile = wxString::FromUTF8(folder) + "/" + name;
         }
         return code;
     }
-    return ticket.read("Remote/JDFName", &job->jdfServerFile);
+    return ticket.read(remoteJdfKey, &job->jdfServerFile);
 }

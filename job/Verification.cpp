@@ -12,7 +12,8 @@
 #include "base/TextFile.h"
 #include "job/JobFiles.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/StripKeys.h"
+#include "jobkeys/Tickets.h"
 #include "measure/ControlStripText.h"
 #include "measure/Helper.h"
 #include "ticket/ParameterTables.h"
@@ -20,8 +21,6 @@
 namespace {
 
 using std::chrono::steady_clock;
-
-constexpr int applicationID = 0x5071103;
 
 /// Bytes that were widened one by one become text again.
 wxString textOf(const std::wstring& text) {
@@ -94,13 +93,14 @@ int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std:
         Helper::LaunchNerovaVerify(result, false, wxString(), true);
         return result;
     }
-    const std::optional<int> stripNumber = stripSelectorOf(strip);
+    const std::optional<int> stripNumber = jobkeys::stripSelectorOf(strip);
     if (host.empty() || user.empty() || !stripNumber) {
         return exitWrongArguments;
     }
 
     const auto start = steady_clock::now();
-    m_connector = ConnectToKZWithLoginCredentials(host, user, password, applicationID, true);
+    m_connector = ConnectToKZWithLoginCredentials(host, user, password,
+                                                  jobkeys::verifierApplication, true);
     const auto pause = pauseAfter(steady_clock::now() - start);
     const std::string server = wstringToString(host);
     if (m_connector == nullptr) {

@@ -6,7 +6,6 @@
 #include <cstdint>
 #include <cstring>
 #include <functional>
-#include <iterator>
 #include <memory>
 #include <new>
 #include <span>
@@ -19,10 +18,14 @@
 #include "jdf/JdfHandler.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/PatchArrays.h"
-#include "job/StripKeys.h"
+#include "jobkeys/PatchArrays.h"
+#include "jobkeys/ResultPositions.h"
+#include "jobkeys/StripKeys.h"
+#include "jobkeys/Tickets.h"
 #include "text/CharSets.h"
 #include "text/MathLib.h"
+
+using namespace jobkeys;
 
 namespace {
 
@@ -31,52 +34,6 @@ constexpr int workflowWithJdf = 3; ///< Of KZJobDataStruct::measurementWorkflow.
 constexpr int paperWhite = 4;    ///< Of analyseResultsRecord::approvals.
 constexpr int averageDeltaE = 5; ///< Of analyseResultsRecord::values.
 constexpr int maximumDeltaE = 6;
-
-/// What the server shows at one position (C87): an entry of analyseResultsRecord::values, and the
-/// entry of approvals and decimals that goes with it.
-struct ResultPosition {
-    int value;
-    int verdict;
-};
-
-constexpr int noValue = -1; ///< Stands as -1.0.
-constexpr int spotAverage = 26;
-constexpr int spotMaximum = 27;    ///< A PSD preset that does not judge it shows spotAverage.
-constexpr int psdSpotMaximum = 21; ///< Of tolerancePresetParameterRecord::usedForPSDResult.
-
-// clang-format off
-constexpr ResultPosition positions[] = {
-    /*  0 */ {0, 6},
-    /*  1 */ {1, 7},
-    /*  2 */ {2, 8},
-    /*  3 */ {3, 9},
-    /*  4 */ {4, paperWhite},
-    /*  5 */ {averageDeltaE, 0},
-    /*  6 */ {maximumDeltaE, 1},
-    /*  7 */ {7, 5},
-    /*  8 */ {14, 12},
-    /*  9 */ {12, 10},
-    /* 10 */ {19, 13},
-    /* 11 */ {20, 3},
-    /* 12 */ {noValue, 2},
-    /* 13 */ {spotMaximum, 19},
-    /* 14 */ {13, 11},
-    /* 15 */ {28, 20},
-    /* 16 */ {29, 21},
-    /* 17 */ {32, 24},
-    /* 18 */ {33, 25},
-    /* 19 */ {30, 22},
-    /* 20 */ {31, 23},
-    /* 21 */ {36, 28},
-    /* 22 */ {34, 26},
-    /* 23 */ {37, 27},
-    /* 24 */ {38, 30},
-    /* 25 */ {39, 31},
-    /* 26 */ {spotAverage, 18},
-};
-// clang-format on
-constexpr int positionCount = std::size(positions);
-constexpr int psdPositionCount = 10; ///< Verdicts of a PSD preset stand in their own order.
 
 /// A job's ticket, below the root of one of its strips.
 class StripTicket {
@@ -244,14 +201,8 @@ void writeMeasured(const StripTicket& ticket, const tolerancePresetParameterReco
         tolerance.fograPSDPreset == 0 || tolerance.usedForPSDResult[psdSpotMaximum] == 1;
     double measured[positionCount];
     for (int i = 0; i < positionCount; ++i) {
-        const int value = positions[i].value;
-        if (value == noValue) {
-            measured[i] = -1.0;
-        } else if (value == spotMaximum && !showsSpotMaximum) {
-            measured[i] = results[spotAverage];
-        } else {
-            measured[i] = results[value];
-        }
+        const int value = valueAt(i, showsSpotMaximum);
+        measured[i] = value == noValue ? -1.0 : results[value];
     }
     ticket.writeArray("Values/Measured", positionCount, measured);
 }
@@ -260,9 +211,9 @@ void writeMeasured(const StripTicket& ticket, const tolerancePresetParameterReco
 void writeVerdicts(const StripTicket& ticket, const std::string& name, bool isPsd,
                    const Bytes& verdicts) {
     int numbers[positionCount];
-    const int count = isPsd ? psdPositionCount : positionCount;
+    const int count = verdictCount(isPsd);
     for (int i = 0; i < count; ++i) {
-        numbers[i] = verdicts[static_cast<std::size_t>(isPsd ? i : positions[i].verdict)];
+        numbers[i] = verdicts[static_cast<std::size_t>(verdictAt(i, isPsd))];
     }
     ticket.writeArray((isPsd ? "Values/PSD" : "Values/") + name, count, numbers);
 }
@@ -297,8 +248,8 @@ int KZVerifyJobProcessor::CopyResulDataToJobTicket(int jobID, KZJobDataStruct jo
 int KZVerifyJobProcessor::WrietErrorToJobTicket(int errorCode, int jobID) {
     constexpr const char* key = "Process/ErrorMessage";
     std::vector<std::string> messages;
-    m_connector->GetJobTicketStringArray(JobTicket::jobType, jobID, key, &messages);
+    m_connector->GetJobTicketStringArray(jobType, jobID, key, &messages);
     std::string message = "k_TintgateError: " + std::to_string(errorCode);
-    return m_connector->SetJobTicketKeyValue(JobTicket::jobType, jobID, key, PARAM_STRING,
-                                             message.data(), static_cast<int>(messages.size()));
+    return m_connector->SetJobTicketKeyValue(jobType, jobID, key, PARAM_STRING, message.data(),
+                                             static_cast<int>(messages.size()));
 }

@@ -13,8 +13,10 @@
 
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/PatchArrays.h"
-#include "job/StripKeys.h"
+#include "jobkeys/PatchArrays.h"
+#include "jobkeys/StripKeys.h"
+
+using namespace jobkeys;
 
 namespace {
 

@@ -1,6 +1,5 @@
 #include "measure/StripLookups.h"
 
-#include <iterator>
 #include <string>
 
 #include <wx/filename.h>
@@ -8,7 +7,11 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "cli/CLogger.h"
 #include "job/JobFiles.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/ServerPaths.h"
 #include "measure/ControlStripText.h"
+
+using namespace jobkeys;
 
 namespace {
 
@@ -24,11 +27,12 @@ wxString normalised(const wxString& path) {
 }
 
 wxString inControlCharts(const JobLoad& load, const wxString& name) {
-    return load.installFolder + "/ControlCharts/" + wxFileName(name).GetName() + ".it8";
+    return wxString::FromUTF8(
+        controlStripPath(load.installFolder.utf8_string(), name.utf8_string()));
 }
 
 bool isDynamic(const JobLoad& load) {
-    return load.job->useDynstrip == 1 && load.strip == Strip::first;
+    return isDynamic(load.strip, load.job->useDynstrip);
 }
 
 /// The definition that the server made of a dynamic strip lies beside the strip, and takes the name
@@ -43,7 +47,7 @@ int lookUpDynamicStrip(const JobLoad& load) {
     wxString path;
     int code = load.ticket.read("Footer/Dynstrip/DeviceID", 0, &load.job->deviceID);
     if (code == 0) {
-        code = load.ticket.read("Footer/Dynstrip/IT8", &path);
+        code = load.ticket.read(dynamicStripKey, &path);
     }
     if (code != 0) {
         return code;
@@ -60,12 +64,8 @@ int lookUpDynamicStrip(const JobLoad& load) {
 }
 
 int lookUpFixedStrip(const JobLoad& load) {
-    constexpr std::size_t shortestName = 4; // In bytes (C33).
-    std::string name;
-    int code = load.ticket.read(stripKey(load.strip, "Footer/ControlstripFile"), &name);
-    if (code != 0 || name.size() < shortestName) {
-        code = load.ticket.read(stripKey(load.strip, "Footer/Nesting/ControlstripFile"), &name);
-    }
+    int code = 0;
+    const std::string name = fixedStripName(load.strip, load.ticket.texts(&code));
     KZJobDataStruct& job = *load.job;
     if (code == 0 && fetchControlStrip(load, wxString::FromUTF8(name), &job.controlStripFile)) {
         load.processor->GetDeviceIDFromIt8ControlStripFileEx(job.controlStripFile, &job.deviceID);
@@ -77,9 +77,9 @@ int lookUpFixedStrip(const JobLoad& load) {
 /// read alone decides: if it finds a strip, references that were not found are no failure (C35).
 int lookUpEskoReferences(const JobLoad& load) {
     wxString path;
-    if (load.ticket.read("Workflow/Verify/CharacterizationData", &path) != 0) {
+    if (load.ticket.read(characterisationKey, &path) != 0) {
         wxString name;
-        if (load.ticket.read("Footer/ControlstripFile", &name) == 0) {
+        if (load.ticket.read(stripFileKey, &name) == 0) {
             path = inControlCharts(load, name);
         }
     }
@@ -99,11 +99,8 @@ int lookUpProfile(const JobLoad& load) {
     if (load.job->measurementStatus > 0) {
         load.job->jobType = 3;
     }
-    std::string path;
-    load.ticket.read(stripKey(load.strip, "Footer/ControlstripInputProfile"), &path);
-    if (path.empty()) {
-        load.ticket.read("Remote/UsedICCProfile", &path);
-    }
+    int ignored = 0;
+    const std::string path = referenceProfile(load.strip, load.ticket.texts(&ignored));
     if (path.empty()) {
         return noReference;
     }
@@ -117,27 +114,17 @@ int takeStripAsReference(const JobLoad& load) {
     return 0;
 }
 
-/// The first mark that the value contains tells the server's folder.
-wxString characterisationPath(const JobLoad& load, const wxString& value) {
-    if (value.Contains("(TEMP)/")) {
-        return normalised(value);
-    }
-    const wxString folder = load.installFolder + "/IT8_CharacterizationData/";
-    for (const char* version : {"MKCheck10", "MKCheck11"}) {
-        if (value.Contains(version)) {
-            return folder + "Fogra_" + version + "/" + value;
-        }
-    }
-    return folder + value;
-}
-
 int lookUpCharacterisation(const JobLoad& load) {
     std::string value;
-    load.ticket.read(stripKey(load.strip, "Workflow/Verify/CharacterizationData"), &value);
+    load.ticket.read(stripKey(load.strip, characterisationKey), &value);
     if (value.empty()) {
         return noReference;
     }
-    fetchFile(load, characterisationPath(load, wxString::FromUTF8(value)), usualWait,
+    // A value that is not valid UTF-8 is empty from here on.
+    const std::string text = wxString::FromUTF8(value).utf8_string();
+    const wxString path =
+        wxString::FromUTF8(characterisationPath(load.installFolder.utf8_string(), text));
+    fetchFile(load, isWholePath(text) ? normalised(path) : path, usualWait,
               &load.job->referenceFile);
     return 0;
 }
@@ -161,24 +148,6 @@ int takeStoredReferences(const JobLoad& load) {
     return 0;
 }
 
-/// The ways to a job's references: the first whose condition holds is taken.
-constexpr struct {
-    bool (*isMeant)(const JobLoad&);
-    int (*lookUp)(const JobLoad&);
-} referenceWays[] = {
-    {[](const JobLoad& load) { return load.fromEsko == 1 && load.job->measurementWorkflow == 4; },
-     lookUpEskoReferences},
-    {[](const JobLoad& load) { return load.job->measurementWorkflow == 1; }, lookUpProfile},
-    {[](const JobLoad& load) {
-         return load.job->measurementWorkflow == 3 && !load.hasStoredReferences;
-     },
-     lookUpProfile},
-    {isDynamic, takeStripAsReference},
-    {[](const JobLoad& load) { return load.job->measurementWorkflow == 2; },
-     lookUpCharacterisation},
-    {[](const JobLoad& load) { return load.job->measurementWorkflow == 3; }, takeStoredReferences},
-};
-
 } // namespace
 
 bool fetchFile(const JobLoad& load, const wxString& serverPath, int limit, wxString* localFile) {
@@ -199,10 +168,20 @@ int lookUpControlStrip(const JobLoad& load) {
 }
 
 int lookUpReferences(const JobLoad& load) {
-    for (const auto& way : referenceWays) {
-        if (way.isMeant(load)) {
-            return way.lookUp(load);
-        }
+    switch (referenceWay(load.fromEsko == 1, load.job->measurementWorkflow, isDynamic(load),
+                         load.hasStoredReferences)) {
+    case ReferenceWay::Packaging:
+        return lookUpEskoReferences(load);
+    case ReferenceWay::Profile:
+        return lookUpProfile(load);
+    case ReferenceWay::DynamicStrip:
+        return takeStripAsReference(load);
+    case ReferenceWay::Characterisation:
+        return lookUpCharacterisation(load);
+    case ReferenceWay::Stored:
+        return takeStoredReferences(load);
+    case ReferenceWay::None:
+        break;
     }
     return noReference;
 }

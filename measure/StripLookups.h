@@ -7,7 +7,7 @@
 #include "job/JobRecords.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/StripKeys.h"
 
 /// A load under way: the record that it fills, and what it has found out beside it. It owns
 /// nothing.
@@ -15,7 +15,7 @@ struct JobLoad {
     KZVerifyJobProcessor* processor;
     KZJobDataStruct* job;
     JobTicket ticket; ///< Of the job.
-    Strip strip;
+    jobkeys::Strip strip;
     wxString installFolder = {};      ///< Of the server.
     int fromEsko = 0;                 ///< 1: of a packaging workflow.
     int subType = 0;                  ///< What the server calls the job.

@@ -4,6 +4,8 @@
 #include <filesystem>
 #include <fstream>
 
+#include "jobkeys/Tickets.h"
+
 namespace report {
 namespace {
 
@@ -27,7 +29,7 @@ bool isReport(const fs::directory_entry& entry) {
 bool isJobFolder(const fs::directory_entry& entry) {
     std::error_code ignored;
     return entry.symlink_status(ignored).type() == fs::file_type::directory &&
-           entry.path().filename().string().starts_with("JobID_");
+           entry.path().filename().string().starts_with(jobkeys::jobFolderPrefix);
 }
 
 /// Entries of a folder for which `wanted` holds; none where it can't be read.

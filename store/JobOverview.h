@@ -23,17 +23,15 @@
 #include <string_view>
 #include <vector>
 
+#include "jobkeys/JobState.h"
+#include "jobkeys/Tickets.h"
 #include "store/tickets/TicketElements.h"
 
 namespace store {
 
-/// The type of the tickets that are jobs.
-inline constexpr int jobType = 3;
+using jobkeys::jobType;
 
-/// In the order in which a client reads them.
-inline constexpr std::array<std::string_view, 5> overviewKeys = {
-    "Input/SubType", "Job/Display/Status", "Remote/ShowInVerifier", "Input/FileType",
-    "Workflow/Verify/Active"};
+using jobkeys::overviewKeys;
 
 /// The key's place among these; overviewKeys.size() for any other.
 std::size_t overviewKey(std::string_view name);

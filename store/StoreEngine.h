@@ -186,6 +186,10 @@ class StoreEngine {
     /// Number 0 is the file itself, which goes first. The size is not looked at.
     virtual void placeVersion(std::string_view path, const FileVersion& version,
                               std::istream& from) = 0;
+    /// The highest number that a version of this file ever had, also if it has been pruned, or 0.
+    virtual int highestVersion(std::string_view path) = 0;
+    /// The next version of this file, which is there, gets a higher number than this one.
+    virtual void raiseHighestVersion(std::string_view path, int number) = 0;
     /// Makes a store of what openCopy opened. Before it, nothing of it has to be on the disk.
     virtual void finishCopy() = 0;
 };

@@ -11,12 +11,12 @@
 #include <unistd.h>
 
 #include "base/Descriptor.h"
+#include "jobkeys/Tickets.h"
 
 namespace store {
 
 namespace {
 
-constexpr int jobType = 3;
 constexpr off_t largestFile = 1 << 20;
 constexpr const char* timeForm = "%Y-%m-%dT%H:%M:%SZ";
 
@@ -71,7 +71,7 @@ bool readLine(const std::string& line, WriteFailure& failure) {
 } // namespace
 
 std::string ticketNameOf(int type, int id) {
-    return (type == jobType ? "job" : std::to_string(type)) + "/" + std::to_string(id);
+    return (type == jobkeys::jobType ? "job" : std::to_string(type)) + "/" + std::to_string(id);
 }
 
 WriteFailures::WriteFailures(const std::string& folder)

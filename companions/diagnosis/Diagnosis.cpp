@@ -28,7 +28,9 @@
 #include "companions/diagnosis/ValueRules.h"
 #include "companions/diagnosis/Words.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "job/StripKeys.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/StripKeys.h"
 #include "platform/TemporaryFolder.h"
 
 namespace diagnosis {
@@ -153,7 +155,8 @@ Diagnosis Examination::result() {
 }
 
 bool Examination::checkCall() {
-    const std::optional<int> selector = stripSelectorOf(base::wideFromBytes(m_request.selector));
+    const std::optional<int> selector =
+        jobkeys::stripSelectorOf(base::wideFromBytes(m_request.selector));
     const std::string where = "strip selector " + m_request.selector;
     if (!selector) {
         add(m_request.selector.empty() ? "strip selector" : where,
@@ -161,7 +164,7 @@ bool Examination::checkCall() {
         return end(exitWrongArguments);
     }
     m_job.secondStrip = *selector;
-    m_strip = stripOf(*selector);
+    m_strip = jobkeys::stripOf(*selector);
     if (*selector != 0 && *selector != 1) {
         add(where,
             "is neither 0, the first strip, nor 1, the second. The run reads the keys of the "
@@ -252,7 +255,7 @@ bool Examination::checkList() {
                : found == nullptr ? "is missing"
                                   : problemOf(*found, false);
     };
-    if (numberIn(asked("Input/FileType")) == 4096) {
+    if (numberIn(asked(jobkeys::fileTypeKey)) == jobkeys::unsuitableFileType) {
         add(jobKey("Input/FileType"), "is 4096, which keeps a job from being verified.", codes);
     }
     const std::string status = text("Job/Display/Status");
@@ -332,7 +335,7 @@ void Examination::measure() {
     }
     const wxString definition = m_processor->WriteTemporaryMeasurementDefinitionFile(strip, &m_job);
     if (definition.empty()) {
-        const bool dynamic = m_job.useDynstrip == 1 && m_strip == Strip::first;
+        const bool dynamic = jobkeys::isDynamic(m_strip, m_job.useDynstrip);
         add("control strip " + fileName(bytesOf(strip)),
             std::string("No definition for the measuring tool can be made from it: ") +
                 (dynamic ? "a dynamic strip needs NUMBER_OF_STRIPS and NUMBER_OF_COLS"

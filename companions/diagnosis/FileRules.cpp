@@ -89,7 +89,7 @@ Role roleOf(const ReadOnlyServer& server, const KZJobDataStruct& job, const Aske
                              !isAfter(server, file, "Footer/ControlstripIT8") && !isJdf;
     for (const Role& role : roles) {
         const bool isNamed = file.namedBy == role.key ||
-                             file.namedBy == stripKey(stripOf(job.secondStrip), role.key);
+                             file.namedBy == stripKey(jobkeys::stripOf(job.secondStrip), role.key);
         if (isNamed && !isReference) {
             return role;
         }

@@ -7,7 +7,7 @@
 #include "companions/diagnosis/Diagnosis.h"
 #include "companions/diagnosis/ReadOnlyServer.h"
 #include "job/JobRecords.h"
-#include "job/StripKeys.h"
+#include "jobkeys/StripKeys.h"
 
 namespace diagnosis {
 

@@ -5,6 +5,8 @@
 
 #include <wx/string.h>
 
+#include "jobkeys/Lookups.h"
+
 namespace diagnosis {
 
 namespace {
@@ -31,12 +33,12 @@ struct Rule {
 constexpr bool emptyIsFine = false;
 constexpr bool emptyToo = true;
 
-const char* const ownStrip = "Footer/ControlstripFile";
+const char* const ownStrip = jobkeys::stripFileKey;
 const char* const modeKey = "Footer/Nesting/ControlstripMode";
-const char* const characterisation = "Workflow/Verify/CharacterizationData";
+const char* const characterisation = jobkeys::characterisationKey;
 const char* const assessment = "Footer/Nesting/PSDAssessment";
-const char* const jdfFolder = "System/Folders/Temp";
-const char* const profile = "Footer/ControlstripInputProfile";
+const char* const jdfFolder = jobkeys::temporaryFolderKey;
+const char* const profile = jobkeys::stripProfileKey;
 const char* const dynamicEnds =
     "The lookup of the dynamic strip ends with it: there is no control strip, and the workflow is "
     "not read.";

@@ -8,13 +8,15 @@
 
 #include "companions/diagnosis/Diagnosis.h"
 #include "companions/diagnosis/ReadOnlyServer.h"
-#include "job/StripKeys.h"
+#include "jobkeys/StripKeys.h"
+#include "jobkeys/Tickets.h"
 
 namespace diagnosis {
 
-inline constexpr int systemType = 0;
-inline constexpr int jobType = 3;
-inline constexpr int presetType = 27;
+using jobkeys::jobType;
+using jobkeys::presetType;
+using jobkeys::Strip;
+using jobkeys::systemType;
 
 /// "system", "job/7", "preset/1", "12/3".
 std::string ticketName(int type, int id);

@@ -9,17 +9,19 @@
 #include "ExitCodes.h"
 #include "companions/diagnosis/KeyRules.h"
 #include "companions/diagnosis/Words.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/PatchArrays.h"
 
 namespace diagnosis {
 
 namespace {
 
-constexpr int mostPatches = 1'000'000; ///< More are not loaded.
-
 /// The keys of one job, and what is found in their values.
 class Values {
   public:
-    explicit Values(const Examined& run) : m_run(run), m_strip(stripOf(run.job.secondStrip)) {}
+    explicit Values(const Examined& run)
+        : m_run(run), m_strip(jobkeys::stripOf(run.job.secondStrip)) {}
 
     void judgeReferences();
     void judgePatches();
@@ -33,7 +35,7 @@ class Values {
     std::optional<int> numberOf(const std::string& key) const {
         return numberIn(findKey(m_run.server.keys(), jobType, m_run.job.jobID, key));
     }
-    bool isDynamic() const { return m_run.job.useDynstrip == 1 && m_strip == Strip::first; }
+    bool isDynamic() const { return jobkeys::isDynamic(m_strip, m_run.job.useDynstrip); }
 
     void add(const std::string& key, std::string text, std::vector<int> codes = {},
              bool spoilsResult = false) {
@@ -63,7 +65,7 @@ void Values::judgePatches() {
     for (const char* name : {"Reference/Numpatches", "Numpatches"}) {
         const std::string key = measurementKey(m_strip, name);
         const std::optional<int> patches = numberOf(key);
-        if (patches && *patches > mostPatches) {
+        if (patches && *patches > jobkeys::mostPatches) {
             add(key,
                 "is " + std::to_string(*patches) + ". More than 1,000,000 patches are not loaded.",
                 {exitPresetFailed, exitSampleMissing});
@@ -98,7 +100,8 @@ void Values::judgeComparison() {
 
 /// Values that lead a run another way than a person may expect.
 void Values::judgeRoad() {
-    if (m_strip == Strip::second && numberOf("Workflow/Verify/Active") != 3) {
+    if (m_strip == Strip::second &&
+        numberOf(jobkeys::verifyActiveKey) != jobkeys::activeForTwoStrips) {
         add("Workflow/Verify/Active",
             "is not 3: the job counts as one with a single strip, and a run on the second closes "
             "it.");

@@ -3,6 +3,7 @@
 
 #include <sys/stat.h>
 
+#include "jobkeys/Tickets.h"
 #include "report/Page.h"
 #include "report/PageFile.h"
 #include "companions/tintgate-report/Failure.h"
@@ -65,7 +66,7 @@ std::string printersFolder(const LoadedResult& loaded) {
     if (failure) {
         return loaded.folder();
     }
-    if (loaded.meta && folder.filename().string().starts_with("JobID_")) {
+    if (loaded.meta && folder.filename().string().starts_with(jobkeys::jobFolderPrefix)) {
         folder = folder.parent_path();
     }
     return fs::proximate(folder).string();

@@ -1,5 +1,6 @@
 #include "companions/tintgate-report/LocalPages.h"
 
+#include "jobkeys/Tickets.h"
 #include "report/Reports.h"
 #include "companions/tintgate-report/Filter.h"
 #include "platform/TemporaryFolder.h"
@@ -12,7 +13,7 @@ LocalPages::LocalPages() : m_folder(platform::temporaryFolder() + "/Tintgate") {
 }
 
 std::string LocalPages::of(const report::Sample& sample) const {
-    const std::string folder = "JobID_" + std::to_string(*sample.jobId);
+    const std::string folder = jobkeys::jobFolderName(*sample.jobId);
     const auto found = m_pages.find(folder);
     if (found == m_pages.end())
         return {};

@@ -6,7 +6,12 @@
 #include <sstream>
 #include <string_view>
 
+#include "jobkeys/Tickets.h"
+
 namespace reporting {
+
+using jobkeys::jobFolderPrefix;
+
 namespace {
 
 namespace fs = std::filesystem;
@@ -67,10 +72,9 @@ class Search {
             std::string_view rest = std::string_view(text).substr(at);
             if (rest.starts_with(hidden))
                 rest.remove_prefix(hidden.size());
-            constexpr std::string_view prefix = "JobID_";
-            if (!rest.starts_with(prefix))
+            if (!rest.starts_with(jobFolderPrefix))
                 continue;
-            const std::size_t end = rest.find_first_not_of("0123456789", prefix.size());
+            const std::size_t end = rest.find_first_not_of("0123456789", jobFolderPrefix.size());
             used.emplace(rest.substr(0, end), m_user);
         }
     }
@@ -84,7 +88,7 @@ class Search {
                 return;
         word.erase(0, word.rfind(':') + 1);
         if (isNumber(word))
-            used.emplace("JobID_" + word, m_user);
+            used.emplace(std::string(jobFolderPrefix) + word, m_user);
     }
 
     /// False only where the tool's environment names another temporary folder.

@@ -1,17 +1,20 @@
 #include "companions/tintgate-report/ServerFiles.h"
 
 #include <algorithm>
-#include <cstdio>
 #include <cstdlib>
 #include <sstream>
 
 #include "analysis/Presets.h"
 #include "colour/CgatsText.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/ServerPaths.h"
+#include "jobkeys/Tickets.h"
 
 namespace reporting {
-namespace {
 
-constexpr int presetType = 27;
+using namespace jobkeys;
+
+namespace {
 
 std::string fileOf(store::StoreEngine& store, const std::string& path) {
     std::ostringstream bytes;
@@ -38,9 +41,7 @@ const Preset& Server::preset(int id, const std::string& installFolder) {
     if (!fresh || id <= 0)
         return at->second;
     at->second.name = textOf(m_store.key(presetType, id, "Name"));
-    char name[32];
-    std::snprintf(name, sizeof name, "CVP_%04d.xml", id);
-    const std::string bytes = fileOf(m_store, installFolder + "/tickets/" + name);
+    const std::string bytes = fileOf(m_store, presetPath(installFolder, id));
     tolerancePresetParameterRecord values;
     if (!bytes.empty() && analysis::parsePreset(bytes, true, values) == 0)
         at->second.values = values;
@@ -49,19 +50,16 @@ const Preset& Server::preset(int id, const std::string& installFolder) {
     return at->second;
 }
 
-std::string Server::instrument(const store::TicketContent& job, const StripKeys& keys, int strip) {
-    if (strip == 1 && integerOf(job.find("Footer/Dynstrip/UseDynstrip")) == 1)
+std::string Server::instrument(const store::TicketContent& job, Strip strip) {
+    if (isDynamic(strip, integerOf(job.find("Footer/Dynstrip/UseDynstrip")).value_or(0))) {
         return nameOf(integerOf(job.find("Footer/Dynstrip/DeviceID")).value_or(0));
-    constexpr std::size_t shortestName = 4;
-    std::string file = textOf(job.find(keys.own("Footer/ControlstripFile")));
-    if (file.size() < shortestName)
-        file = textOf(job.find(keys.own("Footer/Nesting/ControlstripFile")));
-    file.erase(0, file.rfind('/') + 1);
-    file.resize(std::min(file.rfind('.'), file.size()));
-    if (file.empty())
+    }
+    const std::string name =
+        fixedStripName(strip, [&](const std::string& key) { return textOf(job.find(key)); });
+    if (name.empty()) {
         return {};
-    const std::string path =
-        textOf(job.find("System/InstallFolder")) + "/ControlCharts/" + file + ".it8";
+    }
+    const std::string path = controlStripPath(textOf(job.find("System/InstallFolder")), name);
     const auto [at, fresh] = m_strips.try_emplace(path);
     if (fresh)
         if (const auto device = colour::cgatsKeyword(fileOf(m_store, path), "DEVICE"))

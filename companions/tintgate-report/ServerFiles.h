@@ -29,7 +29,7 @@ class Server {
     const Preset& preset(int id, const std::string& installFolder);
 
     /// Of the control strip that the job names; empty where it tells none.
-    std::string instrument(const store::TicketContent& job, const StripKeys& keys, int strip);
+    std::string instrument(const store::TicketContent& job, Strip strip);
 
     const std::set<int>& presetsWithoutFile() const { return m_missing; }
 

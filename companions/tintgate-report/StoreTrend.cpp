@@ -1,5 +1,6 @@
 #include <algorithm>
 #include <map>
+#include <span>
 #include <tuple>
 
 #include "analysis/Criteria.h"
@@ -12,22 +13,17 @@
 #include "companions/tintgate-report/Targets.h"
 #include "companions/tintgate-report/TicketKeys.h"
 #include "companions/tintgate-report/Trend.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/PatchArrays.h"
+#include "jobkeys/ResultPositions.h"
+#include "jobkeys/Tickets.h"
 #include "store/StoreEngine.h"
 
 namespace reporting {
+
+using namespace jobkeys;
+
 namespace {
-
-constexpr int jobType = 3;
-
-/// The criterion whose value and approval stand at each of the server's positions for results; -1
-/// for none. Further positions have none.
-constexpr int criterionAt[] = {6,  7,  8,  9,  4,  0,  1,  5,  12, 10, 13, 3,  -1, 19,
-                               11, 20, 21, -1, -1, 22, -1, -1, -1, -1, -1, -1, 18};
-/// Where the server shows the largest difference of spot colours, or, of presets of the PSD kind
-/// that don't use it, the average, which has a place of its own, too.
-constexpr std::size_t spotPosition = 13;
-constexpr int psdSpotMaximum = 21;
-constexpr int psdApprovals = 10; ///< Of a preset of the PSD kind only these are kept, by entry.
 
 /// What a sample is made of, beside the strip's measurement.
 constexpr const char* sharedKeys[] = {"Input/Title",
@@ -37,29 +33,20 @@ constexpr const char* sharedKeys[] = {"Input/Title",
                                       "Footer/Dynstrip/UseDynstrip",
                                       "Footer/Dynstrip/DeviceID"};
 constexpr const char* stripOnlyKeys[] = {"Workflow/Verify/ComparisonMethod",
-                                         "Workflow/Verify/DeltaEMode", "Footer/ControlstripFile",
-                                         "Footer/Nesting/ControlstripFile"};
-constexpr const char* measuredKeys[] = {"Approval",
-                                        "Date",
-                                        "Time",
-                                        "Values/Measured",
-                                        "Values/Approval",
-                                        "Values/PSDApproval",
-                                        "LabValues/LValues",
-                                        "LabValues/AValues",
-                                        "LabValues/BValues",
-                                        "CMYKValues/CValues",
-                                        "CMYKValues/MValues",
-                                        "CMYKValues/YValues",
-                                        "CMYKValues/KValues"};
+                                         "Workflow/Verify/DeltaEMode", stripFileKey,
+                                         nestedStripFileKey};
+constexpr const char* measuredKeys[] = {
+    "Approval", "Date", "Time", "Values/Measured", "Values/Approval", "Values/PSDApproval"};
 
-store::KeyFilter keysOf(const StripKeys& keys) {
-    std::vector<std::string> names = Targets::keys(keys);
+store::KeyFilter keysOf(Strip strip) {
+    std::vector<std::string> names = Targets::keys(strip);
     names.insert(names.end(), std::begin(sharedKeys), std::end(sharedKeys));
     for (const char* key : stripOnlyKeys)
-        names.push_back(keys.own(key));
-    for (const char* name : measuredKeys)
-        names.push_back(keys.measured(name));
+        names.push_back(stripKey(strip, key));
+    for (const std::span<const char* const> group :
+         std::initializer_list<std::span<const char* const>>{measuredKeys, labArrays, cmykArrays})
+        for (const char* name : group)
+            names.push_back(measurementKey(strip, name));
     std::vector<const char*> table;
     for (const std::string& name : names)
         table.push_back(name.c_str());
@@ -74,26 +61,24 @@ using SharedContent = std::shared_ptr<const store::TicketContent>;
 struct Verified {
     int job = 0;
     int parent = 0; ///< Of a job on a sheet with others; 0 for none.
-    int strip = 1;
+    Strip strip = Strip::first;
     std::int64_t time = 0;
 };
 
 /// The strips of all jobs that have a result of a time that the filter takes; those on a sheet with
 /// others first.
 std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& filter) {
-    const std::vector<std::string> names = {StripKeys(1).measured("Approval"),
-                                            StripKeys(1).measured("Date"),
-                                            StripKeys(1).measured("Time"),
-                                            StripKeys(2).measured("Approval"),
-                                            StripKeys(2).measured("Date"),
-                                            StripKeys(2).measured("Time"),
-                                            "General/ParentID"};
+    std::vector<std::string> names;
+    for (const Strip strip : strips)
+        for (const char* name : {"Approval", "Date", "Time"})
+            names.push_back(measurementKey(strip, name));
+    names.emplace_back("General/ParentID");
     struct Row {
         bool judged = false;
         std::string date;
         std::string time;
     };
-    std::map<std::pair<int, int>, Row> rows;
+    std::map<std::pair<int, Strip>, Row> rows;
     std::map<int, int> parents;
     constexpr std::size_t anySize = static_cast<std::size_t>(-1) / 2;
     store.keysOfAll(jobType, names, anySize, [&](int id, std::size_t name, const auto& elements) {
@@ -101,7 +86,7 @@ std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& fi
             parents[id] = integerOf(elements).value_or(0);
             return;
         }
-        Row& row = rows[{id, name < 3 ? 1 : 2}];
+        Row& row = rows[{id, strips[name / 3]}];
         if (name % 3 == 0)
             row.judged = integerOf(elements).value_or(-1) >= 0;
         else
@@ -146,12 +131,32 @@ struct Results {
     std::vector<int> approvals; ///< By the server's position, or by entry for the PSD kind.
 };
 
-std::optional<bool> approvalOf(const Results& results, std::size_t position, int entry, bool psd) {
-    const std::size_t at = psd ? static_cast<std::size_t>(entry) : position;
-    if (at >= results.approvals.size() || (psd && entry >= psdApprovals))
+std::optional<bool> approvalOf(const Results& results, int verdict, bool isPsd) {
+    const auto position = positionOfVerdict(verdict, isPsd);
+    if (!position || static_cast<std::size_t>(*position) >= results.approvals.size()) {
         return std::nullopt;
-    return results.approvals[at] != 0;
+    }
+    return results.approvals[static_cast<std::size_t>(*position)] != 0;
 }
+
+/// The measured value that belongs to a criterion. Nothing if the server does not show it.
+std::optional<double> measuredOf(const Results& results, const analysis::Criterion& known,
+                                 bool showsSpotMaximum) {
+    const auto position = positionOfVerdict(known.index, false);
+    if (!position || valueAt(*position, showsSpotMaximum) != known.value ||
+        static_cast<std::size_t>(*position) >= results.measured.size()) {
+        return std::nullopt;
+    }
+    return results.measured[static_cast<std::size_t>(*position)];
+}
+
+/// Whether the server's table pairs values and verdicts as the criteria do.
+constexpr bool agreesWithPositions(const analysis::Criterion& known) {
+    const auto position = positionOfVerdict(known.index, false);
+    return !position || valueAt(*position, true) == known.value;
+}
+static_assert(std::all_of(std::begin(analysis::criteria), std::end(analysis::criteria),
+                          agreesWithPositions));
 
 /// Fills in value and outcome as they were judged then. True where today's tolerance would say
 /// something else.
@@ -173,37 +178,33 @@ bool judge(report::Criterion& criterion, double value, std::optional<bool> appro
 
 bool addCriteria(report::Sample& sample, const Results& results, const Preset& preset) {
     bool changed = false;
+    const bool showsSpotMaximum =
+        !preset.psd() || preset.values->usedForPSDResult[psdSpotMaximum] == 1;
     for (const analysis::Criterion& known : analysis::criteria) {
-        const auto at = std::find(std::begin(criterionAt), std::end(criterionAt), known.index);
-        const auto position = static_cast<std::size_t>(at - std::begin(criterionAt));
-        const bool holdsAverage = position == spotPosition && preset.psd() &&
-                                  preset.values->usedForPSDResult[psdSpotMaximum] != 1;
-        if (known.index == analysis::noEntry || at == std::end(criterionAt) ||
-            position >= results.measured.size() || holdsAverage)
+        const auto measured = measuredOf(results, known, showsSpotMaximum);
+        if (!measured) {
             continue;
+        }
         report::Criterion criterion = criterionOf(known, preset);
-        changed |= judge(criterion, results.measured[position],
-                         approvalOf(results, position, known.index, preset.psd()));
+        changed |= judge(criterion, *measured, approvalOf(results, known.index, preset.psd()));
         if (criterion.value || criterion.used)
             sample.criteria.push_back(std::move(criterion));
     }
     return changed;
 }
 
-report::InkColours inksOf(const store::TicketContent& job, const StripKeys& keys) {
+report::InkColours inksOf(const store::TicketContent& job, Strip strip) {
     std::vector<double> lab[3];
     std::vector<double> cmyk[4];
     std::size_t patches = mostElements;
     const auto read = [&](std::vector<double>& values, const char* name) {
-        values = doublesOf(job.find(keys.measured(name)));
+        values = doublesOf(job.find(measurementKey(strip, name)));
         patches = std::min(patches, values.size());
     };
     for (int i = 0; i < 3; ++i)
-        read(lab[i],
-             (const char*[]){"LabValues/LValues", "LabValues/AValues", "LabValues/BValues"}[i]);
+        read(lab[i], labArrays[i]);
     for (int i = 0; i < 4; ++i)
-        read(cmyk[i], (const char*[]){"CMYKValues/CValues", "CMYKValues/MValues",
-                                      "CMYKValues/YValues", "CMYKValues/KValues"}[i]);
+        read(cmyk[i], cmykArrays[i]);
     report::InkMeans means;
     for (std::size_t i = 0; i < patches; ++i) {
         const double device[4] = {cmyk[0][i], cmyk[1][i], cmyk[2][i], cmyk[3][i]};
@@ -226,20 +227,19 @@ report::Verdict verdictOf(const report::Sample& sample, int approval) {
 
 report::Sample sampleOf(const store::TicketContent& job, const Verified& verified, Server& server,
                         const Preset& preset) {
-    const StripKeys keys(verified.strip);
     report::Sample sample;
     sample.time = verified.time;
     sample.jobId = verified.job;
-    sample.strip = verified.strip;
+    sample.strip = numberOf(verified.strip);
     sample.title = textOf(job.find("Input/Title"));
     if (sample.title.empty())
         sample.title = "Job " + std::to_string(verified.job);
     sample.paper = textOf(job.find("CMM/PaperName"));
     sample.workflow = textOf(job.find("Workflow/Name"));
-    sample.instrument = server.instrument(job, keys, verified.strip);
+    sample.instrument = server.instrument(job, verified.strip);
     sample.preset = preset.name;
     sample.formula = colour::formulaName(colour::formulaFromNumber(
-        integerOf(job.find(keys.own("Workflow/Verify/DeltaEMode"))).value_or(0)));
+        integerOf(job.find(stripKey(verified.strip, "Workflow/Verify/DeltaEMode"))).value_or(0)));
     return sample;
 }
 
@@ -251,12 +251,12 @@ class Gatherer {
 
     void add(const Verified& verified) {
         const SharedContent job =
-            m_store.content(jobType, verified.job, m_keys[verified.strip - 1]);
+            m_store.content(jobType, verified.job, m_keys[verified.strip == Strip::first ? 0 : 1]);
         if (!job) // Deleted meanwhile.
             return;
-        const StripKeys keys(verified.strip);
+        const Strip strip = verified.strip;
         const int id =
-            integerOf(job->find(keys.own("Workflow/Verify/ComparisonMethod"))).value_or(0);
+            integerOf(job->find(stripKey(strip, "Workflow/Verify/ComparisonMethod"))).value_or(0);
         const Preset& preset = m_server.preset(id, textOf(job->find("System/InstallFolder")));
         report::Sample sample = sampleOf(*job, verified, m_server, preset);
         sample.presetId = id;
@@ -264,15 +264,15 @@ class Gatherer {
             if (const std::string page = m_pages.of(sample); !page.empty())
                 sample.page = relativeTo(m_place.folder, page);
         Results results;
-        results.measured = doublesOf(job->find(keys.measured("Values/Measured")));
+        results.measured = doublesOf(job->find(measurementKey(strip, "Values/Measured")));
         if (!m_filter.takes(sample) || isKnown(verified, results.measured, sample.page))
             return;
-        results.approvals = integersOf(
-            job->find(keys.measured(preset.psd() ? "Values/PSDApproval" : "Values/Approval")));
+        results.approvals = integersOf(job->find(
+            measurementKey(strip, preset.psd() ? "Values/PSDApproval" : "Values/Approval")));
         m_changes += addCriteria(sample, results, preset);
         sample.verdict =
-            verdictOf(sample, integerOf(job->find(keys.measured("Approval"))).value_or(0));
-        sample.inks = inksOf(*job, keys);
+            verdictOf(sample, integerOf(job->find(measurementKey(strip, "Approval"))).value_or(0));
+        sample.inks = inksOf(*job, strip);
         Target target = m_targets.of(*job, verified.strip, verified.time);
         sample.target = std::move(target.name);
         sample.targetKey = std::move(target.key);
@@ -316,8 +316,8 @@ class Gatherer {
     Server m_server;
     Targets m_targets;
     const LocalPages m_pages;
-    const store::KeyFilter m_keys[2] = {keysOf(StripKeys(1)), keysOf(StripKeys(2))};
-    std::map<std::tuple<int, int, std::string>, std::size_t> m_known;
+    const store::KeyFilter m_keys[2] = {keysOf(Strip::first), keysOf(Strip::second)};
+    std::map<std::tuple<int, Strip, std::string>, std::size_t> m_known;
     Gathered m_gathered;
     std::size_t m_changes = 0;
 };

@@ -8,63 +8,48 @@
 #include "colour/ColourFile.h"
 #include "colour/Difference.h"
 #include "colour/Identity.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/PatchArrays.h"
+#include "jobkeys/ServerPaths.h"
 
 namespace reporting {
+
+using namespace jobkeys;
+
 namespace {
 
 constexpr const char* storedReferences = "stored references";
-constexpr const char* labNames[] = {"LabValues/LValues", "LabValues/AValues", "LabValues/BValues"};
-constexpr const char* xyzNames[] = {"XYZValues/XValues", "XYZValues/YValues", "XYZValues/ZValues"};
-constexpr const char* cmykNames[] = {"CMYKValues/CValues", "CMYKValues/MValues",
-                                     "CMYKValues/YValues", "CMYKValues/KValues"};
 
 std::string nameOf(const std::string& path) {
     return path.substr(path.rfind('/') + 1);
 }
 
-std::string inControlCharts(const std::string& install, const std::string& strip) {
-    std::string name = nameOf(strip);
-    name.resize(std::min(name.rfind('.'), name.size()));
-    return install + "/ControlCharts/" + name + ".it8";
-}
-
-std::string characterisation(const std::string& install, const std::string& value) {
-    if (value.empty() || value.find("(TEMP)/") != value.npos) {
-        return value;
-    }
-    std::string folder = install + "/IT8_CharacterizationData/";
-    for (const char* version : {"MKCheck10", "MKCheck11"}) {
-        if (value.find(version) != value.npos) {
-            return folder + "Fogra_" + version + "/" + value;
-        }
-    }
-    return folder + value;
-}
-
 /// Server path of a job's references; empty if the ticket names none.
-std::string pathOf(const store::TicketContent& job, const StripKeys& keys, int strip,
-                   bool hasStored) {
+std::string pathOf(const store::TicketContent& job, Strip strip, bool hasStored) {
     const auto text = [&](const std::string& key) { return textOf(job.find(key)); };
     const auto number = [&](const std::string& key) {
         return integerOf(job.find(key)).value_or(0);
     };
     const std::string install = text("System/InstallFolder");
-    const int workflow = number(keys.own("Workflow/Verify/MeasurementWorkflow"));
-    if (number("Job/FromEsko") == 1 && workflow == 4) {
-        constexpr const char* data = "Workflow/Verify/CharacterizationData";
-        return job.find(data) ? text(data)
-                              : inControlCharts(install, text("Footer/ControlstripFile"));
+    const bool dynamic = isDynamic(strip, number("Footer/Dynstrip/UseDynstrip"));
+    switch (referenceWay(number("Job/FromEsko") == 1, number(stripKey(strip, workflowKey)), dynamic,
+                         hasStored)) {
+    case ReferenceWay::Packaging:
+        return job.find(characterisationKey) ? text(characterisationKey)
+                                             : controlStripPath(install, text(stripFileKey));
+    case ReferenceWay::Profile:
+        return referenceProfile(strip, text);
+    case ReferenceWay::DynamicStrip:
+        return text(dynamicStripKey);
+    case ReferenceWay::Characterisation: {
+        const std::string value = text(stripKey(strip, characterisationKey));
+        return value.empty() ? "" : characterisationPath(install, value);
     }
-    if (workflow == 1 || (workflow == 3 && !hasStored)) {
-        const std::string own = text(keys.own("Footer/ControlstripInputProfile"));
-        return own.empty() ? text("Remote/UsedICCProfile") : own;
+    case ReferenceWay::Stored:
+    case ReferenceWay::None:
+        break;
     }
-    if (strip == 1 && number("Footer/Dynstrip/UseDynstrip") == 1) {
-        return text("Footer/Dynstrip/IT8");
-    }
-    return workflow == 2
-               ? characterisation(install, text(keys.own("Workflow/Verify/CharacterizationData")))
-               : "";
+    return "";
 }
 
 report::InkColours aimsOf(const colour::DataSet& set) {
@@ -98,26 +83,25 @@ std::vector<double> percents(const store::TicketContent& job, const std::string&
 }
 
 /// References in the ticket itself.
-Target targetInTicket(const store::TicketContent& job, const StripKeys& keys, int patches) {
+Target targetInTicket(const store::TicketContent& job, Strip strip, int patches) {
     const auto count = static_cast<std::size_t>(patches);
     const auto columns = [&](const char* const(&names)[3]) {
         std::vector<std::vector<double>> read;
         for (const char* name : names) {
-            read.push_back(doublesOf(job.find(keys.measured(std::string("Reference/") + name))));
+            read.push_back(doublesOf(job.find(referenceKey(strip, name))));
             read.back().resize(count);
         }
         return read;
     };
-    const bool hasLab = job.find(keys.measured("Reference/LabValues/LValues")) != nullptr;
-    const auto colours = hasLab ? columns(labNames) : columns(xyzNames);
+    const bool hasLab = job.find(referenceKey(strip, labArrays[0])) != nullptr;
+    const auto colours = hasLab ? columns(labArrays) : columns(xyzArrays);
     colour::DataSet set;
     set.patchCount = count;
     set.deviceSpace = colour::DeviceSpace::Cmyk;
     set.channels = {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
     set.device.resize(count * set.channels.size());
     for (std::size_t ink = 0; ink < set.channels.size(); ++ink) {
-        const auto column =
-            percents(job, keys.measured(std::string("Reference/") + cmykNames[ink]));
+        const auto column = percents(job, referenceKey(strip, cmykArrays[ink]));
         for (std::size_t i = 0; i < std::min(column.size(), count); ++i) {
             set.device[i * set.channels.size() + ink] = column[i];
         }
@@ -141,45 +125,43 @@ std::int64_t utcOf(std::int64_t roomTime) {
 
 } // namespace
 
-std::vector<std::string> Targets::keys(const StripKeys& strip) {
+std::vector<std::string> Targets::keys(Strip strip) {
     std::vector<std::string> names = {"Job/FromEsko",
                                       "System/InstallFolder",
-                                      "Footer/ControlstripFile",
+                                      stripFileKey,
                                       "Footer/Dynstrip/UseDynstrip",
-                                      "Footer/Dynstrip/IT8",
-                                      "Remote/UsedICCProfile",
-                                      "Workflow/Verify/CharacterizationData",
-                                      strip.own("Workflow/Verify/MeasurementWorkflow"),
-                                      strip.own("Workflow/Verify/CharacterizationData"),
-                                      strip.own("Footer/ControlstripInputProfile"),
-                                      strip.measured("Status"),
-                                      strip.measured("Reference/Numpatches")};
-    for (const auto* group : {labNames, xyzNames}) {
+                                      dynamicStripKey,
+                                      usedProfileKey,
+                                      characterisationKey,
+                                      stripKey(strip, workflowKey),
+                                      stripKey(strip, characterisationKey),
+                                      stripKey(strip, stripProfileKey),
+                                      measurementKey(strip, "Status"),
+                                      referenceKey(strip, "Numpatches")};
+    for (const auto* group : {labArrays, xyzArrays}) {
         for (int i = 0; i < 3; ++i) {
-            names.push_back(strip.measured(std::string("Reference/") + group[i]));
+            names.push_back(referenceKey(strip, group[i]));
         }
     }
-    for (const char* name : cmykNames) {
-        names.push_back(strip.measured(std::string("Reference/") + name));
+    for (const char* name : cmykArrays) {
+        names.push_back(referenceKey(strip, name));
     }
     return names;
 }
 
-Target Targets::of(const store::TicketContent& job, int strip, std::int64_t time) {
-    const StripKeys keys(strip);
+Target Targets::of(const store::TicketContent& job, Strip strip, std::int64_t time) {
     const auto number = [&](const std::string& key) {
         return integerOf(job.find(key)).value_or(0);
     };
-    const int patches = number(keys.measured("Reference/Numpatches"));
-    constexpr int mostPatches = 1'000'000;
-    const bool hasStored = number(keys.own("Workflow/Verify/MeasurementWorkflow")) == 3 &&
-                           number(keys.measured("Status")) > 0 && patches > 0 &&
+    const int patches = number(referenceKey(strip, "Numpatches"));
+    const bool hasStored = number(stripKey(strip, workflowKey)) == 3 &&
+                           number(measurementKey(strip, "Status")) > 0 && patches > 0 &&
                            patches <= mostPatches;
-    const std::string path = pathOf(job, keys, strip, hasStored);
+    const std::string path = pathOf(job, strip, hasStored);
     if (!path.empty()) {
         return ofFile(path, time);
     }
-    return hasStored ? targetInTicket(job, keys, patches) : Target{};
+    return hasStored ? targetInTicket(job, strip, patches) : Target{};
 }
 
 Target Targets::ofFile(const std::string& path, std::int64_t time) {

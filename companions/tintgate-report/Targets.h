@@ -27,10 +27,10 @@ class Targets {
     explicit Targets(store::StoreEngine& store) : m_store(store) {}
 
     /// Names of the job's keys that `of` needs.
-    static std::vector<std::string> keys(const StripKeys& strip);
+    static std::vector<std::string> keys(Strip strip);
 
     /// `time` is the measurement's on the room's own clock, taken for that of this machine.
-    Target of(const store::TicketContent& job, int strip, std::int64_t time);
+    Target of(const store::TicketContent& job, Strip strip, std::int64_t time);
 
   private:
     struct Content {

@@ -6,9 +6,12 @@
 #include <string>
 #include <vector>
 
+#include "jobkeys/StripKeys.h"
 #include "store/tickets/TicketElements.h"
 
 namespace reporting {
+
+using jobkeys::Strip;
 
 using SharedElements = std::shared_ptr<const store::Elements>;
 
@@ -24,19 +27,5 @@ inline constexpr std::size_t mostElements = std::size_t{1} << 20;
 
 /// The elements up to the first hole or other type.
 std::vector<int> integersOf(const SharedElements& elements);
-
-/// A job's keys as one of its strips has them.
-class StripKeys {
-  public:
-    explicit StripKeys(int strip) : m_suffix(strip == 2 ? "2" : "") {}
-
-    std::string measured(const std::string& name) const {
-        return "Remote/Measurement" + m_suffix + "/" + name;
-    }
-    std::string own(const std::string& key) const { return key + m_suffix; }
-
-  private:
-    std::string m_suffix;
-};
 
 } // namespace reporting

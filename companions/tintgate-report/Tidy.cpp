@@ -15,6 +15,7 @@
 #include "report/Model.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Processes.h"
+#include "jobkeys/Tickets.h"
 
 namespace reporting {
 namespace {
@@ -29,7 +30,7 @@ bool isOurs(const struct stat& status) {
 
 /// "JobID_7" of "JobID_7" and of ".tidy-JobID_7"; empty of any other name.
 std::string jobName(std::string name) {
-    constexpr std::string_view prefix = "JobID_";
+    constexpr std::string_view prefix = jobkeys::jobFolderPrefix;
     if (name.starts_with(hidden))
         name.erase(0, std::strlen(hidden));
     const bool job = name.starts_with(prefix) && name.size() > prefix.size() &&

@@ -59,6 +59,7 @@ class Spool {
 struct ListedFile {
     store::FileEntry entry;
     std::vector<store::FileVersion> versions;
+    int highestVersion = 0; ///< May have been pruned.
 };
 
 class Copy {
@@ -100,7 +101,8 @@ class Copy {
         std::vector<ListedFile> files;
         for (auto& entry : m_from.files()) {
             auto versions = m_from.versions(entry.path);
-            files.push_back({std::move(entry), std::move(versions)});
+            const int highest = m_from.highestVersion(entry.path);
+            files.push_back({std::move(entry), std::move(versions), highest});
         }
         return files;
     }
@@ -140,10 +142,13 @@ class Copy {
     }
 
     void copyFiles(const std::vector<ListedFile>& files) {
-        for (const auto& [entry, versions] : files) {
+        for (const auto& [entry, versions, highest] : files) {
             copyVersion(entry.path, {0, entry.size, entry.time});
             for (const auto& version : versions) {
                 copyVersion(entry.path, version);
+            }
+            if (highest > (versions.empty() ? 0 : versions.back().number)) {
+                m_to.raiseHighestVersion(entry.path, highest);
             }
         }
     }

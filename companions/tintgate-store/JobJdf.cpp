@@ -13,13 +13,12 @@
 #include "companions/tintgate-store/JdfText.h"
 #include "companions/tintgate-store/KeyValue.h"
 #include "companions/tintgate-store/TicketName.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
 
 namespace admin {
 
 namespace {
-
-/// Sub types of jobs whose JDF has a place of its own until they have been measured.
-constexpr int remoteSubTypes[] = {80, 81, 86};
 
 /// Collects what is written to it, up to the largest JDF that is worked on. Throws Failure
 /// (JdfTooLarge) at more.
@@ -153,21 +152,18 @@ std::vector<std::string> jdfPathsOf(store::StoreEngine& store, int job) {
     if (!store.exists(jobType, job)) {
         throw Failure(Status::NotThere, "there is no " + name);
     }
-    const auto text = [&](const char* key) {
+    const auto text = [&](const std::string& key) {
         return textOf(store.key(jobType, job, key)).value_or("");
     };
     std::vector<std::string> paths;
-    const std::string folder = text("System/Folders/Temp");
-    const std::string jdf = text("Output/Jdf/FileName");
-    const std::string inFolder = (folder.empty() ? text("Workflow/RemoteOutFolder") : folder);
-    if (!inFolder.empty() && !jdf.empty()) {
-        paths.push_back(inFolder + "/" + jdf);
+    const std::string folder = jobkeys::jdfFolder(text);
+    const std::string jdf = text(jobkeys::jdfNameKey);
+    if (!folder.empty() && !jdf.empty()) {
+        paths.push_back(folder + "/" + jdf);
     }
-    const int subType = integerOf(store.key(jobType, job, "Input/SubType")).value_or(0);
-    const std::string remote = text("Remote/JDFName");
-    if (std::find(std::begin(remoteSubTypes), std::end(remoteSubTypes), subType) !=
-            std::end(remoteSubTypes) &&
-        !remote.empty()) {
+    const int subType = integerOf(store.key(jobType, job, jobkeys::subTypeKey)).value_or(0);
+    const std::string remote = text(jobkeys::remoteJdfKey);
+    if (jobkeys::isVerification(subType) && !remote.empty()) {
         paths.push_back(remote);
     }
     if (paths.empty()) {

@@ -6,33 +6,30 @@
 
 #include "companions/tintgate-store/KeyValue.h"
 #include "companions/tintgate-store/TicketName.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/StripKeys.h"
 
 namespace admin {
 
+using namespace jobkeys;
+
 namespace {
 
-constexpr int waiting = 208;
-constexpr int verified = 211;
-constexpr int verificationFailed = 212;
-constexpr int noVerification = 4096; ///< A file type that is never verified.
-constexpr int bothStrips = 3;        ///< Of "Workflow/Verify/Active".
-
-constexpr const char* displayKey = "Job/Display/Status";
-constexpr const char* showKey = "Remote/ShowInVerifier";
-constexpr const char* fileTypeKey = "Input/FileType";
-
-constexpr const char* roots[] = {"Remote/Measurement", "Remote/Measurement2"};
+std::string measured(int strip, const char* name) {
+    return measurementKey(strips[strip], name);
+}
 
 std::string statusKey(int strip) {
-    return roots[strip] + std::string("/Status");
+    return measured(strip, "Status");
 }
 
 std::string approvalKey(int strip) {
-    return roots[strip] + std::string("/Approval");
+    return measured(strip, "Approval");
 }
 
 /// The last key of a result, and that of a result under a PSD preset.
-constexpr const char* lastKeys[] = {"/Values/Decimal", "/Values/PSDDecimal"};
+constexpr const char* lastKeys[] = {"Values/Decimal", "Values/PSDDecimal"};
 
 using Elements = std::shared_ptr<const store::Elements>;
 
@@ -47,17 +44,19 @@ const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> reade
      [](Job& job, const Elements& value) { job.title = textOf(value).value_or(""); }},
     {"General/ParentID",
      [](Job& job, const Elements& value) { job.parent = integerOf(value).value_or(0); }},
-    {displayKey,
+    {displayStatusKey,
      [](Job& job, const Elements& value) { job.displayStatus = integerOf(value).value_or(0); }},
-    {showKey,
+    {showInVerifierKey,
      [](Job& job, const Elements& value) {
          job.hasShowInVerifier = integerOf(value).has_value();
          job.showInVerifier = integerOf(value).value_or(0);
      }},
     {fileTypeKey,
      [](Job& job, const Elements& value) { job.fileType = integerOf(value).value_or(0); }},
-    {"Workflow/Verify/Active",
-     [](Job& job, const Elements& value) { job.twoStrips = integerOf(value) == bothStrips; }},
+    {verifyActiveKey,
+     [](Job& job, const Elements& value) {
+         job.twoStrips = integerOf(value) == activeForTwoStrips;
+     }},
     {statusKey(0),
      [](Job& job, const Elements& value) {
          job.strips[0].measurements = integerOf(value).value_or(0);
@@ -70,10 +69,10 @@ const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> reade
      [](Job& job, const Elements& value) { job.strips[0].approval = integerOf(value); }},
     {approvalKey(1),
      [](Job& job, const Elements& value) { job.strips[1].approval = integerOf(value); }},
-    {roots[0] + std::string(lastKeys[0]), noteLastKey<0>},
-    {roots[0] + std::string(lastKeys[1]), noteLastKey<0>},
-    {roots[1] + std::string(lastKeys[0]), noteLastKey<1>},
-    {roots[1] + std::string(lastKeys[1]), noteLastKey<1>},
+    {measured(0, lastKeys[0]), noteLastKey<0>},
+    {measured(0, lastKeys[1]), noteLastKey<0>},
+    {measured(1, lastKeys[0]), noteLastKey<1>},
+    {measured(1, lastKeys[1]), noteLastKey<1>},
 };
 
 Job jobOf(int id, const std::function<Elements(const std::string& key)>& valueOf) {
@@ -123,46 +122,53 @@ void reopen(store::TicketContent& content, ResetResult& result) {
     }
     auto shown = std::make_shared<store::Elements>();
     shown->put(0, 1);
-    content.put(showKey, shown);
+    content.put(showInVerifierKey, shown);
     result.reopened = true;
 }
 
 /// Why a run that measures this strip would fail.
-std::vector<std::string> obstaclesOf(store::StoreEngine& store, int id, int strip) {
-    const std::string suffix = strip == 0 ? "" : "2";
+std::vector<std::string> obstaclesOf(store::StoreEngine& store, int id, jobkeys::Strip strip) {
     const auto number = [&](const std::string& key) {
         return integerOf(store.key(jobType, id, key)).value_or(0);
     };
-    const auto hasText = [&](const std::string& key, std::size_t shortest = 1) {
-        return textOf(store.key(jobType, id, key)).value_or("").size() >= shortest;
+    const auto text = [&](const std::string& key) {
+        return textOf(store.key(jobType, id, key)).value_or("");
     };
-    const std::string name = "strip " + std::to_string(strip + 1) + ": ";
+    const std::string name = "strip " + std::to_string(numberOf(strip)) + ": ";
+    const std::string data = stripKey(strip, characterisationKey);
+    const std::string reference = stripKey(strip, workflowKey);
+    const int workflow = number(reference);
+    const bool dynamic = isDynamic(strip, number("Footer/Dynstrip/UseDynstrip"));
     std::vector<std::string> obstacles;
-    const int workflow = number("Workflow/Verify/MeasurementWorkflow" + suffix);
-    const bool isEsko = number("Job/FromEsko") == 1 && workflow == 4;
-    const bool isDynamic = strip == 0 && number("Footer/Dynstrip/UseDynstrip") == 1;
-    const std::string profile = "Footer/ControlstripInputProfile" + suffix;
-    const std::string data = "Workflow/Verify/CharacterizationData" + suffix;
-    if (!isEsko && (workflow == 1 || workflow == 3)) {
-        if (!hasText(profile) && !hasText("Remote/UsedICCProfile")) {
-            obstacles.push_back(name + "it has no profile as reference (" + profile +
-                                ", Remote/UsedICCProfile)" +
+    switch (referenceWay(number("Job/FromEsko") == 1, workflow, dynamic, false)) {
+    case ReferenceWay::Packaging:
+    case ReferenceWay::DynamicStrip:
+        break;
+    case ReferenceWay::Profile:
+        if (referenceProfile(strip, text).empty()) {
+            obstacles.push_back(name + "it has no profile as reference (" +
+                                stripKey(strip, stripProfileKey) + ", " + usedProfileKey + ")" +
                                 (workflow == 3 ? "; references in the ticket count only for a "
                                                  "strip that is measured"
                                                : ""));
         }
-    } else if (!isEsko && !isDynamic && (workflow != 2 || !hasText(data))) {
-        obstacles.push_back(
-            name + "it has no reference (" +
-            (workflow == 2 ? data : "Workflow/Verify/MeasurementWorkflow" + suffix) + ")");
+        break;
+    case ReferenceWay::Characterisation:
+        if (text(data).empty()) {
+            obstacles.push_back(name + "it has no reference (" + data + ")");
+        }
+        break;
+    case ReferenceWay::Stored:
+    case ReferenceWay::None:
+        obstacles.push_back(name + "it has no reference (" + reference + ")");
+        break;
     }
-    constexpr std::size_t shortestName = 4; // Shorter ones are passed over.
-    const std::string fixed = "Footer/ControlstripFile" + suffix;
-    const std::string nested = "Footer/Nesting/ControlstripFile" + suffix;
-    const std::string dynamic = "Footer/Dynstrip/IT8";
-    if (isDynamic ? !hasText(dynamic) : !hasText(fixed, shortestName) && !hasText(nested)) {
-        obstacles.push_back(name + "it has no control strip (" +
-                            (isDynamic ? dynamic : fixed + ", " + nested) + ")");
+    if (dynamic ? text(dynamicStripKey).empty() : fixedStripName(strip, text).empty()) {
+        obstacles.push_back(
+            name + "it has no control strip (" +
+            (dynamic ? dynamicStripKey
+                     : stripKey(strip, stripFileKey) + ", " + stripKey(strip, nestedStripFileKey)) +
+            ")");
     }
     return obstacles;
 }
@@ -171,16 +177,16 @@ std::vector<std::string> obstaclesOf(store::StoreEngine& store, int id,
                                      const std::vector<int>& strips) {
     const Job job = jobOf(id, [&](const std::string& key) { return store.key(jobType, id, key); });
     std::vector<std::string> obstacles;
-    if (job.fileType == noVerification) {
+    if (job.fileType == unsuitableFileType) {
         obstacles.push_back("a file of this type is never verified (" + std::string(fileTypeKey) +
                             ")");
     } else if (!job.waits()) {
-        obstacles.push_back("it does not wait (" + std::string(displayKey) + " 208 or " + showKey +
-                            " 1), so that only a remeasure finds it");
+        obstacles.push_back("it does not wait (" + std::string(displayStatusKey) + " 208 or " +
+                            showInVerifierKey + " 1), so that only a remeasure finds it");
     }
     for (const int strip : strips) {
         if (strip == 0 || job.twoStrips) {
-            const auto more = obstaclesOf(store, id, strip);
+            const auto more = obstaclesOf(store, id, jobkeys::strips[strip]);
             obstacles.insert(obstacles.end(), more.begin(), more.end());
         }
     }
@@ -189,7 +195,7 @@ std::vector<std::string> obstaclesOf(store::StoreEngine& store, int id,
 
 ResetResult resetOne(store::StoreEngine& store, int id, const std::vector<int>& strips) {
     store::Scope scope;
-    for (const char* const key : {displayKey, showKey, fileTypeKey}) {
+    for (const char* const key : {displayStatusKey, showInVerifierKey, fileTypeKey}) {
         scope.keys.emplace(key, true);
     }
     for (const int strip : strips) {
@@ -214,14 +220,15 @@ ResetResult resetOne(store::StoreEngine& store, int id, const std::vector<int>& 
 } // namespace
 
 bool Job::waits() const {
-    return (displayStatus == waiting || showInVerifier == 1) && fileType != noVerification;
+    return (displayStatus == waitingStatus || showInVerifier == 1) &&
+           fileType != unsuitableFileType;
 }
 
 std::string Job::state() const {
-    return waits()                               ? "waiting"
-           : displayStatus == verified           ? "passed"
-           : displayStatus == verificationFailed ? "failed"
-                                                 : "-";
+    return waits()                           ? "waiting"
+           : displayStatus == verifiedStatus ? "passed"
+           : displayStatus == failedStatus   ? "failed"
+                                             : "-";
 }
 
 std::vector<Job> allJobs(store::StoreEngine& store) {

@@ -13,7 +13,7 @@ namespace {
 const struct {
     const char* word;
     int type;
-} knownTypes[] = {{"system", 0}, {"job", jobType}, {"preset", presetType}};
+} knownTypes[] = {{"system", jobkeys::systemType}, {"job", jobType}, {"preset", presetType}};
 
 constexpr int highestType = 49;
 constexpr int highestId = 0xFFFFFF;

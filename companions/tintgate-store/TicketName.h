@@ -3,10 +3,12 @@
 
 #include <string>
 
+#include "jobkeys/Tickets.h"
+
 namespace admin {
 
-inline constexpr int jobType = 3;
-inline constexpr int presetType = 27;
+using jobkeys::jobType;
+using jobkeys::presetType;
 
 struct TicketName {
     int type = 0;

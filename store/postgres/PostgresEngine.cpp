@@ -399,6 +399,12 @@ class PostgresEngine : public StoreEngine {
                       std::istream& from) override {
         m_connection.once([&] { m_files.placeVersion(path, version, from); });
     }
+    int highestVersion(std::string_view path) override {
+        return m_connection.repeating([&] { return m_files.highestVersion(path); });
+    }
+    void raiseHighestVersion(std::string_view path, int number) override {
+        m_connection.repeating([&] { m_files.raiseHighestVersion(path, number); });
+    }
     void finishCopy() override {
         m_connection.once([&] {
             m_connection.run(writeThrough); // What it waits for has all before it in front.

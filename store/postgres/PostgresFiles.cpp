@@ -39,6 +39,7 @@ constexpr Statement keepVersion = {
     " INSERT INTO tintgate.versions (path, number, content, written) SELECT * FROM kept"};
 constexpr Statement raiseLastVersion = {
     "UPDATE tintgate.files SET last_version = greatest(last_version, $2) WHERE path = $1"};
+constexpr Statement lastVersion = {"SELECT last_version FROM tintgate.files WHERE path = $1"};
 constexpr Statement exchange = {"UPDATE tintgate.files SET content = $2, written = " TINTGATE_NOW
                                 " WHERE path = $1"};
 constexpr Statement exchangeAsOf = {
@@ -293,6 +294,17 @@ void Files::placeVersion(std::string_view path, const FileVersion& version, std:
         m_connection.send(dropContent, replaced);
     }
     transaction.commit();
+}
+
+int Files::highestVersion(std::string_view path) {
+    const Place place(path);
+    const Result found = m_connection.run(lastVersion, place.path);
+    return found.rows() == 0 ? 0 : static_cast<int>(found.number(0, 0));
+}
+
+void Files::raiseHighestVersion(std::string_view path, int number) {
+    const Place place(path);
+    m_connection.run(raiseLastVersion, place.path, number);
 }
 
 } // namespace store::postgres

@@ -21,6 +21,8 @@ class Files {
     void restoreVersion(std::string_view path, int number);
     int pruneVersions(std::string_view path, int keepNewest);
     void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
+    int highestVersion(std::string_view path);
+    void raiseHighestVersion(std::string_view path, int number);
 
   private:
     Connection& m_connection;

@@ -675,6 +675,28 @@ void ServerFiles::placeVersion(std::string_view path, const FileVersion& version
     delivery.putInPlace(current ? place.name() : versionName(version.number));
 }
 
+int ServerFiles::highestVersion(std::string_view path) {
+    const Place place(path);
+    const auto list = versions(path);
+    int highest = list.empty() ? 0 : list.back().number;
+    try {
+        highest = std::max(highest,
+                           lastUsedUp(walk(m_files, place.versions(), false, place.text())));
+    } catch (const StoreFailure& failure) {
+        if (!isMissing(failure)) {
+            throw;
+        }
+    }
+    return highest;
+}
+
+void ServerFiles::raiseHighestVersion(std::string_view path, int number) {
+    const Place place(path);
+    const std::string what = place.text();
+    const ExchangeLock lock(m_files);
+    useUp(walk(m_files, place.versions(), true, what), number, what);
+}
+
 void ServerFiles::finishCopy() {
     for (const char* const top : {"", versionsFolder}) {
         removeDeliveries(m_files, top, 0);

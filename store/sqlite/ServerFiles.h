@@ -7,6 +7,7 @@
 //     .tintgate-versions/
 //       jobs/7/job.jdf/.tintgate-1           what job.jdf was before
 //       jobs/7/job.jdf/.tintgate-2
+//       jobs/7/chart.it8/.tintgate-used-3    versions 1 to 3 were pruned, and nothing came since
 //
 // Server paths have no part that starts with ".tintgate-", so that none of these names can be
 // reached or be in the way.
@@ -55,6 +56,8 @@ class ServerFiles {
     int removeLeftovers();
     /// Not on the disk before finishCopy.
     void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
+    int highestVersion(std::string_view path);
+    void raiseHighestVersion(std::string_view path, int number);
     /// Brings all to the disk, and removes what copies left that were killed. Nobody else may be
     /// at work.
     void finishCopy();

@@ -442,6 +442,10 @@ class SqliteEngine : public StoreEngine {
                       std::istream& from) override {
         m_files.placeVersion(path, version, from);
     }
+    int highestVersion(std::string_view path) override { return m_files.highestVersion(path); }
+    void raiseHighestVersion(std::string_view path, int number) override {
+        m_files.raiseHighestVersion(path, number);
+    }
     void finishCopy() override { setKind(m_database, applicationId); }
 
   protected:

@@ -395,6 +395,40 @@ TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
     }
 }
 
+TEST_F(TintgateStore, IsReadWhereItCannotBeWritten) {
+    makeTicket(3, 7, awkwardContent());
+    answer({"file", "put", m_folder.write("small", "old"), "chart"});
+    const std::string much = m_folder.write("much", std::string(300'000, 'x'));
+    const std::string exported = answer({"export"});
+    support::RunOptions options;
+    options.environment = {{"TINTGATE_STORE", m_address}};
+    const auto expectReadOnly = [&](const std::vector<std::string>& start, int refusal) {
+        const auto runThere = [&](std::vector<std::string> arguments) {
+            arguments.insert(arguments.begin(), TINTGATE_STORE_PROGRAM);
+            arguments.insert(arguments.begin(), start.begin(), start.end());
+            return support::run(arguments, options);
+        };
+        EXPECT_EQ(runThere({"file", "put", much, "chart"}).exitCode, refusal);
+        EXPECT_EQ(runThere({"key", "set", "job/7", "big", "string", std::string(120'000, 'x')})
+                      .exitCode,
+                  refusal);
+        EXPECT_TRUE(runThere({"export"}).output == exported);
+        EXPECT_EQ(runThere({"file", "get", "chart", "-"}).output, "old");
+        EXPECT_EQ(runThere({"info"}).exitCode, 0);
+    };
+    expectReadOnly({"prlimit", "--fsize=100000"}, 8);
+    EXPECT_EQ(open()->versions("chart").size(), 0u);
+
+    const std::string mount = "mount -o bind,ro \"$TINTGATE_STORE\" \"$TINTGATE_STORE\" && ";
+    const std::vector<std::string> mounted = {"unshare", "-m", "sh", "-c", mount + "\"$@\"", "sh"};
+    auto probe = mounted;
+    probe.emplace_back("true");
+    if (const auto tried = support::run(probe, options); tried.exitCode != 0) {
+        GTEST_SKIP() << "no mount of its own: " << tried.error;
+    }
+    expectReadOnly(mounted, 7);
+}
+
 /// The fixture's store is a folder, and there is a database for a copy of it.
 class StoreCopy : public TintgateStore {
   protected:
@@ -413,8 +447,11 @@ class StoreCopy : public TintgateStore {
         for (const std::string content : {"one", "", "three", "four"}) {
             std::istringstream from(content);
             engine->putFile("jobs/7.jdf", from);
+            from.seekg(0);
+            engine->putFile("jobs/8.jdf", from);
         }
         engine->pruneVersions("jobs/7.jdf", 2); // So that they do not start at 1.
+        engine->pruneVersions("jobs/8.jdf", 0);
     }
 
     /// All that a store holds.
@@ -443,12 +480,18 @@ class StoreCopy : public TintgateStore {
 TEST_F(StoreCopy, ThereAndBackIsTheSameToTheBit) {
     const std::string before = allOf(m_address);
     EXPECT_THAT(answer({"copy", m_address, "room"}),
-                HasSubstr("3 tickets, 1001 files and 1 user\n"));
+                HasSubstr("3 tickets, 1002 files and 1 user\n"));
     EXPECT_TRUE(allOf("room") == before);
     answer({"copy", "room", back});
     EXPECT_TRUE(allOf(back) == before);
     for (const std::string& address : {m_address, std::string("room"), back}) {
         EXPECT_EQ(answer({"--store", address, "ticket", "create", "job"}), "job/91\n");
+        const auto engine = store::openStore(address);
+        for (const char* path : {"jobs/7.jdf", "jobs/8.jdf"}) {
+            std::istringstream from("five");
+            engine->putFile(path, from);
+            EXPECT_EQ(engine->versions(path).back().number, 4) << address << ' ' << path;
+        }
     }
     expectRefusal({"copy", m_address, "room"}, 2, "already");
     expectRefusal({"copy", m_folder.path("none"), m_folder.path("new")}, 4, "none");

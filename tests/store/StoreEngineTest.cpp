@@ -131,7 +131,7 @@ TEST_P(StoreEngine, AChangeMakesItsTicketWithAllKeysOrNone) {
     const auto engine = open();
     const auto other = open();
     for (const bool replace : {true, false}) {
-        const store::Scope scope{.everything = replace, .keys = {{"a", false}}, .make = true};
+        const store::Scope scope{.everything = replace, .make = true, .keys = {{"a", false}}};
         const auto put = [&](const char* records) {
             return [=](store::TicketContent& content) {
                 content.apply(support::RecordTable(records).records());

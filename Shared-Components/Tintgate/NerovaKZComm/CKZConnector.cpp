@@ -11,6 +11,9 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "base/WideBytes.h"
+#include "jobkeys/JobState.h"
+#include "jobkeys/Lookups.h"
+#include "jobkeys/Tickets.h"
 #include "text/StringUtilsComGUI.h"
 #include "ticket/ParameterTables.h"
 
@@ -18,7 +21,6 @@ namespace {
 
 constexpr int serverPort = 50005;
 constexpr int oldestServer = 5;
-constexpr int jobTickets = 3;
 
 // UTF-8, but byte for byte where a path is none.
 std::string pathBytes(const wxString& path) {
@@ -55,10 +57,10 @@ struct JobStatus {
 };
 
 bool isToBeVerified(const JobStatus& job, bool remeasure) {
-    constexpr int unsuitableFileType = 4096;
-    const bool suitable = job.fileType != unsuitableFileType;
-    const bool isWaiting = job.displayStatus == 208;
-    const bool isMeasured = job.displayStatus >= 209 && job.displayStatus <= 212;
+    const bool suitable = job.fileType != jobkeys::unsuitableFileType;
+    const bool isWaiting = job.displayStatus == jobkeys::waitingStatus;
+    const bool isMeasured =
+        job.displayStatus > jobkeys::waitingStatus && job.displayStatus <= jobkeys::failedStatus;
     return remeasure ? (isMeasured && suitable) || (isWaiting && job.verifyActive == 1)
                      : (isWaiting || job.showInVerifier == 1) && suitable;
 }
@@ -147,14 +149,14 @@ int CKZConnector::Read(int type, int id, const char* key, PARAM_TYPE ptype, void
 int CKZConnector::GetJobStatus(int jobID, int* displayStatus, int* subType, int* fileType,
                                int* showInVerifier, int* verifyActive) {
     const auto read = [&](const char* key, int* out) {
-        Read(jobTickets, jobID, key, PARAM_INT, out, POSITION_WHOLE);
+        Read(jobkeys::jobType, jobID, key, PARAM_INT, out, POSITION_WHOLE);
     };
-    read("Input/SubType", subType);
-    read("Job/Display/Status", displayStatus);
-    read("Remote/ShowInVerifier", showInVerifier);
-    read("Input/FileType", fileType);
-    read("Workflow/Verify/Active", verifyActive);
-    *verifyActive = *verifyActive == 3 ? 1 : 0;
+    read(jobkeys::subTypeKey, subType);
+    read(jobkeys::displayStatusKey, displayStatus);
+    read(jobkeys::showInVerifierKey, showInVerifier);
+    read(jobkeys::fileTypeKey, fileType);
+    read(jobkeys::verifyActiveKey, verifyActive);
+    *verifyActive = *verifyActive == jobkeys::activeForTwoStrips ? 1 : 0;
     return 0;
 }
 
@@ -212,7 +214,8 @@ int CKZConnector::GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure)
     }
     int number = 0;
     int size = sizeof number;
-    if (m_manager->GetTicketData(jobTickets, numberKind, 0, &size, &number) != 0 || number < 1) {
+    if (m_manager->GetTicketData(jobkeys::jobType, numberKind, 0, &size, &number) != 0 ||
+        number < 1) {
         return -1;
     }
     const ticket::Block<int> all = roomForIds(number);
@@ -222,7 +225,7 @@ int CKZConnector::GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure)
     }
     *ids = selected.release();
     size = number * static_cast<int>(sizeof(int));
-    if (m_manager->GetTicketData(jobTickets, idsKind, 0, &size, all.get()) != 0) {
+    if (m_manager->GetTicketData(jobkeys::jobType, idsKind, 0, &size, all.get()) != 0) {
         return -1; // *ids stays with the caller (C115).
     }
     // Jobs may have gone since they were counted.
@@ -275,17 +278,17 @@ int CKZConnector::GetReferenceProfilePath(int jobID, int strip, std::wstring* pa
     }
     const char* text = nullptr;
     const auto read = [&](const char* key) {
-        return GetJobTicketKeyValue(jobTickets, jobID, key, PARAM_STRING, &text, nullptr,
+        return GetJobTicketKeyValue(jobkeys::jobType, jobID, key, PARAM_STRING, &text, nullptr,
                                     POSITION_WHOLE);
     };
     int result = -1;
-    if (strip == 1) {
-        result = read("Footer/ControlstripInputProfile");
-    } else if (strip == 2) {
-        result = read("Footer/ControlstripInputProfile2");
+    for (const jobkeys::Strip known : jobkeys::strips) {
+        if (strip == numberOf(known)) {
+            result = read(stripKey(known, jobkeys::stripProfileKey).c_str());
+        }
     }
     if (result != 0 || text == nullptr || *text == '\0') {
-        result = read("Remote/UsedICCProfile");
+        result = read(jobkeys::usedProfileKey);
     }
     if (result == 0 && text != nullptr) {
         *path = StringUtilsComGUI::wstringFromstring(text);

@@ -5,6 +5,7 @@
 #include <wx/filename.h>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/RefusingPlugIn.h"
+#include "jobkeys/Tickets.h"
 #include "measure/Helper.h"
 #include "platform/PlugIn.h"
 #include "platform/SystemRoot.h"
@@ -19,11 +20,9 @@ namespace {
 
 const wchar_t* const pszLibName = L"ComGUI.Bundle";
 
-constexpr int verifierApplication = 0x5071103;
 constexpr int defaultPort = 50005;
 constexpr int firstLocalPort = 50006;
 constexpr int lastLocalPort = 50026;
-constexpr int systemTicketType = 0;
 constexpr int systemTicketID = 0;
 
 using OwnedString = platform::Owned<CFStringRef>;
@@ -162,7 +161,7 @@ int ComGUIManager::Initialize(const char* user, const char* password, const char
                               int applicationID) {
     static std::int32_t localPort = firstLocalPort; // Of the process (C96).
     m_record->clientLevelCompanion = 1;
-    m_record->clientLevel = applicationID == verifierApplication ? 7 : 5;
+    m_record->clientLevel = applicationID == jobkeys::verifierApplication ? 7 : 5;
     m_record->reservedFlag = 0;
     setField(m_record->user, user);
     setField(m_record->password, password);
@@ -193,9 +192,10 @@ int ComGUIManager::Login(const char* user, const char* password, const char* ser
     if (code == 0) {
         const char* const address = m_record->server;
         const char* const name =
-            m_container == nullptr ? address
-                                   : m_container->GetPszParameter(systemTicketType, systemTicketID,
-                                                                  "System/ServerName", address);
+            m_container == nullptr
+                ? address
+                : m_container->GetPszParameter(jobkeys::systemType, systemTicketID,
+                                               "System/ServerName", address);
         m_serverName = StringUtilsComGUI::wstringFromstring(name == nullptr ? address : name);
         m_serverIP = StringUtilsComGUI::wstringFromstring(address);
     }
@@ -234,7 +234,7 @@ const MTICKET_ADMIN* ComGUIManager::GetClientContainer() {
     if (container == nullptr) {
         return nullptr;
     }
-    if (container->TicketExists(systemTicketType, systemTicketID)) {
+    if (container->TicketExists(jobkeys::systemType, systemTicketID)) {
         m_container = container;
     } else {
         m_table.Logout(m_instance, m_record->session);

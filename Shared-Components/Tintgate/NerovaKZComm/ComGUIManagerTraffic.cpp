@@ -7,6 +7,7 @@
 #include <wx/debug.h>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/TicketSearch.h"
+#include "jobkeys/Tickets.h"
 #include "platform/CoreFoundationStrings.h"
 #include "text/CharSetsWx.h"
 #include "ticket/ParameterTables.h"
@@ -16,7 +17,6 @@
 
 namespace {
 
-constexpr int systemTicketType = 0;
 constexpr int systemTicketID = 0;
 
 int codeOf(bool found) {
@@ -81,7 +81,7 @@ int ComGUIManager::GetParameter(int type, int id, const char* key, PARAM_TYPE pt
 
 int ComGUIManager::GetSystemTicketParamForKey(const char* key, PARAM_TYPE ptype, void* out,
                                               int position) {
-    return codeOf(ticket::Contained(*m_container, systemTicketType, systemTicketID)
+    return codeOf(ticket::Contained(*m_container, jobkeys::systemType, systemTicketID)
                       .get(key, ptype, out, position));
 }
 

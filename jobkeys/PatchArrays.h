@@ -1,8 +1,10 @@
-// The arrays in which a ticket holds a strip's patches: below the root of the measurement, or of
-// its references, one key for each column, with one element for each patch.
+// The arrays in which a ticket stores a strip's patches, below the root of the measurement or of
+// its references. Each key is one column, with one element for each patch.
 #pragma once
 
-/// Arrays of more patches count as memory that is not there.
+namespace jobkeys {
+
+/// The most patches that an array may have. A larger number counts as a failed allocation.
 inline constexpr int mostPatches = 1'000'000;
 
 inline constexpr const char* xyzArrays[] = {"XYZValues/XValues", "XYZValues/YValues",
@@ -12,3 +14,5 @@ inline constexpr const char* labArrays[] = {"LabValues/LValues", "LabValues/AVal
 inline constexpr const char* cmykArrays[] = {"CMYKValues/CValues", "CMYKValues/MValues",
                                              "CMYKValues/YValues", "CMYKValues/KValues"};
 inline constexpr const char* spectralArray = "SpectralValues/DValues"; ///< Patch after patch.
+
+} // namespace jobkeys

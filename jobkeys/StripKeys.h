@@ -9,7 +9,16 @@
 #include <string>
 #include <string_view>
 
+namespace jobkeys {
+
 enum class Strip { first, second };
+
+inline constexpr Strip strips[] = {Strip::first, Strip::second};
+
+/// 1 or 2.
+constexpr int numberOf(Strip strip) {
+    return strip == Strip::first ? 1 : 2;
+}
 
 /// The strip selector of a call. Nothing if the text does not start with a whole number, or if the
 /// number does not fit an int.
@@ -22,12 +31,12 @@ inline std::optional<int> stripSelectorOf(const std::wstring& text) {
 }
 
 /// Of KZJobDataStruct::secondStrip: 0 is the first strip, any other value the second (C28).
-inline Strip stripOf(int secondStrip) {
+constexpr Strip stripOf(int secondStrip) {
     return secondStrip == 0 ? Strip::first : Strip::second;
 }
 
 /// The root of a strip's measurement, without a slash at its end.
-inline std::string_view measurementRoot(Strip strip) {
+constexpr std::string_view measurementRoot(Strip strip) {
     return strip == Strip::first ? "Remote/Measurement" : "Remote/Measurement2";
 }
 
@@ -36,7 +45,14 @@ inline std::string measurementKey(Strip strip, std::string_view name) {
     return std::string(measurementRoot(strip)).append("/").append(name);
 }
 
+/// The key of a name below the references that the strip's measurement contains.
+inline std::string referenceKey(Strip strip, std::string_view name) {
+    return measurementKey(strip, "Reference/").append(name);
+}
+
 /// The strip's form of a key such as "Footer/ControlstripFile".
 inline std::string stripKey(Strip strip, std::string_view key) {
     return std::string(key).append(strip == Strip::first ? "" : "2");
 }
+
+} // namespace jobkeys

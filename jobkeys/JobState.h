@@ -1,0 +1,30 @@
+// The keys by which clients choose jobs, and what their values mean.
+#pragma once
+
+#include <array>
+#include <string_view>
+
+namespace jobkeys {
+
+inline constexpr const char* subTypeKey = "Input/SubType";
+inline constexpr const char* displayStatusKey = "Job/Display/Status";
+inline constexpr const char* showInVerifierKey = "Remote/ShowInVerifier";
+inline constexpr const char* fileTypeKey = "Input/FileType";
+inline constexpr const char* verifyActiveKey = "Workflow/Verify/Active";
+
+/// In the order in which a client reads them.
+inline constexpr std::array<std::string_view, 5> overviewKeys = {
+    subTypeKey, displayStatusKey, showInVerifierKey, fileTypeKey, verifyActiveKey};
+
+// Of displayStatusKey.
+inline constexpr int waitingStatus = 208;
+inline constexpr int verifiedStatus = 211;
+inline constexpr int failedStatus = 212;
+
+/// Of fileTypeKey: a file that is never verified.
+inline constexpr int unsuitableFileType = 4096;
+
+/// Of verifyActiveKey.
+inline constexpr int activeForTwoStrips = 3;
+
+} // namespace jobkeys
