@@ -233,14 +233,15 @@ PGconn* Connection::connect(const LibPq& pq, const std::string& service, const S
     const std::string passwords = passwordFile(said);
     std::vector<const char*> names = {"service", "fallback_application_name", "passfile"};
     std::vector<const char*> values = {service.c_str(), "tintgate", passwords.c_str()};
-    const auto unlessSaid = [&](const char* name, const std::string& value) {
+    // The value must live until the connection has been made.
+    const auto unlessSaid = [&](const char* name, const char* value) {
         if (postgres::said(said, name) == 0) {
             names.push_back(name);
-            values.push_back(value.c_str());
+            values.push_back(value);
         }
     };
-    unlessSaid("connect_timeout", connectLimit);
-    unlessSaid("tcp_user_timeout", wayLimit);
+    unlessSaid("connect_timeout", connectLimit.c_str());
+    unlessSaid("tcp_user_timeout", wayLimit.c_str());
     // So that no firewall forgets a connection that waits for a measurement.
     unlessSaid("keepalives_idle", "60");
     unlessSaid("keepalives_interval", "10");
