@@ -137,7 +137,7 @@ void addPatch(Comparison& c, std::uint32_t selectedRow, std::uint32_t targetRow,
         c.measurement.rows.push_back(measuredRow);
 }
 
-/// Every row that a file has beside the partner of a row of the selection makes a further patch.
+/// Repeats make further patches: each row that pairs again adds one.
 void addRepeatedRows(Comparison& c) {
     struct Again {
         std::vector<std::uint32_t> target, measurement;

@@ -27,7 +27,7 @@ struct Warning {
     bool keepsOpen = false; ///< Because of this the verdict is at best "incomplete".
 };
 
-/// A row of the measurement that is part of a patch beside the patch's own row.
+/// A further reading of a patch: a row of the measurement other than the patch's own.
 struct FurtherReading {
     std::uint32_t row;
     std::uint32_t patch;

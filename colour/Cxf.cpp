@@ -113,7 +113,7 @@ const Value* valueOf(const Content& content, const Object& object, Value::Kind k
             continue;
         }
         const bool usual =
-            value.specification == nullptr || value.specification->conditions.areUsual();
+            value.colorSpecification == nullptr || value.colorSpecification->conditions.areUsual();
         const int rank = 1 + (value.condition == condition ? 2 : 0) + (usual ? 1 : 0);
         if (rank > bestRank) {
             best = &value;
@@ -557,7 +557,7 @@ class SetReader {
                    axis.length != m_table->set.axis.length) {
             m_axesDiffer = true;
         }
-        m_spectralSpecification = value.specification;
+        m_spectralSpecification = value.colorSpecification;
         return true;
     }
 
@@ -565,16 +565,16 @@ class SetReader {
     /// Step 0 if they can't be told.
     SpectralAxis axisOf(const Value& value, std::size_t count) const {
         const auto length = static_cast<int>(std::min<std::size_t>(count, 100'000));
-        const Specification* const specification = value.specification;
+        const ColorSpecification* const colorSpecification = value.colorSpecification;
         const auto own = value.spectrum.attribute("StartWL").as_int(0);
-        int base = own > 0                    ? own
-                   : specification != nullptr ? specification->firstWavelength.value_or(0)
-                                              : 0;
+        int base = own > 0                         ? own
+                   : colorSpecification != nullptr ? colorSpecification->firstWavelength.value_or(0)
+                                                   : 0;
         if (base <= 0) {
             base = length == 31 ? 400 : 380;
         }
-        if (specification != nullptr && specification->increment) {
-            return {base, *specification->increment, length};
+        if (colorSpecification != nullptr && colorSpecification->increment) {
+            return {base, *colorSpecification->increment, length};
         }
         constexpr int earliestEnd = 700;
         constexpr int latestEnd = 830;
@@ -591,17 +591,18 @@ class SetReader {
     struct Light {
         bool seen = false;
         Conditions stated; ///< If any value is not for D50 and 2 degrees, the first such statement.
-        const Specification* last = nullptr;
+        const ColorSpecification* last = nullptr;
     };
 
     /// Usual statements that differ (one value states D50, another one nothing) cancel out.
     void see(const Value& value, Light& light) {
-        if (light.seen && value.specification == light.last) {
+        if (light.seen && value.colorSpecification == light.last) {
             return;
         }
-        light.last = m_lastSpecification = value.specification;
-        const Conditions stated =
-            value.specification != nullptr ? value.specification->conditions : Conditions{};
+        light.last = m_lastSpecification = value.colorSpecification;
+        const Conditions stated = value.colorSpecification != nullptr
+                                      ? value.colorSpecification->conditions
+                                      : Conditions{};
         if (!std::exchange(light.seen, true) || (light.stated.areUsual() && !stated.areUsual())) {
             light.stated = stated;
         } else if (light.stated.areUsual()) {
@@ -731,10 +732,10 @@ class SetReader {
         set.originator = bounded(text(information, "Creator"));
         set.created = bounded(text(information, "CreationDate"));
         set.descriptor = bounded(text(information, "Description"));
-        const Specification* const specification =
+        const ColorSpecification* const colorSpecification =
             m_spectralSpecification != nullptr ? m_spectralSpecification : m_lastSpecification;
-        if (specification != nullptr) {
-            set.instrumentation = bounded(specification->instrument);
+        if (colorSpecification != nullptr) {
+            set.instrumentation = bounded(colorSpecification->instrument);
         }
         if (!m_document.hasNamespace()) {
             m_notes.add("The file does not state the namespace of its elements.");
@@ -756,8 +757,8 @@ class SetReader {
     Light m_labLight;
     Light m_xyzLight;
     bool m_usual = true;
-    const Specification* m_lastSpecification = nullptr;
-    const Specification* m_spectralSpecification = nullptr;
+    const ColorSpecification* m_lastSpecification = nullptr;
+    const ColorSpecification* m_spectralSpecification = nullptr;
 };
 
 Failure readFile(std::string_view utf8, const CgatsWants& wants, DataSet& set) {

@@ -78,30 +78,31 @@ class Reader {
         return std::string(textOf(m_document.child(parent, name), storage));
     }
 
-    Specification specificationOf(pugi::xml_node node) const {
-        Specification specification;
+    ColorSpecification specificationOf(pugi::xml_node node) const {
+        ColorSpecification colorSpecification;
         const pugi::xml_node tristimulus = m_document.child(node, "TristimulusSpec");
-        specification.conditions.illuminant = text(tristimulus, "Illuminant");
+        colorSpecification.conditions.illuminant = text(tristimulus, "Illuminant");
         if (m_document.child(tristimulus, "CustomIlluminant")) {
-            specification.conditions.illuminant = "custom";
+            colorSpecification.conditions.illuminant = "custom";
         }
         const std::string observer = text(tristimulus, "Observer");
-        specification.conditions.observer = observer == "2_Degree"    ? "2"
-                                            : observer == "10_Degree" ? "10"
-                                                                      : "";
+        colorSpecification.conditions.observer = observer == "2_Degree"    ? "2"
+                                                 : observer == "10_Degree" ? "10"
+                                                                           : "";
         const pugi::xml_node measurement = m_document.child(node, "MeasurementSpec");
         const pugi::xml_node range = m_document.child(measurement, "WavelengthRange");
-        specification.firstWavelength = wholeNumber(range.attribute("StartWL").value());
-        specification.increment = wholeNumber(range.attribute("Increment").value());
+        colorSpecification.firstWavelength = wholeNumber(range.attribute("StartWL").value());
+        colorSpecification.increment = wholeNumber(range.attribute("Increment").value());
         const pugi::xml_node device = m_document.child(measurement, "Device");
-        specification.condition = measuredUnder(device);
+        colorSpecification.condition = measuredUnder(device);
         for (const char* part : {"Manufacturer", "Model", "SerialNumber"}) {
             const std::string word = text(device, part);
             if (!word.empty()) {
-                specification.instrument += (specification.instrument.empty() ? "" : " ") + word;
+                colorSpecification.instrument +=
+                    (colorSpecification.instrument.empty() ? "" : " ") + word;
             }
         }
-        return specification;
+        return colorSpecification;
     }
 
     /// The illumination first: a filter for M2 or a polariser is mentioned beside it, too.
@@ -117,7 +118,7 @@ class Reader {
         return text(device, "DeviceFilter") == "Filter_UVExcluded" ? std::int8_t{2} : unstated;
     }
 
-    const Specification* specificationNamed(const char* id) {
+    const ColorSpecification* specificationNamed(const char* id) {
         // Nearly always that of the object before.
         if (m_lastId != id) {
             const auto found = m_content.specifications.find(id);
@@ -240,9 +241,9 @@ class Reader {
         } else {
             value.sound = numbers(node, m_partNames[kind - 1U], value.numbers, next);
         }
-        value.specification = specificationNamed(node.attribute("ColorSpecification").value());
-        if (value.specification != nullptr) {
-            value.condition = value.specification->condition;
+        value.colorSpecification = specificationNamed(node.attribute("ColorSpecification").value());
+        if (value.colorSpecification != nullptr) {
+            value.condition = value.colorSpecification->condition;
         }
         if (value.condition == unstated) {
             value.condition = conditionIn(objectType);
@@ -267,7 +268,7 @@ class Reader {
     std::string m_storage;
     Content m_content;
     std::string_view m_lastId = "\xFF"; // No attribute has this byte alone.
-    const Specification* m_last = nullptr;
+    const ColorSpecification* m_last = nullptr;
 };
 
 } // namespace

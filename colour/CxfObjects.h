@@ -17,7 +17,7 @@ namespace colour::cxf {
 inline constexpr std::int8_t unstated = -1;
 
 /// A ColorSpecification.
-struct Specification {
+struct ColorSpecification {
     Conditions conditions; ///< Illuminant and observer alone.
     std::int8_t condition = unstated;
     std::optional<int> firstWavelength;
@@ -30,10 +30,11 @@ struct Value {
     enum Kind : std::uint8_t { Spectrum, Lab, LCh, Xyz };
     Kind kind = Lab;
     bool sound = false; ///< The numbers are there and are numbers; a spectrum's text is not read.
-    double numbers[3] = {};                       ///< In the order of the kind's name.
-    pugi::xml_node spectrum;                      ///< Of a Spectrum alone.
-    const Specification* specification = nullptr; ///< Null if it names none that is there.
-    std::int8_t condition = unstated;             ///< Also by the object's type.
+    double numbers[3] = {};  ///< In the order of the kind's name.
+    pugi::xml_node spectrum; ///< Of a Spectrum alone.
+    const ColorSpecification* colorSpecification =
+        nullptr;                      ///< Null if it names none that is there.
+    std::int8_t condition = unstated; ///< Also by the object's type.
 };
 
 /// What the values of an object's DeviceColorValues are.
@@ -64,7 +65,7 @@ Place placeOf(const Document& document, const Object& object);
 
 /// All of a file, in its order. Views and nodes point into the document.
 struct Content {
-    std::unordered_map<std::string_view, Specification> specifications;
+    std::unordered_map<std::string_view, ColorSpecification> specifications;
     std::vector<Object> objects; ///< With device values or colours that are known; no others.
     std::vector<Value> values;
 };

@@ -55,7 +55,7 @@ class CKZConnector {
     int GetJobTicketKeyValue(int type, int id, const char* key, PARAM_TYPE ptype, void* out,
                              void* fallback, int position);
 
-    /// Always 0 (C113): *count tells what came. At most `maximum` elements are stored in values, as
+    /// Always 0 (C113): *count is what came. At most `maximum` elements are stored in values, as
     /// ints for PARAM_INT and doubles for PARAM_DOUBLE; other types touch nothing.
     int GetJobTicketKeyArrayValues(int type, int id, const char* key, PARAM_TYPE ptype, int maximum,
                                    int* count, void* values);

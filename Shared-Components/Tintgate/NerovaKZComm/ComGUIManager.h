@@ -74,8 +74,8 @@ class ComGUIManager {
     void Logout();
     /// Result of the plug-in.
     int Uninitialize();
-    /// 0 if the server answers (C98), else COMERR_NOT_ALIVE. Needs no login. A null host stands for
-    /// the record's server, port 0 for 50005.
+    /// 0 if the server answers (C98), otherwise COMERR_NOT_ALIVE. Needs no login. A null host means
+    /// the record's server, port 0 means 50005.
     int IsAlive(const char* host, int port);
 
     /// The session's tickets, or null. Where none are held the plug-in is asked again, and what it
