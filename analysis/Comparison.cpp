@@ -21,27 +21,33 @@ int load(const std::wstring& path, const colour::CgatsWants& wants, Input& input
 }
 
 int loadSide(const std::wstring& path, const colour::CgatsWants& wants, Input& input) {
-    if (const int status = load(path, wants, input))
+    if (const int status = load(path, wants, input)) {
         return status;
+    }
     return input.file.set && !input.file.set->hasColour() ? exitNoColourValues : exitDone;
 }
 
 /// A patch set selects by process colours, so it must be a text that has them.
 int loadPatchSet(const std::wstring& path, Input& input) {
-    if (const int status = load(path, {.spectra = false}, input))
+    if (const int status = load(path, {.spectra = false}, input)) {
         return status;
-    if (input.file.profile)
+    }
+    if (input.file.profile) {
         return exitPatchSetNotText;
+    }
     return input.file.set->hasCmyk() ? exitDone : exitNoDeviceValues;
 }
 
 int loadAll(const ComparisonPaths& paths, bool keepSpectra, Comparison& c) {
     const std::string& condition = paths.condition;
-    if (const int status = loadSide(paths.target, {.spectra = false, .condition = condition}, c.target))
+    if (const int status =
+            loadSide(paths.target, {.spectra = false, .condition = condition}, c.target)) {
         return status;
+    }
     if (const int status = loadSide(
-            paths.measurement, {.spectra = keepSpectra, .condition = condition}, c.measurement))
+            paths.measurement, {.spectra = keepSpectra, .condition = condition}, c.measurement)) {
         return status;
+    }
     return paths.patchSet.empty() ? exitDone : loadPatchSet(paths.patchSet, c.patchSet);
 }
 
@@ -59,17 +65,21 @@ bool varies(const DataSet& set) {
 /// values vary, such columns were never filled in, and would make every patch paper.
 void dropPlaceholders(Comparison& c) {
     const auto isPlaceholder = [&](const DataSet& set) {
-        if (!set.hasDevice() || varies(set))
+        if (!set.hasDevice() || varies(set)) {
             return false;
-        for (const Input* other : {&c.target, &c.measurement, &c.patchSet})
+        }
+        for (const Input* other : {&c.target, &c.measurement, &c.patchSet}) {
             if (other->file.set && other->file.set->deviceSpace == set.deviceSpace &&
-                other->file.set->patchCount == set.patchCount && varies(*other->file.set))
+                other->file.set->patchCount == set.patchCount && varies(*other->file.set)) {
                 return true;
+            }
+        }
         return false;
     };
     for (Input* input : {&c.target, &c.measurement}) {
-        if (!input->file.set || !isPlaceholder(*input->file.set))
+        if (!input->file.set || !isPlaceholder(*input->file.set)) {
             continue;
+        }
         input->file.set->deviceSpace = colour::DeviceSpace::None;
         input->file.set->channels.clear();
         input->file.set->device.clear();
@@ -80,20 +90,26 @@ void dropPlaceholders(Comparison& c) {
 }
 
 Input* selectionOf(Comparison& c) {
-    for (Input* input : {&c.patchSet, &c.target, &c.measurement})
-        if (input->file.set)
+    for (Input* input : {&c.patchSet, &c.target, &c.measurement}) {
+        if (input->file.set) {
             return input;
+        }
+    }
     return nullptr;
 }
 
 const Input* devicesOf(const Comparison& c) {
     const Input* const inputs[] = {c.selection, &c.target, &c.measurement};
-    for (const Input* input : inputs)
-        if (input->file.set && input->file.set->hasCmyk())
+    for (const Input* input : inputs) {
+        if (input->file.set && input->file.set->hasCmyk()) {
             return input;
-    for (const Input* input : inputs)
-        if (input->file.set && input->file.set->hasDevice())
+        }
+    }
+    for (const Input* input : inputs) {
+        if (input->file.set && input->file.set->hasDevice()) {
             return input;
+        }
+    }
     return nullptr;
 }
 
@@ -113,8 +129,9 @@ int pair(const Comparison& c, Input& input) {
 }
 
 bool has(const Comparison& c, const Input& input, std::uint32_t selectedRow) {
-    if (input.file.profile)
+    if (input.file.profile) {
         return isProcessOnly(*c.selection->file.set, selectedRow);
+    }
     return input.pairing.partner[selectedRow] != noRow;
 }
 
@@ -122,8 +139,9 @@ bool has(const Comparison& c, const Input& input, std::uint32_t selectedRow) {
 /// then from the first on again.
 std::uint32_t rowInTurn(const Input& input, std::uint32_t selectedRow,
                         const std::vector<std::uint32_t>& again, std::size_t k) {
-    if (!input.file.set)
+    if (!input.file.set) {
         return noRow;
+    }
     k %= again.size() + 1;
     return k == 0 ? input.pairing.partner[selectedRow] : again[k - 1];
 }
@@ -131,10 +149,12 @@ std::uint32_t rowInTurn(const Input& input, std::uint32_t selectedRow,
 void addPatch(Comparison& c, std::uint32_t selectedRow, std::uint32_t targetRow,
               std::uint32_t measuredRow) {
     c.selectedRow.push_back(selectedRow);
-    if (c.target.file.set)
+    if (c.target.file.set) {
         c.target.rows.push_back(targetRow);
-    if (c.measurement.file.set)
+    }
+    if (c.measurement.file.set) {
         c.measurement.rows.push_back(measuredRow);
+    }
 }
 
 /// Repeats make further patches: each row that pairs again adds one.
@@ -143,48 +163,60 @@ void addRepeatedRows(Comparison& c) {
         std::vector<std::uint32_t> target, measurement;
     };
     std::map<std::uint32_t, Again> repeats;
-    for (const RowPair& pair : c.target.pairing.again)
+    for (const RowPair& pair : c.target.pairing.again) {
         repeats[pair.left].target.push_back(pair.right);
-    for (const RowPair& pair : c.measurement.pairing.again)
+    }
+    for (const RowPair& pair : c.measurement.pairing.again) {
         repeats[pair.left].measurement.push_back(pair.right);
+    }
     for (const auto& [row, again] : repeats) {
-        if (!has(c, c.target, row) || !has(c, c.measurement, row))
+        if (!has(c, c.target, row) || !has(c, c.measurement, row)) {
             continue;
+        }
         const std::size_t count = std::max(again.target.size(), again.measurement.size());
-        for (std::size_t k = 1; k <= count; ++k)
+        for (std::size_t k = 1; k <= count; ++k) {
             addPatch(c, row, rowInTurn(c.target, row, again.target, k),
                      rowInTurn(c.measurement, row, again.measurement, k));
+        }
     }
 }
 
 /// The patches are those of the selection that both sides have.
 int selectPatches(Comparison& c) {
     c.selection = selectionOf(c);
-    if (!c.selection)
+    if (!c.selection) {
         return exitNoDeviceValues; // two profiles, and nothing that says where to evaluate them
+    }
     c.devices = devicesOf(c);
-    for (Input* input : {&c.target, &c.measurement, &c.patchSet})
-        if (input->file.set || input->file.profile)
-            if (const int status = pair(c, *input))
+    for (Input* input : {&c.target, &c.measurement, &c.patchSet}) {
+        if (input->file.set || input->file.profile) {
+            if (const int status = pair(c, *input)) {
                 return status;
+            }
+        }
+    }
 
     const auto rows = static_cast<std::uint32_t>(c.selection->file.set->patchCount);
     c.selectedRow.reserve(rows);
-    for (Input* side : {&c.target, &c.measurement})
-        if (side->file.set)
+    for (Input* side : {&c.target, &c.measurement}) {
+        if (side->file.set) {
             side->rows.reserve(rows);
+        }
+    }
     for (std::uint32_t row = 0; row < rows; ++row) {
-        if (has(c, c.target, row) && has(c, c.measurement, row))
+        if (has(c, c.target, row) && has(c, c.measurement, row)) {
             addPatch(c, row, rowInTurn(c.target, row, {}, 0), rowInTurn(c.measurement, row, {}, 0));
-        else
+        } else {
             c.selection->unpaired.push_back(row);
+        }
     }
     addRepeatedRows(c);
     c.patchSet.rows = c.patchSet.file.set ? c.selectedRow : std::vector<std::uint32_t>();
     // A patch set picks from the files, so what it leaves there is not missed.
-    if (c.selection == &c.target && c.measurement.file.set)
+    if (c.selection == &c.target && c.measurement.file.set) {
         c.measurement.unpaired =
             rowsLeft(c.measurement.pairing, c.measurement.file.set->patchCount);
+    }
     return c.selectedRow.empty() ? exitNothingToPair : exitDone;
 }
 
@@ -193,16 +225,19 @@ int labOf(const Comparison& c, const Input& side, std::vector<Lab>& lab) {
     const std::size_t count = c.selectedRow.size();
     lab.resize(count);
     if (side.file.set) {
-        for (std::size_t i = 0; i < count; ++i)
+        for (std::size_t i = 0; i < count; ++i) {
             lab[i] = side.file.set->lab[side.rows[i]];
+        }
         return exitDone;
     }
     const DataSet& selection = *c.selection->file.set;
     const std::size_t channels = selection.channels.size();
     std::vector<double> cmyk(count * 4);
-    for (std::size_t i = 0; i < count; ++i)
-        for (std::size_t ink = 0; ink < 4; ++ink)
+    for (std::size_t i = 0; i < count; ++i) {
+        for (std::size_t ink = 0; ink < 4; ++ink) {
             cmyk[i * 4 + ink] = selection.device[c.selectedRow[i] * channels + ink];
+        }
+    }
     return statusOf(side.file.profile->evaluate(cmyk.data(), count, 4, lab.data()));
 }
 
@@ -214,45 +249,53 @@ std::string patches(std::size_t count) {
 void warnOfPairing(Comparison& c, const Input& side) {
     const std::string role = roleOf(c, side);
     const Pairing& pairing = side.pairing;
-    if (pairing.spacesDiffer)
+    if (pairing.spacesDiffer) {
         c.warnings.push_back({"deviceSpacesDiffer",
                               "The device values of the " + role + " and of the " +
                                   roleOf(c, *c.selection) +
                                   " are of different kinds, so nothing proves that equal labels "
                                   "or places mean equal patches.",
                               true});
-    if (pairing.by == PairedBy::Order)
+    }
+    if (pairing.by == PairedBy::Order) {
         c.warnings.push_back({"pairedByOrder",
                               "The patches of the " + role +
                                   " were taken in their order: neither device values nor ids "
                                   "could tell them apart.",
                               true});
-    if (pairing.by == PairedBy::Labels && (pairing.spacesDiffer || pairing.contradicted > 0))
+    }
+    if (pairing.by == PairedBy::Labels && (pairing.spacesDiffer || pairing.contradicted > 0)) {
         c.warnings.push_back(
             {"pairedByLabels",
              "The patches of the " + role + " were found by their labels alone" +
                  (pairing.contradicted > 0 ? ", and ids and names contradict each other for " +
                                                  patches(pairing.contradicted) + "."
                                            : ", although both files have device values.")});
-    if (pairing.rounded > 0)
+    }
+    if (pairing.rounded > 0) {
         c.warnings.push_back(
             {"pairedByRoundedValues", patches(pairing.rounded) + " of the " + role +
                                           " matched in whole percents of the device values only."});
+    }
 }
 
 /// Of a target, which may be a chart larger than the strip, rows without counterpart are no news.
 void warnOfUnpaired(Comparison& c, const Input& input) {
-    if (!input.unpaired.empty() && &input != &c.target)
+    if (!input.unpaired.empty() && &input != &c.target) {
         c.warnings.push_back({"patchesUnpaired", patches(input.unpaired.size()) + " of the " +
                                                      roleOf(c, input) + " had no counterpart."});
+    }
 }
 
 void passOnNotes(Comparison& c) {
-    for (const Input* input : {&c.target, &c.measurement, &c.patchSet})
-        if (input->file.set)
-            for (const std::string& note : input->file.set->notes)
+    for (const Input* input : {&c.target, &c.measurement, &c.patchSet}) {
+        if (input->file.set) {
+            for (const std::string& note : input->file.set->notes) {
                 c.warnings.push_back(
                     {"readerNote", std::string("In the ") + roleOf(c, *input) + ": " + note});
+            }
+        }
+    }
 }
 
 } // namespace
@@ -264,27 +307,35 @@ const char* repeatModeName(RepeatMode mode) {
 int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparison& c) {
     c.formula = wants.formula;
     c.repeatMode = wants.repeats;
-    if (const int status = loadAll(paths, wants.spectra, c))
+    if (const int status = loadAll(paths, wants.spectra, c)) {
         return status;
+    }
     dropPlaceholders(c);
-    if (const int status = selectPatches(c))
+    if (const int status = selectPatches(c)) {
         return status;
-    if (const int status = labOf(c, c.target, c.targetLab))
+    }
+    if (const int status = labOf(c, c.target, c.targetLab)) {
         return status;
-    if (const int status = labOf(c, c.measurement, c.measuredLab))
+    }
+    if (const int status = labOf(c, c.measurement, c.measuredLab)) {
         return status;
+    }
     findRepeats(c);
-    if (wants.repeats == RepeatMode::Mean)
+    if (wants.repeats == RepeatMode::Mean) {
         averageRepeats(c);
+    }
 
     c.difference.resize(c.selectedRow.size());
-    for (std::size_t i = 0; i < c.difference.size(); ++i)
+    for (std::size_t i = 0; i < c.difference.size(); ++i) {
         c.difference[i] = colour::difference(wants.formula, c.targetLab[i], c.measuredLab[i]);
+    }
 
-    for (const Input* side : {&c.target, &c.measurement})
+    for (const Input* side : {&c.target, &c.measurement}) {
         warnOfPairing(c, *side);
-    for (const Input* input : {&c.target, &c.measurement, &c.patchSet})
+    }
+    for (const Input* input : {&c.target, &c.measurement, &c.patchSet}) {
         warnOfUnpaired(c, *input);
+    }
     passOnNotes(c);
     return exitDone;
 }

@@ -138,9 +138,11 @@ constexpr const char* unit(Quantity quantity) {
 
 /// The criterion of a name, else null.
 constexpr const Criterion* criterionOfName(std::string_view name) {
-    for (const Criterion& criterion : criteria)
-        if (name == criterion.name)
+    for (const Criterion& criterion : criteria) {
+        if (name == criterion.name) {
             return &criterion;
+        }
+    }
     return nullptr;
 }
 

@@ -24,38 +24,43 @@ std::optional<unsigned int> numberOf(std::string_view text) {
     text = trimmed(text);
     unsigned int number = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
-    if (error != std::errc() || end != text.data() + text.size())
+    if (error != std::errc() || end != text.data() + text.size()) {
         return std::nullopt;
+    }
     return number;
 }
 
 /// The folder that holds this library, with a slash at its end.
 std::string ownFolder() {
     Dl_info self{};
-    if (!::dladdr(reinterpret_cast<const void*>(&instrumentName), &self) || !self.dli_fname)
+    if (!::dladdr(reinterpret_cast<const void*>(&instrumentName), &self) || !self.dli_fname) {
         return {};
+    }
     const std::string path = self.dli_fname;
     return path.substr(0, path.rfind('/') + 1);
 }
 
 std::string namesFile() {
-    if (const char* const named = std::getenv("TINTGATE_INSTRUMENTS"))
+    if (const char* const named = std::getenv("TINTGATE_INSTRUMENTS")) {
         return named;
+    }
     return ownFolder() + TINTGATE_PRESETS_FROM_LIBRARY "/instruments.txt";
 }
 
 /// The name of `id` in the lines of a names file; empty where they have none.
 std::string_view nameIn(std::string_view lines, unsigned int id) {
     constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF"; // some editors put it before UTF-8
-    if (lines.starts_with(byteOrderMark))
+    if (lines.starts_with(byteOrderMark)) {
         lines.remove_prefix(byteOrderMark.size());
+    }
     while (!lines.empty()) {
         const std::size_t end = lines.find('\n');
         const std::string_view line = trimmed(lines.substr(0, end));
         lines.remove_prefix(end == std::string_view::npos ? lines.size() : end + 1);
         const std::size_t equals = line.find('=');
-        if (equals != std::string_view::npos && numberOf(line.substr(0, equals)) == id)
+        if (equals != std::string_view::npos && numberOf(line.substr(0, equals)) == id) {
             return trimmed(line.substr(equals + 1));
+        }
     }
     return {};
 }
@@ -64,22 +69,27 @@ std::string_view nameIn(std::string_view lines, unsigned int id) {
 
 std::string instrumentName(unsigned int id) {
     std::string lines;
-    if (colour::readWholeFile(namesFile(), largestNamesFile, lines) == colour::Failure::None)
-        if (const std::string_view name = nameIn(lines, id); !name.empty())
+    if (colour::readWholeFile(namesFile(), largestNamesFile, lines) == colour::Failure::None) {
+        if (const std::string_view name = nameIn(lines, id); !name.empty()) {
             return std::string(name);
+        }
+    }
     return "Instrument " + std::to_string(id);
 }
 
 int instrumentOfDefinition(const std::string& path, std::string& name) {
     std::string bytes;
-    if (const int status = statusOf(colour::readWholeFile(path, largestDefinition, bytes)))
+    if (const int status = statusOf(colour::readWholeFile(path, largestDefinition, bytes))) {
         return status;
+    }
     const std::optional<std::string> device = colour::cgatsKeyword(bytes, "DEVICE");
-    if (!device)
+    if (!device) {
         return exitInputDamaged;
+    }
     const std::optional<unsigned int> id = numberOf(*device);
-    if (!id)
+    if (!id) {
         return exitValueNotNumeric;
+    }
     name = instrumentName(*id);
     return exitDone;
 }

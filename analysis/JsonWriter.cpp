@@ -38,24 +38,27 @@ char* writeWhole(char* at, std::uint64_t value) {
         *at = static_cast<char>('0' + value);
         return at + 1;
     }
-    if (value < 100)
+    if (value < 100) {
         return writePair(at, static_cast<std::uint32_t>(value));
+    }
     return std::to_chars(at, at + 20, value).ptr;
 }
 
 /// Six decimals without the zeros at their end; `millionths` is below a million. Most values of
 /// instruments have two.
 char* writeFraction(char* at, std::uint32_t millionths) {
-    if (millionths == 0)
+    if (millionths == 0) {
         return at;
+    }
     *at++ = '.';
     at = writePair(at, millionths / 10000);
     if (const std::uint32_t rest = millionths % 10000; rest != 0) {
         at = writePair(at, rest / 100);
         at = writePair(at, rest % 100);
     }
-    while (at[-1] == '0')
+    while (at[-1] == '0') {
         --at;
+    }
     return at;
 }
 
@@ -64,8 +67,9 @@ char* writeFraction(char* at, std::uint32_t millionths) {
 /// conversion, as is all that would not fit.
 char* writeNumber(char* at, double value) {
     const double size = std::abs(value);
-    if (size >= 1e9)
+    if (size >= 1e9) {
         return std::to_chars(at, at + longestNumber, value).ptr;
+    }
     const double scaled = size * 1e6;
     auto millionths = static_cast<std::uint64_t>(scaled);
     const double rest = scaled - static_cast<double>(millionths);
@@ -81,8 +85,9 @@ char* writeNumber(char* at, double value) {
     } else {
         millionths += rest > 0.5;
     }
-    if (value < 0 && millionths > 0)
+    if (value < 0 && millionths > 0) {
         *at++ = '-';
+    }
     at = writeWhole(at, millionths / 1000000);
     return writeFraction(at, static_cast<std::uint32_t>(millionths % 1000000));
 }
@@ -91,8 +96,9 @@ char* writeNumber(char* at, double value) {
 
 /// Makes sure of room for so many bytes, at most mostRoom.
 void JsonWriter::room(std::size_t bytes) {
-    if (static_cast<std::size_t>(m_block.data() + m_block.size() - m_at) < bytes)
+    if (static_cast<std::size_t>(m_block.data() + m_block.size() - m_at) < bytes) {
         widen(blockSize);
+    }
 }
 
 /// Takes the first bytes of the block to the text, and the others to the block's start.
@@ -112,8 +118,9 @@ void JsonWriter::raw(std::string_view ascii) {
 }
 
 void JsonWriter::lineBreak() {
-    if (m_compactFrom > 0)
+    if (m_compactFrom > 0) {
         return;
+    }
     const auto indent = static_cast<std::size_t>(m_depth) * 2;
     room(1 + indent);
     *m_at++ = '\n';
@@ -130,8 +137,9 @@ void JsonWriter::separate() {
         room(1);
         *m_at++ = ',';
     }
-    if (m_depth > 0)
+    if (m_depth > 0) {
         lineBreak();
+    }
     m_first = false;
 }
 
@@ -145,25 +153,29 @@ void JsonWriter::open(char bracket) {
 
 void JsonWriter::close(char bracket) {
     --m_depth;
-    if (!m_first)
+    if (!m_first) {
         lineBreak();
+    }
     room(1);
     *m_at++ = bracket;
     m_first = false;
-    if (m_depth < m_compactFrom)
+    if (m_depth < m_compactFrom) {
         m_compactFrom = 0;
+    }
 }
 
 void JsonWriter::beginCompactObject() {
     beginObject();
-    if (m_compactFrom == 0)
+    if (m_compactFrom == 0) {
         m_compactFrom = m_depth;
+    }
 }
 
 void JsonWriter::beginCompactArray() {
     beginArray();
-    if (m_compactFrom == 0)
+    if (m_compactFrom == 0) {
         m_compactFrom = m_depth;
+    }
 }
 
 void JsonWriter::key(std::string_view name) {
@@ -174,8 +186,9 @@ void JsonWriter::key(std::string_view name) {
     m_at += name.size();
     *m_at++ = '"';
     *m_at++ = ':';
-    if (m_compactFrom == 0)
+    if (m_compactFrom == 0) {
         *m_at++ = ' ';
+    }
     m_afterKey = true;
 }
 
@@ -200,8 +213,9 @@ void JsonWriter::escaped(int character) {
     default:
         break;
     }
-    if (character < 0x10000)
+    if (character < 0x10000) {
         return unit(static_cast<unsigned>(character));
+    }
     const auto beyond = static_cast<unsigned>(character) - 0x10000;
     unit(0xD800 | beyond >> 10);
     unit(0xDC00 | (beyond & 0x3FF));
@@ -239,8 +253,9 @@ void JsonWriter::text(std::string_view utf8) {
 }
 
 void JsonWriter::number(double value) {
-    if (!std::isfinite(value))
+    if (!std::isfinite(value)) {
         return null();
+    }
     separate();
     room(longestNumber);
     m_at = writeNumber(m_at, value);

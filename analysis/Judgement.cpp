@@ -25,8 +25,9 @@ double quantityOf(const Comparison& c, Quantity quantity, std::size_t patch) {
 
 double meanOf(const std::vector<double>& figures) {
     double sum = 0;
-    for (const double figure : figures)
+    for (const double figure : figures) {
         sum += figure;
+    }
     return sum / static_cast<double>(figures.size());
 }
 
@@ -44,8 +45,9 @@ Statistics statisticsOf(const Comparison& c, std::size_t& worst) {
         static_cast<std::size_t>(std::max_element(sorted.begin(), sorted.end()) - sorted.begin());
     s.maximum = sorted[worst];
     double squares = 0;
-    for (const double figure : sorted)
+    for (const double figure : sorted) {
         squares += (figure - s.mean) * (figure - s.mean);
+    }
     s.standardDeviation = std::sqrt(squares / static_cast<double>(s.count));
 
     const auto at = [&](std::size_t rank) {
@@ -64,8 +66,9 @@ Statistics statisticsOf(const Comparison& c, std::size_t& worst) {
 std::size_t differentPatches(const Comparison& c, const std::vector<std::size_t>& patches) {
     std::vector<std::uint32_t> groups;
     groups.reserve(patches.size());
-    for (const std::size_t patch : patches)
+    for (const std::size_t patch : patches) {
         groups.push_back(c.groupOf[patch]);
+    }
     std::sort(groups.begin(), groups.end());
     return static_cast<std::size_t>(std::unique(groups.begin(), groups.end()) - groups.begin());
 }
@@ -75,12 +78,14 @@ void answerFromPatches(const Comparison& c, const std::vector<std::size_t>& patc
                        Finding& finding) {
     finding.patches = patches.size();
     finding.found = differentPatches(c, patches);
-    if (finding.found < finding.needed)
+    if (finding.found < finding.needed) {
         return;
+    }
     std::vector<double> figures;
     figures.reserve(patches.size());
-    for (const std::size_t patch : patches)
+    for (const std::size_t patch : patches) {
         figures.push_back(quantityOf(c, finding.criterion->quantity, patch));
+    }
     const auto largest = std::max_element(figures.begin(), figures.end());
     finding.answered = true;
     finding.worst = patches[static_cast<std::size_t>(largest - figures.begin())];
@@ -107,8 +112,9 @@ void answerFromAll(const Statistics& statistics, std::size_t worst, Finding& fin
 void answerFromRepeats(const RepeatSpread& spread, Finding& finding) {
     finding.patches = spread.readings;
     finding.found = spread.patches;
-    if (spread.patches == 0)
+    if (spread.patches == 0) {
         return;
+    }
     finding.answered = true;
     finding.worst = spread.worst;
     finding.value = spread.largest;
@@ -125,14 +131,16 @@ struct Evidence {
 /// Answers a criterion as its patches and its quantity ask.
 void answer(const Evidence& evidence, const PresetOptions& options, Finding& finding) {
     const Patches patches = finding.criterion->patches;
-    if (patches == Patches::Greys)
+    if (patches == Patches::Greys) {
         finding.needed = static_cast<std::size_t>(options.minimumGreys);
-    if (patches == Patches::All)
+    }
+    if (patches == Patches::All) {
         answerFromAll(evidence.statistics, evidence.worst, finding);
-    else if (finding.criterion->quantity == Quantity::Spread)
+    } else if (finding.criterion->quantity == Quantity::Spread) {
         answerFromRepeats(evidence.comparison.spread, finding);
-    else
+    } else {
         answerFromPatches(evidence.comparison, evidence.selections.of(patches), finding);
+    }
     if (patches == Patches::OuterGamut) {
         finding.listed = outerGamutCount;
         finding.found = evidence.selections.outerGamut.count();
@@ -143,8 +151,9 @@ void holdAgainst(const Setting& setting, Finding& finding) {
     finding.tolerance = setting.tolerance;
     finding.used = setting.used;
     finding.decimals = setting.decimals;
-    if (!finding.answered)
+    if (!finding.answered) {
         return;
+    }
     finding.rounded = roundedTo(finding.value, finding.decimals);
     finding.passed = finding.rounded <= finding.tolerance;
 }
@@ -154,11 +163,13 @@ Verdict verdictOf(const std::vector<Finding>& findings, bool keptOpen) {
     bool isAnyUsed = false;
     bool isAnyOpen = keptOpen;
     for (const Finding& finding : findings) {
-        if (!finding.used)
+        if (!finding.used) {
             continue;
+        }
         isAnyUsed = true;
-        if (finding.answered && !finding.passed)
+        if (finding.answered && !finding.passed) {
             return Verdict::Failed;
+        }
         isAnyOpen = isAnyOpen || !finding.answered;
     }
     return isAnyUsed && !isAnyOpen ? Verdict::Passed : Verdict::Incomplete;
@@ -169,35 +180,41 @@ void warnOfFindings(const Comparison& c, Judgement& judgement) {
     bool isListSaid = false;
     for (const Finding& finding : judgement.findings) {
         if (finding.used && finding.answered && finding.found < finding.listed &&
-            !std::exchange(isListSaid, true))
+            !std::exchange(isListSaid, true)) {
             judgement.warnings.push_back(
                 {"outerGamutIncomplete",
                  "The data have " + std::to_string(finding.found) + " of the " +
                      std::to_string(finding.listed) +
                      " patches of the outer gamut, and it was judged by these."});
+        }
         if (finding.criterion->quantity == Quantity::Spread && finding.answered && !finding.used &&
-            c.repeatMode == RepeatMode::Mean)
+            c.repeatMode == RepeatMode::Mean) {
             judgement.warnings.push_back(
                 {"spreadUnjudged",
                  "The means of repeated readings were compared, and the preset sets no limit to "
                  "how far the readings may lie apart.",
                  true});
+        }
     }
 }
 
 void warnOfPreset(const tolerancePresetParameterRecord& preset, Judgement& judgement) {
     const auto& findings = judgement.findings;
-    if (std::none_of(findings.begin(), findings.end(), [](const Finding& f) { return f.used; }))
+    if (std::none_of(findings.begin(), findings.end(), [](const Finding& f) { return f.used; })) {
         judgement.warnings.push_back({"nothingJudged", "The preset uses no criterion."});
-    if (preset.fograPSDPreset > 0)
+    }
+    if (preset.fograPSDPreset > 0) {
         return;
-    for (int i = 0; i < presetValueCount; ++i)
+    }
+    for (int i = 0; i < presetValueCount; ++i) {
         if (preset.usedForResult[i] != 0 &&
             std::none_of(findings.begin(), findings.end(),
-                         [&](const Finding& f) { return f.criterion->index == i; }))
+                         [&](const Finding& f) { return f.criterion->index == i; })) {
             judgement.warnings.push_back(
                 {"criterionUnknown",
                  "The preset uses entry " + std::to_string(i) + ", which has no meaning."});
+        }
+    }
 }
 
 } // namespace
@@ -215,8 +232,9 @@ const char* verdictName(Verdict verdict) {
 }
 
 double roundedTo(double value, int decimals) {
-    if (decimals > 15)
+    if (decimals > 15) {
         return value;
+    }
     const double scale = std::pow(10.0, std::max(decimals, 0));
     return std::floor(value * scale + 0.5) / scale;
 }
@@ -249,11 +267,13 @@ void fillResults(const Judgement& judgement, const tolerancePresetParameterRecor
                  analyseResultsRecord& results) {
     std::fill(std::begin(results.values), std::end(results.values), -1.0);
     std::fill(std::begin(results.approvals), std::end(results.approvals), false);
-    for (int i = 0; i < presetValueCount; ++i)
+    for (int i = 0; i < presetValueCount; ++i) {
         results.decimals[i] = preset.decimalPlaces[i] > 0;
+    }
     for (const Finding& finding : judgement.findings) {
-        if (finding.criterion->index == noEntry)
+        if (finding.criterion->index == noEntry) {
             continue;
+        }
         results.values[finding.criterion->value] = finding.value;
         results.approvals[finding.criterion->index] = finding.passed;
     }

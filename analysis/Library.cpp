@@ -49,8 +49,9 @@ Result orEmpty(Work work) noexcept {
 int validate(const std::wstring& path) {
     colour::ColourFile file;
     const colour::CgatsWants wants{.spectra = false};
-    if (const int status = statusOf(colour::loadColourFile(narrowed(path), wants, file)))
+    if (const int status = statusOf(colour::loadColourFile(narrowed(path), wants, file))) {
         return status;
+    }
     // A text serves as target or measurement by its colours, as reference or patch set by its inks.
     const bool usable = file.profile || file.set->hasColour() || file.set->hasCmyk();
     return usable ? exitDone : exitNoColourValues;
@@ -87,20 +88,25 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
     if (job) {
         patches = measuredPatches(comparison);
         const auto& set = comparison.measurement.file.set;
-        if (set && set->axis.length > 0 && !patches.spectral)
+        if (set && set->axis.length > 0 && !patches.spectral) {
             comparison.warnings.push_back(
                 {"spectraNotStored", "The job's record can't hold the measurement's spectra."});
+        }
     }
     std::wstring text;
-    if (json)
+    if (json) {
         text = resultJson(comparison, judgement, preset, options);
+    }
 
-    if (job)
+    if (job) {
         storeMeasurement(std::move(patches), preset.deltaEMode, job->measurement);
-    if (json)
+    }
+    if (json) {
         json->swap(text);
-    if (results)
+    }
+    if (results) {
         fillResults(judgement, preset, *results);
+    }
     return exitDone;
 }
 
@@ -149,8 +155,9 @@ int getDeviceNameFromIt8ControlStripFile(wxString path, wxString* name) {
     return guarded([&] {
         std::string found;
         const int status = instrumentOfDefinition(narrowed(path.ToStdWstring()), found);
-        if (status == exitDone && name)
+        if (status == exitDone && name) {
             *name = wxString(widened(found));
+        }
         return status;
     });
 }

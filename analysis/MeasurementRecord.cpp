@@ -14,8 +14,9 @@ using colour::SpectralAxis;
 template<class T>
 std::unique_ptr<T[], Free> allocate(std::size_t count) {
     auto* const memory = static_cast<T*>(std::calloc(std::max<std::size_t>(count, 1), sizeof(T)));
-    if (!memory)
+    if (!memory) {
         throw std::bad_alloc();
+    }
     return std::unique_ptr<T[], Free>(memory);
 }
 
@@ -27,18 +28,21 @@ struct Thinned {
 };
 
 Thinned thinned(const SpectralAxis& axis) {
-    if (axis.length <= spectralValueCount)
+    if (axis.length <= spectralValueCount) {
         return {.axis = axis};
+    }
     constexpr int from = 380;
     constexpr int to = 730;
     constexpr int step = 10;
-    if (axis.step <= 0 || step % axis.step != 0)
+    if (axis.step <= 0 || step % axis.step != 0) {
         return {};
+    }
     const int end = axis.base + (axis.length - 1) * axis.step;
     // The first wavelength in range that is a whole ten.
     const int base = std::max(from, (axis.base + step - 1) / step * step);
-    if ((base - axis.base) % axis.step != 0 || base > end)
+    if ((base - axis.base) % axis.step != 0 || base > end) {
         return {};
+    }
     const int length = (std::min(end, to) - base) / step + 1;
     return {.first = (base - axis.base) / axis.step,
             .every = step / axis.step,
@@ -55,18 +59,21 @@ std::vector<Origin> originsOf(const Comparison& c) {
     const bool isSet = c.measurement.file.set.has_value();
     const bool asCompared = !isSet || c.selection == &c.patchSet;
     std::vector<Origin> origins(asCompared ? c.patchCount() : c.measurement.file.set->patchCount);
-    if (!asCompared)
-        for (std::uint32_t row = 0; row < origins.size(); ++row)
+    if (!asCompared) {
+        for (std::uint32_t row = 0; row < origins.size(); ++row) {
             origins[row].row = row;
+        }
+    }
     for (std::uint32_t patch = 0; patch < c.patchCount(); ++patch) {
         const std::uint32_t row = isSet ? c.measurement.rows[patch] : noRow;
         origins[asCompared ? patch : row] = {row, patch};
     }
     for (const FurtherReading& reading : c.furtherReadings) {
-        if (asCompared)
+        if (asCompared) {
             origins.push_back({reading.row, reading.patch});
-        else
+        } else {
             origins[reading.row].patch = reading.patch;
+        }
     }
     return origins;
 }
@@ -90,18 +97,21 @@ void fillColours(const Comparison& c, const std::vector<Origin>& origins, double
 
 /// Process colours of a row: the measurement's own, else those that it was compared under.
 const double* processColours(const Comparison& c, const Origin& origin) {
-    if (origin.row != noRow && c.measurement.file.set->hasCmyk())
+    if (origin.row != noRow && c.measurement.file.set->hasCmyk()) {
         return &c.measurement.file.set
                     ->device[origin.row * c.measurement.file.set->channels.size()];
-    if (origin.patch != noRow && c.devices && c.devices->file.set->hasCmyk())
+    }
+    if (origin.patch != noRow && c.devices && c.devices->file.set->hasCmyk()) {
         return c.deviceOf(origin.patch);
+    }
     return nullptr;
 }
 
 void fillCmyk(const Comparison& c, const std::vector<Origin>& origins, double* cmyk) {
     for (const Origin& origin : origins) {
-        if (const double* const device = processColours(c, origin))
+        if (const double* const device = processColours(c, origin)) {
             std::transform(device, device + 4, cmyk, [](double value) { return value * 2.55; });
+        }
         cmyk += 4;
     }
 }
@@ -115,8 +125,9 @@ void fillSpectra(const DataSet& set, const Thinned& spectra, const std::vector<O
         row.stepsize = spectra.axis.step;
         row.length = spectra.axis.length;
         const double* const from = &set.spectra[origin.row * length];
-        for (int i = 0; i < row.length; ++i)
+        for (int i = 0; i < row.length; ++i) {
             row.values[i] = from[spectra.first + i * spectra.every];
+        }
     }
 }
 
@@ -132,8 +143,9 @@ MeasuredPatches measuredPatches(const Comparison& c) {
     fillColours(c, origins, patches.xyz.get(), patches.lab.get());
     fillCmyk(c, origins, patches.cmyk.get());
 
-    if (!c.measurement.file.set)
+    if (!c.measurement.file.set) {
         return patches;
+    }
     const DataSet& set = *c.measurement.file.set;
     if (const Thinned spectra = thinned(set.axis); spectra.axis.length > 0) {
         patches.spectral = allocate<spectralRow>(origins.size());

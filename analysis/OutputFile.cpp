@@ -41,10 +41,12 @@ std::size_t writeAll(int fd, std::string_view bytes) {
     std::size_t done = 0;
     while (done < bytes.size()) {
         const ssize_t written = ::write(fd, bytes.data() + done, bytes.size() - done);
-        if (written < 0 && errno != EINTR)
+        if (written < 0 && errno != EINTR) {
             break;
-        if (written > 0)
+        }
+        if (written > 0) {
             done += static_cast<std::size_t>(written);
+        }
     }
     return done;
 }
@@ -52,28 +54,33 @@ std::size_t writeAll(int fd, std::string_view bytes) {
 /// Puts back what the first `written` bytes have replaced. It needs no room on the disk.
 void restore(int fd, std::string_view old, std::size_t written) {
     if (::lseek(fd, 0, SEEK_SET) == 0 &&
-        writeAll(fd, old.substr(0, written)) == std::min(old.size(), written))
+        writeAll(fd, old.substr(0, written)) == std::min(old.size(), written)) {
         static_cast<void>(::ftruncate(fd, static_cast<off_t>(old.size())) == 0);
+    }
 }
 
 int writeInPlace(const std::string& path, std::string_view bytes) {
     std::string old;
     struct stat status {};
     if (::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode) &&
-        colour::readWholeFile(path, largestKept, old) != colour::Failure::None)
+        colour::readWholeFile(path, largestKept, old) != colour::Failure::None) {
         return exitOutputNotWritable; // what can't be kept is not put at risk
+    }
     Descriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0666));
-    if (!file || ::fstat(file.get(), &status) != 0)
+    if (!file || ::fstat(file.get(), &status) != 0) {
         return exitOutputNotWritable;
+    }
     const std::size_t written = writeAll(file.get(), bytes);
     const bool regular = S_ISREG(status.st_mode);
     if (written < bytes.size()) {
-        if (regular)
+        if (regular) {
             restore(file.get(), old, written);
+        }
         return exitOutputIncomplete;
     }
-    if (regular && ::ftruncate(file.get(), static_cast<off_t>(bytes.size())) != 0)
+    if (regular && ::ftruncate(file.get(), static_cast<off_t>(bytes.size())) != 0) {
         return exitOutputIncomplete;
+    }
     return file.close() ? exitDone : exitOutputIncomplete;
 }
 
@@ -83,8 +90,9 @@ int openDraft(const std::string& path, std::string& draft) {
     for (int attempt = 0; attempt < 100; ++attempt) {
         draft = folder + ".tintgate-" + std::to_string(::getpid()) + "-" + std::to_string(attempt);
         const int fd = ::open(draft.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0666);
-        if (fd >= 0 || errno != EEXIST)
+        if (fd >= 0 || errno != EEXIST) {
             return fd;
+        }
     }
     return -1;
 }
@@ -93,18 +101,22 @@ int openDraft(const std::string& path, std::string& draft) {
 int replaceWhole(const std::string& path, std::string_view bytes, const struct stat* old) {
     std::string draft;
     Descriptor file(openDraft(path, draft));
-    if (!file)
+    if (!file) {
         return old ? writeInPlace(path, bytes) : static_cast<int>(exitOutputNotWritable);
+    }
     // Only root may give a file away, and some file systems have no modes: neither is a failure.
-    if (old && ::fchown(file.get(), old->st_uid, old->st_gid) == 0)
+    if (old && ::fchown(file.get(), old->st_uid, old->st_gid) == 0) {
         static_cast<void>(::fchmod(file.get(), old->st_mode & 07777));
+    }
     int status = exitDone;
-    if (writeAll(file.get(), bytes) < bytes.size() || ::fsync(file.get()) != 0 || !file.close())
+    if (writeAll(file.get(), bytes) < bytes.size() || ::fsync(file.get()) != 0 || !file.close()) {
         status = exitOutputIncomplete;
-    else if (::rename(draft.c_str(), path.c_str()) != 0)
+    } else if (::rename(draft.c_str(), path.c_str()) != 0) {
         status = exitOutputNotWritable;
-    if (status != exitDone)
+    }
+    if (status != exitDone) {
         ::unlink(draft.c_str());
+    }
     return status;
 }
 
@@ -113,13 +125,16 @@ int replaceWhole(const std::string& path, std::string_view bytes, const struct s
 int writeOutputFile(const std::string& path, std::string_view bytes) {
     struct stat old {};
     const bool exists = ::lstat(path.c_str(), &old) == 0;
-    if (exists && S_ISDIR(old.st_mode))
+    if (exists && S_ISDIR(old.st_mode)) {
         return exitOutputNotWritable;
+    }
     // A rename would replace a file that its owner has made read-only.
-    if (exists && ::access(path.c_str(), W_OK) != 0 && errno != ENOENT)
+    if (exists && ::access(path.c_str(), W_OK) != 0 && errno != ENOENT) {
         return exitOutputNotWritable;
-    if (exists && !S_ISREG(old.st_mode))
+    }
+    if (exists && !S_ISREG(old.st_mode)) {
         return writeInPlace(path, bytes);
+    }
 
     return replaceWhole(path, bytes, exists ? &old : nullptr);
 }

@@ -41,8 +41,9 @@ class RowIndex {
     std::uint32_t take(std::uint64_t hash, Same same) {
         Slot& slot = find(hash, same);
         const std::uint32_t row = slot.first;
-        if (row != noRow)
+        if (row != noRow) {
             slot.first = m_next[row];
+        }
         return row;
     }
 
@@ -51,8 +52,9 @@ class RowIndex {
     std::uint32_t takeInTurn(std::uint64_t hash, Same same) {
         Slot& slot = find(hash, same);
         const std::uint32_t row = slot.first == noRow ? slot.key : slot.first;
-        if (row != noRow)
+        if (row != noRow) {
             slot.first = m_next[row];
+        }
         return row;
     }
 
@@ -68,8 +70,9 @@ class RowIndex {
     Slot& find(std::uint64_t hash, Same same) {
         for (std::size_t at = hash & m_mask;; at = (at + 1) & m_mask) {
             Slot& slot = m_slots[at];
-            if (slot.key == noRow || (slot.hash == hash && same(slot.key)))
+            if (slot.key == noRow || (slot.hash == hash && same(slot.key))) {
                 return slot;
+            }
         }
     }
 
@@ -93,7 +96,7 @@ class DeviceKeys {
     DeviceKeys(const DataSet& set, std::size_t width, double perPercent)
         : m_width(width), m_keys(set.patchCount * width) {
         const std::size_t own = set.channels.size();
-        for (std::size_t row = 0; row < set.patchCount; ++row)
+        for (std::size_t row = 0; row < set.patchCount; ++row) {
             for (std::size_t channel = 0; channel < own; ++channel) {
                 const double value = set.device[row * own + channel] * perPercent;
                 // In this order of arguments not-a-number is bounded too.
@@ -101,12 +104,14 @@ class DeviceKeys {
                 m_keys[row * width + channel] =
                     static_cast<std::int32_t>(std::floor(bounded + 0.5));
             }
+        }
     }
 
     std::uint64_t hash(std::uint32_t row) const {
         std::uint64_t h = m_width;
-        for (const std::int32_t *at = key(row), *end = at + m_width; at != end; ++at)
+        for (const std::int32_t *at = key(row), *end = at + m_width; at != end; ++at) {
             h = mixed(h + static_cast<std::uint32_t>(*at));
+        }
         return h;
     }
 
@@ -142,18 +147,22 @@ template<class Keys>
 std::size_t pairRest(Pairing& pairing, std::vector<bool>& taken, const Keys& left,
                      const Keys& right) {
     RowIndex index(taken.size());
-    for (std::uint32_t row = 0; row < taken.size(); ++row)
-        if (!taken[row])
+    for (std::uint32_t row = 0; row < taken.size(); ++row) {
+        if (!taken[row]) {
             index.add(right.hash(row), row,
                       [&](std::uint32_t other) { return right.same(row, right, other); });
+        }
+    }
     std::size_t found = 0;
     for (std::uint32_t row = 0; row < pairing.partner.size(); ++row) {
-        if (pairing.partner[row] != noRow)
+        if (pairing.partner[row] != noRow) {
             continue;
+        }
         const std::uint32_t other = index.take(
             left.hash(row), [&](std::uint32_t key) { return left.same(row, right, key); });
-        if (other == noRow)
+        if (other == noRow) {
             continue;
+        }
         pairing.partner[row] = other;
         taken[other] = true;
         ++found;
@@ -170,15 +179,19 @@ void pairRepeats(const std::vector<std::uint32_t>& partner, const Keys& keys, Fo
     const auto sameAs = [&](std::uint32_t row) {
         return [&keys, row](std::uint32_t other) { return keys.same(row, keys, other); };
     };
-    for (std::uint32_t row = 0; row < partner.size(); ++row)
-        if (partner[row] != noRow)
-            index.add(keys.hash(row), row, sameAs(row));
     for (std::uint32_t row = 0; row < partner.size(); ++row) {
-        if (partner[row] != noRow)
+        if (partner[row] != noRow) {
+            index.add(keys.hash(row), row, sameAs(row));
+        }
+    }
+    for (std::uint32_t row = 0; row < partner.size(); ++row) {
+        if (partner[row] != noRow) {
             continue;
+        }
         const std::uint32_t like = index.takeInTurn(keys.hash(row), sameAs(row));
-        if (like != noRow)
+        if (like != noRow) {
             found(row, partner[like]);
+        }
     }
 }
 
@@ -188,18 +201,21 @@ template<class Keys>
 void addRepeats(Pairing& pairing, std::size_t rightCount, const Keys& left, const Keys& right) {
     std::vector<std::uint32_t> inverse(rightCount, noRow);
     std::size_t leftPaired = 0;
-    for (std::uint32_t row = 0; row < pairing.partner.size(); ++row)
+    for (std::uint32_t row = 0; row < pairing.partner.size(); ++row) {
         if (pairing.partner[row] != noRow) {
             std::uint32_t& first = inverse[pairing.partner[row]];
             first = std::min(first, row); // noRow is the largest
             ++leftPaired;
         }
-    for (const RowPair& pair : pairing.again)
+    }
+    for (const RowPair& pair : pairing.again) {
         inverse[pair.right] = pair.left;
-    if (pairing.paired + pairing.again.size() < rightCount)
+    }
+    if (pairing.paired + pairing.again.size() < rightCount) {
         pairRepeats(inverse, right, [&](std::uint32_t row, std::uint32_t partner) {
             pairing.again.push_back({partner, row});
         });
+    }
     if (leftPaired < pairing.partner.size()) {
         const std::vector<std::uint32_t> partners = pairing.partner;
         pairRepeats(partners, left, [&](std::uint32_t row, std::uint32_t partner) {
@@ -209,8 +225,9 @@ void addRepeats(Pairing& pairing, std::size_t rightCount, const Keys& left, cons
 }
 
 bool comparableDevices(const DataSet& left, const DataSet& right) {
-    if (!left.hasDevice() || left.deviceSpace != right.deviceSpace)
+    if (!left.hasDevice() || left.deviceSpace != right.deviceSpace) {
         return false;
+    }
     return left.deviceSpace != DeviceSpace::Other || left.channels == right.channels;
 }
 
@@ -235,16 +252,20 @@ Pairing pairByDevice(const DataSet& left, const DataSet& right) {
     for (const double scale : perPercent) {
         const std::size_t found = pairRest(pairing, taken, DeviceKeys(left, width, scale),
                                            DeviceKeys(right, width, scale));
-        if (scale == 1)
+        if (scale == 1) {
             pairing.rounded = found;
-        if (pairing.paired == std::min(left.patchCount, right.patchCount))
+        }
+        if (pairing.paired == std::min(left.patchCount, right.patchCount)) {
             break;
+        }
     }
-    for (const double scale : {perPercent[0], perPercent[1]})
+    for (const double scale : {perPercent[0], perPercent[1]}) {
         if (pairing.paired > 0 && (pairing.paired < left.patchCount ||
-                                   pairing.paired + pairing.again.size() < right.patchCount))
+                                   pairing.paired + pairing.again.size() < right.patchCount)) {
             addRepeats(pairing, right.patchCount, DeviceKeys(left, width, scale),
                        DeviceKeys(right, width, scale));
+        }
+    }
     return pairing;
 }
 
@@ -269,14 +290,17 @@ Pairing pairByLabels(const std::vector<std::string>& left, const std::vector<std
 /// Rows that a pairing puts together although labels of the other kind name another row.
 std::size_t contradictionsOf(const Pairing& pairing, const std::vector<std::string>& left,
                              const std::vector<std::string>& right) {
-    if (left.empty() || right.empty())
+    if (left.empty() || right.empty()) {
         return 0;
+    }
     const Pairing other = pairByLabels(left, right);
     std::size_t count = 0;
-    for (std::size_t row = 0; row < left.size(); ++row)
+    for (std::size_t row = 0; row < left.size(); ++row) {
         if (pairing.partner[row] != noRow && other.partner[row] != noRow &&
-            left[row] != right[pairing.partner[row]])
+            left[row] != right[pairing.partner[row]]) {
             ++count;
+        }
+    }
     return count;
 }
 
@@ -294,8 +318,9 @@ Pairing pairByBestLabels(const DataSet& left, const DataSet& right) {
     std::size_t bestAt = ids;
     for (std::size_t i = 0; i < std::size(combinations); ++i) {
         const auto& [leftLabels, rightLabels] = combinations[i];
-        if (leftLabels.empty() || rightLabels.empty())
+        if (leftLabels.empty() || rightLabels.empty()) {
             continue;
+        }
         Pairing pairing = pairByLabels(leftLabels, rightLabels);
         // Ids are often no more than the numbers of the rows; names that differ are meant.
         const bool better =
@@ -306,15 +331,18 @@ Pairing pairByBestLabels(const DataSet& left, const DataSet& right) {
             bestAt = i;
         }
     }
-    if (best.paired == 0)
+    if (best.paired == 0) {
         return best;
-    if (bestAt == ids)
+    }
+    if (bestAt == ids) {
         best.contradicted = contradictionsOf(best, left.names, right.names);
-    else if (bestAt == names)
+    } else if (bestAt == names) {
         best.contradicted = contradictionsOf(best, left.ids, right.ids);
+    }
     const auto& [leftLabels, rightLabels] = combinations[bestAt];
-    if (best.paired < std::max(left.patchCount, right.patchCount))
+    if (best.paired < std::max(left.patchCount, right.patchCount)) {
         addRepeats(best, right.patchCount, LabelKeys(leftLabels), LabelKeys(rightLabels));
+    }
     return best;
 }
 
@@ -337,8 +365,9 @@ const char* pairedByName(PairedBy by) {
 }
 
 Pairing pairSets(const DataSet& left, const DataSet& right) {
-    if (comparableDevices(left, right))
+    if (comparableDevices(left, right)) {
         return pairByDevice(left, right);
+    }
     Pairing pairing = pairByBestLabels(left, right);
     if (pairing.paired == 0) {
         const auto isLabelled = [](const DataSet& set) {
@@ -346,8 +375,9 @@ Pairing pairSets(const DataSet& left, const DataSet& right) {
         };
         pairing = {};
         pairing.partner.assign(left.patchCount, noRow);
-        if (left.patchCount == right.patchCount || !isLabelled(left) || !isLabelled(right))
+        if (left.patchCount == right.patchCount || !isLabelled(left) || !isLabelled(right)) {
             pairByOrder(pairing, right.patchCount);
+        }
     }
     pairing.spacesDiffer = left.hasDevice() && right.hasDevice();
     return pairing;
@@ -363,15 +393,20 @@ Pairing pairWithItself(std::size_t rows) {
 
 std::vector<std::uint32_t> rowsLeft(const Pairing& pairing, std::size_t count) {
     std::vector<bool> taken(count);
-    for (const std::uint32_t row : pairing.partner)
-        if (row != noRow)
+    for (const std::uint32_t row : pairing.partner) {
+        if (row != noRow) {
             taken[row] = true;
-    for (const RowPair& pair : pairing.again)
+        }
+    }
+    for (const RowPair& pair : pairing.again) {
         taken[pair.right] = true;
+    }
     std::vector<std::uint32_t> rows;
-    for (std::uint32_t row = 0; row < count; ++row)
-        if (!taken[row])
+    for (std::uint32_t row = 0; row < count; ++row) {
+        if (!taken[row]) {
             rows.push_back(row);
+        }
+    }
     return rows;
 }
 

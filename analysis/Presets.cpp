@@ -55,27 +55,33 @@ using Status = int; // of ExitCodes.h; exitDone goes on
 template<class Number>
 Status readNumber(std::string_view text, Number smallest, Number largest, Number& number) {
     text = trimmed(text);
-    if (text.empty())
+    if (text.empty()) {
         return exitPresetValueMissing;
+    }
     const std::string_view digits = "0123456789";
-    if (text.find_first_of(digits) == std::string_view::npos) // such as "inf" and "nan"
+    if (text.find_first_of(digits) == std::string_view::npos) { // such as "inf" and "nan"
         return exitPresetNotNumeric;
+    }
     Number value{};
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
-    if (error == std::errc::invalid_argument || end != text.data() + text.size())
+    if (error == std::errc::invalid_argument || end != text.data() + text.size()) {
         return exitPresetNotNumeric;
-    if (error != std::errc{} || !(value >= smallest && value <= largest))
+    }
+    if (error != std::errc{} || !(value >= smallest && value <= largest)) {
         return exitPresetOutOfRange;
+    }
     number = value;
     return exitDone;
 }
 
 Status readSwitch(std::string_view text, int& value) {
     text = trimmed(text);
-    if (text.empty())
+    if (text.empty()) {
         return exitPresetValueMissing;
-    if (text != "yes" && text != "no")
+    }
+    if (text != "yes" && text != "no") {
         return exitPresetOutOfRange;
+    }
     value = text == "yes" ? 1 : 0;
     return exitDone;
 }
@@ -83,8 +89,9 @@ Status readSwitch(std::string_view text, int& value) {
 Status readFormula(std::string_view text, int& number) {
     using colour::Formula;
     text = trimmed(text);
-    if (text.empty())
+    if (text.empty()) {
         return exitPresetValueMissing;
+    }
     for (const Formula formula :
          {Formula::Cie76, Formula::Cmc11, Formula::Cie94, Formula::Ciede2000, Formula::Cmc21}) {
         if (text == colour::formulaName(formula)) {
@@ -102,10 +109,12 @@ bool isUtf8(const std::wstring& widenedText) {
 
 Status readName(std::string_view text, wxString& name) {
     const std::wstring wide = widened(trimmed(text));
-    if (wide.empty())
+    if (wide.empty()) {
         return exitPresetValueMissing;
-    if (!isUtf8(wide))
+    }
+    if (!isUtf8(wide)) {
         return exitPresetNotXml;
+    }
     name = wxString(wide);
     return exitDone;
 }
@@ -126,23 +135,32 @@ Status readInks(std::string_view text, std::vector<std::string>& inks) {
         const std::string_view name = trimmed(text.substr(0, comma));
         more = comma != text.npos;
         text.remove_prefix(more ? comma + 1 : 0);
-        if (name.empty())
+        if (name.empty()) {
             return exitPresetValueMissing;
-        if (!isUtf8(widened(name)))
+        }
+        if (!isUtf8(widened(name))) {
             return exitPresetNotXml;
+        }
         const auto isControl = [](char c) { return static_cast<unsigned char>(c) < ' '; };
         if (names.size() == mostInks || name.size() > longestInk ||
-            std::any_of(name.begin(), name.end(), isControl))
+            std::any_of(name.begin(), name.end(), isControl)) {
             return exitPresetOutOfRange;
-        for (const char* process : {"Cyan", "Magenta", "Yellow", "Black"})
-            if (sameWord(name, process))
+        }
+        for (const char* process : {"Cyan", "Magenta", "Yellow", "Black"}) {
+            if (sameWord(name, process)) {
                 return exitPresetOutOfRange;
-        for (const char* letter : {"C", "M", "Y", "K"}) // small letters are those of light inks
-            if (name == letter)
+            }
+        }
+        for (const char* letter : {"C", "M", "Y", "K"}) { // small letters are those of light inks
+            if (name == letter) {
                 return exitPresetOutOfRange;
-        for (const std::string& other : names)
-            if (sameWord(name, other))
+            }
+        }
+        for (const std::string& other : names) {
+            if (sameWord(name, other)) {
                 return exitPresetValueRepeated;
+            }
+        }
         names.emplace_back(name);
     }
     inks = std::move(names);
@@ -151,13 +169,15 @@ Status readInks(std::string_view text, std::vector<std::string>& inks) {
 
 Status readRepeats(std::string_view text, RepeatMode& mode) {
     text = trimmed(text);
-    if (text.empty())
+    if (text.empty()) {
         return exitPresetValueMissing;
-    for (const RepeatMode each : {RepeatMode::Each, RepeatMode::Mean})
+    }
+    for (const RepeatMode each : {RepeatMode::Each, RepeatMode::Mean}) {
         if (text == repeatModeName(each)) {
             mode = each;
             return exitDone;
         }
+    }
     return exitPresetOutOfRange;
 }
 
@@ -625,12 +645,14 @@ int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOption
 
 Setting settingOf(const Criterion& criterion, const tolerancePresetParameterRecord& preset,
                   const PresetOptions& options) {
-    if (criterion.index == noEntry)
+    if (criterion.index == noEntry) {
         return options.named[placeOf(criterion)];
+    }
     const int decimals = preset.decimalPlaces[criterion.index];
-    if (preset.fograPSDPreset > 0)
+    if (preset.fograPSDPreset > 0) {
         return {preset.psdPresetValues[criterion.psdEntry],
                 preset.usedForPSDResult[criterion.psdEntry] != 0, decimals};
+    }
     return {preset.presetValues[criterion.index], preset.usedForResult[criterion.index] != 0,
             decimals};
 }

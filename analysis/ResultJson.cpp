@@ -15,19 +15,21 @@ using colour::Lab;
 /// Texts that may be absent are null then, so that an empty text always means a stated one.
 void optionalMember(JsonWriter& json, std::string_view name, const std::string& text) {
     json.key(name);
-    if (text.empty())
+    if (text.empty()) {
         json.null();
-    else
+    } else {
         json.text(text);
+    }
 }
 
 template<class Write>
 void memberIf(JsonWriter& json, bool given, std::string_view name, Write write) {
     json.key(name);
-    if (given)
+    if (given) {
         write();
-    else
+    } else {
         json.null();
+    }
 }
 
 void writeProgram(JsonWriter& json, const char* key, const char* name, const char* version) {
@@ -52,16 +54,18 @@ void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset,
     json.member("minimumGreys", std::int64_t{options.minimumGreys});
     json.key("inks");
     json.beginCompactArray();
-    for (const std::string& ink : options.inks)
+    for (const std::string& ink : options.inks) {
         json.text(ink);
+    }
     json.endArray();
     json.endObject();
 }
 
 void writeInput(JsonWriter& json, const char* key, const Input& input) {
     json.key(key);
-    if (!input.file.set && !input.file.profile)
+    if (!input.file.set && !input.file.profile) {
         return json.null();
+    }
     const bool isTarget = std::string_view(key) == "target";
     json.beginObject();
     json.member("path", documentText(input.path));
@@ -133,10 +137,12 @@ void writeStatistics(JsonWriter& json, const Statistics& s) {
 /// A criterion that the preset does not name is a figure and no judgement, whatever its tolerance
 /// of 0 would make of it.
 const char* outcomeOf(const Finding& finding, bool named) {
-    if (!finding.answered)
+    if (!finding.answered) {
         return "unanswered";
-    if (!named)
+    }
+    if (!named) {
         return "unjudged";
+    }
     return finding.passed ? "pass" : "fail";
 }
 
@@ -167,8 +173,9 @@ void writeFinding(JsonWriter& json, const Finding& finding) {
 void writeFindings(JsonWriter& json, const std::vector<Finding>& findings) {
     json.key("criteria");
     json.beginArray();
-    for (const Finding& finding : findings)
+    for (const Finding& finding : findings) {
         writeFinding(json, finding);
+    }
     json.endArray();
 }
 
@@ -176,7 +183,7 @@ void writeWarnings(JsonWriter& json, const std::vector<Warning>& ofComparison,
                    const std::vector<Warning>& ofPreset) {
     json.key("warnings");
     json.beginArray();
-    for (const auto* warnings : {&ofComparison, &ofPreset})
+    for (const auto* warnings : {&ofComparison, &ofPreset}) {
         for (const Warning& warning : *warnings) {
             json.beginCompactObject();
             json.member("code", warning.code);
@@ -184,6 +191,7 @@ void writeWarnings(JsonWriter& json, const std::vector<Warning>& ofComparison,
             json.member("keepsOpen", warning.keepsOpen);
             json.endObject();
         }
+    }
     json.endArray();
 }
 
@@ -197,8 +205,9 @@ void writeLab(JsonWriter& json, const Lab& lab) {
 
 void writeDevice(JsonWriter& json, const double* device, std::size_t channels) {
     json.beginArray();
-    for (std::size_t i = 0; i < channels; ++i)
+    for (std::size_t i = 0; i < channels; ++i) {
         json.number(device[i]);
+    }
     json.endArray();
 }
 
@@ -230,14 +239,16 @@ void writeUnpaired(JsonWriter& json, const char* key, const Input& input, bool i
 void writeColumns(JsonWriter& json, const Comparison& c, const PresetOptions& options) {
     json.key("patchColumns");
     json.beginCompactArray();
-    for (const char* column :
-         {"id", "name", "device", "target", "measured", "difference", "measuredId", "measuredName"})
+    for (const char* column : {"id", "name", "device", "target", "measured", "difference",
+                               "measuredId", "measuredName"}) {
         json.text(column);
+    }
     json.endArray();
     json.key("deviceChannels");
     json.beginCompactArray();
-    for (const std::string& channel : channelNames(c, options.inks))
+    for (const std::string& channel : channelNames(c, options.inks)) {
         json.text(channel);
+    }
     json.endArray();
 }
 
@@ -246,8 +257,10 @@ void writeMeasuredLabels(JsonWriter& json, const DataSet& selection, std::size_t
                          const DataSet& measurement, std::size_t measuredRow) {
     const std::string_view id = labelOf(measurement.ids, measuredRow);
     const std::string_view name = labelOf(measurement.names, measuredRow);
-    if (id == labelOf(selection.ids, selectedRow) && name == labelOf(selection.names, selectedRow))
+    if (id == labelOf(selection.ids, selectedRow) &&
+        name == labelOf(selection.names, selectedRow)) {
         return;
+    }
     json.text(id);
     json.text(name);
 }
@@ -265,9 +278,10 @@ void writePatches(JsonWriter& json, const Comparison& c) {
         writeLab(json, c.targetLab[patch]);
         writeLab(json, c.measuredLab[patch]);
         json.number(c.difference[patch]);
-        if (onSheet && onSheet != &labels)
+        if (onSheet && onSheet != &labels) {
             writeMeasuredLabels(json, labels, c.selectedRow[patch], *onSheet,
                                 c.measurement.rows[patch]);
+        }
         json.endArray();
     }
     json.endArray();

@@ -35,9 +35,11 @@ constexpr struct {
 } // namespace
 
 int statusOf(Failure failure) {
-    for (const auto& status : statuses)
-        if (status.failure == failure)
+    for (const auto& status : statuses) {
+        if (status.failure == failure) {
             return status.code;
+        }
+    }
     return exitInternalFailure;
 }
 

@@ -38,21 +38,25 @@ void appendUtf8(std::string& bytes, std::uint32_t c) {
 
 int decodeUtf8(const char*& from, const char* end) {
     const auto lead = static_cast<unsigned char>(*from++);
-    if (lead < 0x80)
+    if (lead < 0x80) {
         return lead;
+    }
     const int more = lead >= 0xF0 ? 3 : lead >= 0xE0 ? 2 : 1;
-    if (lead < 0xC2 || lead > 0xF4 || end - from < more)
+    if (lead < 0xC2 || lead > 0xF4 || end - from < more) {
         return -1;
+    }
     std::uint32_t c = lead & (0x3Fu >> more);
     for (int i = 0; i < more; ++i) {
         const auto byte = static_cast<unsigned char>(from[i]);
-        if ((byte & 0xC0) != 0x80)
+        if ((byte & 0xC0) != 0x80) {
             return -1;
+        }
         c = c << 6 | (byte & 0x3F);
     }
     constexpr std::uint32_t smallest[] = {0, 0x80, 0x800, 0x10000};
-    if (c < smallest[more] || !isCharacter(c))
+    if (c < smallest[more] || !isCharacter(c)) {
         return -1;
+    }
     from += more;
     return static_cast<int>(c);
 }
@@ -75,10 +79,11 @@ std::string narrowed(std::wstring_view text) {
     bytes.reserve(text.size());
     for (const wchar_t w : text) {
         const auto unit = static_cast<std::uint32_t>(w);
-        if (isEscapedByte(unit))
+        if (isEscapedByte(unit)) {
             bytes += static_cast<char>(unit & 0xFF);
-        else
+        } else {
             appendUtf8(bytes, isCharacter(unit) ? unit : replacement);
+        }
     }
     return bytes;
 }
@@ -96,8 +101,9 @@ std::string documentText(std::wstring_view text) {
 std::string_view trimmed(std::string_view text) {
     constexpr std::string_view blanks = " \t\r\n";
     const std::size_t first = text.find_first_not_of(blanks);
-    if (first == std::string_view::npos)
+    if (first == std::string_view::npos) {
         return {};
+    }
     return text.substr(first, text.find_last_not_of(blanks) - first + 1);
 }
 

@@ -71,11 +71,13 @@ bool isDigit(char c) {
 std::string normalised(std::string_view name) {
     std::string result;
     for (const char c : upperCase(name.substr(0, 256))) {
-        if (c != '*')
+        if (c != '*') {
             result += c == ' ' || c == '-' ? '_' : c;
+        }
     }
-    if (result.starts_with("CIE"))
+    if (result.starts_with("CIE")) {
         result.erase(0, result.starts_with("CIE_") ? 4 : 3);
+    }
     return result;
 }
 
@@ -88,18 +90,21 @@ std::string squeezed(std::string_view name) {
 template<std::size_t N>
 std::optional<int> rankIn(const std::string_view (&spellings)[N], std::string_view name) {
     const auto found = std::find(std::begin(spellings), std::end(spellings), name);
-    if (found == std::end(spellings))
+    if (found == std::end(spellings)) {
         return std::nullopt;
+    }
     return static_cast<int>(found - std::begin(spellings));
 }
 
 /// The whole number that a text of one to four digits is.
 std::optional<int> smallNumber(std::string_view text) {
-    if (text.empty() || text.size() > 4 || !std::all_of(text.begin(), text.end(), isDigit))
+    if (text.empty() || text.size() > 4 || !std::all_of(text.begin(), text.end(), isDigit)) {
         return std::nullopt;
+    }
     int value = 0;
-    for (const char c : text)
+    for (const char c : text) {
         value = 10 * value + (c - '0');
+    }
     return value;
 }
 
@@ -111,35 +116,41 @@ std::optional<ColumnMeaning> spectralMeaning(std::string_view squeezedName) {
     const std::string_view prefix = name.substr(0, digit);
     const auto known = std::find_if(std::begin(spectralPrefixes), std::end(spectralPrefixes),
                                     [&](const SpectralPrefix& p) { return p.name == prefix; });
-    if (known == std::end(spectralPrefixes))
+    if (known == std::end(spectralPrefixes)) {
         return std::nullopt;
+    }
     name.remove_prefix(digit);
-    if (name.ends_with("NM"))
+    if (name.ends_with("NM")) {
         name.remove_suffix(2);
+    }
     const std::size_t point = name.find('.');
     if (point != std::string_view::npos) {
         const std::string_view decimals = name.substr(point + 1);
-        if (decimals.find_first_not_of('0') != std::string_view::npos)
+        if (decimals.find_first_not_of('0') != std::string_view::npos) {
             return std::nullopt;
+        }
         name = name.substr(0, point);
     }
     const std::optional<int> wavelength = smallNumber(name);
-    if (!wavelength || *wavelength < shortestWavelength || *wavelength > longestWavelength)
+    if (!wavelength || *wavelength < shortestWavelength || *wavelength > longestWavelength) {
         return std::nullopt;
+    }
     return ColumnMeaning{Quantity::Spectral, *wavelength, known->unit};
 }
 
 /// Numbers above nine as one letter, as in PCA_A: A is 10, D is 13.
 std::optional<int> inkLetter(std::string_view text) {
-    if (text.size() != 1 || text[0] < 'A' || text[0] > 'D')
+    if (text.size() != 1 || text[0] < 'A' || text[0] > 'D') {
         return std::nullopt;
+    }
     return text[0] - 'A' + 10;
 }
 
 /// 7CLR_1, CLR_1, PC7_1, PCA_A: the number of the ink from 0.
 std::optional<int> colorantIndex(std::string_view name) {
-    while (!name.empty() && isDigit(name.front()))
+    while (!name.empty() && isDigit(name.front())) {
         name.remove_prefix(1);
+    }
     if (name.starts_with("CLR")) {
         name.remove_prefix(3);
     } else if (name.size() > 4 && name.starts_with("PC") && name[3] == '_' &&
@@ -148,12 +159,14 @@ std::optional<int> colorantIndex(std::string_view name) {
     } else {
         return std::nullopt;
     }
-    if (name.starts_with('_'))
+    if (name.starts_with('_')) {
         name.remove_prefix(1);
+    }
     const std::optional<int> letter = inkLetter(name);
     const std::optional<int> number = letter ? letter : smallNumber(name);
-    if (!number || *number == 0)
+    if (!number || *number == 0) {
         return std::nullopt;
+    }
     return *number - 1;
 }
 
@@ -169,53 +182,69 @@ ColumnMeaning cmykMeaning(std::string_view rawName, std::string_view prefix,
     // Light inks have the small letter, and only the case tells them from the full ones.
     const bool lightInk = prefix.size() > 4 && suffix.size() == 1 &&
                           rawName.back() != suffix.back() && rawName.starts_with("CMYK");
-    if (const int letter = letterIndex("CMYK", suffix); letter >= 0 && !lightInk)
+    if (const int letter = letterIndex("CMYK", suffix); letter >= 0 && !lightInk) {
         return {Quantity::Cmyk, letter};
-    if (const auto number = smallNumber(suffix); number && *number >= 1 && *number <= 4)
+    }
+    if (const auto number = smallNumber(suffix); number && *number >= 1 && *number <= 4) {
         return {Quantity::Cmyk, *number - 1};
+    }
     return {Quantity::Spot};
 }
 
 ColumnMeaning meaningOf(const std::string& rawName) {
     const std::string name = normalised(rawName);
     const std::string squeezedName = squeezed(name);
-    if (const auto rank = rankIn(idSpellings, squeezedName))
+    if (const auto rank = rankIn(idSpellings, squeezedName)) {
         return {Quantity::Id, *rank};
-    if (const auto rank = rankIn(nameSpellings, squeezedName))
+    }
+    if (const auto rank = rankIn(nameSpellings, squeezedName)) {
         return {Quantity::Name, *rank};
-    if (const auto spectral = spectralMeaning(squeezedName))
+    }
+    if (const auto spectral = spectralMeaning(squeezedName)) {
         return *spectral;
-    if (squeezedName == "SPECTRALNM")
+    }
+    if (squeezedName == "SPECTRALNM") {
         return {Quantity::Wavelength};
-    if (squeezedName == "SPECTRALPCT")
+    }
+    if (squeezedName == "SPECTRALPCT") {
         return {Quantity::SpectralValue, 0, SpectralUnit::Percent};
-    if (squeezedName == "SPECTRALDEC")
+    }
+    if (squeezedName == "SPECTRALDEC") {
         return {Quantity::SpectralValue, 0, SpectralUnit::Fraction};
-    if (name == "INDEX")
+    }
+    if (name == "INDEX") {
         return {Quantity::RowIndex};
-    if (const auto index = colorantIndex(name))
+    }
+    if (const auto index = colorantIndex(name)) {
         return {Quantity::Colorant, *index};
-    if (name.starts_with("SPOT"))
+    }
+    if (name.starts_with("SPOT")) {
         return {Quantity::Spot};
+    }
 
     const std::size_t underscore = name.rfind('_');
-    if (underscore == std::string::npos)
+    if (underscore == std::string::npos) {
         return {};
+    }
     const std::string_view prefix = std::string_view(name).substr(0, underscore);
     const std::string_view suffix = std::string_view(name).substr(underscore + 1);
     const bool isDevice = prefix == "CMYK" || prefix == "RGB" || prefix == "CMY" ||
                           prefix == "GRAY" || prefix == "GREY";
-    if (isDevice && suffix == "I")
+    if (isDevice && suffix == "I") {
         return {Quantity::CurveInput};
-    if (prefix.starts_with("CMYK"))
+    }
+    if (prefix.starts_with("CMYK")) {
         return cmykMeaning(rawName, prefix, suffix);
-    if (prefix == "CMY" || prefix == "GRAY" || prefix == "GREY")
+    }
+    if (prefix == "CMY" || prefix == "GRAY" || prefix == "GREY") {
         return {Quantity::OtherDevice};
+    }
     constexpr std::pair<std::string_view, Quantity> families[] = {
         {"RGB", Quantity::Rgb}, {"LAB", Quantity::Lab}, {"XYZ", Quantity::Xyz}};
     for (const auto& [letters, quantity] : families) {
-        if (prefix == letters && letterIndex(letters, suffix) >= 0)
+        if (prefix == letters && letterIndex(letters, suffix) >= 0) {
             return {quantity, letterIndex(letters, suffix)};
+        }
     }
     return {};
 }
@@ -237,8 +266,9 @@ std::vector<std::size_t> columnsOf(const Meanings& meanings, Quantity quantity, 
 std::vector<std::size_t> allOf(const Meanings& meanings, Quantity quantity) {
     std::vector<std::size_t> columns;
     for (std::size_t i = 0; i < meanings.size(); ++i) {
-        if (meanings[i].quantity == quantity)
+        if (meanings[i].quantity == quantity) {
             columns.push_back(i);
+        }
     }
     return columns;
 }
@@ -247,16 +277,18 @@ std::vector<std::size_t> allOf(const Meanings& meanings, Quantity quantity) {
 std::optional<std::size_t> bestOf(const Meanings& meanings, Quantity quantity) {
     std::optional<std::size_t> best;
     for (const std::size_t i : allOf(meanings, quantity)) {
-        if (!best || meanings[i].index < meanings[*best].index)
+        if (!best || meanings[i].index < meanings[*best].index) {
             best = i;
+        }
     }
     return best;
 }
 
 Group addGroup(Layout& layout, const std::vector<std::size_t>& columns) {
     const Group group{layout.valueCount, columns.size()};
-    for (const std::size_t column : columns)
+    for (const std::size_t column : columns) {
         layout.columns[column] = {Column::Number, static_cast<std::uint16_t>(layout.valueCount++)};
+    }
     return group;
 }
 
@@ -264,19 +296,24 @@ Group addGroup(Layout& layout, const std::vector<std::size_t>& columns) {
 void takeProcessInks(Meanings& meanings) {
     constexpr int fewest = 5;
     if (columnsOf(meanings, Quantity::Cmyk, 4).empty() &&
-        columnsOf(meanings, Quantity::Colorant, fewest).size() == fewest)
-        for (ColumnMeaning& meaning : meanings)
-            if (meaning.quantity == Quantity::Colorant && meaning.index < 4)
+        columnsOf(meanings, Quantity::Colorant, fewest).size() == fewest) {
+        for (ColumnMeaning& meaning : meanings) {
+            if (meaning.quantity == Quantity::Colorant && meaning.index < 4) {
                 meaning.quantity = Quantity::Cmyk;
+            }
+        }
+    }
 }
 
 /// The columns of the inks beside C, M, Y, K: numbered ones in their order, then by place.
 std::vector<std::size_t> furtherInks(const Meanings& meanings) {
     std::vector<std::size_t> columns;
-    for (std::size_t i = 0; i < meanings.size(); ++i)
+    for (std::size_t i = 0; i < meanings.size(); ++i) {
         if (meanings[i].quantity == Quantity::Spot ||
-            (meanings[i].quantity == Quantity::Colorant && meanings[i].index > 3))
+            (meanings[i].quantity == Quantity::Colorant && meanings[i].index > 3)) {
             columns.push_back(i);
+        }
+    }
     const auto place = [&](std::size_t column) {
         return std::pair(meanings[column].quantity == Quantity::Spot, meanings[column].index);
     };
@@ -305,16 +342,20 @@ void layOutDevice(const Names& names, Meanings meanings, Layout& layout) {
         for (const Quantity quantity :
              {Quantity::Colorant, Quantity::OtherDevice, Quantity::Cmyk}) {
             const std::vector<std::size_t> found = allOf(meanings, quantity);
-            if (columns.empty())
+            if (columns.empty()) {
                 columns = found;
+            }
         }
-        for (const std::size_t spot : allOf(meanings, Quantity::Spot))
+        for (const std::size_t spot : allOf(meanings, Quantity::Spot)) {
             columns.push_back(spot);
-        if (columns.empty())
+        }
+        if (columns.empty()) {
             return;
+        }
         layout.deviceSpace = DeviceSpace::Other;
-        for (const std::size_t column : columns)
+        for (const std::size_t column : columns) {
             layout.channels.push_back(toUtf8(names[column]));
+        }
     }
     layout.device = addGroup(layout, columns);
 }
@@ -352,8 +393,9 @@ void layOutSpectra(const std::vector<double>& firstRow, Meanings& meanings, Layo
         std::unique(columns.begin(), columns.end(),
                     [&](std::size_t a, std::size_t b) { return wavelength(a) == wavelength(b); }),
         columns.end());
-    if (columns.size() < 2)
+    if (columns.size() < 2) {
         return;
+    }
     const int base = wavelength(columns[0]);
     const int step = wavelength(columns[1]) - base;
     for (std::size_t i = 1; i < columns.size(); ++i) {
@@ -368,8 +410,9 @@ void layOutSpectra(const std::vector<double>& firstRow, Meanings& meanings, Layo
     layout.unit = meanings[columns[0]].unit;
     layout.spectra = addGroup(layout, columns);
     layout.wavelengths = addGroup(layout, stated);
-    for (const std::size_t column : stated)
+    for (const std::size_t column : stated) {
         layout.statedWavelengths.push_back(firstRow[column]);
+    }
 }
 
 void noteOddGroups(const Meanings& meanings, Layout& layout) {
@@ -383,11 +426,13 @@ void noteOddGroups(const Meanings& meanings, Layout& layout) {
                   {Quantity::Lab, 3, "Lab"}};
     for (const auto& group : groups) {
         const std::size_t found = columnsOf(meanings, group.quantity, group.size).size();
-        if (found > 0 && found < static_cast<std::size_t>(group.size))
+        if (found > 0 && found < static_cast<std::size_t>(group.size)) {
             layout.notes.push_back(std::string("Some ") + group.name + " columns are missing.");
-        if (allOf(meanings, group.quantity).size() > found && found > 0)
+        }
+        if (allOf(meanings, group.quantity).size() > found && found > 0) {
             layout.notes.push_back(std::string(group.name) +
                                    " columns stand there more than once: the first ones count.");
+        }
     }
 }
 
@@ -404,10 +449,12 @@ std::vector<ColumnMeaning> meaningsOf(const std::vector<std::string>& names) {
         for (std::size_t i = 0; i + run.size() <= plain.size(); ++i) {
             if (!std::equal(plain.begin() + static_cast<std::ptrdiff_t>(i),
                             plain.begin() + static_cast<std::ptrdiff_t>(i + run.size()),
-                            run.names.begin()))
+                            run.names.begin())) {
                 continue;
-            for (std::size_t k = 0; k < run.size(); ++k)
+            }
+            for (std::size_t k = 0; k < run.size(); ++k) {
                 meanings[i + k] = {run.quantity, static_cast<int>(k)};
+            }
         }
     }
     // One bare number among the names may be anything; a row of them is a spectrum.
@@ -416,11 +463,13 @@ std::vector<ColumnMeaning> meaningsOf(const std::vector<std::string>& names) {
                !plain[i].ends_with("NM");
     };
     std::size_t bare = 0;
-    for (std::size_t i = 0; i < plain.size(); ++i)
+    for (std::size_t i = 0; i < plain.size(); ++i) {
         bare += isBare(i) ? 1 : 0;
+    }
     for (std::size_t i = 0; i < plain.size() && bare < 4; ++i) {
-        if (isBare(i))
+        if (isBare(i)) {
             meanings[i] = {};
+        }
     }
     return meanings;
 }
@@ -453,10 +502,11 @@ Layout layoutOf(const std::vector<std::string>& names, const std::vector<double>
     Layout layout;
     layout.columns.resize(names.size());
     Meanings meanings = meaningsOf(names);
-    if (!allOf(meanings, Quantity::CurveInput).empty())
+    if (!allOf(meanings, Quantity::CurveInput).empty()) {
         layout.kind = TableKind::Curve;
-    else if (!allOf(meanings, Quantity::RowIndex).empty())
+    } else if (!allOf(meanings, Quantity::RowIndex).empty()) {
         layout.kind = TableKind::Extremes;
+    }
 
     if (const auto id = bestOf(meanings, Quantity::Id)) {
         layout.columns[*id].kind = Column::Id;
@@ -467,12 +517,15 @@ Layout layoutOf(const std::vector<std::string>& names, const std::vector<double>
         layout.hasNames = true;
     }
     layOutDevice(names, meanings, layout);
-    if (const auto xyz = columnsOf(meanings, Quantity::Xyz, 3); xyz.size() == 3)
+    if (const auto xyz = columnsOf(meanings, Quantity::Xyz, 3); xyz.size() == 3) {
         layout.xyz = addGroup(layout, xyz);
-    if (const auto lab = columnsOf(meanings, Quantity::Lab, 3); lab.size() == 3)
+    }
+    if (const auto lab = columnsOf(meanings, Quantity::Lab, 3); lab.size() == 3) {
         layout.lab = addGroup(layout, lab);
-    if (wantSpectra || (layout.xyz.count == 0 && layout.lab.count == 0))
+    }
+    if (wantSpectra || (layout.xyz.count == 0 && layout.lab.count == 0)) {
         layOutSpectra(firstRow, meanings, layout);
+    }
     noteOddGroups(meanings, layout);
     return layout;
 }

@@ -33,10 +33,12 @@ std::vector<std::string> wordsOf(std::string_view text) {
     std::vector<std::string> words;
     for (std::size_t i = 0; i < text.size();) {
         std::size_t end = i;
-        while (end < text.size() && isWordSign(text[end]))
+        while (end < text.size() && isWordSign(text[end])) {
             ++end;
-        if (end > i)
+        }
+        if (end > i) {
             words.push_back(upperCase(text.substr(i, end - i)));
+        }
         i = std::max(end, i + 1);
     }
     return words;
@@ -49,11 +51,13 @@ bool isMeasurementCondition(std::string_view word) {
 /// D50 and its like, F1 to F12, and, where the keyword asks for nothing else, A, C and E.
 bool isIlluminant(std::string_view word, bool ownKeyword) {
     for (const char* daylight : {"D50", "D55", "D65", "D75"}) {
-        if (word == daylight)
+        if (word == daylight) {
             return true;
+        }
     }
-    if (!ownKeyword)
+    if (!ownKeyword) {
         return false;
+    }
     const bool fluorescent = word.size() >= 2 && word.size() <= 3 && word[0] == 'F' &&
                              std::all_of(word.begin() + 1, word.end(), isDigit);
     return fluorescent || word == "A" || word == "C" || word == "E";
@@ -64,21 +68,25 @@ std::optional<std::string> observerIn(std::string_view text) {
     const std::string upper = upperCase(text);
     std::optional<std::string> found;
     for (std::size_t i = 0; i < upper.size(); ++i) {
-        if (!isDigit(upper[i]))
+        if (!isDigit(upper[i])) {
             continue;
+        }
         std::size_t end = i;
-        while (end < upper.size() && isDigit(upper[end]))
+        while (end < upper.size() && isDigit(upper[end])) {
             ++end;
+        }
         const std::string number = upper.substr(i, end - i);
         const bool alone = i == 0 || (!isWordSign(upper[i - 1]) && upper[i - 1] != '.' &&
                                       upper[i - 1] != '/' && upper[i - 1] != ':');
         std::size_t unit = end;
-        while (unit < upper.size() && (upper[unit] == ' ' || upper[unit] == '-'))
+        while (unit < upper.size() && (upper[unit] == ' ' || upper[unit] == '-')) {
             ++unit;
+        }
         const bool degrees = upper.compare(unit, 3, "DEG") == 0 || upper.compare(unit, 2, "°") == 0;
         if (alone && degrees && (number == "2" || number == "10")) {
-            if (found && *found != number)
+            if (found && *found != number) {
                 return std::nullopt;
+            }
             found = number;
         }
         i = end;
@@ -88,19 +96,23 @@ std::optional<std::string> observerIn(std::string_view text) {
 
 /// As observerIn, for a text that is about the observer alone: "2", "CIE 1931".
 std::optional<std::string> observerAlone(std::string_view text) {
-    if (auto observer = observerIn(text))
+    if (auto observer = observerIn(text)) {
         return observer;
+    }
     std::optional<std::string> found;
     for (const std::string& word : wordsOf(text)) {
         std::string number;
-        if (word == "2" || word == "2DEG" || word == "1931")
+        if (word == "2" || word == "2DEG" || word == "1931") {
             number = "2";
-        else if (word == "10" || word == "10DEG" || word == "1964")
+        } else if (word == "10" || word == "10DEG" || word == "1964") {
             number = "10";
-        if (number.empty() || number == found)
+        }
+        if (number.empty() || number == found) {
             continue;
-        if (found)
+        }
+        if (found) {
             return std::nullopt;
+        }
         found = number;
     }
     return found;
@@ -127,21 +139,24 @@ void ConditionFinder::see(std::string_view keyword, std::string_view value) {
     if (is({"ILLUMINANT", "ILLUMINATION", "ILLUMINATION_NAME"}) ||
         (weighting && upper.find("ILLUMINANT") != std::string::npos)) {
         for (const std::string& word : wordsOf(value)) {
-            if (isIlluminant(word, true))
+            if (isIlluminant(word, true)) {
                 m_illuminant.add(Keyword, word);
-            else if (isMeasurementCondition(word))
+            } else if (isMeasurementCondition(word)) {
                 m_measurement.add(Keyword, word);
+            }
         }
     }
     if (is({"OBSERVER", "OBSERVER_ANGLE", "STANDARD_OBSERVER"})) {
-        if (const auto observer = observerAlone(value))
+        if (const auto observer = observerAlone(value)) {
             m_observer.add(Keyword, *observer);
+        }
     }
     if (weighting) {
         const std::size_t at = upper.find("OBSERVER");
         if (at != std::string::npos) {
-            if (const auto observer = observerAlone(value.substr(at)))
+            if (const auto observer = observerAlone(value.substr(at))) {
                 m_observer.add(Keyword, *observer);
+            }
         }
     }
     if (keyword == "ILLUMINATION_CONDITION" && value.size() == 1 && value[0] >= '0' &&
@@ -151,21 +166,28 @@ void ConditionFinder::see(std::string_view keyword, std::string_view value) {
     } else if (is({"ILLUMINATION_CONDITION", "MEASUREMENT_CONDITION", "MEASUREMENT_CONDITIONS",
                    "MEASUREMENT_MODE", "MEASUREMENT_STANDARD"})) {
         for (const std::string& word : wordsOf(value)) {
-            if (isMeasurementCondition(word))
+            if (isMeasurementCondition(word)) {
                 m_measurement.add(Keyword, word);
+            }
         }
     }
-    if (keyword == "MEASUREMENT_GEOMETRY")
+    if (keyword == "MEASUREMENT_GEOMETRY") {
         seeProse(Geometry, value);
+    }
     if (is({"INSTRUMENTATION", "MEASUREMENT_SOURCE", "MEASUREMENT_CONDITION",
-            "MEASUREMENT_CONDITIONS", "COMPUTATIONAL_PARAMETER"}))
+            "MEASUREMENT_CONDITIONS", "COMPUTATIONAL_PARAMETER"})) {
         seeProse(Prose, value);
-    if (keyword == "MEASUREMENT_SOURCE" && upper.find("TUNGSTEN") != std::string::npos)
+    }
+    if (keyword == "MEASUREMENT_SOURCE" && upper.find("TUNGSTEN") != std::string::npos) {
         m_measurement.add(Hint, "M0");
-    if (is({"FILTER", "FILTER_STATUS"}))
+    }
+    if (is({"FILTER", "FILTER_STATUS"})) {
         seeFilter(value);
-    if (is({"POLARIZATION", "POLARISATION"}) && (upper == "YES" || upper == "TRUE" || upper == "1"))
+    }
+    if (is({"POLARIZATION", "POLARISATION"}) &&
+        (upper == "YES" || upper == "TRUE" || upper == "1")) {
         m_measurement.add(Filter, "M3");
+    }
 }
 
 /// Looks for all three in a text, and for named parts such as Filter=UVcut.
@@ -175,40 +197,47 @@ void ConditionFinder::seeProse(Rank rank, std::string_view text) {
         const std::size_t end = std::min(text.find_first_of(" \t,;", at), text.size());
         const std::string_view part = text.substr(at, end - at);
         const std::size_t equals = part.find('=');
-        if (equals == std::string_view::npos)
+        if (equals == std::string_view::npos) {
             rest.append(part);
-        else
+        } else {
             seeNamed(upperCase(part.substr(0, equals)), part.substr(equals + 1));
-        if (end < text.size())
+        }
+        if (end < text.size()) {
             rest += text[end];
+        }
         at = end + 1;
     }
     for (const std::string& word : wordsOf(rest)) {
-        if (isIlluminant(word, false))
+        if (isIlluminant(word, false)) {
             m_illuminant.add(rank, word);
-        else if (isMeasurementCondition(word))
+        } else if (isMeasurementCondition(word)) {
             m_measurement.add(rank, word);
+        }
     }
-    if (const auto observer = observerIn(rest))
+    if (const auto observer = observerIn(rest)) {
         m_observer.add(rank, *observer);
+    }
 }
 
 /// `name` in capitals.
 void ConditionFinder::seeNamed(std::string_view name, std::string_view value) {
     if (name.ends_with("OBSERVERANGLE") || name.ends_with("OBSERVER")) {
-        if (const auto observer = observerAlone(value))
+        if (const auto observer = observerAlone(value)) {
             m_observer.add(Named, *observer);
+        }
     } else if (name.ends_with("MEASUREMENTCONDITION")) {
         for (const std::string& word : wordsOf(value)) {
-            if (isMeasurementCondition(word))
+            if (isMeasurementCondition(word)) {
                 m_measurement.add(Named, word);
+            }
         }
     } else if (name.ends_with("ILLUMINATION") || name.ends_with("ILLUMINANT")) {
         for (const std::string& word : wordsOf(value)) {
-            if (isIlluminant(word, true))
+            if (isIlluminant(word, true)) {
                 m_illuminant.add(Named, word);
-            else if (isMeasurementCondition(word))
+            } else if (isMeasurementCondition(word)) {
                 m_measurement.add(Named, word);
+            }
         }
     } else if (name.ends_with("FILTER")) {
         seeFilter(value);
@@ -225,20 +254,22 @@ void ConditionFinder::seeFilter(std::string_view text) {
         });
     };
     for (const std::string& word : words) {
-        if (isMeasurementCondition(word))
+        if (isMeasurementCondition(word)) {
             m_measurement.add(Filter, word);
+        }
     }
-    if (holds({"NO"}))
+    if (holds({"NO"})) {
         m_measurement.add(Hint, "M0");
-    else if (holds({"NONE", "INCLUDED", "UVIN", "UVINC"}))
+    } else if (holds({"NONE", "INCLUDED", "UVIN", "UVINC"})) {
         return;
-    else if (holds({"POL", "POLARIZED", "POLARISED", "POLARIZATION", "POLARISATION", "POLARIZER",
-                    "POLARISER"}))
+    } else if (holds({"POL", "POLARIZED", "POLARISED", "POLARIZATION", "POLARISATION", "POLARIZER",
+                      "POLARISER"})) {
         m_measurement.add(Filter, "M3");
-    else if (holds({"UV", "UVCUT", "UVEX", "UVEXCLUDED", "UVFILTER"}))
+    } else if (holds({"UV", "UVCUT", "UVEX", "UVEXCLUDED", "UVFILTER"})) {
         m_measurement.add(Filter, "M2");
-    else if (holds({"D50"}))
+    } else if (holds({"D50"})) {
         m_measurement.add(Filter, "M1");
+    }
 }
 
 Conditions ConditionFinder::result() const {

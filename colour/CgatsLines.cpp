@@ -32,20 +32,24 @@ std::size_t sequenceLength(const char* at, const char* end) {
     const auto follows = [&](std::size_t i) { return (byte(i) & 0xC0) == 0x80; };
     const auto left = static_cast<std::size_t>(end - at);
     const unsigned char lead = byte(0);
-    if (lead < 0x80)
+    if (lead < 0x80) {
         return 1;
-    if (lead >= 0xC2 && lead <= 0xDF)
+    }
+    if (lead >= 0xC2 && lead <= 0xDF) {
         return left >= 2 && follows(1) ? 2 : 0;
+    }
     if (lead >= 0xE0 && lead <= 0xEF) {
-        if (left < 3 || !follows(1) || !follows(2))
+        if (left < 3 || !follows(1) || !follows(2)) {
             return 0;
+        }
         const bool overlong = lead == 0xE0 && byte(1) < 0xA0;
         const bool surrogate = lead == 0xED && byte(1) > 0x9F;
         return overlong || surrogate ? 0 : 3;
     }
     if (lead >= 0xF0 && lead <= 0xF4) {
-        if (left < 4 || !follows(1) || !follows(2) || !follows(3))
+        if (left < 4 || !follows(1) || !follows(2) || !follows(3)) {
             return 0;
+        }
         const bool overlong = lead == 0xF0 && byte(1) < 0x90;
         const bool tooHigh = lead == 0xF4 && byte(1) > 0x8F;
         return overlong || tooHigh ? 0 : 4;
@@ -58,8 +62,9 @@ bool isUtf8(std::string_view text) {
     const char* const end = at + text.size();
     while (at != end) {
         const std::size_t length = sequenceLength(at, end);
-        if (length == 0)
+        if (length == 0) {
             return false;
+        }
         at += length;
     }
     return true;
@@ -67,19 +72,24 @@ bool isUtf8(std::string_view text) {
 
 /// Cuts a text that is longer than is kept, never inside a UTF-8 character.
 std::string_view bounded(std::string_view text) {
-    if (text.size() <= maxHeaderValue)
+    if (text.size() <= maxHeaderValue) {
         return text;
+    }
     std::size_t length = maxHeaderValue;
-    while (length > maxHeaderValue - 4 && (static_cast<unsigned char>(text[length]) & 0xC0) == 0x80)
+    while (length > maxHeaderValue - 4 &&
+           (static_cast<unsigned char>(text[length]) & 0xC0) == 0x80) {
         --length;
+    }
     return text.substr(0, length);
 }
 
 std::string_view trimmed(std::string_view text, const CharTable& chars) {
-    while (!text.empty() && !chars.isPlain(text.front()))
+    while (!text.empty() && !chars.isPlain(text.front())) {
         text.remove_prefix(1);
-    while (!text.empty() && !chars.isPlain(text.back()))
+    }
+    while (!text.empty() && !chars.isPlain(text.back())) {
         text.remove_suffix(1);
+    }
     return text;
 }
 
@@ -89,17 +99,18 @@ Word takeWord(const char*& at, const char* end, const CharTable& chars) {
     Word word;
     if (*at != '"') {
         const char* const start = at;
-        do
+        do {
             ++at;
-        while (at != end && chars.isPlain(*at));
+        } while (at != end && chars.isPlain(*at));
         word.text = {start, static_cast<std::size_t>(at - start)};
         return word;
     }
     word.quoted = true;
     const char* const start = ++at;
     for (; at != end && !chars.isLineEnd(*at); ++at) {
-        if (*at != '"')
+        if (*at != '"') {
             continue;
+        }
         if (closes(at, end, chars)) {
             word.text = {start, static_cast<std::size_t>(at - start)};
             ++at;
@@ -115,21 +126,24 @@ Word takeWord(const char*& at, const char* end, const CharTable& chars) {
 }
 
 std::string wordText(const Word& word) {
-    if (!word.doubledQuotes)
+    if (!word.doubledQuotes) {
         return std::string(word.text);
+    }
     std::string text;
     text.reserve(word.text.size());
     for (std::size_t i = 0; i < word.text.size(); ++i) {
         text += word.text[i];
-        if (word.text[i] == '"' && i + 1 < word.text.size() && word.text[i + 1] == '"')
+        if (word.text[i] == '"' && i + 1 < word.text.size() && word.text[i + 1] == '"') {
             ++i;
+        }
     }
     return text;
 }
 
 const char* lineEndOf(const char* at, const char* end) {
-    while (at != end && *at != '\n' && *at != '\r')
+    while (at != end && *at != '\n' && *at != '\r') {
         ++at;
+    }
     return at;
 }
 
@@ -139,8 +153,9 @@ bool splitWords(std::string_view line, const CharTable& chars, std::size_t limit
     const char* const end = line.data() + line.size();
     const char* at = skipBlanks(line.data(), end, chars);
     while (at != end && *at != '#') {
-        if (words.size() == limit)
+        if (words.size() == limit) {
             return false;
+        }
         words.push_back(takeWord(at, end, chars));
         at = skipBlanks(at, end, chars);
     }
@@ -154,10 +169,12 @@ bool splitCells(std::string_view line, const CharTable& chars, std::size_t limit
     const char* const end = line.data() + line.size();
     const char* at = line.data();
     while (true) {
-        if (cells.size() == limit)
+        if (cells.size() == limit) {
             return false;
-        while (at != end && *at != separator && chars.isBlank(*at))
+        }
+        while (at != end && *at != separator && chars.isBlank(*at)) {
             ++at;
+        }
         Word cell;
         if (at != end && *at == '"') {
             cell = takeWord(at, end, chars);
@@ -168,8 +185,9 @@ bool splitCells(std::string_view line, const CharTable& chars, std::size_t limit
             at = next;
         }
         cells.push_back(cell);
-        if (at == end)
+        if (at == end) {
             return true;
+        }
         ++at;
     }
 }
@@ -177,13 +195,15 @@ bool splitCells(std::string_view line, const CharTable& chars, std::size_t limit
 bool unwrapLine(std::string_view line, std::string& inner) {
     const char* const end = line.data() + line.size();
     const char* at = skipBlanks(line.data(), end, blanksSeparate);
-    if (at == end || *at != '"')
+    if (at == end || *at != '"') {
         return false;
+    }
     const Word word = takeWord(at, end, blanksSeparate);
     const bool alone = std::all_of(
         at, end, [](char c) { return blanksSeparate.isBlank(c) || c == ',' || c == ';'; });
-    if (!alone || word.text.find(' ') == std::string_view::npos)
+    if (!alone || word.text.find(' ') == std::string_view::npos) {
         return false;
+    }
     inner = wordText(word);
     // A spreadsheet doubles every quote inside; others belong to cells of their own.
     const auto quotes = [](std::string_view text) {
@@ -194,8 +214,9 @@ bool unwrapLine(std::string_view line, std::string& inner) {
 
 KeywordLine keywordLine(std::string_view line) {
     // Trailing separators are what a spreadsheet leaves of empty cells.
-    while (!line.empty() && (line.back() == ',' || line.back() == ';' || line.back() == '\t'))
+    while (!line.empty() && (line.back() == ',' || line.back() == ';' || line.back() == '\t')) {
         line.remove_suffix(1);
+    }
 
     KeywordLine result;
     std::string inner;
@@ -203,21 +224,25 @@ KeywordLine keywordLine(std::string_view line) {
         // A sentence in quotes is no keyword line, whatever word it begins with.
         const auto signs = static_cast<std::size_t>(
             std::find_if_not(inner.begin(), inner.end(), isKeywordSign) - inner.begin());
-        if (signs >= 2 && signs < inner.size() && !blanksSeparate.isPlain(inner[signs]))
+        if (signs >= 2 && signs < inner.size() && !blanksSeparate.isPlain(inner[signs])) {
             line = inner;
+        }
     }
     const char* const end = line.data() + line.size();
     const char* at = skipBlanks(line.data(), end, anySeparates);
-    if (at == end)
+    if (at == end) {
         return result;
+    }
     std::string_view name = takeWord(at, end, anySeparates).text;
-    if (name.ends_with(':'))
+    if (name.ends_with(':')) {
         name.remove_suffix(1);
+    }
     result.keyword = upperCase(name.substr(0, 256)); // no keyword is longer
 
     at = skipBlanks(at, end, anySeparates);
-    if (at == end || *at == '#')
+    if (at == end || *at == '#') {
         return result;
+    }
     if (*at == '"') {
         Word value = takeWord(at, end, blanksSeparate);
         value.text = bounded(value.text);
@@ -253,14 +278,16 @@ bool isAscii(std::string_view text) {
         std::memcpy(&eight, text.data(), sizeof eight);
         bits |= eight;
     }
-    for (const char c : text)
+    for (const char c : text) {
         bits |= static_cast<unsigned char>(c);
+    }
     return (bits & 0x8080808080808080) == 0;
 }
 
 std::string toUtf8(std::string_view text) {
-    if (isUtf8(text))
+    if (isUtf8(text)) {
         return std::string(text);
+    }
     std::string result;
     result.reserve(text.size() + text.size() / 8);
     for (const char c : text) {

@@ -18,13 +18,16 @@ class CharTable {
   public:
     /// `separator` is 0 for blanks and tabs alone, else the sign that separates too.
     explicit constexpr CharTable(char separator, char another = 0) : m_separator(separator) {
-        for (const char blank : {' ', '\t', '\v', '\f', '\x1a'}) // 1A ends texts of old systems
+        for (const char blank : {' ', '\t', '\v', '\f', '\x1a'}) { // 1A ends texts of old systems
             m_kinds[static_cast<unsigned char>(blank)] = blankChar;
-        for (const char lineEnd : {'\n', '\r'})
+        }
+        for (const char lineEnd : {'\n', '\r'}) {
             m_kinds[static_cast<unsigned char>(lineEnd)] = lineEndChar;
+        }
         for (const char more : {separator, another}) {
-            if (more != 0)
+            if (more != 0) {
                 m_kinds[static_cast<unsigned char>(more)] = blankChar;
+            }
         }
     }
 
@@ -68,8 +71,9 @@ std::string wordText(const Word& word);
 
 /// Next character that is no blank, or `end`.
 inline const char* skipBlanks(const char* at, const char* end, const CharTable& chars) {
-    while (at != end && chars.isBlank(*at))
+    while (at != end && chars.isBlank(*at)) {
         ++at;
+    }
     return at;
 }
 

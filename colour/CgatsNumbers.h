@@ -55,8 +55,9 @@ inline constexpr double powersOfTen[mostDigits + 1] = {1e0,  1e1,  1e2,  1e3,  1
 /// Up to seven digits and a point without a loop: eight bytes are taken as one word, whose lowest
 /// byte is the first character.
 inline bool NumberReader::readShort(const char*& at, const char* end, double& value) {
-    if (std::endian::native != std::endian::little || end - at < 9)
+    if (std::endian::native != std::endian::little || end - at < 9) {
         return false;
+    }
     const bool negative = *at == '-';
     const char* const p = at + (negative ? 1 : 0);
     std::uint64_t digits = 0;
@@ -64,15 +65,17 @@ inline bool NumberReader::readShort(const char*& at, const char* end, double& va
     digits ^= 0x3030303030303030; // digits become 0 to 9
     // The top bit of every byte that is no digit, exact up to the second such byte.
     std::uint64_t others = (digits | (digits + 0x7676767676767676)) & 0x8080808080808080;
-    if (others == 0)
+    if (others == 0) {
         return false;
+    }
     int length = std::countr_zero(others) / 8;
     int count = length;
     int decimals = 0;
     if (p[length] == '.') {
         others &= others - 1;
-        if (others == 0)
+        if (others == 0) {
             return false;
+        }
         const std::uint64_t whole = (std::uint64_t{1} << (8 * length)) - 1;
         digits = (digits & whole) | ((digits >> 8) & ~whole);
         count = std::countr_zero(others) / 8 - 1;
@@ -80,8 +83,9 @@ inline bool NumberReader::readShort(const char*& at, const char* end, double& va
         length = count + 1;
         m_points = true;
     }
-    if (count == 0 || m_chars->isPlain(p[length]))
+    if (count == 0 || m_chars->isPlain(p[length])) {
         return false;
+    }
     // Zeros in front make eight digits; then pairs, fours and all eight are put together.
     digits <<= 8 * (8 - count);
     digits = 10 * digits + (digits >> 8);

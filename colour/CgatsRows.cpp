@@ -31,8 +31,9 @@ std::string counted(std::size_t number, const char* what) {
 
 void Notes::add(std::string note) {
     if (m_notes.size() < mostNotes &&
-        std::find(m_notes.begin(), m_notes.end(), note) == m_notes.end())
+        std::find(m_notes.begin(), m_notes.end(), note) == m_notes.end()) {
         m_notes.push_back(std::move(note));
+    }
 }
 
 RowReader::RowReader(std::string_view text, bool ascii, const TableHeader& header,
@@ -44,26 +45,33 @@ Failure RowReader::read(const char*& at, Table& table) {
     m_begin = m_at = at;
     useNames(m_header.names, {});
     const Form form = findRow() ? inspectFirstRow() : Form::Lines;
-    if (m_layout.columns.size() > maxCgatsColumns)
+    if (m_layout.columns.size() > maxCgatsColumns) {
         return Failure::TooLarge;
-    for (const std::string& note : m_layout.notes)
+    }
+    for (const std::string& note : m_layout.notes) {
         m_notes.add(note);
+    }
     m_set.deviceSpace = m_layout.deviceSpace;
     m_set.channels = m_layout.channels;
     m_set.axis = m_layout.axis;
     reserveRows();
 
     Failure failure = readRows(form);
-    if (failure == Failure::None)
+    if (failure == Failure::None) {
         failure = checkEnd();
-    if (failure == Failure::None && m_numbers.isAmbiguous())
+    }
+    if (failure == Failure::None && m_numbers.isAmbiguous()) {
         failure = Failure::NotNumeric;
-    if (failure == Failure::None)
+    }
+    if (failure == Failure::None) {
         failure = dropUnreadableGroups();
-    if (failure != Failure::None)
+    }
+    if (failure != Failure::None) {
         return failure;
-    if (m_numbers.sawCommas())
+    }
+    if (m_numbers.sawCommas()) {
         m_notes.add("Commas are read as decimal points.");
+    }
     at = m_at;
     table.set = std::move(m_set);
     table.unit = m_layout.unit;
@@ -84,8 +92,9 @@ void RowReader::useNames(const std::vector<std::string>& names,
 void RowReader::reserveRows() {
     const std::size_t room =
         static_cast<std::size_t>(m_end - m_at) / (2 * m_layout.columns.size()) + 1;
-    if (!m_header.setCount || *m_header.setCount > std::min(room, maxCgatsPatches))
+    if (!m_header.setCount || *m_header.setCount > std::min(room, maxCgatsPatches)) {
         return;
+    }
     const auto rows = static_cast<std::size_t>(*m_header.setCount);
     m_set.device.reserve(rows * m_layout.device.count);
     m_set.spectra.reserve(rows * m_layout.spectra.count);
@@ -97,8 +106,9 @@ void RowReader::reserveRows() {
 
 Failure RowReader::readRows(Form form) {
     while (!m_ended && findRow()) {
-        if (m_set.patchCount == maxCgatsPatches)
+        if (m_set.patchCount == maxCgatsPatches) {
             return Failure::TooLarge;
+        }
         const bool quick = form == Form::Lines   ? quickRow<Form::Lines>()
                            : form == Form::Cells ? quickRow<Form::Cells>()
                                                  : quickRow<Form::Stream>();
@@ -106,10 +116,12 @@ Failure RowReader::readRows(Form form) {
             append();
             continue;
         }
-        if (form == Form::Stream)
+        if (form == Form::Stream) {
             return Failure::Damaged;
-        if (const Failure failure = carefulRow(); failure != Failure::None)
+        }
+        if (const Failure failure = carefulRow(); failure != Failure::None) {
             return failure;
+        }
     }
     return Failure::None;
 }
@@ -117,12 +129,15 @@ Failure RowReader::readRows(Form form) {
 /// Goes to the next line that is neither blank nor a comment. False at END_DATA and at the end.
 bool RowReader::findRow() {
     while (true) {
-        while (m_at != m_end && !m_chars->isPlain(*m_at))
+        while (m_at != m_end && !m_chars->isPlain(*m_at)) {
             ++m_at;
-        if (m_at == m_end)
+        }
+        if (m_at == m_end) {
             return false;
-        if (*m_at != '#')
+        }
+        if (*m_at != '#') {
             break;
+        }
         m_at = lineEndOf(m_at, m_end);
     }
     return !takeEndOfData();
@@ -131,22 +146,26 @@ bool RowReader::findRow() {
 /// The whole line, with the separators in front of an empty first cell.
 std::string_view RowReader::lineAtHand() const {
     const char* start = m_at;
-    while (start != m_begin && m_chars->isBlank(start[-1]))
+    while (start != m_begin && m_chars->isBlank(start[-1])) {
         --start;
+    }
     return {start, static_cast<std::size_t>(lineEndOf(m_at, m_end) - start)};
 }
 
 bool RowReader::takeEndOfData() {
-    if (*m_at != 'E' && *m_at != 'e' && *m_at != '"')
+    if (*m_at != 'E' && *m_at != 'e' && *m_at != '"') {
         return false;
+    }
     const char* behind = m_at;
     const Word word = takeWord(behind, m_end, *m_chars);
-    if (!sameWord(word.text, "END_DATA"))
+    if (!sameWord(word.text, "END_DATA")) {
         return false;
+    }
     if (word.quoted) { // alone in its line; else it is an id
         behind = skipBlanks(behind, m_end, *m_chars);
-        if (behind != m_end && !m_chars->isLineEnd(*behind))
+        if (behind != m_end && !m_chars->isLineEnd(*behind)) {
             return false;
+        }
     }
     m_at = lineEndOf(behind, m_end);
     m_ended = true;
@@ -160,8 +179,9 @@ RowReader::Form RowReader::inspectFirstRow() {
     Form form = Form::Cells;
     if (!cellsBySeparator(row) && !cellsBySpreadsheet(row)) {
         if (!splitWords(row, *m_chars, mostWords(),
-                        m_words)) // as many whole rows as were looked at
+                        m_words)) { // as many whole rows as were looked at
             m_words.resize(m_words.size() - m_words.size() % m_layout.columns.size());
+        }
         form = formOfWords(line.data() + line.size());
     }
     std::vector<std::string> names = m_header.names;
@@ -204,12 +224,14 @@ std::size_t RowReader::mostWords() const {
 /// True if semicolons or commas give the row that blanks don't, though the names don't show it.
 bool RowReader::cellsBySpreadsheet(std::string_view row) {
     splitWords(row, *m_chars, mostWords(), m_words);
-    if (m_chars != &blanksSeparate || m_words.size() >= m_layout.columns.size())
+    if (m_chars != &blanksSeparate || m_words.size() >= m_layout.columns.size()) {
         return false;
+    }
     for (const CharTable* chars : {&semicolonsSeparate, &commasSeparate}) {
         m_chars = chars;
-        if (cellsBySeparator(row))
+        if (cellsBySeparator(row)) {
             return true;
+        }
     }
     m_chars = &blanksSeparate;
     return false;
@@ -221,17 +243,20 @@ bool RowReader::completedByNextLines(const char* at) {
     const std::size_t have = m_words.size();
     std::vector<Word> words;
     while (m_words.size() < width) {
-        while (at != m_end && !m_chars->isPlain(*at))
+        while (at != m_end && !m_chars->isPlain(*at)) {
             ++at;
+        }
         const std::string_view line(at, static_cast<std::size_t>(lineEndOf(at, m_end) - at));
         const bool fits = splitWords(line, *m_chars, width, words);
-        if (at == m_end || !fits || (!words.empty() && sameWord(words[0].text, "END_DATA")))
+        if (at == m_end || !fits || (!words.empty() && sameWord(words[0].text, "END_DATA"))) {
             break;
+        }
         m_words.insert(m_words.end(), words.begin(), words.end());
         at = line.data() + line.size();
     }
-    if (m_words.size() == width)
+    if (m_words.size() == width) {
         return true;
+    }
     m_words.resize(have);
     return false;
 }
@@ -239,13 +264,16 @@ bool RowReader::completedByNextLines(const char* at) {
 /// True if a first row with more cells than names belongs to columns whose names were lost: the
 /// header counts them, or the next row has as many and no name with blanks explains it.
 bool RowReader::namesAreLost(const char* behind) const {
-    if (!allNumbers(m_words.data()) || m_header.fieldCount == m_layout.columns.size())
+    if (!allNumbers(m_words.data()) || m_header.fieldCount == m_layout.columns.size()) {
         return false;
-    if (m_header.fieldCount == m_words.size())
+    }
+    if (m_header.fieldCount == m_words.size()) {
         return true;
+    }
     const char* next = behind;
-    while (next != m_end && !m_chars->isPlain(*next))
+    while (next != m_end && !m_chars->isPlain(*next)) {
         ++next;
+    }
     std::vector<Word> words;
     splitWords({next, static_cast<std::size_t>(lineEndOf(next, m_end) - next)}, *m_chars,
                mostWords(), words);
@@ -258,8 +286,9 @@ inline const char* RowReader::toCell(const char* at, bool isFirst) const {
     const CharTable& chars = *m_chars;
     if constexpr (form == Form::Cells) {
         const auto skip = [&] {
-            while (at != m_end && chars.isBlank(*at) && *at != chars.cellSeparator())
+            while (at != m_end && chars.isBlank(*at) && *at != chars.cellSeparator()) {
                 ++at;
+            }
         };
         skip();
         if (!isFirst && at != m_end && *at == chars.cellSeparator()) {
@@ -270,8 +299,9 @@ inline const char* RowReader::toCell(const char* at, bool isFirst) const {
     }
     at = skipBlanks(at, m_end, chars);
     if constexpr (form == Form::Stream) {
-        while (at != m_end && (!chars.isPlain(*at) || *at == '#'))
+        while (at != m_end && (!chars.isPlain(*at) || *at == '#')) {
             at = *at == '#' ? lineEndOf(at, m_end) : at + 1;
+        }
     }
     return at;
 }
@@ -283,20 +313,23 @@ bool RowReader::quickRow() {
     const CharTable& chars = *m_chars;
     const char* at = m_at;
     bool isFirst = true;
-    if (form == Form::Cells && at != m_begin && at[-1] == chars.cellSeparator())
+    if (form == Form::Cells && at != m_begin && at[-1] == chars.cellSeparator()) {
         return false; // the first cell is empty
+    }
     for (const Column& column : m_layout.columns) {
         at = toCell<form>(at, isFirst);
         isFirst = false;
-        if (at == m_end || !chars.isPlain(*at) || *at == '#')
+        if (at == m_end || !chars.isPlain(*at) || *at == '#') {
             return false;
+        }
         switch (column.kind) {
         case Column::Skip:
             takeWord(at, m_end, chars);
             break;
         case Column::Number:
-            if (!quickNumber<form>(at, column.slot))
+            if (!quickNumber<form>(at, column.slot)) {
                 return false;
+            }
             break;
         case Column::Id:
             m_id = takeWord(at, m_end, chars);
@@ -308,10 +341,12 @@ bool RowReader::quickRow() {
     }
     if constexpr (form != Form::Stream) {
         at = skipBlanks(at, m_end, chars);
-        if (at != m_end && *at == '#')
+        if (at != m_end && *at == '#') {
             at = lineEndOf(at, m_end);
-        if (at != m_end && !chars.isLineEnd(*at))
+        }
+        if (at != m_end && !chars.isLineEnd(*at)) {
             return false;
+        }
     }
     m_at = at;
     return true;
@@ -320,13 +355,15 @@ bool RowReader::quickRow() {
 /// A stream has no lines that could be looked at once more: there a text counts at once.
 template<RowReader::Form form>
 inline bool RowReader::quickNumber(const char*& at, std::size_t slot) {
-    if (m_numbers.readPlain(at, m_end, m_values[slot]))
+    if (m_numbers.readPlain(at, m_end, m_values[slot])) {
         return true;
+    }
     const Word word = takeWord(at, m_end, *m_chars);
     const double value = m_numbers.read(word.text);
     if (std::isnan(value)) {
-        if (form != Form::Stream || sameWord(word.text, "END_DATA"))
+        if (form != Form::Stream || sameWord(word.text, "END_DATA")) {
             return false;
+        }
         ++m_unreadable[slot];
     }
     m_values[slot] = value;
@@ -346,8 +383,9 @@ Failure RowReader::carefulRow() {
         append();
         return Failure::None;
     }
-    if (!splitWords(row, *m_chars, mostWords(), m_words))
+    if (!splitWords(row, *m_chars, mostWords(), m_words)) {
         return Failure::Damaged;
+    }
     if (!m_words.empty() && sameWord(m_words.back().text, "END_DATA")) {
         m_words.pop_back();
         m_ended = true;
@@ -357,19 +395,22 @@ Failure RowReader::carefulRow() {
         const bool needed = std::any_of(
             m_layout.columns.begin() + static_cast<std::ptrdiff_t>(m_words.size()),
             m_layout.columns.end(), [](const Column& c) { return c.kind == Column::Number; });
-        if (needed || m_words.empty())
+        if (needed || m_words.empty()) {
             return Failure::Damaged;
+        }
         m_words.resize(width);
     } else if (m_words.size() > width) {
-        if (holdSeveralRows())
+        if (holdSeveralRows()) {
             return appendSeveralRows();
+        }
         if (std::vector<Word> joined = joinedNames(); !joined.empty()) {
             m_words = std::move(joined);
             m_notes.add("Names with blanks are not quoted.");
         } else {
             const bool remark = std::isnan(numberIn(m_words[width].text, '.'));
-            if (!remark || !allNumbers(m_words.data()))
+            if (!remark || !allNumbers(m_words.data())) {
                 return Failure::Damaged;
+            }
             m_notes.add("Words behind the last cell of a row are skipped.");
         }
     }
@@ -381,12 +422,15 @@ Failure RowReader::carefulRow() {
 /// Splits the row by its strict separator. True if this gives one cell for each column.
 bool RowReader::cellsBySeparator(std::string_view row) {
     const std::size_t width = m_layout.columns.size();
-    if (row.find(m_chars->cellSeparator()) == std::string_view::npos)
+    if (row.find(m_chars->cellSeparator()) == std::string_view::npos) {
         return false;
-    if (!splitCells(row, *m_chars, width + maxCgatsColumns, m_words))
+    }
+    if (!splitCells(row, *m_chars, width + maxCgatsColumns, m_words)) {
         return false;
-    while (m_words.size() > width && m_words.back().text.empty())
+    }
+    while (m_words.size() > width && m_words.back().text.empty()) {
         m_words.pop_back();
+    }
     return m_words.size() == width;
 }
 
@@ -397,20 +441,23 @@ std::vector<Word> RowReader::joinedNames() const {
     for (const Column::Kind kind : {Column::Name, Column::Id}) {
         const auto column = std::find_if(m_layout.columns.begin(), m_layout.columns.end(),
                                          [&](const Column& c) { return c.kind == kind; });
-        if (column == m_layout.columns.end())
+        if (column == m_layout.columns.end()) {
             continue;
+        }
         const auto first = m_words.begin() + (column - m_layout.columns.begin());
         const auto last = first + surplus;
         if (std::none_of(first, last + 1,
-                         [](const Word& word) { return std::isnan(numberIn(word.text, ',')); }))
+                         [](const Word& word) { return std::isnan(numberIn(word.text, ',')); })) {
             continue;
+        }
         std::vector<Word> joined(m_words.begin(), first + 1);
         const char* const start = first->text.data();
         const char* const end = last->text.data() + last->text.size();
         joined.back().text = {start, static_cast<std::size_t>(end - start)};
         joined.insert(joined.end(), last + 1, m_words.end());
-        if (allNumbers(joined.data()))
+        if (allNumbers(joined.data())) {
             return joined;
+        }
     }
     return {};
 }
@@ -419,15 +466,17 @@ std::vector<Word> RowReader::joinedNames() const {
 bool RowReader::holdSeveralRows() const {
     const std::size_t width = m_layout.columns.size();
     bool numbers = m_words.size() >= 2 * width && m_words.size() % width == 0;
-    for (std::size_t first = 0; numbers && first < m_words.size(); first += width)
+    for (std::size_t first = 0; numbers && first < m_words.size(); first += width) {
         numbers = allNumbers(m_words.data() + first);
+    }
     return numbers;
 }
 
 Failure RowReader::appendSeveralRows() {
     for (std::size_t first = 0; first < m_words.size(); first += m_layout.columns.size()) {
-        if (m_set.patchCount == maxCgatsPatches)
+        if (m_set.patchCount == maxCgatsPatches) {
             return Failure::TooLarge;
+        }
         place(m_words.data() + first);
         append();
     }
@@ -439,8 +488,9 @@ Failure RowReader::appendSeveralRows() {
 bool RowReader::allNumbers(const Word* cells) const {
     for (const Column& column : m_layout.columns) {
         if (column.kind == Column::Number &&
-            std::isnan(numberIn(cells->text, m_chars->decimalComma())))
+            std::isnan(numberIn(cells->text, m_chars->decimalComma()))) {
             return false;
+        }
         ++cells;
     }
     return true;
@@ -463,8 +513,9 @@ void RowReader::place(const Word* cells) {
 }
 
 std::string RowReader::textOf(const Word& word) const {
-    if (word.doubledQuotes)
+    if (word.doubledQuotes) {
         return toUtf8(wordText(word));
+    }
     return m_ascii ? std::string(word.text) : toUtf8(word.text);
 }
 
@@ -475,12 +526,15 @@ void RowReader::append() {
         target.insert(target.end(), values + group.first, values + group.first + group.count);
     };
     ++set.patchCount;
-    if (m_layout.hasIds)
+    if (m_layout.hasIds) {
         set.ids.push_back(textOf(m_id));
-    if (m_layout.hasNames)
+    }
+    if (m_layout.hasNames) {
         set.names.push_back(textOf(m_name));
-    if (m_layout.device.count > 0)
+    }
+    if (m_layout.device.count > 0) {
         add(set.device, m_layout.device);
+    }
     if (m_layout.xyz.count > 0) {
         const double* const xyz = values + m_layout.xyz.first;
         set.xyz.push_back({xyz[0], xyz[1], xyz[2]});
@@ -489,8 +543,9 @@ void RowReader::append() {
         const double* const lab = values + m_layout.lab.first;
         set.lab.push_back({lab[0], lab[1], lab[2]});
     }
-    if (m_layout.spectra.count > 0)
+    if (m_layout.spectra.count > 0) {
         add(set.spectra, m_layout.spectra);
+    }
     if (m_layout.wavelengths.count > 0 && !m_wavelengthsDiffer) {
         m_wavelengthsDiffer =
             !std::equal(m_layout.statedWavelengths.begin(), m_layout.statedWavelengths.end(),
@@ -504,23 +559,27 @@ Failure RowReader::checkEnd() {
     const std::size_t rows = m_set.patchCount;
     if (!m_ended && m_header.hasBegin) {
         const bool lineIsWhole = m_end[-1] == '\n' || m_end[-1] == '\r';
-        if (m_header.setCount != rows || !lineIsWhole)
+        if (m_header.setCount != rows || !lineIsWhole) {
             return Failure::Damaged;
+        }
         m_notes.add("END_DATA is missing; the number of rows is the one stated.");
     }
-    if (m_header.setCount && *m_header.setCount != rows)
+    if (m_header.setCount && *m_header.setCount != rows) {
         m_notes.add("NUMBER_OF_SETS says " + std::to_string(*m_header.setCount) + ", there are " +
                     counted(rows, "rows: the rows count."));
-    if (m_header.fieldCount && *m_header.fieldCount != m_layout.columns.size())
+    }
+    if (m_header.fieldCount && *m_header.fieldCount != m_layout.columns.size()) {
         m_notes.add("NUMBER_OF_FIELDS says " + std::to_string(*m_header.fieldCount) +
                     ", there are " + counted(m_layout.columns.size(), "columns."));
+    }
     return Failure::None;
 }
 
 std::size_t RowReader::unreadableIn(const Group& group) const {
     std::size_t sum = 0;
-    for (std::size_t slot = group.first; slot < group.first + group.count; ++slot)
+    for (std::size_t slot = group.first; slot < group.first + group.count; ++slot) {
         sum += m_unreadable[slot];
+    }
     return sum;
 }
 
@@ -541,8 +600,9 @@ Failure RowReader::dropUnreadableGroups() {
     std::size_t left = std::accumulate(m_unreadable.begin(), m_unreadable.end(), std::size_t{0});
     const auto drop = [&](const Group& group, const char* name, auto clear) {
         const std::size_t unreadable = unreadableIn(group);
-        if (unreadable == 0 || unreadable != group.count * set.patchCount)
+        if (unreadable == 0 || unreadable != group.count * set.patchCount) {
             return;
+        }
         m_notes.add(std::string(name) + " columns hold no numbers.");
         left -= unreadable;
         dropped = true;

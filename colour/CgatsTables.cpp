@@ -71,8 +71,9 @@ std::vector<std::size_t> matchLabels(const std::vector<std::string>& first,
                                      const std::vector<std::string>& next) {
     std::vector<std::size_t> rows(first.size());
     std::iota(rows.begin(), rows.end(), std::size_t{0});
-    if (first == next)
+    if (first == next) {
         return rows;
+    }
     // A chain of equal labels for each label, in the order of the rows.
     std::unordered_map<std::string_view, std::size_t> heads;
     std::vector<std::size_t> following(next.size());
@@ -83,8 +84,9 @@ std::vector<std::size_t> matchLabels(const std::vector<std::string>& first,
     }
     for (std::size_t row = 0; row < first.size(); ++row) {
         const auto head = heads.find(first[row]);
-        if (head == heads.end() || head->second == next.size())
+        if (head == heads.end() || head->second == next.size()) {
             return {};
+        }
         rows[row] = head->second;
         head->second = following[head->second];
     }
@@ -94,8 +96,9 @@ std::vector<std::size_t> matchLabels(const std::vector<std::string>& first,
 /// For each row of `first` the row of `next` that is the same patch; empty if they are not the same
 /// patches.
 std::vector<std::size_t> matchRows(const DataSet& first, const DataSet& next) {
-    if (first.patchCount != next.patchCount)
+    if (first.patchCount != next.patchCount) {
         return {};
+    }
     std::vector<std::size_t> rows;
     if (!first.ids.empty() && !next.ids.empty()) {
         rows = matchLabels(first.ids, next.ids);
@@ -106,14 +109,16 @@ std::vector<std::size_t> matchRows(const DataSet& first, const DataSet& next) {
         std::iota(rows.begin(), rows.end(), std::size_t{0});
     }
     if (rows.empty() || first.device.empty() || next.device.empty() ||
-        first.channels != next.channels)
+        first.channels != next.channels) {
         return rows;
+    }
     const std::size_t channels = first.channels.size();
     for (std::size_t row = 0; row < rows.size(); ++row) {
         const auto here = first.device.begin() + static_cast<std::ptrdiff_t>(row * channels);
         const auto there = next.device.begin() + static_cast<std::ptrdiff_t>(rows[row] * channels);
-        if (!std::equal(here, here + static_cast<std::ptrdiff_t>(channels), there))
+        if (!std::equal(here, here + static_cast<std::ptrdiff_t>(channels), there)) {
             return {};
+        }
     }
     return rows;
 }
@@ -122,12 +127,14 @@ std::vector<std::size_t> matchRows(const DataSet& first, const DataSet& next) {
 template<typename T>
 bool takeColumns(std::vector<T>& target, std::vector<T>& source,
                  const std::vector<std::size_t>& rows, std::size_t width) {
-    if (!target.empty() || source.empty())
+    if (!target.empty() || source.empty()) {
         return false;
+    }
     target.reserve(source.size());
     for (const std::size_t row : rows) {
-        for (std::size_t i = 0; i < width; ++i)
+        for (std::size_t i = 0; i < width; ++i) {
             target.push_back(std::move(source[row * width + i]));
+        }
     }
     return true;
 }
@@ -200,29 +207,35 @@ std::size_t strideOver(std::size_t rows) {
 double statedLuminance(const DataSet& set) {
     double sum = 0;
     for (std::size_t row = 0; row < set.patchCount; row += strideOver(set.patchCount)) {
-        if (!set.lab.empty())
+        if (!set.lab.empty()) {
             sum += luminanceOf(set.lab[row].L);
-        else if (!set.xyz.empty())
+        } else if (!set.xyz.empty()) {
             sum += set.xyz[row].Y;
+        }
     }
     return sum;
 }
 
 void scaleXyz(DataSet& set, ScaleHint hint, Notes& notes) {
-    if (hint == ScaleHint::NeverOfOne)
+    if (hint == ScaleHint::NeverOfOne) {
         return;
+    }
     double largest = 0;
     double sum = 0;
-    for (const Xyz& xyz : set.xyz)
+    for (const Xyz& xyz : set.xyz) {
         largest = std::max({largest, xyz.X, xyz.Y, xyz.Z});
-    for (std::size_t row = 0; row < set.xyz.size(); row += strideOver(set.patchCount))
+    }
+    for (std::size_t row = 0; row < set.xyz.size(); row += strideOver(set.patchCount)) {
         sum += set.xyz[row].Y;
+    }
     const double expected = set.lab.empty() ? 0 : statedLuminance(set);
     const bool ofOne = expected > 0 && sum > 0 ? sum < expected / 10 : largest <= largestXyzOfOne;
-    if (!ofOne || largest <= 0)
+    if (!ofOne || largest <= 0) {
         return;
-    for (Xyz& xyz : set.xyz)
+    }
+    for (Xyz& xyz : set.xyz) {
         xyz = {100 * xyz.X, 100 * xyz.Y, 100 * xyz.Z};
+    }
     notes.add("XYZ is taken as 0 to 1.");
 }
 
@@ -230,47 +243,56 @@ void scaleXyz(DataSet& set, ScaleHint hint, Notes& notes) {
 bool spectraInPercent(const Table& table) {
     const DataSet& set = table.set;
     const double largest = *std::max_element(set.spectra.begin(), set.spectra.end());
-    if (largest > 10 * largestReflectance)
+    if (largest > 10 * largestReflectance) {
         return true;
+    }
     if (spectraUsable(set.axis)) {
         const SpectralWeights weights(set.axis);
         const auto length = static_cast<std::size_t>(set.axis.length);
         double sum = 0;
-        for (std::size_t row = 0; row < set.patchCount; row += strideOver(set.patchCount))
+        for (std::size_t row = 0; row < set.patchCount; row += strideOver(set.patchCount)) {
             sum += weights.xyz(set.spectra.data() + row * length).Y;
+        }
         const double expected = statedLuminance(set);
-        if (expected > 0 && sum > 0)
+        if (expected > 0 && sum > 0) {
             return sum > 10 * expected;
+        }
     }
     return largest > largestReflectance || table.unit == SpectralUnit::Percent;
 }
 
 void scaleSpectra(Table& table, Notes& notes) {
-    if (!spectraInPercent(table))
+    if (!spectraInPercent(table)) {
         return;
-    for (double& value : table.set.spectra)
+    }
+    for (double& value : table.set.spectra) {
         value /= 100;
-    if (table.unit != SpectralUnit::Percent)
+    }
+    if (table.unit != SpectralUnit::Percent) {
         notes.add("Spectra are taken as 0 to 100.");
+    }
 }
 
 void scaleDevice(DataSet& set, ScaleHint hint, Notes& notes) {
     const double largest = *std::max_element(set.device.begin(), set.device.end());
     double full = 100;
-    if (largest > 0 && largest <= 1 && hint != ScaleHint::NeverOfOne)
+    if (largest > 0 && largest <= 1 && hint != ScaleHint::NeverOfOne) {
         full = 1;
-    else if (largest > largestPercent && largest <= largestByte)
+    } else if (largest > largestPercent && largest <= largestByte) {
         full = 255;
-    else if (largest >= smallestWord && largest <= largestWord)
+    } else if (largest >= smallestWord && largest <= largestWord) {
         full = 65535;
-    else if (largest > largestByte)
+    } else if (largest > largestByte) {
         notes.add("Device values go up to " + std::to_string(std::lround(largest)) +
                   " and are taken as they stand.");
-    if (full == 100)
+    }
+    if (full == 100) {
         return;
-    for (double& value : set.device)
+    }
+    for (double& value : set.device) {
         value =
             value * 100 / full; // in this order 255 gives 100, and what percents gave comes back
+    }
     notes.add("Device values are taken as 0 to " + std::to_string(std::lround(full)) + ".");
 }
 
@@ -282,8 +304,9 @@ void dropZeroColumns(DataSet& set, Notes& notes) {
     const bool lab = !set.lab.empty() && !allZero(set.lab);
     const bool xyz = !set.xyz.empty() && !allZero(set.xyz);
     const bool spectra = !set.spectra.empty() && !allZero(set.spectra);
-    if (!lab && !xyz && !spectra)
+    if (!lab && !xyz && !spectra) {
         return;
+    }
     const char* const remark = " is zero throughout and counts as absent.";
     if (!lab && !set.lab.empty()) {
         set.lab.clear();
@@ -305,16 +328,19 @@ void xyzFromSpectra(DataSet& set) {
     const SpectralWeights weights(set.axis);
     const auto length = static_cast<std::size_t>(set.axis.length);
     set.xyz.resize(set.patchCount);
-    for (std::size_t row = 0; row < set.patchCount; ++row)
+    for (std::size_t row = 0; row < set.patchCount; ++row) {
         set.xyz[row] = weights.xyz(set.spectra.data() + row * length);
+    }
 }
 
 Failure deriveColour(DataSet& set) {
     const bool usable = !set.spectra.empty() && spectraUsable(set.axis);
-    if (set.lab.empty() && set.xyz.empty() && !set.spectra.empty() && !usable)
+    if (set.lab.empty() && set.xyz.empty() && !set.spectra.empty() && !usable) {
         return Failure::SpectraUnusable;
-    if (set.xyz.empty() && usable)
+    }
+    if (set.xyz.empty() && usable) {
         xyzFromSpectra(set);
+    }
     if (set.lab.empty()) {
         set.lab.resize(set.xyz.size());
         std::transform(set.xyz.begin(), set.xyz.end(), set.lab.begin(), labFromXyz);
@@ -339,8 +365,9 @@ void joinTable(Table& first, Table&& next, Notes& notes) {
     }
     const std::vector<std::size_t> rows = matchRows(first.set, next.set);
     if (!rows.empty()) {
-        if (!takeAllColumns(first, next, rows))
+        if (!takeAllColumns(first, next, rows)) {
             notes.add("A further table repeats the same patches and is left out.");
+        }
     } else if (sameColumns(first, next)) {
         appendRows(first.set, next.set);
         notes.add("Several tables are joined into one.");
@@ -351,25 +378,32 @@ void joinTable(Table& first, Table&& next, Notes& notes) {
 
 Failure complete(Table& table, ScaleHint hint, const CgatsWants& wants, Notes& notes) {
     DataSet& set = table.set;
-    if (set.patchCount == 0 || table.kind == TableKind::Curve)
+    if (set.patchCount == 0 || table.kind == TableKind::Curve) {
         return Failure::NoPatches;
-    if (!inRange(set))
+    }
+    if (!inRange(set)) {
         return Failure::NotNumeric;
+    }
     dropZeroColumns(set, notes);
     if (hint != ScaleHint::Stated) {
-        if (!set.xyz.empty())
+        if (!set.xyz.empty()) {
             scaleXyz(set, hint, notes);
-        if (!set.spectra.empty())
+        }
+        if (!set.spectra.empty()) {
             scaleSpectra(table, notes);
-        if (!set.device.empty())
+        }
+        if (!set.device.empty()) {
             scaleDevice(set, hint, notes);
+        }
     }
 
     const bool stated = !set.lab.empty() || !set.xyz.empty();
-    if (!stated && set.spectra.empty() && table.unevenSpectra)
+    if (!stated && set.spectra.empty() && table.unevenSpectra) {
         return Failure::SpectraUnusable;
-    if (!stated && set.spectra.empty())
+    }
+    if (!stated && set.spectra.empty()) {
         return set.device.empty() ? Failure::NoColourValues : Failure::None;
+    }
     if (wants.calculated && !set.spectra.empty() && spectraUsable(set.axis)) {
         set.lab.clear();
         set.xyz.clear();

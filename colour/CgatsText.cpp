@@ -68,14 +68,17 @@ class Lines {
 
     bool next(std::string_view& line) {
         while (true) {
-            while (m_at != m_end && !anySeparates.isPlain(*m_at))
+            while (m_at != m_end && !anySeparates.isPlain(*m_at)) {
                 ++m_at;
-            if (m_at == m_end)
+            }
+            if (m_at == m_end) {
                 return false;
+            }
             const char* const start = m_at;
             m_at = lineEndOf(start, m_end);
-            if (*start == '#')
+            if (*start == '#') {
                 continue;
+            }
             line = {start, static_cast<std::size_t>(m_at - start)};
             return true;
         }
@@ -103,16 +106,18 @@ std::size_t findWord(std::string_view line, std::string_view word) {
         const std::size_t behind = at + word.size();
         if ((at == 0 || !isPart(line[at - 1])) &&
             (behind == line.size() || !isPart(line[behind])) &&
-            sameWord(line.substr(at, word.size()), word))
+            sameWord(line.substr(at, word.size()), word)) {
             return at;
+        }
     }
     return std::string_view::npos;
 }
 
 bool isStructure(std::string_view word) {
     for (const char* name : {"BEGIN_DATA", "END_DATA", "BEGIN_DATA_FORMAT", "END_DATA_FORMAT"}) {
-        if (sameWord(word, name))
+        if (sameWord(word, name)) {
             return true;
+        }
     }
     return false;
 }
@@ -134,8 +139,9 @@ std::size_t knownNames(const std::vector<std::string>& names) {
 
 std::vector<std::string> textsOf(const std::vector<Word>& words) {
     std::vector<std::string> texts;
-    for (const Word& word : words)
+    for (const Word& word : words) {
         texts.push_back(toUtf8(wordText(word)));
+    }
     return texts;
 }
 
@@ -148,8 +154,9 @@ void dropEmptyEnd(std::vector<Word>& cells) {
 /// What separates the names of a line: that which gives the most names that mean something.
 const CharTable* separatorOf(std::string_view line) {
     const CharTable* best = &blanksSeparate;
-    if (line.find_first_of(",;") == std::string_view::npos)
+    if (line.find_first_of(",;") == std::string_view::npos) {
         return best;
+    }
     std::size_t most = 0;
     for (const CharTable* chars : {&blanksSeparate, &semicolonsSeparate, &commasSeparate}) {
         std::vector<Word> words;
@@ -166,15 +173,18 @@ const CharTable* separatorOf(std::string_view line) {
 /// Adds the names of one line. False if there are more than may be.
 bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount, NameList& list) {
     std::string inner;
-    if (unwrapLine(line, inner))
+    if (unwrapLine(line, inner)) {
         line = inner;
+    }
     const bool isFirst = list.names.empty();
-    if (isFirst)
+    if (isFirst) {
         list.chars = separatorOf(line);
+    }
     const std::size_t room = maxCgatsColumns - list.names.size();
     std::vector<Word> words;
-    if (!splitWords(line, *list.chars, room, words))
+    if (!splitWords(line, *list.chars, room, words)) {
         return false;
+    }
     std::vector<std::string> names = textsOf(words);
     if (names.empty()) {
         return true;
@@ -202,8 +212,9 @@ bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount
 NameList unannouncedNames(std::string_view line) {
     NameList list;
     if (!addLine(line, std::nullopt, list) || list.names.size() < 3 ||
-        !holdWholeGroup(meaningsOf(list.names)))
+        !holdWholeGroup(meaningsOf(list.names))) {
         list.names.clear();
+    }
     return list;
 }
 
@@ -221,8 +232,9 @@ bool isRow(std::string_view line, const CharTable& chars) {
 std::optional<unsigned long long> countIn(const std::string& value) {
     unsigned long long count = 0;
     const auto [stop, error] = std::from_chars(value.data(), value.data() + value.size(), count);
-    if (error != std::errc() || stop == value.data())
+    if (error != std::errc() || stop == value.data()) {
         return std::nullopt;
+    }
     return count;
 }
 
@@ -278,14 +290,17 @@ class TextReader {
 Failure TextReader::read(DataSet& set) {
     std::string_view line;
     while (m_lines.next(line)) {
-        if (const Failure failure = readLine(line); failure != Failure::None)
+        if (const Failure failure = readLine(line); failure != Failure::None) {
             return failure;
+        }
     }
-    if (m_tables == 0)
+    if (m_tables == 0) {
         return Failure::Damaged; // breaks off before its rows
+    }
     if (const Failure failure = complete(m_table, m_scaleHint, m_wants, m_notes);
-        failure != Failure::None)
+        failure != Failure::None) {
         return failure;
+    }
 
     set = std::move(m_table.set);
     set.originator = std::move(m_texts.originator);
@@ -306,10 +321,12 @@ Failure TextReader::readLine(std::string_view line) {
         m_lines.moveTo(std::min(behind, line.data() + line.size()));
         return readFormat(line);
     }
-    if (sameWord(word, "BEGIN_DATA"))
+    if (sameWord(word, "BEGIN_DATA")) {
         return readRows(std::min(behind, line.data() + line.size()), true);
-    if (isStructure(word))
+    }
+    if (isStructure(word)) {
         return Failure::None;
+    }
 
     KeywordLine keyword = keywordLine(line);
     if (keyword.keyword == "NUMBER_OF_FIELDS") {
@@ -332,18 +349,21 @@ Failure TextReader::readFormat(std::string_view line) {
     m_hasFormat = true;
     while (true) {
         const char* const start = m_lines.at();
-        if (!m_lines.next(line))
+        if (!m_lines.next(line)) {
             return Failure::Damaged;
+        }
         if (sameWord(firstWordOf(line), "BEGIN_DATA")) {
             m_notes.add("END_DATA_FORMAT is missing.");
             m_lines.moveTo(start);
             return Failure::None;
         }
         const std::size_t end = findWord(line, "END_DATA_FORMAT"); // also behind the last name
-        if (!addLine(line.substr(0, end), m_fieldCount, m_names))
+        if (!addLine(line.substr(0, end), m_fieldCount, m_names)) {
             return Failure::TooLarge;
-        if (end != std::string_view::npos)
+        }
+        if (end != std::string_view::npos) {
             return Failure::None;
+        }
     }
 }
 
@@ -351,32 +371,37 @@ Failure TextReader::readFormat(std::string_view line) {
 /// BEGIN_DATA either and the rows are read.
 Failure TextReader::seeUnannounced(std::string_view line) {
     const auto searched = static_cast<std::size_t>(line.data() - m_text.data()) + line.size();
-    if (m_hasFormat || searched > searchedHeader)
+    if (m_hasFormat || searched > searchedHeader) {
         return Failure::None;
+    }
     NameList names = unannouncedNames(line);
-    if (names.names.empty())
+    if (names.names.empty()) {
         return Failure::None;
+    }
     m_unannounced = std::move(names);
     Lines ahead = m_lines;
     std::string_view next;
-    if (!ahead.next(next) || isStructure(firstWordOf(next)) || !isRow(next, *m_unannounced.chars))
+    if (!ahead.next(next) || isStructure(firstWordOf(next)) || !isRow(next, *m_unannounced.chars)) {
         return Failure::None;
+    }
     m_notes.add("There is no BEGIN_DATA: the rows are taken to follow the names of the columns.");
     return readRows(line.data() + line.size(), false);
 }
 
 /// Settles the names of the columns for the rows behind BEGIN_DATA.
 Failure TextReader::findNames(Lines& rows) {
-    if (m_hasFormat)
+    if (m_hasFormat) {
         return m_names.names.empty() ? Failure::Damaged : Failure::None;
+    }
     if (!m_unannounced.names.empty()) {
         m_names = std::move(m_unannounced);
     } else {
         Lines ahead = rows;
         std::string_view line;
         NameList names;
-        if (ahead.next(line) && !isStructure(firstWordOf(line)))
+        if (ahead.next(line) && !isStructure(firstWordOf(line))) {
             names = unannouncedNames(line);
+        }
         if (!names.names.empty()) {
             m_names = std::move(names);
             rows = ahead;
@@ -415,8 +440,9 @@ void TextReader::letRowDecide(Lines rows) {
 Failure TextReader::readRows(const char* at, bool hasBegin) {
     Lines rows = m_lines;
     rows.moveTo(at);
-    if (const Failure failure = findNames(rows); failure != Failure::None)
+    if (const Failure failure = findNames(rows); failure != Failure::None) {
         return failure;
+    }
     letRowDecide(rows);
 
     const TableHeader header{m_names.names, m_names.chars, m_fieldCount, m_setCount, hasBegin};
@@ -424,13 +450,15 @@ Failure TextReader::readRows(const char* at, bool hasBegin) {
     at = rows.at();
     if (const Failure failure =
             RowReader(m_text, m_ascii, header, m_wants, m_notes).read(at, table);
-        failure != Failure::None)
+        failure != Failure::None) {
         return failure;
+    }
     m_lines.moveTo(at);
-    if (++m_tables == 1)
+    if (++m_tables == 1) {
         m_table = std::move(table);
-    else
+    } else {
         joinTable(m_table, std::move(table), m_notes);
+    }
     m_hasFormat = false;
     m_unannounced = {};
     m_fieldCount.reset();
@@ -441,26 +469,29 @@ Failure TextReader::readRows(const char* at, bool hasBegin) {
 /// Keeps what a data set has of its header. Of repeated keywords the first counts.
 void TextReader::seeHeader(const KeywordLine& line) {
     const auto keep = [&](std::string& text) {
-        if (text.empty())
+        if (text.empty()) {
             text = line.value;
+        }
     };
-    if (line.keyword == "ORIGINATOR")
+    if (line.keyword == "ORIGINATOR") {
         keep(m_texts.originator);
-    else if (line.keyword == "CREATED")
+    } else if (line.keyword == "CREATED") {
         keep(m_texts.created);
-    else if (line.keyword == "INSTRUMENTATION")
+    } else if (line.keyword == "INSTRUMENTATION") {
         keep(m_texts.instrumentation);
-    else if (line.keyword == "DESCRIPTOR" || line.keyword == "FILE_DESCRIPTOR")
+    } else if (line.keyword == "DESCRIPTOR" || line.keyword == "FILE_DESCRIPTOR") {
         keep(m_texts.descriptor);
-    else if (line.keyword == "PRINTER")
+    } else if (line.keyword == "PRINTER") {
         keep(m_texts.printing);
-    else if (line.keyword == "PRINT_CONDITIONS" && !sameWord(line.value, "Not specified"))
+    } else if (line.keyword == "PRINT_CONDITIONS" && !sameWord(line.value, "Not specified")) {
         keep(m_printConditions);
-    else if (line.keyword == "TINTGATE_SCALES" && line.value == "device 100, XYZ 100, spectra 1")
+    } else if (line.keyword == "TINTGATE_SCALES" &&
+               line.value == "device 100, XYZ 100, spectra 1") {
         m_scaleHint = ScaleHint::Stated;
-    else if (m_scaleHint == ScaleHint::None &&
-             (line.keyword == "CTI1" || line.keyword == "CTI2" || line.keyword == "CTI3"))
+    } else if (m_scaleHint == ScaleHint::None &&
+               (line.keyword == "CTI1" || line.keyword == "CTI2" || line.keyword == "CTI3")) {
         m_scaleHint = ScaleHint::NeverOfOne;
+    }
     m_conditions.see(line.keyword, line.value);
     m_inks.see(line.keyword, line.value);
 }
@@ -474,8 +505,9 @@ bool isBlack(const DataSet& set) {
 namespace {
 
 bool isCgats(std::string_view bytes) {
-    if (bytes.empty() || std::memchr(bytes.data(), 0, bytes.size()) != nullptr)
+    if (bytes.empty() || std::memchr(bytes.data(), 0, bytes.size()) != nullptr) {
         return false;
+    }
     Lines lines(bytes.substr(0, searchedHeader));
     std::string_view line;
     bool isFirst = true;
@@ -484,8 +516,9 @@ bool isCgats(std::string_view bytes) {
         if (isFirst) {
             const std::string upper = upperCase(word.substr(0, 16));
             for (const std::string_view known : firstWords) {
-                if (upper.starts_with(known))
+                if (upper.starts_with(known)) {
                     return true;
+                }
             }
         }
         isFirst = false;
@@ -493,10 +526,12 @@ bool isCgats(std::string_view bytes) {
         if (std::find(std::begin(knownKeywords), std::end(knownKeywords), keyword) !=
                 std::end(knownKeywords) &&
             (isStructure(word) ||
-             std::none_of(word.begin(), word.end(), [](char c) { return c >= 'a' && c <= 'z'; })))
+             std::none_of(word.begin(), word.end(), [](char c) { return c >= 'a' && c <= 'z'; }))) {
             return true;
-        if (!unannouncedNames(line).names.empty())
+        }
+        if (!unannouncedNames(line).names.empty()) {
             return true;
+        }
     }
     return false;
 }
@@ -509,22 +544,26 @@ bool looksLikeCgats(std::string_view bytes) {
 }
 
 Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set) {
-    if (bytes.size() > maxCgatsBytes)
+    if (bytes.size() > maxCgatsBytes) {
         return Failure::TooLarge;
+    }
     try {
         std::string decoded;
         bytes = withoutUtf16(bytes, decoded);
-        if (!isCgats(bytes))
+        if (!isCgats(bytes)) {
             return Failure::NotRecognised;
+        }
         DataSet result;
         const Failure failure = TextReader(bytes, wants).read(result);
-        if (failure != Failure::None)
+        if (failure != Failure::None) {
             return failure;
+        }
         if (!wants.spectra && result.hasColour() && isBlack(result)) {
             // Where a store had neither Lab nor XYZ these are zeros, and the spectra tell.
             DataSet withSpectra;
-            if (TextReader(bytes, {}).read(withSpectra) == Failure::None && !isBlack(withSpectra))
+            if (TextReader(bytes, {}).read(withSpectra) == Failure::None && !isBlack(withSpectra)) {
                 result = std::move(withSpectra);
+            }
         }
         if (!result.conditions.areUsual() && result.hasColour() && !wants.calculated) {
             DataSet calculated;
@@ -560,8 +599,9 @@ std::optional<std::string> cgatsKeyword(std::string_view bytes, std::string_view
             inRows = true;
         } else if (line.front() == '"' || sameWord(word, keyword)) {
             KeywordLine found = keywordLine(line);
-            if (sameWord(found.keyword, keyword))
+            if (sameWord(found.keyword, keyword)) {
                 return std::move(found.value);
+            }
         }
     }
     return std::nullopt;

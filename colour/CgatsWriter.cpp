@@ -17,8 +17,9 @@ bool isForbidden(char c) {
 void addQuoted(std::string& text, std::string_view value) {
     text += '"';
     for (const char c : value) {
-        if (c == '"')
+        if (c == '"') {
             text += '"';
+        }
         text += isForbidden(c) ? ' ' : c;
     }
     text += '"';
@@ -30,10 +31,11 @@ void addWord(std::string& text, std::string_view word) {
         return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') ||
                c == '_' || c == '-' || c == '.' || c == '+';
     });
-    if (simple && !cgats::sameWord(word, "END_DATA"))
+    if (simple && !cgats::sameWord(word, "END_DATA")) {
         text += word;
-    else
+    } else {
         addQuoted(text, word);
+    }
 }
 
 /// The shortest text that reads back as the same number.
@@ -45,8 +47,9 @@ void addNumber(std::string& text, double value) {
 }
 
 void addHeaderText(std::string& text, const char* keyword, const std::string& value) {
-    if (value.empty())
+    if (value.empty()) {
         return;
+    }
     text += keyword;
     text += ' ';
     addQuoted(text, value);
@@ -64,10 +67,12 @@ void addHeader(std::string& text, const DataSet& set) {
         conditions.illuminant = "D50";
         conditions.observer = "2";
     }
-    if (!conditions.illuminant.empty())
+    if (!conditions.illuminant.empty()) {
         addHeaderText(text, "WEIGHTING_FUNCTION", "ILLUMINANT, " + conditions.illuminant);
-    if (!conditions.observer.empty())
+    }
+    if (!conditions.observer.empty()) {
         addHeaderText(text, "WEIGHTING_FUNCTION", "OBSERVER, " + conditions.observer + " degree");
+    }
     if (!conditions.measurement.empty()) {
         text += "KEYWORD \"MEASUREMENT_CONDITION\"\n";
         addHeaderText(text, "MEASUREMENT_CONDITION", conditions.measurement);
@@ -83,10 +88,12 @@ struct Columns {
         : ids(set.ids.size() == set.patchCount), names(set.names.size() == set.patchCount),
           xyz(set.xyz.size() == set.patchCount), lab(set.lab.size() == set.patchCount),
           channels(set.channels.size()), spectra(static_cast<std::size_t>(set.axis.length)) {
-        if (set.device.size() != channels * set.patchCount)
+        if (set.device.size() != channels * set.patchCount) {
             channels = 0;
-        if (set.spectra.size() != spectra * set.patchCount)
+        }
+        if (set.spectra.size() != spectra * set.patchCount) {
             spectra = 0;
+        }
     }
 
     std::size_t count() const {
@@ -104,16 +111,19 @@ struct Columns {
 void addFormat(std::string& text, const DataSet& set, const Columns& columns) {
     text += "NUMBER_OF_FIELDS " + std::to_string(columns.count());
     text += "\nBEGIN_DATA_FORMAT\nSAMPLE_ID";
-    if (columns.names)
+    if (columns.names) {
         text += "\tSAMPLE_NAME";
+    }
     for (std::size_t i = 0; i < columns.channels; ++i) {
         text += '\t';
         addWord(text, set.channels[i]);
     }
-    if (columns.xyz)
+    if (columns.xyz) {
         text += "\tXYZ_X\tXYZ_Y\tXYZ_Z";
-    if (columns.lab)
+    }
+    if (columns.lab) {
         text += "\tLAB_L\tLAB_A\tLAB_B";
+    }
     for (std::size_t i = 0; i < columns.spectra; ++i) {
         text += "\tSPECTRAL_NM";
         text += std::to_string(set.axis.base + static_cast<long long>(i) * set.axis.step);
@@ -156,8 +166,9 @@ std::string writeCgats(const DataSet& set) {
     text.reserve(1024 + set.patchCount * columns.count() * 12);
     addHeader(text, set);
     addFormat(text, set, columns);
-    for (std::size_t row = 0; row < set.patchCount; ++row)
+    for (std::size_t row = 0; row < set.patchCount; ++row) {
         addRow(text, set, columns, row);
+    }
     text += "END_DATA\n";
     return text;
 }

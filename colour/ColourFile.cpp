@@ -35,8 +35,9 @@ class Descriptor {
   public:
     explicit Descriptor(int number) : m_number(number) {}
     ~Descriptor() {
-        if (m_number >= 0)
+        if (m_number >= 0) {
             close(m_number);
+        }
     }
     Descriptor(const Descriptor&) = delete;
     Descriptor& operator=(const Descriptor&) = delete;
@@ -60,18 +61,22 @@ ssize_t readSome(Source& source, char* target, std::size_t room) {
         if (source.isStream) {
             pollfd wait{source.descriptor, POLLIN, 0};
             const int ready = poll(&wait, 1, source.awaitsWriter ? patienceForWriter : patience);
-            if (ready < 0 && errno == EINTR)
+            if (ready < 0 && errno == EINTR) {
                 continue;
+            }
             silent = ready == 0;
-            if (ready < 0 || (silent && !source.awaitsWriter))
+            if (ready < 0 || (silent && !source.awaitsWriter)) {
                 return -1;
+            }
         }
         const ssize_t count = read(source.descriptor, target, room);
-        if (silent && count == 0)
+        if (silent && count == 0) {
             return -1; // poll does not report a pipe without a writer, but read finds its end
+        }
         source.awaitsWriter = false;
-        if (count >= 0 || (errno != EINTR && errno != EAGAIN))
+        if (count >= 0 || (errno != EINTR && errno != EAGAIN)) {
             return count;
+        }
     }
 }
 
@@ -90,8 +95,9 @@ bool textOrProfile(std::string_view head) {
 /// NotRecognised where the first bytes are not worth the rest.
 Failure readBytes(const std::string& path, std::size_t limit, WorthReading worthReading,
                   std::string& bytes) {
-    if (path.find('\0') != std::string::npos)
+    if (path.find('\0') != std::string::npos) {
         return Failure::Missing;
+    }
     // Without O_NONBLOCK the opening of a pipe waits for its other end.
     const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
     if (file.number() < 0) {
@@ -99,14 +105,16 @@ Failure readBytes(const std::string& path, std::size_t limit, WorthReading worth
         return missing ? Failure::Missing : Failure::Unreadable;
     }
     struct stat status {};
-    if (fstat(file.number(), &status) != 0 || S_ISDIR(status.st_mode))
+    if (fstat(file.number(), &status) != 0 || S_ISDIR(status.st_mode)) {
         return Failure::Unreadable;
+    }
     const bool isStream = !S_ISREG(status.st_mode);
     Source source{file.number(), isStream, S_ISFIFO(status.st_mode)};
-    if (isStream)
+    if (isStream) {
         limit = std::min(limit, maxStreamBytes);
-    else if (static_cast<unsigned long long>(status.st_size) > limit)
+    } else if (static_cast<unsigned long long>(status.st_size) > limit) {
         return Failure::TooLarge;
+    }
 
     std::string contents;
     std::size_t used = 0;
@@ -114,18 +122,22 @@ Failure readBytes(const std::string& path, std::size_t limit, WorthReading worth
     contents.resize(headBytes);
     while (true) {
         const ssize_t count = readSome(source, contents.data() + used, contents.size() - used);
-        if (count < 0)
+        if (count < 0) {
             return Failure::Unreadable;
+        }
         used += static_cast<std::size_t>(count);
-        if (used > limit)
+        if (used > limit) {
             return Failure::TooLarge;
+        }
         if (!isHeadSeen && (count == 0 || used == contents.size())) {
             isHeadSeen = true;
-            if (!worthReading({contents.data(), used}))
+            if (!worthReading({contents.data(), used})) {
                 return Failure::NotRecognised;
+            }
         }
-        if (count == 0)
+        if (count == 0) {
             break;
+        }
         if (used == contents.size()) {
             // One byte more than a file says, so that its end is seen without another growth.
             const auto stated =

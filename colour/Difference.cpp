@@ -43,12 +43,14 @@ Plane planeOf(const Lab& lab) {
 /// without passing 0.
 double hueStep(const Plane& first, const Plane& second) {
     const double chromas = first.chroma * second.chroma;
-    if (chromas == 0)
+    if (chromas == 0) {
         return 0;
+    }
     const double cross = first.a * second.b - first.b * second.a;
     const double dot = first.a * second.a + first.b * second.b;
-    if (dot >= 0)
+    if (dot >= 0) {
         return cross / std::sqrt((chromas + dot) / 2);
+    }
     const double step = std::sqrt(2 * (chromas - dot));
     const bool backwards = cross != 0 ? cross < 0 : first.b < 0 || (first.b == 0 && first.a < 0);
     return backwards ? -step : step;
@@ -201,8 +203,9 @@ double deltaE2000(const Lab& target, const Lab& measured) {
     const double SH = 1 + 0.015 * meanC * T;
 
     double hue = std::atan2(sin1, cos1) / radians;
-    if (hue < 0)
+    if (hue < 0) {
         hue += 360;
+    }
     const double dTheta = 30 * std::exp(-squared((hue - 275) / 25));
     const double RT = -2 * seventhPowerShare(meanC) * std::sin(2 * dTheta * radians);
 

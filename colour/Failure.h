@@ -1,4 +1,5 @@
-// Why a colour file could not be used. One word for one cause; the library turns each into its code.
+// Why a colour file could not be used. One word for one cause; the library turns each into its
+// code.
 #pragma once
 
 namespace colour {

@@ -20,16 +20,18 @@ constexpr std::size_t batch = 512; ///< Patches handed to LittleCMS at a time.
 
 std::uint32_t wordAt(std::string_view bytes, std::size_t offset) {
     std::uint32_t word = 0;
-    for (std::size_t i = 0; i < 4; ++i)
+    for (std::size_t i = 0; i < 4; ++i) {
         word = word << 8 | static_cast<unsigned char>(bytes[offset + i]);
+    }
     return word;
 }
 
 /// What the header alone rules out. A profile shorter than its header says is cut off: LittleCMS
 /// would pass over the tags that are gone and might evaluate another one in their place.
 Failure checkHeader(std::string_view bytes) {
-    if (!looksLikeProfile(bytes) || bytes.size() < headerBytes || wordAt(bytes, 0) > bytes.size())
+    if (!looksLikeProfile(bytes) || bytes.size() < headerBytes || wordAt(bytes, 0) > bytes.size()) {
         return Failure::ProfileDamaged;
+    }
     switch (wordAt(bytes, classOffset)) {
     case cmsSigOutputClass:
     case cmsSigInputClass:
@@ -135,24 +137,29 @@ bool looksLikeProfile(std::string_view bytes) {
 }
 
 Failure Profile::open(std::string_view bytes) {
-    if (const Failure failure = checkHeader(bytes); failure != Failure::None)
+    if (const Failure failure = checkHeader(bytes); failure != Failure::None) {
         return failure;
+    }
 
     auto state = std::make_unique<State>();
     state->context.reset(cmsCreateContext(nullptr, nullptr));
-    if (!state->context)
+    if (!state->context) {
         return Failure::OutOfMemory;
+    }
     cmsContext context = state->context.get();
 
     const Owned<cmsHPROFILE, ProfileCloser> profile{
         cmsOpenProfileFromMemTHR(context, bytes.data(), wordAt(bytes, 0))};
-    if (!profile)
+    if (!profile) {
         return Failure::ProfileDamaged;
+    }
     const Owned<cmsHPROFILE, ProfileCloser> lab{cmsCreateLab4ProfileTHR(context, nullptr)};
-    if (!lab)
+    if (!lab) {
         return Failure::OutOfMemory;
-    if (!hasMediaWhite(profile.get()))
+    }
+    if (!hasMediaWhite(profile.get())) {
         return Failure::ProfileUnusable;
+    }
 
     // The observer counts as fully adapted, which is the absolute colorimetry of ICC.1: the media
     // white scales XYZ. (Profiles of ArgyllCMS bring a matrix of their own for that in a private
@@ -166,8 +173,9 @@ Failure Profile::open(std::string_view bytes) {
     state->transform.reset(cmsCreateExtendedTransform(
         context, chain.size(), chain.data(), blackPoint.data(), intents.data(), adapted.data(),
         nullptr, 0, TYPE_CMYK_DBL, TYPE_Lab_DBL, cmsFLAGS_NOOPTIMIZE | cmsFLAGS_NOCACHE));
-    if (!state->transform)
+    if (!state->transform) {
         return Failure::ProfileUnusable;
+    }
     state->description = descriptionOf(profile.get());
     m_state = std::move(state);
     return Failure::None;
@@ -179,15 +187,19 @@ Failure Profile::evaluate(const double* cmyk, std::size_t count, std::size_t str
     std::array<cmsCIELab, batch> colours;
     for (std::size_t done = 0; done < count;) {
         const std::size_t now = std::min(batch, count - done);
-        for (std::size_t i = 0; i < now; ++i)
-            for (std::size_t ink = 0; ink < 4; ++ink)
+        for (std::size_t i = 0; i < now; ++i) {
+            for (std::size_t ink = 0; ink < 4; ++ink) {
                 inks[4 * i + ink] = inkAmount(cmyk[(done + i) * stride + ink]);
+            }
+        }
         cmsDoTransform(m_state->transform.get(), inks.data(), colours.data(),
                        static_cast<cmsUInt32Number>(now));
-        for (std::size_t i = 0; i < now; ++i)
+        for (std::size_t i = 0; i < now; ++i) {
             lab[done + i] = {colours[i].L, colours[i].a, colours[i].b};
-        if (!std::all_of(colours.begin(), colours.begin() + now, isColour))
+        }
+        if (!std::all_of(colours.begin(), colours.begin() + now, isColour)) {
             return Failure::ProfileUnusable;
+        }
         done += now;
     }
     return Failure::None;

@@ -27,9 +27,11 @@ long long lastWavelength(const SpectralAxis& axis) {
 /// Value of coefficient `which` of the polynomial through the integer points 0 .. points - 1.
 double lagrange(int points, int which, double at) {
     double value = 1;
-    for (int other = 0; other < points; ++other)
-        if (other != which)
+    for (int other = 0; other < points; ++other) {
+        if (other != which) {
             value *= (at - other) / (which - other);
+        }
+    }
     return value;
 }
 
@@ -45,8 +47,9 @@ Interpolation interpolate(int count, int interval, double within) {
     const bool atEnd = interval == 0 || interval == count - 2;
     result.points = atEnd ? 3 : 4;
     result.first = interval == 0 ? 0 : interval - 1;
-    for (int i = 0; i < result.points; ++i)
+    for (int i = 0; i < result.points; ++i) {
         result.coefficients[i] = lagrange(result.points, i, interval - result.first + within);
+    }
     return result;
 }
 
@@ -58,8 +61,9 @@ double illuminantAt(int wavelength) {
     const double within = static_cast<double>(offset) / illuminantStep - interval;
     const Interpolation parts = interpolate(illuminantLength, interval, within);
     double power = 0;
-    for (int i = 0; i < parts.points; ++i)
+    for (int i = 0; i < parts.points; ++i) {
         power += parts.coefficients[i] * illuminantD50[parts.first + i];
+    }
     return power;
 }
 
@@ -73,8 +77,9 @@ std::array<Xyz, observerLength> observedLight() {
         light[i] = {power * observer.X, power * observer.Y, power * observer.Z};
         sum += light[i].Y;
     }
-    for (Xyz& value : light)
+    for (Xyz& value : light) {
         value = {100 * value.X / sum, 100 * value.Y / sum, 100 * value.Z / sum};
+    }
     return light;
 }
 

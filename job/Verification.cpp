@@ -8,8 +8,8 @@
 
 #include "ExitCodes.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
-#include "cli/CLogger.h"
 #include "base/TextFile.h"
+#include "cli/CLogger.h"
 #include "job/JobFiles.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "jobkeys/StripKeys.h"
@@ -99,8 +99,8 @@ int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std:
     }
 
     const auto start = steady_clock::now();
-    m_connector = ConnectToKZWithLoginCredentials(host, user, password,
-                                                  jobkeys::verifierApplication, true);
+    m_connector =
+        ConnectToKZWithLoginCredentials(host, user, password, jobkeys::verifierApplication, true);
     const auto pause = pauseAfter(steady_clock::now() - start);
     const std::string server = wstringToString(host);
     if (m_connector == nullptr) {

@@ -19,11 +19,11 @@
 #include <wx/filefn.h>
 #include <wx/utils.h>
 
+#include "base/WideBytes.h"
 #include "measure/MeasureOptions.h"
 #include "platform/CoreFoundationStrings.h"
 #include "platform/Processes.h"
 #include "platform/SystemRoot.h"
-#include "base/WideBytes.h"
 
 namespace {
 

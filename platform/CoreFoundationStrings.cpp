@@ -4,8 +4,8 @@
 #include <optional>
 #include <string_view>
 
-#include "platform/CodePage.h"
 #include "base/Utf8.h"
+#include "platform/CodePage.h"
 
 namespace {
 

@@ -8,9 +8,9 @@ namespace platform {
 /// The folder for temporary files, as bytes, or empty if there is none that may be used.
 ///
 /// The first of TMPDIR, TMP and TEMP that names a folder. A relative path is made absolute, in the
-/// variable too: the viewer and other children run in folders of their own. Else /tmp/tintgate-UID, made with mode
-/// 0700 where it is missing, used only if it is a folder of this user, and exported as TMPDIR so
-/// that wxFileName::GetTempDir and every child process find the same one.
+/// variable too: the viewer and other children run in folders of their own. Else /tmp/tintgate-UID,
+/// made with mode 0700 where it is missing, used only if it is a folder of this user, and exported
+/// as TMPDIR so that wxFileName::GetTempDir and every child process find the same one.
 ///
 /// The path must hold no quotes, backslashes or double blanks for the viewer to be started from
 /// it: its command line is not quoted.

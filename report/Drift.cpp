@@ -26,8 +26,9 @@ std::vector<double> movingAverage(const std::vector<double>& values, double star
     averages.reserve(values.size());
     double average = start;
     for (const double value : values) {
-        if (std::isfinite(value))
+        if (std::isfinite(value)) {
             average = weight * value + (1 - weight) * average;
+        }
         averages.push_back(average);
     }
     return averages;
@@ -36,16 +37,19 @@ std::vector<double> movingAverage(const std::vector<double>& values, double star
 double scatterOf(const std::vector<double>& values) {
     constexpr double rangeToDeviation = 0.954;
     const std::vector<double> known = finite(values);
-    if (known.size() < 2)
+    if (known.size() < 2) {
         return 0;
+    }
     std::vector<double> ranges;
-    for (std::size_t i = 1; i < known.size(); ++i)
+    for (std::size_t i = 1; i < known.size(); ++i) {
         ranges.push_back(std::abs(known[i] - known[i - 1]));
+    }
     const auto upper = ranges.begin() + static_cast<std::ptrdiff_t>(ranges.size() / 2);
     std::nth_element(ranges.begin(), upper, ranges.end());
     double median = *upper;
-    if (ranges.size() % 2 == 0)
+    if (ranges.size() % 2 == 0) {
         median = (median + *std::max_element(ranges.begin(), upper)) / 2;
+    }
     return median / rangeToDeviation;
 }
 
@@ -61,8 +65,9 @@ Drift driftOf(const std::vector<double>& values) {
         return drift;
     }
     const std::size_t first = beginningOf(known.size());
-    for (std::size_t i = 0; i < first; ++i)
+    for (std::size_t i = 0; i < first; ++i) {
         drift.began += known[i] / static_cast<double>(first);
+    }
     drift.averages = movingAverage(values, drift.began, driftWeight);
     drift.shift = drift.averages.back() - drift.began;
     const double scatter = std::max(scatterOf(known), leastScatter);

@@ -7,7 +7,7 @@ namespace report {
 
 std::string inScript(const PageJson& json) {
     std::string safe;
-    for (const char c : json.dump(-1, ' ', true, PageJson::error_handler_t::replace))
+    for (const char c : json.dump(-1, ' ', true, PageJson::error_handler_t::replace)) {
         switch (c) {
         case '<':
             safe += "\\u003c";
@@ -21,23 +21,26 @@ std::string inScript(const PageJson& json) {
         default:
             safe += c;
         }
+    }
     return safe;
 }
 
 void appendNumber(std::string& text, double value) {
     char digits[32];
-    if (!std::isfinite(value))
+    if (!std::isfinite(value)) {
         text += "null";
-    else
+    } else {
         text.append(digits, std::to_chars(digits, digits + sizeof digits, value).ptr);
+    }
 }
 
 void appendRounded(std::string& text, const std::vector<double>& values, int decimals) {
     const double scale = std::pow(10, decimals);
     text += '[';
     for (std::size_t i = 0; i < values.size(); ++i) {
-        if (i != 0)
+        if (i != 0) {
             text += ',';
+        }
         appendNumber(text, std::round(values[i] * scale) / scale);
     }
     text += ']';
@@ -60,10 +63,11 @@ std::string linkTo(const std::string& path) {
         const auto byte = static_cast<unsigned char>(c);
         const bool plain = (c >= 'a' && c <= 'z') || (c >= 'A' && c <= 'Z') ||
                            (c >= '0' && c <= '9') || c == '/' || c == '-' || c == '.' || c == '_';
-        if (plain)
+        if (plain) {
             url += c;
-        else
+        } else {
             url += {'%', digits[byte >> 4], digits[byte & 15]};
+        }
     }
     return url;
 }

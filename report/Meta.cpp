@@ -14,8 +14,9 @@ std::string text(const Json& value) {
 }
 
 std::int64_t integer(const Json& value) {
-    if (!value.is_number_integer())
+    if (!value.is_number_integer()) {
         throw std::runtime_error("a number that is not whole");
+    }
     return value.get<std::int64_t>();
 }
 
@@ -23,12 +24,14 @@ std::int64_t integer(const Json& value) {
 std::string stamp(const std::string& value) {
     constexpr std::string_view form = "0000-00-00T00:00:00+00:00";
     bool fits = value.size() == form.size();
-    for (std::size_t i = 0; fits && i < form.size(); ++i)
+    for (std::size_t i = 0; fits && i < form.size(); ++i) {
         fits = form[i] == '0'   ? value[i] >= '0' && value[i] <= '9'
                : form[i] == '+' ? value[i] == '+' || value[i] == '-'
                                 : value[i] == form[i];
-    if (!fits)
+    }
+    if (!fits) {
         throw std::runtime_error("\"created\" is no time");
+    }
     return value;
 }
 
@@ -37,16 +40,19 @@ std::string stamp(const std::string& value) {
 std::optional<Meta> readMeta(std::string_view bytes, std::string& problem) {
     try {
         const Json json = Json::parse(bytes);
-        if (!json.is_object() || json.value("format", Json()) != "tintgate-meta")
+        if (!json.is_object() || json.value("format", Json()) != "tintgate-meta") {
             throw std::runtime_error("not a meta file");
-        if (json.at("formatVersion") != 1)
+        }
+        if (json.at("formatVersion") != 1) {
             throw std::runtime_error("a format that this version does not know");
+        }
         Meta meta;
         meta.created = stamp(json.at("created"));
         const Json& job = json.at("job");
         meta.jobId = integer(job.at("id"));
-        if (!job.at("parentId").is_null())
+        if (!job.at("parentId").is_null()) {
             meta.parentId = integer(job.at("parentId"));
+        }
         meta.title = text(job.at("title"));
         meta.strip = job.at("strip") == 2 ? 2 : 1;
         meta.instrument = text(json.at("instrument").at("name"));
@@ -54,8 +60,9 @@ std::optional<Meta> readMeta(std::string_view bytes, std::string& problem) {
         meta.workflow = text(json.at("workflow").at("name"));
         const Json& server = json.at("server");
         meta.server = text(server.at("name"));
-        if (meta.server.empty())
+        if (meta.server.empty()) {
             meta.server = text(server.at("host"));
+        }
         meta.user = text(server.at("user"));
         return meta;
     } catch (const std::exception& failure) {

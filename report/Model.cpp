@@ -13,12 +13,14 @@ constexpr const char* dash = "\u2013";
 
 /// Decimals that a number needs to be shown as it stands, up to six.
 int decimalsOf(double value, int atLeast) {
-    if (!std::isfinite(value))
+    if (!std::isfinite(value)) {
         return atLeast;
+    }
     int decimals = atLeast;
     for (double scale = std::pow(10, decimals);
-         decimals < 6 && std::abs(value * scale - std::round(value * scale)) > 1e-6; scale *= 10)
+         decimals < 6 && std::abs(value * scale - std::round(value * scale)) > 1e-6; scale *= 10) {
         ++decimals;
+    }
     return decimals;
 }
 
@@ -28,26 +30,34 @@ std::string counted(std::size_t count, const std::string& one, const std::string
 }
 
 std::string differenceUnit(const std::string& formula) {
-    if (formula == "CIE2000")
+    if (formula == "CIE2000") {
         return "ΔE00";
-    if (formula == "CIE76")
+    }
+    if (formula == "CIE76") {
         return "ΔE*ab";
-    if (formula == "CIE94")
+    }
+    if (formula == "CIE94") {
         return "ΔE94";
-    if (formula == "CIECMC")
+    }
+    if (formula == "CIECMC") {
         return "ΔE CMC 1:1";
+    }
     return formula == "CIECMC_2_1" ? "ΔE CMC 2:1" : "ΔE " + formula;
 }
 
 std::string formulaTitle(const std::string& formula) {
-    if (formula == "CIE2000")
+    if (formula == "CIE2000") {
         return "CIEDE2000";
-    if (formula == "CIE76")
+    }
+    if (formula == "CIE76") {
         return "CIE 1976 (ΔE*ab)";
-    if (formula == "CIE94")
+    }
+    if (formula == "CIE94") {
         return "CIE94, graphic arts";
-    if (formula == "CIECMC")
+    }
+    if (formula == "CIECMC") {
         return "CMC 1:1";
+    }
     return formula == "CIECMC_2_1" ? "CMC 2:1" : formula;
 }
 
@@ -78,9 +88,10 @@ std::string deviceText(const Result& result, std::size_t patch) {
 
 /// Why a criterion has no answer.
 std::string missingText(const Criterion& criterion) {
-    if (criterion.found > 0)
+    if (criterion.found > 0) {
         return "only " + std::to_string(criterion.found) + " of the " +
                std::to_string(criterion.needed) + " different patches that it needs";
+    }
     return criterion.name == "repeatSpread" ? "no patch was measured more than once"
                                             : "the data hold no such patches";
 }
@@ -96,27 +107,33 @@ Figure figureOf(const Criterion& criterion, const Result& result) {
         criterion.value.value_or(std::numeric_limits<double>::quiet_NaN()));
     figure.value = fixedText(value, criterion.decimals);
     figure.tolerance = dash;
-    if (criterion.worstPatch)
+    if (criterion.worstPatch) {
         figure.worstLabel = labelOf(result, *criterion.worstPatch);
-    if (criterion.outcome == Outcome::Unanswered)
+    }
+    if (criterion.outcome == Outcome::Unanswered) {
         figure.missing = missingText(criterion);
-    if (criterion.listed > criterion.found && criterion.found > 0)
+    }
+    if (criterion.listed > criterion.found && criterion.found > 0) {
         figure.title += " (" + std::to_string(criterion.found) + " of " +
                         std::to_string(criterion.listed) + " patches)";
-    if (!criterion.tolerance)
+    }
+    if (!criterion.tolerance) {
         return figure;
+    }
 
     const double limit = *criterion.tolerance;
     const int decimals = decimalsOf(limit, criterion.decimals);
     figure.tolerance = fixedText(limit, decimals);
-    if (!std::isfinite(value))
+    if (!std::isfinite(value)) {
         return figure;
+    }
     figure.excess = limit > 0 ? value / limit : std::numeric_limits<double>::infinity();
     figure.fill = std::clamp(figure.excess / 2, 0.0, 1.0);
-    if (criterion.outcome == Outcome::Pass || criterion.outcome == Outcome::Fail)
+    if (criterion.outcome == Outcome::Pass || criterion.outcome == Outcome::Fail) {
         figure.distance = value == limit ? "at the tolerance"
                                          : fixedText(std::abs(value - limit), decimals) +
                                                (value > limit ? " above" : " below");
+    }
     return figure;
 }
 
@@ -146,9 +163,10 @@ void sayVerdict(Model& model, const Result& result) {
             model.reasons.push_back(figure.title + ": " + figure.missing);
         }
     }
-    for (const Warning& warning : result.warnings)
+    for (const Warning& warning : result.warnings) {
         (warning.keepsOpen && verdict == Verdict::Incomplete ? model.doubts : model.warnings)
             .push_back(warning.text);
+    }
     const std::size_t all = model.judged.size();
     model.word = report::wordOf(verdict);
     switch (verdict) {
@@ -167,17 +185,18 @@ void sayVerdict(Model& model, const Result& result) {
                          counted(all, "criterion is", "criteria are") + " above tolerance.";
         return;
     case Verdict::Incomplete:
-        if (all == 0)
+        if (all == 0) {
             model.sentence = "The preset judges no criterion, so nothing can pass.";
-        else if (open == 0 && failed == 0 && !model.doubts.empty())
+        } else if (open == 0 && failed == 0 && !model.doubts.empty()) {
             model.sentence =
                 "Every figure is within its tolerance, but the comparison itself is in "
                 "doubt, so it can't pass.";
-        else
+        } else {
             model.sentence =
                 std::to_string(open) + " of " + counted(all, "criterion", "criteria") +
                 " can't be answered from these data" +
                 (failed == 0 ? std::string(".") : ", " + std::to_string(failed) + " failed.");
+        }
         return;
     }
 }
@@ -187,17 +206,19 @@ std::string conditionText(const Result& result) {
     const std::string& measured = result.measurement.measurementCondition;
     const std::string& target = result.target.measurementCondition;
     const bool isAsked = result.presetCondition >= 0 && result.presetCondition <= 3;
-    if (measured.empty() && target.empty() && !isAsked)
+    if (measured.empty() && target.empty() && !isAsked) {
         return {};
+    }
     const auto stated = [](const std::string& condition) {
         return condition.empty() ? std::string("not stated") : condition;
     };
     std::string text =
         "Measuring condition: measurement " + stated(measured) + ", target " + stated(target);
-    if (isAsked)
+    if (isAsked) {
         text += std::string(", preset ") +
                 (result.conditionRequired ? "requires M" : "asks for M") +
                 std::to_string(result.presetCondition);
+    }
     return text;
 }
 
@@ -219,11 +240,13 @@ void chooseDrawn(Model& model) {
     const std::size_t worst = all <= mostDrawn ? all : mostDrawn / 2;
     model.drawn.resize(worst);
     std::iota(model.drawn.begin(), model.drawn.end(), std::size_t{0});
-    if (worst == all)
+    if (worst == all) {
         return;
+    }
     const std::size_t rest = mostDrawn - worst;
-    for (std::size_t i = 0; i < rest; ++i)
+    for (std::size_t i = 0; i < rest; ++i) {
         model.drawn.push_back(worst + i * (all - worst) / rest);
+    }
     model.drawnText = "Drawn are " + std::to_string(mostDrawn) + " of " + std::to_string(all) +
                       " patches: the " + std::to_string(worst) +
                       " with the largest differences, and others spread evenly over the rest.";
@@ -231,56 +254,67 @@ void chooseDrawn(Model& model) {
 
 void drawHistogram(Model& model, const Result& result) {
     std::vector<double> differences;
-    for (const Patch& patch : result.patches)
+    for (const Patch& patch : result.patches) {
         differences.push_back(patch.difference);
+    }
     model.histogram = histogramOf(differences);
     model.marks = {
         {"average " + fixedText(result.statistics.mean, 2), result.statistics.mean, false},
         {"95 % " + fixedText(result.statistics.percentile95, 2), result.statistics.percentile95,
          false}};
     for (const Criterion& criterion : result.criteria) {
-        if (!criterion.used || !criterion.tolerance)
+        if (!criterion.used || !criterion.tolerance) {
             continue;
+        }
         const double limit = *criterion.tolerance;
         const std::string text = fixedText(limit, decimalsOf(limit, 0));
-        if (criterion.name == "average")
+        if (criterion.name == "average") {
             model.marks[0].label += " (at most " + text + ")";
-        else if (criterion.name == "percentile95")
+        } else if (criterion.name == "percentile95") {
             model.marks[1].label += " (at most " + text + ")";
-        else if (criterion.name == "maximum")
+        } else if (criterion.name == "maximum") {
             model.marks.push_back({"limit of each patch " + text, limit, true});
+        }
     }
     std::erase_if(model.marks, [](const Mark& mark) { return !std::isfinite(mark.value); });
-    for (const Bin& bin : model.histogram)
+    for (const Bin& bin : model.histogram) {
         model.histogramText += (model.histogramText.empty() ? "" : "; ") +
                                fixedText(bin.from, decimalsOf(bin.from, 0)) + " to " +
                                fixedText(bin.to, decimalsOf(bin.to, 0)) + ": " +
                                std::to_string(bin.count);
+    }
 }
 
 void addFact(Facts& facts, const char* label, const std::string& text) {
-    if (!text.empty())
+    if (!text.empty()) {
         facts.emplace_back(label, text);
+    }
 }
 
 std::string foundBy(const std::string& how) {
-    if (how == "own")
+    if (how == "own") {
         return "its own patches";
-    if (how == "profile")
+    }
+    if (how == "profile") {
         return "the profile, evaluated at their device values";
-    if (how == "deviceValues")
+    }
+    if (how == "deviceValues") {
         return "patches with equal device values";
-    if (how == "labels")
+    }
+    if (how == "labels") {
         return "patches with equal ids or names";
+    }
     return how == "order" ? "patches in the same order" : how;
 }
 
 std::string listed(const Unpaired& unpaired) {
-    if (unpaired.count == 0)
+    if (unpaired.count == 0) {
         return {};
+    }
     std::string text = std::to_string(unpaired.count) + (unpaired.labels.empty() ? "" : ":");
-    for (const std::string& label : unpaired.labels)
+    for (const std::string& label : unpaired.labels) {
         text += ' ' + label;
+    }
     return !unpaired.labels.empty() && unpaired.count > unpaired.labels.size() ? text + " ..."
                                                                                : text;
 }
@@ -298,8 +332,9 @@ void addSections(Model& model, const Result& result, const Meta* meta) {
     if (meta != nullptr) {
         addFact(job, "Title", meta->title);
         addFact(job, "Job", std::to_string(meta->jobId));
-        if (meta->parentId)
+        if (meta->parentId) {
             addFact(job, "Part of job", std::to_string(*meta->parentId));
+        }
         addFact(job, "Strip", meta->strip == 2 ? "Second" : "First");
         addFact(job, "Verified", model.created);
         addFact(job, "Paper", meta->paper);
@@ -314,8 +349,9 @@ void addSections(Model& model, const Result& result, const Meta* meta) {
     model.sections = {{meta != nullptr ? "Job" : "Preset", job},
                       {"Target", factsOf(result.target)},
                       {"Measurement", factsOf(result.measurement)}};
-    if (result.patchSet)
+    if (result.patchSet) {
         model.sections.emplace_back("Patch set", factsOf(*result.patchSet));
+    }
     Facts pairing;
     addFact(pairing, "Patches of",
             result.selection == "patchSet" ? "the patch set" : "the " + result.selection);
@@ -331,10 +367,11 @@ void addSections(Model& model, const Result& result, const Meta* meta) {
                     counted(result.repeats.readings, "reading", "readings") +
                     (result.repeats.averaged ? "; their means are compared"
                                              : "; each is compared by itself"));
-        if (result.repeats.worstPatch && result.repeats.largestDistance)
+        if (result.repeats.worstPatch && result.repeats.largestDistance) {
             addFact(pairing, "Furthest from the mean of its readings",
                     fixedText(*result.repeats.largestDistance, 2) + " " + model.unit + ", " +
                         labelOf(result, *result.repeats.worstPatch));
+        }
     }
     model.sections.emplace_back("Pairing", pairing);
     model.sections.emplace_back(
@@ -343,8 +380,9 @@ void addSections(Model& model, const Result& result, const Meta* meta) {
 
 void addRepeats(Model& model, const Result& result) {
     const Repeats& repeats = result.repeats;
-    if (repeats.patches == 0 || !repeats.largestDistance)
+    if (repeats.patches == 0 || !repeats.largestDistance) {
         return;
+    }
     model.statistics.emplace_back("Read repeatedly", std::to_string(repeats.patches));
     model.statistics.emplace_back("Spread of repeats", fixedText(*repeats.largestDistance, 2));
 }
@@ -362,9 +400,11 @@ void addHead(Model& model, const Result& result, const Meta* meta) {
     } else {
         parts = {result.presetName};
     }
-    for (const std::string& part : parts)
-        if (!part.empty())
+    for (const std::string& part : parts) {
+        if (!part.empty()) {
             model.subtitle += (model.subtitle.empty() ? "" : " · ") + part;
+        }
+    }
 }
 
 } // namespace
@@ -384,15 +424,17 @@ std::string labelOf(const Result& result, std::size_t index) {
     const std::string inTarget = joined(patch.id, patch.name);
     const std::string onSheet = joined(patch.measuredId, patch.measuredName);
     const std::string device = deviceText(result, index);
-    if (onSheet.empty() || onSheet == inTarget)
+    if (onSheet.empty() || onSheet == inTarget) {
         return (inTarget.empty() ? "row " + std::to_string(index + 1) : inTarget) + device;
+    }
     return onSheet + device + (inTarget.empty() ? "" : ", in the target " + inTarget);
 }
 
 std::string fixedText(double value, int decimals) {
     char text[400];
-    if (!std::isfinite(value))
+    if (!std::isfinite(value)) {
         return dash;
+    }
     const auto [end, error] =
         std::to_chars(text, text + sizeof text, value, std::chars_format::fixed, decimals);
     return error == std::errc() ? std::string(text, end) : dash;
@@ -421,9 +463,11 @@ std::string dateText(const std::string& created) {
 
 std::vector<Bin> histogramOf(const std::vector<double>& values) {
     double largest = 0;
-    for (const double value : values)
-        if (std::isfinite(value))
+    for (const double value : values) {
+        if (std::isfinite(value)) {
             largest = std::max(largest, value);
+        }
+    }
     constexpr double fewest = 12;
     constexpr double smallestWidth = 0.01;
     const double wanted = std::max(largest / fewest, smallestWidth);
@@ -436,11 +480,14 @@ std::vector<Bin> histogramOf(const std::vector<double>& values) {
         return static_cast<std::size_t>(std::max(value, 0.0) / width + 1e-9);
     };
     std::vector<Bin> bins(binOf(largest) + 1);
-    for (std::size_t i = 0; i < bins.size(); ++i)
+    for (std::size_t i = 0; i < bins.size(); ++i) {
         bins[i] = {static_cast<double>(i) * width, static_cast<double>(i + 1) * width, 0};
-    for (const double value : values)
-        if (std::isfinite(value))
+    }
+    for (const double value : values) {
+        if (std::isfinite(value)) {
             ++bins[binOf(value)].count;
+        }
+    }
     return bins;
 }
 
@@ -448,8 +495,9 @@ Model makeModel(const Result& result, const Meta* meta) {
     Model model;
     addHead(model, result, meta);
     model.unit = differenceUnit(result.formula);
-    for (const Criterion& criterion : result.criteria)
+    for (const Criterion& criterion : result.criteria) {
         (criterion.used ? model.judged : model.others).push_back(figureOf(criterion, result));
+    }
     putInOrder(model.judged);
     sayVerdict(model, result);
     model.condition = conditionText(result);
@@ -462,9 +510,10 @@ Model makeModel(const Result& result, const Meta* meta) {
                         {"Standard deviation", fixedText(s.standardDeviation, 2)}};
     addRepeats(model, result);
     drawHistogram(model, result);
-    for (const std::size_t patch : worstFirst(result.patches))
+    for (const std::size_t patch : worstFirst(result.patches)) {
         model.rows.push_back(
             {patch, swatch(result.patches[patch].target), swatch(result.patches[patch].measured)});
+    }
     chooseDrawn(model);
     addSections(model, result, meta);
     return model;

@@ -37,8 +37,9 @@ void appendRow(std::string& text, const Result& result, const Row& row) {
             inScript(patch.name) + ",[";
     const std::size_t channels = result.channels.size();
     for (std::size_t i = 0; i < channels; ++i) {
-        if (i != 0)
+        if (i != 0) {
             text += ',';
+        }
         appendNumber(text, result.device[row.patch * channels + i]);
     }
     text += "],";
@@ -49,14 +50,15 @@ void appendRow(std::string& text, const Result& result, const Row& row) {
     appendNumber(text, patch.difference);
     text += ',';
     text += '"' + swatchText(row.target) + "\",\"" + swatchText(row.measured) + '"';
-    if (patch.measuredId != patch.id || patch.measuredName != patch.name)
+    if (patch.measuredId != patch.id || patch.measuredName != patch.name) {
         text += ',' + inScript(patch.measuredId) + ',' + inScript(patch.measuredName);
+    }
     text += ']';
 }
 
 Json figures(const std::vector<Figure>& figures) {
     Json list = Json::array();
-    for (const Figure& figure : figures)
+    for (const Figure& figure : figures) {
         list.push_back({{"title", figure.title},
                         {"unit", figure.unit},
                         {"outcome", keyOf(figure.outcome)},
@@ -67,34 +69,39 @@ Json figures(const std::vector<Figure>& figures) {
                         {"fill", figure.fill},
                         {"patches", figure.patches},
                         {"worst", figure.worstLabel}});
+    }
     return list;
 }
 
 Json facts(const Facts& facts) {
     Json list = Json::array();
-    for (const auto& [label, text] : facts)
+    for (const auto& [label, text] : facts) {
         list.push_back({label, text});
+    }
     return list;
 }
 
 Json bins(const std::vector<Bin>& histogram) {
     Json list = Json::array();
-    for (const Bin& bin : histogram)
+    for (const Bin& bin : histogram) {
         list.push_back({bin.from, bin.to, bin.count});
+    }
     return list;
 }
 
 Json marks(const std::vector<Mark>& marks) {
     Json list = Json::array();
-    for (const Mark& mark : marks)
+    for (const Mark& mark : marks) {
         list.push_back({{"label", mark.label}, {"value", mark.value}, {"limit", mark.limit}});
+    }
     return list;
 }
 
 Json sections(const Model& model) {
     Json list = Json::array();
-    for (const auto& [title, content] : model.sections)
+    for (const auto& [title, content] : model.sections) {
         list.push_back({title, facts(content)});
+    }
     return list;
 }
 
@@ -131,11 +138,13 @@ std::string dataOf(const Model& model, const Result& result) {
 
 /// The text, cut to what a summary has room for, never within a character.
 std::string shortened(std::string text) {
-    if (text.size() <= longestText)
+    if (text.size() <= longestText) {
         return text;
+    }
     std::size_t end = longestText;
-    while (end > 0 && (text[end] & 0xC0) == 0x80)
+    while (end > 0 && (text[end] & 0xC0) == 0x80) {
         --end;
+    }
     return text.substr(0, end) + "…";
 }
 
@@ -160,8 +169,9 @@ std::string pageOf(const Result& result, const Meta* meta) {
 
 std::optional<Summary> summaryIn(std::string_view page) {
     const std::size_t start = page.find(summaryStart);
-    if (start == page.npos)
+    if (start == page.npos) {
         return std::nullopt;
+    }
     page.remove_prefix(start + summaryStart.size());
     const Json json = Json::parse(page.substr(0, page.find('<')), nullptr, false);
     try {

@@ -19,23 +19,27 @@ class Draft {
         m_file = mkostemp(m_path.data(), O_CLOEXEC);
     }
     ~Draft() {
-        if (m_file < 0)
+        if (m_file < 0) {
             return;
+        }
         close(m_file);
-        if (!m_named)
+        if (!m_named) {
             unlink(m_path.c_str());
+        }
     }
     Draft(const Draft&) = delete;
     Draft& operator=(const Draft&) = delete;
 
     /// False with errno set.
     bool write(std::string_view text) const {
-        if (m_file < 0)
+        if (m_file < 0) {
             return false;
+        }
         while (!text.empty()) {
             const ssize_t count = ::write(m_file, text.data(), text.size());
-            if (count < 0 && errno != EINTR)
+            if (count < 0 && errno != EINTR) {
                 return false;
+            }
             text.remove_prefix(count < 0 ? 0 : static_cast<std::size_t>(count));
         }
         const mode_t mask = umask(0);
@@ -51,17 +55,21 @@ class Draft {
 
   private:
     bool nameFresh(const std::string& path) const {
-        if (renameat2(AT_FDCWD, m_path.c_str(), AT_FDCWD, path.c_str(), RENAME_NOREPLACE) == 0)
+        if (renameat2(AT_FDCWD, m_path.c_str(), AT_FDCWD, path.c_str(), RENAME_NOREPLACE) == 0) {
             return true;
-        if (errno != EINVAL && errno != ENOSYS)
+        }
+        if (errno != EINVAL && errno != ENOSYS) {
             return false;
+        }
         // This file system can't, so the name is taken first.
         const int place = open(path.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600);
-        if (place < 0)
+        if (place < 0) {
             return false;
+        }
         close(place);
-        if (rename(m_path.c_str(), path.c_str()) == 0)
+        if (rename(m_path.c_str(), path.c_str()) == 0) {
             return true;
+        }
         const int reason = errno;
         unlink(path.c_str());
         errno = reason;
@@ -98,14 +106,16 @@ std::string keepPage(const std::string& folder, const std::string& stem, std::st
     for (int number = 1; number <= mostOfOneName; ++number) {
         const std::string path =
             folder + "/" + stem + (number == 1 ? "" : "-" + std::to_string(number)) + ".html";
-        if (draft.name(path, true))
+        if (draft.name(path, true)) {
             return path;
+        }
         if (errno != EEXIST) {
             problem = std::strerror(errno);
             return {};
         }
-        if (holds(path, page))
+        if (holds(path, page)) {
             return path;
+        }
     }
     problem = "every name is taken";
     return {};
@@ -114,8 +124,9 @@ std::string keepPage(const std::string& folder, const std::string& stem, std::st
 bool replacePage(const std::string& path, std::string_view page, std::string& problem) {
     const std::size_t slash = path.rfind('/');
     Draft draft(slash == path.npos ? "." : path.substr(0, slash));
-    if (draft.write(page) && draft.name(path, false))
+    if (draft.write(page) && draft.name(path, false)) {
         return true;
+    }
     problem = std::strerror(errno);
     return false;
 }

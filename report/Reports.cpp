@@ -38,9 +38,11 @@ std::vector<fs::path> entriesOf(const fs::path& folder, Wanted wanted) {
     std::vector<fs::path> paths;
     std::error_code failure;
     for (fs::directory_iterator at(folder, failure), end; !failure && at != end;
-         at.increment(failure))
-        if (wanted(*at))
+         at.increment(failure)) {
+        if (wanted(*at)) {
             paths.push_back(at->path());
+        }
+    }
     return paths;
 }
 
@@ -48,11 +50,14 @@ std::vector<fs::path> entriesOf(const fs::path& folder, Wanted wanted) {
 
 std::vector<Listed> reportsBelow(const std::string& folder) {
     std::vector<Listed> reports;
-    for (const fs::path& job : entriesOf(folder, isJobFolder))
-        for (const fs::path& page : entriesOf(job, isReport))
-            if (auto summary = summaryIn(startOf(page)))
+    for (const fs::path& job : entriesOf(folder, isJobFolder)) {
+        for (const fs::path& page : entriesOf(job, isReport)) {
+            if (auto summary = summaryIn(startOf(page))) {
                 reports.push_back(
                     {job.filename().string() + "/" + page.filename().string(), *summary});
+            }
+        }
+    }
     // Stamps carry the distance from UTC; within one room they sort as text.
     std::sort(reports.begin(), reports.end(), [](const auto& a, const auto& b) {
         return a.summary.created != b.summary.created ? a.summary.created > b.summary.created

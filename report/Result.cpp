@@ -20,14 +20,16 @@ double number(const Json& value) {
 
 /// A whole number. A real one is not turned into it, for it may have no room there.
 std::int64_t whole(const Json& value) {
-    if (!value.is_number_integer())
+    if (!value.is_number_integer()) {
         throw std::runtime_error("a number that is not whole");
+    }
     return value.get<std::int64_t>();
 }
 
 std::size_t count(const Json& value) {
-    if (whole(value) < 0)
+    if (whole(value) < 0) {
         throw std::runtime_error("a count below 0");
+    }
     return value.get<std::size_t>();
 }
 
@@ -44,8 +46,9 @@ std::optional<std::size_t> optionalCount(const Json& json, const char* key) {
 template<class Value>
 Value oneOf(const Json& text, const std::map<std::string, Value>& words) {
     const auto found = words.find(text.get<std::string>());
-    if (found == words.end())
+    if (found == words.end()) {
         throw std::runtime_error("unknown word \"" + text.get<std::string>() + "\"");
+    }
     return found->second;
 }
 
@@ -66,11 +69,13 @@ Criterion criterion(const Json& json) {
     c.tolerance = optionalNumber(json.at("tolerance"));
     c.value = optionalNumber(json.at("value"));
     c.rounded = optionalNumber(json.at("rounded"));
-    if (const Json& decimals = json.at("decimals"); !decimals.is_null())
+    if (const Json& decimals = json.at("decimals"); !decimals.is_null()) {
         c.decimals = static_cast<int>(std::clamp<std::int64_t>(whole(decimals), 0, 6));
+    }
     c.patches = count(json.at("patches"));
-    if (const Json& worst = json.at("worstPatch"); !worst.is_null())
+    if (const Json& worst = json.at("worstPatch"); !worst.is_null()) {
         c.worstPatch = count(worst);
+    }
     if (const auto found = json.find("found"); found != json.end()) {
         c.found = count(*found);
         c.needed = count(json.at("needed"));
@@ -91,14 +96,18 @@ Input input(const Json& json) {
           std::pair{"created", "Created"}, std::pair{"instrumentation", "Instrumentation"},
           std::pair{"printing", "Printing"}, std::pair{"illuminant", "Illuminant"},
           std::pair{"observer", "Observer"},
-          std::pair{"measurementCondition", "Measurement condition"}})
-        if (const auto found = json.find(key); found != json.end() && found->is_string())
+          std::pair{"measurementCondition", "Measurement condition"}}) {
+        if (const auto found = json.find(key); found != json.end() && found->is_string()) {
             input.statements.emplace_back(title, found->get<std::string>());
-    if (json.value("calculatedFromSpectra", false))
+        }
+    }
+    if (json.value("calculatedFromSpectra", false)) {
         input.statements.emplace_back("Colours", "calculated from the spectra for D50, 2 degrees");
+    }
     if (const auto found = json.find("measurementCondition");
-        found != json.end() && found->is_string())
+        found != json.end() && found->is_string()) {
         input.measurementCondition = *found;
+    }
     return input;
 }
 
@@ -113,26 +122,31 @@ class Rows {
     explicit Rows(Result& result) : m_result(result) {}
 
     bool operator()(int depth, Json::parse_event_t event, Json& parsed) {
-        if (event == Json::parse_event_t::key && depth <= 2)
+        if (event == Json::parse_event_t::key && depth <= 2) {
             (depth == 1 ? m_outer : m_inner) = parsed.get<std::string>();
-        if (event != Json::parse_event_t::array_end)
+        }
+        if (event != Json::parse_event_t::array_end) {
             return true;
-        if (depth == 2 && m_outer == "patches")
+        }
+        if (depth == 2 && m_outer == "patches") {
             takePatch(parsed);
-        else if (depth == 3 && m_outer == "unpaired")
+        } else if (depth == 3 && m_outer == "unpaired") {
             takeUnpaired(parsed);
-        else
+        } else {
             return true;
+        }
         return false;
     }
 
     /// Throws where patches have different numbers of device values.
     void check() const {
         if (m_result.device.size() != m_result.channels.size() * m_result.patches.size() ||
-            m_uneven)
+            m_uneven) {
             throw std::runtime_error("device values do not match their channels");
-        if (m_result.patches.empty())
+        }
+        if (m_result.patches.empty()) {
             throw std::runtime_error("no patches");
+        }
     }
 
   private:
@@ -142,11 +156,13 @@ class Rows {
                                     number(row.at(5)), row.at(isRelabelled ? 6 : 0),
                                     row.at(isRelabelled ? 7 : 1)});
         const Json& device = row.at(2);
-        if (m_result.patches.size() == 1)
+        if (m_result.patches.size() == 1) {
             m_channels = device.size();
+        }
         m_uneven = m_uneven || device.size() != m_channels;
-        for (const Json& value : device)
+        for (const Json& value : device) {
             m_result.device.push_back(number(value));
+        }
     }
 
     void takeUnpaired(const Json& row) {
@@ -168,10 +184,12 @@ class Rows {
 };
 
 void checkFormat(const Json& json) {
-    if (!json.is_object() || json.value("format", Json()) != "tintgate-result")
+    if (!json.is_object() || json.value("format", Json()) != "tintgate-result") {
         throw std::runtime_error("not a result");
-    if (json.at("formatVersion") != knownVersion)
+    }
+    if (json.at("formatVersion") != knownVersion) {
         throw std::runtime_error("a format that this version does not know");
+    }
 }
 
 void fill(Result& result, const Json& json) {
@@ -190,14 +208,16 @@ void fill(Result& result, const Json& json) {
     const Json& inputs = json.at("inputs");
     result.target = input(inputs.at("target"));
     result.measurement = input(inputs.at("measurement"));
-    if (!inputs.at("patchSet").is_null())
+    if (!inputs.at("patchSet").is_null()) {
         result.patchSet = input(inputs.at("patchSet"));
+    }
     const Json& pairing = json.at("pairing");
     result.selection = pairing.at("selection");
     result.targetBy = pairing.at("target");
     result.measurementBy = pairing.at("measurement");
-    if (const auto listed = pairing.find("unpairedTarget"); listed != pairing.end())
+    if (const auto listed = pairing.find("unpairedTarget"); listed != pairing.end()) {
         result.unpairedTarget.count = count(*listed); // which are not listed
+    }
     result.statistics = statistics(json.at("statistics"));
     if (const auto repeats = json.find("repeats"); repeats != json.end()) {
         result.repeats.patches = count(repeats->at("patches"));
@@ -205,20 +225,26 @@ void fill(Result& result, const Json& json) {
         result.repeats.largestDistance = optionalNumber(repeats->at("largestDistance"));
         result.repeats.worstPatch = optionalCount(*repeats, "worstPatch");
     }
-    for (const Json& item : json.at("criteria"))
+    for (const Json& item : json.at("criteria")) {
         result.criteria.push_back(criterion(item));
-    for (const Json& item : json.at("warnings"))
+    }
+    for (const Json& item : json.at("warnings")) {
         result.warnings.push_back({item.at("text"), item.value("keepsOpen", false)});
-    for (const Json& item : json.at("deviceChannels"))
+    }
+    for (const Json& item : json.at("deviceChannels")) {
         result.channels.push_back(item);
+    }
 }
 
 void checkWorstPatches(const Result& result) {
-    for (const Criterion& c : result.criteria)
-        if (c.worstPatch && *c.worstPatch >= result.patches.size())
+    for (const Criterion& c : result.criteria) {
+        if (c.worstPatch && *c.worstPatch >= result.patches.size()) {
             throw std::runtime_error("a criterion names a patch that is not there");
-    if (result.repeats.worstPatch && *result.repeats.worstPatch >= result.patches.size())
+        }
+    }
+    if (result.repeats.worstPatch && *result.repeats.worstPatch >= result.patches.size()) {
         throw std::runtime_error("the repeats name a patch that is not there");
+    }
 }
 
 } // namespace

@@ -47,7 +47,7 @@ struct Patch {
 /// One side of the comparison, with what its file says of itself. Empty where it says nothing.
 struct Input {
     std::string path;
-    std::string kind; ///< "text" or "profile".
+    std::string kind;     ///< "text" or "profile".
     std::string identity; ///< Of a target's colours; empty in results of versions before it.
     std::vector<std::pair<std::string, std::string>> statements;
     std::string measurementCondition; ///< "M0" to "M3", or empty.

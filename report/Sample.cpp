@@ -58,22 +58,26 @@ const char* inkCriterion(Ink ink) {
 }
 
 std::optional<Ink> inkOf(const double* device, std::size_t channels) {
-    if (channels < 4)
+    if (channels < 4) {
         return std::nullopt;
+    }
     std::optional<std::size_t> full;
     for (std::size_t i = 0; i < channels; ++i) {
-        if (near(device[i], 0))
+        if (near(device[i], 0)) {
             continue;
-        if (full || i >= 4 || !near(device[i], 100))
+        }
+        if (full || i >= 4 || !near(device[i], 100)) {
             return std::nullopt;
+        }
         full = i;
     }
     return full ? allInks[*full + 1] : Ink::Paper;
 }
 
 void InkMeans::add(Ink ink, const colour::Lab& lab) {
-    if (!std::isfinite(lab.L) || !std::isfinite(lab.a) || !std::isfinite(lab.b))
+    if (!std::isfinite(lab.L) || !std::isfinite(lab.a) || !std::isfinite(lab.b)) {
         return;
+    }
     Sum& sum = m_sums[static_cast<std::size_t>(ink)];
     sum.lab = {sum.lab.L + lab.L, sum.lab.a + lab.a, sum.lab.b + lab.b};
     ++sum.count;
@@ -84,8 +88,9 @@ InkColours InkMeans::means() const {
     for (std::size_t i = 0; i < inkCount; ++i) {
         const auto& [lab, count] = m_sums[i];
         const auto n = static_cast<double>(count);
-        if (count != 0)
+        if (count != 0) {
             means[i] = colour::Lab{lab.L / n, lab.a / n, lab.b / n};
+        }
     }
     return means;
 }
@@ -106,8 +111,9 @@ Sample sampleOf(const Result& result, const Meta* meta) {
         sample.strip = meta->strip;
         sample.paper = meta->paper;
         sample.workflow = meta->workflow;
-        if (!meta->instrument.empty())
+        if (!meta->instrument.empty()) {
             sample.instrument = meta->instrument;
+        }
     }
     sample.preset = result.presetName;
     sample.presetId = result.presetId;
@@ -116,8 +122,9 @@ Sample sampleOf(const Result& result, const Meta* meta) {
     sample.criteria = result.criteria;
     // RGB and the like have channels that are no process inks.
     if (result.channels.size() >= 4 && result.channels[0].ends_with("C") &&
-        result.channels[3].ends_with("K"))
+        result.channels[3].ends_with("K")) {
         addInks(sample, result);
+    }
     return sample;
 }
 

@@ -25,8 +25,9 @@ double encoded(double linear) {
 } // namespace
 
 Swatch swatch(const colour::Lab& lab) {
-    if (!std::isfinite(lab.L) || !std::isfinite(lab.a) || !std::isfinite(lab.b))
+    if (!std::isfinite(lab.L) || !std::isfinite(lab.a) || !std::isfinite(lab.b)) {
         return {0, 0, 0, true};
+    }
     // No colour of a print comes near this; beyond it the cubes could overflow.
     const auto bounded = [](double value) { return std::clamp(value, -1000.0, 1000.0); };
     const double y = (bounded(lab.L) + 16) / 116;

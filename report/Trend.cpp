@@ -35,14 +35,16 @@ std::string dayText(std::int64_t time) {
 /// "cyan", "cyan and black", "cyan, magenta and black"
 std::string listText(const std::vector<std::string>& words) {
     std::string text;
-    for (std::size_t i = 0; i < words.size(); ++i)
+    for (std::size_t i = 0; i < words.size(); ++i) {
         text += (i == 0 ? "" : i + 1 == words.size() ? " and " : ", ") + words[i];
+    }
     return text;
 }
 
 std::string lower(std::string text) {
-    if (!text.empty() && text[0] >= 'A' && text[0] <= 'Z')
+    if (!text.empty() && text[0] >= 'A' && text[0] <= 'Z') {
         text[0] = static_cast<char>(text[0] - 'A' + 'a');
+    }
     return text;
 }
 
@@ -59,8 +61,9 @@ double judgedValue(const Criterion& criterion) {
 
 double excessOf(const Criterion& criterion) {
     const double value = judgedValue(criterion);
-    if (!criterion.used || !criterion.tolerance || !std::isfinite(value))
+    if (!criterion.used || !criterion.tolerance || !std::isfinite(value)) {
         return -1;
+    }
     return *criterion.tolerance > 0 ? value / *criterion.tolerance
                                     : std::numeric_limits<double>::infinity();
 }
@@ -79,12 +82,14 @@ double axisOf(const colour::Lab& lab, std::size_t axis) {
 
 std::string shiftText(const Drift (&drifts)[3]) {
     std::vector<std::string> parts;
-    for (std::size_t i = 0; i < 3; ++i)
-        if (drifts[i].significant)
+    for (std::size_t i = 0; i < 3; ++i) {
+        if (drifts[i].significant) {
             parts.push_back((drifts[i].shift > 0 ? axes[i].more : axes[i].less) +
                             std::string(" (") + axes[i].symbol +
                             (drifts[i].shift > 0 ? "\u00a0+" : "\u00a0") +
                             fixedText(drifts[i].shift, 2) + ")");
+        }
+    }
     return listText(parts);
 }
 
@@ -105,8 +110,9 @@ void sayMovement(InkTrend& trend, bool significant, std::size_t known) {
 void addLatest(InkTrend& trend, const std::vector<const Sample*>& samples) {
     for (auto at = samples.rbegin(); at != samples.rend(); ++at) {
         const Criterion* const criterion = criterionOf(**at, inkCriterion(trend.ink));
-        if (criterion == nullptr || !std::isfinite(judgedValue(*criterion)))
+        if (criterion == nullptr || !std::isfinite(judgedValue(*criterion))) {
             continue;
+        }
         trend.value = fixedText(judgedValue(*criterion), criterion->decimals);
         if (criterion->tolerance && *criterion->tolerance > 0) {
             trend.tolerance = fixedText(*criterion->tolerance, criterion->decimals);
@@ -184,8 +190,9 @@ InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
     for (const Sample* sample : samples) {
         const auto& lab = sample->inks[static_cast<std::size_t>(ink)];
         known += lab.has_value();
-        for (std::size_t i = 0; i < 3; ++i)
+        for (std::size_t i = 0; i < 3; ++i) {
             values[i].push_back(lab ? axisOf(*lab, i) : none);
+        }
     }
     addLatest(trend, samples);
     const Drift drifts[3] = {driftOf(values[0]), driftOf(values[1]), driftOf(values[2])};
@@ -199,19 +206,21 @@ InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
     trend.beganSwatch = swatch(trend.began);
     trend.nowSwatch = swatch(trend.now);
     trend.shift = colour::deltaE76(trend.began, trend.now);
-    for (std::size_t i = 0; i < 3; ++i)
+    for (std::size_t i = 0; i < 3; ++i) {
         for (std::size_t j = 0; j < samples.size(); ++j) {
             trend.changes[i].push_back(values[i][j] - drifts[i].began);
             trend.averages[i].push_back(drifts[i].averages[j] - drifts[i].began);
         }
+    }
     sayMovement(trend,
                 std::any_of(drifts, drifts + 3, [](const Drift& d) { return d.significant; }),
                 known);
     addCorrection(trend, samples);
     trend.sentence =
         "moving average " + fixedText(trend.shift, 2) + " ΔE*ab from the mean of the first jobs";
-    if (trend.movement == Movement::Drifting)
+    if (trend.movement == Movement::Drifting) {
         trend.sentence += ": " + shiftText(drifts);
+    }
     return trend;
 }
 
@@ -223,13 +232,15 @@ void add(CriterionTrend& trend, std::size_t job, const Criterion* criterion) {
         criterion != nullptr && criterion->tolerance ? *criterion->tolerance : none;
     trend.values.push_back(value);
     trend.outcomes.push_back(criterion != nullptr ? criterion->outcome : Outcome::Unanswered);
-    if (criterion == nullptr)
+    if (criterion == nullptr) {
         return;
+    }
     const bool same = !trend.tolerances.empty() &&
                       (trend.tolerances.back().second == tolerance ||
                        (std::isnan(trend.tolerances.back().second) && std::isnan(tolerance)));
-    if (!same)
+    if (!same) {
         trend.tolerances.emplace_back(job, tolerance);
+    }
     trend.used = trend.used || criterion->used;
     trend.decimals = criterion->decimals;
     trend.failed += criterion->outcome == Outcome::Fail;
@@ -243,16 +254,20 @@ void add(CriterionTrend& trend, std::size_t job, const Criterion* criterion) {
 std::vector<CriterionTrend> criterionTrends(const std::vector<const Sample*>& samples) {
     std::vector<std::string> names;
     std::vector<CriterionTrend> trends;
-    for (const Sample* sample : samples)
-        for (const Criterion& criterion : sample->criteria)
+    for (const Sample* sample : samples) {
+        for (const Criterion& criterion : sample->criteria) {
             if (std::find(names.begin(), names.end(), criterion.name) == names.end()) {
                 names.push_back(criterion.name);
                 trends.emplace_back().title = criterion.title;
                 trends.back().unit = unitOf(criterion, sample->formula);
             }
-    for (std::size_t job = 0; job < samples.size(); ++job)
-        for (std::size_t i = 0; i < names.size(); ++i)
+        }
+    }
+    for (std::size_t job = 0; job < samples.size(); ++job) {
+        for (std::size_t i = 0; i < names.size(); ++i) {
             add(trends[i], job, criterionOf(*samples[job], names[i]));
+        }
+    }
     std::erase_if(trends,
                   [](const CriterionTrend& trend) { return trend.answered == 0 && !trend.used; });
     std::stable_sort(trends.begin(), trends.end(),
@@ -270,11 +285,13 @@ auto keyOf(const Sample& s) {
 
 std::string nameOf(const Sample& sample) {
     std::string name;
-    for (const std::string& part :
-         {sample.folder, sample.printer, sample.paper, sample.target, sample.preset,
-          sample.instrument, sample.workflow, std::string(sample.strip == 2 ? "second strip" : "")})
-        if (!part.empty())
+    for (const std::string& part : {sample.folder, sample.printer, sample.paper, sample.target,
+                                    sample.preset, sample.instrument, sample.workflow,
+                                    std::string(sample.strip == 2 ? "second strip" : "")}) {
+        if (!part.empty()) {
             name += (name.empty() ? "" : " · ") + part;
+        }
+    }
     return name.empty() ? "Without paper, preset and instrument" : name;
 }
 
@@ -316,8 +333,9 @@ std::string recentText(const Series& series, const std::vector<const Sample*>& s
     const auto failed = std::count_if(begin, samples.end(), [](const Sample* sample) {
         return sample->verdict == Verdict::Failed;
     });
-    if (failed == 0)
+    if (failed == 0) {
         return {};
+    }
     const CriterionTrend* worst = nullptr;
     std::size_t most = 0;
     for (const CriterionTrend& criterion : series.criteria) {
@@ -347,8 +365,9 @@ std::string correctionText(const InkTrend& ink) {
 void sayDrifting(Series& series) {
     std::vector<std::string> names;
     for (const InkTrend& ink : series.inks) {
-        if (ink.movement != Movement::Drifting)
+        if (ink.movement != Movement::Drifting) {
             continue;
+        }
         names.push_back(lower(inkName(ink.ink)));
         series.reasons.push_back(inkName(ink.ink) + std::string(": ") + ink.sentence +
                                  correctionText(ink));
@@ -360,9 +379,11 @@ void sayDrifting(Series& series) {
 
 void saySteady(Series& series) {
     const InkTrend* nearest = nullptr;
-    for (const InkTrend& ink : series.inks)
-        if (!ink.tolerance.empty() && (nearest == nullptr || ink.fill > nearest->fill))
+    for (const InkTrend& ink : series.inks) {
+        if (!ink.tolerance.empty() && (nearest == nullptr || ink.fill > nearest->fill)) {
             nearest = &ink;
+        }
+    }
     series.word = series.failing ? "Steady, but the latest job failed" : "Steady";
     series.sentence = "The moving averages of paper and solids stay at the means of the first " +
                       std::to_string(series.beginning) + " jobs.";
@@ -405,27 +426,32 @@ void sayState(Series& series, const std::vector<const Sample*>& samples) {
             "These results hold nothing of paper or solids, so a drift can't be told.";
         break;
     }
-    if (const std::string recent = recentText(series, samples); !recent.empty())
+    if (const std::string recent = recentText(series, samples); !recent.empty()) {
         series.reasons.push_back(recent);
+    }
 }
 
 Series seriesOf(const std::vector<Sample>& all, std::vector<std::size_t> indices) {
     Series series;
     series.samples = std::move(indices);
     std::vector<const Sample*> samples;
-    for (const std::size_t index : series.samples)
+    for (const std::size_t index : series.samples) {
         samples.push_back(&all[index]);
+    }
     series.name = nameOf(*samples[0]);
     series.span = dayText(samples.front()->time);
-    if (const std::string last = dayText(samples.back()->time); last != series.span)
+    if (const std::string last = dayText(samples.back()->time); last != series.span) {
         series.span += " to " + last;
-    for (const Sample* sample : samples)
+    }
+    for (const Sample* sample : samples) {
         ++(sample->verdict == Verdict::Passed   ? series.passed
            : sample->verdict == Verdict::Failed ? series.failed
                                                 : series.incomplete);
+    }
     series.beginning = beginningOf(samples.size());
-    for (const Ink ink : allInks)
+    for (const Ink ink : allInks) {
         series.inks.push_back(inkTrend(ink, samples));
+    }
     series.criteria = criterionTrends(samples);
     sayState(series, samples);
     return series;
@@ -445,8 +471,9 @@ std::string nearestText(const Sample& sample) {
     const auto furthest =
         std::max_element(sample.criteria.begin(), sample.criteria.end(),
                          [](const auto& a, const auto& b) { return excessOf(a) < excessOf(b); });
-    if (furthest == sample.criteria.end() || excessOf(*furthest) < 0)
+    if (furthest == sample.criteria.end() || excessOf(*furthest) < 0) {
         return {};
+    }
     return furthest->title + " " + fixedText(judgedValue(*furthest), furthest->decimals) + " of " +
            fixedText(*furthest->tolerance, furthest->decimals);
 }
@@ -461,10 +488,12 @@ TrendModel makeTrend(std::vector<Sample> samples, const std::string& source,
     });
     using Key = decltype(keyOf(model.samples[0]));
     std::map<Key, std::vector<std::size_t>> groups;
-    for (std::size_t i = 0; i < model.samples.size(); ++i)
+    for (std::size_t i = 0; i < model.samples.size(); ++i) {
         groups[keyOf(model.samples[i])].push_back(i);
-    for (auto& [key, indices] : groups)
+    }
+    for (auto& [key, indices] : groups) {
         model.series.push_back(seriesOf(model.samples, std::move(indices)));
+    }
     tellApart(model.series, model.samples);
     std::stable_sort(model.series.begin(), model.series.end(), [](const auto& a, const auto& b) {
         const bool first = a.movement == Movement::Drifting;

@@ -20,7 +20,7 @@ enum class Movement { Unknown, TooFew, Steady, Drifting };
 struct InkTrend {
     Ink ink = Ink::Paper;
     Movement movement = Movement::Unknown;
-    std::string word;     ///< "Drifting", "Steady", "Too few jobs", "No data".
+    std::string word; ///< "Drifting", "Steady", "Too few jobs", "No data".
     /// What the moving average has done: "moving average 1.84 from the mean of the first jobs:
     /// lighter (L* +1.20)".
     std::string sentence;

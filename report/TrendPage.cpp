@@ -25,8 +25,9 @@ const char* keyOf(Movement movement) {
 }
 
 std::string labText(const colour::Lab& lab) {
-    if (!std::isfinite(lab.L))
+    if (!std::isfinite(lab.L)) {
         return {};
+    }
     const auto tenths = [](double value) {
         return fixedText(std::round(value * 10) / 10 + 0.0, 1); // No "-0.0".
     };
@@ -44,8 +45,9 @@ class Part {
     }
     void list(const char* name, const std::vector<std::string>& parts) {
         m_text += std::string(",\"") + name + "\":[";
-        for (std::size_t i = 0; i < parts.size(); ++i)
+        for (std::size_t i = 0; i < parts.size(); ++i) {
             m_text += (i == 0 ? "\n" : ",\n") + parts[i];
+        }
         m_text += ']';
     }
     std::string text() && { return std::move(m_text) + "}"; }
@@ -82,11 +84,13 @@ std::string inkData(const InkTrend& ink) {
 
 std::string criterionData(const CriterionTrend& criterion) {
     std::string outcomes;
-    for (const Outcome outcome : criterion.outcomes)
+    for (const Outcome outcome : criterion.outcomes) {
         outcomes += keyOf(outcome)[0]; // p, f, i or u
+    }
     PageJson tolerances = PageJson::array();
-    for (const auto& [job, tolerance] : criterion.tolerances)
+    for (const auto& [job, tolerance] : criterion.tolerances) {
         tolerances.push_back({job, std::isfinite(tolerance) ? PageJson(tolerance) : PageJson()});
+    }
     Part part({{"title", criterion.title},
                {"unit", criterion.unit},
                {"used", criterion.used},
@@ -121,16 +125,19 @@ std::string seriesData(const TrendModel& model, const Series& series) {
                {"incomplete", series.incomplete},
                {"beginning", series.beginning}});
     std::vector<std::string> parts;
-    for (const InkTrend& ink : series.inks)
+    for (const InkTrend& ink : series.inks) {
         parts.push_back(inkData(ink));
+    }
     part.list("inks", parts);
     parts.clear();
-    for (const CriterionTrend& criterion : series.criteria)
+    for (const CriterionTrend& criterion : series.criteria) {
         parts.push_back(criterionData(criterion));
+    }
     part.list("criteria", parts);
     parts.clear();
-    for (const std::size_t index : series.samples)
+    for (const std::size_t index : series.samples) {
         parts.push_back(jobData(model.samples[index]));
+    }
     part.list("jobs", parts);
     return std::move(part).text();
 }
@@ -140,8 +147,9 @@ std::string seriesData(const TrendModel& model, const Series& series) {
 std::string trendPageOf(const TrendModel& model) {
     Part data({{"subtitle", model.subtitle}, {"notes", model.notes}});
     std::vector<std::string> parts;
-    for (const Series& series : model.series)
+    for (const Series& series : model.series) {
         parts.push_back(seriesData(model, series));
+    }
     data.list("series", parts);
     std::string page(trendTemplate[0]);
     page += std::move(data).text();

@@ -17,8 +17,9 @@ namespace ticket {
 
 /// Types that travel by their address.
 template<class T>
-concept Number = std::same_as<T, int> || std::same_as<T, unsigned int> ||
-    std::same_as<T, long long> || std::same_as<T, unsigned long long> || std::same_as<T, double>;
+concept Number =
+    std::same_as<T, int> || std::same_as<T, unsigned int> || std::same_as<T, long long> ||
+    std::same_as<T, unsigned long long> || std::same_as<T, double>;
 
 /// Types that are pointers themselves.
 template<class T>

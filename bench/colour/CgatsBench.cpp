@@ -20,8 +20,9 @@ std::string makeText(std::size_t patches, bool withSpectra) {
     std::uniform_real_distribution<double> unit(0, 1);
     std::string text = "CGATS.17\nBEGIN_DATA_FORMAT\nSAMPLE_ID\tCMYK_C\tCMYK_M\tCMYK_Y\tCMYK_K\t"
                        "XYZ_X\tXYZ_Y\tXYZ_Z\tLAB_L\tLAB_A\tLAB_B";
-    for (int nm = 380; withSpectra && nm <= 730; nm += 10)
+    for (int nm = 380; withSpectra && nm <= 730; nm += 10) {
         text += "\tSPECTRAL_NM" + std::to_string(nm);
+    }
     text += "\nEND_DATA_FORMAT\nNUMBER_OF_SETS " + std::to_string(patches) + "\nBEGIN_DATA\n";
     const auto add = [&](const char* format, double value) {
         char number[32];
@@ -30,14 +31,18 @@ std::string makeText(std::size_t patches, bool withSpectra) {
     };
     for (std::size_t i = 0; i < patches; ++i) {
         text += std::to_string(i + 1);
-        for (int k = 0; k < 4; ++k)
+        for (int k = 0; k < 4; ++k) {
             add("\t%.0f", 100 * unit(engine));
-        for (int k = 0; k < 4; ++k)
+        }
+        for (int k = 0; k < 4; ++k) {
             add("\t%.2f", 100 * unit(engine));
-        for (int k = 0; k < 2; ++k)
+        }
+        for (int k = 0; k < 2; ++k) {
             add("\t%.2f", 120 * unit(engine) - 60);
-        for (int k = 0; withSpectra && k < 36; ++k)
+        }
+        for (int k = 0; withSpectra && k < 36; ++k) {
             add("\t%.4f", unit(engine));
+        }
         text += '\n';
     }
     return text + "END_DATA\n";
@@ -48,21 +53,24 @@ double splitAndConvert(const std::string& text) {
     double sum = 0;
     const char* at = text.c_str();
     while (*at != '\0') {
-        while (isBlank(*at))
+        while (isBlank(*at)) {
             ++at;
+        }
         char* end = nullptr;
         sum += std::strtod(at, &end);
         at = end;
-        while (*at != '\0' && !isBlank(*at))
+        while (*at != '\0' && !isBlank(*at)) {
             ++at;
+        }
     }
     return sum;
 }
 
 double read(const std::string& text, bool spectra) {
     DataSet set;
-    if (readCgats(text, {spectra}, set) != Failure::None)
+    if (readCgats(text, {spectra}, set) != Failure::None) {
         std::abort();
+    }
     return static_cast<double>(set.patchCount);
 }
 

@@ -54,8 +54,9 @@ int main() {
     for (const auto& c : cases) {
         const double ours = bench::fastest([&] {
             double sum = 0;
-            for (std::size_t i = 0; i < count; ++i)
+            for (std::size_t i = 0; i < count; ++i) {
                 sum += difference(c.formula, targets[i], measured[i]);
+            }
             return sum;
         });
         const double theirs = bench::fastest([&] {

@@ -15,10 +15,10 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 #include "SuiteRoot.h"
 #include "Timing.h"
+#include "base/WideBytes.h"
+#include "job/KZVerifyJobProcessor.h"
 #include "store/StoreEngine.h"
 #include "store/Users.h"
-#include "job/KZVerifyJobProcessor.h"
-#include "base/WideBytes.h"
 
 namespace {
 
@@ -163,8 +163,8 @@ int main() {
     engine->create(3, job);
 
     KZVerifyJobProcessor processor;
-    processor.m_connector = new CKZConnector(base::wideFromBytes(address), L"bench", L"bench",
-                                             0x5071103, false, false);
+    processor.m_connector =
+        new CKZConnector(base::wideFromBytes(address), L"bench", L"bench", 0x5071103, false, false);
     check(processor.m_connector->IsLoggedIn(), "the login");
     ComGUIManager& manager = *processor.m_connector->getComGUIMngrInstance();
 

@@ -29,8 +29,9 @@ std::size_t worksLeft = 0;
 sigset_t cancellingSet() {
     sigset_t set;
     sigemptyset(&set);
-    for (const int number : cancelling)
+    for (const int number : cancelling) {
         sigaddset(&set, number);
+    }
     return set;
 }
 
@@ -40,13 +41,15 @@ void waitAtMost(std::chrono::nanoseconds time) {
     const timespec limit{static_cast<time_t>(whole.count()),
                          static_cast<long>((time - whole).count())};
     const sigset_t set = cancellingSet();
-    if (sigtimedwait(&set, nullptr, &limit) > 0)
+    if (sigtimedwait(&set, nullptr, &limit) > 0) {
         throw Failure(Status::Cancelled, "cancelled");
+    }
 }
 
 base::Descriptor checked(int number) {
-    if (number < 0)
+    if (number < 0) {
         throw std::system_error(errno, std::generic_category());
+    }
     return base::Descriptor(number);
 }
 
@@ -56,15 +59,18 @@ bool awaitEvent(const base::Descriptor& event, Clock::time_point end) {
     const base::Descriptor signals = checked(signalfd(-1, &set, SFD_CLOEXEC | SFD_NONBLOCK));
     while (true) {
         const auto left = end - Clock::now();
-        if (left <= Clock::duration::zero())
+        if (left <= Clock::duration::zero()) {
             return false;
+        }
         pollfd wait[] = {{event.get(), POLLIN, 0}, {signals.get(), POLLIN, 0}};
         const auto limit = std::chrono::ceil<std::chrono::milliseconds>(
             std::min<Clock::duration>(left, longestWait));
-        if (poll(wait, 2, static_cast<int>(limit.count())) < 0 && errno != EINTR)
+        if (poll(wait, 2, static_cast<int>(limit.count())) < 0 && errno != EINTR) {
             throw std::system_error(errno, std::generic_category());
-        if ((wait[0].revents & POLLIN) != 0)
+        }
+        if ((wait[0].revents & POLLIN) != 0) {
             return true;
+        }
         checkCancelled();
     }
 }
@@ -83,8 +89,9 @@ void checkCancelled() {
 void pauseFor(std::chrono::milliseconds time) {
     const auto end = Clock::now() + time;
     // Another signal, such as that of a changed window, ends a wait early.
-    for (auto left = end - Clock::now(); left.count() > 0; left = end - Clock::now())
+    for (auto left = end - Clock::now(); left.count() > 0; left = end - Clock::now()) {
         waitAtMost(left);
+    }
     checkCancelled();
 }
 
@@ -98,8 +105,9 @@ bool awaitWork(std::function<void()> work, Clock::time_point end) {
         eventfd_write(done->get(), 1);
     }).detach();
     ++worksLeft; // Also if the wait ends by an exception.
-    if (!awaitEvent(*done, end))
+    if (!awaitEvent(*done, end)) {
         return false;
+    }
     --worksLeft;
     return true;
 }

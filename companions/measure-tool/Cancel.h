@@ -40,8 +40,9 @@ std::optional<std::invoke_result_t<Work>> resultBefore(Clock::time_point end, Wo
     const auto task =
         std::make_shared<std::packaged_task<std::invoke_result_t<Work>()>>(std::move(work));
     auto result = task->get_future();
-    if (!awaitWork([task] { (*task)(); }, end))
+    if (!awaitWork([task] { (*task)(); }, end)) {
         return std::nullopt;
+    }
     return result.get();
 }
 

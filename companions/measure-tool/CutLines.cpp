@@ -64,19 +64,22 @@ Cells cellsByTabs(std::string_view line) {
 
 /// The end of the cell that starts at `at`. A quote closes only if a blank or the end follows.
 std::size_t endOfWord(std::string_view line, std::size_t at) {
-    if (line[at] != '"')
+    if (line[at] != '"') {
         return std::min(line.find_first_of(blanks, at), line.size());
+    }
     std::size_t end = line.find('"', at + 1);
-    while (end != line.npos && end + 1 < line.size() && blanks.find(line[end + 1]) == blanks.npos)
+    while (end != line.npos && end + 1 < line.size() && blanks.find(line[end + 1]) == blanks.npos) {
         end = line.find('"', end + 1);
+    }
     return end == line.npos ? line.size() : end + 1;
 }
 
 Cells cellsByBlanks(std::string_view line) {
     Cells cells;
     for (std::size_t at = 0; (at = line.find_first_not_of(blanks, at)) != line.npos;) {
-        if (line[at] == '#')
+        if (line[at] == '#') {
             break;
+        }
         const std::size_t end = endOfWord(line, at);
         cells.push_back(line.substr(at, end - at));
         at = end;
@@ -90,16 +93,19 @@ Cells cellsOf(std::string_view line, Separator separator) {
 
 /// Told by the names, and by the rows if the names leave a choice.
 Separator separatorOf(const TableLines& table) {
-    if (table.names.find_first_of("\",;") != table.names.npos)
+    if (table.names.find_first_of("\",;") != table.names.npos) {
         return Separator::Unknown;
-    if (table.names.find('\t') == table.names.npos)
+    }
+    if (table.names.find('\t') == table.names.npos) {
         return Separator::Blanks;
+    }
     const Cells names = cellsByTabs(table.names);
     const bool blankInName = std::any_of(names.begin(), names.end(), [](std::string_view name) {
         return name.empty() || name.find(' ') != name.npos;
     });
-    if (blankInName)
+    if (blankInName) {
         return Separator::Unknown;
+    }
     const bool tabs = std::all_of(table.rows.begin(), table.rows.end(), [](const auto& row) {
         return !isRow(row) || row.find('\t') != row.npos;
     });
@@ -137,9 +143,10 @@ void checkCutNames(std::vector<std::string>& names) {
             std::any_of(std::begin(continued), std::end(continued),
                         [&](const std::string& start) { return start.starts_with(damaged); });
     }
-    if (!references)
+    if (!references) {
         refuse("the definition's list of columns has lost its end: in the strip it has at most "
                "511 bytes, and names outside ASCII take more of them");
+    }
     names[whole] = "-";
 }
 
@@ -157,10 +164,12 @@ Kept keptOf(const std::vector<std::string>& names) {
     for (std::size_t i = 0; i < names.size(); ++i) {
         const Column& column = layout.columns[i];
         const bool device = column.kind == Column::Number && layout.device.contains(column.slot);
-        if (device || column.kind == Column::Id)
+        if (device || column.kind == Column::Id) {
             kept.needed = i + 1;
-        if (device || column.kind == Column::Id || column.kind == Column::Name)
+        }
+        if (device || column.kind == Column::Id || column.kind == Column::Name) {
             kept.columns.push_back(i);
+        }
     }
     return kept;
 }
@@ -175,14 +184,16 @@ bool isNumber(std::string_view cell) {
 /// has its list of columns on two lines.
 void checkAllNamed(const TableLines& table, std::size_t nameCount, Separator separator) {
     const auto first = std::find_if(table.rows.begin(), table.rows.end(), isRow);
-    if (first == table.rows.end())
+    if (first == table.rows.end()) {
         return;
+    }
     const Cells cells = cellsOf(*first, separator);
     // Among blanks the surplus may be a name of several words, unless the strip counts its columns.
     const bool surplus = cells.size() > nameCount && isNumber(cells[nameCount]);
-    if (surplus && (separator == Separator::Tab || cells.size() == table.fieldCount))
+    if (surplus && (separator == Separator::Tab || cells.size() == table.fieldCount)) {
         refuse("the rows of the definition have more cells than columns are named: the strip's "
                "list of columns must be on one line");
+    }
 }
 
 /// Takes from a row what stays.
@@ -190,15 +201,18 @@ std::string keptCells(const std::string& line, std::size_t number, const Kept& k
                       std::size_t nameCount, Separator separator) {
     const Cells cells = cellsOf(line, separator);
     const std::string row = "row " + std::to_string(number) + " of the definition ";
-    if (cells.size() < kept.needed)
+    if (cells.size() < kept.needed) {
         refuse(row + "has lost device values, or does not have all of them on one line");
-    if (separator == Separator::Blanks && cells.size() > nameCount)
+    }
+    if (separator == Separator::Blanks && cells.size() > nameCount) {
         refuse(row + "can't be split into cells: in the strip, names with blanks are quoted");
+    }
     if (kept.needed > 0 && mayBeCut(line)) {
         const std::string_view last = cells[kept.needed - 1];
-        if (last.data() + last.size() == line.data() + line.size())
+        if (last.data() + last.size() == line.data() + line.size()) {
             refuse(row + "may have lost the end of its device values, which a name outside ASCII "
                          "or 511 bytes before them cause: in the strip, names go after them");
+        }
     }
     std::string result;
     for (const std::size_t column : kept.columns) {
@@ -210,8 +224,9 @@ std::string keptCells(const std::string& line, std::size_t number, const Kept& k
 
 std::string joined(const std::vector<std::string>& names, const std::vector<std::size_t>& columns) {
     std::string line;
-    for (const std::size_t column : columns)
+    for (const std::size_t column : columns) {
         line += (line.empty() ? "" : "\t") + names[column];
+    }
     return line;
 }
 
@@ -239,28 +254,34 @@ void dropCutCells(const TableLines& table) {
         table.isWritten && std::any_of(table.rows.begin(), table.rows.end(),
                                        [](const auto& row) { return isRow(row) && mayBeCut(row); });
     const bool anyCut = namesCut || rowsCut;
-    if (anyCut && separator == Separator::Unknown)
+    if (anyCut && separator == Separator::Unknown) {
         refuse("the definition has lines that may have lost their end, and its columns can't be "
                "told apart: in the strip, tabs separate them");
-    if (names.empty() || separator == Separator::Unknown)
+    }
+    if (names.empty() || separator == Separator::Unknown) {
         return;
-    if (namesCut)
+    }
+    if (namesCut) {
         checkCutNames(names);
-    else
+    } else {
         checkAllNamed(table, names.size(), separator);
+    }
     const Kept kept = keptOf(names);
     std::size_t number = 0;
     for (std::string& row : table.rows) {
-        if (!anyCut || !isRow(row))
+        if (!anyCut || !isRow(row)) {
             continue;
+        }
         std::string cells = keptCells(row, ++number, kept, names.size(), separator);
         // Without device values the references stay: the reader wants one or the other.
-        if (kept.hasDevice)
+        if (kept.hasDevice) {
             row = std::move(cells);
+        }
     }
-    if (kept.hasDevice)
+    if (kept.hasDevice) {
         table.names =
             anyCut ? joined(names, kept.columns) : withoutReferences(names, kept, separator);
+    }
 }
 
 } // namespace measuring

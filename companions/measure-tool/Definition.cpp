@@ -62,8 +62,9 @@ Lines linesOf(std::string_view text) {
     Lines lines;
     while (!text.empty()) {
         const std::size_t end = std::min(text.find_first_of("\r\n"), text.size());
-        if (end > 0)
+        if (end > 0) {
             lines.emplace_back(text.substr(0, end));
+        }
         text.remove_prefix(std::min(end + 1, text.size()));
     }
     return lines;
@@ -76,8 +77,9 @@ std::string firstWordOf(const std::string& line) {
 
 /// The first line from `first` on that begins with this word, else `last`.
 std::size_t findLine(const Lines& lines, const char* word, std::size_t first, std::size_t last) {
-    while (first < last && firstWordOf(lines[first]) != word)
+    while (first < last && firstWordOf(lines[first]) != word) {
         ++first;
+    }
     return first;
 }
 
@@ -95,12 +97,14 @@ Lines takeFillings(Lines& lines, std::size_t firstRow, std::size_t lastRow) {
     std::size_t first = lastRow;
     for (; first > firstRow; --first) {
         std::string number = numberOfFilling(lines[first - 1]);
-        if (number.empty())
+        if (number.empty()) {
             break;
+        }
         numbers.push_back(std::move(number));
     }
-    if (first == firstRow)
+    if (first == firstRow) {
         return {};
+    }
     const auto begin = lines.begin();
     lines.erase(begin + static_cast<std::ptrdiff_t>(first),
                 begin + static_cast<std::ptrdiff_t>(lastRow));
@@ -129,8 +133,9 @@ Lines prepare(Lines& lines) {
     // several: its lines were never cut, and it stays as it is.
     const std::size_t names = format + 1;
     if (firstRow > lines.size() ||
-        findLine(lines, "END_DATA_FORMAT", format, firstRow) != names + 1)
+        findLine(lines, "END_DATA_FORMAT", format, firstRow) != names + 1) {
         return {};
+    }
     const std::size_t fieldCount = countIn(lines, "NUMBER_OF_FIELDS", firstRow);
     Lines numbers = takeFillings(lines, firstRow, lastRow);
     const auto rows = std::span(lines).subspan(firstRow, lastRow - firstRow - numbers.size());
@@ -143,10 +148,12 @@ Lines prepare(Lines& lines) {
 /// The last line stays without an end: by this the reader recognises a text that was cut off.
 std::string textOf(const Lines& lines, const std::string& original) {
     std::string text;
-    for (const std::string& line : lines)
+    for (const std::string& line : lines) {
         text += line + "\n";
-    if (!text.empty() && original.back() != '\n' && original.back() != '\r')
+    }
+    if (!text.empty() && original.back() != '\n' && original.back() != '\r') {
         text.pop_back();
+    }
     return text;
 }
 
@@ -157,19 +164,22 @@ void takeAmountsAsPercent(Lines lines, const std::string& original, colour::Data
     colour::DataSet stated;
     if (colour::readCgats(textOf(lines, original), {.spectra = false}, stated) !=
             colour::Failure::None ||
-        stated.device.size() != set.device.size())
+        stated.device.size() != set.device.size()) {
         return;
+    }
     // Fractions of 1 are left to the reader, which makes percent of them.
     const double largest = *std::max_element(stated.device.begin(), stated.device.end());
-    if (largest > 1)
+    if (largest > 1) {
         set.device = std::move(stated.device);
+    }
 }
 
 void checkAmounts(const colour::DataSet& set) {
     const auto wrong = std::find_if(set.device.begin(), set.device.end(),
                                     [](double value) { return value > largestAmount; });
-    if (wrong == set.device.end())
+    if (wrong == set.device.end()) {
         return;
+    }
     const auto index = static_cast<std::size_t>(wrong - set.device.begin());
     const std::size_t channels = set.channels.size();
     char amount[32];
@@ -184,10 +194,12 @@ void addPaper(colour::DataSet& chart, const Lines& numbers) {
     const double white = chart.deviceSpace == colour::DeviceSpace::Rgb ? 100 : 0;
     for (const std::string& number : numbers) {
         ++chart.patchCount;
-        if (!chart.ids.empty())
+        if (!chart.ids.empty()) {
             chart.ids.push_back(number);
-        if (!chart.names.empty())
+        }
+        if (!chart.names.empty()) {
             chart.names.emplace_back();
+        }
         chart.device.insert(chart.device.end(), chart.channels.size(), white);
     }
 }
@@ -215,8 +227,9 @@ Definition readDefinition(const std::string& path) {
     colour::DataSet set;
     expectUsable(colour::readCgats(textOf(lines, bytes), {.spectra = false}, set),
                  Status::BadDefinition, path);
-    if (set.hasDevice() && set.deviceSpace != colour::DeviceSpace::Rgb)
+    if (set.hasDevice() && set.deviceSpace != colour::DeviceSpace::Rgb) {
         takeAmountsAsPercent(lines, bytes, set);
+    }
     checkAmounts(set);
     Definition definition{colour::chartOf(std::move(set)), conditionIn(bytes)};
     addPaper(definition.chart, numbers);

@@ -36,8 +36,9 @@ struct State {
 
 State stateOf(const std::string& path) {
     struct stat status {};
-    if (stat(path.c_str(), &status) != 0)
+    if (stat(path.c_str(), &status) != 0) {
         return {};
+    }
     return {true,
             status.st_dev,
             status.st_ino,
@@ -51,8 +52,9 @@ void checkFolder(const std::string& path) {
     const std::string folder = parent.empty() ? "." : parent.string();
     struct stat status {};
     const bool found = stat(folder.c_str(), &status) == 0;
-    if (found && S_ISDIR(status.st_mode) && access(folder.c_str(), X_OK) == 0)
+    if (found && S_ISDIR(status.st_mode) && access(folder.c_str(), X_OK) == 0) {
         return;
+    }
     const char* const reason =
         found && !S_ISDIR(status.st_mode) ? std::strerror(ENOTDIR) : std::strerror(errno);
     throw Failure(Status::BadExport,
@@ -66,8 +68,9 @@ colour::DataSet load(const std::string& path, const std::string& condition) {
     colour::CgatsWants wants;
     wants.condition = condition;
     expectUsable(colour::loadColourFile(path, wants, file), Status::BadExport, path);
-    if (!file.set || !file.set->hasColour())
+    if (!file.set || !file.set->hasColour()) {
         throw Failure(Status::BadExport, path + " holds no measured colours");
+    }
     return std::move(*file.set);
 }
 
@@ -79,9 +82,10 @@ struct Accepted {
 /// Throws Failure (OtherPatches, OtherCondition) unless the export is what was asked for.
 Accepted accept(colour::DataSet set, const Settings& settings, const Definition& definition) {
     const std::string& stated = set.conditions.measurement;
-    if (!definition.condition.empty() && !stated.empty() && stated != definition.condition)
+    if (!definition.condition.empty() && !stated.empty() && stated != definition.condition) {
         throw Failure(Status::OtherCondition, settings.file + " was measured under " + stated +
                                                   ", and the job asks for " + definition.condition);
+    }
     try {
         std::vector<std::size_t> rows = matchPatches(definition.chart, set, settings.bareIds);
         return {std::move(set), std::move(rows)};
@@ -99,19 +103,23 @@ class Wait {
 
     Accepted run() {
         const std::optional<State> known = look();
-        if (!known)
+        if (!known) {
             giveUp();
+        }
         m_tried = m_last = *known;
         m_person.askForExport(m_settings.file, m_end);
         while (Clock::now() < m_end) {
             pauseFor(rest);
             m_person.showTime();
-            if (m_open && Clock::now() - m_failed >= slowWriter)
+            if (m_open && Clock::now() - m_failed >= slowWriter) {
                 report();
-            if (!isNew())
+            }
+            if (!isNew()) {
                 continue;
-            if (std::optional<Accepted> accepted = attempt())
+            }
+            if (std::optional<Accepted> accepted = attempt()) {
                 return std::move(*accepted);
+            }
         }
         giveUp();
     }
@@ -126,8 +134,9 @@ class Wait {
         const State now = look().value_or(State());
         const bool atRest = now == m_last;
         m_last = now;
-        if (!now.exists || !atRest || now == m_tried)
+        if (!now.exists || !atRest || now == m_tried) {
             return false;
+        }
         m_tried = now;
         return true;
     }
@@ -138,17 +147,20 @@ class Wait {
                 resultBefore(m_end, [path = m_settings.file, condition = m_definition.condition] {
                     return load(path, condition);
                 });
-            if (!set)
+            if (!set) {
                 return std::nullopt;
+            }
             return accept(std::move(*set), m_settings, m_definition);
         } catch (const Failure& failure) {
-            if (failure.status == Status::Cancelled || failure.status == Status::OutOfMemory)
+            if (failure.status == Status::Cancelled || failure.status == Status::OutOfMemory) {
                 throw;
+            }
             m_problem.emplace(failure);
             m_failed = Clock::now();
             m_open = true;
-            if (failure.status != Status::BadExport)
+            if (failure.status != Status::BadExport) {
                 report();
+            }
             return std::nullopt;
         }
     }
@@ -159,8 +171,9 @@ class Wait {
     }
 
     [[noreturn]] void giveUp() const {
-        if (!m_problem)
+        if (!m_problem) {
             throw Failure(Status::BadExport, m_settings.file + " was not exported in time");
+        }
         throw Failure(m_problem->status,
                       std::string(m_problem->what()) + "; no other export came in time");
     }
@@ -193,9 +206,10 @@ ExportedMeasurement::ExportedMeasurement(const Settings& settings, const Definit
                                      settings, definition);
     m_set = std::move(accepted.set);
     m_rows = std::move(accepted.rows);
-    if (!definition.condition.empty() && m_set.conditions.measurement.empty())
+    if (!definition.condition.empty() && m_set.conditions.measurement.empty()) {
         person.remark(path + " does not state its measurement condition, and the job asks for " +
                       definition.condition);
+    }
 }
 
 void ExportedMeasurement::describe(colour::DataSet& measurement) const {

@@ -35,10 +35,12 @@ const char* wordsFor(colour::Failure failure) {
 }
 
 void expectUsable(colour::Failure failure, Status status, const std::string& path) {
-    if (failure == colour::Failure::None)
+    if (failure == colour::Failure::None) {
         return;
-    if (failure == colour::Failure::OutOfMemory)
+    }
+    if (failure == colour::Failure::OutOfMemory) {
         status = Status::OutOfMemory;
+    }
     throw Failure(status, path + " " + wordsFor(failure));
 }
 

@@ -31,8 +31,9 @@ void meet(Mishap mishap, std::size_t patch) {
         throw Failure(Status::Cancelled, "cancelled at patch " + std::to_string(patch + 1) +
                                              ", as the settings want it");
     case Mishap::Hang:
-        while (true)
+        while (true) {
             pauseFor(std::chrono::hours(1));
+        }
     case Mishap::Crash:
         crash();
     }
@@ -56,8 +57,9 @@ colour::DataSet measureAll(const colour::DataSet& chart, Instrument& instrument,
     instrument.describe(measurement);
     progress.begin(chart);
     for (std::size_t patch = 0; patch < count; ++patch) {
-        if (patch == mishapAt)
+        if (patch == mishapAt) {
             meet(settings.mishap, patch);
+        }
         pauseFor(settings.delay);
         append(instrument.measure(patch), measurement);
         progress.show(measurement, patch + 1, count);

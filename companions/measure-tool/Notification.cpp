@@ -29,11 +29,12 @@ using Message = std::unique_ptr<sd_bus_message, decltype(&sd_bus_message_unref)>
 
 Bus openBus() {
     sd_bus* bus = nullptr;
-    if (sd_bus_open_user(&bus) < 0)
+    if (sd_bus_open_user(&bus) < 0) {
         bus = nullptr;
-    else
+    } else {
         sd_bus_set_method_call_timeout(
             bus, static_cast<std::uint64_t>(std::chrono::microseconds(patience).count()));
+    }
     return {bus, &sd_bus_flush_close_unref};
 }
 
@@ -41,9 +42,10 @@ Bus openBus() {
 template<class... Arguments>
 Message call(const Bus& bus, const char* method, const char* types, Arguments... arguments) {
     sd_bus_message* reply = nullptr;
-    if (bus)
+    if (bus) {
         sd_bus_call_method(bus.get(), service, object, service, method, nullptr, &reply, types,
                            arguments...);
+    }
     return {reply, &sd_bus_message_unref};
 }
 
@@ -51,8 +53,9 @@ Message call(const Bus& bus, const char* method, const char* types, Arguments...
 bool readsMarkUp(const Bus& bus) {
     const Message reply = call(bus, "GetCapabilities", "");
     char** names = nullptr;
-    if (!reply || sd_bus_message_read_strv(reply.get(), &names) < 0)
+    if (!reply || sd_bus_message_read_strv(reply.get(), &names) < 0) {
         return false;
+    }
     bool found = false;
     for (char** name = names; name != nullptr && *name != nullptr; ++name) {
         found = found || std::string_view(*name) == "body-markup";
@@ -64,8 +67,9 @@ bool readsMarkUp(const Bus& bus) {
 
 std::string escaped(const std::string& text) {
     std::string result;
-    for (const char c : text)
+    for (const char c : text) {
         result += c == '&' ? "&amp;" : c == '<' ? "&lt;" : c == '>' ? "&gt;" : std::string(1, c);
+    }
     return result;
 }
 
@@ -77,16 +81,18 @@ std::uint32_t show(std::uint32_t replaced, const std::string& title, const std::
     const Message reply = call(bus, "Notify", "susssasa{sv}i", "NerovaMeasure", replaced, "",
                                title.c_str(), body.c_str(), 0, 1, "urgency", "y", critical, 0);
     std::uint32_t number = 0;
-    if (reply)
+    if (reply) {
         sd_bus_message_read(reply.get(), "u", &number);
+    }
     return number;
 }
 
 } // namespace
 
 Notification::~Notification() {
-    if (m_number == 0 || m_failed)
+    if (m_number == 0 || m_failed) {
         return;
+    }
     try {
         resultBefore(Clock::now() + patience, [number = m_number] {
             return call(openBus(), "CloseNotification", "u", number) != nullptr;
@@ -98,11 +104,13 @@ Notification::~Notification() {
 
 void Notification::show(const std::string& title, std::initializer_list<std::string> lines) {
     const char* const address = std::getenv("DBUS_SESSION_BUS_ADDRESS");
-    if (m_failed || address == nullptr || *address == '\0')
+    if (m_failed || address == nullptr || *address == '\0') {
         return;
+    }
     std::string text;
-    for (const std::string& line : lines)
+    for (const std::string& line : lines) {
         text += (text.empty() ? "" : "\n") + printable(line);
+    }
     // The bus itself may be slow to answer, which the limit of a call does not cover.
     const auto number = resultBefore(Clock::now() + patience,
                                      [replaced = m_number, title = printable(title), text] {

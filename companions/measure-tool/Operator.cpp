@@ -30,8 +30,9 @@ void Operator::askForExport(const std::string& path, Clock::time_point end) {
 
 void Operator::showTime() {
     const std::string time = timeLeft();
-    if (time != m_shown)
+    if (time != m_shown) {
         m_progress.line(time);
+    }
     m_shown = time;
 }
 

@@ -41,12 +41,15 @@ std::map<std::string, std::string> pairsOf(const std::string& path) {
     for (std::string_view rest = bytes; !rest.empty();) {
         const std::string name = takeLine(rest);
         // A value with a line break in it shifts all that follows.
-        if (name.size() < 2 || name.front() != '-')
+        if (name.size() < 2 || name.front() != '-') {
             refuse("\"" + name + "\" for an option's name");
-        if (rest.empty())
+        }
+        if (rest.empty()) {
             refuse("no value for " + name);
-        if (!pairs.emplace(name, takeLine(rest)).second)
+        }
+        if (!pairs.emplace(name, takeLine(rest)).second) {
             refuse(name + " twice");
+        }
     }
     return pairs;
 }
@@ -61,12 +64,14 @@ Options readOptions(const std::string& path) {
     };
     const auto needed = [&](const char* name) {
         std::string value = valueOf(name);
-        if (value.empty())
+        if (value.empty()) {
             throw Failure(Status::BadOptions, path + " has no " + name);
+        }
         return value;
     };
-    if (needed("-m") != "measure")
+    if (needed("-m") != "measure") {
         throw Failure(Status::BadOptions, path + " asks for something else than to measure");
+    }
     return {needed("-patch"), needed("-o"), valueOf("-patchname"), valueOf("-i")};
 }
 

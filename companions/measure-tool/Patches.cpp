@@ -35,15 +35,17 @@ constexpr std::size_t mostCompared = 2000;
 template<class Key>
 Rows pairByKeys(const std::vector<Key>& chart, const std::vector<Key>& measured) {
     std::map<Key, Rows> rowsOf;
-    for (std::size_t row = measured.size(); row-- > 0;)
+    for (std::size_t row = measured.size(); row-- > 0;) {
         rowsOf[measured[row]].push_back(row); // the first is at the back
+    }
     Rows rows;
     for (const Key& key : chart) {
         const auto found = rowsOf.find(key);
         const bool missing = found == rowsOf.end() || found->second.empty();
         rows.push_back(missing ? none : found->second.back());
-        if (!missing)
+        if (!missing) {
             found->second.pop_back();
+        }
     }
     return rows;
 }
@@ -59,13 +61,17 @@ std::size_t countOfPairs(const Rows& rows) {
 /// Rows from 0 to `count` that belong to no patch.
 Rows unpaired(const Rows& rows, std::size_t count) {
     std::vector<bool> paired(count);
-    for (const std::size_t row : rows)
-        if (row != none)
+    for (const std::size_t row : rows) {
+        if (row != none) {
             paired[row] = true;
+        }
+    }
     Rows left;
-    for (std::size_t row = 0; row < count; ++row)
-        if (!paired[row])
+    for (std::size_t row = 0; row < count; ++row) {
+        if (!paired[row]) {
             left.push_back(row);
+        }
+    }
     return left;
 }
 
@@ -86,36 +92,43 @@ std::size_t channelsOf(const DataSet& chart, const DataSet& measured) {
 }
 
 bool alike(const DataSet& chart, std::size_t patch, const DataSet& measured, std::size_t row) {
-    for (std::size_t channel = 0; channel < channelsOf(chart, measured); ++channel)
+    for (std::size_t channel = 0; channel < channelsOf(chart, measured); ++channel) {
         if (std::abs(deviceValue(chart, patch, channel) - deviceValue(measured, row, channel)) >
-            rounding)
+            rounding) {
             return false;
+        }
+    }
     return true;
 }
 
 /// Device values in hundredths of a percent, as sets of the same origin state them.
 std::vector<std::vector<long>> deviceKeys(const DataSet& set, std::size_t channels) {
     std::vector<std::vector<long>> keys(set.patchCount, std::vector<long>(channels));
-    for (std::size_t patch = 0; patch < set.patchCount; ++patch)
-        for (std::size_t channel = 0; channel < channels; ++channel)
+    for (std::size_t patch = 0; patch < set.patchCount; ++patch) {
+        for (std::size_t channel = 0; channel < channels; ++channel) {
             keys[patch][channel] = std::lround(100 * deviceValue(set, patch, channel));
+        }
+    }
     return keys;
 }
 
 bool comparableDevices(const DataSet& chart, const DataSet& measured) {
-    if (!chart.hasDevice() || chart.deviceSpace != measured.deviceSpace)
+    if (!chart.hasDevice() || chart.deviceSpace != measured.deviceSpace) {
         return false;
+    }
     return chart.deviceSpace != colour::DeviceSpace::Other || chart.channels == measured.channels;
 }
 
 /// Gives patches without a row one that is alike.
 void pairAlike(const DataSet& chart, const DataSet& measured, Rows& rows) {
     Rows left = unpaired(rows, measured.patchCount);
-    if (left.size() > mostCompared)
+    if (left.size() > mostCompared) {
         return;
+    }
     for (std::size_t patch = 0; patch < rows.size(); ++patch) {
-        if (rows[patch] != none)
+        if (rows[patch] != none) {
             continue;
+        }
         const auto row = std::find_if(left.begin(), left.end(), [&](std::size_t candidate) {
             return alike(chart, patch, measured, candidate);
         });
@@ -137,13 +150,15 @@ void pairAlike(const DataSet& chart, const DataSet& measured, Rows& rows) {
     }
     pairAlike(chart, measured, rows);
     const std::size_t pairs = countOfPairs(rows);
-    if (pairs == rows.size())
+    if (pairs == rows.size()) {
         refuse("the patches are in another order and their device values are rounded: they must "
                "be in the strip's order, or not rounded");
-    if (inOrder > 0 && inOrder >= pairs)
+    }
+    if (inOrder > 0 && inOrder >= pairs) {
         refuse("patch " + nameOf(chart, differing) + " should be " + deviceText(chart, differing) +
                ", and row " + std::to_string(differing + 1) + " is " +
                deviceText(measured, differing));
+    }
     const std::size_t missing = firstWithout(rows);
     const std::size_t surplus = unpaired(rows, measured.patchCount).front();
     refuse("there is no patch " + nameOf(chart, missing) + ", which is " +
@@ -155,12 +170,14 @@ Rows matchDevices(const DataSet& chart, const DataSet& measured) {
     Rows rows(chart.patchCount);
     std::iota(rows.begin(), rows.end(), std::size_t{0});
     if (std::all_of(rows.begin(), rows.end(),
-                    [&](std::size_t patch) { return alike(chart, patch, measured, patch); }))
+                    [&](std::size_t patch) { return alike(chart, patch, measured, patch); })) {
         return rows;
+    }
     const std::size_t channels = channelsOf(chart, measured);
     rows = pairByKeys(deviceKeys(chart, channels), deviceKeys(measured, channels));
-    if (firstWithout(rows) < rows.size())
+    if (firstWithout(rows) < rows.size()) {
         refuseDevices(chart, measured, std::move(rows));
+    }
     return rows;
 }
 
@@ -168,9 +185,11 @@ Rows matchDevices(const DataSet& chart, const DataSet& measured) {
 
 /// "0012" becomes "12"; other labels stay.
 Labels withoutZeros(Labels labels) {
-    for (std::string& label : labels)
-        if (label.find_first_not_of("0123456789") == label.npos)
+    for (std::string& label : labels) {
+        if (label.find_first_not_of("0123456789") == label.npos) {
             label.erase(0, std::min(label.find_first_not_of('0'), label.size() - 1));
+        }
+    }
     return labels;
 }
 
@@ -178,8 +197,9 @@ Labels withoutZeros(Labels labels) {
 bool areCounted(const Labels& labels) {
     Labels present = withoutZeros(labels);
     Labels counted;
-    for (std::size_t number = 1; number <= labels.size(); ++number)
+    for (std::size_t number = 1; number <= labels.size(); ++number) {
         counted.push_back(std::to_string(number));
+    }
     std::sort(present.begin(), present.end());
     std::sort(counted.begin(), counted.end());
     return present == counted;
@@ -187,8 +207,9 @@ bool areCounted(const Labels& labels) {
 
 Rows pairLabels(const Labels& wanted, const Labels& present) {
     Rows rows = pairByKeys(wanted, present);
-    if (firstWithout(rows) < rows.size())
+    if (firstWithout(rows) < rows.size()) {
         rows = pairByKeys(withoutZeros(wanted), withoutZeros(present));
+    }
     return rows;
 }
 
@@ -202,35 +223,41 @@ Rows matchLabels(const DataSet& chart, const DataSet& measured, bool bareIds) {
     const Labels* bestLabels = nullptr;
     bool onlyCounted = false;
     for (const auto& [wanted, present] : ways) {
-        if (wanted->empty() || present->empty())
+        if (wanted->empty() || present->empty()) {
             continue;
+        }
         Rows rows = pairLabels(*wanted, *present);
         if (firstWithout(rows) == rows.size()) {
-            if (bareIds || !areCounted(*wanted))
+            if (bareIds || !areCounted(*wanted)) {
                 return rows;
+            }
             onlyCounted = true;
         } else if (bestLabels == nullptr || countOfPairs(rows) > countOfPairs(best)) {
             best = std::move(rows);
             bestLabels = wanted;
         }
     }
-    if (onlyCounted)
+    if (onlyCounted) {
         refuse("only the ids 1 to " + std::to_string(chart.patchCount) +
                " identify the patches, and every strip of as many patches has these; the setting "
                "match = ids accepts them");
-    if (bestLabels == nullptr)
+    }
+    if (bestLabels == nullptr) {
         refuse("neither device values nor ids tell which patches were measured");
+    }
     refuse("there is no patch " + (*bestLabels)[firstWithout(best)]);
 }
 
 } // namespace
 
 std::vector<std::size_t> matchPatches(const DataSet& chart, const DataSet& measured, bool bareIds) {
-    if (chart.patchCount != measured.patchCount)
+    if (chart.patchCount != measured.patchCount) {
         refuse("there are " + std::to_string(measured.patchCount) + " patches where " +
                std::to_string(chart.patchCount) + " were asked for");
-    if (chart.hasDevice() && measured.hasDevice() && !comparableDevices(chart, measured))
+    }
+    if (chart.hasDevice() && measured.hasDevice() && !comparableDevices(chart, measured)) {
         refuse("the device values are of other colorants");
+    }
     return chart.hasDevice() && measured.hasDevice() ? matchDevices(chart, measured)
                                                      : matchLabels(chart, measured, bareIds);
 }

@@ -14,14 +14,17 @@ constexpr const char* startOfCleanLine = "\r\x1b[K";
 } // namespace
 
 Progress::Progress() {
-    for (std::FILE* stream : {stderr, stdout})
-        if (m_terminal == nullptr && isatty(fileno(stream)) != 0)
+    for (std::FILE* stream : {stderr, stdout}) {
+        if (m_terminal == nullptr && isatty(fileno(stream)) != 0) {
             m_terminal = stream;
+        }
+    }
 }
 
 Progress::~Progress() {
-    if (m_open)
+    if (m_open) {
         std::fputc('\n', m_terminal);
+    }
 }
 
 void Progress::begin(const colour::DataSet& chart) {
@@ -32,8 +35,9 @@ void Progress::begin(const colour::DataSet& chart) {
 
 void Progress::show(const colour::DataSet& measurement, std::size_t done, std::size_t total) {
     const auto now = std::chrono::steady_clock::now();
-    if (m_terminal == nullptr || (now < m_next && done < total))
+    if (m_terminal == nullptr || (now < m_next && done < total)) {
         return;
+    }
     m_next = now + betweenLooks;
     const std::size_t patch = done - 1;
     const colour::Lab& lab = measurement.lab[patch];
@@ -44,16 +48,18 @@ void Progress::show(const colour::DataSet& measurement, std::size_t done, std::s
 }
 
 void Progress::say(const std::string& sentence) {
-    if (m_terminal == nullptr)
+    if (m_terminal == nullptr) {
         return;
+    }
     std::fprintf(m_terminal, "%s%s\n", m_open ? startOfCleanLine : "", printable(sentence).c_str());
     std::fflush(m_terminal);
     m_open = false;
 }
 
 void Progress::line(const std::string& text) {
-    if (m_terminal == nullptr)
+    if (m_terminal == nullptr) {
         return;
+    }
     std::fprintf(m_terminal, "%s%s", startOfCleanLine, printable(text).c_str());
     std::fflush(m_terminal);
     m_open = true;

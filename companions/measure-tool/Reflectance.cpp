@@ -20,25 +20,31 @@ bool solveLinear(Matrix& matrix, Vector& right) {
     const std::size_t size = right.size();
     for (std::size_t column = 0; column < size; ++column) {
         std::size_t pivot = column;
-        for (std::size_t row = column + 1; row < size; ++row)
-            if (std::abs(matrix[row][column]) > std::abs(matrix[pivot][column]))
+        for (std::size_t row = column + 1; row < size; ++row) {
+            if (std::abs(matrix[row][column]) > std::abs(matrix[pivot][column])) {
                 pivot = row;
-        if (!(std::abs(matrix[pivot][column]) > 1e-300))
+            }
+        }
+        if (!(std::abs(matrix[pivot][column]) > 1e-300)) {
             return false;
+        }
         std::swap(matrix[pivot], matrix[column]);
         std::swap(right[pivot], right[column]);
         for (std::size_t row = column + 1; row < size; ++row) {
             const double factor = matrix[row][column] / matrix[column][column];
-            if (factor == 0)
+            if (factor == 0) {
                 continue;
-            for (std::size_t i = column; i < size; ++i)
+            }
+            for (std::size_t i = column; i < size; ++i) {
                 matrix[row][i] -= factor * matrix[column][i];
+            }
             right[row] -= factor * right[column];
         }
     }
     for (std::size_t row = size; row-- > 0;) {
-        for (std::size_t i = row + 1; i < size; ++i)
+        for (std::size_t i = row + 1; i < size; ++i) {
             right[row] -= matrix[row][i] * right[i];
+        }
         right[row] /= matrix[row][row];
     }
     return true;
@@ -66,38 +72,49 @@ ReflectanceMaker::ReflectanceMaker() {
 double ReflectanceMaker::residual(const std::array<double, 3>& target, double most,
                                   const Vector& at, Vector& value, Matrix* slope) const {
     value.fill(0);
-    if (slope != nullptr)
-        for (Vector& row : *slope)
+    if (slope != nullptr) {
+        for (Vector& row : *slope) {
             row.fill(0);
-    for (std::size_t k = 0; k < 3; ++k)
+        }
+    }
+    for (std::size_t k = 0; k < 3; ++k) {
         value[length + k] = -target[k];
+    }
     for (std::size_t i = 0; i < length; ++i) {
         const double tanh = std::tanh(at[i]);
         const double first = most * (1 - tanh * tanh) / 2; // derivatives of the reflectance
         const double second = -2 * tanh * first;
         double pull = 0;
-        for (std::size_t k = 0; k < 3; ++k)
+        for (std::size_t k = 0; k < 3; ++k) {
             pull += m_weights[i][k] * at[length + k];
+        }
         value[i] = first * pull;
-        for (const std::size_t other : {i - 1, i + 1})
-            if (other < length)
+        for (const std::size_t other : {i - 1, i + 1}) {
+            if (other < length) {
                 value[i] += at[i] - at[other];
-        for (std::size_t k = 0; k < 3; ++k)
+            }
+        }
+        for (std::size_t k = 0; k < 3; ++k) {
             value[length + k] += m_weights[i][k] * reflectanceOf(at[i], most);
-        if (slope == nullptr)
+        }
+        if (slope == nullptr) {
             continue;
+        }
         (*slope)[i][i] = second * pull;
-        for (const std::size_t other : {i - 1, i + 1})
+        for (const std::size_t other : {i - 1, i + 1}) {
             if (other < length) {
                 (*slope)[i][i] += 1;
                 (*slope)[i][other] = -1;
             }
-        for (std::size_t k = 0; k < 3; ++k)
+        }
+        for (std::size_t k = 0; k < 3; ++k) {
             (*slope)[i][length + k] = (*slope)[length + k][i] = first * m_weights[i][k];
+        }
     }
     double largest = 0;
-    for (const double part : value)
+    for (const double part : value) {
         largest = std::max(largest, std::abs(part));
+    }
     return largest;
 }
 
@@ -113,18 +130,22 @@ bool ReflectanceMaker::solve(const std::array<double, 3>& target, double most,
     Matrix slope;
     for (int step = 0; step < mostSteps; ++step) {
         const double error = residual(target, most, solution, value, &slope);
-        if (error < exactEnough)
+        if (error < exactEnough) {
             return true;
-        if (!std::isfinite(error) || !solveLinear(slope, value))
+        }
+        if (!std::isfinite(error) || !solveLinear(slope, value)) {
             return false;
+        }
         Vector next;
         Vector there;
         double part = 1;
         do {
-            if (part < shortestStep)
+            if (part < shortestStep) {
                 return false;
-            for (std::size_t i = 0; i < unknowns; ++i)
+            }
+            for (std::size_t i = 0; i < unknowns; ++i) {
                 next[i] = solution[i] - part * value[i];
+            }
             part /= 2;
         } while (!(residual(target, most, next, there, nullptr) < error));
         solution = next;
@@ -140,11 +161,13 @@ bool ReflectanceMaker::make(const colour::Xyz& xyz, std::vector<double>& reflect
     }
     Vector solution;
     for (const double most : {1.0, 1.5}) {
-        if (!solve(target, most, solution))
+        if (!solve(target, most, solution)) {
             continue;
+        }
         reflectance.resize(length);
-        for (std::size_t i = 0; i < length; ++i)
+        for (std::size_t i = 0; i < length; ++i) {
             reflectance[i] = std::round(reflectanceOf(solution[i], most) * 1e8) / 1e8;
+        }
         return true;
     }
     return false;

@@ -41,23 +41,27 @@ void RunLog::start(const std::string& output, const std::vector<std::string>& in
         return fs::path(file).lexically_normal() == fs::path(path).lexically_normal() ||
                fs::equivalent(file, path, ignored);
     };
-    if (isLog(output) || std::any_of(inputs.begin(), inputs.end(), isLog))
+    if (isLog(output) || std::any_of(inputs.begin(), inputs.end(), isLog)) {
         return;
+    }
     struct stat status {};
     const bool isThere = lstat(path.c_str(), &status) == 0;
-    if (isThere && (!S_ISREG(status.st_mode) || !holdsLog(path) || unlink(path.c_str()) != 0))
+    if (isThere && (!S_ISREG(status.st_mode) || !holdsLog(path) || unlink(path.c_str()) != 0)) {
         return;
+    }
     m_path = path;
 }
 
 void RunLog::add(std::string_view sentence) const {
-    if (m_path.empty())
+    if (m_path.empty()) {
         return;
+    }
     const base::Descriptor file(open(
         m_path.c_str(), O_WRONLY | O_CREAT | O_APPEND | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, 0666));
-    if (file.isOpen())
+    if (file.isOpen()) {
         base::writeAll(file, timeText(std::chrono::system_clock::now()) + " " +
                                  printable(sentence) + "\n");
+    }
 }
 
 } // namespace measuring

@@ -44,8 +44,9 @@ bool readNumber(std::string_view text, Number least, Number most, Number& number
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
     // In this order of comparisons not-a-number is refused too.
     if (error != std::errc() || end != text.data() + text.size() ||
-        !(value >= least && value <= most))
+        !(value >= least && value <= most)) {
         return false;
+    }
     number = value;
     return true;
 }
@@ -53,8 +54,9 @@ bool readNumber(std::string_view text, Number least, Number most, Number& number
 template<class Unit>
 bool readTime(std::string_view text, int most, Unit& time) {
     int count = 0;
-    if (!readNumber(text, 0, most, count))
+    if (!readNumber(text, 0, most, count)) {
         return false;
+    }
     time = Unit(count);
     return true;
 }
@@ -63,8 +65,9 @@ bool readLab(std::string_view text, colour::Lab& lab) {
     for (double* value : {&lab.L, &lab.a, &lab.b}) {
         text = trimmed(text);
         const std::string_view number = text.substr(0, text.find_first_of(" \t"));
-        if (!readNumber(number, -largestError, largestError, *value))
+        if (!readNumber(number, -largestError, largestError, *value)) {
             return false;
+        }
         text.remove_prefix(number.size());
     }
     return trimmed(text).empty();
@@ -73,11 +76,12 @@ bool readLab(std::string_view text, colour::Lab& lab) {
 template<class Value, std::size_t N>
 bool choose(std::string_view text, const std::pair<const char*, Value> (&choices)[N],
             Value& value) {
-    for (const auto& [word, chosen] : choices)
+    for (const auto& [word, chosen] : choices) {
         if (text == word) {
             value = chosen;
             return true;
         }
+    }
     return false;
 }
 
@@ -135,26 +139,32 @@ constexpr Entry entries[] = {
 };
 
 const Entry* entryOf(std::string_view name) {
-    for (const Entry& entry : entries)
-        if (name == entry.name)
+    for (const Entry& entry : entries) {
+        if (name == entry.name) {
             return &entry;
+        }
+    }
     return nullptr;
 }
 
 /// What is wrong with a line; empty if nothing is.
 std::string readLine(std::string_view line, Settings& settings, std::set<const Entry*>& seen) {
     line = trimmed(line);
-    if (line.empty() || line.front() == '#')
+    if (line.empty() || line.front() == '#') {
         return {};
+    }
     const std::size_t equals = line.find('=');
-    if (equals == line.npos)
+    if (equals == line.npos) {
         return "has no =";
+    }
     const std::string name(trimmed(line.substr(0, equals)));
     const Entry* const entry = entryOf(name);
-    if (entry == nullptr)
+    if (entry == nullptr) {
         return "names \"" + name + "\", which is no setting";
-    if (!seen.insert(entry).second)
+    }
+    if (!seen.insert(entry).second) {
         return "has " + name + " a second time";
+    }
     return entry->read(trimmed(line.substr(equals + 1)), settings)
                ? std::string()
                : "wants " + std::string(entry->expected) + " for " + name;
@@ -162,14 +172,16 @@ std::string readLine(std::string_view line, Settings& settings, std::set<const E
 
 void checkComplete(const Settings& settings, const std::string& path) {
     const char* missing = nullptr;
-    if (settings.instrument == Settings::Instrument::None)
+    if (settings.instrument == Settings::Instrument::None) {
         missing = "instrument";
-    else if (settings.instrument == Settings::Instrument::Virtual && settings.profile.empty())
+    } else if (settings.instrument == Settings::Instrument::Virtual && settings.profile.empty()) {
         missing = "profile";
-    else if (settings.instrument == Settings::Instrument::File && settings.file.empty())
+    } else if (settings.instrument == Settings::Instrument::File && settings.file.empty()) {
         missing = "file";
-    if (missing != nullptr)
+    }
+    if (missing != nullptr) {
         throw Failure(Status::BadSettings, path + " has no " + missing);
+    }
 }
 
 std::string valueOf(const char* variable) {
@@ -186,16 +198,18 @@ std::string configurationFolder() {
 } // namespace
 
 std::string settingsPath() {
-    if (std::string named = valueOf("TINTGATE_MEASURE"); !named.empty())
+    if (std::string named = valueOf("TINTGATE_MEASURE"); !named.empty()) {
         return named;
+    }
     const std::string places[] = {
         platform::underRoot("/Library/Preferences/NerovaMeasure.conf"),
         configurationFolder() + "/tintgate/measure.conf",
     };
     for (const std::string& place : places) {
         std::error_code ignored;
-        if (std::filesystem::exists(place, ignored))
+        if (std::filesystem::exists(place, ignored)) {
             return place;
+        }
     }
     throw Failure(Status::BadSettings,
                   "no instrument is chosen: there is no TINTGATE_MEASURE, no " + places[0] +
@@ -208,23 +222,28 @@ Settings readSettings(const std::string& path) {
     Settings settings;
     std::set<const Entry*> seen;
     std::string_view rest = bytes;
-    if (rest.starts_with(byteOrderMark))
+    if (rest.starts_with(byteOrderMark)) {
         rest.remove_prefix(byteOrderMark.size());
-    if (rest.find('\0') != rest.npos)
+    }
+    if (rest.find('\0') != rest.npos) {
         throw Failure(Status::BadSettings, path + " is not UTF-8 text");
+    }
     for (int number = 1; !rest.empty(); ++number) {
         const std::size_t end = rest.find('\n');
         if (const std::string problem = readLine(rest.substr(0, end), settings, seen);
-            !problem.empty())
+            !problem.empty()) {
             throw Failure(Status::BadSettings,
                           path + " line " + std::to_string(number) + " " + problem);
+        }
         rest.remove_prefix(end == rest.npos ? rest.size() : end + 1);
     }
     checkComplete(settings, path);
     const std::filesystem::path folder = std::filesystem::path(path).parent_path();
-    for (std::string* name : {&settings.profile, &settings.file})
-        if (!name->empty())
+    for (std::string* name : {&settings.profile, &settings.file}) {
+        if (!name->empty()) {
             *name = folder / *name; // an absolute path stays itself
+        }
+    }
     return settings;
 }
 

@@ -11,8 +11,9 @@ std::string printable(std::string_view text) {
     std::string result;
     while (!text.empty()) {
         const auto character = base::takeUtf8(text);
-        if (!character)
+        if (!character) {
             text.remove_prefix(1);
+        }
         const bool control =
             !character || *character < 0x20 || (*character >= 0x7F && *character < 0xA0);
         base::appendUtf8(result, control ? U'?' : *character);

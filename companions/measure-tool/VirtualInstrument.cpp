@@ -31,8 +31,9 @@ colour::Profile openProfile(const std::string& path) {
                      path);
         return loaded;
     });
-    if (!file.profile)
+    if (!file.profile) {
         throw Failure(Status::BadProfile, path + " is no ICC profile");
+    }
     return std::move(*file.profile);
 }
 
@@ -40,12 +41,14 @@ colour::Profile openProfile(const std::string& path) {
 void checkPrintable(const colour::DataSet& chart) {
     const std::size_t channels = chart.channels.size();
     bool printable = chart.hasCmyk() || chart.deviceSpace == colour::DeviceSpace::Rgb;
-    for (std::size_t i = 0; chart.hasCmyk() && i < chart.device.size(); ++i)
+    for (std::size_t i = 0; chart.hasCmyk() && i < chart.device.size(); ++i) {
         printable = printable && (i % channels < 4 || chart.device[i] == 0);
-    if (!printable)
+    }
+    if (!printable) {
         throw Failure(Status::NotMeasurable,
                       "the virtual instrument prints CMYK and RGB, and the definition has patches "
                       "of other colorants");
+    }
 }
 
 /// Uniform in 0 to 1, both excluded. The distributions of the standard library differ from one to
@@ -73,18 +76,20 @@ void VirtualInstrument::describe(colour::DataSet& measurement) const {
     measurement.instrumentation =
         m_name.empty() ? "Virtual instrument" : "Virtual instrument in place of " + m_name;
     measurement.conditions = {.illuminant = "D50", .observer = "2", .measurement = {}};
-    if (m_spectra)
+    if (m_spectra) {
         measurement.axis = ReflectanceMaker::axis;
+    }
 }
 
 /// Lab of a patch by the profile.
 colour::Lab VirtualInstrument::print(std::size_t patch) const {
     const double* const values = &m_chart.device[patch * m_chart.channels.size()];
     std::array<double, 4> inks{};
-    if (m_chart.hasCmyk())
+    if (m_chart.hasCmyk()) {
         std::copy(values, values + 4, inks.begin());
-    else // Each ink takes away what its colour lacks, and there is no black: white stays paper.
+    } else { // Each ink takes away what its colour lacks, and there is no black: white stays paper.
         std::transform(values, values + 3, inks.begin(), [](double value) { return 100 - value; });
+    }
     colour::Lab lab;
     expectUsable(m_profile.evaluate(inks.data(), 1, inks.size(), &lab), Status::BadProfile, m_path);
     return lab;
@@ -112,10 +117,11 @@ Reading VirtualInstrument::measure(std::size_t patch) {
     reading.lab = {sixDecimals(lab.L), sixDecimals(lab.a), sixDecimals(lab.b)};
     const colour::Xyz xyz = colour::xyzFromLab(reading.lab);
     reading.xyz = {sixDecimals(xyz.X), sixDecimals(xyz.Y), sixDecimals(xyz.Z)};
-    if (m_spectra && !m_reflectances.make(xyz, reading.spectrum))
+    if (m_spectra && !m_reflectances.make(xyz, reading.spectrum)) {
         throw Failure(Status::NotMeasurable, "no spectrum has the colour of patch " +
                                                  std::to_string(patch + 1) +
                                                  "; a smaller error or bias helps");
+    }
     return reading;
 }
 

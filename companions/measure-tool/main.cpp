@@ -74,8 +74,9 @@ int fail(Status status, const std::string& words, const RunLog& log) {
 bool isSameFile(const std::string& left, const std::string& right) {
     namespace fs = std::filesystem;
     std::error_code ignored;
-    if (fs::equivalent(left, right, ignored))
+    if (fs::equivalent(left, right, ignored)) {
         return true;
+    }
     std::error_code failed;
     const fs::path first = fs::weakly_canonical(left, failed);
     return !failed && first == fs::weakly_canonical(right, failed) && !failed;
@@ -84,22 +85,27 @@ bool isSameFile(const std::string& left, const std::string& right) {
 /// Finds out before the first patch what would stop the result at the last one, and protects the
 /// files that are read.
 void checkOutput(const std::string& output, const std::vector<std::string>& inputs) {
-    for (const std::string& input : inputs)
-        if (!input.empty() && isSameFile(input, output))
+    for (const std::string& input : inputs) {
+        if (!input.empty() && isSameFile(input, output)) {
             throw Failure(Status::BadOptions, "the measurement would replace " + input);
+        }
+    }
     struct stat status {};
-    if (lstat(output.c_str(), &status) == 0 && !S_ISREG(status.st_mode))
+    if (lstat(output.c_str(), &status) == 0 && !S_ISREG(status.st_mode)) {
         throw Failure(Status::NotWritten, output + " is no ordinary file");
+    }
     const std::filesystem::path parent = std::filesystem::path(output).parent_path();
     const std::string folder = parent.empty() ? "./" : parent.string();
-    if (access(folder.c_str(), W_OK | X_OK) != 0)
+    if (access(folder.c_str(), W_OK | X_OK) != 0) {
         throw Failure(Status::NotWritten, "nothing can be written in " + folder);
+    }
 }
 
 std::unique_ptr<Instrument> connect(const Settings& settings, const Options& options,
                                     const Definition& definition, Operator& person) {
-    if (settings.instrument == Settings::Instrument::Virtual)
+    if (settings.instrument == Settings::Instrument::Virtual) {
         return std::make_unique<VirtualInstrument>(settings, options.instrument, definition.chart);
+    }
     return std::make_unique<ExportedMeasurement>(settings, definition, person);
 }
 
@@ -127,23 +133,28 @@ void measure(const std::string& optionsFile, RunLog& log) {
         const auto instrument = connect(settings, options, definition, person);
         return measureAll(definition.chart, *instrument, settings, progress);
     }();
-    if (measurement.descriptor.empty())
+    if (measurement.descriptor.empty()) {
         measurement.descriptor = options.title;
-    if (measurement.created.empty())
+    }
+    if (measurement.created.empty()) {
         measurement.created = timeText(std::chrono::system_clock::now());
+    }
     checkCancelled();
     std::string problem;
-    if (!report::replacePage(options.output, colour::writeCgats(measurement), problem))
+    if (!report::replacePage(options.output, colour::writeCgats(measurement), problem)) {
         throw Failure(Status::NotWritten, "can't write " + options.output + ": " + problem);
+    }
 }
 
 int run(const std::vector<std::string_view>& words, RunLog& log) {
-    if (words.size() != 1)
+    if (words.size() != 1) {
         return fail(Status::BadCommand, "not understood; --help tells how it is called", log);
-    if (words[0] == "--help" || words[0] == "-h")
+    }
+    if (words[0] == "--help" || words[0] == "-h") {
         return end(std::fputs((std::string(help) + nerovaMeasureStatusHelp).c_str(), stdout) < 0
                        ? Status::NotWritten
                        : Status::Done);
+    }
     measure(std::string(words[0]), log);
     return end(Status::Done);
 }
@@ -167,8 +178,9 @@ int runAndReport(const std::vector<std::string_view>& words) {
 
 int main(int argumentCount, char** arguments) {
     const int status = runAndReport({arguments + (argumentCount > 0), arguments + argumentCount});
-    if (!hasLeftWork())
+    if (!hasLeftWork()) {
         return status;
+    }
     std::fflush(stdout);
     _exit(status);
 }

@@ -61,12 +61,13 @@ std::string presetsParagraph(int code) {
 std::string explanationOf(int code) {
     const auto found = std::find_if(std::begin(exitCodeTexts), std::end(exitCodeTexts),
                                     [&](const ExitCodeText& text) { return text.code == code; });
-    if (found == std::end(exitCodeTexts))
+    if (found == std::end(exitCodeTexts)) {
         throw Failure(Status::UnknownCode,
                       "Tintgate has no exit code " + std::to_string(code) +
                           (code > 128 && code < 160 ? "; a shell gives 128 and the number of the "
                                                       "signal that ended a program"
                                                     : ""));
+    }
     std::string text = paragraph(std::to_string(code), found->meaning + std::string(".")) +
                        paragraph("Cause", found->cause + std::string(".")) +
                        paragraph("Remedy", found->remedy + std::string("."));

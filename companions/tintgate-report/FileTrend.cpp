@@ -3,12 +3,12 @@
 
 #include <sys/stat.h>
 
-#include "jobkeys/Tickets.h"
-#include "report/Page.h"
-#include "report/PageFile.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/Trend.h"
+#include "jobkeys/Tickets.h"
+#include "report/Page.h"
+#include "report/PageFile.h"
 
 namespace reporting {
 namespace {
@@ -18,13 +18,18 @@ namespace fs = std::filesystem;
 /// When a result was made: by its job, else as its measurement says, else as its file.
 std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile) {
     byFile = false;
-    if (loaded.meta)
-        if (const auto time = timeOf(loaded.meta->created))
+    if (loaded.meta) {
+        if (const auto time = timeOf(loaded.meta->created)) {
             return *time;
-    for (const auto& [label, text] : loaded.result.measurement.statements)
-        if (label == "Created")
-            if (const auto time = timeOf(text))
+        }
+    }
+    for (const auto& [label, text] : loaded.result.measurement.statements) {
+        if (label == "Created") {
+            if (const auto time = timeOf(text)) {
                 return *time;
+            }
+        }
+    }
     struct stat status {};
     byFile = true;
     stat(loaded.path.c_str(), &status);
@@ -33,16 +38,19 @@ std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile) {
 
 /// The path of the job's page from the trend's page.
 std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {
-    if (place.folder.empty())
+    if (place.folder.empty()) {
         return {};
+    }
     const std::string stem = loaded.meta ? report::pageStem(*loaded.meta) : loaded.stem();
     const std::string viewers = loaded.folder() + "/" + stem + ".html";
     std::error_code ignored;
-    if (loaded.meta && fs::is_regular_file(viewers, ignored))
+    if (loaded.meta && fs::is_regular_file(viewers, ignored)) {
         return relativeTo(place.folder, viewers);
+    }
 
-    if (place.name.empty())
+    if (place.name.empty()) {
         return {};
+    }
     const std::string folder = place.folder + "/" + place.name;
     std::error_code failure;
     fs::create_directory(folder, failure);
@@ -53,8 +61,9 @@ std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {
         failure ? ""
                 : report::keepPage(folder, name, report::pageOf(loaded.result, loaded.metaOrNull()),
                                    problem);
-    if (page.empty())
+    if (page.empty()) {
         throw Failure(Status::NotWritten, "can't write a page in " + folder + ": " + problem);
+    }
     return place.name + page.substr(folder.size());
 }
 
@@ -87,34 +96,39 @@ Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& fi
         try {
             std::string note;
             const LoadedResult loaded = loadResult(path, "", note);
-            if (!note.empty())
+            if (!note.empty()) {
                 say(note);
+            }
             report::Sample sample = report::sampleOf(loaded.result, loaded.metaOrNull());
             if (seriesBy == SeriesBy::Folders) {
                 sample.folder = printersFolder(loaded);
             }
             bool guessed = false;
             sample.time = timeOfResult(loaded, guessed);
-            if (!filter.takes(sample))
+            if (!filter.takes(sample)) {
                 continue;
+            }
             byFile += guessed;
             sample.page = pageFor(loaded, place);
             gathered.samples.push_back(std::move(sample));
         } catch (const Failure& failure) {
-            if (failure.status == Status::NotWritten)
+            if (failure.status == Status::NotWritten) {
                 throw;
+            }
             say(failure.what());
             ++gathered.leftOut;
         }
     }
-    if (byFile != 0)
+    if (byFile != 0) {
         gathered.notes.push_back(
             counted(byFile, " result does not tell its time; it stands at that of its file.",
                     " results do not tell their time; they stand at those of their files."));
-    if (gathered.leftOut != 0)
+    }
+    if (gathered.leftOut != 0) {
         gathered.notes.push_back(counted(gathered.leftOut,
                                          " file could not be read and is left out.",
                                          " files could not be read and are left out."));
+    }
     return gathered;
 }
 

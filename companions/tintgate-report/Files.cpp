@@ -9,8 +9,8 @@
 #include <memory>
 
 #include "colour/ColourFile.h"
-#include "report/PageFile.h"
 #include "companions/tintgate-report/Failure.h"
+#include "report/PageFile.h"
 
 namespace reporting {
 namespace {
@@ -37,16 +37,18 @@ std::string bytesOf(const std::string& path) {
 
 report::Meta metaOf(const std::string& path) {
     std::string problem;
-    if (auto meta = report::readMeta(bytesOf(path), problem))
+    if (auto meta = report::readMeta(bytesOf(path), problem)) {
         return *meta;
+    }
     throw Failure(Status::Broken, path + " is broken: " + problem);
 }
 
 /// Of a file met in a folder, where other JSON lies, too.
 bool beginsAsResult(const fs::directory_entry& entry) {
     std::error_code ignored;
-    if (!entry.path().filename().string().ends_with(".json") || !entry.is_regular_file(ignored))
+    if (!entry.path().filename().string().ends_with(".json") || !entry.is_regular_file(ignored)) {
         return false;
+    }
     char start[512];
     std::ifstream file(entry.path(), std::ios::binary);
     file.read(start, sizeof start);
@@ -62,9 +64,10 @@ void writeInPlace(const std::string& path, std::string_view text) {
         [](std::FILE* file) { return file != nullptr ? std::fclose(file) : 0; });
     std::FILE* const file = standardOutput ? stdout : opened.get();
     if (file == nullptr || std::fwrite(text.data(), 1, text.size(), file) != text.size() ||
-        std::fflush(file) != 0)
+        std::fflush(file) != 0) {
         throw Failure(Status::NotWritten, (standardOutput ? "standard output" : path) +
                                               " can't be written: " + std::strerror(errno));
+    }
 }
 
 } // namespace
@@ -84,8 +87,9 @@ LoadedResult loadResult(const std::string& path, const std::string& metaPath, st
     loaded.path = path;
     std::string problem;
     auto result = report::readResult(bytesOf(path), problem);
-    if (!result)
+    if (!result) {
         throw Failure(Status::Broken, path + " is broken: " + problem);
+    }
     loaded.result = std::move(*result);
     if (!metaPath.empty()) {
         loaded.meta = metaOf(metaPath);
@@ -93,8 +97,9 @@ LoadedResult loadResult(const std::string& path, const std::string& metaPath, st
     }
     const std::string beside = loaded.folder() + "/meta.json";
     std::error_code ignored;
-    if (loaded.stem() != "output" || !fs::exists(fs::symlink_status(beside, ignored)))
+    if (loaded.stem() != "output" || !fs::exists(fs::symlink_status(beside, ignored))) {
         return loaded;
+    }
     try {
         loaded.meta = metaOf(beside);
     } catch (const Failure& failure) {
@@ -114,11 +119,14 @@ std::vector<std::string> filesOf(const std::vector<std::string>& arguments) {
         std::vector<std::string> inside;
         constexpr auto options = fs::directory_options::skip_permission_denied;
         for (fs::recursive_directory_iterator at(argument, options, failure), end;
-             !failure && at != end; at.increment(failure))
-            if (beginsAsResult(*at))
+             !failure && at != end; at.increment(failure)) {
+            if (beginsAsResult(*at)) {
                 inside.push_back(at->path());
-        if (failure)
+            }
+        }
+        if (failure) {
             throw Failure(Status::Unreadable, argument + " can't be read: " + failure.message());
+        }
         std::sort(inside.begin(), inside.end());
         files.insert(files.end(), inside.begin(), inside.end());
     }
@@ -132,15 +140,17 @@ std::string relativeTo(const std::string& folder, const std::string& path) {
 
 void writeOutput(const std::string& path, std::string_view text) {
     std::error_code ignored;
-    if (path == "-" || fs::is_other(fs::status(path, ignored)))
+    if (path == "-" || fs::is_other(fs::status(path, ignored))) {
         return writeInPlace(path, text);
+    }
     // A link stays one: what it leads to is replaced.
     const fs::path target = fs::is_symlink(fs::symlink_status(path, ignored))
                                 ? fs::weakly_canonical(path, ignored)
                                 : fs::path(path);
     std::string problem;
-    if (!report::replacePage(target.empty() ? path : target.string(), text, problem))
+    if (!report::replacePage(target.empty() ? path : target.string(), text, problem)) {
         throw Failure(Status::NotWritten, path + " can't be written: " + problem);
+    }
 }
 
 } // namespace reporting

@@ -10,22 +10,27 @@ namespace {
 void appendText(std::string& csv, std::string_view text) {
     const bool formula = !text.empty() && std::string_view("=+-@\t\r").find(text[0]) != text.npos;
     const bool quoted = text.find_first_of("\",\r\n") != text.npos;
-    if (quoted)
+    if (quoted) {
         csv += '"';
-    if (formula)
+    }
+    if (formula) {
         csv += '\'';
-    for (const char c : text)
+    }
+    for (const char c : text) {
         csv.append(c == '"' ? 2 : 1, c);
-    if (quoted)
+    }
+    if (quoted) {
         csv += '"';
+    }
 }
 
 void appendNumber(std::string& csv, double value) {
     char digits[400];
-    if (std::isfinite(value))
+    if (std::isfinite(value)) {
         csv.append(
             digits,
             std::to_chars(digits, digits + sizeof digits, value, std::chars_format::fixed).ptr);
+    }
 }
 
 } // namespace
@@ -48,11 +53,14 @@ std::string patchesCsv(const report::Result& result) {
             csv += ',';
             appendNumber(csv, value);
         };
-        for (std::size_t channel = 0; channel < channels; ++channel)
+        for (std::size_t channel = 0; channel < channels; ++channel) {
             number(result.device[i * channels + channel]);
-        for (const colour::Lab& lab : {patch.target, patch.measured})
-            for (const double value : {lab.L, lab.a, lab.b})
+        }
+        for (const colour::Lab& lab : {patch.target, patch.measured}) {
+            for (const double value : {lab.L, lab.a, lab.b}) {
                 number(value);
+            }
+        }
         number(patch.difference);
         for (const std::string& label : {patch.measuredId, patch.measuredName}) {
             csv += ',';

@@ -42,16 +42,20 @@ class Search {
         const std::string folder = "/proc/" + process;
         const std::string arguments = contentsOf(folder + "/cmdline");
         m_user = nameOf(folder, arguments) + " (process " + process + ")";
-        for (const char* link : {"/cwd", "/root", "/exe"})
+        for (const char* link : {"/cwd", "/root", "/exe"}) {
             takePaths(linkOf(folder + link));
+        }
         std::error_code failure;
         for (fs::directory_iterator at(folder + "/fd", failure), end; !failure && at != end;
-             at.increment(failure))
+             at.increment(failure)) {
             takePaths(linkOf(at->path()));
+        }
         takePaths(contentsOf(folder + "/maps"));
         takePaths(arguments);
-        if (nameOf(folder, arguments) == "Tintgate" && mayWorkHere(contentsOf(folder + "/environ")))
+        if (nameOf(folder, arguments) == "Tintgate" &&
+            mayWorkHere(contentsOf(folder + "/environ"))) {
             takeJob(arguments);
+        }
     }
 
     std::map<std::string, std::string> used;
@@ -60,8 +64,9 @@ class Search {
     static std::string nameOf(const std::string& folder, const std::string& arguments) {
         std::string path = linkOf(folder + "/exe");
         path.resize(std::min(path.find(" (deleted)"), path.size())); // Since an upgrade.
-        if (path.empty())
+        if (path.empty()) {
             path = arguments.substr(0, arguments.find('\0'));
+        }
         return path.substr(path.rfind('/') + 1);
     }
 
@@ -70,10 +75,12 @@ class Search {
         for (std::size_t at = 0; (at = text.find(m_start, at)) != text.npos;) {
             at += m_start.size();
             std::string_view rest = std::string_view(text).substr(at);
-            if (rest.starts_with(hidden))
+            if (rest.starts_with(hidden)) {
                 rest.remove_prefix(hidden.size());
-            if (!rest.starts_with(jobFolderPrefix))
+            }
+            if (!rest.starts_with(jobFolderPrefix)) {
                 continue;
+            }
             const std::size_t end = rest.find_first_not_of("0123456789", jobFolderPrefix.size());
             used.emplace(rest.substr(0, end), m_user);
         }
@@ -83,25 +90,30 @@ class Search {
     void takeJob(const std::string& arguments) {
         std::istringstream words(arguments);
         std::string word;
-        for (int i = 0; i <= 3; ++i)
-            if (!std::getline(words, word, '\0'))
+        for (int i = 0; i <= 3; ++i) {
+            if (!std::getline(words, word, '\0')) {
                 return;
+            }
+        }
         word.erase(0, word.rfind(':') + 1);
-        if (isNumber(word))
+        if (isNumber(word)) {
             used.emplace(std::string(jobFolderPrefix) + word, m_user);
+        }
     }
 
     /// False only where the tool's environment names another temporary folder.
     bool mayWorkHere(const std::string& environment) const {
         for (const std::string name : {"TMPDIR=", "TMP=", "TEMP="}) {
             const std::size_t at = ('\0' + environment).find('\0' + name);
-            if (at == environment.npos)
+            if (at == environment.npos) {
                 continue;
+            }
             const std::string value = environment.substr(at + name.size()).c_str();
             std::error_code failure;
             const fs::path folder = fs::canonical(value, failure);
-            if (!failure && fs::is_directory(folder, failure))
+            if (!failure && fs::is_directory(folder, failure)) {
                 return (folder / "Tintgate").string() + "/" == m_start;
+            }
         }
         return true;
     }
@@ -116,9 +128,11 @@ std::map<std::string, std::string> usedFolders(const std::string& folder) {
     Search search(folder);
     std::error_code failure;
     for (fs::directory_iterator at("/proc", failure), end; !failure && at != end;
-         at.increment(failure))
-        if (const std::string name = at->path().filename(); isNumber(name))
+         at.increment(failure)) {
+        if (const std::string name = at->path().filename(); isNumber(name)) {
             search.look(name);
+        }
+    }
     return std::move(search.used);
 }
 

@@ -21,16 +21,18 @@ std::string fileOf(store::StoreEngine& store, const std::string& path) {
     try {
         store.getFile(path, bytes);
     } catch (const store::StoreFailure& failure) {
-        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath)
+        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath) {
             throw;
+        }
         return {};
     }
     return std::move(bytes).str();
 }
 
 std::string nameOf(int device) {
-    if (device <= 0)
+    if (device <= 0) {
         return {};
+    }
     return GetInstrumentNameFromID(static_cast<unsigned>(device)).utf8_string();
 }
 
@@ -38,15 +40,17 @@ std::string nameOf(int device) {
 
 const Preset& Server::preset(int id, const std::string& installFolder) {
     const auto [at, fresh] = m_presets.try_emplace({id, installFolder});
-    if (!fresh || id <= 0)
+    if (!fresh || id <= 0) {
         return at->second;
+    }
     at->second.name = textOf(m_store.key(presetType, id, "Name"));
     const std::string bytes = fileOf(m_store, presetPath(installFolder, id));
     tolerancePresetParameterRecord values;
-    if (!bytes.empty() && analysis::parsePreset(bytes, true, values) == 0)
+    if (!bytes.empty() && analysis::parsePreset(bytes, true, values) == 0) {
         at->second.values = values;
-    else
+    } else {
         m_missing.insert(id);
+    }
     return at->second;
 }
 
@@ -61,9 +65,11 @@ std::string Server::instrument(const store::TicketContent& job, Strip strip) {
     }
     const std::string path = controlStripPath(textOf(job.find("System/InstallFolder")), name);
     const auto [at, fresh] = m_strips.try_emplace(path);
-    if (fresh)
-        if (const auto device = colour::cgatsKeyword(fileOf(m_store, path), "DEVICE"))
+    if (fresh) {
+        if (const auto device = colour::cgatsKeyword(fileOf(m_store, path), "DEVICE")) {
             at->second = nameOf(std::atoi(device->c_str()));
+        }
+    }
     return at->second;
 }
 

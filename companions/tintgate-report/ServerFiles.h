@@ -7,9 +7,9 @@
 #include <string>
 #include <utility>
 
-#include "store/StoreEngine.h"
 #include "companions/tintgate-report/TicketKeys.h"
 #include "job/AnalysisLibrary.h"
+#include "store/StoreEngine.h"
 
 namespace reporting {
 

@@ -41,15 +41,19 @@ constexpr const char* measuredKeys[] = {
 store::KeyFilter keysOf(Strip strip) {
     std::vector<std::string> names = Targets::keys(strip);
     names.insert(names.end(), std::begin(sharedKeys), std::end(sharedKeys));
-    for (const char* key : stripOnlyKeys)
+    for (const char* key : stripOnlyKeys) {
         names.push_back(stripKey(strip, key));
+    }
     for (const std::span<const char* const> group :
-         std::initializer_list<std::span<const char* const>>{measuredKeys, labArrays, cmykArrays})
-        for (const char* name : group)
+         std::initializer_list<std::span<const char* const>>{measuredKeys, labArrays, cmykArrays}) {
+        for (const char* name : group) {
             names.push_back(measurementKey(strip, name));
+        }
+    }
     std::vector<const char*> table;
-    for (const std::string& name : names)
+    for (const std::string& name : names) {
         table.push_back(name.c_str());
+    }
     table.push_back(nullptr);
     return store::KeyFilter(table.data());
 }
@@ -69,9 +73,11 @@ struct Verified {
 /// others first.
 std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& filter) {
     std::vector<std::string> names;
-    for (const Strip strip : strips)
-        for (const char* name : {"Approval", "Date", "Time"})
+    for (const Strip strip : strips) {
+        for (const char* name : {"Approval", "Date", "Time"}) {
             names.push_back(measurementKey(strip, name));
+        }
+    }
     names.emplace_back("General/ParentID");
     struct Row {
         bool judged = false;
@@ -87,18 +93,21 @@ std::vector<Verified> verifiedStrips(store::StoreEngine& store, const Filter& fi
             return;
         }
         Row& row = rows[{id, strips[name / 3]}];
-        if (name % 3 == 0)
+        if (name % 3 == 0) {
             row.judged = integerOf(elements).value_or(-1) >= 0;
-        else
+        } else {
             (name % 3 == 1 ? row.date : row.time) = textOf(elements);
+        }
     });
     std::vector<Verified> verified;
     for (const auto& [key, row] : rows) {
         auto time = timeOf(row.date + " " + row.time);
-        if (!time)
+        if (!time) {
             time = timeOf(row.date);
-        if (row.judged && time && filter.takesTime(*time))
+        }
+        if (row.judged && time && filter.takesTime(*time)) {
             verified.push_back({key.first, parents[key.first], key.second, *time});
+        }
     }
     std::stable_sort(verified.begin(), verified.end(),
                      [](const auto& a, const auto& b) { return (a.parent > 0) > (b.parent > 0); });
@@ -113,16 +122,18 @@ report::Criterion criterionOf(const analysis::Criterion& known, const Preset& pr
     criterion.name = known.name;
     criterion.title = known.title;
     criterion.unit = analysis::unit(known.quantity);
-    if (!preset.values)
+    if (!preset.values) {
         return criterion;
+    }
     const auto& values = *preset.values;
     const double tolerance =
         preset.psd() ? values.psdPresetValues[known.psdEntry] : values.presetValues[known.index];
     criterion.used = (preset.psd() ? values.usedForPSDResult[known.psdEntry]
                                    : values.usedForResult[known.index]) != 0;
     criterion.decimals = std::clamp(values.decimalPlaces[known.index], 0, 6);
-    if (criterion.used || tolerance != 0)
+    if (criterion.used || tolerance != 0) {
         criterion.tolerance = tolerance;
+    }
     return criterion;
 }
 
@@ -168,8 +179,9 @@ bool judge(report::Criterion& criterion, double value, std::optional<bool> appro
     }
     criterion.value = value;
     criterion.patches = 1;
-    if (!criterion.tolerance)
+    if (!criterion.tolerance) {
         return false;
+    }
     criterion.rounded = analysis::roundedTo(value, criterion.decimals);
     const bool within = *criterion.rounded <= *criterion.tolerance;
     criterion.outcome = approval.value_or(within) ? report::Outcome::Pass : report::Outcome::Fail;
@@ -187,8 +199,9 @@ bool addCriteria(report::Sample& sample, const Results& results, const Preset& p
         }
         report::Criterion criterion = criterionOf(known, preset);
         changed |= judge(criterion, *measured, approvalOf(results, known.index, preset.psd()));
-        if (criterion.value || criterion.used)
+        if (criterion.value || criterion.used) {
             sample.criteria.push_back(std::move(criterion));
+        }
     }
     return changed;
 }
@@ -201,22 +214,26 @@ report::InkColours inksOf(const store::TicketContent& job, Strip strip) {
         values = doublesOf(job.find(measurementKey(strip, name)));
         patches = std::min(patches, values.size());
     };
-    for (int i = 0; i < 3; ++i)
+    for (int i = 0; i < 3; ++i) {
         read(lab[i], labArrays[i]);
-    for (int i = 0; i < 4; ++i)
+    }
+    for (int i = 0; i < 4; ++i) {
         read(cmyk[i], cmykArrays[i]);
+    }
     report::InkMeans means;
     for (std::size_t i = 0; i < patches; ++i) {
         const double device[4] = {cmyk[0][i], cmyk[1][i], cmyk[2][i], cmyk[3][i]};
-        if (const auto ink = report::inkOf(device, 4))
+        if (const auto ink = report::inkOf(device, 4)) {
             means.add(*ink, {lab[0][i], lab[1][i], lab[2][i]});
+        }
     }
     return means.means();
 }
 
 report::Verdict verdictOf(const report::Sample& sample, int approval) {
-    if (approval > 0)
+    if (approval > 0) {
         return report::Verdict::Passed;
+    }
     const auto used = [&](report::Outcome outcome) {
         return std::any_of(sample.criteria.begin(), sample.criteria.end(),
                            [&](const auto& c) { return c.used && c.outcome == outcome; });
@@ -232,8 +249,9 @@ report::Sample sampleOf(const store::TicketContent& job, const Verified& verifie
     sample.jobId = verified.job;
     sample.strip = numberOf(verified.strip);
     sample.title = textOf(job.find("Input/Title"));
-    if (sample.title.empty())
+    if (sample.title.empty()) {
         sample.title = "Job " + std::to_string(verified.job);
+    }
     sample.paper = textOf(job.find("CMM/PaperName"));
     sample.workflow = textOf(job.find("Workflow/Name"));
     sample.instrument = server.instrument(job, verified.strip);
@@ -252,21 +270,25 @@ class Gatherer {
     void add(const Verified& verified) {
         const SharedContent job =
             m_store.content(jobType, verified.job, m_keys[verified.strip == Strip::first ? 0 : 1]);
-        if (!job) // Deleted meanwhile.
+        if (!job) { // Deleted meanwhile.
             return;
+        }
         const Strip strip = verified.strip;
         const int id =
             integerOf(job->find(stripKey(strip, "Workflow/Verify/ComparisonMethod"))).value_or(0);
         const Preset& preset = m_server.preset(id, textOf(job->find("System/InstallFolder")));
         report::Sample sample = sampleOf(*job, verified, m_server, preset);
         sample.presetId = id;
-        if (!m_place.folder.empty())
-            if (const std::string page = m_pages.of(sample); !page.empty())
+        if (!m_place.folder.empty()) {
+            if (const std::string page = m_pages.of(sample); !page.empty()) {
                 sample.page = relativeTo(m_place.folder, page);
+            }
+        }
         Results results;
         results.measured = doublesOf(job->find(measurementKey(strip, "Values/Measured")));
-        if (!m_filter.takes(sample) || isKnown(verified, results.measured, sample.page))
+        if (!m_filter.takes(sample) || isKnown(verified, results.measured, sample.page)) {
             return;
+        }
         results.approvals = integersOf(job->find(
             measurementKey(strip, preset.psd() ? "Values/PSDApproval" : "Values/Approval")));
         m_changes += addCriteria(sample, results, preset);
@@ -281,14 +303,16 @@ class Gatherer {
     }
 
     Gathered gathered() && {
-        for (const int id : m_server.presetsWithoutFile())
+        for (const int id : m_server.presetsWithoutFile()) {
             m_gathered.notes.push_back("The file of preset " + std::to_string(id) +
                                        " can't be read, so its tolerances are not known.");
-        if (m_changes != 0)
+        }
+        if (m_changes != 0) {
             m_gathered.notes.push_back(
                 std::to_string(m_changes) + (m_changes == 1 ? " job was" : " jobs were") +
                 " judged by other tolerances than the preset has today. Passed and failed are as "
                 "they were judged; the lines show the tolerances of today.");
+        }
         return std::move(m_gathered);
     }
 
@@ -298,15 +322,17 @@ class Gatherer {
     bool isKnown(const Verified& verified, const std::vector<double>& measured,
                  const std::string& page) {
         const int family = verified.parent > 0 ? verified.parent : verified.job;
-        if (measured.empty())
+        if (measured.empty()) {
             return false;
+        }
         // As bytes, since a ticket may hold what is no number and has no order.
         std::string bytes(reinterpret_cast<const char*>(measured.data()),
                           measured.size() * sizeof(double));
         const auto [at, fresh] = m_known.try_emplace({family, verified.strip, std::move(bytes)},
                                                      m_gathered.samples.size());
-        if (!fresh && m_gathered.samples[at->second].page.empty())
+        if (!fresh && m_gathered.samples[at->second].page.empty()) {
             m_gathered.samples[at->second].page = page;
+        }
         return !fresh;
     }
 
@@ -328,8 +354,9 @@ Gathered gatherStore(const std::string& address, const Filter& filter, const Pag
     try {
         const auto store = store::openStore(address, store::Access::Read);
         Gatherer gatherer(*store, filter, place);
-        for (const Verified& verified : verifiedStrips(*store, filter))
+        for (const Verified& verified : verifiedStrips(*store, filter)) {
             gatherer.add(verified);
+        }
         return std::move(gatherer).gathered();
     } catch (const store::StoreFailure& failure) {
         throw Failure(Status::Store, failure.what());

@@ -99,8 +99,8 @@ std::string inksText(const report::Series& series, const Painter& paint) {
 
 std::string criteriaText(const report::Series& series, const Painter& paint) {
     std::vector<std::vector<Cell>> lines;
-    for (const report::CriterionTrend& criterion : series.criteria)
-        if (criterion.used)
+    for (const report::CriterionTrend& criterion : series.criteria) {
+        if (criterion.used) {
             lines.push_back({{criterion.title},
                              {criterion.latest, Tone::Bold, true},
                              {"of " + criterion.tolerance, Tone::Plain, true},
@@ -108,6 +108,8 @@ std::string criteriaText(const report::Series& series, const Painter& paint) {
                              {std::to_string(criterion.failed) + " of " +
                                   std::to_string(criterion.answered) + " above",
                               criterion.failed != 0 ? Tone::Failed : Tone::Soft}});
+        }
+    }
     return lines.empty() ? "" : '\n' + tableText(lines, paint);
 }
 
@@ -129,8 +131,9 @@ std::string jobsText(const report::TrendModel& trend, const report::Series& seri
 
 std::string trendText(const report::TrendModel& trend, const Painter& paint) {
     std::string text;
-    for (const std::string& note : trend.notes)
+    for (const std::string& note : trend.notes) {
         text += paint(Tone::Open, "! ") + paint(Tone::Plain, note) + '\n';
+    }
     for (const report::Series& series : trend.series) {
         const bool bad = series.failing && series.movement == report::Movement::Steady;
         const Mark mark = bad ? markOf(report::Verdict::Failed) : markOf(series.movement);
@@ -142,8 +145,9 @@ std::string trendText(const report::TrendModel& trend, const Painter& paint) {
                                       " passed, " + std::to_string(series.failed) + " failed, " +
                                       std::to_string(series.incomplete) + " incomplete") +
                 '\n' + paint(Tone::Plain, series.sentence) + '\n';
-        for (const std::string& reason : series.reasons)
+        for (const std::string& reason : series.reasons) {
             text += "  " + paint(Tone::Plain, reason) + '\n';
+        }
         text += '\n' + inksText(series, paint) + criteriaText(series, paint) +
                 jobsText(trend, series, paint);
     }
@@ -157,19 +161,24 @@ std::string summaryText(const report::Result& result, const report::Meta* meta,
     std::string text = paint(mark.tone, mark.sign + model.word) + "  " +
                        paint(Tone::Bold, model.title) + '\n' + paint(Tone::Soft, model.subtitle) +
                        '\n' + model.sentence + '\n';
-    for (const std::string& doubt : model.doubts)
+    for (const std::string& doubt : model.doubts) {
         text += "  " + paint(Tone::Open, "? ") + paint(Tone::Plain, doubt) + '\n';
-    if (!model.condition.empty())
+    }
+    if (!model.condition.empty()) {
         text += paint(Tone::Soft, model.condition) + '\n';
+    }
     text += criteriaText(model, paint) + '\n';
     std::string statistics;
-    for (const auto& [label, value] : model.statistics)
+    for (const auto& [label, value] : model.statistics) {
         statistics += (statistics.empty() ? "" : ", ") + label + ' ' + value;
+    }
     text += statistics + '\n' + patchesText(model, result, paint);
-    if (!model.warnings.empty())
+    if (!model.warnings.empty()) {
         text += '\n' + paint(Tone::Bold, "Warnings") + '\n';
-    for (const std::string& warning : model.warnings)
+    }
+    for (const std::string& warning : model.warnings) {
         text += "  " + paint(Tone::Open, "! ") + paint(Tone::Plain, warning) + '\n';
+    }
     return text;
 }
 

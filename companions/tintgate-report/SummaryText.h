@@ -3,10 +3,10 @@
 
 #include <string>
 
+#include "companions/tintgate-report/Terminal.h"
 #include "report/Meta.h"
 #include "report/Result.h"
 #include "report/Trend.h"
-#include "companions/tintgate-report/Terminal.h"
 
 namespace reporting {
 

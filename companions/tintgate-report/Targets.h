@@ -8,9 +8,9 @@
 #include <utility>
 #include <vector>
 
-#include "store/StoreEngine.h"
-#include "report/Sample.h"
 #include "companions/tintgate-report/TicketKeys.h"
+#include "report/Sample.h"
+#include "store/StoreEngine.h"
 
 namespace reporting {
 

@@ -38,8 +38,9 @@ const char* sequenceOf(Tone tone) {
 
 std::string Painter::operator()(Tone tone, std::string_view text) const {
     const std::string shown = admin::printable(text);
-    if (!m_colours || tone == Tone::Plain || shown.empty())
+    if (!m_colours || tone == Tone::Plain || shown.empty()) {
         return shown;
+    }
     return sequenceOf(tone) + shown + "\x1b[0m";
 }
 
@@ -54,8 +55,9 @@ std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter
     std::vector<std::size_t> widths;
     for (const auto& cells : lines) {
         widths.resize(std::max(widths.size(), cells.size()));
-        for (std::size_t i = 0; i < cells.size(); ++i)
+        for (std::size_t i = 0; i < cells.size(); ++i) {
             widths[i] = std::max(widths[i], widthOf(admin::printable(cells[i].text)));
+        }
     }
     std::string text;
     for (const auto& cells : lines) {
@@ -65,8 +67,9 @@ std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter
             const std::size_t gap = widths[i] - widthOf(admin::printable(cell.text));
             line +=
                 "  " + std::string(cell.toTheRight ? gap : 0, ' ') + paint(cell.tone, cell.text);
-            if (!cell.toTheRight && i + 1 < cells.size())
+            if (!cell.toTheRight && i + 1 < cells.size()) {
                 line.append(gap, ' ');
+            }
         }
         text += line.substr(0, line.find_last_not_of(' ') + 1) + '\n';
     }

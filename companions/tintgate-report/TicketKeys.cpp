@@ -18,8 +18,9 @@ std::string textOf(const SharedElements& elements) {
 }
 
 std::vector<double> doublesOf(const SharedElements& elements) {
-    if (!elements || static_cast<std::size_t>(elements->count()) > mostElements)
+    if (!elements || static_cast<std::size_t>(elements->count()) > mostElements) {
         return {};
+    }
     std::vector<double> values(static_cast<std::size_t>(elements->count()),
                                std::numeric_limits<double>::quiet_NaN());
     if (elements->numberType() == PARAM_DOUBLE) {
@@ -27,8 +28,9 @@ std::vector<double> doublesOf(const SharedElements& elements) {
         return values;
     }
     elements->visit([&](int position, const store::Value& value) {
-        if (const auto* number = std::get_if<double>(&value))
+        if (const auto* number = std::get_if<double>(&value)) {
             values[static_cast<std::size_t>(position)] = *number;
+        }
         return true;
     });
     return values;
@@ -36,14 +38,16 @@ std::vector<double> doublesOf(const SharedElements& elements) {
 
 std::vector<int> integersOf(const SharedElements& elements) {
     std::vector<int> values;
-    if (elements)
+    if (elements) {
         elements->visit([&](int position, const store::Value& value) {
             const auto* number = std::get_if<int>(&value);
-            if (number == nullptr || position != static_cast<int>(values.size()))
+            if (number == nullptr || position != static_cast<int>(values.size())) {
                 return false;
+            }
             values.push_back(*number);
             return true;
         });
+    }
     return values;
 }
 

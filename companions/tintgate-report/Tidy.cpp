@@ -12,10 +12,10 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "report/Model.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Processes.h"
 #include "jobkeys/Tickets.h"
+#include "report/Model.h"
 
 namespace reporting {
 namespace {
@@ -31,8 +31,9 @@ bool isOurs(const struct stat& status) {
 /// "JobID_7" of "JobID_7" and of ".tidy-JobID_7"; empty of any other name.
 std::string jobName(std::string name) {
     constexpr std::string_view prefix = jobkeys::jobFolderPrefix;
-    if (name.starts_with(hidden))
+    if (name.starts_with(hidden)) {
         name.erase(0, std::strlen(hidden));
+    }
     const bool job = name.starts_with(prefix) && name.size() > prefix.size() &&
                      name.find_first_not_of("0123456789", prefix.size()) == name.npos;
     return job ? name : "";
@@ -47,8 +48,9 @@ void fail(JobFolder& folder, const std::string& reason) {
 bool addEntry(JobFolder& folder, const fs::path& path, dev_t device) {
     struct stat status {};
     if (lstat(path.c_str(), &status) != 0) {
-        if (errno != ENOENT) // Gone meanwhile; its folder has changed then.
+        if (errno != ENOENT) { // Gone meanwhile; its folder has changed then.
             fail(folder, std::strerror(errno));
+        }
         return true;
     }
     constexpr std::uint64_t blockSize = 512;
@@ -71,12 +73,14 @@ JobFolder survey(const fs::path& path, const std::string& name, std::int64_t bef
     bool oneDevice = addEntry(folder, path, status.st_dev);
     std::error_code failure;
     for (fs::recursive_directory_iterator at(path, failure), end; !failure && at != end;
-         at.increment(failure))
+         at.increment(failure)) {
         oneDevice = addEntry(folder, at->path(), status.st_dev) && oneDevice;
-    if (failure)
+    }
+    if (failure) {
         fail(folder, failure.message());
-    else if (folder.fate == Fate::Removed && folder.changed >= before)
+    } else if (folder.fate == Fate::Removed && folder.changed >= before) {
         folder.fate = Fate::Recent;
+    }
     if (!isOurs(status) || !oneDevice) {
         folder.fate = Fate::NotOurs;
         folder.reason =
@@ -89,14 +93,17 @@ JobFolder survey(const fs::path& path, const std::string& name, std::int64_t bef
 fs::path checkedFolder(const std::string& path) {
     struct stat status {};
     if (lstat(path.c_str(), &status) != 0) {
-        if (errno == ENOENT)
+        if (errno == ENOENT) {
             return {};
+        }
         throw Failure(Status::NotTidied, path + " can't be looked at: " + std::strerror(errno));
     }
-    if (!S_ISDIR(status.st_mode))
+    if (!S_ISDIR(status.st_mode)) {
         throw Failure(Status::NotTidied, path + " is no folder, or a link to one");
-    if (!isOurs(status))
+    }
+    if (!isOurs(status)) {
         throw Failure(Status::NotTidied, path + " belongs to another user");
+    }
     return fs::canonical(path);
 }
 
@@ -113,12 +120,14 @@ class Candidates {
             const std::string name = at->path().filename();
             std::error_code ignored;
             if (!jobName(name).empty() &&
-                at->symlink_status(ignored).type() == fs::file_type::directory)
+                at->symlink_status(ignored).type() == fs::file_type::directory) {
                 m_folders.emplace(name, survey(at->path(), jobName(name), m_before));
+            }
         }
-        if (failure)
+        if (failure) {
             throw Failure(Status::NotTidied,
                           m_folder.string() + " can't be read: " + failure.message());
+        }
         keepUsed();
     }
 
@@ -129,8 +138,9 @@ class Candidates {
         for (auto& [name, folder] : m_folders) {
             const std::string other = hidden + folder.name;
             const bool hide = folder.fate == Fate::Removed && name != other;
-            if (hide && !rename(name, other))
+            if (hide && !rename(name, other)) {
                 fail(folder, std::strerror(errno));
+            }
             now.emplace(hide && folder.fate == Fate::Removed ? other : name, std::move(folder));
         }
         m_folders = std::move(now);
@@ -141,8 +151,9 @@ class Candidates {
         const auto used = usedFolders(m_folder);
         for (auto& [name, folder] : m_folders) {
             const auto user = used.find(folder.name);
-            if (folder.fate != Fate::Removed || user == used.end())
+            if (folder.fate != Fate::Removed || user == used.end()) {
                 continue;
+            }
             // A name that is taken again is that of a newer folder, and nobody needs this one.
             if (rename(name, folder.name) || errno != EEXIST) {
                 folder.fate = Fate::InUse;
@@ -153,19 +164,22 @@ class Candidates {
 
     void remove() {
         for (auto& [name, folder] : m_folders) {
-            if (folder.fate != Fate::Removed)
+            if (folder.fate != Fate::Removed) {
                 continue;
+            }
             std::error_code failure;
             fs::remove_all(m_folder / name, failure);
-            if (failure)
+            if (failure) {
                 fail(folder, failure.message());
+            }
         }
     }
 
     std::vector<JobFolder> folders() const {
         std::vector<JobFolder> all;
-        for (const auto& [name, folder] : m_folders)
+        for (const auto& [name, folder] : m_folders) {
             all.push_back(folder);
+        }
         std::sort(all.begin(), all.end(), [](const auto& a, const auto& b) {
             return a.name.size() != b.name.size() ? a.name.size() < b.name.size()
                                                   : a.name < b.name; // By number.
@@ -176,11 +190,12 @@ class Candidates {
   private:
     void keepUsed() {
         const auto used = usedFolders(m_folder);
-        for (auto& [name, folder] : m_folders)
+        for (auto& [name, folder] : m_folders) {
             if (const auto user = used.find(folder.name); user != used.end()) {
                 folder.fate = Fate::InUse;
                 folder.reason = user->second;
             }
+        }
     }
 
     /// False with errno set, which is EEXIST where the new name is taken.
@@ -234,8 +249,9 @@ std::string lineOf(const JobFolder& folder, bool dryRun) {
 
 std::vector<JobFolder> tidy(const std::string& workingFolder, std::int64_t seconds, bool dryRun) {
     const fs::path folder = checkedFolder(workingFolder);
-    if (folder.empty())
+    if (folder.empty()) {
         return {};
+    }
     Candidates candidates(folder, std::time(nullptr) - seconds);
     candidates.find();
     if (!dryRun) {

@@ -5,8 +5,8 @@
 #include <string>
 #include <vector>
 
-#include "report/Trend.h"
 #include "companions/tintgate-report/Filter.h"
+#include "report/Trend.h"
 
 namespace reporting {
 

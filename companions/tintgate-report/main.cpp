@@ -13,9 +13,6 @@
 
 #include <CLI/CLI.hpp>
 
-#include "report/Page.h"
-#include "report/PageFile.h"
-#include "report/TrendPage.h"
 #include "companions/tintgate-report/CheckPreset.h"
 #include "companions/tintgate-report/Explain.h"
 #include "companions/tintgate-report/Failure.h"
@@ -26,6 +23,9 @@
 #include "companions/tintgate-report/Trend.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "platform/TemporaryFolder.h"
+#include "report/Page.h"
+#include "report/PageFile.h"
+#include "report/TrendPage.h"
 
 namespace {
 
@@ -110,40 +110,46 @@ void keepPage(const reporting::LoadedResult& loaded, const std::string& page) {
     std::string problem;
     const std::string stem = loaded.meta ? report::pageStem(*loaded.meta) : loaded.stem();
     const std::string path = report::keepPage(loaded.folder(), stem, page, problem);
-    if (path.empty())
+    if (path.empty()) {
         throw Failure(Status::NotWritten,
                       "can't write a page in " + loaded.folder() + ": " + problem);
+    }
     reporting::writeOutput("-", path + '\n');
 }
 
 void reportOne(const Options& options) {
     std::string note;
     const auto loaded = reporting::loadResult(options.results[0], options.meta, note);
-    if (!note.empty())
+    if (!note.empty()) {
         say(note);
+    }
     const std::string output = options.output.empty() ? "-" : options.output;
-    if (options.csv)
+    if (options.csv) {
         return reporting::writeOutput(output, reporting::patchesCsv(loaded.result));
+    }
     if (options.text) {
         const reporting::Painter paint(output == "-" && reporting::terminalTakesColours());
         return reporting::writeOutput(
             output, reporting::summaryText(loaded.result, loaded.metaOrNull(), paint));
     }
     const std::string page = report::pageOf(loaded.result, loaded.metaOrNull());
-    if (options.output.empty())
+    if (options.output.empty()) {
         return keepPage(loaded, page);
+    }
     reporting::writeOutput(output, page);
 }
 
 /// "trend.html" becomes "trend-jobs".
 reporting::PagePlace placeOf(const Options& options) {
-    if (options.text || options.output == "-")
+    if (options.text || options.output == "-") {
         return {};
+    }
     const fs::path output = options.output.empty() ? "trend.html" : options.output;
     reporting::PagePlace place;
     place.folder = output.has_parent_path() ? output.parent_path().string() : ".";
-    if (!options.noPages)
+    if (!options.noPages) {
         place.name = output.stem().string() + "-jobs";
+    }
     return place;
 }
 
@@ -154,12 +160,14 @@ void writeTrend(const Options& options, const report::TrendModel& trend) {
         return reporting::writeOutput(output, reporting::trendText(trend, paint));
     }
     const std::string page = report::trendPageOf(trend);
-    if (!options.output.empty())
+    if (!options.output.empty()) {
         return reporting::writeOutput(output, page);
+    }
     std::string problem;
     const std::string path = report::keepPage(".", "trend", page, problem);
-    if (path.empty())
+    if (path.empty()) {
         throw Failure(Status::NotWritten, "can't write a page in this folder: " + problem);
+    }
     reporting::writeOutput("-", path + '\n');
 }
 
@@ -172,9 +180,10 @@ Status reportTrend(const Options& options) {
                                      options.series == "folder" ? reporting::SeriesBy::Folders
                                                                 : reporting::SeriesBy::Statements,
                                      place, say);
-    if (gathered.samples.empty())
+    if (gathered.samples.empty()) {
         throw Failure(gathered.leftOut != 0 ? Status::Unreadable : Status::NothingFound,
                       "there is no result that fits what was asked for");
+    }
     const std::string source = options.fromStore() ? "the store " + options.store : "files";
     writeTrend(options,
                report::makeTrend(std::move(gathered.samples), source, std::move(gathered.notes)));
@@ -184,8 +193,9 @@ Status reportTrend(const Options& options) {
 Status tidyFolders(const Options& options) {
     constexpr std::int64_t secondsOfDay = 86400;
     const std::string temporary = platform::temporaryFolder();
-    if (temporary.empty())
+    if (temporary.empty()) {
         throw Failure(Status::NotTidied, "there is no temporary folder that may be used");
+    }
     const auto folders =
         reporting::tidy(temporary + "/Tintgate", *options.tidyDays * secondsOfDay, options.dryRun);
     reporting::writeOutput("-", reporting::tidiedText(folders, options.dryRun));
@@ -202,19 +212,21 @@ bool wantsTrend(const Options& options) {
 }
 
 int run(const Options& options) {
-    if (options.verdict)
+    if (options.verdict) {
         return verdictOf(options);
+    }
     try {
-        if (options.code)
+        if (options.code) {
             reporting::writeOutput("-", reporting::explanationOf(*options.code));
-        else if (!options.preset.empty())
+        } else if (!options.preset.empty()) {
             reporting::writeOutput("-", reporting::presetSummary(options.preset));
-        else if (options.tidyDays)
+        } else if (options.tidyDays) {
             return static_cast<int>(tidyFolders(options));
-        else if (wantsTrend(options))
+        } else if (wantsTrend(options)) {
             return static_cast<int>(reportTrend(options));
-        else
+        } else {
             reportOne(options);
+        }
         return static_cast<int>(Status::Done);
     } catch (const Failure& failure) {
         return fail(failure.status, failure.what());
@@ -271,8 +283,9 @@ void addOptions(CLI::App& program, Options& options) {
           std::tuple{"--instrument", &options.filter.instrument,
                      "Of instruments whose names hold this text"},
           std::tuple{"--workflow", &options.filter.workflow,
-                     "Of workflows whose names hold this text"}})
+                     "Of workflows whose names hold this text"}}) {
         program.add_option(name, *value, what)->type_name("TEXT")->group(trend);
+    }
     program
         .add_option("--series", options.series,
                     "\"folder\": results in different folders are of\ndifferent printers")
@@ -311,34 +324,44 @@ void settle(Options& options) {
     constexpr std::int64_t secondsOfDay = 86400;
     const auto day = [](const std::string& text, const char* option) {
         const auto time = reporting::dayOf(text);
-        if (!time)
+        if (!time) {
             throw CLI::ValidationError(option,
                                        "\"" + text + "\" is no day such as 2026-11-24 or 30d");
+        }
         return *time;
     };
-    if (!options.since.empty())
+    if (!options.since.empty()) {
         options.filter.since = day(options.since, "--since");
-    if (!options.until.empty())
+    }
+    if (!options.until.empty()) {
         options.filter.until = day(options.until, "--until") + secondsOfDay;
+    }
     const char* const store = std::getenv("TINTGATE_STORE");
     if (!options.code && !options.tidyDays && options.preset.empty() && options.results.empty() &&
-        options.store.empty() && store != nullptr)
+        options.store.empty() && store != nullptr) {
         options.store = store;
+    }
     if (options.code.has_value() + options.tidyDays.has_value() + !options.preset.empty() +
             options.fromStore() + !options.results.empty() !=
-        1)
+        1) {
         throw CLI::RequiredError("One of results, --store, --explain, --check-preset and --tidy");
-    if (options.text + options.csv + options.verdict > 1)
+    }
+    if (options.text + options.csv + options.verdict > 1) {
         throw CLI::ExcludesError("--text, --csv and --verdict", "each other");
+    }
     constexpr int mostDays = 36500;
-    if (options.tidyDays && (*options.tidyDays < 1 || *options.tidyDays > mostDays))
+    if (options.tidyDays && (*options.tidyDays < 1 || *options.tidyDays > mostDays)) {
         throw CLI::ValidationError("--tidy", "takes 1 to 36500 days");
-    if (options.dryRun && !options.tidyDays)
+    }
+    if (options.dryRun && !options.tidyDays) {
         throw CLI::RequiresError("--dry-run", "--tidy");
-    if (options.fromStore() && !options.series.empty())
+    }
+    if (options.fromStore() && !options.series.empty()) {
         throw CLI::ExcludesError("--series", "--store");
-    if ((options.csv || options.verdict || !options.meta.empty()) && wantsTrend(options))
+    }
+    if ((options.csv || options.verdict || !options.meta.empty()) && wantsTrend(options)) {
         throw CLI::ValidationError("--csv, --verdict and --meta", "are for one result");
+    }
 }
 
 } // namespace

@@ -6,8 +6,8 @@
 #include <string>
 #include <vector>
 
-#include "store/StoreEngine.h"
 #include "companions/tintgate-store/CommandLine.h"
+#include "store/StoreEngine.h"
 
 namespace admin {
 

@@ -21,8 +21,8 @@
 #include <memory>
 #include <string>
 
-#include "store/tickets/TicketElements.h"
 #include "companions/tintgate-store/Bytes.h"
+#include "store/tickets/TicketElements.h"
 
 namespace admin {
 

@@ -27,8 +27,8 @@
 #include <string>
 #include <vector>
 
-#include "store/tickets/TicketContent.h"
 #include "companions/tintgate-store/TicketName.h"
+#include "store/tickets/TicketContent.h"
 
 namespace admin {
 

@@ -24,8 +24,9 @@ bool openFile(const std::string& path, std::string& problem) {
     // The browser may outlive everybody: it must not hold the pipes of whoever started us.
     posix_spawn_file_actions_t files;
     posix_spawn_file_actions_init(&files);
-    for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO})
+    for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {
         posix_spawn_file_actions_addopen(&files, stream, "/dev/null", O_RDWR, 0);
+    }
     posix_spawnattr_t attributes;
     posix_spawnattr_init(&attributes);
     posix_spawnattr_setflags(&attributes, POSIX_SPAWN_SETSID);
@@ -38,8 +39,9 @@ bool openFile(const std::string& path, std::string& problem) {
         posix_spawnp(&process, program.c_str(), &files, &attributes, arguments, environ);
     posix_spawnattr_destroy(&attributes);
     posix_spawn_file_actions_destroy(&files);
-    if (reason != 0)
+    if (reason != 0) {
         problem = program + ": " + std::strerror(reason);
+    }
     return reason == 0;
 }
 

@@ -12,14 +12,14 @@
 
 #include "CompanionStatuses.h"
 #include "colour/ColourFile.h"
+#include "companions/viewer/Browser.h"
+#include "companions/viewer/MissingWrites.h"
+#include "platform/TemporaryFolder.h"
 #include "report/Meta.h"
 #include "report/Page.h"
 #include "report/PageFile.h"
 #include "report/Reports.h"
 #include "report/Result.h"
-#include "companions/viewer/Browser.h"
-#include "companions/viewer/MissingWrites.h"
-#include "platform/TemporaryFolder.h"
 
 namespace {
 
@@ -57,68 +57,83 @@ std::string folderOf(const std::string& path) {
 }
 
 int show(const std::string& page) {
-    if (isatty(STDOUT_FILENO))
+    if (isatty(STDOUT_FILENO)) {
         std::printf("%s\n", page.c_str());
+    }
     std::string problem;
-    if (viewer::hasDisplay() && !viewer::openFile(page, problem))
+    if (viewer::hasDisplay() && !viewer::openFile(page, problem)) {
         return fail(Status::PageNotOpened, page + " is not opened: " + problem);
+    }
     return end(Status::Done);
 }
 
 int showReport(const std::string& metaPath) {
     std::string bytes;
     std::string problem;
-    if (!read(metaPath, bytes))
+    if (!read(metaPath, bytes)) {
         return fail(Status::MetaMissing, "can't read " + metaPath);
+    }
     const std::optional<report::Meta> meta = report::readMeta(bytes, problem);
-    if (!meta)
+    if (!meta) {
         return fail(Status::MetaBroken, metaPath + " is broken: " + problem);
+    }
     const std::string folder = folderOf(metaPath);
     const std::string resultPath = folder + "/output.json";
-    if (!read(resultPath, bytes))
+    if (!read(resultPath, bytes)) {
         return fail(Status::ResultMissing, "can't read " + resultPath);
+    }
     std::optional<report::Result> result = report::readResult(bytes, problem);
-    if (!result)
+    if (!result) {
         return fail(Status::ResultBroken, resultPath + " is broken: " + problem);
+    }
     const store::WriteFailures failures(platform::temporaryFolder());
     const std::string missing = viewer::missingWrites(failures.all(), folder, *meta);
-    if (!missing.empty())
+    if (!missing.empty()) {
         result->warnings.insert(result->warnings.begin(), report::Warning{.text = missing});
+    }
     const std::string page =
         report::keepPage(folder, report::pageStem(*meta), report::pageOf(*result, &*meta), problem);
-    if (page.empty())
+    if (page.empty()) {
         return fail(Status::PageNotWritten, "can't write a page in " + folder + ": " + problem);
+    }
     return show(page);
 }
 
 int showIndex() {
     const std::string temporary = platform::temporaryFolder();
-    if (temporary.empty())
+    if (temporary.empty()) {
         return fail(Status::PageNotWritten, "there is no temporary folder that may be used");
+    }
     // The tool's working folder, or the temporary folder as long as there is none.
     const std::string working = temporary + "/Tintgate";
     const std::string folder = access(working.c_str(), W_OK | X_OK) == 0 ? working : temporary;
     const std::string path = folder + "/reports.html";
     std::string problem;
-    if (!report::replacePage(path, report::indexOf(report::reportsBelow(folder), folder), problem))
+    if (!report::replacePage(path, report::indexOf(report::reportsBelow(folder), folder),
+                             problem)) {
         return fail(Status::PageNotWritten, "can't write " + path + ": " + problem);
+    }
     return show(path);
 }
 
 int run(const std::vector<std::string_view>& words) {
-    if (words.empty())
+    if (words.empty()) {
         return showIndex();
-    if (words.size() == 1 && (words[0] == "--help" || words[0] == "-h"))
+    }
+    if (words.size() == 1 && (words[0] == "--help" || words[0] == "-h")) {
         return end(std::fputs((std::string(help) + nerovaVerifyStatusHelp).c_str(), stdout) < 0
                        ? Status::PageNotWritten
                        : Status::Done);
+    }
     const std::size_t meta = words[0] == "-detail" ? 1 : 0;
-    if (words.size() < meta + 2 || words[meta] != "-meta")
+    if (words.size() < meta + 2 || words[meta] != "-meta") {
         return fail(Status::BadCommand, "not understood; --help tells how it is called");
+    }
     // Whoever starts this program does not quote the path, so blanks part it into words.
     std::string path(words[meta + 1]);
-    for (std::size_t i = meta + 2; i < words.size(); ++i)
+    for (std::size_t i = meta + 2; i < words.size(); ++i) {
         path.append(" ").append(words[i]);
+    }
     return showReport(path);
 }
 

@@ -7,8 +7,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "store/sqlite/ServerFiles.h"
 #include "store/StoreEngine.h"
+#include "store/sqlite/ServerFiles.h"
 
 namespace store {
 

@@ -680,8 +680,8 @@ int ServerFiles::highestVersion(std::string_view path) {
     const auto list = versions(path);
     int highest = list.empty() ? 0 : list.back().number;
     try {
-        highest = std::max(highest,
-                           lastUsedUp(walk(m_files, place.versions(), false, place.text())));
+        highest =
+            std::max(highest, lastUsedUp(walk(m_files, place.versions(), false, place.text())));
     } catch (const StoreFailure& failure) {
         if (!isMissing(failure)) {
             throw;

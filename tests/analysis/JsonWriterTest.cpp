@@ -22,8 +22,9 @@ std::string printed(double value) {
     std::string number(text,
                        static_cast<std::size_t>(std::snprintf(text, sizeof text, "%.6f", value)));
     number.erase(number.find_last_not_of('0') + 1);
-    if (number.back() == '.')
+    if (number.back() == '.') {
         number.pop_back();
+    }
     return number == "-0" ? "0" : number;
 }
 
@@ -37,8 +38,9 @@ TEST(JsonNumbers, AreWhatPrintfRounds) {
         const double half = (static_cast<double>(random() % 1'000'000'000) + 0.5) / 1e6;
         values.insert(values.end(), {half, std::nextafter(half, 0), std::nextafter(half, 1e9)});
     }
-    for (const double value : values)
+    for (const double value : values) {
         ASSERT_EQ(numberText(value), printed(value)) << std::hexfloat << value;
+    }
 
     EXPECT_EQ(numberText(1e300), "1e+300");
     EXPECT_EQ(numberText(std::numeric_limits<double>::infinity()), "null");

@@ -29,8 +29,9 @@ class JudgementTest : public LibraryTest {
     JudgementTest() {
         const std::regex row("\\| ([0-9]+) \\| `(\\w+)` \\| ([0-9]+) \\| ([0-9]+) \\|");
         const std::string docs = support::contentsOf(TINTGATE_SOURCE_DIR "/docs/criteria.md");
-        for (std::sregex_iterator it(docs.begin(), docs.end(), row), end; it != end; ++it)
+        for (std::sregex_iterator it(docs.begin(), docs.end(), row), end; it != end; ++it) {
             documented[(*it)[2]] = {stoi((*it)[1]), stoi((*it)[3]), stoi((*it)[4])};
+        }
         std::fill(std::begin(preset.decimalPlaces), std::end(preset.decimalPlaces), 99);
     }
 
@@ -69,8 +70,9 @@ TEST_F(JudgementTest, EachCriterionLooksAtItsPatches) {
         {"spotMaximum", 10},      {"outerGamutAverage", (1 + 2 + 3 + 3 + 5 + 7 + 8) / 7.0},
         {"outerGamutMaximum", 8}, {"maximum", 42}};
     EXPECT_EQ(verdict(), "incomplete");
-    for (const auto& [name, value] : expected)
+    for (const auto& [name, value] : expected) {
         EXPECT_NEAR(results.values[documented.at(name).value], value, 1e-12) << name;
+    }
     EXPECT_EQ(results.values[106], -1);
     // Each by itself, as a plain preset and as a PSD preset, which has arrays of its own.
     ASSERT_EQ(documented.size(), 21U);

@@ -34,8 +34,9 @@ class Library : public LibraryTest {
         std::vector<std::string> command = {"python3",
                                             TINTGATE_SOURCE_DIR "/tests/analysis/audit.py",
                                             TINTGATE_SOURCE_DIR "/docs/" + schema};
-        for (const std::string& text : texts)
+        for (const std::string& text : texts) {
             command.push_back(scratch.write(std::to_string(command.size()) + ".json", text));
+        }
         const support::Outcome outcome = support::run(command);
         EXPECT_EQ(outcome.exitCode, 0) << outcome.error;
     }
@@ -44,7 +45,7 @@ class Library : public LibraryTest {
 // ArgyllCMS pairs by sample id and we by device values: in one chart that is the same.
 TEST_F(Library, AgreesWithColverifyToSixDecimals) {
     for (const auto& [target, measurement] :
-         {std::pair{"FOGRA28L.ti3", "FOGRA30L.ti3"}, std::pair{"TR006.ti3", "FOGRA39L.ti3"}})
+         {std::pair{"FOGRA28L.ti3", "FOGRA30L.ti3"}, std::pair{"TR006.ti3", "FOGRA39L.ti3"}}) {
         for (const int formula : {0, 4}) {
             const support::Outcome peer = support::run(
                 {"colverify", formula == 4 ? "-k" : "-v", sets + target, sets + measurement});
@@ -55,6 +56,7 @@ TEST_F(Library, AgreesWithColverifyToSixDecimals) {
                           results.values[5]);
             EXPECT_THAT(peer.output, HasSubstr(figures)) << target << measurement;
         }
+    }
 }
 
 TEST_F(Library, WritesSoundResults) {
@@ -154,8 +156,9 @@ TEST_F(Library, GivesOneCodeForOneCause) {
                                   nullptr, nullptr),
               0);
     const std::string rgb = chart("RGB_R RGB_G RGB_B", "1 2 3\n");
-    for (const std::string& path : {lab, inks, profile})
+    for (const std::string& path : {lab, inks, profile}) {
         EXPECT_EQ(validateInputFile(stringToWstring(path)), 0) << path;
+    }
     EXPECT_EQ(validateInputFile(stringToWstring(rgb)), exitNoColourValues);
     EXPECT_EQ(validateInputFile(stringToWstring(rgbProfile)), exitProfileWrongColourSpace);
 }

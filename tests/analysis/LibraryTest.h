@@ -13,8 +13,9 @@
 class LibraryTest : public testing::Test {
   protected:
     ~LibraryTest() override {
-        for (double* array : {record.xyz, record.lab, record.cmyk})
+        for (double* array : {record.xyz, record.lab, record.cmyk}) {
             std::free(array);
+        }
         std::free(record.spectral);
     }
 

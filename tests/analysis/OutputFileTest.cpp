@@ -26,8 +26,9 @@ int statusInChild(const std::string& path, unsigned user, bool diskFull) {
             const rlimit limit{2, 2};
             setrlimit(RLIMIT_FSIZE, &limit);
         }
-        if (user != 0 && !support::becomeUser(user))
+        if (user != 0 && !support::becomeUser(user)) {
             _exit(127);
+        }
         _exit(analysis::writeOutputFile(path, "new"));
     }
     int status = 0;
@@ -82,8 +83,9 @@ TEST(OutputFile, IsWrittenThroughLinks) {
 
 TEST(OutputFile, SaysWhatIsWrongWithThePath) {
     const support::ScratchFolder scratch;
-    for (const std::string& path : {scratch.path(), scratch.path("no/such"), std::string()})
+    for (const std::string& path : {scratch.path(), scratch.path("no/such"), std::string()}) {
         EXPECT_EQ(analysis::writeOutputFile(path, "x"), exitOutputNotWritable) << path;
+    }
     EXPECT_EQ(analysis::writeOutputFile(scratch.path(std::string(255, 'n')), "x"), exitDone);
 }
 

@@ -22,11 +22,13 @@ DataSet setOf(const std::string& line) {
                                        : DeviceSpace::None;
     for (std::string patch; patches >> patch; ++set.patchCount) {
         const std::size_t colon = patch.find(':');
-        if (colon > 0)
+        if (colon > 0) {
             set.ids.push_back(patch.substr(0, colon));
+        }
         std::istringstream values(patch.substr(colon + 1));
-        for (std::string value; std::getline(values, value, ',');)
+        for (std::string value; std::getline(values, value, ',');) {
             set.device.push_back(std::stod(value));
+        }
     }
     set.channels.resize(set.device.size() / set.patchCount);
     return set;
@@ -35,10 +37,12 @@ DataSet setOf(const std::string& line) {
 /// "deviceValues 0 - 2 +0:3": how, each left row's partner, and the right rows that pair again.
 std::string said(const analysis::Pairing& pairing) {
     std::string text = pairedByName(pairing.by);
-    for (const std::uint32_t row : pairing.partner)
+    for (const std::uint32_t row : pairing.partner) {
         text += " " + (row == analysis::noRow ? "-" : std::to_string(row));
-    for (const auto& [left, right] : pairing.again)
+    }
+    for (const auto& [left, right] : pairing.again) {
         text += " +" + std::to_string(left) + ":" + std::to_string(right);
+    }
     return text;
 }
 

@@ -175,13 +175,16 @@ TEST(Presets, OneCodeForOneCause) {
         expect(text.replace(text.find(from), from.size(), to), code);
     }
     std::string deep;
-    for (const char* tag : {"<a>", "</a>"})
-        for (int i = 0; i < 100000; ++i)
+    for (const char* tag : {"<a>", "</a>"}) {
+        for (int i = 0; i < 100000; ++i) {
             deep += tag;
+        }
+    }
     expect(deep, exitPresetWrongKind);
     expect(goodText + std::string(maxPresetBytes, ' '), exitPresetWrongKind);
-    for (const char* noXml : {"", " \n", "CGATS.17\n"})
+    for (const char* noXml : {"", " \n", "CGATS.17\n"}) {
         expect(noXml, exitPresetNotXml);
+    }
 }
 
 TEST(Presets, Files) {
@@ -234,8 +237,9 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
         EXPECT_TRUE(spread(record, options).used);
         EXPECT_EQ(spread(record, options).decimals, 1);
         EXPECT_EQ(settingOf(*criterionOfName("average"), record, options).tolerance, 2.5);
-        if (isThere)
+        if (isThere) {
             std::filesystem::remove(path);
+        }
     }
     // Another file than the last one is read, and must be there.
     change("<psd>no", "<psd>yes");

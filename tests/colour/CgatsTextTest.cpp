@@ -42,15 +42,17 @@ std::string table(const std::string& names, const std::string& rows,
 }
 
 std::string replaced(std::string text, const std::string& what, const std::string& by) {
-    for (std::size_t at = 0; (at = text.find(what, at)) != std::string::npos; at += by.size())
+    for (std::size_t at = 0; (at = text.find(what, at)) != std::string::npos; at += by.size()) {
         text.replace(at, what.size(), by);
+    }
     return text;
 }
 
 std::string notesOf(const DataSet& set) {
     std::string notes;
-    for (const std::string& note : set.notes)
+    for (const std::string& note : set.notes) {
         notes += note + "\n";
+    }
     return notes;
 }
 
@@ -65,8 +67,9 @@ const std::string plain = table(plainNames,
 /// L*, a*, b* of all patches, one behind the other.
 std::vector<double> labsOf(const DataSet& set) {
     std::vector<double> values;
-    for (const Lab& lab : set.lab)
+    for (const Lab& lab : set.lab) {
         values.insert(values.end(), {lab.L, lab.a, lab.b});
+    }
     return values;
 }
 
@@ -75,10 +78,12 @@ std::string deviceOf(const DataSet& set) {
     const char* const spaces[] = {"none", "cmyk", "rgb", "other"};
     std::ostringstream text;
     text << spaces[static_cast<int>(set.deviceSpace)];
-    for (const std::string& channel : set.channels)
+    for (const std::string& channel : set.channels) {
         text << ' ' << channel;
-    for (const double value : set.device)
+    }
+    for (const double value : set.device) {
         text << ' ' << value;
+    }
     return replaced(text.str(), "CMYK_C CMYK_M CMYK_Y CMYK_K", "CMYK");
 }
 
@@ -244,8 +249,9 @@ TEST(CgatsText, TellsIdsAndNames) {
     };
     for (const auto& [columns, cells, id, name] : cases) {
         std::string text = table(columns + " LAB_L LAB_A LAB_B", cells + " 50 0 0\n");
-        if (columns.find('\t') != std::string::npos)
+        if (columns.find('\t') != std::string::npos) {
             text = replaced(replaced(text, " LAB", "\tLAB"), " 50 0 0", "\t50\t0\t0");
+        }
         const DataSet set = readWell(text);
         EXPECT_EQ(set.ids.empty() ? "" : set.ids[0], id) << text;
         EXPECT_EQ(set.names.empty() ? "" : set.names[0], name) << text;
@@ -341,8 +347,9 @@ TEST(CgatsText, DecidesScalesByWholeColumns) {
         {xyz + " LAB_L LAB_A LAB_B", "0.8 0.9 0.7 8.1 0 0\n", 0.9},
         {xyz + " LAB_L LAB_A LAB_B", "0.8 0.9 0.7 96 0 0\n", 90},
     };
-    for (const auto& [columns, rows, Y] : lights)
+    for (const auto& [columns, rows, Y] : lights) {
         EXPECT_EQ(readWell(table(columns, rows)).xyz.at(0).Y, Y) << rows;
+    }
 
     // ArgyllCMS never writes 0 to 1.
     const DataSet blacks = readWell(table("RGB_R RGB_G RGB_B " + xyz, "1 0.5 0 0.5 0.25 0.5\n",
@@ -454,8 +461,9 @@ TEST(CgatsText, CalculatesColoursThatAreStatedForOtherLight) {
                                  "SPECTRAL_600 SPECTRAL_620 SPECTRAL_640 SPECTRAL_660 SPECTRAL_680 "
                                  "SPECTRAL_700";
     std::string halves;
-    for (int i = 0; i < 16; ++i)
+    for (int i = 0; i < 16; ++i) {
         halves += " 0.5";
+    }
     const struct {
         const char* header;
         std::string columns, row;
@@ -467,7 +475,7 @@ TEST(CgatsText, CalculatesColoursThatAreStatedForOtherLight) {
         {"ILLUMINANT D65\n", "", "", false},
         {"ILLUMINANT D65\n", "SPECTRAL_400 SPECTRAL_700", " 0.5 0.5", false}, // too coarse
     };
-    for (const auto& c : cases)
+    for (const auto& c : cases) {
         for (const bool wanted : {false, true}) {
             const DataSet set =
                 readWell(table(labNames + " " + c.columns, "1 70 9 9" + c.row + "\n",
@@ -482,6 +490,7 @@ TEST(CgatsText, CalculatesColoursThatAreStatedForOtherLight) {
             EXPECT_NEAR(again.lab[0].L, set.lab[0].L, 1e-9);
             EXPECT_EQ(again.conditions.areUsual(), c.calculated || set.conditions.areUsual());
         }
+    }
     // Without other values, too: a reader of the set must not take the colours for those of D65.
     const DataSet alone =
         readWell(table("SAMPLE_ID " + spectrum, "1" + halves + "\n", "CGATS.17\nILLUMINANT D65\n"));
@@ -509,8 +518,9 @@ TEST(CgatsText, NamesOneCauseForEachFailure) {
         {table("ID nm400 nm425 nm700", "1 0.1 0.1 0.1\n"), Failure::SpectraUnusable},
         {table("ID nm400 nm410 nm420", "1 0.1 0.1 0.1\n"), Failure::SpectraUnusable},
     };
-    for (const auto& [text, failure] : cases)
+    for (const auto& [text, failure] : cases) {
         EXPECT_EQ(failureOf(text), failure) << text;
+    }
 }
 
 // However a text is cut, its rest never passes for a set: patches would be missing unnoticed.
@@ -533,8 +543,9 @@ TEST(CgatsText, NeverTakesACutTextForAWholeOne) {
 TEST(CgatsText, BearsHostileSizes) {
     const auto many = [](std::size_t count, const std::string& what) {
         std::string text;
-        for (std::size_t i = 0; i < count; ++i)
+        for (std::size_t i = 0; i < count; ++i) {
             text += what;
+        }
         return text;
     };
     const std::string longText = many(2'000'000, "x");
@@ -546,8 +557,9 @@ TEST(CgatsText, BearsHostileSizes) {
         {"CGATS.17\nORIGINATOR \"" + longText, Failure::Damaged},
         {table(labNames, "1 0 0 0\n1 0 " + many(220'000, "0 ") + "0\n"), Failure::Damaged},
     };
-    for (const auto& [text, failure] : failing)
+    for (const auto& [text, failure] : failing) {
         EXPECT_EQ(failureOf(text), failure) << text.substr(0, 80);
+    }
     EXPECT_EQ(readWell(table(labNames, many(20'000, "0 0 0 0 ") + "\n")).patchCount, 20'000U);
     const std::string page = "BEGIN_DATA\n1 50 0 0\nEND_DATA\nBEGIN_DATA\n2 50 0 0\nEND_DATA\n";
     EXPECT_EQ(readWell(table(labNames, "3 50 0 0\n") + many(2500, page)).patchCount, 5001U);
@@ -564,8 +576,9 @@ TEST(CgatsText, ReadsNumbersToTheLastBit) {
     for (int i = 0; i < 90'000; ++i) {
         char text[64];
         double number = value(engine);
-        if (i % 5 == 0)
+        if (i % 5 == 0) {
             number *= std::pow(10, static_cast<double>(engine() % 50) - 43);
+        }
         std::snprintf(text, sizeof text, formats[engine() % std::size(formats)], number);
         rows += std::string(text) + (i % 3 == 2 ? "\n" : " ");
         expected.push_back(std::strtod(text, nullptr));
@@ -576,8 +589,9 @@ TEST(CgatsText, ReadsNumbersToTheLastBit) {
                     {123456.78901234567890, .5, 5., -0., 7.5, 1e9, 1e-27, 0, 12345678});
     const std::vector<double> found = labsOf(readWell(table("LAB_L LAB_A LAB_B", rows)));
     ASSERT_EQ(found.size(), expected.size());
-    for (std::size_t i = 0; i < found.size(); ++i)
+    for (std::size_t i = 0; i < found.size(); ++i) {
         ASSERT_EQ(found[i], expected[i]) << "number " << i;
+    }
 }
 
 TEST(CgatsText, FindsKeywordsInUnfinishedTexts) {
@@ -591,6 +605,7 @@ TEST(CgatsText, FindsKeywordsInUnfinishedTexts) {
         {"# DEVICE 7\nORIGINATOR \"DEVICE 9\"\n", std::nullopt},
         {replaced(plain, "A1 0 0", "DEVICE 3 0") + "DEVICE  M\xFC X  \n", "Mü X"},
     };
-    for (const auto& [text, expected] : cases)
+    for (const auto& [text, expected] : cases) {
         EXPECT_EQ(cgatsKeyword(text, "DEVICE"), expected) << text;
+    }
 }

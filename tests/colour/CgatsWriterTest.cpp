@@ -29,8 +29,9 @@ void expectReadBack(const DataSet& set) {
     EXPECT_EQ(back.conditions, set.conditions);
     EXPECT_EQ(back.originator + back.created, set.originator + set.created);
     EXPECT_EQ(back.descriptor + back.instrumentation, set.descriptor + set.instrumentation);
-    for (const std::string& note : back.notes) // nothing assumed, nothing mended
+    for (const std::string& note : back.notes) { // nothing assumed, nothing mended
         EXPECT_THAT(note, HasSubstr("other conditions than D50"));
+    }
 }
 
 /// Patches with values of full length.
@@ -44,12 +45,14 @@ DataSet randomSet(std::size_t patches) {
     set.axis = {380, 10, 36};
     for (std::size_t i = 0; i < patches; ++i) {
         set.ids.push_back(std::to_string(i + 1));
-        for (int k = 0; k < 4; ++k)
+        for (int k = 0; k < 4; ++k) {
             set.device.push_back(100 * unit(engine));
+        }
         set.lab.push_back({100 * unit(engine), 120 * unit(engine) - 60, 120 * unit(engine) - 60});
         set.xyz.push_back(xyzFromLab(set.lab.back()));
-        for (int k = 0; k < 36; ++k)
+        for (int k = 0; k < 36; ++k) {
             set.spectra.push_back(unit(engine));
+        }
     }
     return set;
 }

@@ -55,8 +55,9 @@ TEST(Difference, AgreesWithLittleCms) {
         const double spread = i % 4 == 0 ? 0.01 : 1; // a quarter of them nearly grey
         const Lab first{lightness(engine), spread * wide(engine), spread * wide(engine)};
         Lab second{lightness(engine), wide(engine), wide(engine)};
-        if (i % 2 == 0)
+        if (i % 2 == 0) {
             second = {first.L + near(engine), first.a + near(engine), first.b + near(engine)};
+        }
         cmsCIELab a{first.L, first.a, first.b};
         cmsCIELab b{second.L, second.a, second.b};
         const std::pair<Formula, double> peers[] = {
@@ -65,8 +66,9 @@ TEST(Difference, AgreesWithLittleCms) {
             {Formula::Cmc11, cmsCMCdeltaE(&a, &b, 1, 1)},
             {Formula::Cmc21, cmsCMCdeltaE(&a, &b, 2, 1)},
         };
-        for (const auto& [formula, expected] : peers)
+        for (const auto& [formula, expected] : peers) {
             ASSERT_NEAR(difference(formula, first, second), expected, 1e-9) << formulaName(formula);
+        }
 
         cmsCIEXYZ other;
         cmsLab2XYZ(nullptr, &other, &a);

@@ -26,8 +26,9 @@ std::vector<double> someInks(std::size_t count) {
     std::uniform_real_distribution<double> percent(0, 100);
     std::vector<double> inks = {0, 0, 0,   0, 100, 0, 0, 0,   0,   100, 0,   0,
                                 0, 0, 100, 0, 0,   0, 0, 100, 100, 100, 100, 100};
-    while (inks.size() < 4 * count)
+    while (inks.size() < 4 * count) {
         inks.push_back(percent(engine));
+    }
     return inks;
 }
 
@@ -36,15 +37,17 @@ std::vector<Lab> ask(const std::string& command, const std::vector<double>& inks
     const support::ScratchFolder folder;
     std::ostringstream lines;
     lines.precision(12);
-    for (std::size_t i = 0; i < inks.size(); ++i)
+    for (std::size_t i = 0; i < inks.size(); ++i) {
         lines << inks[i] * scale << (i % 4 == 3 ? '\n' : ' ');
+    }
     const auto outcome =
         support::run({"sh", "-c", command + " < " + folder.write("inks", lines.str())});
     EXPECT_EQ(outcome.exitCode, 0) << outcome.error;
     std::istringstream answers(outcome.output);
     std::vector<Lab> labs;
-    for (Lab lab; answers >> lab.L >> lab.a >> lab.b;)
+    for (Lab lab; answers >> lab.L >> lab.a >> lab.b;) {
         labs.push_back(lab);
+    }
     return labs;
 }
 
@@ -67,8 +70,9 @@ TEST(Profile, AgreesWithTransiccAndIcclu) {
         const auto labs = evaluate(profile, inks);
         const auto transicc = ask("transicc -n -t3 '-o*Lab4' -i" + path, inks, 1);
         ASSERT_EQ(transicc.size(), labs.size());
-        for (std::size_t i = 0; i < labs.size(); ++i)
+        for (std::size_t i = 0; i < labs.size(); ++i) {
             ASSERT_LE(deltaE76(labs[i], transicc[i]), 0.01) << path << i;
+        }
     }
     Profile profile;
     ASSERT_EQ(profile.open(contentsOf(press)), Failure::None);
@@ -76,8 +80,9 @@ TEST(Profile, AgreesWithTransiccAndIcclu) {
     const auto nodes = evaluate(profile, someInks(6));
     const auto icclu = ask("icclu -v0 -ff -ia -pl " + press, someInks(6), 0.01);
     ASSERT_EQ(icclu.size(), 6U);
-    for (std::size_t i = 0; i < 6; ++i)
+    for (std::size_t i = 0; i < 6; ++i) {
         EXPECT_LE(deltaE76(nodes[i], icclu[i]), 0.01) << i;
+    }
 
     // Further channels behind the four are skipped, and inks beyond 0 and 100 are cut.
     const auto wide = evaluate(profile, {-3, 130, 0, 0, 55, 99, 0, 0, 100, 0, 55, 99}, 6);
@@ -92,8 +97,9 @@ TEST(Profile, OneFailureForOneCause) {
         return text.replace(at, bytes.size(), bytes);
     };
     std::string noTables = good;
-    for (std::size_t at = 0; (at = noTables.find("A2B", at)) != std::string::npos;)
+    for (std::size_t at = 0; (at = noTables.find("A2B", at)) != std::string::npos;) {
         noTables.replace(at, 3, "xxx");
+    }
     const std::pair<std::string, Failure> cases[] = {
         {"", Failure::ProfileDamaged},
         {with(36, "x"), Failure::ProfileDamaged}, // no signature
@@ -104,6 +110,7 @@ TEST(Profile, OneFailureForOneCause) {
         {noTables, Failure::ProfileUnusable},
         {good + std::string(64, '\0'), Failure::None},
     };
-    for (const auto& c : cases)
+    for (const auto& c : cases) {
         EXPECT_EQ(Profile().open(c.first), c.second) << &c - cases;
+    }
 }

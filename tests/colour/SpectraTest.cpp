@@ -25,8 +25,9 @@ double reflectance(int patch, int wavelength) {
 
 std::vector<double> reflectances(int patch, const SpectralAxis& axis) {
     std::vector<double> values;
-    for (int i = 0; i < axis.length; ++i)
+    for (int i = 0; i < axis.length; ++i) {
         values.push_back(reflectance(patch, axis.base + i * axis.step));
+    }
     return values;
 }
 
@@ -37,14 +38,16 @@ std::vector<Lab> askSpec2cie(int patches) {
     text << "CTI3\n\nDEVICE_CLASS \"OUTPUT\"\nCOLOR_REP \"RGB_XYZ\"\nSPECTRAL_BANDS \"471\"\n"
          << "SPECTRAL_START_NM \"360\"\nSPECTRAL_END_NM \"830\"\nNUMBER_OF_FIELDS 478\n"
          << "BEGIN_DATA_FORMAT\nSAMPLE_ID RGB_R RGB_G RGB_B XYZ_X XYZ_Y XYZ_Z";
-    for (int nm = 360; nm <= 830; ++nm)
+    for (int nm = 360; nm <= 830; ++nm) {
         text << " SPEC_" << nm;
+    }
     text << "\nEND_DATA_FORMAT\nNUMBER_OF_SETS " << patches << "\nBEGIN_DATA\n";
     text.precision(12);
     for (int patch = 0; patch < patches; ++patch) {
         text << patch + 1 << " 0 0 0 0 0 0";
-        for (const double value : reflectances(patch, axis))
+        for (const double value : reflectances(patch, axis)) {
             text << ' ' << 100 * value;
+        }
         text << '\n';
     }
     const support::ScratchFolder folder;
@@ -90,6 +93,7 @@ TEST(Spectra, AllAxesAgreeWithSpec2cie) {
 TEST(Spectra, AxesThatCannotServe) {
     const int unusable[][3] = {{380, 10, 0},  {410, 10, 30},        {400, 10, 30},
                                {360, 25, 20}, {2147483647, 1, 400}, {0, 20, 2147483647}};
-    for (const auto& [base, step, length] : unusable)
+    for (const auto& [base, step, length] : unusable) {
         EXPECT_FALSE(spectraUsable({base, step, length})) << base << ' ' << step;
+    }
 }

@@ -14,8 +14,8 @@
 #include <pugixml.hpp>
 
 #include "StoreProgram.h"
-#include "store/StoreEngine.h"
 #include "jdf/JdfHandler.h"
+#include "store/StoreEngine.h"
 
 namespace {
 

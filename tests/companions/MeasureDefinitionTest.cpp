@@ -52,12 +52,14 @@ class StripMaker {
         const bool named = chance(80);
         const bool nameFirst = chance(60);
         Names columns{"SAMPLE_ID"};
-        if (named && nameFirst)
+        if (named && nameFirst) {
             columns.push_back("SAMPLE_NAME");
+        }
         columns.insert(columns.end(), device.begin(), device.end());
         m_needed = columns.size();
-        if (named && !nameFirst)
+        if (named && !nameFirst) {
             columns.push_back("SAMPLE_NAME");
+        }
         const Names references = makeReferences();
         // Some strips have their references first.
         const bool referencesFirst = chance(15);
@@ -70,19 +72,22 @@ class StripMaker {
         m_overInked = !m_isRgb && chance(5);
         strip.names = joined(columns);
         strip.text = "CGATS.17\n";
-        if (chance(50))
+        if (chance(50)) {
             strip.text += "NUMBER_OF_FIELDS " + std::to_string(columns.size()) + "\n";
+        }
         const std::size_t rows = 1 + below(12);
         const std::size_t grid = rows + below(4);
         strip.text += "BEGIN_DATA_FORMAT\n" + strip.names + "\nEND_DATA_FORMAT\n";
         strip.text += "NUMBER_OF_STRIPS 1\nNUMBER_OF_COLS " + std::to_string(grid) +
                       "\nNUMBER_OF_SETS " + std::to_string(rows) + "\nBEGIN_DATA\n";
-        for (std::size_t row = 0; row < rows; ++row)
+        for (std::size_t row = 0; row < rows; ++row) {
             addRow(columns, row, strip);
+        }
         strip.text += "END_DATA\n";
-        for (std::size_t row = rows; strip.dynamic && row < grid; ++row)
+        for (std::size_t row = rows; strip.dynamic && row < grid; ++row) {
             strip.patches.push_back(
                 {std::to_string(row + 1), std::vector<double>(device.size(), m_isRgb ? 100 : 0)});
+        }
         return strip;
     }
 
@@ -107,24 +112,27 @@ class StripMaker {
         default:
             Names spectra;
             const std::string start = pick<std::string>({"SPECTRAL_NM_", "SPECTRAL_", "nm"});
-            for (int nm = 380; nm <= 730; nm += 10)
+            for (int nm = 380; nm <= 730; nm += 10) {
                 spectra.push_back(start + std::to_string(nm));
+            }
             return spectra;
         }
     }
 
     std::string joined(const Names& cells) {
         std::string line;
-        for (const std::string& cell : cells)
+        for (const std::string& cell : cells) {
             line += (line.empty() ? "" : m_tabs ? "\t" : pick<std::string>({" ", "  "})) + cell;
+        }
         return line;
     }
 
     std::string makeName() {
         const Names letters{"ä", "白", "😀", "é", " ", "3"};
         std::string name = "N";
-        for (std::size_t i = below(16); i > 0; --i)
+        for (std::size_t i = below(16); i > 0; --i) {
             name += below(100) < m_foreign ? pick(letters) : "x";
+        }
         name += "n";
         return m_tabs ? name : "\"" + name + "\"";
     }
@@ -175,8 +183,9 @@ class StripMaker {
         strip.text += line + "\n";
         strip.patches.push_back(std::move(patch));
         std::size_t end = 0;
-        for (std::size_t i = 0; i < m_needed; ++i)
+        for (std::size_t i = 0; i < m_needed; ++i) {
             end = line.find(cells[i], end) + cells[i].size();
+        }
         const bool last = m_needed == cells.size();
         strip.wholeRows.push_back(line.substr(0, end) + (last ? "\r" : line.substr(end, 1)));
     }
@@ -232,8 +241,9 @@ TEST(MeasureDefinition, IsReadRightOrRefused) {
             ASSERT_EQ(chart.channels.size(), channels);
             for (std::size_t i = 0; i < chart.patchCount; ++i) {
                 ASSERT_EQ(chart.ids[i], strip.patches[i].id);
-                for (std::size_t k = 0; k < channels; ++k)
+                for (std::size_t k = 0; k < channels; ++k) {
                     ASSERT_NEAR(chart.device[i * channels + k], strip.patches[i].device[k], 1e-9);
+                }
             }
             ASSERT_EQ(result.condition, round % 5 == 0 ? "" : "M" + std::to_string(round % 5 - 1));
         } catch (const measuring::Failure& failure) {

@@ -86,8 +86,9 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         const colour::DataSet set = measured(definition, settings);
         EXPECT_EQ(patchesText(set), "1: 100 0 0 0; 2: 40 27 27 0; 3: 0 0 0 0; 4: 0 0 0 0; ");
         std::vector<double> b;
-        for (const colour::Lab& measuredLab : set.lab)
+        for (const colour::Lab& measuredLab : set.lab) {
             b.push_back(measuredLab.b);
+        }
         EXPECT_THAT(b, testing::ElementsAre(-50, 2, -2, -3));
         const bool states = c.text.starts_with(made);
         EXPECT_EQ(set.conditions.measurement, states ? "M1" : "");

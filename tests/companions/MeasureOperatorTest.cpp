@@ -34,14 +34,16 @@ class Desktop {
         std::istringstream(bus.output) >> m_address >> m_busNumber;
         EXPECT_GT(m_busNumber, 0) << bus.error;
         m_thread = std::thread([this] { serve(); });
-        while (!m_ready)
+        while (!m_ready) {
             std::this_thread::sleep_for(std::chrono::milliseconds(5));
+        }
     }
     ~Desktop() {
         m_stopped = true;
         m_thread.join();
-        if (m_busNumber > 0)
+        if (m_busNumber > 0) {
             kill(m_busNumber, SIGTERM);
+        }
     }
     Desktop(const Desktop&) = delete;
     Desktop& operator=(const Desktop&) = delete;
@@ -95,9 +97,11 @@ class Desktop {
                                  "org.freedesktop.Notifications", table, this);
         EXPECT_GE(sd_bus_request_name(bus, "org.freedesktop.Notifications", 0), 0);
         m_ready = true;
-        while (!m_stopped)
-            if (sd_bus_process(bus, nullptr) == 0)
+        while (!m_stopped) {
+            if (sd_bus_process(bus, nullptr) == 0) {
                 sd_bus_wait(bus, 20'000);
+            }
+        }
         sd_bus_flush_close_unref(bus);
     }
 
@@ -151,8 +155,9 @@ TEST_F(MeasureTool, TellsTheOperatorWhoseTurnItIs) {
           std::string("1:30 left"), "Not accepted: " + path + problem + "\r\n",
           "Measure strip.it8 and export it again as " + path, std::string("1:28 left"),
           std::string("Measuring 1 patches, the first is 100 0 0 0"),
-          std::string("Patch 1 of 1    100 0 0 0    L*a*b* 22.00 0.00 0.00\r\n")})
+          std::string("Patch 1 of 1    100 0 0 0    L*a*b* 22.00 0.00 0.00\r\n")}) {
         EXPECT_THAT(outcome.output, HasSubstr(words));
+    }
 }
 
 // A desktop that does not answer, or none, costs at most a moment.

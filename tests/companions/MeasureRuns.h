@@ -39,8 +39,9 @@ inline std::string crlf(const std::string& text) {
 /// A definition of these patches, such as "100\t0\t0\t0".
 inline std::string definitionOf(const std::vector<std::string>& patches) {
     std::string lines;
-    for (std::size_t i = 0; i < patches.size(); ++i)
+    for (std::size_t i = 0; i < patches.size(); ++i) {
         lines += std::to_string(i + 1) + "\t" + patches[i] + "\n";
+    }
     return crlf(head + format(cmyk) + "DEVICE 33\n" + begin + lines + end);
 }
 
@@ -50,8 +51,9 @@ inline std::string patchesText(const colour::DataSet& set) {
     const std::size_t channels = set.channels.size();
     for (std::size_t patch = 0; patch < set.patchCount; ++patch) {
         text << set.ids[patch] << ':';
-        for (std::size_t i = 0; i < channels; ++i)
+        for (std::size_t i = 0; i < channels; ++i) {
             text << ' ' << std::round(100 * set.device[patch * channels + i]) / 100;
+        }
         text << "; ";
     }
     return text.str();

@@ -89,10 +89,11 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
     };
     for (const auto& [text, patches, exitCode, words] : cases) {
         SCOPED_TRACE(text);
-        if (exitCode != 0)
+        if (exitCode != 0) {
             expectFailure(measure(crlf(text), virtualPrint), exitCode, words);
-        else
+        } else {
             EXPECT_EQ(patchesText(measured(crlf(text), virtualPrint)), patches);
+        }
     }
     const std::string two = table(cmyk, "1\t100\t0\t0\t0\n2\t40\t27\t27\t0\n" + end);
     EXPECT_EQ(patchesText(measured(support::utf16(crlf(two), "BE"), virtualPrint)), simple);
@@ -101,9 +102,10 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
 TEST_F(MeasureTool, SpectraHaveTheColourMeasured) {
     const std::string steps[] = {"0", "50", "100"};
     std::vector<std::string> grid;
-    for (int i = 0; i < 81; ++i)
+    for (int i = 0; i < 81; ++i) {
         grid.push_back(steps[i / 27] + "\t" + steps[i / 9 % 3] + "\t" + steps[i / 3 % 3] + "\t" +
                        steps[i % 3]);
+    }
     const colour::DataSet set =
         measured(definitionOf(grid), virtualPrint + "spectra = yes\nerror = 1\n");
     ASSERT_EQ(set.axis.base, 380);
@@ -125,8 +127,9 @@ TEST_F(MeasureTool, ErrorsHaveTheirSizeAndCanBeRepeated) {
     const std::string settings = virtualPrint + "error = 2\nbias = 1 -2 0.5\n";
     const colour::DataSet set = measured(definition, settings);
     double size = 0;
-    for (const colour::Lab& lab : set.lab)
+    for (const colour::Lab& lab : set.lab) {
         size += colour::deltaE76(lab, {printed.L + 1, printed.a - 2, printed.b + 0.5}) / 4000;
+    }
     EXPECT_NEAR(size, 2, 0.06);
     EXPECT_THAT(set.instrumentation, HasSubstr("Virtual")); // Nobody is to take it for real.
 
@@ -162,8 +165,9 @@ TEST_F(MeasureTool, IsCancelledBySignals) {
     for (const auto& c : cases) {
         SCOPED_TRACE(c.blocked);
         support::RunOptions run = environmentWith(c.settings);
-        if (c.settings.empty())
+        if (c.settings.empty()) {
             run.environment["TINTGATE_MEASURE"] = pipe;
+        }
         const std::string path = c.options.empty() ? pipe : m_folder.write("options", c.options);
         const auto start = std::chrono::steady_clock::now();
         expectFailure(
@@ -227,8 +231,9 @@ TEST_F(MeasureTool, KeepsItsLogAndNobodyElsesFile) {
                 testing::MatchesRegex("20[^ ]*Z the instrument failed at patch 1, [^\n]*\n"));
     EXPECT_EQ(logAfter(old, virtualPrint), ""); // Nothing to report.
     for (const std::string& other :
-         {std::string("CGATS.17\nand more than a time\n"), old.substr(1)})
+         {std::string("CGATS.17\nand more than a time\n"), old.substr(1)}) {
         EXPECT_EQ(logAfter(other, fails), other);
+    }
     // The measurement itself may have the name.
     std::string options = support::contentsOf(writeOptions());
     options.replace(options.find(m_output), m_output.size(), m_logPath);

@@ -409,9 +409,9 @@ TEST_F(TintgateStore, IsReadWhereItCannotBeWritten) {
             return support::run(arguments, options);
         };
         EXPECT_EQ(runThere({"file", "put", much, "chart"}).exitCode, refusal);
-        EXPECT_EQ(runThere({"key", "set", "job/7", "big", "string", std::string(120'000, 'x')})
-                      .exitCode,
-                  refusal);
+        EXPECT_EQ(
+            runThere({"key", "set", "job/7", "big", "string", std::string(120'000, 'x')}).exitCode,
+            refusal);
         EXPECT_TRUE(runThere({"export"}).output == exported);
         EXPECT_EQ(runThere({"file", "get", "chart", "-"}).output, "old");
         EXPECT_EQ(runThere({"info"}).exitCode, 0);

@@ -30,8 +30,9 @@ class Viewer : public testing::Test {
   protected:
     Viewer() {
         m_scratch.makeFolder("Größe a b");
-        for (const char* name : {"meta.json", "output.json"})
+        for (const char* name : {"meta.json", "output.json"}) {
             std::filesystem::copy_file(data + name, m_folder + "/" + name);
+        }
     }
 
     support::Outcome show(const support::RunOptions& options = withoutDisplay()) const {
@@ -53,8 +54,9 @@ TEST_F(Viewer, ShowsTheVerdictAndRunsNothingOfATicket) {
                 "<img src='data:,' onerror=\"document.documentElement.lang='ran'\">");
     const support::Outcome seen = support::browse(m_scratch, m_scratch.write("altered.html", page));
     std::size_t stopped = 0;
-    for (std::size_t at = 0; (at = seen.error.find("CONSOLE", at)) != seen.error.npos; ++at)
+    for (std::size_t at = 0; (at = seen.error.find("CONSOLE", at)) != seen.error.npos; ++at) {
         ++stopped;
+    }
     EXPECT_EQ(stopped, 3u) << seen.error;
     for (const char* part :
          {R"(<html lang="en")", R"(<h2 id="word">Failed</h2>)",
@@ -64,18 +66,21 @@ TEST_F(Viewer, ShowsTheVerdictAndRunsNothingOfATicket) {
           R"(<p>2 patches &lt;svg onload=hostile()&gt; have no counterpart.</p>)",
           R"(<dd>'"&gt;&lt;img src=x onerror=hostile()&gt;</dd>)",
           R"(<td>=2+5 "&gt;&lt;img src=x onerror=hostile()&gt; (100&nbsp;0&nbsp;0&nbsp;0)</td>)",
-          R"(<output id="range">1–4 of 4</output>)"})
+          R"(<output id="range">1–4 of 4</output>)"}) {
         EXPECT_THAT(seen.output, HasSubstr(part));
-    for (const char* part : {"<img src=\"x", "<svg"})
+    }
+    for (const char* part : {"<img src=\"x", "<svg"}) {
         EXPECT_THAT(seen.output, Not(HasSubstr(part)));
+    }
 
     // The worst patch leads the table, with both its colours and all its numbers.
     const std::size_t table = seen.output.find("<tbody>", seen.output.find("id=\"patches\""));
     const std::string first = seen.output.substr(table, seen.output.find("</tr>", table) - table);
     for (const char* part : {"<td class=\"patch\">=2+5 <span class=\"name\">", "100 0 0 0",
                              "55.00 -37.00 -50.00", "52.00 -35.00 -46.00", ">-3.00<", ">+2.00<",
-                             ">+4.00<", "difference\">4.75</td>", "beyond what an sRGB screen"})
+                             ">+4.00<", "difference\">4.75</td>", "beyond what an sRGB screen"}) {
         EXPECT_THAT(first, HasSubstr(part));
+    }
 }
 
 TEST_F(Viewer, NamesWhatTheServerDoesNotHave) {
@@ -139,8 +144,9 @@ TEST_F(Viewer, SortsFindsAndSavesPatches) {
           "\nA1,paper,0,0,0,0,95,0,-2,95,0.5,-3,1.25,A1,paper",
           "\n'=2+5,\"\"\"&gt;&lt;img src=x "
           "onerror=hostile()&gt;\",100,0,0,0,55,-37,-50,52,-35,-46,4.75",
-          "\n,,0,0,100,0,89,-5,93,88,-4,90,1.5", "\nA4,,0,0,0,100,16,0,0,,0,0,,A4,\r\n"})
+          "\n,,0,0,100,0,89,-5,93,88,-4,90,1.5", "\nA4,,0,0,0,100,16,0,0,,0,0,,A4,\r\n"}) {
         EXPECT_THAT(seen.output, HasSubstr(part));
+    }
 }
 
 // As results are written now: a patch with other labels on the sheet, and what leaves a doubt.
@@ -173,8 +179,9 @@ TEST_F(Viewer, ShowsWhereAPatchIsOnTheSheetAndWhatIsInDoubt) {
                              "counterpart.</li>",
                              "measurement not stated, target M1, preset requires M2</p>",
                              "1 patch, 2 readings; each is compared by itself",
-                             "0.50 ΔE00, B3 &lt;b&gt;Gelb (0&nbsp;0&nbsp;100&nbsp;0)"})
+                             "0.50 ΔE00, B3 &lt;b&gt;Gelb (0&nbsp;0&nbsp;100&nbsp;0)"}) {
         EXPECT_THAT(seen.output, HasSubstr(part));
+    }
 }
 
 TEST_F(Viewer, ListsAPageARunAndPassesOverWhatIsNone) {
@@ -208,8 +215,9 @@ TEST_F(Viewer, OpensThePageWhereThereIsADisplay) {
     options.environment["PATH"] = m_scratch.path() + ":/usr/bin:/bin";
     options.environment["OPENED"] = opened;
     EXPECT_EQ(show(options).exitCode, 0);
-    for (int waited = 0; waited < 1000 && !support::exists(opened); ++waited)
+    for (int waited = 0; waited < 1000 && !support::exists(opened); ++waited) {
         usleep(10'000);
+    }
     EXPECT_EQ(support::contentsOf(opened), m_page);
     options.environment["PATH"] = m_folder;
     std::swap(options.environment["DISPLAY"], options.environment["WAYLAND_DISPLAY"]);
@@ -242,8 +250,9 @@ TEST_F(Viewer, SaysWhatIsWrongAndLeavesNoPage) {
     expectFailure(3);
     std::filesystem::remove(meta);
     expectFailure(2);
-    for (const char* word : {"-detail", "-meta", "-meta-detail"})
+    for (const char* word : {"-detail", "-meta", "-meta-detail"}) {
         EXPECT_EQ(support::run({VIEWER, word}, withoutDisplay()).exitCode, 64) << word;
+    }
 }
 
 } // namespace

@@ -15,8 +15,9 @@ using namespace colour;
 namespace {
 
 void require(bool condition, const char* what) {
-    if (condition)
+    if (condition) {
         return;
+    }
     std::fprintf(stderr, "broken: %s\n", what);
     std::abort();
 }
@@ -52,8 +53,9 @@ void checkWriting(const DataSet& set) {
         return std::abs(xyz.X) > 1e9 || std::abs(xyz.Y) > 1e9 || std::abs(xyz.Z) > 1e9;
     });
     require(failure == Failure::None || isLarge, "reading back");
-    if (failure != Failure::None)
+    if (failure != Failure::None) {
         return;
+    }
     require(back.patchCount == set.patchCount, "patches read back");
     require(back.channels == set.channels && back.device == set.device, "device read back");
     require(set.ids.empty() || back.ids == set.ids, "ids read back");
@@ -81,8 +83,9 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         require(looksLikeCgats(bytes), "recognised");
     }
     DataSet some;
-    if (readCgats(bytes, {false}, some) == Failure::None)
+    if (readCgats(bytes, {false}, some) == Failure::None) {
         checkWhole(some);
+    }
     cgatsKeyword(bytes, "DEVICE");
     return 0;
 }

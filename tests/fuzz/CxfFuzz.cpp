@@ -48,7 +48,8 @@ void checkWhole(const DataSet& set) {
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     const std::string_view bytes(reinterpret_cast<const char*>(data), size);
-    for (const CgatsWants& wants : {CgatsWants{}, CgatsWants{.spectra = false, .condition = "M2"}}) {
+    for (const CgatsWants& wants :
+         {CgatsWants{}, CgatsWants{.spectra = false, .condition = "M2"}}) {
         DataSet set;
         if (readCxf(bytes, wants, set) == Failure::None) {
             checkWhole(set);

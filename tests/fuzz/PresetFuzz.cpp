@@ -10,8 +10,9 @@
 namespace {
 
 void require(bool condition) {
-    if (!condition)
+    if (!condition) {
         std::abort();
+    }
 }
 
 } // namespace
@@ -29,11 +30,14 @@ extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size
         return 0;
     }
     require(record.presetID >= 0 && !record.name.empty());
-    for (const double value : record.presetValues)
+    for (const double value : record.presetValues) {
         require(value >= 0 && value <= 1000);
-    for (const double value : record.psdPresetValues)
+    }
+    for (const double value : record.psdPresetValues) {
         require(value >= 0 && value <= 1000);
-    for (const int places : record.decimalPlaces)
+    }
+    for (const int places : record.decimalPlaces) {
         require(places >= 0 && places <= 10);
+    }
     return 0;
 }

@@ -15,10 +15,10 @@
 #include "SuiteRoot.h"
 #include "TicketText.h"
 #include "cli/CLogger.h"
+#include "job/KZVerifyJobProcessor.h"
 #include "store/StoreEngine.h"
 #include "store/StoreKeep.h"
 #include "store/Users.h"
-#include "job/KZVerifyJobProcessor.h"
 
 class JobOnStore : public testing::Test {
   protected:

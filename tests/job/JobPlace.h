@@ -118,9 +118,7 @@ class Place {
         return support::run(words, options);
     }
 
-    support::Outcome run(const Call& call = {}) const {
-        return run(words(call));
-    }
+    support::Outcome run(const Call& call = {}) const { return run(words(call)); }
 
     /// The messages of the job's log, with marks for the folders; empty where there is none.
     std::string log() const {
@@ -131,9 +129,7 @@ class Place {
         return std::regex_replace(text, std::regex(address), "STORE");
     }
 
-    std::shared_ptr<store::StoreEngine> engine() const {
-        return store::openStore(address);
-    }
+    std::shared_ptr<store::StoreEngine> engine() const { return store::openStore(address); }
 
     /// Changes a ticket, in the words of TicketText.h.
     void set(const std::string& records, int id = 7, int type = 3) const {

@@ -61,6 +61,7 @@ TEST(PlugIn, IsLoadedOnceAndOnlyAsItIsListed) {
         EXPECT_EQ(open(root.path(name + "/")), plugIn);
         EXPECT_EQ(firstInstance(plugIn) != nullptr, &c == cases) << name;
     }
-    for (const std::string& path : {root.path("Missing.Bundle"), root.path(), std::string()})
+    for (const std::string& path : {root.path("Missing.Bundle"), root.path(), std::string()}) {
         EXPECT_EQ(open(path), nullptr);
+    }
 }

@@ -24,8 +24,9 @@ TEST(Drift, AveragesAsTheHandbookDoes) {
                                            49.38, 49.92, 50.73, 51.23, 51.94, 51.99};
     const std::vector<double> averages = movingAverage(data, 50, 0.3);
     ASSERT_EQ(averages.size(), published.size());
-    for (std::size_t i = 0; i < published.size(); ++i)
+    for (std::size_t i = 0; i < published.size(); ++i) {
         EXPECT_NEAR(averages[i], published[i], 0.006) << i;
+    }
     EXPECT_THAT(movingAverage({1, none, 1}, 0, 0.5), ElementsAre(0.5, 0.5, 0.75));
 }
 

@@ -40,8 +40,9 @@ TEST(Swatch, IsTheColourThatLittleCmsShows) {
         cmsDoTransform(transform, colour, rgb, 1);
         const Swatch s = swatch({colour[0], colour[1], colour[2]});
         const double ours[3] = {double(s.red), double(s.green), double(s.blue)};
-        for (int channel = 0; channel < 3; ++channel)
+        for (int channel = 0; channel < 3; ++channel) {
             EXPECT_NEAR(ours[channel], 255 * std::clamp(rgb[channel], 0.0, 1.0), 1.0);
+        }
         // Well inside or outside, so that rounding can't decide.
         const auto [least, most] = std::minmax({rgb[0], rgb[1], rgb[2]});
         if (least < -0.01 || most > 1.01) {
@@ -52,8 +53,9 @@ TEST(Swatch, IsTheColourThatLittleCmsShows) {
         }
     }
     EXPECT_GT(inside, 500);
-    for (const double bad : {none, 1e308, -1e308})
+    for (const double bad : {none, 1e308, -1e308}) {
         EXPECT_TRUE(swatch({bad, bad, bad}).clipped);
+    }
     cmsDeleteTransform(transform);
     cmsCloseProfile(lab);
     cmsCloseProfile(srgb);
@@ -77,8 +79,9 @@ TEST(Histogram, HasFewRoundBinsThatHoldEveryNumber) {
         EXPECT_NEAR(histogram[0].to / width, 1, 1e-9);
         EXPECT_EQ(histogram[0].count, first);
         std::size_t counted = 0;
-        for (const Bin& bin : histogram)
+        for (const Bin& bin : histogram) {
             counted += bin.count;
+        }
         EXPECT_EQ(counted, sum);
     }
 }
@@ -90,16 +93,18 @@ Criterion criterion(const char* name, double tolerance, double value, Outcome ou
     c.used = name != std::string("unused");
     c.outcome = outcome;
     c.tolerance = tolerance;
-    if (std::isfinite(value))
+    if (std::isfinite(value)) {
         c.value = c.rounded = value;
+    }
     return c;
 }
 
 Result resultOf(std::size_t patches) {
     Result result;
     result.formula = "CIE2000";
-    for (std::size_t i = 0; i < patches; ++i)
+    for (std::size_t i = 0; i < patches; ++i) {
         result.patches.push_back({std::to_string(i + 1), "", {50, 0, 0}, {50, 1, 0}, double(i)});
+    }
     return result;
 }
 
@@ -164,8 +169,9 @@ TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
     const std::string meta = support::contentsOf(data + "meta.json");
     const std::string time = "2024-05-01T12:34:56+02:00";
     EXPECT_EQ(dateText(readMeta(meta, problem)->created), "1 May 2024, 12:34 (UTC+02:00)");
-    for (const char* other : {"../../../../etc/cron.d/xxx", "2024-05-01T12:34:56Z", ""})
+    for (const char* other : {"../../../../etc/cron.d/xxx", "2024-05-01T12:34:56Z", ""}) {
         EXPECT_FALSE(readMeta(with(meta, time, other), problem)) << other;
+    }
 }
 
 } // namespace

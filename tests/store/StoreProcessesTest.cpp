@@ -26,8 +26,8 @@ class NumberedWrites {
     };
 
     NumberedWrites()
-        : m_done(*new (mmap(nullptr, sizeof(Done), PROT_READ | PROT_WRITE,
-                            MAP_SHARED | MAP_ANONYMOUS, -1, 0)) Done{}) {}
+        : m_done(*new(mmap(nullptr, sizeof(Done), PROT_READ | PROT_WRITE,
+                           MAP_SHARED | MAP_ANONYMOUS, -1, 0)) Done{}) {}
     ~NumberedWrites() { munmap(&m_done, sizeof(Done)); }
     NumberedWrites(const NumberedWrites&) = delete;
 

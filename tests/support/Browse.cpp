@@ -13,8 +13,9 @@ Outcome browse(const ScratchFolder& scratch, const std::string& page) {
                              "--disable-sync --enable-logging=stderr --virtual-time-budget=5000 "
                              "--dump-dom");
     std::vector<std::string> command(std::istream_iterator<std::string>(words), {});
-    if (geteuid() == 0)
+    if (geteuid() == 0) {
         command.emplace_back("--no-sandbox");
+    }
     command.push_back("--user-data-dir=" + scratch.path("browser"));
     command.push_back("file://" + page);
     return run(command);

@@ -35,8 +35,9 @@ TEST(LocaleSettings, AsksTheVariablesInTheirOrder) {
         {{nullptr, "xx:fi"}, 59}, // only LANGUAGE is a list
     };
     for (const auto& [values, number] : cases) {
-        for (int i = 0; i < 4; ++i)
+        for (int i = 0; i < 4; ++i) {
             values[i] == nullptr ? unsetenv(names[i]) : setenv(names[i], values[i], 1);
+        }
         EXPECT_EQ(LocaleSettings::MacGetUserLocale(), number);
     }
 }

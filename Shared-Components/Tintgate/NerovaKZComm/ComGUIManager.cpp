@@ -5,11 +5,11 @@
 #include <wx/filename.h>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/RefusingPlugIn.h"
+#include "base/WideBytes.h"
 #include "jobkeys/Tickets.h"
 #include "measure/Helper.h"
 #include "platform/PlugIn.h"
 #include "platform/SystemRoot.h"
-#include "base/WideBytes.h"
 #include "text/CharSets.h"
 #include "text/CharSetsWx.h"
 #include "text/StringUtilsComGUI.h"
@@ -106,8 +106,7 @@ void ComGUIManager::RefuseFromNowOn() {
 std::wstring ComGUIManager::PlugInPath() {
     std::wstring suite = Helper::GetHWBInstallationPath().ToStdWstring();
     if (suite.empty()) {
-        suite =
-            base::wideFromBytes(platform::systemRoot()); // What follows is a fixed path then.
+        suite = base::wideFromBytes(platform::systemRoot()); // What follows is a fixed path then.
     }
     return suite + static_cast<wchar_t>(wxFileName::GetPathSeparator()) + L"lib/" + pszLibName;
 }

@@ -168,7 +168,7 @@ class ComGUIManager {
                     void (*append)(Array&, Value));
 
     static ComGUIManager* m_pInstance;
-    static bool m_bAcceptNotification; ///< Written only (C110).
+    static bool m_bAcceptNotification;               ///< Written only (C110).
     static ComGUIModuleInterface** m_givenInterface; ///< Of UseInterface, or null.
 
     std::unique_ptr<ComSessionRecord> m_record;

@@ -23,8 +23,9 @@ const std::string data = TINTGATE_SOURCE_DIR "/tests/data/report/";
 class ReportProgram : public testing::Test {
   protected:
     ReportProgram() {
-        for (const char* name : {"meta.json", "output.json"})
+        for (const char* name : {"meta.json", "output.json"}) {
             fs::copy_file(data + name, m_scratch.path(name));
+        }
     }
 
     static support::Outcome report(std::vector<std::string> words,
@@ -80,8 +81,9 @@ TEST_F(ReportProgram, SummarisesForATerminal) {
     for (const char* part :
          {"Failed  Größe \"7\"", "1 of 2 criteria are above tolerance.",
           "Solid cyan            4.75  of 3.00  ΔE00  1.75 above", "95th percentile 4.75",
-          "  4.75  =2+5 ", "ΔL* -3.00  Δa* +2.00  Δb* +4.00", "! 2 patches <svg"})
+          "  4.75  =2+5 ", "ΔL* -3.00  Δa* +2.00  Δb* +4.00", "! 2 patches <svg"}) {
         EXPECT_THAT(plain.output, HasSubstr(part));
+    }
     EXPECT_THAT(plain.output, Not(HasSubstr("\x1b")));
 
     // A title must not reach the terminal as a command to it.
@@ -124,13 +126,13 @@ TEST_F(ReportProgram, ExplainsExitCodes) {
     };
     for (const ExitCodeText& code : exitCodeTexts) {
         const std::string words = explained(code.code);
-        EXPECT_THAT(words, AllOf(HasSubstr(code.meaning), HasSubstr(code.cause),
-                                 HasSubstr(code.remedy)));
+        EXPECT_THAT(words,
+                    AllOf(HasSubstr(code.meaning), HasSubstr(code.cause), HasSubstr(code.remedy)));
         EXPECT_EQ(words.find(" Job ") != std::string::npos, code.jobActor != nullptr) << words;
         if (code.jobActor != nullptr) {
-            EXPECT_THAT(words, AllOf(HasSubstr(code.jobCause), HasSubstr(code.jobActor),
-                                     HasSubstr(code.jobRetry),
-                                     HasSubstr("tintgate-store diagnose")));
+            EXPECT_THAT(words,
+                        AllOf(HasSubstr(code.jobCause), HasSubstr(code.jobActor),
+                              HasSubstr(code.jobRetry), HasSubstr("tintgate-store diagnose")));
             // A cause that is the same in a job is not repeated.
             EXPECT_EQ(words.find(code.jobCause), words.rfind(code.jobCause)) << words;
         }

@@ -94,8 +94,9 @@ class StoreTrend : public StoreProgram {
                                      {{"type", 27}, {"id", 7}, {"keys", name}}};
         for (int job = 1; job <= jobs; ++job) {
             tickets.push_back(jobOf(job));
-            if (changes.count(job) > 0)
+            if (changes.count(job) > 0) {
                 tickets.back()["keys"].merge_patch(changes.at(job));
+            }
         }
         import(tickets);
     }
@@ -277,8 +278,9 @@ TEST_F(StoreTrend, CountsTheResultOfASheetOnce) {
         tickets.push_back(jobOf(3));
         tickets.back()["id"] = id;
         tickets.back()["keys"]["Input/Title"] = {{"string", "Sheet " + std::to_string(id)}};
-        if (id != 30)
+        if (id != 30) {
             tickets.back()["keys"]["General/ParentID"] = {{"int", 30}};
+        }
     }
     import(tickets);
     EXPECT_THAT(text(), HasSubstr("13 results"));

@@ -38,8 +38,9 @@ class Tidy : public testing::Test {
         const auto set = [&](const fs::path& path) {
             EXPECT_EQ(utimensat(AT_FDCWD, path.c_str(), times, AT_SYMLINK_NOFOLLOW), 0) << path;
         };
-        for (const auto& entry : fs::recursive_directory_iterator(folder))
+        for (const auto& entry : fs::recursive_directory_iterator(folder)) {
             set(entry.path());
+        }
         set(folder);
     }
 
@@ -71,8 +72,9 @@ TEST_F(Tidy, RemovesOldFoldersOfJobsAndNothingElse) {
     fs::create_directory_symlink(elsewhere, path("JobID_4/inner/folder"));
     makeOld(path("JobID_4"), 40);
     fs::create_directory_symlink(elsewhere, path("JobID_5"));
-    for (const char* name : {"JobID_6 copy", "JobID_", "JobID_x", "other"})
+    for (const char* name : {"JobID_6 copy", "JobID_", "JobID_x", "other"}) {
         makeJob(name);
+    }
     makeJob(".tidy-JobID_7"); // Of a call that was cut off.
 
     const std::string dry = tidy({"30", "--dry-run"}).output;
@@ -81,11 +83,13 @@ TEST_F(Tidy, RemovesOldFoldersOfJobsAndNothingElse) {
     EXPECT_TRUE(support::exists(path("JobID_1/inner/file")));
 
     EXPECT_EQ(tidy({"30"}).exitCode, 0);
-    for (const char* gone : {"JobID_1", "JobID_4", "JobID_7", ".tidy-JobID_7"})
+    for (const char* gone : {"JobID_1", "JobID_4", "JobID_7", ".tidy-JobID_7"}) {
         EXPECT_FALSE(support::exists(path(gone))) << gone;
+    }
     for (const char* kept : {"JobID_2/inner/file", "JobID_3/output.json", "JobID_5/file",
-                             "JobID_6 copy/inner/file", "JobID_", "JobID_x", "other"})
+                             "JobID_6 copy/inner/file", "JobID_", "JobID_x", "other"}) {
         EXPECT_TRUE(support::exists(path(kept))) << kept;
+    }
     EXPECT_TRUE(support::exists(precious));
     EXPECT_THAT(tidy({"30"}).output, HasSubstr("0 of 2 folders removed"));
 }
@@ -122,15 +126,17 @@ TEST_F(Tidy, KeepsWhatAProcessUsesOrNames) {
 }
 
 TEST_F(Tidy, SaysWhatItCantDo) {
-    for (const char* days : {"0", "-1", "x", "1e9"})
+    for (const char* days : {"0", "-1", "x", "1e9"}) {
         EXPECT_EQ(tidy({days}).exitCode, 64) << days;
+    }
 
     // A number that no tool on this machine has, since those of root tell this user no folder.
     makeJob("JobID_987001");
     fs::permissions(path("JobID_987001/inner"), fs::perms(0555));
     fs::permissions(m_scratch.path(), fs::perms(0777));
-    for (const auto& entry : fs::recursive_directory_iterator(m_scratch.path()))
+    for (const auto& entry : fs::recursive_directory_iterator(m_scratch.path())) {
         support::giveTo(support::ordinaryUser, entry.path());
+    }
     makeOld(path("JobID_987001"), 40);
     const support::Outcome outcome = tidy({"30"}, support::ordinaryUser);
     EXPECT_EQ(outcome.exitCode, 10);

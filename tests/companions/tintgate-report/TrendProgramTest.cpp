@@ -46,11 +46,13 @@ class Trend : public testing::Test {
             std::string meta = support::contentsOf(data + "meta.json");
             meta = replaced(meta, "2024-05-01", "2024-05-" + twoDigits(job));
             meta = replaced(meta, "4711", std::to_string(job));
-            if (job <= 5)
+            if (job <= 5) {
                 meta = replaced(meta, "\"'\\\"><img src=x onerror=hostile()>\"", "\"Gloss\"");
+            }
             m_scratch.write(folder + "/meta.json", meta);
-            if (job == 11)
+            if (job == 11) {
                 result = replaced(result, "\"tolerance\":3,", "\"tolerance\":2.25,");
+            }
             m_scratch.write(folder + "/output.json",
                             replaced(result, "[52,", "[" + std::to_string(52 + 0.5 * job) + ","));
         }
@@ -63,13 +65,15 @@ class Trend : public testing::Test {
 
 TEST_F(Trend, ShowsADriftAndLeadsToEachJob) {
     ASSERT_EQ(support::run({VIEWER, "-meta", m_rooms + "/JobID_7/meta.json"}).exitCode, 0);
-    for (int times = 0; times < 2; ++times) // Making it all again adds nothing.
+    for (int times = 0; times < 2; ++times) { // Making it all again adds nothing.
         ASSERT_EQ(report({m_rooms, "-o", m_page}).exitCode, 0);
+    }
     const fs::path pages = m_scratch.path("trend-jobs");
     EXPECT_EQ(std::distance(fs::directory_iterator(pages), {}), jobs - 1);
-    for (int job = 8; job <= jobs; ++job)
+    for (int job = 8; job <= jobs; ++job) {
         EXPECT_TRUE(fs::exists(pages / ("job-" + std::to_string(job) + "-strip2-2024-05-" +
                                         twoDigits(job) + "-123456.html")));
+    }
 
     const support::Outcome seen = support::browseHandled(m_scratch, m_page, R"(
         const choose = (i) => document.querySelectorAll("#series button")[i].click();
@@ -101,10 +105,12 @@ TEST_F(Trend, ShowsADriftAndLeadsToEachJob) {
           "<a href=\"./rooms%20%231/JobID_7/report-strip2-2024-05-07-123456.html\">",
           "<td>24 May 2024, 12:34</td>", "<td>Solid cyan 4.75 of 2.25</td>",
           "[second: Too few jobs 1–5 of 5 Gloss]", "[charts: 3]", "[failed: 1–5 of 5]",
-          "[none: None found]"})
+          "[none: None found]"}) {
         EXPECT_THAT(seen.output, HasSubstr(part));
-    for (const char* part : {"<img", "<svg", "hostile()</script"})
+    }
+    for (const char* part : {"<img", "<svg", "hostile()</script"}) {
         EXPECT_THAT(seen.output, Not(HasSubstr(part)));
+    }
 }
 
 TEST_F(Trend, TakesWhatTheFiltersLetThrough) {
