@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Target against measurement: which files, which patches, which differences.
 #pragma once
 

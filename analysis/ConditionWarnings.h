@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whether target, measurement and preset are about the same light, observer and instrument filter.
 #pragma once
 

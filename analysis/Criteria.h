@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a comparison is judged by: one table, from which presets, results and docs take their words.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the inks of a comparison are called.
 #pragma once
 

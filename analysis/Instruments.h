@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Display names of measuring instruments.
 #pragma once
 

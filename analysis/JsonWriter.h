@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ASCII JSON, written as the wide text that callers of the library get.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A comparison judged by the criteria of a preset.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Lab values of a profile for the device values of a chart.
 #pragma once
 

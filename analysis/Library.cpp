@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The ten functions. Nothing is thrown out of them: another program's code waits behind.
 #include <exception>
 #include <filesystem>

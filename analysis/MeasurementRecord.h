@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The measured patches as the job's record holds them.
 #pragma once
 

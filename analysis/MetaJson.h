@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What is known of a job beside its colours, for the viewer; docs/meta.schema.json describes it.
 #pragma once
 

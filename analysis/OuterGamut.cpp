@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The list is CMYK_ISO_12647-7_outer_gamut.ti1 of DisplayCAL (github.com/RomanHargrave/displaycal,
 // DisplayCAL/ref, added 2017-08-29). The file states no edition of the standard. Its entries follow
 // the rules below: paper, ramps of one ink, pairs of inks, and with black the colours that have

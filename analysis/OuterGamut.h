@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The patches of the outer gamut: 226 sets of process colours that proofs are judged by.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writing a file so that what stood there before is lost only to something whole.
 #pragma once
 

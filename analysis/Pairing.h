@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which patch of one data set is which of another.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a patch is by its device values: paper, a solid, a grey and so on.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // <?xml version="1.0" encoding="UTF-8"?>
 // <tolerancePreset version="1">
 //   <id>1</id>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tolerance presets as XML files. docs/presets.md states the format for whoever writes one.
 #pragma once
 

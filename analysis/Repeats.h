@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Patches that were measured more than once.
 #pragma once
 

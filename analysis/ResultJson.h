@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The result of a comparison as JSON text; docs/result.md and docs/result.schema.json describe it.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which status of the library a failure of a colour file is.
 #pragma once
 

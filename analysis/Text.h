@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The two text forms at the library's boundary: bytes as the file system has them, and wide text of
 // one 32-bit unit a character.
 #pragma once

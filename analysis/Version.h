@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Versions as the results state them. The build gives them.
 #pragma once
 

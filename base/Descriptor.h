@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An open file, folder or pipe.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files that appear whole or not at all.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Memory that crosses a boundary which allocates with malloc and frees with free.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Shared objects that are opened on demand.
 #pragma once
 

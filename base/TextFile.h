@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Wide text as a file of bytes.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Bytes as wide text and back: paths and arguments pass through wide strings unchanged.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What benchmarks of any folder share.
 #pragma once
 

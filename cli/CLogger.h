@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The program's only log writer: a plain text trace for support, without levels or rotation.
 //
 //     Mon, 24.11.2025 09:30:05:	argument 1: -version

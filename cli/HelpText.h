@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What "-help" prints. Callers know it to the byte, its spelling included (C1).
 #pragma once
 

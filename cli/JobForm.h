@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The job form, in a module of its own: the file forms start without what only a job needs.
 #pragma once
 

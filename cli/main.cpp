@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Entry point. There is no option parser: the number of arguments alone decides what is done, and
 // each argument is read by its position. All that is printed goes to standard output, and a failure
 // shows as the exit code only. Callers rely on both (C2).

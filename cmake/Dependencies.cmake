@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # Everything from outside comes from Debian's packages; scripts/setup.sh installs them.
 
 find_package(PkgConfig REQUIRED)

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # docs/exit-codes.csv is the one place that states exit codes, and docs/job-outcomes.csv the one that
 # states what they ask of whom in a job. "ExitCodes.h" is made from both.
 

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # What an installation holds, and the Debian packages made of it by scripts/package.sh: tintgate (the
 # tool, presets, pages), libtintgate1 (the analysis library), libtintgate-dev (its headers),
 # tintgate-comgui (the comm plug-in) and tintgate-companions (the programs beside the tool).

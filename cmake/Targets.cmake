@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # Targets that see no more than stands behind their arrows.
 #
 # Includes are written from the root of the tree ("ticket/PartialMode.h"), yet the root itself is on

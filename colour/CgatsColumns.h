@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the columns of a table mean, told from their names as instruments, profilers and
 // spreadsheets write them.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Statements as they are met:
 //
 //     ILLUMINANT "D50"                              OBSERVER "CIE 2 degree"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Illuminant, observer and measurement condition from what a header says of them.
 #pragma once
 

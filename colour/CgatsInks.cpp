@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Statements as they are met:
 //
 //     LGOMCCHANNEL05 "InkName = 'Orange' InkSample = '[0.4 0.3 0.1]'"

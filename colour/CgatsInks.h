@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Names of the inks beside C, M, Y and K, from where a header states them reliably.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The small grammar below CGATS text: line ends, blanks, words, quotes, keyword lines, character
 // sets.
 #pragma once

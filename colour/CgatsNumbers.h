@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Numbers as they stand in the cells of a table.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // From the tables of a text to one data set: joining, scales, and values worked out from others.
 #pragma once
 

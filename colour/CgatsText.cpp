@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // CGATS text, as it should be:
 //
 //     CGATS.17

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading CGATS.17 / IT8 text as it is met in the wild, and writing it as the standard has it.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A file that names colour: CGATS text, CxF3 or ICC profile, told apart by its bytes, never by its
 // name.
 #pragma once

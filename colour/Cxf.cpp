@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A CxF3 file, as far as it is read:
 //
 //     <cc:CxF xmlns:cc="http://colorexchangeformat.com/CxF3-core">

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading CxF3 (ISO 17972-1), the XML that today's instruments and their programs export.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The objects of a CxF3 file: what each one holds, under which conditions it was measured.
 #pragma once
 

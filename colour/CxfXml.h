@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // XML of colour exchange files: checked before it is parsed, and its elements known by namespace.
 #pragma once
 

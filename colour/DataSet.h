@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A set of patches as a reader gives it and a comparison takes it.
 #pragma once
 

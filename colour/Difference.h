@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Colour differences, under the names and in the notation of the literature.
 #pragma once
 

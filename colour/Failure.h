@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Why a colour file could not be used. One word for one cause; the library turns each into its
 // code.
 #pragma once

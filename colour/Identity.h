@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which colours a file asks for, as one short text: equal texts are equal targets.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An ICC profile for CMYK, evaluated absolute colorimetric (D50, 2 degrees).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // XYZ from reflectances after ASTM E308: one weight for each wavelength and coordinate.
 //
 // The weights are worked out for the axis at hand in the manner of ASTM E2022, which the printed

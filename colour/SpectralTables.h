@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The figures of the CIE that XYZ is made from.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Text files in UTF-16, as some export programs on desktop systems write them.
 #pragma once
 

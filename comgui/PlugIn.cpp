@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // ComGUI.Bundle's shared object: the table of operations, and the function that makes its object.
 //
 // Instances, sessions and tickets that come back from outside are looked up before anything is done

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One login to a store.
 #pragma once
 

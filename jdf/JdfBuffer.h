@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Searching and changing a text in one fixed buffer. A JDF file is updated as text, so that all
 // that the update does not understand stays byte for byte.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A JDF file in memory, with room to grow.
 #pragma once
 

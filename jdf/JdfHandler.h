@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writing a measurement and its result into a job's JDF file.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The element that carries one measurement:
 //
 //     <tazo:Measurement Date="2024-05-31" Time="13:37:00" Comment="Remote confirmation M1"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The boundary to libTintgate: ten functions, linked by name, and the two records that exist for
 // them. Another vendor's library may stand in the place of ours, so the order and the widths of all
 // members are a contract, those of members that nothing here touches included (C27).

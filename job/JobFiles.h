@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files of a job's folder.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // All that is known of one job. The records cross the boundary to libTintgate (see
 // AnalysisLibrary.h): the order and the widths of all members are a contract (C27).
 #pragma once

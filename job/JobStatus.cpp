@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Closing a job's verification on the server.
 #include "cli/CLogger.h"
 #include "job/JobTicket.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One ticket of the server, as the job logic reads and writes it.
 #pragma once
 

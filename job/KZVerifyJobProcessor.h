@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The object that carries one job of a print server from its arguments to its result code.
 #pragma once
 

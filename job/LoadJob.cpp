@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Loading a job: what its ticket says, and the files that it names.
 //
 // The steps keep this order (C29), and so does what becomes of their codes: most reads replace

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The two steps that only a job to be measured takes: measuring it, and handing its result back.
 #include <cstdlib>
 #include <utility>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The way of a job from its arguments to its result code. Its folder stays (C26).
 #include <algorithm>
 #include <chrono>

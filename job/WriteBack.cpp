@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The result of one strip, written to its job: into the JDF, where the job's workflow asks for it,
 // and into the ticket, under the keys of the strip.
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The keys by which clients choose jobs, and what their values mean.
 #pragma once
 

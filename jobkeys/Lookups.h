@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where a ticket names a job's control strip, references and JDF. A lookup asks for texts with
 //
 //   std::string text(const std::string& key);     empty if the ticket has no text of this key

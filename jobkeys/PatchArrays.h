@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The arrays in which a ticket stores a strip's patches, below the root of the measurement or of
 // its references. Each key is one column, with one element for each patch.
 #pragma once

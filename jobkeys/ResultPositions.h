@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The server's 27 positions of a result (C87). A ticket's array "Values/Measured" has a value at
 // each of them, and "Values/Approval" and "Values/Decimal" have what belongs to it. Under a preset
 // of the PSD kind "Values/PSDApproval" and "Values/PSDDecimal" replace these two, with ten

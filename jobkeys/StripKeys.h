@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The keys of a job's ticket that differ between its two control strips. They come in two families:
 // those below "Remote/Measurement/", which read "Remote/Measurement2/" for the second strip, and
 // those that end in a "2" for the second strip. Keys that both strips share are written where they

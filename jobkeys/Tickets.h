@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which tickets there are, and the names that follow from their ids.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Text files of control strips, line by line, as the definition for the measuring tool is made from
 // them.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the measuring tool is told to measure: a text made from the job's control-strip file,
 // keyword by keyword. Every line ends in "\r\n":
 //

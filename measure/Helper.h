@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The companion applications around the tool: the measuring tool "NerovaMeasure", the viewer
 // "Nerova Verify" and the Hue Workbench suite, in whose folder the comm plug-in lives.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // An option's name and its value take a line each. The password is always there, and it alone is
 // quoted (C60):
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The options file of the measuring tool.
 #pragma once
 

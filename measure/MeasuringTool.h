@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How a job's language reaches the measuring tool.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The values of instruments lie in a few powers of ten, where 128 bits hold all that rounding has
 // to know. That takes less than half the time of the C++ library's conversion, which does all the
 // others.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #pragma once
 
 /// Room for "-1.2345678e-308", which has all that a number text can have.

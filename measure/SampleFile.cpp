@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The text file in which a job's stored values go to the analysis. Its lines end in "\n", its
 // columns are parted by tabs:
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The values that a job's ticket holds for one of its strips, measured or reference, as the record
 // wants them: one array of a key in the ticket is one column of the record.
 #include <algorithm>

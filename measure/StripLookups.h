@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where the control strip and the references of a job come from: the part of a load that finds them
 // and fetches them into the job's folder.
 #pragma once

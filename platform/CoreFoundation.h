@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Handles of the desktop platform's core library, as far as this program needs them.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Strings of the desktop platform: UTF-16 inside, any known encoding outside.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the user's session says about languages.
 #pragma once
 

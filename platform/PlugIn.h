@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Loading of plug-ins. A plug-in is a bundle, that is a folder:
 //
 //   ComGUI.Bundle/

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The running applications of this user.
 //
 // An application is a live process of this user whose executable lies below the system root, or

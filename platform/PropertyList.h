@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Property lists, in which the suite says where its parts are installed and bundles say what they
 // offer. XML:
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The folder that stands in for "/" where the suite's fixed paths are concerned.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whether a row of figures still stands where it began.
 #pragma once
 

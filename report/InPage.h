@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How data stand in a page.
 #pragma once
 

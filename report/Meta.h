@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What is known of a job beside its colours, read back from its JSON (docs/meta.schema.json).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Everything that the page of a report says, worked out of a result and, for a job, its meta file.
 // The page itself (page.html, page.js) places, sorts and draws, and works nothing out.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The page of one report, and the index of many: HTML in one piece that fetches nothing.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The reports that lie on this machine.
 #pragma once
 

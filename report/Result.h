@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The result of a comparison, read back from its JSON (docs/result.md).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One result as a point in time: what a trend is made of.
 #pragma once
 

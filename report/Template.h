@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The pages' HTML as the build assembles it (embed.py), cut where the data goes in.
 #pragma once
 

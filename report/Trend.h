@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Everything that the page of a trend says, worked out of many results. The page itself
 // (trend.html, trend.js) places and draws, and works nothing out.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The page of a trend: HTML in one piece that fetches nothing.
 #pragma once
 

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Assembles the pages and writes them as C++ source.
 
 embed.py FOLDER CHART_JS OUTPUT

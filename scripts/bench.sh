@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Times the parts and the whole program against their peers; takes about five minutes on a machine
 # that does nothing else.
 set -euo pipefail

@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Builds everything with the second compiler and with each build type, as somebody does who knows no
 # preset. Installs each build and runs a job there. Takes an hour on two cores; build/variants-NAME
 # is kept. The names of variants as arguments select some of them.

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Runs the file forms of the tool on real data and shows what came out.
 
 demo.py TINTGATE FOLDER

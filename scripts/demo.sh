@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Builds the tool and shows it at work on real data: characterisations of printing conditions, and
 # CMYK profiles, as Debian ships them. First it compares files, then it verifies the jobs of a print
 # room. What comes out stays in build/demo.

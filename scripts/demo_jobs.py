@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Verifies jobs of a print server: makes a store with real data, runs the tool on each job as a
 client does, and shows what came out.
 

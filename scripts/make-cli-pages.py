@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Makes a manual page or a bash completion of what a program says to --help, its commands included,
 so that neither can tell anything else than the program.
 

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Makes whatever states exit statuses of the companion programs from docs/companion-statuses.csv:
 the header that the programs and their help use, and the lists in their pages of docs/.
 

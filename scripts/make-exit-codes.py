@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Makes whatever states exit codes, so that each is described in one place: docs/exit-codes.csv
 describes the codes, docs/job-outcomes.csv beside it what those that a job can end with ask of whom.
 

@@ -1,4 +1,5 @@
 #!/bin/sh
+# SPDX-License-Identifier: Apache-2.0
 # Runs the tests of the ticket library and its engine under valgrind, leaks included.
 # Needs a release build (scripts/test.sh makes one) and Debian's package valgrind.
 set -eu

@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Builds the Debian packages; they stand in build/package.
 set -euo pipefail
 cd "$(dirname "$0")/.."

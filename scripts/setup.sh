@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Installs the Debian packages for building, testing and the demo; quick where all are there.
 set -euo pipefail
 
@@ -9,7 +10,7 @@ packages=(
   libexpat1-dev libpq-dev libjs-chart.js libsystemd-dev
   # To test and to measure
   libgtest-dev libgmock-dev libbenchmark-dev python3-jsonschema argyll liblcms2-utils chromium
-  postgresql pgbouncer dbus
+  postgresql pgbouncer dbus clang-format-16 clang-tidy-16
   # Data of printing conditions, and CMYK profiles
   icc-profiles-free libgs-common
 )

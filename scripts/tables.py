@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """What the makers of lists of codes have in common: reading a CSV file, writing its texts into C++,
 manual pages and Markdown, and replacing the made part of a page that is otherwise written by hand.
 """

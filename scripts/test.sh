@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Builds everything and runs all tests: as it is delivered, then under the address and
 # undefined-behaviour sanitizers. Names of presets as arguments choose others.
 set -euo pipefail

@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Tries what `cmake --install` put into a prefix. Verifies a job with nothing in the environment that
 # leads to a suite: measured by the virtual instrument, then shown. Then builds the example of the
 # library's users against the installed headers and library.

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Has many processes verify many jobs of one store at the same time, and checks that each job is
 closed exactly when it should be, that nothing is lost and nothing is done twice.
 

@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Installs the packages of scripts/package.sh in a fresh Debian 12 without a compiler, and verifies a
 # job there: measured by the virtual instrument, then shown. Then installs a compiler and builds the
 # example of libtintgate-dev. Needs root, debootstrap and a mirror.

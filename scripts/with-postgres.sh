@@ -1,4 +1,5 @@
 #!/usr/bin/env bash
+# SPDX-License-Identifier: Apache-2.0
 # Gives a command a PostgreSQL server of its own:
 #
 #   with-postgres.sh COMMAND ARGUMENT...     starts a server, runs the command, stops the server

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The kinds of places that stores are in, and what is the same in each.
 #pragma once
 

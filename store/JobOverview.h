@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The keys by which clients choose jobs, which a store keeps a second time: narrow, and of all jobs
 // together.
 //

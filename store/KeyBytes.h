@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The bytes in which a store keeps the elements of one key:
 //
 //   01                                version

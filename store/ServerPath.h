@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Server paths: which of them name a file of a store.
 #pragma once
 

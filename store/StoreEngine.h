@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Where a store's tickets, users and files are kept: the one interface behind which a database is
 // known. What a table does to a ticket is said above it, by TicketContent.
 #pragma once

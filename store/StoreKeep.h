@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The tickets of a store, as a session's container asks for them.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Who may log in to a store.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writes that a server did not take, kept for people: exit codes and a run's log do not mention
 // them. A text file in the temporary folder has a line for each, with tabs between its parts:
 //

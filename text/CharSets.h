@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Between the user interface's code page and the text on the wire, and byte filters (C164).
 //
 // On this platform the code page conversions are empty (C147): text passes unchanged, and

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Between the strings of the user side ("Controls", in the application encoding) and those of the
 // comm plug-in and its server ("Io", UTF-8). Some serve other programs only (C165).
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The language of the machine's user, in three numberings (C167).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Rounding, comparing with a tolerance, and turning doubles into integers without overflow (C168).
 #pragma once
 

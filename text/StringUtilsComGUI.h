@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Strings between wide characters (one 32-bit unit each) and 8 bits, and small helpers (C166).
 #pragma once
 

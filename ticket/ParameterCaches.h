@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Sets of values whose stored elements keep their addresses until the set is cleared. They let a
 // table of pointers outlive the variables of those who filled it, and store what is equal once.
 #pragma once

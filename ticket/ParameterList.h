@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A table of parameters in the making, which owns all that it points to (C162).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The records in which parameters cross the plug-in boundary. Values, sizes and offsets are a
 // contract with plug-ins that were built without these headers (C95).
 #pragma once

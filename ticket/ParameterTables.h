@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tables of parameter records: making, copying, and asking what became of them (C158).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which keys of a ticket are of interest: exact keys, and prefixes with a trailing `*` (C159).
 #pragma once
 

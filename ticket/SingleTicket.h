@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Views on one ticket's record, which add what the plug-in does not offer: strings, vectors,
 // arrays, booleans and file names.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A set of key prefixes of which none begins with another.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Views on the container of a session: the parameters of its tickets, and the tickets (C161).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What must be sent to turn one ticket's table into another's.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tickets that belong to no container: scratch and delta tickets (C160).
 #pragma once
 

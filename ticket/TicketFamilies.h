@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading and writing typed values, vectors and arrays, once for both ways to reach a ticket.
 //
 // A vector costs two calls of the plug-in, its count and one table, whatever its length. `Place` is

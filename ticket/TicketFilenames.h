@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // File names in tickets have forward slashes, whatever system they come from.
 #pragma once
 

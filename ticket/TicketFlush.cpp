@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The flush of a TICKET_UPDATE_LIST: per ticket, what the server holds is compared with what it
 // should hold, and the difference is sent as one table.
 #include "ticket/ParameterList.h"

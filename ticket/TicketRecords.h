@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The records of functions through which a plug-in gives out its tickets. Each is an array of
 // 64-bit words whose numbers are a contract (C95); words not named here belong to the plug-in.
 #pragma once

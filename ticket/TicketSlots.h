@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The parameters of one ticket, reached in either of two ways: what is written over these works for
 // a ticket of its own and for one inside a container.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Who wants to know which addresses of tickets a flush replaced.
 #pragma once
 

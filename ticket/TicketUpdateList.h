@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Changes to tickets, held back until a flush sends what differs to the server (C163).
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 #include "ticket/TicketUpdateLog.h"
 
 clTICKET_UPDATE_LOG::clTICKET_UPDATE_LOG(const char*) {}

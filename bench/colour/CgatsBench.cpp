@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading CGATS text against a bare loop that splits the same bytes and calls strtod.
 #include <algorithm>
 #include <chrono>

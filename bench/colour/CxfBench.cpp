@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reading CxF3 against pugixml's own parse of the same bytes.
 #include <cstdio>
 #include <cstdlib>

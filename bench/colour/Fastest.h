@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How long a piece of work takes at best.
 #pragma once
 

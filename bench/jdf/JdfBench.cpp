@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Updating a JDF file, against the least that any update must do: read the file, insert the text
 // once, write the file.
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Writing a measurement back, against the same tables made beforehand and sent straight to the
 // plug-in's tickets: 1,617 patches with spectra, through the real bundle and into a real store.
 #include <algorithm>

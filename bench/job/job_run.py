@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Times a whole run of the job form against the comparison of the same two files.
 
 job_run.py BUILD SOURCE

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The text files of a job. The sample file, against a C++ stream that writes the same text; the
 // definition, against a bare walk over the strip's lines that writes each one anew.
 #include <algorithm>

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Makes results as a print room has them after some months, with the tool itself.
 
 make-results.py TINTGATE PRESET FOLDER COUNT [--seed N]

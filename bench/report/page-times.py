@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Times the page of a trend of 2,000 results against that of one result, in headless Chromium.
 
 page-times.py TINTGATE TINTGATE_REPORT PRESET [--results N] [--pairs N] [--keep FOLDER]

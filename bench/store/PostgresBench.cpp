@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A store on a PostgreSQL server through the real bundle and the manager, against statements that
 // are sent with libpq by hand. Run by scripts/with-postgres.sh, for a server of its own.
 #include <memory>

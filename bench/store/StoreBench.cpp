@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The store through the real bundle and the manager, against bare SQLite and bare loops.
 #include <cstdlib>
 #include <cstring>

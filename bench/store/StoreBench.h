@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the benchmarks of stores share.
 //
 // The two sides of a ratio run by turns, each at its best of several, so that a machine that is

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Times a run of the job form in stores of growing size, against the run in a store of 100 jobs.
 
 job_growth.py BUILD SOURCE [JOBS...]

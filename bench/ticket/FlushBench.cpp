@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A flush that changes one element in each of many vectors: what it costs an element, at growing
 // numbers of elements. A flush that walked a vector once for each change would show a rising
 // figure.

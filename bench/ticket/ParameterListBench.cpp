@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Filling a parameter list, against bare sets that take the same keys and values.
 #include <algorithm>
 #include <chrono>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What any program on the wx base library costs to start and end: the measure for -version.
 
 #include <wx/string.h>

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Times the whole program against its peers, and prints ratios.
 
 ratios.py TINTGATE EMPTY_WX PRESET [--quick]

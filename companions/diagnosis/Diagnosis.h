@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Why a job's run fails, or gives a wrong result: the tool's own code run on the job up to where a
 // measurement would start, and its reads judged.
 #pragma once

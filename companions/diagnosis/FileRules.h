@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What follows if a file of a job does not come, or if its name is one that the job's folder can't
 // hold beside the others.
 #pragma once

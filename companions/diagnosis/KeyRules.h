@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What follows if a key of a job is missing or not readable.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the suite lacks on this machine.
 #pragma once
 

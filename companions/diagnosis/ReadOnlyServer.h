@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A store as a server that records what it is asked and changes nothing.
 #pragma once
 

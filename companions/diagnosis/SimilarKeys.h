@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Keys that look like another one, for misspelt names.
 #pragma once
 

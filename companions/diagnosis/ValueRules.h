@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Values of a job's keys that are there and can be read, and still are not what a run needs.
 #pragma once
 

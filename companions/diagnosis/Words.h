@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Texts and numbers of findings.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The person's way to end a measurement: Ctrl-C, a closed terminal, or an application that asks for
 // it (SIGINT, SIGHUP, SIGTERM).
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A row that loses two bytes, because its name has two more bytes than characters:
 //
 //     SAMPLE_ID SAMPLE_NAME CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B

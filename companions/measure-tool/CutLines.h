@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tables of definitions, whose lines the writer may have cut.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A definition, all lines ending in CR LF but the last:
 //
 //     CGATS.17

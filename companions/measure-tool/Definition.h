@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The definition of the patches, as the tool writes it for whoever measures.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A measurement that an instrument's own software has exported.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // How a run of the measuring tool ends.
 #pragma once
 

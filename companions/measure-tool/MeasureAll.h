@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One measurement, from the first patch to the last.
 #pragma once
 

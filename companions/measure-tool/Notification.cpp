@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Desktop Notifications Specification 1.2.
 #include "companions/measure-tool/Notification.h"
 

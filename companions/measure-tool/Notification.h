@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A notification on the operator's desktop.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The person who is to measure and export.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The options file: a line with a name, a line with its value, and so on. Nothing is escaped; the
 // value of -pwd alone stands in quotes.
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which measured patch is which of the patches asked for.
 #pragma once
 

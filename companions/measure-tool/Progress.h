@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a person at a terminal sees of a measurement.
 #pragma once
 

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # Run at installation: writes the property lists, whose paths are absolute and hold the root.
 get_filename_component(_root "${CMAKE_INSTALL_PREFIX}" ABSOLUTE)
 if(_root MATCHES "[\"'$`\\\\]")

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // From XYZ back to a reflectance that has it.
 #pragma once
 

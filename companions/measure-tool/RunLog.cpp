@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // 2024-05-01T12:34:56Z Waiting for /srv/exports/measurement.txt, until 2024-05-01T12:49:56Z
 // 2024-05-01T12:40:02Z Not accepted: there are 40 patches where 48 were asked for
 #include "companions/measure-tool/RunLog.h"

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a run reports, kept in a file: the standard error of a program that another one starts is
 // often lost.
 #pragma once

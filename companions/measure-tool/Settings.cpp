@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The settings file: UTF-8 lines of a name and a value.
 //
 //     # A printer that drifts towards yellow

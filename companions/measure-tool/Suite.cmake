@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 # One folder with a whole suite: `cmake --install BUILD --component companions --prefix ROOT` makes
 # a system root, which TINTGATE_ROOT then names.
 #

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Prints patches through a profile, and measures the print.
 #pragma once
 

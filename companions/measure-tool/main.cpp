@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Measures the patches of a definition. Below the system root this program stands at
 // "/Applications/Nerova/NerovaMeasure.app/Contents/MacOS/NerovaMeasure", and a property list of the
 // Library leads the tool to it.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The command of the property-list reader: "Print" and the way to an entry.
 //
 //   Print :installed_path

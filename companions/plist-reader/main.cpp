@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Prints one value of a property list. Below the system root this program stands at
 // usr/libexec/Plistbuddy, where the tool looks for it.
 #include <cstdio>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tolerance presets, checked for whoever writes one.
 #pragma once
 

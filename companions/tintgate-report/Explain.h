@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Exit codes of the tool, explained.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Results in files, with the meta file that belongs to each, and where the output goes.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Which results a trend is made of.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Pages that the viewer has made on this machine.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The patches of a result for a spreadsheet or a script.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Who uses the folders of jobs right now.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Presets and instruments of a store's jobs, from the server's files.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A result, or the trend of many, in a few lines for a terminal.
 #pragma once
 

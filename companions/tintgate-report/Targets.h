@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the jobs of a store were aimed at.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Text for a terminal.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a job's ticket holds under its keys.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Old folders of jobs, removed.
 #pragma once
 

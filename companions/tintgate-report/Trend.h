@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The trend of many results, from files or a store.
 #pragma once
 

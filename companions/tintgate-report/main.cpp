@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Reports for people who have result files or a store: pages, trends, terminal summaries, patches
 // as CSV, verdicts for scripts, and what exit codes mean.
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Bytes as text: base64, UTF-8, and what a terminal may be shown.
 #pragma once
 

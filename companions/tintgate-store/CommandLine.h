@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Commands and their options, as the command line knows them. The parser behind them is a library
 // of headers that takes longer to compile than any command, so only CommandLine.cpp and main see
 // it.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The commands of tintgate-store. Each group of them is one source file.
 #pragma once
 

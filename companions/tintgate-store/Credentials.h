@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Names and passwords of users, in the bytes in which a login brings them: one for each character.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What one key holds, as JSON. A key is a run of elements, or a list of runs where types differ or
 // there are holes:
 //

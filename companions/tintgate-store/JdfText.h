@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A JDF's text, made such that updates leave it whole.
 //
 // The update of a JDF works on text, and its delete is none: it doubles what it was to take away

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The JDF of a job in its store: before its updates, and after those that went wrong.
 #pragma once
 

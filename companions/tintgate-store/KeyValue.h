@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the reader of one value finds in a key: its first element, where that has the wanted type.
 #pragma once
 

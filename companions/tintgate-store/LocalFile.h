@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Files of the machine that the program runs on.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a command shows: a table for people, or JSON for scripts.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tickets by the names that people give them.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tickets as a JSON file (docs/ticket.schema.json):
 //
 //   {

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The places of an XML document's elements in its text, for changes that leave all else as it is.
 #pragma once
 

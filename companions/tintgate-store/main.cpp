@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The administration tool of a store: users, tickets, files and jobs.
 #include <algorithm>
 #include <csignal>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the server does not have of a job's result.
 #pragma once
 

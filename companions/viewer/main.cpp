@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Shows a verified job: makes a page of its result and opens it. Below the system root this program
 // stands at "/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify", where the tool
 // looks for it.

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Makes a complete job for a store: tickets, and the files that they name.
 
 By itself the job asks whether a print on super-calendered paper (measured: FOGRA40L) keeps to the

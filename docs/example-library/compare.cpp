@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Compares a measurement with a target under a tolerance preset, as a program that uses
 // libTintgate. With libtintgate-dev installed:
 //

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // PostgreSQL's client library, loaded when a store on a server is opened: with all that it brings,
 // it takes three times as long to load as the rest of the plug-in, and who works with a folder has
 // no use for it.

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A connection to a PostgreSQL server, its statements, and failures as StoreFailure.
 //
 // Statements are sent several at a time where one does not need what another gives, so that they

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A store in the database of a PostgreSQL server; PostgresSchema.cpp has its tables.
 //
 // What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction: it locks

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The files of a store in a PostgreSQL database, which are there for every machine that reaches the
 // server. A delivery is one transaction, so that nothing is ever left of one that was cut off.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Some keys of all tickets of a type, from a PostgreSQL server in one go.
 #pragma once
 

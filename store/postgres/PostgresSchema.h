@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The tables of a store in a PostgreSQL database. All stand in the schema "tintgate", which the
 // statements name, so that nobody's search path counts.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Who may use what is in a store's folder.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A SQLite connection and its statements, with failures as StoreFailure.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A store in one folder on a local disk:
 //
 //   tickets.db      tickets and users, a SQLite database in WAL mode (with tickets.db-wal and -shm

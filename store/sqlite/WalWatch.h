@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whether a SQLite database in WAL mode has had a commit.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tickets that live as long as the process.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One ticket behind the record of functions through which callers reach it.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The tickets of a server, as one session reaches them.
 #pragma once
 

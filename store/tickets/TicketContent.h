@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What a ticket holds, with the rules by which it is read and changed.
 #pragma once
 

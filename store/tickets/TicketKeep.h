@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The place where the tickets of a server are kept.
 #pragma once
 

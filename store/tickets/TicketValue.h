@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One value of a ticket, as the plug-in keeps it.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tickets that belong to no container, and the factory that makes them for callers.
 #pragma once
 

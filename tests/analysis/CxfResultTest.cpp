@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // One measurement as CGATS text and as CxF3 gives one result.
 #include "LibraryTest.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The library through its functions, on texts that a test writes.
 #pragma once
 

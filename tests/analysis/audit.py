@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Checks documents of the library: audit.py SCHEMA DOCUMENT...
 
 Each document must be ASCII JSON without NaN or infinity and fit the schema. Of a result, the figures

@@ -1,3 +1,4 @@
+# SPDX-License-Identifier: Apache-2.0
 """What a verdict must be, worked out in the plainest way: every rule of docs/criteria.md and
 docs/result.md by itself, without regard to time, and nothing taken from the program.
 

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Verdicts of the whole program: verdicts.py TINTGATE SCRATCH_FOLDER
 
 Each case is a pair of charts and a preset with the verdict that they must get and the warnings that

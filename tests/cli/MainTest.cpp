@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The program as its callers see it: arguments in; exit code, standard output and files out.
 
 #include <filesystem>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Stands in the place of libTintgate, as another vendor's library could. It writes each call to the
 // file that CALLS names, and answers as the environment says: VALIDATE, LAB, PARSE and ANALYZE are
 // statuses, JSON is the result's text.

@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Writes one measurement as CGATS text and as CxF3, in several forms.
 
 cxf_samples.py CHARACTERISATION.ti3 FOLDER

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The real bundle, loaded by the real loader and used through the connector.
 #include <cstdlib>
 #include <cstring>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A suite in a system root of the test's own, with the scripted plug-in as its comm bundle.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A comm plug-in whose answers a test sets and whose calls it reads. It is a shared object in a
 // bundle; its tickets are those of the real engine. Slots go by their numbers.
 #pragma once

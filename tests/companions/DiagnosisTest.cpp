@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Broken jobs: what is changed in a sound job, the exit code that the tool then ends with, and the
 // words by which tintgate-store names the cause.
 #include <algorithm>

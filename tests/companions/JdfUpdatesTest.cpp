@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // JDFs in a store, prepared by the administration tool and then updated as the job's results are
 // written back. An XML library judges what has become of them.
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Random control strips on their way: through the writer of definitions, which cuts lines, and the
 // measuring tool's reader. What the reader gives is what was in the strip, or it refuses.
 #include <algorithm>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Runs of the measuring tool with exports of an instrument's own software.
 #include <chrono>
 #include <filesystem>

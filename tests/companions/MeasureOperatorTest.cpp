@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the operator sees of a run of the measuring tool: on a terminal, and on a desktop.
 #include <atomic>
 #include <chrono>

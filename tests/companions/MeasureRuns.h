@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Runs of the measuring tool on definitions as the writer makes them.
 #pragma once
 

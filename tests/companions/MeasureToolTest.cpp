@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Runs of the measuring tool with the virtual instrument, and what is refused before the first
 // patch.
 #include <algorithm>

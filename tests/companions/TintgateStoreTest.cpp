@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The administration tool as its callers see it, and what it then left in the store.
 
 #include <bit>

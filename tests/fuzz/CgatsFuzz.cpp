@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Whatever the bytes: no crash, no hang, and a data set that is whole, finite and survives writing.
 #include <algorithm>
 #include <cmath>

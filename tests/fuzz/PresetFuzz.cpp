@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Presets made of any bytes: read or refused, never more than that.
 #include <cmath>
 #include <cstdint>

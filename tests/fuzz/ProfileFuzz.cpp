@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Profiles made of any bytes: opened or refused, and what was opened gives colours or a failure.
 #include <cmath>
 #include <cstdint>

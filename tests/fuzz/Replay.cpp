@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Feeds every file of the folders that it is given to a fuzz target, where no fuzzer is built in.
 #include <cstdint>
 #include <cstdio>

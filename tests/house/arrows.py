@@ -1,4 +1,5 @@
 #!/usr/bin/env python3
+# SPDX-License-Identifier: Apache-2.0
 """Checks that each target sees the headers behind its arrows, and no others.
 
 arrows.py COMPILER SOURCE_DIR BINARY_DIR TARGET...

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A job on a store of the test's own, and a processor that reaches it through the real comm bundle.
 #pragma once
 

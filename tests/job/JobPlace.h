@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A place where the real program verifies jobs as a client has it do: a store, a system root with
 // the suite in it, and a temporary folder.
 #pragma once

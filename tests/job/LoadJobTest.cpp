@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A ticket in; the record, the job's folder and the code out.
 #include <filesystem>
 #include <map>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Runs of the real program on jobs, as a client starts it: arguments and a store in; the exit code,
 // the log, the job's folder and the tickets out.
 #include <atomic>

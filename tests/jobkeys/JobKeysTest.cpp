@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Facts about tickets that no program exercises with all their cases.
 #include <map>
 #include <string>

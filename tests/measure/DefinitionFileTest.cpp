@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Definitions to the byte. "|" stands for the end of a line: "\n" in a strip, "\r\n" in what is
 // expected.
 #include <filesystem>

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Loads through a real store, the real plug-in and the real connector.
 #include <sstream>
 #include <string>

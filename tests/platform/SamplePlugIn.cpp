@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The shared object of a bundle that the loader's tests load.
 #define EXPORTED extern "C" __attribute__((visibility("default")))
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What only a store on a server can meet: services that lead nowhere, servers that fall silent or
 // are stopped, older schemas.
 #include <chrono>

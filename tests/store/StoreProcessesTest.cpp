@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Several processes on one store; writers that are killed, and servers that are stopped under them.
 #include <atomic>
 #include <csignal>

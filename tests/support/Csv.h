@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The tables under tests/data: comma-separated, comment lines with "#".
 #pragma once
 

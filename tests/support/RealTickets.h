@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tickets of the real engine, for tests: records are copied, so that a test can replace single
 // words.
 #pragma once

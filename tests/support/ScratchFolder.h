@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A folder of a test's own, gone when the test ends.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The administration tool, run on a store of a test's own.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A store of a test's own, and processes that work on it.
 #pragma once
 

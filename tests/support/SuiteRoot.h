@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // A system root of a test's own, with the suite's parts in it.
 #pragma once
 

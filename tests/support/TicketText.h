@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Parameters as short lines of text, so that a table of test cases shows them side by side.
 //
 // Records are parted by blanks and read key[position]=value:

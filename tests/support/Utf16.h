@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Text in UTF-16, as export programs of desktop systems write it.
 #pragma once
 

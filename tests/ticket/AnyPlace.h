@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tests of lists and flushes that run wherever tickets are kept: in memory and in a store of each
 // kind.
 #pragma once

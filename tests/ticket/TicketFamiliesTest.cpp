@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What single tickets and tickets in a container have in common, on both of them.
 #include "ticket/TicketFamilies.h"
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What the job logic holds of the server: a login from construction to destruction, and the
 // server's tickets and files in the job's own terms.
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The client side of the comm plug-in: loads it, keeps the session, and passes ticket and file
 // traffic on. Much of it serves other programs only (C169).
 #pragma once

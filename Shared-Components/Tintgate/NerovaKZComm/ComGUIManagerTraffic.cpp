@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Tickets, commands and files: the working surface of the manager.
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 

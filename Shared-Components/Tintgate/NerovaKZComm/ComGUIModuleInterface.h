@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The table of operations that the comm plug-in "ComGUI.Bundle" gives out: 44 slots of one machine
 // word each, whose numbers and arguments are a contract with plug-ins that were built without this
 // header (C95).

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // The record that a session's client and its comm plug-in share. Size and offsets are a contract
 // with plug-ins that were built without this header (C95).
 #pragma once

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // What stands in for the plug-in where it could not be loaded.
 #pragma once
 

@@ -1,3 +1,4 @@
+// SPDX-License-Identifier: Apache-2.0
 // Walks over the tickets of a container. Each function below is a TicketWalk and takes what its
 // comment says as context.
 #pragma once
