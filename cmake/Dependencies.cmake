@@ -31,6 +31,10 @@ pkg_check_modules(sqlite3 REQUIRED IMPORTED_TARGET sqlite3)
 pkg_check_modules(libsodium REQUIRED IMPORTED_TARGET libsodium)
 pkg_check_modules(expat REQUIRED IMPORTED_TARGET expat)
 pkg_check_modules(libmd REQUIRED IMPORTED_TARGET libmd)
+# Compiled in from its header: what it hashes is short, and the library need not be loaded.
+pkg_check_modules(libxxhash REQUIRED libxxhash)
+add_library(xxhash INTERFACE)
+target_include_directories(xxhash SYSTEM INTERFACE ${libxxhash_INCLUDE_DIRS})
 pkg_check_modules(libsystemd REQUIRED IMPORTED_TARGET libsystemd)
 # The store's plug-in loads libpq itself, when it is needed: only the headers are for building.
 pkg_check_modules(libpq REQUIRED IMPORTED_TARGET libpq)

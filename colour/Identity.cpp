@@ -2,28 +2,22 @@
 #include "colour/Identity.h"
 
 #include <array>
+#include <bit>
 #include <cmath>
 #include <cstdint>
 #include <vector>
 
-#include <sha256.h>
+#define XXH_INLINE_ALL
+#include <xxhash.h>
 
 namespace colour {
 namespace {
 
-/// Collects integers and hashes them in blocks, which costs less than one call for each.
+/// Hashes integers, in blocks.
 class Digest {
   public:
-    Digest() { SHA256Init(&m_context); }
-
     void add(double value, double scale) {
-        constexpr double most = 2'000'000'000; // Within 32 bits; no colour comes near it.
-        const double scaled = std::isfinite(value) ? value * scale : 0;
-        const auto number = static_cast<std::uint32_t>(
-            static_cast<std::int32_t>(std::lround(std::fmin(std::fmax(scaled, -most), most))));
-        for (int shift = 0; shift < 32; shift += 8) {
-            m_block[m_used++] = static_cast<std::uint8_t>(number >> shift);
-        }
+        m_block[m_used++] = rounded(value * scale);
         if (m_used == m_block.size()) {
             flush();
         }
@@ -31,10 +25,10 @@ class Digest {
 
     std::string finish() {
         flush();
-        std::array<std::uint8_t, SHA256_DIGEST_LENGTH> bytes{};
-        SHA256Final(bytes.data(), &m_context);
+        XXH128_canonical_t canonical;
+        XXH128_canonicalFromHash(&canonical, XXH3_128bits_digest(&m_state));
         std::string text;
-        for (const std::uint8_t byte : bytes) {
+        for (const unsigned char byte : canonical.digest) {
             text += "0123456789abcdef"[byte >> 4];
             text += "0123456789abcdef"[byte & 15];
         }
@@ -42,13 +36,32 @@ class Digest {
     }
 
   private:
+    /// The nearest integer (the even one of two), as the bytes of a little-endian int32. Numbers
+    /// beyond two billion count as that, which no colour comes near; NaN and infinity count as 0.
+    static std::uint32_t rounded(double number) {
+        constexpr double most = 2'000'000'000;
+        if (!(std::fabs(number) <= most)) {
+            number = std::isfinite(number) ? std::copysign(most, number) : 0;
+        }
+        // In a double of this size the last bit is worth 1, so the addition rounds, and the lower
+        // half of the bits is the integer. lround costs several times as much.
+        constexpr double unit = 6'755'399'441'055'744; // 1.5 * 2^52
+        const auto integer =
+            static_cast<std::uint32_t>(std::bit_cast<std::uint64_t>(number + unit));
+        return std::endian::native == std::endian::little ? integer : __builtin_bswap32(integer);
+    }
+
     void flush() {
-        SHA256Update(&m_context, m_block.data(), m_used);
+        XXH3_128bits_update(&m_state, m_block.data(), m_used * sizeof m_block[0]);
         m_used = 0;
     }
 
-    SHA2_CTX m_context;
-    std::array<std::uint8_t, 4096> m_block;
+    XXH3_state_t m_state = [] {
+        XXH3_state_t state;
+        XXH3_128bits_reset(&state);
+        return state;
+    }();
+    std::array<std::uint32_t, 1024> m_block;
     std::size_t m_used = 0;
 };
 

@@ -8,10 +8,11 @@
 
 namespace colour {
 
-/// 64 hexadecimal digits: SHA-256 over the number of device channels, then for each patch in order
-/// its device values in 1/10000 percent and its L*a*b* in 1/1000, all as 32-bit little-endian
-/// integers. Headers, ids, names, spectra and the file format do not count. A set without colour
-/// values has no identity (empty).
+/// 32 hexadecimal digits: XXH3 (128 bits, canonical order) over the number of device channels, then
+/// for each patch in order its device values in 1/10000 percent and its L*a*b* in 1/1000, rounded
+/// to the nearest (halves to even), all as 32-bit little-endian integers. Headers, ids, names,
+/// spectra and the file format do not count. A set without colour values has no identity (empty).
+/// The hash separates what was aimed at different colours; it does not protect against forgery.
 std::string identityOf(const DataSet& set);
 
 /// The identity of the patches of all combinations of 0, 20, ... 100 percent C, M, Y, K (K varies

@@ -303,7 +303,7 @@ void tellApart(std::vector<Series>& all, const std::vector<Sample>& samples) {
         byName[series.name].push_back(&series);
     }
     constexpr std::size_t enoughDigits = 8;
-    constexpr std::size_t identityDigits = 64;
+    constexpr std::size_t identityDigits = 32;
     for (const auto& [name, alike] : byName) {
         const Sample& first = samples[alike[0]->samples[0]];
         for (Series* const series : alike) {

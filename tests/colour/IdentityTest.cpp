@@ -30,13 +30,13 @@ const std::string rows = "1 0 0 0 0 95 0 -2\n2 100 0 0 0 55 -37 -50\n"
 
 } // namespace
 
-// The digests are those of Python's hashlib over struct.pack("<i") of the documented integers.
+// The digests are those of xxh128sum over Python's struct.pack("<i") of the documented integers.
 TEST(Identity, IsThatOfTheColoursAlone) {
-    const std::string expected = "ea9516377047b161daff9fd8c835d3098d9d5c4ad4a4dd1b81dc63d0e0d23f91";
+    const std::string expected = "d17e455f60da1d6cdc7da694595a425b";
     EXPECT_EQ(identityIn(text("", rows)), expected);
     EXPECT_EQ(identityIn("CGATS.17\nBEGIN_DATA_FORMAT\nLAB_L LAB_A LAB_B\nEND_DATA_FORMAT\n"
                          "BEGIN_DATA\n50 1 -2.5\nEND_DATA\n"),
-              "9882d54ad96943e5d175a7a65b9035d9f42b0bea8081d5ac6aacd6c5587c1550");
+              "599c6e66e34f7a07b2d49dad608128a2");
 
     std::string renamed = rows;
     renamed[0] = 'X';
@@ -53,7 +53,7 @@ TEST(Identity, IsThatOfTheColoursAlone) {
 TEST(Identity, OfAProfileIsThatOfItsColours) {
     std::string profile = support::contentsOf("/usr/share/color/icc/ghostscript/default_cmyk.icc");
     const std::string expected = identityIn(profile);
-    EXPECT_EQ(expected.size(), 64U);
+    EXPECT_EQ(expected.size(), 32U);
     profile[31] ^= 1; // Its date.
     EXPECT_EQ(identityIn(profile), expected);
 }

@@ -175,8 +175,8 @@ TEST(TrendTimes, AreThoseOfTheMeasurementsIfTheyCannotBeMistaken) {
 TEST(TrendSeries, JoinNothingThatWasAimedAtOtherColours) {
     const support::ScratchFolder scratch;
     const std::string result = support::contentsOf(data + "output.json");
-    const std::string first(64, 'a');
-    const std::string second(64, 'b');
+    const std::string first(32, 'a');
+    const std::string second(32, 'b');
     const struct {
         const char* file;
         std::string identity;
