@@ -26,6 +26,17 @@ void writeConverted(std::ostream& stream, std::wstring_view piece) {
     }
 }
 
+/// False if a character is not ASCII. Works on bare pointers, so that the compiler can take several
+/// characters at once.
+bool narrowAscii(const wchar_t* from, std::size_t count, char* to) {
+    wchar_t all = 0;
+    for (std::size_t i = 0; i < count; ++i) {
+        all |= from[i];
+        to[i] = static_cast<char>(from[i]);
+    }
+    return (all & ~0x7F) == 0;
+}
+
 /// In pieces, since the narrow copy of a large result would cost as much memory as the analysis
 /// itself. A piece of plain ASCII, as all of ours are, is narrowed here: the C library's converter
 /// would take a seventh of a whole run.
@@ -35,12 +46,7 @@ void write(std::ostream& stream, std::wstring_view text) {
     for (; !text.empty() && stream; text.remove_prefix(std::min(pieceLength, text.size()))) {
         const std::wstring_view piece = text.substr(0, pieceLength);
         narrow.resize(piece.size());
-        wchar_t all = 0;
-        for (std::size_t i = 0; i < piece.size(); ++i) {
-            all |= piece[i];
-            narrow[i] = static_cast<char>(piece[i]);
-        }
-        if ((all & ~0x7F) == 0) {
+        if (narrowAscii(piece.data(), piece.size(), narrow.data())) {
             stream << narrow;
         } else {
             writeConverted(stream, piece);
