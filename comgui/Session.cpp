@@ -123,12 +123,12 @@ std::unique_ptr<StoreEngine> openStoreAt(const std::string& address) {
 
 Session::Session(std::string address, std::unique_ptr<StoreEngine> engine)
     : m_address(std::move(address)), m_engine(std::move(engine)),
-      m_keep(std::make_shared<StoreKeep>(
+      m_storage(std::make_shared<CachingStorage>(
           m_engine,
           [this](int type, int id, const std::string& key, const std::string& reason) {
               noteFailure(ticketNameOf(type, id), key, reason);
           })),
-      m_container(m_keep) {}
+      m_container(m_storage) {}
 
 void Session::noteFailure(const std::string& target, const std::string& key,
                           const std::string& reason) const {
@@ -143,7 +143,7 @@ Code Session::getTicketData(int type, int kind, int index, int* size, void* buff
         size == nullptr || *size < 0 || buffer == nullptr) {
         return codeRefused;
     }
-    const std::vector<int> ids = m_keep->listIds(type);
+    const std::vector<int> ids = m_storage->listIds(type);
     if (kind == numberKind) {
         const int number = static_cast<int>(ids.size());
         if (*size < static_cast<int>(sizeof number)) {

@@ -7,8 +7,8 @@
 #include <string>
 #include <string_view>
 
+#include "store/CachingStorage.h"
 #include "store/StoreEngine.h"
-#include "store/StoreKeep.h"
 #include "store/tickets/TicketContainer.h"
 
 namespace store {
@@ -60,7 +60,7 @@ class Session {
 
     const std::string m_address;
     const std::shared_ptr<StoreEngine> m_engine;
-    const std::shared_ptr<StoreKeep> m_keep;
+    const std::shared_ptr<CachingStorage> m_storage;
     TicketContainer m_container;
     int m_notificationId = 0; ///< 0: there is no callback.
     void* m_callbackUser = nullptr;

@@ -16,8 +16,8 @@
 #include "StoreBench.h"
 #include "SuiteRoot.h"
 #include "base/WideBytes.h"
+#include "store/CachingStorage.h"
 #include "store/StoreEngine.h"
-#include "store/StoreKeep.h"
 #include "store/Users.h"
 #include "ticket/ParameterList.h"
 #include "ticket/TicketUpdateList.h"
@@ -81,7 +81,7 @@ int main() {
     {
         const std::shared_ptr<store::StoreEngine> engine = store::openStore(address);
         engine->putUser({"bench", store::passwordHash("bench"), false});
-        store::StoreKeep keep(engine);
+        store::CachingStorage keep(engine);
         // Made without waiting for the disk: the log is written through at the end.
         BareDatabase bare(address + "/tickets.db");
         bare.run("BEGIN");

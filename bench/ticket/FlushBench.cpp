@@ -7,7 +7,7 @@
 #include <memory>
 #include <string>
 
-#include "store/tickets/MemoryKeep.h"
+#include "store/tickets/MemoryStorage.h"
 #include "store/tickets/TicketContainer.h"
 #include "store/tickets/WorkTickets.h"
 #include "ticket/TicketFactory.h"
@@ -20,7 +20,7 @@ constexpr int id = 1;
 
 /// Seconds of one flush that changes the middle element of each vector.
 double flushSeconds(int vectors, int elements) {
-    store::TicketContainer engine(std::make_shared<store::MemoryKeep>());
+    store::TicketContainer engine(std::make_shared<store::MemoryStorage>());
     engine.createWithKeys(type, id, nullptr);
     const auto& admin = ticket::as<MTICKET_ADMIN>(*engine.access());
     std::vector<double> values(static_cast<std::size_t>(elements));

@@ -81,8 +81,8 @@ int ticketOperation(void* handle, int type, int id, TICKET_OP op, void*) {
 } // namespace
 
 ReadOnlyServer::ReadOnlyServer(std::shared_ptr<store::StoreEngine> engine)
-    : m_engine(std::move(engine)), m_keep(std::make_shared<store::StoreKeep>(m_engine)),
-      m_container(m_keep) {
+    : m_engine(std::move(engine)), m_storage(std::make_shared<store::CachingStorage>(m_engine)),
+      m_container(m_storage) {
     current = this;
     namespace slot = ticket::container;
     m_access.words[ticket::handleWord] = reinterpret_cast<std::uint64_t>(this);
@@ -185,7 +185,7 @@ bool ReadOnlyServer::exists(int type, int id) {
 
 std::int32_t ReadOnlyServer::listTickets(int type, int kind, int* size, void* buffer) {
     return guarded(refused, [&] {
-        const std::vector<int> ids = m_keep->listIds(type);
+        const std::vector<int> ids = m_storage->listIds(type);
         const int number = static_cast<int>(ids.size());
         const std::size_t bytes = std::min(static_cast<std::size_t>(*size),
                                            kind == 0 ? sizeof number : ids.size() * sizeof(int));

@@ -10,8 +10,8 @@
 #include <vector>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
+#include "store/CachingStorage.h"
 #include "store/StoreEngine.h"
-#include "store/StoreKeep.h"
 #include "store/tickets/TicketContainer.h"
 
 namespace diagnosis {
@@ -77,7 +77,7 @@ class ReadOnlyServer {
     Result guarded(Result failed, Body body);
 
     const std::shared_ptr<store::StoreEngine> m_engine;
-    const std::shared_ptr<store::StoreKeep> m_keep;
+    const std::shared_ptr<store::CachingStorage> m_storage;
     store::TicketContainer m_container;
     MTICKET_ACCESS m_access{};
     ComGUIModuleInterface m_table;

@@ -185,7 +185,7 @@ class TicketContainer::OpenedTicket : public Ticket {
     const int m_id;
 };
 
-TicketContainer::TicketContainer(std::shared_ptr<TicketKeep> keep) : m_keep(std::move(keep)) {
+TicketContainer::TicketContainer(std::shared_ptr<TicketStorage> keep) : m_storage(std::move(keep)) {
     namespace slot = ticket::container;
     m_access.words[ticket::handleWord] = reinterpret_cast<std::uint64_t>(&m_access);
     slot::GetParameter::put(m_access, getParameter);
@@ -205,7 +205,7 @@ TicketContainer::~TicketContainer() {
 }
 
 bool TicketContainer::exists(int type, int id) {
-    return TICKET_Valid(type, id) && m_keep->exists(type, id);
+    return TICKET_Valid(type, id) && m_storage->exists(type, id);
 }
 
 const STICKET_ACCESS* TicketContainer::open(int type, int id) {
@@ -223,13 +223,13 @@ const STICKET_ACCESS* TicketContainer::createWithKeys(int type, int id, const ch
     if (!TICKET_Valid(type, id)) {
         return nullptr;
     }
-    m_keep->create(type, id);
+    m_storage->create(type, id);
     setPartial(type, id, keys);
     return open(type, id);
 }
 
 int TicketContainer::createNext(int type) {
-    return TICKET_TYPE_Valid(type) ? m_keep->createNext(type) : -1;
+    return TICKET_TYPE_Valid(type) ? m_storage->createNext(type) : -1;
 }
 
 /// Without a change, what walks showed stays. It goes last, since a table may point into it.
@@ -250,7 +250,7 @@ bool TicketContainer::change(int type, int id, Change change) {
 }
 
 bool TicketContainer::remove(int type, int id) {
-    if (!change(type, id, [&](bool&) { return m_keep->remove(type, id); })) {
+    if (!change(type, id, [&](bool&) { return m_storage->remove(type, id); })) {
         return false;
     }
     m_partial.erase({type, id});
@@ -261,7 +261,7 @@ bool TicketContainer::walkTickets(TicketWalk callback, void* context, int type) 
     if (!TICKET_TYPE_Valid(type)) {
         return false;
     }
-    for (const int id : m_keep->ids(type)) {
+    for (const int id : m_storage->ids(type)) {
         // The callback may delete tickets that are still to come.
         if (const auto* ticket = open(type, id)) {
             if (!callback(context, type, id, ticket)) {
@@ -294,7 +294,7 @@ bool TicketContainer::fetchAndGet(int type, int id, const char* key, PARAM_TYPE 
     }
     dropSnapshot();
     m_snapshot.key = key;
-    m_snapshot.elements = m_keep->key(type, id, m_snapshot.key);
+    m_snapshot.elements = m_storage->key(type, id, m_snapshot.key);
     m_snapshot.address = {type, id};
     m_snapshot.held = true;
     return readElement(m_snapshot.elements.get(), ptype, out, position, m_handedOut);
@@ -302,7 +302,7 @@ bool TicketContainer::fetchAndGet(int type, int id, const char* key, PARAM_TYPE 
 
 std::shared_ptr<const TicketContent> TicketContainer::content(int type, int id,
                                                               const KeyFilter& filter) {
-    return TICKET_Valid(type, id) ? m_keep->content(type, id, filter) : nullptr;
+    return TICKET_Valid(type, id) ? m_storage->content(type, id, filter) : nullptr;
 }
 
 std::shared_ptr<const TicketContent> TicketContainer::shown(int type, int id) {
@@ -319,7 +319,7 @@ std::shared_ptr<const TicketContent> TicketContainer::shown(int type, int id) {
 
 bool TicketContainer::apply(int type, int id, SETMULTIPAR* table) {
     return change(type, id, [&](bool& changed) {
-        const bool taken = m_keep->apply(type, id, table);
+        const bool taken = m_storage->apply(type, id, table);
         const auto* record = table;
         while (record != nullptr && record->key != nullptr && !record->ok()) {
             ++record;
@@ -330,7 +330,7 @@ bool TicketContainer::apply(int type, int id, SETMULTIPAR* table) {
 }
 
 bool TicketContainer::transfer(int type, int id, const TicketContent& source, bool replace) {
-    return change(type, id, [&](bool&) { return m_keep->transfer(type, id, source, replace); });
+    return change(type, id, [&](bool&) { return m_storage->transfer(type, id, source, replace); });
 }
 
 bool TicketContainer::setPartial(int type, int id, const char* const* keys) {

@@ -10,7 +10,7 @@
 #include <vector>
 
 #include "store/tickets/SingleTicket.h"
-#include "store/tickets/TicketKeep.h"
+#include "store/tickets/TicketStorage.h"
 #include "ticket/TicketRecords.h"
 
 namespace store {
@@ -24,7 +24,7 @@ namespace store {
 /// that an array is whole and is fetched once.
 class TicketContainer {
   public:
-    explicit TicketContainer(std::shared_ptr<TicketKeep> keep);
+    explicit TicketContainer(std::shared_ptr<TicketStorage> keep);
     ~TicketContainer();
     TicketContainer(const TicketContainer&) = delete;
     TicketContainer& operator=(const TicketContainer&) = delete;
@@ -87,7 +87,7 @@ class TicketContainer {
     bool change(int type, int id, Change change);
     bool fetchAndGet(int type, int id, const char* key, PARAM_TYPE ptype, void* out, int position);
 
-    const std::shared_ptr<TicketKeep> m_keep;
+    const std::shared_ptr<TicketStorage> m_storage;
     MTICKET_ACCESS m_access{};
     HandedOut m_handedOut;
     Snapshot m_snapshot;

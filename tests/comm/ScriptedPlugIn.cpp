@@ -3,14 +3,14 @@
 
 #include <memory>
 
-#include "store/tickets/MemoryKeep.h"
+#include "store/tickets/MemoryStorage.h"
 #include "store/tickets/TicketContainer.h"
 #include "store/tickets/WorkTickets.h"
 
 #define EXPORTED extern "C" __attribute__((visibility("default")))
 
 ScriptedPlugIn::ScriptedPlugIn() {
-    static store::TicketContainer engine(std::make_shared<store::MemoryKeep>());
+    static store::TicketContainer engine(std::make_shared<store::MemoryStorage>());
     access = *engine.access();
     set(0, 0, "System/Product/MajorVersion=5");
 }

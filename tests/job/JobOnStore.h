@@ -17,8 +17,8 @@
 #include "TicketText.h"
 #include "cli/CLogger.h"
 #include "job/KZVerifyJobProcessor.h"
+#include "store/CachingStorage.h"
 #include "store/StoreEngine.h"
-#include "store/StoreKeep.h"
 #include "store/Users.h"
 
 class JobOnStore : public testing::Test {
@@ -41,7 +41,7 @@ class JobOnStore : public testing::Test {
 
     /// Sends a table, in the words of TicketText.h.
     void set(const std::string& records, int id = job) const {
-        store::StoreKeep keep(engine);
+        store::CachingStorage keep(engine);
         support::RecordTable table(records);
         ASSERT_TRUE(keep.apply(3, id, table.records())) << records;
     }

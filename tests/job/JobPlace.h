@@ -21,8 +21,8 @@
 #include "RunningProgram.h"
 #include "SuiteRoot.h"
 #include "TicketText.h"
+#include "store/CachingStorage.h"
 #include "store/StoreEngine.h"
-#include "store/StoreKeep.h"
 #include "store/Users.h"
 
 namespace support {
@@ -134,7 +134,7 @@ class Place {
 
     /// Changes a ticket, in the words of TicketText.h.
     void set(const std::string& records, int id = 7, int type = 3) const {
-        store::StoreKeep keep(engine());
+        store::CachingStorage keep(engine());
         ASSERT_TRUE(keep.apply(type, id, support::RecordTable(records).records())) << records;
     }
 

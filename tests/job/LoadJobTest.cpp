@@ -55,7 +55,7 @@ class LoadJob : public JobOnStore {
     void setPreset(const std::string& records, int id = 7) const {
         engine->remove(27, id);
         engine->create(27, id);
-        store::StoreKeep keep(engine);
+        store::CachingStorage keep(engine);
         ASSERT_TRUE(keep.apply(27, id, support::RecordTable(records).records()));
     }
 

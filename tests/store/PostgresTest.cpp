@@ -126,7 +126,7 @@ TEST_F(Postgres, WhatWasSentIsRepeatedUnlessTwiceIsNotOnce) {
         store::TicketContent expected = *open()->content(3, 1, store::KeyFilter());
         const std::string before = contentText(expected);
         expected.apply(table.records());
-        store::StoreKeep keep(open());
+        store::CachingStorage keep(open());
         bare.run(
             "BEGIN; UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = 3 AND id = 1");
         std::thread killer([&] { // While the change waits at the server.

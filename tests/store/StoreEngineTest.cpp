@@ -160,14 +160,14 @@ TEST_P(StoreEngine, AChangeMakesItsTicketWithAllKeysOrNone) {
 TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
     // The first two are held of all jobs at once, from when a reader asks for the ids.
     const std::string keys[] = {"Job/Display/Status", "Input/FileType", "Other"};
-    store::StoreKeep reader(open());
-    store::StoreKeep other(open());
+    store::CachingStorage reader(open());
+    store::CachingStorage other(open());
     std::map<int, std::map<std::string, int>> jobs; // What is there.
     std::mt19937 random(1);
     const auto below = [&](int limit) { return static_cast<int>(random() % unsigned(limit)); };
     other.create(27, 2); // Of another type.
     for (int step = 0; step < 250 && !HasFailure(); ++step) {
-        store::StoreKeep& writer = below(3) == 0 ? reader : other;
+        store::CachingStorage& writer = below(3) == 0 ? reader : other;
         const int id = 1 + below(3);
         const std::string& key = keys[below(3)];
         const int what = below(9);
@@ -339,7 +339,7 @@ TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
             engine->users();
             engine->highestIds();
             engine->versions("a/b");
-            store::StoreKeep keep(engine);
+            store::CachingStorage keep(engine);
             for (const int id : keep.listIds(3)) {
                 engine->key(3, id, "n");
                 keep.key(3, id, "Job/Display/Status");
@@ -406,7 +406,7 @@ TEST_F(FolderStore, CanBeReadOnAFullDisk) {
                 const std::shared_ptr<store::StoreEngine> engine =
                     store::openStore(address, access);
                 EXPECT_EQ(ticket(*engine, 3, 1), "kept[0]=1 kept[1]=2 kept[2]=3");
-                EXPECT_EQ(store::StoreKeep(engine).ids(3), std::vector<int>{1});
+                EXPECT_EQ(store::CachingStorage(engine).ids(3), std::vector<int>{1});
                 EXPECT_EQ(faultOf([&] { putFile(*engine, "a", std::string(30'000, 'x')); }),
                           Fault::Full);
             });
@@ -432,7 +432,7 @@ TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
         EXPECT_EQ(send(*engine, 3, 1, "small=1"), "taken 1");
         // A session that lost a write takes no more for that ticket.
         engine->create(3, 2);
-        store::StoreKeep keep(open());
+        store::CachingStorage keep(open());
         EXPECT_FALSE(keep.apply(3, 1, support::RecordTable("big='" + much).records()));
         EXPECT_FALSE(keep.apply(3, 1, support::RecordTable("status=1").records()));
         EXPECT_TRUE(keep.apply(3, 2, support::RecordTable("status=1").records()));

@@ -11,7 +11,7 @@
 #include <gtest/gtest.h>
 
 #include "TicketText.h"
-#include "store/tickets/MemoryKeep.h"
+#include "store/tickets/MemoryStorage.h"
 #include "store/tickets/TicketContainer.h"
 #include "store/tickets/WorkTickets.h"
 #include "ticket/SingleTicket.h"
@@ -59,17 +59,17 @@ class WorkTicket {
     const STICKET_ACCESS* m_real;
 };
 
-inline std::shared_ptr<store::TicketKeep> memoryKeep() {
-    return std::make_shared<store::MemoryKeep>();
+inline std::shared_ptr<store::TicketStorage> memoryKeep() {
+    return std::make_shared<store::MemoryStorage>();
 }
 
 /// Where the tickets of a new Server are, unless it is told.
-inline std::function<std::shared_ptr<store::TicketKeep>()> newKeep = memoryKeep;
+inline std::function<std::shared_ptr<store::TicketStorage>()> newKeep = memoryKeep;
 
 /// A session with a server.
 class Server {
   public:
-    explicit Server(std::shared_ptr<store::TicketKeep> place = newKeep())
+    explicit Server(std::shared_ptr<store::TicketStorage> place = newKeep())
         : keep(std::move(place)), engine(keep), record(*engine.access()) {
         hSTicketInstance = store::ticketFactory();
     }
@@ -88,7 +88,7 @@ class Server {
     }
     std::string content(int id) { return support::ticketText(engine.open(jobs, id)); }
 
-    const std::shared_ptr<store::TicketKeep> keep;
+    const std::shared_ptr<store::TicketStorage> keep;
     store::TicketContainer engine;
     MTICKET_ACCESS record;
 };

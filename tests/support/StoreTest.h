@@ -20,8 +20,8 @@
 #include "RunProgram.h"
 #include "ScratchFolder.h"
 #include "TicketText.h"
+#include "store/CachingStorage.h"
 #include "store/StoreEngine.h"
-#include "store/StoreKeep.h"
 #include "store/sqlite/Sqlite.h"
 
 /// Starts work in a process of its own, which ends with what work returns; 99 after an exception.
@@ -75,7 +75,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
     static std::string send(store::StoreEngine& engine, int type, int id,
                             const std::string& records) {
         // The keep is gone before the engine is.
-        store::StoreKeep keep(std::shared_ptr<store::StoreEngine>(&engine, [](auto*) {}));
+        store::CachingStorage keep(std::shared_ptr<store::StoreEngine>(&engine, [](auto*) {}));
         support::RecordTable table(records);
         const bool taken = keep.apply(type, id, table.records());
         return (taken ? "taken " : "refused ") + support::resultText(table.records());

@@ -11,8 +11,8 @@
 #include "Postgres.h"
 #include "RealTickets.h"
 #include "ScratchFolder.h"
+#include "store/CachingStorage.h"
 #include "store/StoreEngine.h"
-#include "store/StoreKeep.h"
 
 enum class Place { Memory, Sqlite, Postgres };
 
@@ -31,8 +31,8 @@ class AnyPlace : public testing::TestWithParam<Place> {
     bool inStore() const { return GetParam() != Place::Memory; }
 
   private:
-    std::shared_ptr<store::TicketKeep> emptied() const {
-        auto keep = std::make_shared<store::StoreKeep>(store::openStore(m_address));
+    std::shared_ptr<store::TicketStorage> emptied() const {
+        auto keep = std::make_shared<store::CachingStorage>(store::openStore(m_address));
         for (const int id : keep->ids(jobs)) {
             EXPECT_TRUE(keep->remove(jobs, id));
         }

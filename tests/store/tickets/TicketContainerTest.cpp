@@ -22,7 +22,7 @@ class TicketContainer : public testing::Test {
         return session.view().GetIntParameter(type, id, position, key, -1);
     }
 
-    std::shared_ptr<store::MemoryKeep> keep = std::make_shared<store::MemoryKeep>();
+    std::shared_ptr<store::MemoryStorage> keep = std::make_shared<store::MemoryStorage>();
     Server session{keep};
     Server other{keep}; ///< Another session.
 };

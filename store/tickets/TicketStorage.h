@@ -11,9 +11,9 @@ namespace store {
 
 /// Tickets by type and id. It keeps and gives back; what a table does to a ticket is said by
 /// TicketContent. Types and ids that it is given are valid. Running out of memory is an exception.
-class TicketKeep {
+class TicketStorage {
   public:
-    virtual ~TicketKeep() = default;
+    virtual ~TicketStorage() = default;
 
     /// Of all tickets of a type, ascending.
     virtual std::vector<int> ids(int type) = 0;

@@ -15,7 +15,7 @@
 
 #include "store/JobOverview.h"
 #include "store/StoreEngine.h"
-#include "store/tickets/TicketKeep.h"
+#include "store/tickets/TicketStorage.h"
 
 namespace store {
 
@@ -34,13 +34,13 @@ namespace store {
 /// While a client lists jobs (it has asked for the ids and now reads these keys job by job), values
 /// may be up to oldestListed old if asking costs a round trip. Every other read sees the latest
 /// commit.
-class StoreKeep : public TicketKeep {
+class CachingStorage : public TicketStorage {
   public:
     /// Shown each key that a table or a transfer did not write, and why, for people.
     using NoteFailure =
         std::function<void(int type, int id, const std::string& key, const std::string& reason)>;
 
-    explicit StoreKeep(std::shared_ptr<StoreEngine> engine, NoteFailure note = {});
+    explicit CachingStorage(std::shared_ptr<StoreEngine> engine, NoteFailure note = {});
 
     std::vector<int> ids(int type) override;
     /// The same, but that a failure of the store is thrown: none is not the same as not known.

@@ -1,16 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "store/tickets/MemoryKeep.h"
+#include "store/tickets/MemoryStorage.h"
 
 #include <algorithm>
 
 namespace store {
 
-std::shared_ptr<TicketContent>* MemoryKeep::find(int type, int id) {
+std::shared_ptr<TicketContent>* MemoryStorage::find(int type, int id) {
     const auto found = m_tickets.find({type, id});
     return found == m_tickets.end() ? nullptr : &found->second;
 }
 
-std::vector<int> MemoryKeep::ids(int type) {
+std::vector<int> MemoryStorage::ids(int type) {
     std::vector<int> ids;
     for (auto it = m_tickets.lower_bound({type, 0}); it != m_tickets.end(); ++it) {
         if (it->first.first != type) {
@@ -21,11 +21,11 @@ std::vector<int> MemoryKeep::ids(int type) {
     return ids;
 }
 
-bool MemoryKeep::exists(int type, int id) {
+bool MemoryStorage::exists(int type, int id) {
     return find(type, id) != nullptr;
 }
 
-bool MemoryKeep::create(int type, int id) {
+bool MemoryStorage::create(int type, int id) {
     if (exists(type, id)) {
         return false;
     }
@@ -35,7 +35,7 @@ bool MemoryKeep::create(int type, int id) {
     return true;
 }
 
-int MemoryKeep::createNext(int type) {
+int MemoryStorage::createNext(int type) {
     int id = m_highestId[type] + 1;
     if (!TICKET_ID_Valid(id)) {
         // The numbers are used up: the lowest that is free.
@@ -47,17 +47,17 @@ int MemoryKeep::createNext(int type) {
     return TICKET_ID_Valid(id) && create(type, id) ? id : -1;
 }
 
-bool MemoryKeep::remove(int type, int id) {
+bool MemoryStorage::remove(int type, int id) {
     return m_tickets.erase({type, id}) != 0;
 }
 
-std::shared_ptr<const Elements> MemoryKeep::key(int type, int id, std::string_view key) {
+std::shared_ptr<const Elements> MemoryStorage::key(int type, int id, std::string_view key) {
     const auto* content = find(type, id);
     return content == nullptr ? nullptr : (*content)->find(key);
 }
 
-std::shared_ptr<const TicketContent> MemoryKeep::content(int type, int id,
-                                                         const KeyFilter& filter) {
+std::shared_ptr<const TicketContent> MemoryStorage::content(int type, int id,
+                                                            const KeyFilter& filter) {
     const auto* content = find(type, id);
     if (content == nullptr) {
         return nullptr;
@@ -68,7 +68,7 @@ std::shared_ptr<const TicketContent> MemoryKeep::content(int type, int id,
     return std::make_shared<TicketContent>((*content)->select(filter));
 }
 
-bool MemoryKeep::apply(int type, int id, SETMULTIPAR* table) {
+bool MemoryStorage::apply(int type, int id, SETMULTIPAR* table) {
     auto* content = find(type, id);
     if (content == nullptr) {
         return false;
@@ -77,7 +77,7 @@ bool MemoryKeep::apply(int type, int id, SETMULTIPAR* table) {
     return true;
 }
 
-bool MemoryKeep::transfer(int type, int id, const TicketContent& source, bool replace) {
+bool MemoryStorage::transfer(int type, int id, const TicketContent& source, bool replace) {
     auto* content = find(type, id);
     if (content == nullptr) {
         return false;

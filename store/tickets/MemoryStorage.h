@@ -5,11 +5,11 @@
 #include <map>
 #include <utility>
 
-#include "store/tickets/TicketKeep.h"
+#include "store/tickets/TicketStorage.h"
 
 namespace store {
 
-class MemoryKeep : public TicketKeep {
+class MemoryStorage : public TicketStorage {
   public:
     std::vector<int> ids(int type) override;
     bool exists(int type, int id) override;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "store/StoreKeep.h"
+#include "store/CachingStorage.h"
 
 #include <algorithm>
 #include <limits>
@@ -78,13 +78,13 @@ void clearResults(SETMULTIPAR* table) {
 
 } // namespace
 
-StoreKeep::StoreKeep(std::shared_ptr<StoreEngine> engine, NoteFailure note)
+CachingStorage::CachingStorage(std::shared_ptr<StoreEngine> engine, NoteFailure note)
     : m_engine(std::move(engine)), m_note(std::move(note)) {}
 
 /// Writes to a ticket, unless a former write to it was lost. False, with each key noted, if the
 /// store did not take it.
 template<class Keys, class Write>
-bool StoreKeep::write(int type, int id, Keys keys, Write write) {
+bool CachingStorage::write(int type, int id, Keys keys, Write write) {
     const std::pair address = {type, id};
     std::string reason = "an earlier write to this ticket was lost";
     if (!m_cutOff.contains(address)) {
@@ -109,11 +109,11 @@ bool StoreKeep::write(int type, int id, Keys keys, Write write) {
     return false;
 }
 
-std::vector<int> StoreKeep::ids(int type) {
+std::vector<int> CachingStorage::ids(int type) {
     return orElse(std::vector<int>(), [&] { return listIds(type); });
 }
 
-std::vector<int> StoreKeep::listIds(int type) {
+std::vector<int> CachingStorage::listIds(int type) {
     if (type != jobType) {
         return m_engine->ids(type);
     }
@@ -125,24 +125,24 @@ std::vector<int> StoreKeep::listIds(int type) {
     return m_overview.ids();
 }
 
-bool StoreKeep::exists(int type, int id) {
+bool CachingStorage::exists(int type, int id) {
     return orElse(false, [&] { return m_engine->exists(type, id); });
 }
 
-bool StoreKeep::create(int type, int id) {
+bool CachingStorage::create(int type, int id) {
     return orElse(false, [&] { return m_engine->create(type, id); });
 }
 
-int StoreKeep::createNext(int type) {
+int CachingStorage::createNext(int type) {
     return orElse(-1, [&] { return m_engine->createNext(type); });
 }
 
-bool StoreKeep::remove(int type, int id) {
+bool CachingStorage::remove(int type, int id) {
     const auto none = [] { return std::vector<std::string>(); };
     return write(type, id, none, [&] { return m_engine->remove(type, id); });
 }
 
-std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_view key) {
+std::shared_ptr<const Elements> CachingStorage::key(int type, int id, std::string_view key) {
     return orElse(SharedElements(), [&] {
         const std::size_t index = type == jobType ? overviewKey(key) : overviewKeys.size();
         const bool inOverview = index != overviewKeys.size();
@@ -176,7 +176,7 @@ std::shared_ptr<const Elements> StoreKeep::key(int type, int id, std::string_vie
 }
 
 /// Whether a read of the overview goes on in a listing, behind its first one.
-bool StoreKeep::goesOn(int id, std::size_t overviewKey) {
+bool CachingStorage::goesOn(int id, std::size_t overviewKey) {
     const std::pair next = {id, overviewKey};
     const bool starts = m_listed == listingStarts;
     const bool goesOn = !starts && m_listed < next;
@@ -187,7 +187,7 @@ bool StoreKeep::goesOn(int id, std::size_t overviewKey) {
 /// Whether the overview of this moment is there; it is fetched where that is worth it. While others
 /// keep writing, it is fetched again only after so many reads that they cost more, or after so long
 /// a time that a listing does not notice.
-bool StoreKeep::wantsOverview(std::uint64_t commits, bool listing) {
+bool CachingStorage::wantsOverview(std::uint64_t commits, bool listing) {
     if (m_overviewHeld && m_overviewCommits == commits) {
         return true;
     }
@@ -201,7 +201,7 @@ bool StoreKeep::wantsOverview(std::uint64_t commits, bool listing) {
     return true;
 }
 
-void StoreKeep::fetchOverview(std::uint64_t commits) {
+void CachingStorage::fetchOverview(std::uint64_t commits) {
     m_overviewHeld = false;
     m_engine->overview(m_overview);
     m_overviewFetched = std::chrono::steady_clock::now();
@@ -211,7 +211,7 @@ void StoreKeep::fetchOverview(std::uint64_t commits) {
     m_readsUntilNext = 20 + m_overview.ids().size();
 }
 
-const StoreKeep::SharedElements& StoreKeep::elementsOf(std::size_t key, int number) {
+const CachingStorage::SharedElements& CachingStorage::elementsOf(std::size_t key, int number) {
     auto& [last, elements] = m_lastNumbers[key];
     if (elements == nullptr || last != number) {
         auto& known = m_numbers[number];
@@ -226,12 +226,13 @@ const StoreKeep::SharedElements& StoreKeep::elementsOf(std::size_t key, int numb
     return elements;
 }
 
-std::shared_ptr<const TicketContent> StoreKeep::content(int type, int id, const KeyFilter& filter) {
+std::shared_ptr<const TicketContent> CachingStorage::content(int type, int id,
+                                                             const KeyFilter& filter) {
     return orElse(std::shared_ptr<const TicketContent>(),
                   [&] { return m_engine->content(type, id, filter); });
 }
 
-bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
+bool CachingStorage::apply(int type, int id, SETMULTIPAR* table) {
     if (table == nullptr || table->key == nullptr) {
         return exists(type, id);
     }
@@ -252,7 +253,7 @@ bool StoreKeep::apply(int type, int id, SETMULTIPAR* table) {
     }
 }
 
-bool StoreKeep::transfer(int type, int id, const TicketContent& source, bool replace) {
+bool CachingStorage::transfer(int type, int id, const TicketContent& source, bool replace) {
     Scope scope;
     scope.everything = replace;
     scope.repeatable = true;
