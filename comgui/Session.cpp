@@ -15,7 +15,7 @@
 
 #include "platform/TemporaryFolder.h"
 #include "store/WriteFailures.h"
-#include "store/tickets/SingleTicket.h"
+#include "store/tickets/TicketRecord.h"
 
 namespace store {
 

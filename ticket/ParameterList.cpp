@@ -6,8 +6,8 @@
 
 #include "text/MathLib.h"
 #include "ticket/ParameterTables.h"
+#include "ticket/TicketAccess.h"
 #include "ticket/TicketFilenames.h"
-#include "ticket/TicketSlots.h"
 
 namespace {
 

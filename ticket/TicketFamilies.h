@@ -11,8 +11,8 @@
 #include <vector>
 
 #include "ticket/ParameterTables.h"
+#include "ticket/TicketAccess.h"
 #include "ticket/TicketFilenames.h"
-#include "ticket/TicketSlots.h"
 
 namespace ticket {
 

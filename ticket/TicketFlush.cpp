@@ -3,9 +3,9 @@
 // should hold, and the difference is sent as one table.
 #include "ticket/ParameterList.h"
 #include "ticket/ParameterTables.h"
+#include "ticket/TicketAccess.h"
 #include "ticket/TicketDifference.h"
 #include "ticket/TicketFactory.h"
-#include "ticket/TicketSlots.h"
 #include "ticket/TicketUpdateList.h"
 #include "ticket/TicketUpdateLog.h"
 

@@ -4,9 +4,9 @@
 #include <utility>
 
 #include "text/LocaleSettings.h"
+#include "ticket/TicketAccess.h"
 #include "ticket/TicketFactory.h"
 #include "ticket/TicketFilenames.h"
-#include "ticket/TicketSlots.h"
 #include "ticket/TicketUpdateLog.h"
 
 namespace {

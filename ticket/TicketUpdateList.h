@@ -13,10 +13,10 @@
 #include "text/CharSetsWx.h"
 #include "ticket/ParameterCaches.h"
 #include "ticket/PartialMode.h"
-#include "ticket/SingleTicket.h"
 #include "ticket/TicketContainer.h"
 #include "ticket/TicketRecords.h"
 #include "ticket/TicketUpdateCallback.h"
+#include "ticket/TicketViews.h"
 
 /// Tickets of this type live in lists only; they are never sent.
 inline constexpr int TICKET_TYPE_LOCAL = 1000;

@@ -9,7 +9,7 @@
 #include <utility>
 #include <vector>
 
-#include "store/tickets/SingleTicket.h"
+#include "store/tickets/TicketRecord.h"
 #include "store/tickets/TicketStorage.h"
 #include "ticket/TicketRecords.h"
 

@@ -3,7 +3,7 @@
 
 #include <unordered_map>
 
-#include "store/tickets/SingleTicket.h"
+#include "store/tickets/TicketRecord.h"
 
 namespace store {
 

@@ -9,7 +9,7 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "tests/comm/CommTest.h"
-#include "ticket/SingleTicket.h"
+#include "ticket/TicketViews.h"
 
 namespace {
 

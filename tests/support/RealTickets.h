@@ -14,10 +14,10 @@
 #include "store/tickets/MemoryStorage.h"
 #include "store/tickets/TicketContainer.h"
 #include "store/tickets/WorkTickets.h"
-#include "ticket/SingleTicket.h"
 #include "ticket/TicketContainer.h"
 #include "ticket/TicketFactory.h"
 #include "ticket/TicketUpdateList.h"
+#include "ticket/TicketViews.h"
 
 constexpr int jobs = 3; ///< The type of a server's tickets.
 

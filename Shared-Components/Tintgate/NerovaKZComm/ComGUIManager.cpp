@@ -14,8 +14,8 @@
 #include "text/CharSets.h"
 #include "text/CharSetsWx.h"
 #include "text/StringUtilsComGUI.h"
-#include "ticket/SingleTicket.h"
 #include "ticket/TicketFactory.h"
+#include "ticket/TicketViews.h"
 
 namespace {
 

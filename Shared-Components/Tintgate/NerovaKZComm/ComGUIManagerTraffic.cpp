@@ -12,9 +12,9 @@
 #include "platform/CoreFoundationStrings.h"
 #include "text/CharSetsWx.h"
 #include "ticket/ParameterTables.h"
-#include "ticket/SingleTicket.h"
 #include "ticket/TicketUpdateCallback.h"
 #include "ticket/TicketUpdateList.h"
+#include "ticket/TicketViews.h"
 
 namespace {
 

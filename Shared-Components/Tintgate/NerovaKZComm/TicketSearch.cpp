@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "Shared-Components/Tintgate/NerovaKZComm/TicketSearch.h"
 
-#include "ticket/SingleTicket.h"
-#include "ticket/TicketSlots.h"
+#include "ticket/TicketAccess.h"
+#include "ticket/TicketViews.h"
 
 namespace {
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "ticket/SingleTicket.h"
+#include "ticket/TicketViews.h"
 
 #include <limits>
 

@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "ticket/SingleTicket.h"
+#include "ticket/TicketViews.h"
 
 #include <climits>
 
 #include "RealTickets.h"
 
-TEST(SingleTicket, FindsTheFirstEqualElement) {
+TEST(TicketViews, FindsTheFirstEqualElement) {
     const WorkTicket work("numbers=4,5,5,0.5,6 scalar[-1]=9 texts='a,'ab,'b");
     const STICKET_MODIFY& view = work.view();
     EXPECT_EQ(view.FindParameterPosition<int>("numbers", 5), 1);
@@ -16,7 +16,7 @@ TEST(SingleTicket, FindsTheFirstEqualElement) {
     EXPECT_EQ(view.FindParameterPosition<int>("none", 0), -1);
 }
 
-TEST(SingleTicket, SaysWhereItComesFromOrNothing) {
+TEST(TicketViews, SaysWhereItComesFromOrNothing) {
     STICKET_OPTION_WHOAMI record{&record, 5, 6};
     EXPECT_FALSE(WorkTicket().view().WhoAmI(record));
     EXPECT_TRUE(record.pointer == nullptr && record.number1 == -1 && record.number2 == -1);
@@ -26,7 +26,7 @@ TEST(SingleTicket, SaysWhereItComesFromOrNothing) {
     EXPECT_TRUE(record.number1 == jobs && record.number2 == TicketInside::id);
 }
 
-TEST(SingleTicket, BearsAFaultyPlugIn) {
+TEST(TicketViews, BearsAFaultyPlugIn) {
     static int answer;
     static unsigned long count;
     WorkTicket work;

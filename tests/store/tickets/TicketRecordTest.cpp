@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "store/tickets/SingleTicket.h"
+#include "store/tickets/TicketRecord.h"
 
 #include "RealTickets.h"
 
@@ -7,7 +7,7 @@ using namespace ticket;
 using support::RecordTable;
 using support::resultText;
 
-TEST(SingleTicket, ReadsOnlyWhatIsThereUnderItsType) {
+TEST(TicketRecord, ReadsOnlyWhatIsThereUnderItsType) {
     const WorkTicket ticket("a=5 v[2]='x v[4]=u7 d=2.5 b=#0102 n=4,5,6");
     const struct {
         const char* key;
@@ -44,7 +44,7 @@ TEST(SingleTicket, ReadsOnlyWhatIsThereUnderItsType) {
     EXPECT_FALSE(bit0(single::GetParameter::call(*ticket.real(), "a", PARAM_INT, nullptr, 0)));
 }
 
-TEST(SingleTicket, TransfersTakeWholeKeys) {
+TEST(TicketRecord, TransfersTakeWholeKeys) {
     const struct {
         const char* source;
         std::vector<const char*> keys;
@@ -70,7 +70,7 @@ TEST(SingleTicket, TransfersTakeWholeKeys) {
     }
 }
 
-TEST(SingleTicket, TextsStayGoodWhenTheirTicketIsGone) {
+TEST(TicketRecord, TextsStayGoodWhenTheirTicketIsGone) {
     WorkTicket ticket("a='first b=#6162");
     const char* text = nullptr;
     BIN_STRING bytes;
@@ -82,7 +82,7 @@ TEST(SingleTicket, TextsStayGoodWhenTheirTicketIsGone) {
     EXPECT_EQ(std::string(bytes.begin(), bytes.end()), "ab");
 }
 
-TEST(SingleTicket, ATableMayPointIntoTheTicketThatItChanges) {
+TEST(TicketRecord, ATableMayPointIntoTheTicketThatItChanges) {
     const WorkTicket ticket("a='x,'y b='z,1,2.5");
     const std::vector<SETMULTIPAR> table = support::walked(*ticket.real());
     // All is deleted, then set again from behind, out of what was deleted.
@@ -95,7 +95,7 @@ TEST(SingleTicket, ATableMayPointIntoTheTicketThatItChanges) {
     EXPECT_EQ(ticket.content(), "a[0]='x a[1]='y b[0]='z b[1]=1 b[2]=2.5");
 }
 
-TEST(SingleTicket, AWalkOutlivesWhatItsCallbackDoes) {
+TEST(TicketRecord, AWalkOutlivesWhatItsCallbackDoes) {
     struct Context {
         WorkTicket ticket{"a=1,2 b=3 c='x"};
         std::string seen;
@@ -110,7 +110,7 @@ TEST(SingleTicket, AWalkOutlivesWhatItsCallbackDoes) {
     EXPECT_EQ(context.seen, "aab");
 }
 
-TEST(SingleTicket, NonsenseIsRefused) {
+TEST(TicketRecord, NonsenseIsRefused) {
     WorkTicket ticket("a=1");
     BIN_STRING nowhere;
     nowhere.length = 5;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "store/tickets/SingleTicket.h"
+#include "store/tickets/TicketRecord.h"
 
 #include <unordered_map>
 
