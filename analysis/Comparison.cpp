@@ -5,10 +5,10 @@
 #include <map>
 
 #include "ExitCodes.h"
+#include "analysis/BoundaryText.h"
 #include "analysis/PatchKinds.h"
 #include "analysis/Repeats.h"
 #include "analysis/Status.h"
-#include "analysis/Text.h"
 
 namespace analysis {
 namespace {

@@ -9,8 +9,8 @@
 #include <dlfcn.h>
 
 #include "ExitCodes.h"
+#include "analysis/BoundaryText.h"
 #include "analysis/Status.h"
-#include "analysis/Text.h"
 #include "colour/CgatsText.h"
 #include "colour/ColourFile.h"
 

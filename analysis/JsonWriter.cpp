@@ -8,7 +8,7 @@
 #include <cstring>
 #include <utility>
 
-#include "analysis/Text.h"
+#include "analysis/BoundaryText.h"
 
 namespace analysis {
 namespace {

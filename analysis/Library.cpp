@@ -7,6 +7,7 @@
 #include <utility>
 
 #include "ExitCodes.h"
+#include "analysis/BoundaryText.h"
 #include "analysis/Comparison.h"
 #include "analysis/Instruments.h"
 #include "analysis/Judgement.h"
@@ -16,7 +17,6 @@
 #include "analysis/Presets.h"
 #include "analysis/ResultJson.h"
 #include "analysis/Status.h"
-#include "analysis/Text.h"
 #include "colour/ColourFile.h"
 #include "job/AnalysisLibrary.h"
 #include "job/JobRecords.h"

@@ -5,7 +5,7 @@
 
 #include <nlohmann/json.hpp>
 
-#include "analysis/Text.h"
+#include "analysis/BoundaryText.h"
 #include "analysis/Version.h"
 #include "colour/Difference.h"
 

@@ -33,8 +33,8 @@
 #include <pugixml.hpp>
 
 #include "ExitCodes.h"
+#include "analysis/BoundaryText.h"
 #include "analysis/Criteria.h"
-#include "analysis/Text.h"
 #include "colour/ColourFile.h"
 #include "colour/Difference.h"
 

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "analysis/ResultJson.h"
 
+#include "analysis/BoundaryText.h"
 #include "analysis/InkNames.h"
 #include "analysis/JsonWriter.h"
-#include "analysis/Text.h"
 #include "analysis/Version.h"
 #include "colour/Identity.h"
 

@@ -10,7 +10,7 @@
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
 #include "companions/tintgate-report/LocalPages.h"
-#include "companions/tintgate-report/ServerFiles.h"
+#include "companions/tintgate-report/ServerLookups.h"
 #include "companions/tintgate-report/Targets.h"
 #include "companions/tintgate-report/TicketKeys.h"
 #include "companions/tintgate-report/Trend.h"
@@ -243,8 +243,8 @@ report::Verdict verdictOf(const report::Sample& sample, int approval) {
                                              : report::Verdict::Failed;
 }
 
-report::Sample sampleOf(const store::TicketContent& job, const Verified& verified, Server& server,
-                        const Preset& preset) {
+report::Sample sampleOf(const store::TicketContent& job, const Verified& verified,
+                        ServerLookups& server, const Preset& preset) {
     report::Sample sample;
     sample.time = verified.time;
     sample.jobId = verified.job;
@@ -340,7 +340,7 @@ class Gatherer {
     store::StoreEngine& m_store;
     const Filter& m_filter;
     const PagePlace& m_place;
-    Server m_server;
+    ServerLookups m_server;
     Targets m_targets;
     const LocalPages m_pages;
     const store::KeyFilter m_keys[2] = {keysOf(Strip::first), keysOf(Strip::second)};

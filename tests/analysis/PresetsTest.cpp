@@ -9,7 +9,7 @@
 
 #include "ExitCodes.h"
 #include "ScratchFolder.h"
-#include "analysis/Text.h"
+#include "analysis/BoundaryText.h"
 
 using namespace analysis;
 using Record = tolerancePresetParameterRecord;

@@ -22,9 +22,9 @@ struct Preset {
 };
 
 /// Presets and instruments, each looked up once.
-class Server {
+class ServerLookups {
   public:
-    explicit Server(store::StoreEngine& store) : m_store(store) {}
+    explicit ServerLookups(store::StoreEngine& store) : m_store(store) {}
 
     /// The tool judges by the preset's file, so its ticket gives no more than the name.
     const Preset& preset(int id, const std::string& installFolder);

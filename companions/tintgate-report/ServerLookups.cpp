@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "companions/tintgate-report/ServerFiles.h"
+#include "companions/tintgate-report/ServerLookups.h"
 
 #include <algorithm>
 #include <cstdlib>
@@ -39,7 +39,7 @@ std::string nameOf(int device) {
 
 } // namespace
 
-const Preset& Server::preset(int id, const std::string& installFolder) {
+const Preset& ServerLookups::preset(int id, const std::string& installFolder) {
     const auto [at, fresh] = m_presets.try_emplace({id, installFolder});
     if (!fresh || id <= 0) {
         return at->second;
@@ -55,7 +55,7 @@ const Preset& Server::preset(int id, const std::string& installFolder) {
     return at->second;
 }
 
-std::string Server::instrument(const store::TicketContent& job, Strip strip) {
+std::string ServerLookups::instrument(const store::TicketContent& job, Strip strip) {
     if (isDynamic(strip, integerOf(job.find("Footer/Dynstrip/UseDynstrip")).value_or(0))) {
         return nameOf(integerOf(job.find("Footer/Dynstrip/DeviceID")).value_or(0));
     }
