@@ -16,12 +16,12 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
+#include "job/StripSources.h"
 #include "jobkeys/JobState.h"
 #include "jobkeys/Lookups.h"
 #include "jobkeys/StripKeys.h"
 #include "jobkeys/Tickets.h"
-#include "measure/ControlStripText.h"
-#include "measure/StripLookups.h"
+#include "measure/StripLines.h"
 #include "ticket/ParameterTables.h"
 
 using namespace jobkeys;

@@ -11,12 +11,12 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "base/TextFile.h"
 #include "cli/CLogger.h"
-#include "job/JobFiles.h"
+#include "job/FileExists.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "jobkeys/StripKeys.h"
 #include "jobkeys/Tickets.h"
-#include "measure/ControlStripText.h"
 #include "measure/Helper.h"
+#include "measure/StripLines.h"
 #include "ticket/ParameterTables.h"
 
 namespace {

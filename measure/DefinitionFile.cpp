@@ -35,7 +35,7 @@
 #include <unistd.h>
 
 #include "job/KZVerifyJobProcessor.h"
-#include "measure/ControlStripText.h"
+#include "measure/StripLines.h"
 #include "measure/StripText.h"
 
 namespace {

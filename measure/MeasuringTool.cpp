@@ -12,9 +12,9 @@
 #include <wx/filename.h>
 
 #include "job/KZVerifyJobProcessor.h"
-#include "measure/ControlStripText.h"
 #include "measure/Helper.h"
 #include "measure/NerovaMeasureParams.h"
+#include "measure/StripLines.h"
 
 namespace {
 

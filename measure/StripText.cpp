@@ -11,8 +11,8 @@
 
 #include <wx/convauto.h>
 
-#include "job/JobFiles.h"
-#include "measure/ControlStripText.h"
+#include "job/FileExists.h"
+#include "measure/StripLines.h"
 
 namespace measure {
 

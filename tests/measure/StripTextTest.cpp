@@ -15,7 +15,7 @@
 
 #include "ScratchFolder.h"
 #include "job/KZVerifyJobProcessor.h"
-#include "measure/ControlStripText.h"
+#include "measure/StripLines.h"
 
 namespace {
 

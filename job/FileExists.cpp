@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "job/JobFiles.h"
+#include "job/FileExists.h"
 
 #include <filesystem>
 #include <system_error>
 
 #include "cli/CLogger.h"
-#include "measure/ControlStripText.h"
+#include "measure/StripLines.h"
 
 bool fileExists(const wxString& path) {
     std::error_code ignored;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "measure/StripLookups.h"
+#include "job/StripSources.h"
 
 #include <string>
 
@@ -7,10 +7,10 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "cli/CLogger.h"
-#include "job/JobFiles.h"
+#include "job/FileExists.h"
 #include "jobkeys/Lookups.h"
 #include "jobkeys/ServerPaths.h"
-#include "measure/ControlStripText.h"
+#include "measure/StripLines.h"
 
 using namespace jobkeys;
 

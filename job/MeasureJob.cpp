@@ -5,7 +5,7 @@
 
 #include "ExitCodes.h"
 #include "cli/CLogger.h"
-#include "job/JobFiles.h"
+#include "job/FileExists.h"
 #include "job/KZVerifyJobProcessor.h"
 
 namespace {

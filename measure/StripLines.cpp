@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "measure/ControlStripText.h"
+#include "measure/StripLines.h"
 
 #include <algorithm>
 #include <limits>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include "measure/ControlStripText.h"
+#include "measure/StripLines.h"
 
 #include <string>
 
@@ -34,7 +34,7 @@ TEST(StringConditioning, EndsALineAnew) {
     }
 }
 
-TEST(ControlStripText, NamesItsInstrument) {
+TEST(StripLines, NamesItsInstrument) {
     const support::ScratchFolder folder;
     setenv("TMPDIR", folder.path().c_str(), 1);
     KZVerifyJobProcessor processor;
