@@ -11,7 +11,7 @@
 
 namespace colour::cgats {
 
-enum CharKind : std::uint8_t { plainChar, blankChar, lineEndChar };
+enum CharKind : std::uint8_t { PlainChar, BlankChar, LineEndChar };
 
 /// What every byte is between the cells of a line. Blanks and tabs always separate; spreadsheets
 /// add a semicolon or a comma.
@@ -20,21 +20,21 @@ class CharTable {
     /// `separator` is 0 for blanks and tabs alone, else the sign that separates too.
     explicit constexpr CharTable(char separator, char another = 0) : m_separator(separator) {
         for (const char blank : {' ', '\t', '\v', '\f', '\x1a'}) { // 1A ends texts of old systems
-            m_kinds[static_cast<unsigned char>(blank)] = blankChar;
+            m_kinds[static_cast<unsigned char>(blank)] = BlankChar;
         }
         for (const char lineEnd : {'\n', '\r'}) {
-            m_kinds[static_cast<unsigned char>(lineEnd)] = lineEndChar;
+            m_kinds[static_cast<unsigned char>(lineEnd)] = LineEndChar;
         }
         for (const char more : {separator, another}) {
             if (more != 0) {
-                m_kinds[static_cast<unsigned char>(more)] = blankChar;
+                m_kinds[static_cast<unsigned char>(more)] = BlankChar;
             }
         }
     }
 
-    bool isPlain(char c) const { return m_kinds[static_cast<unsigned char>(c)] == plainChar; }
-    bool isBlank(char c) const { return m_kinds[static_cast<unsigned char>(c)] == blankChar; }
-    bool isLineEnd(char c) const { return m_kinds[static_cast<unsigned char>(c)] == lineEndChar; }
+    bool isPlain(char c) const { return m_kinds[static_cast<unsigned char>(c)] == PlainChar; }
+    bool isBlank(char c) const { return m_kinds[static_cast<unsigned char>(c)] == BlankChar; }
+    bool isLineEnd(char c) const { return m_kinds[static_cast<unsigned char>(c)] == LineEndChar; }
 
     /// What separates cells so strictly that nothing between two of them is an empty cell.
     char cellSeparator() const { return m_separator == 0 ? '\t' : m_separator; }

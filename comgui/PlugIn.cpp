@@ -58,7 +58,7 @@ std::int32_t answer(Body body) {
     } catch (const StoreFailure& failure) {
         return codeOf(failure);
     } catch (...) {
-        return codeRefused;
+        return Code::Refused;
     }
 }
 
@@ -66,7 +66,7 @@ template<class Body>
 std::int32_t inSession(const void* instance, std::uint64_t handle, Body body) {
     return answer([&]() -> std::int32_t {
         Session* const session = find(instance, handle);
-        return session == nullptr ? codeRefused : body(*session);
+        return session == nullptr ? Code::Refused : body(*session);
     });
 }
 
@@ -83,20 +83,21 @@ bool isUsable(const ComSessionRecord* record) {
 std::int32_t createInstance(void** instance) {
     return answer([&] {
         if (instance == nullptr) {
-            return codeRefused;
+            return Code::Refused;
         }
         auto made = std::make_unique<Instance>();
         void* const word = made.get();
         instances().emplace(word, std::move(made));
         *instance = word;
-        return codeDone;
+        return Code::Done;
     });
 }
 
 /// Login reads the record again, since the client may change it until then.
 std::int32_t initialize(void* instance, ComSessionRecord* record) {
-    return answer(
-        [&] { return find(instance) == nullptr || !isUsable(record) ? codeRefused : codeDone; });
+    return answer([&] {
+        return find(instance) == nullptr || !isUsable(record) ? Code::Refused : Code::Done;
+    });
 }
 
 std::int32_t uninitialize(void* instance, ComSessionRecord* record) {
@@ -119,15 +120,15 @@ std::int32_t login(void* instance, ComSessionRecord* record) {
     return answer([&] {
         Instance* const known = find(instance);
         if (known == nullptr || !isUsable(record)) {
-            return codeRefused;
+            return Code::Refused;
         }
         const std::string address = textOf(record->server);
         auto engine = openForLogin(address);
         switch (checkLogin(*engine, textOf(record->user), textOf(record->password))) {
         case LoginAnswer::WrongUserOrPassword:
-            return codeWrongUserOrPassword;
+            return Code::WrongUserOrPassword;
         case LoginAnswer::Disabled:
-            return codeUserDisabled;
+            return Code::UserDisabled;
         case LoginAnswer::Welcome:
             break;
         }
@@ -136,14 +137,14 @@ std::int32_t login(void* instance, ComSessionRecord* record) {
         known->sessions.emplace(lastHandle + 1,
                                 std::make_unique<Session>(address, std::move(engine)));
         record->session = ++lastHandle;
-        return codeDone;
+        return Code::Done;
     });
 }
 
 std::int32_t logout(void* instance, std::uint64_t handle) {
     return answer([&] {
         Instance* const known = find(instance);
-        return known != nullptr && known->sessions.erase(handle) != 0 ? codeDone : codeRefused;
+        return known != nullptr && known->sessions.erase(handle) != 0 ? Code::Done : Code::Refused;
     });
 }
 
@@ -161,31 +162,33 @@ std::int32_t getTicketData(void* instance, std::uint64_t handle, int type, int k
 
 /// No kind of whole-ticket data is written here.
 std::int32_t setTicketData(void*, std::uint64_t, int, int, int, int*, void*) {
-    return codeRefused;
+    return Code::Refused;
 }
 
 std::int32_t sendCommand(void* instance, std::uint64_t handle, const char* command, int size,
                          void* data) {
     return inSession(instance, handle, [&](Session& session) {
-        return command == nullptr ? codeRefused : session.sendCommand(command, size, data);
+        return command == nullptr ? Code::Refused : session.sendCommand(command, size, data);
     });
 }
 
 std::int32_t putFile(void* instance, std::uint64_t handle, const char* first, const char* second) {
     return inSession(instance, handle, [&](Session& session) {
-        return first == nullptr || second == nullptr ? codeRefused : session.putFile(first, second);
+        return first == nullptr || second == nullptr ? Code::Refused
+                                                     : session.putFile(first, second);
     });
 }
 
 std::int32_t getFile(void* instance, std::uint64_t handle, const char* first, const char* second) {
     return inSession(instance, handle, [&](Session& session) {
-        return first == nullptr || second == nullptr ? codeRefused : session.getFile(first, second);
+        return first == nullptr || second == nullptr ? Code::Refused
+                                                     : session.getFile(first, second);
     });
 }
 
 /// A store prints nothing: there is nobody to hand a job to.
 std::int32_t sendJob(void*, std::uint64_t, TJobIdentification*, const char*, const char*) {
-    return codeRefused;
+    return Code::Refused;
 }
 
 /// Answered from a session with this store if there is one, which then tries to reach a server that
@@ -197,18 +200,18 @@ std::int32_t isAlive(void* instance, const char* host, int) {
     const std::int32_t result = answer([&]() -> std::int32_t {
         const Instance* const known = find(instance);
         if (known == nullptr || host == nullptr) {
-            return codeNoStore;
+            return Code::NoStore;
         }
         for (const auto& [handle, session] : known->sessions) {
             if (session->address() == host) {
-                return session->alive() ? codeDone : codeNoStore;
+                return session->alive() ? Code::Done : Code::NoStore;
             }
         }
         openForLogin(host);
-        return codeDone;
+        return Code::Done;
     });
     const bool answered =
-        result == codeDone || result == codeStoreIsNewer || result == codeStoreIsOlder;
+        result == Code::Done || result == Code::StoreIsNewer || result == Code::StoreIsOlder;
     return answered ? alive : silent;
 }
 

@@ -89,19 +89,19 @@ void put(void* to, const T& value) {
 Code codeOf(const StoreFailure& failure) {
     switch (failure.fault) {
     case Fault::Newer:
-        return codeStoreIsNewer;
+        return Code::StoreIsNewer;
     case Fault::Older:
-        return codeStoreIsOlder;
+        return Code::StoreIsOlder;
     case Fault::BadPath:
-        return codeBadPath;
+        return Code::BadPath;
     case Fault::NoFile:
-        return codeNoFile;
+        return Code::NoFile;
     case Fault::ReadOnly:
     case Fault::Full:
     case Fault::Busy:
-        return codeNotWritten;
+        return Code::NotWritten;
     default:
-        return codeNoStore;
+        return Code::NoStore;
     }
 }
 
@@ -141,24 +141,24 @@ Code Session::getTicketData(int type, int kind, int index, int* size, void* buff
     constexpr int idsKind = 1;
     if (!TICKET_TYPE_Valid(type) || (kind != numberKind && kind != idsKind) || index != 0 ||
         size == nullptr || *size < 0 || buffer == nullptr) {
-        return codeRefused;
+        return Code::Refused;
     }
     const std::vector<int> ids = m_storage->listIds(type);
     if (kind == numberKind) {
         const int number = static_cast<int>(ids.size());
         if (*size < static_cast<int>(sizeof number)) {
-            return codeRefused;
+            return Code::Refused;
         }
         put(buffer, number);
         *size = sizeof number;
-        return codeDone;
+        return Code::Done;
     }
     const std::size_t fitting = std::min(ids.size(), static_cast<std::size_t>(*size) / sizeof(int));
     if (fitting != 0) {
         std::memcpy(buffer, ids.data(), fitting * sizeof(int));
     }
     *size = static_cast<int>(fitting * sizeof(int));
-    return codeDone;
+    return Code::Done;
 }
 
 Code Session::sendCommand(std::string_view command, int size, void* data) {
@@ -169,11 +169,11 @@ Code Session::sendCommand(std::string_view command, int size, void* data) {
                                 : command == "local.set.thumbnailfolder" ? &m_thumbnailFolder
                                                                          : nullptr;
     if (folder == nullptr || size < 0 || data == nullptr) {
-        return codeRefused;
+        return Code::Refused;
     }
     const auto* const text = static_cast<const char*>(data);
     folder->assign(text, strnlen(text, static_cast<std::size_t>(size)));
-    return codeDone;
+    return Code::Done;
 }
 
 /// Takes the client's pointer out of the ticket, and gives it the number under which the client
@@ -181,7 +181,7 @@ Code Session::sendCommand(std::string_view command, int size, void* data) {
 Code Session::setCallback(void* ticket) {
     const auto found = findTicket(ticket);
     if (found == nullptr) {
-        return codeRefused;
+        return Code::Refused;
     }
     void* user = nullptr;
     found->get("pUser", PARAM_POINTER, &user, POSITION_WHOLE);
@@ -190,23 +190,23 @@ Code Session::setCallback(void* ticket) {
     const bool told = setSingle("iGUINotificationID", PARAM_INT, &id, POSITION_WHOLE,
                                 [&](SETMULTIPAR* table) { return found->apply(table); });
     if (!told) {
-        return codeRefused;
+        return Code::Refused;
     }
     lastNotificationId = std::max(lastNotificationId, id);
     m_notificationId = id;
     m_callbackUser = user;
-    return codeDone;
+    return Code::Done;
 }
 
 Code Session::putFile(const std::string& local, const std::string& server) {
     std::error_code failure;
     // A pipe would have us wait for its writer.
     if (!std::filesystem::is_regular_file(local, failure)) {
-        return codeNoFile;
+        return Code::NoFile;
     }
     std::ifstream from(local, std::ios::binary);
     if (!from) {
-        return codeNoFile;
+        return Code::NoFile;
     }
     try {
         m_engine->putFile(server, from);
@@ -214,19 +214,19 @@ Code Session::putFile(const std::string& local, const std::string& server) {
         noteFailure("file", server, failure.what());
         throw;
     }
-    return codeDone;
+    return Code::Done;
 }
 
 Code Session::getFile(const std::string& local, const std::string& server) {
     if (local.empty()) {
-        return codeRefused;
+        return Code::Refused;
     }
     LocalCopy copy(local);
     if (!copy.isOpen()) {
-        return codeNotWritten;
+        return Code::NotWritten;
     }
     m_engine->getFile(server, copy.stream());
-    return copy.putInPlace() ? codeDone : codeNotWritten;
+    return copy.putInPlace() ? Code::Done : Code::NotWritten;
 }
 
 } // namespace store

@@ -15,16 +15,16 @@ namespace store {
 
 /// What slots of the plug-in's table answer. A login that fails gives one of the first five.
 enum Code : std::int32_t {
-    codeDone = 0,
-    codeWrongUserOrPassword = -2004,
-    codeNoStore = -2005, ///< Nor one that this process may use.
-    codeUserDisabled = -2030,
-    codeStoreIsNewer = -2031,
-    codeStoreIsOlder = -2033,
-    codeRefused = -1,    ///< An argument, handle or command that means nothing here.
-    codeNoFile = -2050,  ///< The server has no such file.
-    codeBadPath = -2051, ///< A server path that leads out of the store's files, or to a folder.
-    codeNotWritten = -2052,
+    Done = 0,
+    WrongUserOrPassword = -2004,
+    NoStore = -2005, ///< Nor one that this process may use.
+    UserDisabled = -2030,
+    StoreIsNewer = -2031,
+    StoreIsOlder = -2033,
+    Refused = -1,    ///< An argument, handle or command that means nothing here.
+    NoFile = -2050,  ///< The server has no such file.
+    BadPath = -2051, ///< A server path that leads out of the store's files, or to a folder.
+    NotWritten = -2052,
 };
 
 Code codeOf(const StoreFailure& failure);

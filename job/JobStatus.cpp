@@ -19,7 +19,7 @@ bool hasResult(const JobTicket& ticket, Strip strip) {
     if (code != 0 || approval < 0) {
         return false;
     }
-    CLogger::GetLogger()->Log("%s Strip verified YES", strip == Strip::first ? "First" : "Second");
+    CLogger::GetLogger()->Log("%s Strip verified YES", strip == Strip::First ? "First" : "Second");
     return true;
 }
 
@@ -36,7 +36,7 @@ int KZVerifyJobProcessor::SetJobStatus(int jobID, bool approved) {
     CLogger::GetLogger()->Log("Job With Two Strips = %d", hasTwoStrips ? 1 : 0);
     if (hasTwoStrips) {
         result = 0;
-        if (!hasResult(ticket, Strip::first) || !hasResult(ticket, Strip::second)) {
+        if (!hasResult(ticket, Strip::First) || !hasResult(ticket, Strip::Second)) {
             return result;
         }
     }

@@ -89,7 +89,7 @@ int lookUpEskoReferences(const JobLoad& load) {
     }
     std::string strip; // As for a profile: a path that is no UTF-8 is one.
     if (load.ticket.read("Footer/ControlstripIT8", &strip) != 0 || strip.empty()) {
-        return noReference;
+        return NoReference;
     }
     fetchFile(load, wxString::FromUTF8(strip), usualWait, &load.job->controlStripFile);
     return 0;
@@ -103,7 +103,7 @@ int lookUpProfile(const JobLoad& load) {
     int ignored = 0;
     const std::string path = referenceProfile(load.strip, load.ticket.texts(&ignored));
     if (path.empty()) {
-        return noReference;
+        return NoReference;
     }
     fetchFile(load, wxString::FromUTF8(path), profileWait, &load.job->referenceFile);
     return 0;
@@ -119,7 +119,7 @@ int lookUpCharacterisation(const JobLoad& load) {
     std::string value;
     load.ticket.read(stripKey(load.strip, characterisationKey), &value);
     if (value.empty()) {
-        return noReference;
+        return NoReference;
     }
     // A value that is not valid UTF-8 is empty from here on.
     const std::string text = wxString::FromUTF8(value).utf8_string();
@@ -137,14 +137,14 @@ int takeStoredReferences(const JobLoad& load) {
     const int code = load.processor->LoadKZJobReferences(&job);
     CLogger::GetLogger()->Log("LoadKZJobReferences returns = %d", code);
     if (code != 0) {
-        return referencesNotLoaded;
+        return ReferencesNotLoaded;
     }
     if (load.processor->WriteTemporarySampleFile(job, true) != 0 ||
         !fileExists(job.referenceFile)) {
         // The line names the other file (C36).
         CLogger::GetLogger()->Log("Temporary Reference file not found = %s",
                                   measure::pathBytes(job.sampleFile).c_str());
-        return noReference;
+        return NoReference;
     }
     return 0;
 }
@@ -184,5 +184,5 @@ int lookUpReferences(const JobLoad& load) {
     case ReferenceWay::None:
         break;
     }
-    return noReference;
+    return NoReference;
 }

@@ -26,8 +26,8 @@ struct JobLoad {
 /// What a lookup gives where it finds nothing. The step that fetches the JDF replaces both, so that
 /// they never leave a load.
 enum LookupFailure : int {
-    noReference = 104,
-    referencesNotLoaded = 110, ///< Those that the ticket should hold.
+    NoReference = 104,
+    ReferencesNotLoaded = 110, ///< Those that the ticket should hold.
 };
 
 /// Fetches a file into the job's folder, under the last part of its server path. Where it comes

@@ -60,7 +60,7 @@ class StripTicket {
 };
 
 std::string commentOf(Strip strip) {
-    return strip == Strip::first ? "Remote confirmation M1" : "Remote confirmation M2";
+    return strip == Strip::First ? "Remote confirmation M1" : "Remote confirmation M2";
 }
 
 /// How the JDF names a formula.
@@ -82,7 +82,7 @@ const char* formulaName(int deltaEType) {
 /// A device value of 0 to 255 in percent: of the first strip with two decimals, of the second one,
 /// as a 16-bit number, without any (C85).
 double percentOf(double value, Strip strip) {
-    if (strip == Strip::first) {
+    if (strip == Strip::First) {
         return round_(value / 2.55, 2);
     }
     const auto whole = MathLib::cast_value<std::int64_t>(std::floor(value / 2.55 + 0.5));
@@ -103,7 +103,7 @@ Bytes bytesOf(const bool (&flags)[presetValueCount]) {
 JDFMeasurementHeader headerOf(KZJobDataStruct& job, const analyseResultsRecord& results) {
     JDFMeasurementHeader header;
     JdfHandler::SetJDFMeasurementHeaderDefaults(&header);
-    header.secondStrip = stripOf(job.secondStrip) == Strip::first ? 0 : 1;
+    header.secondStrip = stripOf(job.secondStrip) == Strip::First ? 0 : 1;
     header.party = job.jobType != 0 ? 2 : 1;
     CharSets::stracpy(header.deltaEType, formulaName(job.measurement.deltaEType),
                       sizeof header.deltaEType);

@@ -28,7 +28,7 @@ inline constexpr const char* remoteJdfKey = "Remote/JDFName";
 
 /// A dynamic strip takes the place of the first strip alone.
 constexpr bool isDynamic(Strip strip, int useDynstrip) {
-    return useDynstrip == 1 && strip == Strip::first;
+    return useDynstrip == 1 && strip == Strip::First;
 }
 
 /// The name of a strip that is not dynamic. Its own key counts from four bytes on.

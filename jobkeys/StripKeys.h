@@ -12,13 +12,13 @@
 
 namespace jobkeys {
 
-enum class Strip { first, second };
+enum class Strip { First, Second };
 
-inline constexpr Strip strips[] = {Strip::first, Strip::second};
+inline constexpr Strip strips[] = {Strip::First, Strip::Second};
 
 /// 1 or 2.
 constexpr int numberOf(Strip strip) {
-    return strip == Strip::first ? 1 : 2;
+    return strip == Strip::First ? 1 : 2;
 }
 
 /// The strip selector of a call. Nothing if the text does not start with a whole number, or if the
@@ -33,12 +33,12 @@ inline std::optional<int> stripSelectorOf(const std::wstring& text) {
 
 /// Of KZJobDataStruct::secondStrip: 0 is the first strip, any other value the second (C28).
 constexpr Strip stripOf(int secondStrip) {
-    return secondStrip == 0 ? Strip::first : Strip::second;
+    return secondStrip == 0 ? Strip::First : Strip::Second;
 }
 
 /// The root of a strip's measurement, without a slash at its end.
 constexpr std::string_view measurementRoot(Strip strip) {
-    return strip == Strip::first ? "Remote/Measurement" : "Remote/Measurement2";
+    return strip == Strip::First ? "Remote/Measurement" : "Remote/Measurement2";
 }
 
 /// The key of a name below the strip's measurement, such as "Status" or "XYZValues/XValues".
@@ -53,7 +53,7 @@ inline std::string referenceKey(Strip strip, std::string_view name) {
 
 /// The strip's form of a key such as "Footer/ControlstripFile".
 inline std::string stripKey(Strip strip, std::string_view key) {
-    return std::string(key).append(strip == Strip::first ? "" : "2");
+    return std::string(key).append(strip == Strip::First ? "" : "2");
 }
 
 } // namespace jobkeys

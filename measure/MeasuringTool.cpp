@@ -21,12 +21,12 @@ namespace {
 namespace fs = std::filesystem;
 
 enum Outcome {
-    done = 0,
-    alreadyRunning = -1,
-    notStarted = -2,
-    noControlStrip = -3,
-    noDefinition = -4,
-    noDefinitionPath = -5,
+    Done = 0,
+    AlreadyRunning = -1,
+    NotStarted = -2,
+    NoControlStrip = -3,
+    NoDefinition = -4,
+    NoDefinitionPath = -5,
 };
 
 constexpr int codeOfRunningTool = 1015;
@@ -83,10 +83,10 @@ wxString instrumentOf(const wxString& definition) {
 Outcome launch(const NerovaMeasureParams& params) {
     int exitCode = 0;
     if (Helper::LaunchNerovaMeasure(params, exitCode, true) && exitCode == 0) {
-        return done;
+        return Done;
     }
     removeFile(params.o);
-    return exitCode == -1 || exitCode == codeOfRunningTool ? alreadyRunning : notStarted;
+    return exitCode == -1 || exitCode == codeOfRunningTool ? AlreadyRunning : NotStarted;
 }
 
 } // namespace
@@ -103,12 +103,12 @@ int GetLanguageID(KZJobDataStruct* job) {
 int KZVerifyJobProcessor::ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job) {
     const wxString& controlStrip = job->controlStripFile;
     if (controlStrip.empty()) {
-        return noControlStrip;
+        return NoControlStrip;
     }
     const ReplacedStrip replacedStrip(controlStrip);
     const wxString definition = WriteTemporaryMeasurementDefinitionFile(controlStrip, job);
     if (definition.empty()) {
-        return noDefinition;
+        return NoDefinition;
     }
     removeFile(job->sampleFile); // An old one is not to be taken for a new one.
     NerovaMeasureParams params;
@@ -118,7 +118,7 @@ int KZVerifyJobProcessor::ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job) 
     params.patchname = wxFileName(controlStrip).GetFullName();
     params.patch = definition;
     if (params.patch.empty()) {
-        return noDefinitionPath;
+        return NoDefinitionPath;
     }
     params.i = instrumentOf(definition);
     params.m = "measure";

@@ -123,7 +123,7 @@ class Examination {
     std::unique_ptr<ReadOnlyServer> m_server;
     std::unique_ptr<KZVerifyJobProcessor> m_processor;
     KZJobDataStruct m_job;
-    Strip m_strip = Strip::first;
+    Strip m_strip = Strip::First;
     std::vector<Finding> m_findings;
     Diagnosis m_result;
 };

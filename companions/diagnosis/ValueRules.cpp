@@ -101,7 +101,7 @@ void Values::judgeComparison() {
 
 /// Values that lead a run another way than a person may expect.
 void Values::judgeRoad() {
-    if (m_strip == Strip::second &&
+    if (m_strip == Strip::Second &&
         numberOf(jobkeys::verifyActiveKey) != jobkeys::activeForTwoStrips) {
         add("Workflow/Verify/Active",
             "is not 3: the job counts as one with a single strip, and a run on the second closes "

@@ -66,7 +66,7 @@ using SharedContent = std::shared_ptr<const store::TicketContent>;
 struct Verified {
     int job = 0;
     int parent = 0; ///< Of a job on a sheet with others; 0 for none.
-    Strip strip = Strip::first;
+    Strip strip = Strip::First;
     std::int64_t time = 0;
 };
 
@@ -270,7 +270,7 @@ class Gatherer {
 
     void add(const Verified& verified) {
         const SharedContent job =
-            m_store.content(jobType, verified.job, m_keys[verified.strip == Strip::first ? 0 : 1]);
+            m_store.content(jobType, verified.job, m_keys[verified.strip == Strip::First ? 0 : 1]);
         if (!job) { // Deleted meanwhile.
             return;
         }
@@ -343,7 +343,7 @@ class Gatherer {
     ServerLookups m_server;
     Targets m_targets;
     const LocalPages m_pages;
-    const store::KeyFilter m_keys[2] = {keysOf(Strip::first), keysOf(Strip::second)};
+    const store::KeyFilter m_keys[2] = {keysOf(Strip::First), keysOf(Strip::Second)};
     std::map<std::tuple<int, Strip, std::string>, std::size_t> m_known;
     Gathered m_gathered;
     std::size_t m_changes = 0;

@@ -32,7 +32,7 @@ constexpr Statement keysOfType = {
     " UNION ALL SELECT NULL, NULL,"
     " string_agg(int8send(number), ''), string_agg(int4send(id), '')"
     " FROM tintgate.tickets WHERE type = $1"};
-enum Column { nameColumn, valueColumn, numbersColumn, idsColumn };
+enum Column { NameColumn, ValueColumn, NumbersColumn, IdsColumn };
 
 /// The first of numbers that are packed one behind the other, which it takes off them.
 std::int64_t takeBigint(std::string_view& packed) {
@@ -53,8 +53,8 @@ using Ticket = std::pair<int, std::int64_t>;
 
 /// By id.
 std::vector<Ticket> ticketsIn(const Result& rows, int row) {
-    std::string_view ids = rows.bytes(row, idsColumn);
-    std::string_view numbers = rows.bytes(row, numbersColumn);
+    std::string_view ids = rows.bytes(row, IdsColumn);
+    std::string_view numbers = rows.bytes(row, NumbersColumn);
     std::vector<Ticket> tickets;
     if (ids.size() % sizeof(int) != 0 || ids.size() / sizeof(int) != numbers.size() / 8 ||
         numbers.size() % 8 != 0) {
@@ -116,19 +116,19 @@ void showKeys(const Result& rows, const std::vector<std::string>& names,
     std::vector<Key> keys;
     for (std::size_t i = 0; i < rowCount; ++i) {
         const int row = static_cast<int>(i);
-        if (rows.isNull(row, nameColumn)) {
+        if (rows.isNull(row, NameColumn)) {
             tickets = ticketsIn(rows, row);
             continue;
         }
-        const auto name = std::find(names.begin(), names.end(), rows.bytes(row, nameColumn));
-        if (name == names.end() || rows.bytes(row, numbersColumn).size() % 8 != 0) {
+        const auto name = std::find(names.begin(), names.end(), rows.bytes(row, NameColumn));
+        if (name == names.end() || rows.bytes(row, NumbersColumn).size() % 8 != 0) {
             failDamaged();
         }
         nameOf[i] = static_cast<std::size_t>(name - names.begin());
-        if (!rows.isNull(row, valueColumn)) {
-            elementsOf[i] = decoded(rows.bytes(row, valueColumn));
+        if (!rows.isNull(row, ValueColumn)) {
+            elementsOf[i] = decoded(rows.bytes(row, ValueColumn));
         }
-        for (std::string_view numbers = rows.bytes(row, numbersColumn); !numbers.empty();) {
+        for (std::string_view numbers = rows.bytes(row, NumbersColumn); !numbers.empty();) {
             keys.push_back({takeBigint(numbers), i});
             if (keys.back().ticket < 0) {
                 failDamaged();

@@ -61,8 +61,8 @@ std::string traceOf(const std::map<std::string, std::string>& ticket, LookUp loo
 }
 
 TEST(JobKeys, ReadsAFurtherKeyOnlyIfItIsNeeded) {
-    const auto strip = [](auto text) { return fixedStripName(Strip::second, text); };
-    const auto profile = [](auto text) { return referenceProfile(Strip::second, text); };
+    const auto strip = [](auto text) { return fixedStripName(Strip::Second, text); };
+    const auto profile = [](auto text) { return referenceProfile(Strip::Second, text); };
     const auto folder = [](auto text) { return jdfFolder(text); };
     const std::string own = "Footer/ControlstripFile2";
     const std::string nested = "Footer/Nesting/ControlstripFile2";
