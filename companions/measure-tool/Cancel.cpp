@@ -17,7 +17,7 @@
 #include "base/Descriptor.h"
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 constexpr int cancelling[] = {SIGINT, SIGHUP, SIGTERM};
@@ -117,4 +117,4 @@ bool hasLeftWork() {
     return worksLeft > 0;
 }
 
-} // namespace measuring
+} // namespace measuretool

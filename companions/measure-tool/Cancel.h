@@ -11,7 +11,7 @@
 #include <type_traits>
 #include <utility>
 
-namespace measuring {
+namespace measuretool {
 
 using Clock = std::chrono::steady_clock;
 
@@ -53,4 +53,4 @@ std::invoke_result_t<Work> unlessCancelled(Work work) {
     return *resultBefore(Clock::time_point::max(), std::move(work));
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -18,7 +18,7 @@
 #include "colour/CgatsColumns.h"
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 using colour::cgats::Column;
@@ -285,4 +285,4 @@ void dropCutCells(const TableLines& table) {
     }
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -6,7 +6,7 @@
 #include <span>
 #include <string>
 
-namespace measuring {
+namespace measuretool {
 
 /// The lines of one table, without their line ends.
 struct TableLines {
@@ -28,4 +28,4 @@ struct TableLines {
 /// that no column's name belongs to.
 void dropCutCells(const TableLines& table);
 
-} // namespace measuring
+} // namespace measuretool

@@ -37,7 +37,7 @@
 #include "companions/measure-tool/CutLines.h"
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 constexpr std::size_t largestFile = 64 << 20;
@@ -237,4 +237,4 @@ Definition readDefinition(const std::string& path) {
     return definition;
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -6,7 +6,7 @@
 
 #include "colour/DataSet.h"
 
-namespace measuring {
+namespace measuretool {
 
 struct Definition {
     colour::DataSet chart; ///< Ids, names and device values of the patches, in order; no colours.
@@ -21,4 +21,4 @@ struct Definition {
 /// columns of inks are in percent, columns of RGB may be from 0 to 255.
 Definition readDefinition(const std::string& path);
 
-} // namespace measuring
+} // namespace measuretool

@@ -16,7 +16,7 @@
 #include "companions/measure-tool/Failure.h"
 #include "companions/measure-tool/Patches.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 /// An exported file must not change for this long before it counts as written.
@@ -230,4 +230,4 @@ Reading ExportedMeasurement::measure(std::size_t patch) {
     return {m_set.lab[row], m_set.xyz[row], {spectrum, spectrum + m_set.axis.length}};
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -10,7 +10,7 @@
 #include "companions/measure-tool/Operator.h"
 #include "companions/measure-tool/Settings.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// Hands over what was exported for the patches of a definition.
 class ExportedMeasurement : public Instrument {
@@ -31,4 +31,4 @@ class ExportedMeasurement : public Instrument {
     std::vector<std::size_t> m_rows; ///< Of each patch of the chart.
 };
 
-} // namespace measuring
+} // namespace measuretool

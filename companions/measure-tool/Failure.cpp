@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 
 const char* wordsFor(colour::Failure failure) {
     switch (failure) {
@@ -45,4 +45,4 @@ void expectUsable(colour::Failure failure, Status status, const std::string& pat
     throw Failure(status, path + " " + wordsFor(failure));
 }
 
-} // namespace measuring
+} // namespace measuretool

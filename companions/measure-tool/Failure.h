@@ -8,7 +8,7 @@
 #include "CompanionStatuses.h"
 #include "colour/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 
 using Status = NerovaMeasureStatus; ///< Listed in docs/companion-statuses.csv.
 
@@ -26,4 +26,4 @@ const char* wordsFor(colour::Failure failure);
 /// Throws Failure (`status`, or OutOfMemory) unless the file at `path` could be used.
 void expectUsable(colour::Failure failure, Status status, const std::string& path);
 
-} // namespace measuring
+} // namespace measuretool

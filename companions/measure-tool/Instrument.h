@@ -7,7 +7,7 @@
 
 #include "colour/DataSet.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// What an instrument says of one patch.
 struct Reading {
@@ -31,4 +31,4 @@ class Instrument {
     virtual Reading measure(std::size_t patch) = 0;
 };
 
-} // namespace measuring
+} // namespace measuretool

@@ -10,7 +10,7 @@
 #include "companions/measure-tool/Cancel.h"
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 [[noreturn]] void crash() {
@@ -68,4 +68,4 @@ colour::DataSet measureAll(const colour::DataSet& chart, Instrument& instrument,
     return measurement;
 }
 
-} // namespace measuring
+} // namespace measuretool

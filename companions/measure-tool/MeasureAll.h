@@ -7,11 +7,11 @@
 #include "companions/measure-tool/Progress.h"
 #include "companions/measure-tool/Settings.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// Measures all patches of a chart, at the pace and with the mishap that the settings want. Throws
 /// Failure: InstrumentFailed, Cancelled, and what the instrument throws.
 colour::DataSet measureAll(const colour::DataSet& chart, Instrument& instrument,
                            const Settings& settings, Progress& progress);
 
-} // namespace measuring
+} // namespace measuretool

@@ -14,7 +14,7 @@
 #include "companions/measure-tool/Failure.h"
 #include "companions/measure-tool/Text.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 constexpr std::chrono::seconds patience{2};
@@ -115,10 +115,10 @@ void Notification::show(const std::string& title, std::initializer_list<std::str
     // The bus itself may be slow to answer, which the limit of a call does not cover.
     const auto number = resultBefore(Clock::now() + patience,
                                      [replaced = m_number, title = printable(title), text] {
-                                         return measuring::show(replaced, title, text);
+                                         return measuretool::show(replaced, title, text);
                                      });
     m_number = number.value_or(0);
     m_failed = m_number == 0;
 }
 
-} // namespace measuring
+} // namespace measuretool

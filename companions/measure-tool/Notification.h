@@ -6,7 +6,7 @@
 #include <initializer_list>
 #include <string>
 
-namespace measuring {
+namespace measuretool {
 
 /// Shown by whatever serves org.freedesktop.Notifications on the session bus; there is none without
 /// DBUS_SESSION_BUS_ADDRESS. A desktop that fails or does not answer within two seconds is not
@@ -29,4 +29,4 @@ class Notification {
     bool m_failed = false;
 };
 
-} // namespace measuring
+} // namespace measuretool

@@ -6,7 +6,7 @@
 
 #include "companions/measure-tool/Text.h"
 
-namespace measuring {
+namespace measuretool {
 
 Operator::Operator(const std::string& strip, Progress& progress, const RunLog& log)
     : m_strip(strip.empty() ? "the strip" : strip), m_progress(progress), m_log(log) {}
@@ -52,4 +52,4 @@ void Operator::remark(const std::string& sentence) {
     m_progress.say(sentence);
 }
 
-} // namespace measuring
+} // namespace measuretool

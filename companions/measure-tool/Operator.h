@@ -9,7 +9,7 @@
 #include "companions/measure-tool/Progress.h"
 #include "companions/measure-tool/RunLog.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// Tells the operator what to do, on the terminal and the desktop, and keeps it in the log.
 class Operator {
@@ -43,4 +43,4 @@ class Operator {
     std::string m_until; ///< The same on the operator's clock.
 };
 
-} // namespace measuring
+} // namespace measuretool

@@ -20,7 +20,7 @@
 #include "colour/ColourFile.h"
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 constexpr std::size_t largestFile = 1 << 20;
@@ -76,4 +76,4 @@ Options readOptions(const std::string& path) {
     return {needed("-patch"), needed("-o"), valueOf("-patchname"), valueOf("-i")};
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -4,7 +4,7 @@
 
 #include <string>
 
-namespace measuring {
+namespace measuretool {
 
 /// The options that matter here; the others are read over. Paths are bytes.
 struct Options {
@@ -18,4 +18,4 @@ struct Options {
 /// no pairs, or where -m is not "measure" or a path is missing.
 Options readOptions(const std::string& path);
 
-} // namespace measuring
+} // namespace measuretool

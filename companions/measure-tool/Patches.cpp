@@ -11,7 +11,7 @@
 
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 using colour::DataSet;
@@ -274,4 +274,4 @@ std::string deviceText(const DataSet& set, std::size_t patch) {
     return text;
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -8,7 +8,7 @@
 
 #include "colour/DataSet.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// For each patch of the chart, the row of `measured` that is the same patch. Throws Failure
 /// (OtherPatches) unless both are the same patches, all of them and no others. The failure names a
@@ -27,4 +27,4 @@ std::vector<std::size_t> matchPatches(const colour::DataSet& chart, const colour
 /// The device values of a patch as text: "40 27 27 0". Empty if there are none.
 std::string deviceText(const colour::DataSet& set, std::size_t patch);
 
-} // namespace measuring
+} // namespace measuretool

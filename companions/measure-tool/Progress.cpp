@@ -6,7 +6,7 @@
 #include "companions/measure-tool/Patches.h"
 #include "companions/measure-tool/Text.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 constexpr std::chrono::milliseconds betweenLooks{40};
@@ -66,4 +66,4 @@ void Progress::line(const std::string& text) {
     m_open = true;
 }
 
-} // namespace measuring
+} // namespace measuretool

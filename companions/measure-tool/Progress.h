@@ -9,7 +9,7 @@
 
 #include "colour/DataSet.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// One line that changes from patch to patch; nothing at all where nobody looks. Standard error, or
 /// where that is no terminal, standard output.
@@ -38,4 +38,4 @@ class Progress {
     std::chrono::steady_clock::time_point m_next{};
 };
 
-} // namespace measuring
+} // namespace measuretool

@@ -7,7 +7,7 @@
 
 #include "colour/Spectra.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 constexpr int mostSteps = 200;
@@ -174,4 +174,4 @@ bool ReflectanceMaker::make(const colour::Xyz& xyz, std::vector<double>& reflect
     return false;
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -7,7 +7,7 @@
 
 #include "colour/DataSet.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// Countless reflectances have the same XYZ. This one is the smoothest that stays between 0 and 1:
 /// "least hyperbolic tangent slope squared", Scott A. Burns, "Numerical methods for smoothest
@@ -38,4 +38,4 @@ class ReflectanceMaker {
         m_weights; ///< XYZ of each wavelength's light, 0 to 1.
 };
 
-} // namespace measuring
+} // namespace measuretool

@@ -15,7 +15,7 @@
 #include "base/Descriptor.h"
 #include "companions/measure-tool/Text.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 /// True if a file starts as each line of a log does, or is empty.
@@ -65,4 +65,4 @@ void RunLog::add(std::string_view sentence) const {
     }
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -7,7 +7,7 @@
 #include <string_view>
 #include <vector>
 
-namespace measuring {
+namespace measuretool {
 
 class RunLog {
   public:
@@ -26,4 +26,4 @@ class RunLog {
     std::string m_path;
 };
 
-} // namespace measuring
+} // namespace measuretool

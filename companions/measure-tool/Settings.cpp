@@ -20,7 +20,7 @@
 #include "companions/measure-tool/Failure.h"
 #include "platform/SystemRoot.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 constexpr std::size_t largestFile = 1 << 20;
@@ -248,4 +248,4 @@ Settings readSettings(const std::string& path) {
     return settings;
 }
 
-} // namespace measuring
+} // namespace measuretool

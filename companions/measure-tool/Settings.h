@@ -10,7 +10,7 @@
 
 #include "colour/DataSet.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// What goes wrong on purpose, for tests and training.
 enum class Mishap { None, Fail, Cancel, Hang, Crash };
@@ -49,4 +49,4 @@ std::string settingsPath();
 /// (BadSettings), with the line, for whatever is not as described in docs/measuring.md.
 Settings readSettings(const std::string& path);
 
-} // namespace measuring
+} // namespace measuretool

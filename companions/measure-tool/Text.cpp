@@ -6,7 +6,7 @@
 
 #include "base/Utf8.h"
 
-namespace measuring {
+namespace measuretool {
 
 std::string printable(std::string_view text) {
     std::string result;
@@ -47,4 +47,4 @@ std::string timeText(std::chrono::system_clock::time_point time) {
     return text;
 }
 
-} // namespace measuring
+} // namespace measuretool

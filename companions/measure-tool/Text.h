@@ -6,7 +6,7 @@
 #include <string>
 #include <string_view>
 
-namespace measuring {
+namespace measuretool {
 
 /// A text as valid UTF-8 without control characters, each of which becomes a question mark: paths
 /// and ids of foreign files must not command a terminal.
@@ -21,4 +21,4 @@ std::string clockText(std::chrono::system_clock::time_point time);
 /// The time in UTC as ISO 8601 has it: "2024-05-01T12:34:56Z".
 std::string timeText(std::chrono::system_clock::time_point time);
 
-} // namespace measuring
+} // namespace measuretool

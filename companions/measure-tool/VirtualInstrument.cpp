@@ -12,7 +12,7 @@
 #include "companions/measure-tool/Cancel.h"
 #include "companions/measure-tool/Failure.h"
 
-namespace measuring {
+namespace measuretool {
 namespace {
 
 /// Six decimals: more than a print can mean, and short enough to read.
@@ -126,4 +126,4 @@ Reading VirtualInstrument::measure(std::size_t patch) {
     return reading;
 }
 
-} // namespace measuring
+} // namespace measuretool

@@ -10,7 +10,7 @@
 #include "companions/measure-tool/Reflectance.h"
 #include "companions/measure-tool/Settings.h"
 
-namespace measuring {
+namespace measuretool {
 
 /// Prints what the profile says, absolute colorimetric, and adds Settings::bias and an error to
 /// each patch. Errors follow a fixed sequence, a row after the other, so that equal settings
@@ -40,4 +40,4 @@ class VirtualInstrument : public Instrument {
     const ReflectanceMaker m_reflectances;
 };
 
-} // namespace measuring
+} // namespace measuretool

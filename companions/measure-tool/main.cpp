@@ -34,7 +34,7 @@
 
 namespace {
 
-using namespace measuring;
+using namespace measuretool;
 
 constexpr const char* help =
     R"(Measures the patches of a definition, with a virtual instrument or by

@@ -10,7 +10,7 @@
 #include "analysis/Presets.h"
 #include "companions/tintgate-report/Failure.h"
 
-namespace reporting {
+namespace report {
 
 std::string presetSummary(const std::string& path) {
     tolerancePresetParameterRecord preset;
@@ -42,4 +42,4 @@ std::string installedPresets() {
     return fs::is_directory(folder, error) ? folder.native() : std::string();
 }
 
-} // namespace reporting
+} // namespace report

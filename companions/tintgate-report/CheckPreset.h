@@ -4,7 +4,7 @@
 
 #include <string>
 
-namespace reporting {
+namespace report {
 
 /// One line about a sound preset: its file, number, name and number of criteria. Throws Failure
 /// (Missing or Broken) with the line, the element and the exit code that Tintgate gives for the
@@ -14,4 +14,4 @@ std::string presetSummary(const std::string& path);
 /// Where the presets are that were installed with this program; empty if it is not installed.
 std::string installedPresets();
 
-} // namespace reporting
+} // namespace report

@@ -9,7 +9,7 @@
 #include "companions/tintgate-report/CheckPreset.h"
 #include "companions/tintgate-report/Failure.h"
 
-namespace reporting {
+namespace report {
 namespace {
 
 /// The text after its label, broken at blanks to lines that fit a terminal.
@@ -79,4 +79,4 @@ std::string explanationOf(int code) {
     return text;
 }
 
-} // namespace reporting
+} // namespace report

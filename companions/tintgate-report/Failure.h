@@ -7,7 +7,7 @@
 
 #include "CompanionStatuses.h"
 
-namespace reporting {
+namespace report {
 
 using Status = TintgateReportStatus; ///< Listed in docs/companion-statuses.csv.
 
@@ -19,4 +19,4 @@ class Failure : public std::runtime_error {
     const Status status;
 };
 
-} // namespace reporting
+} // namespace report

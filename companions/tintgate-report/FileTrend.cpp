@@ -11,7 +11,7 @@
 #include "report/Page.h"
 #include "report/PageFile.h"
 
-namespace reporting {
+namespace report {
 namespace {
 
 namespace fs = std::filesystem;
@@ -133,4 +133,4 @@ Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& fi
     return gathered;
 }
 
-} // namespace reporting
+} // namespace report

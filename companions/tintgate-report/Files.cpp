@@ -13,7 +13,7 @@
 #include "companions/tintgate-report/Failure.h"
 #include "report/PageFile.h"
 
-namespace reporting {
+namespace report {
 namespace {
 
 namespace fs = std::filesystem;
@@ -154,4 +154,4 @@ void writeOutput(const std::string& path, std::string_view text) {
     }
 }
 
-} // namespace reporting
+} // namespace report

@@ -10,14 +10,14 @@
 #include "report/Meta.h"
 #include "report/Result.h"
 
-namespace reporting {
+namespace report {
 
 struct LoadedResult {
     std::string path;
-    report::Result result;
-    std::optional<report::Meta> meta;
+    Result result;
+    std::optional<Meta> meta;
 
-    const report::Meta* metaOrNull() const { return meta ? &*meta : nullptr; }
+    const Meta* metaOrNull() const { return meta ? &*meta : nullptr; }
     std::string folder() const; ///< "." where the path has none.
     std::string stem() const;   ///< Name without folder and ".json".
 };
@@ -39,4 +39,4 @@ std::string relativeTo(const std::string& folder, const std::string& path);
 /// written in place. Throws Failure (NotWritten).
 void writeOutput(const std::string& path, std::string_view text);
 
-} // namespace reporting
+} // namespace report

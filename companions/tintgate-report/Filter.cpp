@@ -6,7 +6,7 @@
 #include <cstdio>
 #include <ctime>
 
-namespace reporting {
+namespace report {
 namespace {
 
 constexpr std::int64_t secondsOfDay = 86400;
@@ -109,4 +109,4 @@ std::optional<std::int64_t> dayOf(const std::string& text) {
                                                 : std::nullopt;
 }
 
-} // namespace reporting
+} // namespace report

@@ -8,7 +8,7 @@
 
 #include "report/Sample.h"
 
-namespace reporting {
+namespace report {
 
 /// Seconds since 1970 on the room's own clock of a text such as "2026-11-24", "2026-11-24 21:53",
 /// "2026-11-24T21:53:07+01:00" (the zone counts for nothing), "Tue Nov 24 21:53:07 2026",
@@ -30,11 +30,11 @@ struct Filter {
     std::string workflow;
 
     bool takesTime(std::int64_t time) const;
-    bool takes(const report::Sample& sample) const;
+    bool takes(const Sample& sample) const;
 };
 
 /// The begin of a day: "2026-11-24", or "30d" for so many days before today. Nothing for any other
 /// text.
 std::optional<std::int64_t> dayOf(const std::string& text);
 
-} // namespace reporting
+} // namespace report

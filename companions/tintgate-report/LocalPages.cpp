@@ -6,7 +6,7 @@
 #include "platform/TemporaryFolder.h"
 #include "report/Reports.h"
 
-namespace reporting {
+namespace report {
 
 LocalPages::LocalPages() : m_folder(platform::temporaryFolder() + "/Tintgate") {
     for (report::Listed& page : report::reportsBelow(m_folder)) {
@@ -32,4 +32,4 @@ std::string LocalPages::of(const report::Sample& sample) const {
     return earliest;
 }
 
-} // namespace reporting
+} // namespace report

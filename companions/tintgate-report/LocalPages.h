@@ -9,7 +9,7 @@
 #include "report/Page.h"
 #include "report/Sample.h"
 
-namespace reporting {
+namespace report {
 
 /// The pages of jobs that lie on this machine.
 class LocalPages {
@@ -17,11 +17,11 @@ class LocalPages {
     LocalPages();
 
     /// The page of the run that wrote the sample: the first one since then. Empty for none.
-    std::string of(const report::Sample& sample) const;
+    std::string of(const Sample& sample) const;
 
   private:
     std::string m_folder;
-    std::map<std::string, std::vector<report::Listed>> m_pages;
+    std::map<std::string, std::vector<Listed>> m_pages;
 };
 
-} // namespace reporting
+} // namespace report

@@ -5,7 +5,7 @@
 #include <cmath>
 #include <string_view>
 
-namespace reporting {
+namespace report {
 namespace {
 
 void appendText(std::string& csv, std::string_view text) {
@@ -72,4 +72,4 @@ std::string patchesCsv(const report::Result& result) {
     return csv;
 }
 
-} // namespace reporting
+} // namespace report

@@ -6,7 +6,7 @@
 
 #include "report/Result.h"
 
-namespace reporting {
+namespace report {
 
 /// A line for the names of the columns and one for each patch, in the result's order: id, name, the
 /// device values under their channels' names, target_L, target_a, target_b, measured_L, measured_a,
@@ -16,6 +16,6 @@ namespace reporting {
 /// UTF-8, lines end with a line feed, cells are quoted where they need to be (RFC 4180). A text
 /// that a spreadsheet would run as a formula gets an apostrophe in front. No number is an empty
 /// cell.
-std::string patchesCsv(const report::Result& result);
+std::string patchesCsv(const Result& result);
 
-} // namespace reporting
+} // namespace report

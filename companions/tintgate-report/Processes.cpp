@@ -9,7 +9,7 @@
 
 #include "jobkeys/Tickets.h"
 
-namespace reporting {
+namespace report {
 
 using jobkeys::jobFolderPrefix;
 
@@ -137,4 +137,4 @@ std::map<std::string, std::string> usedFolders(const std::string& folder) {
     return std::move(search.used);
 }
 
-} // namespace reporting
+} // namespace report

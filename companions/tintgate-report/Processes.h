@@ -5,7 +5,7 @@
 #include <map>
 #include <string>
 
-namespace reporting {
+namespace report {
 
 /// For each job's folder that a living process uses, by its name below `folder` such as "JobID_7":
 /// which process, in words. `folder` has no links in it.
@@ -14,4 +14,4 @@ namespace reporting {
 /// name.
 std::map<std::string, std::string> usedFolders(const std::string& folder);
 
-} // namespace reporting
+} // namespace report

@@ -11,7 +11,7 @@
 #include "jobkeys/ServerPaths.h"
 #include "jobkeys/Tickets.h"
 
-namespace reporting {
+namespace report {
 
 using namespace jobkeys;
 
@@ -74,4 +74,4 @@ std::string ServerLookups::instrument(const store::TicketContent& job, Strip str
     return at->second;
 }
 
-} // namespace reporting
+} // namespace report

@@ -12,7 +12,7 @@
 #include "job/AnalysisLibrary.h"
 #include "store/StoreEngine.h"
 
-namespace reporting {
+namespace report {
 
 struct Preset {
     std::string name;
@@ -41,4 +41,4 @@ class ServerLookups {
     std::set<int> m_missing;
 };
 
-} // namespace reporting
+} // namespace report

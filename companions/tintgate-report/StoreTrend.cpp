@@ -20,7 +20,7 @@
 #include "jobkeys/Tickets.h"
 #include "store/StoreEngine.h"
 
-namespace reporting {
+namespace report {
 
 using namespace jobkeys;
 
@@ -364,4 +364,4 @@ Gathered gatherStore(const std::string& address, const Filter& filter, const Pag
     }
 }
 
-} // namespace reporting
+} // namespace report

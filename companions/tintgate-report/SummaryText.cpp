@@ -5,35 +5,35 @@
 
 #include "report/Model.h"
 
-namespace reporting {
+namespace report {
 namespace {
 
 using report::fixedText;
 
 constexpr std::size_t mostPatches = 5;
 
-struct Mark {
+struct Badge {
     std::string sign;
     Tone tone;
 };
 
-Mark markOf(report::Verdict verdict) {
-    return verdict == report::Verdict::Passed   ? Mark{"✓ ", Tone::Passed}
-           : verdict == report::Verdict::Failed ? Mark{"✕ ", Tone::Failed}
-                                                : Mark{"? ", Tone::Open};
+Badge badgeOf(report::Verdict verdict) {
+    return verdict == report::Verdict::Passed   ? Badge{"✓ ", Tone::Passed}
+           : verdict == report::Verdict::Failed ? Badge{"✕ ", Tone::Failed}
+                                                : Badge{"? ", Tone::Open};
 }
 
-Mark markOf(report::Outcome outcome) {
-    return outcome == report::Outcome::Pass   ? Mark{"✓ ", Tone::Passed}
-           : outcome == report::Outcome::Fail ? Mark{"✕ ", Tone::Failed}
-                                              : Mark{"? ", Tone::Open};
+Badge badgeOf(report::Outcome outcome) {
+    return outcome == report::Outcome::Pass   ? Badge{"✓ ", Tone::Passed}
+           : outcome == report::Outcome::Fail ? Badge{"✕ ", Tone::Failed}
+                                              : Badge{"? ", Tone::Open};
 }
 
 std::string criteriaText(const report::Model& model, const Painter& paint) {
     std::vector<std::vector<Cell>> lines;
     for (const report::Figure& figure : model.judged) {
-        const Mark mark = markOf(figure.outcome);
-        lines.push_back({{mark.sign + figure.word, mark.tone},
+        const Badge badge = badgeOf(figure.outcome);
+        lines.push_back({{badge.sign + figure.word, badge.tone},
                          {figure.title},
                          {figure.value, Tone::Bold, true},
                          {"of " + figure.tolerance, Tone::Plain, true},
@@ -68,17 +68,17 @@ std::string patchesText(const report::Model& model, const report::Result& result
 
 constexpr std::size_t mostJobs = 10;
 
-Mark markOf(report::Movement movement) {
-    return movement == report::Movement::Drifting ? Mark{"↗ ", Tone::Failed}
-           : movement == report::Movement::Steady ? Mark{"= ", Tone::Passed}
-                                                  : Mark{"? ", Tone::Open};
+Badge badgeOf(report::Movement movement) {
+    return movement == report::Movement::Drifting ? Badge{"↗ ", Tone::Failed}
+           : movement == report::Movement::Steady ? Badge{"= ", Tone::Passed}
+                                                  : Badge{"? ", Tone::Open};
 }
 
 std::string inksText(const report::Series& series, const Painter& paint) {
     std::vector<std::vector<Cell>> lines;
     for (const report::InkTrend& ink : series.inks) {
-        const Mark mark = markOf(ink.movement);
-        lines.push_back({{mark.sign + ink.word, mark.tone},
+        const Badge badge = badgeOf(ink.movement);
+        lines.push_back({{badge.sign + ink.word, badge.tone},
                          {report::inkName(ink.ink)},
                          {ink.value, Tone::Bold, true},
                          {ink.tolerance.empty() ? "" : "of " + ink.tolerance, Tone::Plain, true},
@@ -119,8 +119,8 @@ std::string jobsText(const report::TrendModel& trend, const report::Series& seri
     std::vector<std::vector<Cell>> lines;
     for (std::size_t i = 0; i < std::min(mostJobs, series.samples.size()); ++i) {
         const auto& sample = trend.samples[series.samples[series.samples.size() - 1 - i]];
-        const Mark mark = markOf(sample.verdict);
-        lines.push_back({{mark.sign + report::wordOf(sample.verdict), mark.tone},
+        const Badge badge = badgeOf(sample.verdict);
+        lines.push_back({{badge.sign + report::wordOf(sample.verdict), badge.tone},
                          {report::timeText(sample.time), Tone::Soft},
                          {sample.title},
                          {report::nearestText(sample), Tone::Soft}});
@@ -137,8 +137,8 @@ std::string trendText(const report::TrendModel& trend, const Painter& paint) {
     }
     for (const report::Series& series : trend.series) {
         const bool bad = series.failing && series.movement == report::Movement::Steady;
-        const Mark mark = bad ? markOf(report::Verdict::Failed) : markOf(series.movement);
-        text += (text.empty() ? "" : "\n") + paint(mark.tone, mark.sign + series.word) + "  " +
+        const Badge badge = bad ? badgeOf(report::Verdict::Failed) : badgeOf(series.movement);
+        text += (text.empty() ? "" : "\n") + paint(badge.tone, badge.sign + series.word) + "  " +
                 paint(Tone::Bold, series.name) + '\n' +
                 paint(Tone::Soft, std::to_string(series.samples.size()) +
                                       (series.samples.size() == 1 ? " result, " : " results, ") +
@@ -158,8 +158,8 @@ std::string trendText(const report::TrendModel& trend, const Painter& paint) {
 std::string summaryText(const report::Result& result, const report::Meta* meta,
                         const Painter& paint) {
     const report::Model model = report::makeModel(result, meta);
-    const Mark mark = markOf(model.verdict);
-    std::string text = paint(mark.tone, mark.sign + model.word) + "  " +
+    const Badge badge = badgeOf(model.verdict);
+    std::string text = paint(badge.tone, badge.sign + model.word) + "  " +
                        paint(Tone::Bold, model.title) + '\n' + paint(Tone::Soft, model.subtitle) +
                        '\n' + model.sentence + '\n';
     for (const std::string& doubt : model.doubts) {
@@ -183,4 +183,4 @@ std::string summaryText(const report::Result& result, const report::Meta* meta,
     return text;
 }
 
-} // namespace reporting
+} // namespace report

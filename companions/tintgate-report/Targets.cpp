@@ -13,7 +13,7 @@
 #include "jobkeys/PatchArrays.h"
 #include "jobkeys/ServerPaths.h"
 
-namespace reporting {
+namespace report {
 
 using namespace jobkeys;
 
@@ -238,4 +238,4 @@ Target Targets::read(const std::string& path, int version) {
     return target;
 }
 
-} // namespace reporting
+} // namespace report

@@ -13,12 +13,12 @@
 #include "report/Sample.h"
 #include "store/StoreEngine.h"
 
-namespace reporting {
+namespace report {
 
 struct Target {
-    std::string name;        ///< Of its file; that of stored references for these.
-    std::string key;         ///< Equal for the same colours (report::Sample::targetKey).
-    report::InkColours aims; ///< Of paper and solids.
+    std::string name; ///< Of its file; that of stored references for these.
+    std::string key;  ///< Equal for the same colours (Sample::targetKey).
+    InkColours aims;  ///< Of paper and solids.
 };
 
 /// Finds each job's references by the rules of docs/jobs.md. A file counts as it was when the job
@@ -49,4 +49,4 @@ class Targets {
     std::map<std::string, std::vector<Content>> m_contents;     ///< By time.
 };
 
-} // namespace reporting
+} // namespace report

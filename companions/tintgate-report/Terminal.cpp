@@ -8,7 +8,7 @@
 
 #include "companions/tintgate-store/Bytes.h"
 
-namespace reporting {
+namespace report {
 namespace {
 
 /// In characters, not bytes.
@@ -77,4 +77,4 @@ std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter
     return text;
 }
 
-} // namespace reporting
+} // namespace report

@@ -6,7 +6,7 @@
 #include <string_view>
 #include <vector>
 
-namespace reporting {
+namespace report {
 
 enum class Tone { Plain, Bold, Soft, Passed, Failed, Open };
 
@@ -35,4 +35,4 @@ struct Cell {
 /// Columns as wide as their widest cell, two blanks apart, two in front.
 std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter& paint);
 
-} // namespace reporting
+} // namespace report

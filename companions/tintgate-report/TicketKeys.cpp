@@ -4,7 +4,7 @@
 #include <cstring>
 #include <limits>
 
-namespace reporting {
+namespace report {
 
 std::optional<int> integerOf(const SharedElements& elements) {
     const auto* value = elements ? elements->first() : nullptr;
@@ -52,4 +52,4 @@ std::vector<int> integersOf(const SharedElements& elements) {
     return values;
 }
 
-} // namespace reporting
+} // namespace report

@@ -10,7 +10,7 @@
 #include "jobkeys/StripKeys.h"
 #include "store/tickets/TicketElements.h"
 
-namespace reporting {
+namespace report {
 
 using jobkeys::Strip;
 
@@ -29,4 +29,4 @@ inline constexpr std::size_t mostElements = std::size_t{1} << 20;
 /// The elements up to the first hole or other type.
 std::vector<int> integersOf(const SharedElements& elements);
 
-} // namespace reporting
+} // namespace report

@@ -18,7 +18,7 @@
 #include "jobkeys/Tickets.h"
 #include "report/Model.h"
 
-namespace reporting {
+namespace report {
 namespace {
 
 namespace fs = std::filesystem;
@@ -279,4 +279,4 @@ std::string tidiedText(const std::vector<JobFolder>& folders, bool dryRun) {
            (dryRun ? " would be removed, " : " removed, ") + sizeText(bytes) + '\n';
 }
 
-} // namespace reporting
+} // namespace report

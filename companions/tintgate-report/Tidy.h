@@ -6,7 +6,7 @@
 #include <string>
 #include <vector>
 
-namespace reporting {
+namespace report {
 
 enum class Fate {
     Removed, ///< Or, of a dry run, would be.
@@ -42,4 +42,4 @@ std::vector<JobFolder> tidy(const std::string& workingFolder, std::int64_t secon
 /// What became of the folders, in lines for a person; those that are recent are only counted.
 std::string tidiedText(const std::vector<JobFolder>& folders, bool dryRun);
 
-} // namespace reporting
+} // namespace report

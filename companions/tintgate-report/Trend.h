@@ -9,11 +9,11 @@
 #include "companions/tintgate-report/Filter.h"
 #include "report/Trend.h"
 
-namespace reporting {
+namespace report {
 
 /// Samples, with what a person should know of where they come from.
 struct Gathered {
-    std::vector<report::Sample> samples;
+    std::vector<Sample> samples;
     std::vector<std::string> notes;
     std::size_t leftOut = 0; ///< Results that could not be read.
 };
@@ -39,4 +39,4 @@ Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& fi
 /// folder on this machine. Throws Failure (Store).
 Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place);
 
-} // namespace reporting
+} // namespace report

@@ -32,8 +32,8 @@ namespace {
 
 namespace fs = std::filesystem;
 
-using reporting::Failure;
-using reporting::Status;
+using report::Failure;
+using report::Status;
 
 constexpr const char* footer = R"(
 Examples:
@@ -70,7 +70,7 @@ struct Options {
     std::string since;
     std::string until;
     std::string series;
-    reporting::Filter filter;
+    report::Filter filter;
     std::optional<int> code;
     std::optional<int> tidyDays;
     std::string preset;
@@ -91,7 +91,7 @@ int fail(Status status, const std::string& words) {
 int verdictOf(const Options& options) {
     try {
         std::string note;
-        const auto loaded = reporting::loadResult(options.results[0], options.meta, note);
+        const auto loaded = report::loadResult(options.results[0], options.meta, note);
         switch (loaded.result.verdict) {
         case report::Verdict::Passed:
             return static_cast<int>(Status::Done);
@@ -107,7 +107,7 @@ int verdictOf(const Options& options) {
 
 /// The page beside its result, under a name of its own; its path is printed. That of a job is the
 /// very one that the viewer makes.
-void keepPage(const reporting::LoadedResult& loaded, const std::string& page) {
+void keepPage(const report::LoadedResult& loaded, const std::string& page) {
     std::string problem;
     const std::string stem = loaded.meta ? report::pageStem(*loaded.meta) : loaded.stem();
     const std::string path = report::keepPage(loaded.folder(), stem, page, problem);
@@ -115,38 +115,38 @@ void keepPage(const reporting::LoadedResult& loaded, const std::string& page) {
         throw Failure(Status::NotWritten,
                       "can't write a page in " + loaded.folder() + ": " + problem);
     }
-    reporting::writeOutput("-", path + '\n');
+    report::writeOutput("-", path + '\n');
 }
 
 void reportOne(const Options& options) {
     std::string note;
-    const auto loaded = reporting::loadResult(options.results[0], options.meta, note);
+    const auto loaded = report::loadResult(options.results[0], options.meta, note);
     if (!note.empty()) {
         say(note);
     }
     const std::string output = options.output.empty() ? "-" : options.output;
     if (options.csv) {
-        return reporting::writeOutput(output, reporting::patchesCsv(loaded.result));
+        return report::writeOutput(output, report::patchesCsv(loaded.result));
     }
     if (options.text) {
-        const reporting::Painter paint(output == "-" && reporting::terminalTakesColours());
-        return reporting::writeOutput(
-            output, reporting::summaryText(loaded.result, loaded.metaOrNull(), paint));
+        const report::Painter paint(output == "-" && report::terminalTakesColours());
+        return report::writeOutput(output,
+                                   report::summaryText(loaded.result, loaded.metaOrNull(), paint));
     }
     const std::string page = report::pageOf(loaded.result, loaded.metaOrNull());
     if (options.output.empty()) {
         return keepPage(loaded, page);
     }
-    reporting::writeOutput(output, page);
+    report::writeOutput(output, page);
 }
 
 /// "trend.html" becomes "trend-jobs".
-reporting::PagePlace placeOf(const Options& options) {
+report::PagePlace placeOf(const Options& options) {
     if (options.text || options.output == "-") {
         return {};
     }
     const fs::path output = options.output.empty() ? "trend.html" : options.output;
-    reporting::PagePlace place;
+    report::PagePlace place;
     place.folder = output.has_parent_path() ? output.parent_path().string() : ".";
     if (!options.noPages) {
         place.name = output.stem().string() + "-jobs";
@@ -157,30 +157,30 @@ reporting::PagePlace placeOf(const Options& options) {
 void writeTrend(const Options& options, const report::TrendModel& trend) {
     const std::string output = options.output.empty() ? "-" : options.output;
     if (options.text) {
-        const reporting::Painter paint(output == "-" && reporting::terminalTakesColours());
-        return reporting::writeOutput(output, reporting::trendText(trend, paint));
+        const report::Painter paint(output == "-" && report::terminalTakesColours());
+        return report::writeOutput(output, report::trendText(trend, paint));
     }
     const std::string page = report::trendPageOf(trend);
     if (!options.output.empty()) {
-        return reporting::writeOutput(output, page);
+        return report::writeOutput(output, page);
     }
     std::string problem;
     const std::string path = report::keepPage(".", "trend", page, problem);
     if (path.empty()) {
         throw Failure(Status::NotWritten, "can't write a page in this folder: " + problem);
     }
-    reporting::writeOutput("-", path + '\n');
+    report::writeOutput("-", path + '\n');
 }
 
 Status reportTrend(const Options& options) {
-    const reporting::PagePlace place = placeOf(options);
-    reporting::Gathered gathered =
+    const report::PagePlace place = placeOf(options);
+    report::Gathered gathered =
         options.fromStore()
-            ? reporting::gatherStore(options.store, options.filter, place)
-            : reporting::gatherFiles(options.results, options.filter,
-                                     options.series == "folder" ? reporting::SeriesBy::Folders
-                                                                : reporting::SeriesBy::Statements,
-                                     place, say);
+            ? report::gatherStore(options.store, options.filter, place)
+            : report::gatherFiles(options.results, options.filter,
+                                  options.series == "folder" ? report::SeriesBy::Folders
+                                                             : report::SeriesBy::Statements,
+                                  place, say);
     if (gathered.samples.empty()) {
         throw Failure(gathered.leftOut != 0 ? Status::Unreadable : Status::NothingFound,
                       "there is no result that fits what was asked for");
@@ -198,10 +198,10 @@ Status tidyFolders(const Options& options) {
         throw Failure(Status::NotTidied, "there is no temporary folder that may be used");
     }
     const auto folders =
-        reporting::tidy(temporary + "/Tintgate", *options.tidyDays * secondsOfDay, options.dryRun);
-    reporting::writeOutput("-", reporting::tidiedText(folders, options.dryRun));
+        report::tidy(temporary + "/Tintgate", *options.tidyDays * secondsOfDay, options.dryRun);
+    report::writeOutput("-", report::tidiedText(folders, options.dryRun));
     const bool failed = std::any_of(folders.begin(), folders.end(), [](const auto& folder) {
-        return folder.fate == reporting::Fate::Failed;
+        return folder.fate == report::Fate::Failed;
     });
     return failed ? Status::NotTidied : Status::Done;
 }
@@ -218,9 +218,9 @@ int run(const Options& options) {
     }
     try {
         if (options.code) {
-            reporting::writeOutput("-", reporting::explanationOf(*options.code));
+            report::writeOutput("-", report::explanationOf(*options.code));
         } else if (!options.preset.empty()) {
-            reporting::writeOutput("-", reporting::presetSummary(options.preset));
+            report::writeOutput("-", report::presetSummary(options.preset));
         } else if (options.tidyDays) {
             return static_cast<int>(tidyFolders(options));
         } else if (wantsTrend(options)) {
@@ -324,7 +324,7 @@ void addOptions(CLI::App& program, Options& options) {
 void settle(Options& options) {
     constexpr std::int64_t secondsOfDay = 86400;
     const auto day = [](const std::string& text, const char* option) {
-        const auto time = reporting::dayOf(text);
+        const auto time = report::dayOf(text);
         if (!time) {
             throw CLI::ValidationError(option,
                                        "\"" + text + "\" is no day such as 2026-11-24 or 30d");

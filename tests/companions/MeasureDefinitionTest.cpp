@@ -233,7 +233,7 @@ TEST(MeasureDefinition, IsReadRightOrRefused) {
         const std::string definition = support::contentsOf(path.utf8_string());
         const bool mustBe = mustBeRead(strip, definition);
         try {
-            const measuring::Definition result = measuring::readDefinition(path.utf8_string());
+            const measuretool::Definition result = measuretool::readDefinition(path.utf8_string());
             const colour::DataSet& chart = result.chart;
             ++read;
             ASSERT_FALSE(strip.tooMuchInk);
@@ -247,9 +247,9 @@ TEST(MeasureDefinition, IsReadRightOrRefused) {
                 }
             }
             ASSERT_EQ(result.condition, round % 5 == 0 ? "" : "M" + std::to_string(round % 5 - 1));
-        } catch (const measuring::Failure& failure) {
+        } catch (const measuretool::Failure& failure) {
             ++refused;
-            ASSERT_EQ(failure.status, measuring::Status::BadDefinition);
+            ASSERT_EQ(failure.status, measuretool::Status::BadDefinition);
             ASSERT_FALSE(mustBe) << failure.what() << "\n" << definition;
         }
     }
