@@ -15,6 +15,14 @@
 #
 # Generated headers are published by a target of their own (see cmake/ExitCodes.cmake).
 
+# Made anew at every configuration, so that nothing lingers of a header or a target that moved. Two
+# folders are of generated headers, which the build makes.
+file(GLOB _published "${PROJECT_BINARY_DIR}/see/*")
+list(FILTER _published EXCLUDE REGEX "/(exitcodes|statuses)$")
+if(_published)
+  file(REMOVE_RECURSE ${_published})
+endif()
+
 function(_tintgate_publish_headers target folder)
   file(RELATIVE_PATH _here "${PROJECT_SOURCE_DIR}" "${CMAKE_CURRENT_SOURCE_DIR}")
   foreach(_header IN LISTS ARGN)
@@ -32,10 +40,8 @@ function(tintgate_target target kind)
     message(FATAL_ERROR "${target}: unexpected ${T_UNPARSED_ARGUMENTS}")
   endif()
 
-  # Made anew at every configuration, so that a header that moved does not linger in its old place.
   set(_public "${PROJECT_BINARY_DIR}/see/${target}")
   set(_private "${PROJECT_BINARY_DIR}/see/${target}.own")
-  file(REMOVE_RECURSE "${_public}" "${_private}")
   file(MAKE_DIRECTORY "${_public}" "${_private}")
   _tintgate_publish_headers(${target} "${_public}" ${T_HEADERS})
   _tintgate_publish_headers(${target} "${_private}" ${T_PRIVATE_HEADERS})
