@@ -28,7 +28,7 @@ bool flushFolder(const std::string& path) {
     const std::string folder = folderOf(path);
     const Descriptor descriptor(
         open(folder.empty() ? "." : folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    // A folder that may be written but not read, or a file system that flushes no folders.
+    // Not a failure: an unreadable folder, or a file system that does not flush folders.
     return !descriptor.isOpen() || fsync(descriptor.get()) == 0 || errno == EINVAL;
 }
 
@@ -61,7 +61,7 @@ bool FileDraft::keepAccessOf(const std::string& old) const {
     if (stat(old.c_str(), &status) != 0) {
         return false;
     }
-    // In this order: a change of the owner clears the bits that run a program as its owner.
+    // In this order, because changing the owner clears the set-user-ID and set-group-ID bits.
     static_cast<void>(fchown(m_file.get(), status.st_uid, status.st_gid) == 0);
     return fchmod(m_file.get(), status.st_mode & 07777) == 0 || errno == ENOSYS || errno == EPERM;
 }
@@ -86,7 +86,7 @@ bool FileDraft::nameFresh(const std::string& target) {
         if (errno != EINVAL && errno != ENOSYS) {
             return false;
         }
-        // This file system can't, so the name is taken first.
+        // This file system has no renameat2 flags, so the name is reserved first.
         const Descriptor place(open(target.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
         if (!place.isOpen()) {
             return false;

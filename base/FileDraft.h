@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Files that appear whole or not at all.
+// Files that appear complete or not at all.
 #pragma once
 
 #include <string>
@@ -11,9 +11,9 @@
 
 namespace base {
 
-/// A file under a temporary name in the folder of its target, until it is complete. A draft that
-/// does not get its name is removed when the object goes; one that a killed process leaves is
-/// called ".tintgate-new-" and six characters.
+/// A file under a temporary name in its target's folder until it is complete. Its destructor
+/// removes a draft that was not renamed. A killed process leaves a draft called ".tintgate-new-"
+/// plus six characters.
 ///
 /// Every member that fails sets errno.
 class FileDraft {
@@ -25,31 +25,31 @@ class FileDraft {
     FileDraft& operator=(const FileDraft&) = delete;
 
     bool isOpen() const { return m_file.isOpen(); }
-    /// For those who write on their own; path() stays valid until the draft has its name.
+    /// For callers that write themselves. path() is valid until the draft is renamed.
     const Descriptor& descriptor() const { return m_file; }
     const std::string& path() const { return m_path; }
 
     bool write(std::string_view bytes) const;
 
-    /// Takes over the permissions of the file that is to be replaced and, if this process may give
-    /// files away, its owner. File systems without permissions are not a failure.
+    /// Copies the permissions of the file to be replaced and, if this process may change owners,
+    /// its owner. File systems without permissions are not a failure.
     bool keepAccessOf(const std::string& old) const;
 
-    /// Brings the content to the disk and gives the draft its name, in place of a file that has it.
+    /// Flushes the content to disk and renames the draft, replacing any file of that name.
     bool replace(const std::string& target);
-    /// The same if the name is free; otherwise errno is EEXIST and the draft can try another name.
+    /// Same if the name is free. Otherwise errno is EEXIST and the draft can try another name.
     bool nameFresh(const std::string& target);
 
   private:
     bool finish();
 
-    std::string m_path; ///< Empty if there is no draft (any more).
+    std::string m_path; ///< Empty if there is no draft.
     Descriptor m_file;
 };
 
-/// Writes a file whole: a regular file or a missing one through a draft, keeping the access of the
-/// one that was there. Symbolic links are followed and remain links. False with errno set; then the
-/// old file is unchanged.
+/// Writes a complete file. Regular and missing files are written as a draft that keeps the old
+/// file's access. Symbolic links are followed and remain links. Returns false with errno set on
+/// failure; the old file is then unchanged.
 bool writeWholeFile(const std::string& path, std::string_view bytes);
 
 } // namespace base

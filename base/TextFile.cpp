@@ -11,8 +11,8 @@
 namespace base {
 namespace {
 
-/// Up to the first NUL, as the C library converts. A character that the encoding lacks fails the
-/// stream, and nothing of the piece is written.
+/// Stops at the first NUL, as the C library's converter does. A character that the encoding lacks
+/// fails the stream, and nothing of the piece is written.
 void writeConverted(std::ostream& stream, std::wstring_view piece) {
     const std::wstring wide(piece);
     const wchar_t* from = wide.c_str();
@@ -37,9 +37,9 @@ bool narrowAscii(const wchar_t* from, std::size_t count, char* to) {
     return (all & ~0x7F) == 0;
 }
 
-/// In pieces, since the narrow copy of a large result would cost as much memory as the analysis
-/// itself. A piece of plain ASCII, as all of ours are, is narrowed here: the C library's converter
-/// would take a seventh of a whole run.
+/// In pieces, because the narrow copy of a large result would use as much memory as the analysis
+/// itself. ASCII pieces, such as all of ours, are narrowed here: the C library's converter would
+/// take a seventh of a whole run.
 void write(std::ostream& stream, std::wstring_view text) {
     constexpr std::size_t pieceLength = 1 << 18;
     std::string narrow;

@@ -15,9 +15,9 @@ std::string CLogger::m_sFileName = "Log.txt";
 
 namespace {
 
-// Opens `path` for writing and empties it, if it is ours to write passwords into; else the stream
-// stays closed. The stream is opened by way of the descriptor, so that the file which is written is
-// the one that was looked at. O_NONBLOCK keeps a pipe without a reader from holding up the run.
+// Opens `path` for writing and truncates it, if the file is safe for passwords; otherwise the
+// stream stays closed. The stream is opened through the descriptor, so that the file written is the
+// file checked. O_NONBLOCK prevents a pipe without a reader from blocking the run.
 void openPrivately(std::ofstream& stream, const std::string& path) {
     const int descriptor =
         open(path.c_str(), O_WRONLY | O_CREAT | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC, 0600);
@@ -83,7 +83,7 @@ std::string CLogger::CurrentDateTime() {
     localtime_r(&now, &local);
     char text[32] = "";
     if (std::strftime(text, sizeof text, "%a, %d.%m.%Y %H:%M:%S", &local) == 0) {
-        return {}; // A day name too long for the field: its contents are not to be used.
+        return {}; // The day name does not fit; the contents are undefined.
     }
     return text;
 }

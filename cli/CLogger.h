@@ -9,36 +9,36 @@
 #include <fstream>
 #include <string>
 
-/// One process-wide log with at most one open file. For the main thread alone: nothing is locked.
-/// It belongs to the program; a module that the program loads writes to the same log.
+/// One process-wide log with at most one open file. Use it from the main thread only: nothing is
+/// locked. It belongs to the program, and a module that the program loads writes to the same log.
 ///
-/// Nothing is flushed before DeleteLogger, so a crash can lose the tail of a trace.
+/// Nothing is flushed before DeleteLogger, so a crash can lose the end of a trace.
 class __attribute__((visibility("default"))) CLogger {
   public:
-    /// Opens `fileName`, replacing its contents; if a log is open already, the name is ignored.
+    /// Opens `fileName` and replaces its contents. If a log is already open, the name is ignored.
     ///
-    /// Logs hold passwords: the file is for its owner alone (mode 0600), and it stays closed where
-    /// the name is a symbolic link, belongs to somebody else or is no regular file. A file that
-    /// can't be opened is not reported; lines then vanish (C10).
+    /// Logs contain passwords, so only the owner can read the file (mode 0600). It is not opened if
+    /// the name is a symbolic link, belongs to another user or is not a regular file. If the file
+    /// can't be opened, nothing is reported and lines are lost (C10).
     static CLogger* InitLogger(std::string fileName);
 
-    /// Null while no log is open.
+    /// Null if no log is open.
     static CLogger* GetLogger() { return m_pThis; }
 
-    /// Closes the log; harmless when there is none.
+    /// Closes the log. Does nothing if none is open.
     static void DeleteLogger();
 
-    // Both are static so that `GetLogger()->Log(...)` touches no object and a null pointer is
-    // harmless: without a log, or with one that could not be opened, they do nothing.
+    // Static, so that `GetLogger()->Log(...)` uses no object and a null pointer is harmless.
+    // Without a log, or if it could not be opened, they do nothing.
 
-    /// One line, printf-style; the message is cut at 1023 bytes. Texts from outside go through
-    /// "%s", never as the format.
+    /// Writes one line, printf-style. The message is cut at 1023 bytes. Pass external text as an
+    /// argument of "%s", never as the format.
     static void Log(const char* format, ...) __attribute__((format(printf, 1, 2)));
 
-    /// One line with the text as it stands.
+    /// Writes one line with the text unchanged.
     static void Log(char* text);
 
-    /// An empty line, then one line with the text (C11). REQUIRES: a log is open.
+    /// Writes an empty line, then a line with the text (C11). REQUIRES: a log is open.
     CLogger& operator<<(const std::string& text);
 
   private:
@@ -49,5 +49,5 @@ class __attribute__((visibility("default"))) CLogger {
 
     static CLogger* m_pThis;
     static std::ofstream m_Logfile;
-    static std::string m_sFileName; ///< Never read (C110): InitLogger gets the name.
+    static std::string m_sFileName; ///< Never used (C110): InitLogger gets the name.
 };

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What "-help" prints. Callers know it to the byte, its spelling included (C1).
+// The output of "-help". Callers rely on every byte, including its spelling (C1).
 #pragma once
 
 inline constexpr char helpText[] =
@@ -31,7 +31,7 @@ Where:
 
 **************************************************************************************
 )"
-    // The blank at the end of this line stays (C1).
+    // Keep the blank at the end of this line (C1).
     "For L*ab calculation from reference CMYK values and an icc profile: \n"
     R"(Tintgate.exe [ <reference> <profile> <output> ]
 Where:

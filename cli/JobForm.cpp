@@ -15,17 +15,17 @@
 
 namespace {
 
-/// What follows the last ":" of an argument, or all of it if there is none (C6).
+/// The text after the last ":" of an argument, or the whole argument if there is none (C6).
 std::wstring valueOf(const char* argument) {
     const std::wstring text = stringToWstring(argument);
-    return text.substr(text.rfind(L':') + 1); // Without a ":", from the start.
+    return text.substr(text.rfind(L':') + 1); // Without a ":", starts at 0.
 }
 
 } // namespace
 
 extern "C" __attribute__((visibility("default"))) int tintgateVerifyJob(int count,
                                                                         char* arguments[]) {
-    // Any other text is false (C7).
+    // Any other text means false (C7).
     const bool remeasure = count == 9 && std::strcmp(arguments[8], "KEY_KZ_REMEASURE:=:true") == 0;
     wxDisableAsserts();
     wxLog::EnableLogging(false); // wx would report failed opens on standard error.
@@ -35,7 +35,7 @@ extern "C" __attribute__((visibility("default"))) int tintgateVerifyJob(int coun
     unsigned int minor = 0;
     unsigned int patch = 0;
     getLibVersion(major, minor, patch);
-    // Spelt like this in every log (C12).
+    // Every log has this spelling (C12).
     CLogger::GetLogger()->Log("Tintgate.exe verion = %d.%d.%d", cli::toolVersion[0],
                               cli::toolVersion[1], cli::toolVersion[2]);
     CLogger::GetLogger()->Log("TintgateLib.dll verion = %u.%u.%u", major, minor, patch);

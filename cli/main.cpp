@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Entry point. There is no option parser: the number of arguments alone decides what is done, and
-// each argument is read by its position. All that is printed goes to standard output, and a failure
-// shows as the exit code only. Callers rely on both (C2).
+// Entry point. There is no option parser: the number of arguments selects the operation, and each
+// argument is read by position. All output goes to standard output, and failures are visible only
+// as the exit code. Callers rely on both (C2).
 
 #include <clocale>
 #include <cstdio>
@@ -26,8 +26,8 @@ namespace {
 
 using cli::toolVersion;
 
-/// Texts and file names are taken as the user's locale has them, and as UTF-8 where that can't hold
-/// every character. Numbers keep their point.
+/// Texts and file names use the user's locale, or UTF-8 if that locale can't represent every
+/// character. Numbers keep the decimal point.
 void prepareProcess() {
     const char* locale = std::setlocale(LC_CTYPE, "");
     if (locale == nullptr || std::strcmp(nl_langinfo(CODESET), "UTF-8") != 0) {
@@ -35,16 +35,16 @@ void prepareProcess() {
     }
 }
 
-/// A run lives for milliseconds and allocates in ever larger pieces. To map each of them and to
-/// give each back would cost a sixteenth of a run with a usual chart.
+/// A run lasts milliseconds and allocates ever larger blocks. Mapping and unmapping each of them
+/// would cost a sixteenth of a run with a typical chart.
 void keepFreedMemory() {
-    constexpr int piece = 32 << 20; // The largest that the C library accepts for M_MMAP_THRESHOLD.
+    constexpr int piece = 32 << 20; // The C library's maximum for M_MMAP_THRESHOLD.
     mallopt(M_MMAP_THRESHOLD, piece);
     mallopt(M_TRIM_THRESHOLD, piece);
     mallopt(M_TOP_PAD, piece / 4);
 }
 
-/// Leaves the arguments of this run, a job's password among them, in its own log (C5).
+/// Writes the arguments of this run, including a job's password, to a log of their own (C5).
 void logArguments(int count, char* arguments[]) {
     const std::string folder = platform::temporaryFolder();
     if (folder.empty()) {
@@ -77,8 +77,8 @@ int answerWord(const std::string& word) {
     return validateInputFile(stringToWstring(word)); // Any other word is a path (C4).
 }
 
-/// The output is opened in place, so that links and /dev/stdout work, and not before there is
-/// something to write: a failed comparison leaves an existing file as it was.
+/// The output is opened in place, so that links and /dev/stdout work. It is opened only when there
+/// is something to write: a failed comparison leaves an existing file unchanged.
 int calculateSummary(char* arguments[], const char* patchSetPath) {
     const std::wstring target = stringToWstring(arguments[1]);
     const std::wstring measurement = stringToWstring(arguments[2]);
@@ -99,7 +99,7 @@ int calculateSummary(char* arguments[], const char* patchSetPath) {
     return base::writeTextInPlace(arguments[4], json) ? exitDone : exitResultNotWritten;
 }
 
-/// Null if the module is not where it was installed, seen from the program.
+/// Null if the module is not at its installed place relative to the program.
 cli::VerifyJob loadJobForm() {
     std::error_code failure;
     const auto program = std::filesystem::read_symlink("/proc/self/exe", failure);
@@ -114,8 +114,8 @@ cli::VerifyJob loadJobForm() {
     return nullptr;
 }
 
-/// A client application starts one run for each job and looks at nothing but its exit code (C9). An
-/// exception is not caught: a job id that is not a number ends the process by one (C8).
+/// A client application starts one run per job and reads only its exit code (C9). Exceptions are
+/// not caught: a job id that is not a number terminates the process (C8).
 int verifyJob(int count, char* arguments[]) {
     if (std::strstr(arguments[1], "KEY_KZ_HOST") == nullptr) {
         return exitJobFormRefused;
@@ -135,7 +135,7 @@ int main(int argc, char* argv[]) {
     case 2:
         return answerWord(argv[1]);
     case 3:
-        return exitDone; // Two arguments are not a form and not a mistake (C3).
+        return exitDone; // Two arguments are neither a form nor an error (C3).
     case 4:
         return writeLabFromReferencesAndICCProfile(
             stringToWstring(argv[1]), stringToWstring(argv[2]), stringToWstring(argv[3]));

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The keys by which clients choose jobs, and what their values mean.
+// The keys by which clients select jobs, and the meaning of their values.
 #pragma once
 
 #include <array>
@@ -17,15 +17,15 @@ inline constexpr const char* verifyActiveKey = "Workflow/Verify/Active";
 inline constexpr std::array<std::string_view, 5> overviewKeys = {
     subTypeKey, displayStatusKey, showInVerifierKey, fileTypeKey, verifyActiveKey};
 
-// Of displayStatusKey.
+// Values of displayStatusKey.
 inline constexpr int waitingStatus = 208;
 inline constexpr int verifiedStatus = 211;
 inline constexpr int failedStatus = 212;
 
-/// Of fileTypeKey: a file that is never verified.
+/// Value of fileTypeKey: a file that is never verified.
 inline constexpr int unsuitableFileType = 4096;
 
-/// Of verifyActiveKey.
+/// Value of verifyActiveKey.
 inline constexpr int activeForTwoStrips = 3;
 
 } // namespace jobkeys

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// Where a ticket names a job's control strip, references and JDF. A lookup asks for texts with
+// Finds a job's control strip, references and JDF in its ticket. A lookup asks for texts with
 //
-//   std::string text(const std::string& key);     empty if the ticket has no text of this key
+//   std::string text(const std::string& key);     empty if the ticket has no text for this key
 //
-// and reads a further key only if the previous one was of no use.
+// and reads the next key only if the previous one was not usable.
 #pragma once
 
 #include <algorithm>
@@ -26,12 +26,12 @@ inline constexpr const char* temporaryFolderKey = "System/Folders/Temp";
 inline constexpr const char* outFolderKey = "Workflow/RemoteOutFolder";
 inline constexpr const char* remoteJdfKey = "Remote/JDFName";
 
-/// A dynamic strip takes the place of the first strip alone.
+/// A dynamic strip replaces the first strip only.
 constexpr bool isDynamic(Strip strip, int useDynstrip) {
     return useDynstrip == 1 && strip == Strip::First;
 }
 
-/// The name of a strip that is not dynamic. Its own key counts from four bytes on.
+/// The name of a strip that is not dynamic. Its own key is used if it has at least four bytes.
 template<class Text>
 std::string fixedStripName(Strip strip, Text text) {
     constexpr std::size_t shortestName = 4; // In bytes (C33).
@@ -41,7 +41,7 @@ std::string fixedStripName(Strip strip, Text text) {
 
 /// Where a strip's references come from.
 enum class ReferenceWay {
-    Packaging,        ///< Characterisation data, else the strip's values, of a packaging workflow.
+    Packaging,        ///< Packaging workflow: characterization data, or else the strip's values.
     Profile,          ///< referenceProfile.
     DynamicStrip,     ///< The values of the strip itself.
     Characterisation, ///< The file of characterisationKey.
@@ -49,7 +49,7 @@ enum class ReferenceWay {
     None,
 };
 
-/// The first way whose condition holds. `workflow` is the value of workflowKey. References are
+/// The first source whose condition is true. `workflow` is the value of workflowKey. References are
 /// stored if the strip was measured and the ticket has at least one.
 constexpr ReferenceWay referenceWay(bool fromPackaging, int workflow, bool isDynamic,
                                     bool hasStored) {
@@ -61,22 +61,22 @@ constexpr ReferenceWay referenceWay(bool fromPackaging, int workflow, bool isDyn
                                                             : ReferenceWay::None;
 }
 
-/// The server path of the profile that gives a strip's references.
+/// The server path of the profile that supplies a strip's references.
 template<class Text>
 std::string referenceProfile(Strip strip, Text text) {
     const std::string path = text(stripKey(strip, stripProfileKey));
     return path.empty() ? text(usedProfileKey) : path;
 }
 
-/// The folder of the JDF whose name is in jdfNameKey. A job of type 1 has the whole path in
-/// remoteJdfKey instead.
+/// The folder of the JDF that jdfNameKey names. For a job of type 1, remoteJdfKey has the whole
+/// path instead.
 template<class Text>
 std::string jdfFolder(Text text) {
     const std::string folder = text(temporaryFolderKey);
     return folder.empty() ? text(outFolderKey) : folder;
 }
 
-/// Of "Input/SubType": whether the server calls the job a verification.
+/// Tests "Input/SubType": whether the server marks the job as a verification.
 constexpr bool isVerification(int subType) {
     return subType == 80 || subType == 81 || subType == 86;
 }

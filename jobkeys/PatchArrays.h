@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 // The arrays in which a ticket stores a strip's patches, below the root of the measurement or of
-// its references. Each key is one column, with one element for each patch.
+// its references. Each key is one column with one element per patch.
 #pragma once
 
 namespace jobkeys {
 
-/// The most patches that an array may have. A larger number counts as a failed allocation.
+/// The maximum length of an array. A larger number counts as a failed allocation.
 inline constexpr int mostPatches = 1'000'000;
 
 inline constexpr const char* xyzArrays[] = {"XYZValues/XValues", "XYZValues/YValues",

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // The server's 27 positions of a result (C87). A ticket's array "Values/Measured" has a value at
-// each of them, and "Values/Approval" and "Values/Decimal" have what belongs to it. Under a preset
-// of the PSD kind "Values/PSDApproval" and "Values/PSDDecimal" replace these two, with ten
-// positions in an order of their own: that of the verdicts.
+// each position; "Values/Approval" and "Values/Decimal" have the matching entries. Under a preset
+// of the PSD kind, "Values/PSDApproval" and "Values/PSDDecimal" replace these two. They have ten
+// positions in their own order, that of the verdicts.
 #pragma once
 
 #include <iterator>
@@ -10,7 +10,7 @@
 
 namespace jobkeys {
 
-/// Entries of an analysis' result: of analyseResultsRecord::values, and of its approvals and
+/// Entries of an analysis result: of analyseResultsRecord::values, and of its approvals and
 /// decimals.
 struct ResultPosition {
     int value;
@@ -19,8 +19,8 @@ struct ResultPosition {
 
 inline constexpr int noValue = -1; ///< Shown as -1.0.
 
-/// The value at this position is spotAverage if a preset of the PSD kind does not judge it, that is
-/// if entry psdSpotMaximum of tolerancePresetParameterRecord::usedForPSDResult is not 1.
+/// This position shows spotAverage if a preset of the PSD kind does not judge the spot maximum,
+/// i.e. if entry psdSpotMaximum of tolerancePresetParameterRecord::usedForPSDResult is not 1.
 inline constexpr int spotMaximum = 27;
 inline constexpr int spotAverage = 26;
 inline constexpr int psdSpotMaximum = 21;
@@ -65,7 +65,7 @@ constexpr int valueAt(int position, bool showsSpotMaximum) {
     return value == spotMaximum && !showsSpotMaximum ? spotAverage : value;
 }
 
-/// How many positions approvals and decimals have.
+/// The number of positions of approvals and decimals.
 constexpr int verdictCount(bool isPsd) {
     return isPsd ? psdPositionCount : positionCount;
 }

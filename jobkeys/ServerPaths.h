@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Where the server keeps the files that a job's ticket names.
+// Server paths of the files that a job's ticket names.
 #pragma once
 
 #include <string>
@@ -8,7 +8,7 @@
 namespace jobkeys {
 
 /// The file of a control strip that a ticket names, with or without a folder and an extension. A
-/// dot at the start of a name starts no extension.
+/// leading dot does not start an extension.
 inline std::string controlStripPath(std::string_view installFolder, std::string_view strip) {
     std::string_view name = strip.substr(strip.rfind('/') + 1);
     if (const std::size_t dot = name.rfind('.'); dot != 0) {
@@ -17,13 +17,13 @@ inline std::string controlStripPath(std::string_view installFolder, std::string_
     return std::string(installFolder).append("/ControlCharts/").append(name).append(".it8");
 }
 
-/// Whether a ticket's characterisation data is a path of its own.
+/// Whether a ticket's characterization data is a complete path.
 inline bool isWholePath(std::string_view characterisation) {
     return characterisation.find("(TEMP)/") != characterisation.npos;
 }
 
-/// The file of a ticket's characterisation data. The first version that the value contains decides
-/// the folder.
+/// The file of a ticket's characterization data. A version in the value selects the folder; the
+/// versions are tried in the order below.
 inline std::string characterisationPath(std::string_view installFolder, std::string_view value) {
     if (isWholePath(value)) {
         return std::string(value);

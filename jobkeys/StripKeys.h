@@ -1,8 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The keys of a job's ticket that differ between its two control strips. They come in two families:
-// those below "Remote/Measurement/", which read "Remote/Measurement2/" for the second strip, and
-// those that end in a "2" for the second strip. Keys that both strips share are written where they
-// are used.
+// The keys of a job's ticket that differ between its two control strips. There are two families:
+// keys below "Remote/Measurement/" (for the second strip "Remote/Measurement2/"), and keys with a
+// "2" at the end for the second strip. Keys shared by both strips are written where they are used.
 #pragma once
 
 #include <optional>
@@ -21,8 +20,8 @@ constexpr int numberOf(Strip strip) {
     return strip == Strip::First ? 1 : 2;
 }
 
-/// The strip selector of a call. Nothing if the text does not start with a whole number, or if the
-/// number does not fit an int.
+/// The strip selector of a call. Nothing if the text does not start with an integer that fits an
+/// int.
 inline std::optional<int> stripSelectorOf(const std::wstring& text) {
     try {
         return std::stoi(text);
@@ -31,22 +30,22 @@ inline std::optional<int> stripSelectorOf(const std::wstring& text) {
     }
 }
 
-/// Of KZJobDataStruct::secondStrip: 0 is the first strip, any other value the second (C28).
+/// Decodes KZJobDataStruct::secondStrip: 0 is the first strip, any other value the second (C28).
 constexpr Strip stripOf(int secondStrip) {
     return secondStrip == 0 ? Strip::First : Strip::Second;
 }
 
-/// The root of a strip's measurement, without a slash at its end.
+/// The root of a strip's measurement, without a trailing slash.
 constexpr std::string_view measurementRoot(Strip strip) {
     return strip == Strip::First ? "Remote/Measurement" : "Remote/Measurement2";
 }
 
-/// The key of a name below the strip's measurement, such as "Status" or "XYZValues/XValues".
+/// The key of an entry of the strip's measurement, such as "Status" or "XYZValues/XValues".
 inline std::string measurementKey(Strip strip, std::string_view name) {
     return std::string(measurementRoot(strip)).append("/").append(name);
 }
 
-/// The key of a name below the references that the strip's measurement contains.
+/// The key of an entry of the references that the strip's measurement contains.
 inline std::string referenceKey(Strip strip, std::string_view name) {
     return measurementKey(strip, "Reference/").append(name);
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A UUID as it crosses to a plug-in: by value, its bytes in the order in which its text names them.
+// A UUID as passed to a plug-in: by value, with its bytes in the order of its text form.
 #pragma once
 
 struct CFUUIDBytes {

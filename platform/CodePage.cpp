@@ -12,8 +12,8 @@ namespace {
 
 constexpr std::size_t upperSize = 128;
 
-// ICU has no converter for these two. Characters after the tables CROATIAN.TXT and ROMANIAN.TXT
-// that the Unicode Consortium publishes under MAPPINGS/VENDORS.
+// ICU has no converter for these two. Source: CROATIAN.TXT and ROMANIAN.TXT, published by the
+// Unicode Consortium under MAPPINGS/VENDORS.
 constexpr std::u16string_view croatian = u"ÄÅÇÉÑÖÜáàâäãåçéèêëíìîïñóòôöõúùûü"
                                          u"†°¢£§•¶ß®Š™´¨≠ŽØ∞±≤≥∆µ∂∑∏š∫ªºΩžø"
                                          u"¿¡¬√ƒ≈Ć«Č…\u00A0ÀÃÕŒœĐ—“”‘’÷◊\uF8FF©⁄€‹›Æ»"
@@ -24,13 +24,13 @@ constexpr std::u16string_view romanian = u"ÄÅÇÉÑÖÜáàâäãåçéèêë�
                                          u"‡·‚„‰ÂÊÁËÈÍÎÏÌÓÔ\uF8FFÒÚÛÙıˆ˜¯˘˙˚¸˝˛ˇ";
 static_assert(croatian.size() == upperSize && romanian.size() == upperSize);
 
-// ICU's functions bear its version in their names, which its headers hide behind macros.
+// ICU's function names include its version; its headers hide that behind macros.
 #define TINTGATE_TEXT(name) #name
 #define TINTGATE_FIND(function, name)                                                              \
     decltype(&name) function = nullptr;                                                            \
     library.find(TINTGATE_TEXT(name), function)
 
-/// The upper half of a converter, or nothing. The library stays open: it keeps caches of its own.
+/// The upper half of a converter, or nothing. The library stays open because it has its own caches.
 std::u16string upperFromIcu(const char* converter) {
     const base::SharedObject library("libicuuc.so." U_ICU_VERSION_SHORT);
     TINTGATE_FIND(open, ucnv_open);

@@ -11,24 +11,24 @@
 
 namespace platform {
 
-/// A code page of 256 different characters, the lower half ASCII.
+/// A code page of 256 distinct characters with ASCII as its lower half.
 ///
-/// The upper half of most pages comes from ICU. Loading its libraries costs a third of an empty
-/// program's start, so they are opened when a text first holds anything but ASCII.
+/// ICU supplies the upper half of most pages. Loading its libraries costs a third of the startup of
+/// an empty program, so they are opened for the first text that is not ASCII.
 class CodePage {
   public:
-    /// Null where there is no conversion for the encoding.
+    /// Null if there is no conversion for the encoding.
     static const CodePage* find(CFStringEncoding encoding);
 
-    /// A page that ICU has under the name `converter`.
+    /// A page that ICU calls `converter`.
     CodePage(CFStringEncoding encoding, const char* converter)
         : m_encoding(encoding), m_converter(converter) {}
 
-    /// A page whose characters 0x80 to 0xFF are given.
+    /// A page with the given characters 0x80 to 0xFF.
     CodePage(CFStringEncoding encoding, std::u16string_view upper)
         : m_encoding(encoding), m_upper(upper) {}
 
-    /// Nothing if the upper half is needed and can't be had.
+    /// Nothing if the upper half is needed and not available.
     std::optional<std::u16string> decode(std::string_view bytes) const;
 
     /// Nothing if a character is not on this page. There are no near matches.

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Handles of the desktop platform's core library, as far as this program needs them.
+// The handles of the desktop platform's core library that this program needs.
 #pragma once
 
 #include <cstddef>
@@ -9,15 +9,15 @@
 
 namespace platform {
 
-/// What every handle points to. A handle from a function with Create or Copy in its name belongs to
-/// the caller, who gives it to CFRelease; one from a function with Get belongs to what it came
-/// from.
+/// The target of every handle. A handle returned by a function with Create or Copy in its name
+/// belongs to the caller, who passes it to CFRelease. A handle from a function with Get belongs to
+/// its source.
 class Object {
   public:
     virtual ~Object() = default;
 };
 
-/// What a CFArrayRef stands for. It owns its elements.
+/// The target of a CFArrayRef. Owns its elements.
 class Array : public Object {
   public:
     std::vector<std::unique_ptr<const Object>> elements;
@@ -29,11 +29,11 @@ using CFIndex = long;
 using CFTypeRef = const platform::Object*;
 using CFArrayRef = const platform::Array*;
 
-/// There is one allocator here, the default one.
+/// The default allocator is the only one.
 using CFAllocatorRef = std::nullptr_t;
 inline constexpr CFAllocatorRef kCFAllocatorDefault = nullptr;
 
-/// Ends a handle. Null is harmless.
+/// Releases a handle. Null is allowed.
 void CFRelease(CFTypeRef object);
 
 namespace platform {
@@ -50,5 +50,5 @@ using Owned = std::unique_ptr<std::remove_pointer_t<Ref>, Release>;
 
 CFIndex CFArrayGetCount(CFArrayRef array);
 
-/// Null for an index outside of the array.
+/// Null if the index is out of range.
 CFTypeRef CFArrayGetValueAtIndex(CFArrayRef array, CFIndex index);

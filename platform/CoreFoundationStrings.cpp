@@ -89,7 +89,7 @@ void CFStringGetCharacters(CFStringRef string, CFRange range, UniChar* buffer) {
 }
 
 CFIndex CFStringGetMaximumSizeForEncoding(CFIndex length, CFStringEncoding encoding) {
-    // A surrogate pair takes four bytes, which is less than two units of three bytes each.
+    // A surrogate pair takes four bytes, fewer than the six of two three-byte units.
     return encoding == kCFStringEncodingUTF8 ? length * 3 : length;
 }
 

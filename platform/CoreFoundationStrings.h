@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Strings of the desktop platform: UTF-16 inside, any known encoding outside.
+// Strings of the desktop platform: UTF-16 internally, any known encoding externally.
 #pragma once
 
 #include <cstdint>
@@ -9,7 +9,7 @@
 
 namespace platform {
 
-/// What a CFStringRef stands for.
+/// The target of a CFStringRef.
 class String : public Object {
   public:
     explicit String(std::u16string text) : units(std::move(text)) {}
@@ -23,8 +23,8 @@ using CFStringRef = const platform::String*;
 using CFStringEncoding = std::uint32_t;
 using UniChar = char16_t;
 
-/// Encodings with a conversion here. Japanese (1), traditional Chinese (2), Korean (3) and
-/// simplified Chinese (25) have none: nothing converts from or to them, not even ASCII.
+/// Encodings that can be converted here. Japanese (1), traditional Chinese (2), Korean (3) and
+/// simplified Chinese (25) can't: nothing is converted from or to them, not even ASCII.
 enum : CFStringEncoding {
     kCFStringEncodingMacRoman = 0,
     kCFStringEncodingMacGreek = 6,
@@ -41,22 +41,22 @@ struct CFRange {
     CFIndex length;
 };
 
-/// Null if text is null, or not valid in the encoding. UTF-8 is taken strictly: no surrogates,
-/// nothing above U+10FFFF, no longer form than needed.
+/// Null if the text is null or invalid in the encoding. UTF-8 is checked strictly: no surrogates,
+/// no overlong forms, nothing above U+10FFFF.
 CFStringRef CFStringCreateWithCString(CFAllocatorRef, const char* text, CFStringEncoding encoding);
 
-/// Takes any units, zeros and lone surrogates included.
+/// Accepts any units, including zeros and lone surrogates.
 CFStringRef CFStringCreateWithCharacters(CFAllocatorRef, const UniChar* units, CFIndex count);
 
 /// Number of 16-bit units.
 CFIndex CFStringGetLength(CFStringRef string);
 
-/// Copies the units of the range, which must lie within the string.
+/// Copies the units of the range, which must be inside the string.
 void CFStringGetCharacters(CFStringRef string, CFRange range, UniChar* buffer);
 
-/// Bytes that a text of `length` units can need, without a terminator.
+/// Maximum bytes of a text of `length` units, without a terminator.
 CFIndex CFStringGetMaximumSizeForEncoding(CFIndex length, CFStringEncoding encoding);
 
-/// Writes the text and a terminator. False, with the buffer untouched, if both don't fit into size
-/// bytes or a character has no place in the encoding.
+/// Writes the text and a terminator. Returns false and leaves the buffer unchanged if they don't
+/// fit into `size` bytes or if the encoding lacks a character.
 bool CFStringGetCString(CFStringRef string, char* buffer, CFIndex size, CFStringEncoding encoding);

@@ -68,8 +68,8 @@ std::string utf8(CFStringRef string) {
     return text;
 }
 
-// A factory as an array of factories holds it. It knows its bundle, so that two bundles may name
-// the same factory.
+// An element of an array of factories. It records its bundle, so that two bundles may list the same
+// factory UUID.
 class Factory : public platform::Uuid {
   public:
     Factory(const CFUUIDBytes& bytes, __CFBundle* bundle) : Uuid(bytes), bundle(bundle) {}
@@ -118,7 +118,7 @@ class __CFBundle {
     __CFBundle(std::string folder, platform::PropertyList info)
         : m_folder(std::move(folder)), m_info(std::move(info)) {}
 
-    // The name, as it is written, of the UUID's entry in a dictionary.
+    // The UUID's entry name in a dictionary, with its original spelling.
     std::optional<std::string> nameOf(const CFUUIDBytes& uuid, const char* dictionary) const {
         for (const std::string& name :
              m_info.names({dictionary}).value_or(std::vector<std::string>())) {
@@ -141,7 +141,7 @@ class __CFBundle {
 
     const std::string m_folder;
     const platform::PropertyList m_info;
-    void* m_sharedObject = nullptr; // Never closed: instances may outlive everything.
+    void* m_sharedObject = nullptr; // Never closed: instances may outlive every owner.
 };
 
 CFURLRef CFURLCreateWithFileSystemPath(CFAllocatorRef, CFStringRef path, CFURLPathStyle style,
@@ -163,7 +163,7 @@ CFUUIDBytes CFUUIDGetUUIDBytes(CFUUIDRef uuid) {
 }
 
 CFPlugInRef CFPlugInCreate(CFAllocatorRef, CFURLRef folder) {
-    // Not destroyed at the end, when plug-ins may still be at work on threads of their own.
+    // Never destroyed: plug-in threads may still be running at exit.
     static auto& bundles = *new std::map<std::string, std::unique_ptr<__CFBundle>>;
     if (folder == nullptr) {
         return nullptr;

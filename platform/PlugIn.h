@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Loading of plug-ins. A plug-in is a bundle, that is a folder:
+// Loads plug-ins. A plug-in is a bundle, i.e. a folder:
 //
 //   ComGUI.Bundle/
 //     Contents/
@@ -13,7 +13,7 @@
 //   CFPlugInFactories      { FACTORY-UUID: function }    function in the shared object
 //
 // UUIDs are written 5CDEF0B8-6CFC-11D8-A365-003065B1346E, in either case. The function has C
-// linkage and the shape of platform::PlugInFactory.
+// linkage and the type platform::PlugInFactory.
 #pragma once
 
 #include <string>
@@ -24,7 +24,7 @@
 
 namespace platform {
 
-/// What a CFURLRef stands for: the path of a file or folder, as bytes.
+/// The target of a CFURLRef: the path of a file or folder, as bytes.
 class Url : public Object {
   public:
     explicit Url(std::string path) : path(std::move(path)) {}
@@ -32,7 +32,7 @@ class Url : public Object {
     const std::string path;
 };
 
-/// What a CFUUIDRef stands for.
+/// The target of a CFUUIDRef.
 class Uuid : public Object {
   public:
     explicit Uuid(const CFUUIDBytes& bytes) : bytes(bytes) {}
@@ -40,8 +40,8 @@ class Uuid : public Object {
     const CFUUIDBytes bytes;
 };
 
-/// Makes an object whose first word points to a table of functions, or null. The first argument is
-/// always null; the type is nothing that a plug-in could look into.
+/// Creates an object whose first word points to a table of functions, or returns null. The first
+/// argument is always null; the type is opaque to the plug-in.
 using PlugInFactory = void* (*)(const void* allocator, const void* type);
 
 } // namespace platform
@@ -57,28 +57,27 @@ using CFURLRef = const platform::Url*;
 using CFUUIDRef = const platform::Uuid*;
 using CFPlugInRef = __CFBundle*;
 
-/// Null for an empty path, one that is no Unicode, and any other style than POSIX.
+/// Null for an empty path, a path that is not Unicode, and any style other than POSIX.
 CFURLRef CFURLCreateWithFileSystemPath(CFAllocatorRef, CFStringRef path, CFURLPathStyle style,
                                        Boolean isDirectory);
 
-/// Null if the text is not 32 hexadecimal digits in the groups 8-4-4-4-12.
+/// Null unless the text is 32 hexadecimal digits in the groups 8-4-4-4-12.
 CFUUIDRef CFUUIDCreateFromString(CFAllocatorRef, CFStringRef text);
 
 CFUUIDBytes CFUUIDGetUUIDBytes(CFUUIDRef uuid);
 
-/// The bundle in a folder, or null if there is no folder with a readable Contents/Info.plist. Its
-/// shared object is loaded when a first instance is made.
+/// The bundle in a folder, or null if the folder has no readable Contents/Info.plist. Its shared
+/// object is loaded when the first instance is created.
 ///
-/// A bundle stays for the rest of the process: asked again for the same folder, this gives out the
-/// same bundle, and nobody releases it.
+/// A bundle exists until the process ends: the same folder always gives the same bundle, and nobody
+/// releases it.
 CFPlugInRef CFPlugInCreate(CFAllocatorRef, CFURLRef folder);
 
 /// The factories (UUIDs, each bound to its bundle) that the bundle lists for a type, in its order.
-/// Null if it does not list the type; an array without elements if it lists the type with no
-/// factory.
+/// Null if it does not list the type. Empty if it lists the type without factories.
 CFArrayRef CFPlugInFindFactoriesForPlugInTypeInPlugIn(CFUUIDRef type, CFPlugInRef plugIn);
 
-/// What the factory's function makes; it belongs to the caller, by the plug-in's own reference
-/// count. Null if the function gives null, if there is no such function or no loadable shared
-/// object, and for a UUID that is not an element of an array of factories.
+/// Returns the object that the factory function creates. The caller owns one of its references.
+/// Null if the function returns null, if the function or a loadable shared object is missing, and
+/// for a UUID that is not an element of an array of factories.
 void* CFPlugInInstanceCreate(CFAllocatorRef, CFUUIDRef factory, CFUUIDRef type);

@@ -30,7 +30,7 @@ bool endsWith(std::string_view text, std::string_view end) {
     return text.size() >= end.size() && text.substr(text.size() - end.size()) == end;
 }
 
-// The numbers of all processes, ascending.
+// The ids of all processes, ascending.
 std::vector<std::uint32_t> allProcesses() {
     std::vector<std::uint32_t> numbers;
     DIR* const folder = opendir("/proc");
@@ -58,7 +58,7 @@ bool isOfThisUser(std::uint32_t number) {
     return stat(processFile(number, "").c_str(), &status) == 0 && status.st_uid == geteuid();
 }
 
-// Nothing for a process that has ended, one of the system's own, and a foreign one.
+// Nothing for a process that has ended, for kernel processes and for other users' processes.
 std::optional<std::string> executable(std::uint32_t number) {
     char path[PATH_MAX];
     const ssize_t length = readlink(processFile(number, "/exe").c_str(), path, sizeof path);
@@ -66,7 +66,7 @@ std::optional<std::string> executable(std::uint32_t number) {
         return std::nullopt;
     }
     std::string result(path, static_cast<std::size_t>(length));
-    // The system marks an executable that was replaced while it runs.
+    // The system marks an executable that was replaced while running.
     constexpr std::string_view deleted = " (deleted)";
     if (endsWith(result, deleted) && access(result.c_str(), F_OK) != 0) {
         result.resize(result.size() - deleted.size());
@@ -74,21 +74,21 @@ std::optional<std::string> executable(std::uint32_t number) {
     return result;
 }
 
-// What the paths of applications begin with: nothing without a system root, and no value where the
-// root is no folder, so that there are no applications.
+// The path prefix of all applications. Empty without a system root. No value if the root is not a
+// folder: then there are no applications.
 std::optional<std::string> folderOfApplications() {
     const std::string root = platform::systemRoot();
     if (root.empty()) {
         return root;
     }
-    // Paths of executables are free of links, so the root has to be too.
+    // Paths of executables contain no links, so the root must not either.
     std::error_code failure;
     const std::string folder = std::filesystem::canonical(root, failure).string() + "/";
     return failure ? std::nullopt : std::optional(folder);
 }
 
-// The executable's path below that folder, or nothing if this is no running application. The owner
-// is asked for last: nearly all processes lie elsewhere.
+// The executable's path below that folder, or nothing if this is not a running application. The
+// owner is checked last, because nearly all processes are outside the folder.
 std::optional<std::string> pathOfApplication(std::uint32_t number,
                                              const std::optional<std::string>& folder) {
     if (number == 0 || number > INT_MAX || !folder) {
@@ -118,7 +118,7 @@ std::string nameOfApplication(std::string_view path) {
 } // namespace
 
 OSErr GetNextProcess(ProcessSerialNumber* cursor) {
-    // One look at the list of processes and at the root serves a whole walk.
+    // The process list and the root are read once per walk.
     thread_local std::vector<std::uint32_t> numbers;
     thread_local std::optional<std::string> folder;
     if (cursor->lowLongOfPSN == 0) {

@@ -17,7 +17,7 @@ namespace platform {
 
 namespace {
 
-// libplist counts bytes in 32 bits.
+// libplist uses 32-bit sizes.
 constexpr std::uintmax_t largestFile = std::numeric_limits<std::uint32_t>::max();
 constexpr std::int64_t secondsFrom1970To2001 = 978307200;
 
@@ -28,15 +28,15 @@ constexpr std::int64_t secondsFrom1970To2001 = 978307200;
     X(get_string_val) X(get_uint_val)
 // clang-format on
 
-/// The functions that are used of libplist, without their plist_ in front.
+/// The libplist functions in use, without the plist_ prefix.
 struct LibPlist {
 #define TINTGATE_LIBPLIST_MEMBER(name) decltype(&plist_##name) name = nullptr;
     TINTGATE_LIBPLIST_FUNCTIONS(TINTGATE_LIBPLIST_MEMBER)
 #undef TINTGATE_LIBPLIST_MEMBER
 };
 
-/// Opens the library with the first list that is read: linked, it would cost every program that can
-/// read a list a twentieth of its start. Returns nothing if the library is not installed.
+/// Opens the library when the first list is read. Linking it would cost every program that can read
+/// lists a twentieth of its startup. Returns nothing if the library is not installed.
 std::optional<LibPlist> loadLibPlist() {
     const base::SharedObject library("libplist-2.0.so.3");
     LibPlist functions;
@@ -154,7 +154,7 @@ std::optional<std::string> PropertyList::text(const Way& way) const {
         return value != 0 ? "true" : "false";
     }
     case PLIST_UINT: {
-        // Negative numbers come in the same 64 bits.
+        // Negative numbers use the same 64 bits.
         std::uint64_t value = 0;
         libPlist()->get_uint_val(node, &value);
         return std::to_string(static_cast<std::int64_t>(value));

@@ -17,7 +17,7 @@ bool isFolder(const char* path) {
     return stat(path, &status) == 0 && S_ISDIR(status.st_mode);
 }
 
-/// The path as seen from the current folder; unchanged if there is none any more.
+/// The path made absolute. Unchanged if the current folder no longer exists.
 std::string absolute(const std::string& path) {
     std::error_code failure;
     const std::filesystem::path folder = std::filesystem::current_path(failure);

@@ -1,24 +1,24 @@
 // SPDX-License-Identifier: Apache-2.0
-// Where logs and working files go.
+// The place for logs and working files.
 #pragma once
 
 #include <string>
 
 namespace platform {
 
-/// The folder for temporary files, as bytes, or empty if there is none that may be used.
+/// The folder for temporary files, as bytes, or empty if none may be used.
 ///
-/// The first of TMPDIR, TMP and TEMP that names a folder. A relative path is made absolute, in the
-/// variable too: the viewer and other children run in folders of their own. Else /tmp/tintgate-UID,
-/// made with mode 0700 where it is missing, used only if it is a folder of this user, and exported
-/// as TMPDIR so that wxFileName::GetTempDir and every child process find the same one.
+/// It is the first of TMPDIR, TMP and TEMP that names a folder. A relative path is made absolute,
+/// and so is the variable, because the viewer and other children run in other folders. If none
+/// does, it is /tmp/tintgate-UID, created with mode 0700, used only if it is a folder of this user,
+/// and exported as TMPDIR, so that wxFileName::GetTempDir and every child process find the same
+/// folder.
 ///
-/// The path must hold no quotes, backslashes or double blanks for the viewer to be started from
-/// it: its command line is not quoted.
+/// The viewer's unquoted command line requires a path without quotes, backslashes, double blanks.
 std::string temporaryFolder();
 
-/// Makes a folder where it is missing; the umask applies. True if it is a folder of this user then,
-/// and no symbolic link: anybody may make names in a shared folder such as /tmp.
+/// Creates a missing folder; the umask applies. True if the path is then a folder of this user, and
+/// not a symbolic link: anybody can create names in a shared folder such as /tmp.
 bool haveOwnFolder(const std::string& path, unsigned mode);
 
 } // namespace platform

@@ -15,7 +15,7 @@ struct Escape {
     const char* replacement;
 };
 
-// Ascending by the unsigned byte, which is the order of the passes. From 0xC4 on Windows-1252.
+// In ascending byte order, which is the order of the passes. From 0xC4 up: Windows-1252.
 constexpr Escape escapes[] = {
     {'\x22', "&quot;"}, {'\x26', "&amp;"},  {'\x27', "&apos;"}, {'\x3C', "&lt;"},
     {'\x3E', "&gt;"},   {'\xC4', "&#196;"}, {'\xD6', "&#214;"}, {'\xDC', "&#220;"},
@@ -26,8 +26,8 @@ bool isContinuation(char c) {
     return (c & 0xC0) == 0x80;
 }
 
-/// Whether a multi-byte sequence starts here. Never looks behind a byte that is no continuation,
-/// and so never behind the terminator.
+/// Whether a multi-byte sequence starts here. Never reads past a byte that is not a continuation
+/// byte, so it never reads past the terminator.
 bool startsSequence(const char* p) {
     if ((*p & 0xE0) == 0xC0) {
         return isContinuation(p[1]);
@@ -35,7 +35,7 @@ bool startsSequence(const char* p) {
     if ((*p & 0xF0) == 0xE0) {
         return isContinuation(p[1]) && isContinuation(p[2]);
     }
-    // 0xF8 would be the mask of the encoding (C149).
+    // The correct mask would be 0xF8 (C149).
     if ((*p & 0xF1) == 0xF0) {
         return isContinuation(p[1]) && isContinuation(p[2]) && isContinuation(p[3]);
     }
@@ -45,8 +45,8 @@ bool startsSequence(const char* p) {
 } // namespace
 
 void ReplaceConflictingXMLDataInString(std::string& text) {
-    // Since the passes start where the one before ended, and no replacement holds a character that
-    // a later pass looks for, all passes together walk the text once from front to back.
+    // Each pass starts where the previous one ended, and no replacement contains a character that a
+    // later pass looks for. So all passes together walk the text once, from front to back.
     std::string escaped;
     std::string::size_type start = 0;
     for (const Escape& escape : escapes) {

@@ -11,7 +11,7 @@ enum Outcome { Unchanged = 0, Converted = 1, Failed = 2 };
 
 using Conversion = int (*)(void* context, std::string& target, const char* source);
 
-/// Translate, to a string: the outcome of everything that is longer than its buffer is Failed.
+/// Translate, with a string as target. Text that does not fit in the buffer gives Failed.
 Outcome translate(std::string& target, const char* source, CFStringEncoding targetEncoding,
                   CFStringEncoding sourceEncoding) {
     char buffer[4096] = {};

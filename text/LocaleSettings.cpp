@@ -65,8 +65,8 @@ constexpr Range languageIdentifiers[] = {
 };
 constexpr int englishIdentifier = 1033;
 
-/// Dutch, 55 and 56, has the Central European encoding (C155). The Chinese, Japanese and Korean
-/// encodings are numbers without a name in this program, since nothing converts them.
+/// Dutch, 55 and 56, has the Central European encoding (C155). Chinese, Japanese and Korean
+/// encodings are plain numbers, since nothing here converts them.
 constexpr Range macEncodings[] = {
     {41, 41, kCFStringEncodingMacCyrillic},
     {44, 44, 2},
@@ -96,7 +96,7 @@ int find(const Range (&ranges)[N], int number, int fallback) {
     return fallback;
 }
 
-/// Number of an entry of the list, or a negative one if the table does not know it.
+/// Number of an entry of the preference list. Negative if the table does not contain it.
 int languageNumber(CFStringRef entry) {
     char text[256];
     LocaleRef locale;

@@ -1,30 +1,30 @@
 // SPDX-License-Identifier: Apache-2.0
-// The language of the machine's user, in three numberings (C167).
+// The user's language, in three numbering schemes (C167).
 #pragma once
 
 #include <wx/string.h>
 
 namespace LocaleSettings {
 
-/// Language number of the system's own, after the user's preferred languages: the first that is
-/// known. 59, English, when none is.
+/// The system's number for the first of the user's preferred languages that is known. 59 (English)
+/// if none is known.
 int MacGetUserLocale();
 
 /// The same.
 int GetSystemLanguagewX();
 
-/// Windows language identifier of the user's language, and not a code page (C155).
+/// Windows language identifier of the user's language, not a code page (C155).
 int GetSystemCodePage();
 
-/// The same for a language number; a negative one means the user's language. 1033, English, for
-/// unknown numbers.
+/// Same for a language number; a negative number means the user's language. Unknown numbers give
+/// 1033 (English).
 int GetSystemCodePage(int language);
 
 /// The identifier of the user's language as decimal text.
 wxString GetSystemLanguageString();
 
-/// Text encoding of the user's language, a CFStringEncoding: 0, MacRoman, for most. Not all of them
-/// have a conversion here, see platform/CoreFoundationStrings.h.
+/// Text encoding of the user's language, a CFStringEncoding; for most languages 0, MacRoman. Some
+/// of these encodings have no conversion here, see platform/CoreFoundationStrings.h.
 int GetMacSystemEncoding();
 
 } // namespace LocaleSettings

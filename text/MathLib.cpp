@@ -89,7 +89,7 @@ bool ExplicitEpsilonEqual(double a, double b, double epsilon) {
 
 double MagneticInt(double value, double epsilon) {
     const double nearest = Round(value);
-    // At 0 a relative distance says nothing.
+    // At 0 a relative distance has no meaning.
     const bool near = nearest == 0.0 ? ExplicitEpsilonEqual(value, nearest, epsilon)
                                      : EpsilonEqual(value, nearest, epsilon);
     return near ? nearest : value;
@@ -108,7 +108,7 @@ unsigned long long DoubleToU64(double value) {
         return ~0ULL;
     }
     if (value > lastBelow2To63) {
-        // From 2^63 on, the mantissa with its hidden bit is the number's upper 53 bits.
+        // From 2^63 on, the mantissa with its hidden bit is the upper 53 bits of the number.
         return std::bit_cast<std::uint64_t>(value) << 11 | 0x8000000000000000;
     }
     return static_cast<unsigned long long>(static_cast<long long>(value));
@@ -119,7 +119,7 @@ double U64ToDouble(unsigned long long value) {
     if (value < topBit) {
         return static_cast<double>(static_cast<long long>(value));
     }
-    // The lower 63 bits, rounded to the 52 of a mantissa without a carry into the exponent.
+    // The lower 63 bits, rounded to the 52 bits of a mantissa without a carry into the exponent.
     const std::uint64_t lower = value & ~topBit;
     const std::uint64_t rounded = lower >= 0x7FFFFFFFFFFFFC00 ? ~topBit : lower + 1024;
     return std::bit_cast<double>(rounded >> 11 | 0x43E0000000000000);

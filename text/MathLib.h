@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Rounding, comparing with a tolerance, and turning doubles into integers without overflow (C168).
+// Rounding, comparison with a tolerance, safe conversion of doubles to integers (C168).
 #pragma once
 
 #include <bit>
@@ -9,7 +9,7 @@
 
 namespace MathLib {
 
-/// What stands for a missing number. Their addresses are handed out, and are the same for all.
+/// Represent a missing number. Their addresses are handed out and are the same everywhere.
 inline constexpr double NOT_A_DOUBLE_NUMBER =
     std::bit_cast<double>(std::uint64_t{0x7FF8000000000000});
 inline constexpr float NOT_A_FLOAT_NUMBER = std::bit_cast<float>(std::uint32_t{0x7FC00000});
@@ -23,12 +23,12 @@ T NotANumber();
 template<>
 double NotANumber<double>();
 
-/// Truncates toward zero, within the limits of T: what lies outside gives the nearer limit, and a
-/// NaN the smallest T (a processor would choose by itself).
+/// Truncates toward zero and clamps to the range of T. A NaN gives the smallest T, so that the
+/// result does not depend on the processor.
 template<std::integral T>
 constexpr T cast_value(double value) {
     using Limits = std::numeric_limits<T>;
-    // The largest 64-bit number becomes 2^63 as a double, one more than fits: hence >= and not >.
+    // As a double, the largest 64-bit integer becomes 2^63, one more than fits: hence >=.
     if (value >= static_cast<double>(Limits::max())) {
         return Limits::max();
     }
@@ -46,12 +46,12 @@ unsigned int RoundToUnsigned(double value);
 long long RoundToI64(double value);
 unsigned long long RoundToU64(double value);
 
-/// To the nearest multiple of granularity; one below 1 leaves the value as it is.
+/// To the nearest multiple of granularity. If granularity is below 1, returns the value unchanged.
 double RoundToBigGranularity(double value, int granularity);
-/// To the nearest multiple of 1 / granularity; one below 1 leaves the value as it is.
+/// To the nearest multiple of 1 / granularity. Same exception.
 double RoundToSmallGranularity(double value, int granularity);
 
-// A value that misses a whole number by less than epsilon, relative to the value, counts as it.
+// A value within epsilon (relative to the value) of a whole number counts as that number.
 double EpsilonFloor(double value, double epsilon);
 double EpsilonCeil(double value, double epsilon);
 int EpsilonFloorToInt(double value, double epsilon);
@@ -59,27 +59,27 @@ int EpsilonCeilToInt(double value, double epsilon);
 unsigned int EpsilonFloorToUnsigned(double value, double epsilon);
 unsigned int EpsilonCeilToUnsigned(double value, double epsilon);
 
-/// Relative to b alone, so not symmetric (C157).
+/// The tolerance is relative to b alone, so the comparison is not symmetric (C157).
 bool EpsilonEqual(double a, double b, double epsilon);
-/// Absolute.
+/// The tolerance is absolute.
 bool ExplicitEpsilonEqual(double a, double b, double epsilon);
 
-/// The nearest whole number where the value is within epsilon of it (relative, except at 0), else
-/// the value.
+/// The nearest whole number if the value is within epsilon of it (a relative distance, but absolute
+/// for 0), otherwise the value.
 double MagneticInt(double value, double epsilon);
 
-/// Truncates; negative values give 0, values from 2^64 on and all that is no number the largest.
+/// Truncates. Negative values give 0; 2^64 or more, infinities and NaNs the largest number.
 unsigned long long DoubleToU64(double value);
-/// The nearest double; halves between two doubles go up.
+/// The nearest double. Ties are rounded up.
 double U64ToDouble(unsigned long long value);
 
-/// The resolution nearest to the wanted one that divides the encoder's in whole steps. Not a number
-/// where either is 0 or less, or the resolution is above the encoder's.
+/// The resolution nearest to the requested one that divides the encoder's resolution into whole
+/// steps. Returns NaN if either is 0 or less, or if the requested resolution exceeds the encoder's.
 double ResolutionToEncoderGranularity(double resolution, double encoder);
 
 } // namespace MathLib
 
-/// To `digits` decimals, halves up, for negative values too: -2.5 gives -2. The result is the
-/// product with a power of ten and keeps that product's binary remainder (C157). Not to be merged
+/// Rounds to `digits` decimals, halves up even for negative values: -2.5 gives -2. The result is
+/// the product with a power of ten and keeps that product's binary remainder (C157). Don't merge it
 /// with MathLib::RoundToSmallGranularity, which rounds halves away from zero and divides.
 double round_(double value, int digits);

@@ -28,7 +28,7 @@ const char* STRINGCACHE::operator[](const char* text) {
         return nullptr;
     }
     if (m_last == nullptr || *m_last != text) {
-        // Looked up as it stands, so that a text that is stored already costs no allocation.
+        // Looks up the pointer's text directly, so that a text already stored costs no allocation.
         const std::string_view wanted = text;
         auto place = m_texts.lower_bound(wanted);
         if (place == m_texts.end() || *place != wanted) {

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Sets of values whose stored elements keep their addresses until the set is cleared. They let a
-// table of pointers outlive the variables of those who filled it, and store what is equal once.
+// Sets of values whose elements keep their addresses until the set is cleared. A table of pointers
+// can therefore outlive the caller's variables, and equal values are stored once.
 #pragma once
 
 #include <bit>
@@ -15,10 +15,10 @@
 
 #include "ticket/ParameterRecords.h"
 
-/// Counted bytes of its own, with a view on them.
+/// Owns counted bytes and a view of them.
 class BIN_STRING_BUFFER {
   public:
-    /// A view that is not valid gives an empty buffer with an empty view.
+    /// An invalid view gives an empty buffer with an empty view.
     explicit BIN_STRING_BUFFER(const BIN_STRING& bytes);
     BIN_STRING_BUFFER(const BIN_STRING_BUFFER& other);
     BIN_STRING_BUFFER& operator=(const BIN_STRING_BUFFER& other);
@@ -30,7 +30,7 @@ class BIN_STRING_BUFFER {
 
   private:
     std::string m_bytes;
-    BIN_STRING m_view; ///< On m_bytes.
+    BIN_STRING m_view; ///< Of m_bytes.
 };
 
 /// Texts.
@@ -40,12 +40,12 @@ class STRINGCACHE {
     STRINGCACHE(const STRINGCACHE&) = delete;
     STRINGCACHE& operator=(const STRINGCACHE&) = delete;
 
-    /// Stores a copy of the text, redirects the pointer to it and gives it back. Null stays null.
+    /// Stores a copy of the text, points the pointer to it and returns it. Null stays null.
     const char* operator()(const char*& text);
-    /// The same by value.
+    /// Same, with the pointer passed by value.
     const char* operator[](const char* text);
 
-    /// True if the text is stored; null never is.
+    /// True if the text is stored. Always false for null.
     bool find(const char* text) const;
     void clear() {
         m_texts.clear();
@@ -54,12 +54,12 @@ class STRINGCACHE {
 
   private:
     std::set<std::string, std::less<>> m_texts;
-    const std::string* m_last = nullptr; ///< The one asked for last: keys come in runs.
+    const std::string* m_last = nullptr; ///< The latest lookup: equal keys come in runs.
 };
 
-/// Numbers. Of a double no NaN may come here, since it equals nothing; 0.0 and -0.0 are the same,
-/// and the first to come is stored. A hash table: arrays of measured values, no two of which are
-/// alike, go through here, and with a tree that would be most of the time that writing them takes.
+/// Numbers. The caller must keep NaNs out, since a NaN equals nothing. 0.0 and -0.0 are equal: the
+/// first one added is stored. This is a hash table because arrays of distinct measured values pass
+/// through it, and a tree would take most of the time needed to write them.
 template<class T>
 class VALCACHE {
   public:
@@ -67,7 +67,7 @@ class VALCACHE {
     VALCACHE(const VALCACHE&) = delete;
     VALCACHE& operator=(const VALCACHE&) = delete;
 
-    /// Stores a copy of the value, redirects the pointer to it and gives it back. Null stays null.
+    /// Stores a copy of the value, points the pointer to it and returns it. Null stays null.
     const T* operator()(const T*& value) {
         if (value != nullptr) {
             value = &Stored(*value);
@@ -78,7 +78,7 @@ class VALCACHE {
         m_values.clear();
         m_places.clear();
     }
-    /// Makes room for that many more values.
+    /// Makes room for `more` additional values.
     void reserve(std::size_t more) {
         const std::size_t places = std::bit_ceil(2 * (m_values.size() + more) + 1);
         if (more != 0 && places > m_places.size()) {
@@ -98,15 +98,15 @@ class VALCACHE {
         return *place;
     }
 
-    /// Where the value is, or where it is to go: there is always a free place.
+    /// The place of the value, or the free place where it belongs. There is always a free place.
     const T*& PlaceOf(const T& value) {
-        // Equal values have equal bits but for the zeros of a double.
+        // Equal values have equal bits, except the zeros of a double.
         std::uint64_t bits = 0;
         if (value != T(0)) {
             std::memcpy(&bits, &value, sizeof value);
         }
         const std::size_t last = m_places.size() - 1; // The size is a power of two.
-        // The highest bits of the product are those that all bits of the value have a part in.
+        // The highest bits of the product depend on all bits of the value.
         std::size_t place = bits * 0x9E3779B97F4A7C15 >> std::countl_zero(last);
         while (m_places[place] != nullptr && *m_places[place] != value) {
             place = (place + 1) & last;
@@ -121,14 +121,14 @@ class VALCACHE {
         }
     }
 
-    std::deque<T> m_values;         ///< In order of arrival.
-    std::vector<const T*> m_places; ///< Of the values, by their bits: at most half are taken.
+    std::deque<T> m_values;         ///< In order of insertion.
+    std::vector<const T*> m_places; ///< Hash table of m_values, at most half full.
 };
 
 /// Binary values.
 class BIN_STRING_CACHE {
   public:
-    /// Stores a copy of the bytes, redirects the pointer to the copy's view and gives it back. Null
+    /// Stores a copy of the bytes, redirects the pointer to the copy's view and returns it. Null
     /// stays null.
     const BIN_STRING* operator()(const BIN_STRING*& bytes);
     void clear() { m_buffers.clear(); }

@@ -15,7 +15,7 @@ SETMULTIPAR makeRecord(const char* key, PARAM_TYPE type, const void* value, int 
     return {.key = key, .type = type, .value = value, .position = position};
 }
 
-/// Copies the value into the cache; the address of the copy.
+/// Copies the value into the cache and returns the address of the copy.
 template<class T, class Cache>
 const void* own(Cache& cache, const void* value) {
     auto* typed = static_cast<const T*>(value);
@@ -64,7 +64,7 @@ void SETMULTIPAR_LIST::Append(const SETMULTIPAR& record) {
     DropTable();
 }
 
-/// What is not a finite number has no place in the cache, so all such share one constant (C131).
+/// NaNs and infinities can't be stored in the cache, so they share one constant (C131).
 const void* SETMULTIPAR_LIST::OwnDouble(const void* value) {
     if (value != nullptr && MathLib::IsNotANumber(*static_cast<const double*>(value))) {
         return &MathLib::NOT_A_DOUBLE_NUMBER;
@@ -112,7 +112,7 @@ bool SETMULTIPAR_LIST::xSetNumbers(const char* key, PARAM_TYPE type, const void*
         return false;
     }
     if (count <= 0) {
-        return true; // Not even the key counts as set.
+        return true; // The key does not count as set either.
     }
     const auto more = static_cast<std::size_t>(count);
     if (m_list.size() + more > m_list.capacity()) {
@@ -139,7 +139,7 @@ bool SETMULTIPAR_LIST::xSetNumbers(const char* key, PARAM_TYPE type, const void*
 
 bool SETMULTIPAR_LIST::ySetParameter(const char* key, PARAM_TYPE type, const void* value,
                                      int position) {
-    // Position 0 of a walk starts a key, and a table that starts a key replaces it.
+    // Position 0 of a walk starts a key. In a table, POSITION_WHOLE replaces the key.
     const int folded = position == 0 ? POSITION_WHOLE : position;
     if (m_deep) {
         return xSetParameter(key, type, value, folded);
@@ -183,7 +183,7 @@ void SETMULTIPAR_LIST::Merge(const STICKET_ACCESS* access, const char* const* ke
         return;
     }
     if (keys != nullptr && *keys != nullptr) {
-        // Straight through the filter: one that came out empty lets nothing pass.
+        // Uses the filter even if it is empty: an empty filter lets nothing pass.
         MergeFiltered(*access, PARTIAL_MODE(keys));
     } else {
         ticket::walk(*access, CollectAction, this);
@@ -226,7 +226,7 @@ bool SETMULTIPAR_LIST::CollectAction(void* context, const char* key, PARAM_TYPE 
 bool SETMULTIPAR_LIST::FilterAction(void* context, const char* key, PARAM_TYPE type,
                                     const void* value, int position) {
     auto* list = static_cast<SETMULTIPAR_LIST*>(context);
-    // Each call on a copy (C133), so that a predicate starts every time as it was given.
+    // Calls a copy (C133), so that the predicate starts in its original state each time.
     auto filter = list->m_filter;
     if (filter(key)) {
         list->ySetParameter(key, type, value, position);

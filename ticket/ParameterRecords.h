@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The records in which parameters cross the plug-in boundary. Values, sizes and offsets are a
-// contract with plug-ins that were built without these headers (C95).
+// The records that carry parameters across the plug-in boundary. Their values, sizes and offsets
+// are a contract with plug-ins that were built without these headers (C95).
 #pragma once
 
 #include <cstddef>
@@ -8,15 +8,15 @@
 #include <cstring>
 #include <string>
 
-/// Type of a value. In a record, the value pointer is what the comment says; reading, it is the
-/// place that receives it.
+/// Type of a value. Each comment describes what the record's value pointer refers to. When reading,
+/// it is the place that receives the value.
 enum PARAM_TYPE : std::int32_t {
-    PARAM_DELETE = 0,  ///< Setting: null, deletes. Reading: asks whether the key exists; a
-                       ///< PARAM_TYPE place, or null, receives the type that is stored.
+    PARAM_DELETE = 0,  ///< Setting: null, deletes. Reading: tests whether the key exists; a
+                       ///< PARAM_TYPE place, or null, receives the stored type.
     PARAM_POINTER = 1, ///< The void* itself, never what it points to.
-    PARAM_INT = 2,     ///< int. Booleans travel as 0 and 1 of this type.
+    PARAM_INT = 2,     ///< int. Booleans are passed as 0 and 1 of this type.
     PARAM_DOUBLE = 3,  ///< double
-    PARAM_STRING = 4,  ///< Setting: the text itself, ended by a zero byte. Reading: a const char*
+    PARAM_STRING = 4,  ///< Setting: the zero-terminated text itself. Reading: a const char*
                        ///< place.
     PARAM_BINARY = 5,  ///< BIN_STRING
     PARAM_COUNT = 6,   ///< Reading at POSITION_WHOLE: an unsigned long place receives the number of
@@ -27,38 +27,38 @@ enum PARAM_TYPE : std::int32_t {
 };
 
 /// Positions from 0 up are elements of a key.
-inline constexpr int POSITION_APPEND = -2; ///< Behind the last element.
+inline constexpr int POSITION_APPEND = -2; ///< After the last element.
 inline constexpr int POSITION_WHOLE =
     -1; ///< The key as a whole: set replaces it, delete removes it.
 
-/// One record of a table that is written. A null key ends the table; nothing behind it is read.
-/// Keys and values belong to whoever made the table.
+/// One record of a table to write. A null key ends the table. Keys and values belong to whoever
+/// created the table.
 struct SETMULTIPAR {
     const char* key = nullptr;
     PARAM_TYPE type = PARAM_DELETE;
     std::int32_t reserved1 = 0;
     const void* value = nullptr;
     std::int32_t position = 0;
-    std::uint8_t result = 0; ///< Bit 0 alone: the plug-in carried the record out.
+    std::uint8_t result = 0; ///< Only bit 0 counts: the plug-in carried the record out.
     std::uint8_t reserved2[3] = {};
 
     bool ok() const { return (result & 1) != 0; }
 };
 
-/// One record of a table that is read; laid out as SETMULTIPAR.
+/// One record of a table to read, laid out like SETMULTIPAR.
 struct GETMULTIPAR {
     const char* key = nullptr;
     PARAM_TYPE type = PARAM_DELETE;
     std::int32_t reserved1 = 0;
     void* value = nullptr; ///< The place that receives the value.
     std::int32_t position = 0;
-    std::uint8_t result = 0; ///< Bit 0 alone: the place was filled.
+    std::uint8_t result = 0; ///< Only bit 0 counts: the place was filled.
     std::uint8_t reserved2[3] = {};
 
     bool ok() const { return (result & 1) != 0; }
 };
 
-/// A view on counted bytes; it owns nothing.
+/// A non-owning view of counted bytes.
 struct BIN_STRING {
     const char* data = nullptr;
     std::size_t length = 0;
@@ -71,8 +71,7 @@ struct BIN_STRING {
     const char* end() const { return data + length; }
 };
 
-/// The order of the keys, and of nothing else. A record without a key comes last, as the end of a
-/// table does.
+/// Orders records by key only. A record without a key comes last, like the end of a table.
 inline bool operator<(const SETMULTIPAR& a, const SETMULTIPAR& b) {
     if (a.key == nullptr || b.key == nullptr) {
         return a.key != nullptr;
@@ -80,7 +79,7 @@ inline bool operator<(const SETMULTIPAR& a, const SETMULTIPAR& b) {
     return std::strcmp(a.key, b.key) < 0;
 }
 
-/// The type under which a native value travels. Types without one don't compile.
+/// The parameter type that corresponds to a native type. Other types don't compile.
 template<class T>
 constexpr PARAM_TYPE GetParamType() = delete;
 template<>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tables of parameter records: making, copying, and asking what became of them (C158).
+// Creates and copies tables of parameter records and evaluates their results (C158).
 #pragma once
 
 #include <cstdlib>
@@ -7,37 +7,37 @@
 
 #include "ticket/ParameterRecords.h"
 
-/// True when every record of the table was carried out: of an empty table, true; of null, false.
+/// True if every record of the table was carried out. True for an empty table, false for null.
 bool AllMultiParameterOk(const GETMULTIPAR* table);
 bool AllMultiParameterOk(const SETMULTIPAR* table);
 
-/// True when at least one record of the table was carried out: of an empty table or null, false.
+/// True if at least one record was carried out. False for an empty table or null.
 bool AnyMultiParameterOk(const GETMULTIPAR* table);
 bool AnyMultiParameterOk(const SETMULTIPAR* table);
 
-/// Copies the results, record by record, up to the end of the shorter table. Either may be null.
+/// Copies the results record by record until the shorter table ends. Either may be null.
 void MultiParameterResultCpy(SETMULTIPAR* to, const SETMULTIPAR* from);
 
-/// A copy of the table that shares keys and values with its source. To be freed with free(). Null
-/// for null and when memory is short.
+/// Returns a copy that shares keys and values with its source, to be freed with free(). Returns
+/// null for null and if memory runs out.
 SETMULTIPAR* MultiParameterDup(const SETMULTIPAR* table);
 
-/// A table that reads the first `count` elements of a key: positions 0, 1, 2, ... and no values
-/// yet.
+/// A table that reads the first `count` elements of a key, at positions 0, 1, 2, ... Its value
+/// pointers are null.
 ///
-/// To be freed with free(). Null when memory is short, and for more elements than a key can have.
+/// Free it with free(). Null if memory runs out or if a key can't have that many elements.
 GETMULTIPAR* NewGetMultipar(unsigned long count, const char* key, PARAM_TYPE type);
 
 /// A table that replaces a key by `count` elements: the first record, at position -1, replaces the
-/// key, and those at 1, 2, ... fill it up. No values yet. Memory as for NewGetMultipar.
+/// key; the others, at 1, 2, ..., extend it. Values and memory are as for NewGetMultipar.
 SETMULTIPAR* NewSetMultipar(unsigned long count, const char* key, PARAM_TYPE type);
 
 namespace ticket {
 
-/// More elements than these no key has: a count beyond it is damage, and is not allocated.
+/// The maximum number of elements of a key. A larger count is damaged data and is not allocated.
 inline constexpr unsigned long maxElements = 0x1000000;
 
-/// True for the types under which a ticket keeps values.
+/// True for the types of values that a ticket can store.
 constexpr bool isValueType(PARAM_TYPE type) {
     return type >= PARAM_POINTER && type <= PARAM_UINT64 && type != PARAM_COUNT;
 }

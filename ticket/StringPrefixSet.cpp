@@ -14,7 +14,7 @@ STRINGPREFIXSET::const_iterator STRINGPREFIXSET::find(const std::string& text) c
 }
 
 void STRINGPREFIXSET::insert(const std::string& prefix) {
-    // By place and not by key: erasing by key takes all longer prefixes at once.
+    // Erases by iterator: erasing by key would remove all longer prefixes at once.
     const const_iterator first = m_prefixes.find(prefix);
     if (first != end() && first->size() > prefix.size()) {
         m_prefixes.erase(first);

@@ -1,15 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
-// A set of key prefixes of which none begins with another.
+// A set of key prefixes, none of which begins with another.
 #pragma once
 
 #include <set>
 #include <string>
 
-/// An ordered set in which strings count as the same as soon as one begins with the other, so that
-/// it holds one prefix, normally the shortest, of each family. The empty string is of every family.
+/// An ordered set in which two strings count as equal if one begins with the other. So it contains
+/// one prefix of each family, normally the shortest. The empty string belongs to every family.
 class STRINGPREFIXSET {
   public:
-    /// Compares as many characters as the shorter string has, byte by byte.
+    /// Compares only as many characters as the shorter string has, byte by byte.
     struct LESS {
         bool operator()(const std::string& a, const std::string& b) const;
     };
@@ -21,18 +21,18 @@ class STRINGPREFIXSET {
     bool empty() const { return m_prefixes.empty(); }
     void clear() { m_prefixes.clear(); }
 
-    /// The prefix that `text` begins with, or end(): of a stored `ab`, `abc` finds it and `a` does
-    /// not.
+    /// Returns the stored prefix that `text` begins with, or end(). If `ab` is stored, `abc` finds
+    /// it and `a` does not.
     const_iterator find(const std::string& text) const;
 
     /// Stores a prefix, unless a shorter one covers it.
     ///
-    /// Of several longer prefixes the first alone gives way, and then the others keep the new one
-    /// out (C122). `ab` to a set of `abc` and `abd` leaves `abd`.
+    /// If several longer prefixes are stored, only the first is removed, and the others keep the
+    /// new prefix out (C122). Adding `ab` to `abc` and `abd` leaves `abd`.
     void insert(const std::string& prefix);
 
-    /// Removes what find() finds, so that erasing `abc` removes a stored `ab` (C123).
-    /// The number removed.
+    /// Removes what find() finds: erasing `abc` removes a stored `ab` (C123). Returns the number of
+    /// removed prefixes.
     std::size_t erase(const std::string& prefix);
 
   private:

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The parameters of one ticket, reached in either of two ways: what is written over these works for
-// a ticket of its own and for one inside a container.
+// Access to the parameters of one ticket in either of two ways. Code based on these classes works
+// for a single ticket and for a ticket inside a container.
 #pragma once
 
 #include <type_traits>
@@ -30,7 +30,7 @@ class Single {
     const STICKET_ACCESS& m_access;
 };
 
-/// A ticket through the container that holds it. Type and id pass unchecked.
+/// A ticket through its container. Type and id are not checked.
 class Contained {
   public:
     Contained(const MTICKET_ACCESS& access, int type, int id)
@@ -58,13 +58,13 @@ class Contained {
     int m_id;
 };
 
-/// Shows the callback every value of the ticket.
+/// Calls back with every value of the ticket.
 inline void walk(const STICKET_ACCESS& access, SCollect callback, void* context) {
-    // Text and number mean something to the plug-in alone, which never got others (C121).
+    // Only the plug-in interprets text and number. Callers have always passed these (C121).
     single::Walk::call(access, callback, context, "", 8000);
 }
 
-/// A plug-in's record as one of its views: the same address, since views have no data.
+/// A plug-in's record as one of its views, at the same address, since views have no data.
 template<class View, class Record>
 const View& as(const Record& record) {
     static_assert(std::is_base_of_v<Record, View> && sizeof(View) == sizeof(Record));

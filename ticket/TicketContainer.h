@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Views on the container of a session: the parameters of its tickets, and the tickets (C161).
+// Views of the container of a session: its tickets and their parameters (C161).
 #pragma once
 
 #include <string>
@@ -7,11 +7,11 @@
 
 #include "ticket/TicketFamilies.h"
 
-/// Reading. The view is the plug-in's record itself, at the same address (ticket::as), and has no
-/// data; the container and the tickets that it opens belong to the plug-in.
+/// Read access. The view has no data: it is the plug-in's record, at the same address (ticket::as).
+/// The plug-in owns the container and the tickets that it opens.
 ///
-/// A ticket is addressed by its type and its id, which reach the plug-in unchecked except where
-/// told. Parameters are read as by STICKET_READ.
+/// A ticket is addressed by its type and id. Unless documented otherwise, they reach the plug-in
+/// unchecked. Parameters are read as in STICKET_READ.
 class MTICKET_READ : public MTICKET_ACCESS {
   public:
     bool TicketExists(int type, int id) const;
@@ -19,8 +19,8 @@ class MTICKET_READ : public MTICKET_ACCESS {
     /// The ticket, or null.
     const STICKET_ACCESS* OpenTicket(int type, int id) const;
 
-    /// The ids of all tickets of a type, as the plug-in walks them. True when there are any; an
-    /// invalid type has none, and the plug-in is not asked.
+    /// The ids of all tickets of a type, in the plug-in's order. True if there are any. An invalid
+    /// type has none, and the plug-in is not called.
     bool GetTickets(int type, std::vector<int>& ids) const;
 
     bool WalkTickets(TicketWalk fn, void* context, int type) const;
@@ -28,12 +28,12 @@ class MTICKET_READ : public MTICKET_ACCESS {
     bool GetParameter(int type, int id, const char* key, std::string& out, int position) const;
 
     int GetIntParameter(int type, int id, const char* key, int fallback) const;
-    /// Note the position in front of the key (C128).
+    /// Note that the position precedes the key (C128).
     int GetIntParameter(int type, int id, int position, const char* key, int fallback) const;
 
     std::string GetStringParameter(int type, int id, const char* key,
                                    const std::string& fallback) const;
-    /// The plug-in's own text, or the fallback.
+    /// The plug-in's own text (not a copy), or the fallback.
     const char* GetPszParameter(int type, int id, const char* key, const char* fallback) const;
 
     bool GetFilenameParameterChk_C(int type, int id, const char* key, std::string& out,
@@ -53,7 +53,7 @@ class MTICKET_READ : public MTICKET_ACCESS {
     }
 };
 
-/// Changing parameters, as STICKET_MODIFY does.
+/// Write access to parameters, as in STICKET_MODIFY.
 class MTICKET_MODIFY : public MTICKET_READ {
   public:
     bool DelParameter(int type, int id, const char* key, int position) const;
@@ -73,21 +73,21 @@ class MTICKET_MODIFY : public MTICKET_READ {
         return ticket::writeArray(ticket::Contained(*this, type, id), key, values, count);
     }
 
-    /// Gives the plug-in the ticket's table of partial keys.
+    /// Passes the ticket's table of partial keys to the plug-in.
     bool SetPartial(int type, int id, const char* const* keys) const;
 };
 
-/// Making and removing tickets, and being told of changes.
+/// Creates and deletes tickets and controls change notifications.
 class MTICKET_ADMIN : public MTICKET_MODIFY {
   public:
-    /// The new ticket's id, or -1. The flag chooses TICKET_ID_NEW over TICKET_ID_NEW_PLAIN.
+    /// Returns the new id, or -1. The flag selects TICKET_ID_NEW over TICKET_ID_NEW_PLAIN.
     int CreateNextTicket(int type, bool flag) const;
 
-    /// The ticket, made with these keys if it is not there. Null where it can't be made, also where
-    /// the plug-in has no function for that.
+    /// Returns the ticket, and creates it with these keys if it does not exist. Returns null if it
+    /// can't be created or if the plug-in has no function for that.
     const STICKET_ACCESS* CreateOrOpenTicket(int type, int id, const char* const* keys) const;
 
-    /// The flag means something to the plug-in alone.
+    /// Only the plug-in interprets the flag.
     bool DeleteTicket(int type, int id, bool flag) const;
 
     bool EnableNotification(int type, int id, int notificationId, const char* const* keys) const;

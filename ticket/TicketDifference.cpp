@@ -42,7 +42,7 @@ bool ValueDiffers(const SETMULTIPAR& x, const SETMULTIPAR& y) {
     }
 }
 
-/// The records of one key. Within a table equal keys have one address, so the address ends a run.
+/// The records of one key. Within a table, equal keys have one address, which ends the run.
 struct Run {
     const SETMULTIPAR* first;
     const SETMULTIPAR* end;
@@ -69,7 +69,7 @@ void append(Records& out, const SETMULTIPAR* first, const SETMULTIPAR* end) {
     out.insert(out.end(), first, end);
 }
 
-/// Sends single elements of a key where that takes fewer records than its whole run.
+/// Sends single elements of a key if that takes fewer records than the whole run.
 void appendChanges(Records& out, const Run& present, const Run& wanted) {
     const SETMULTIPAR* a = present.first;
     const SETMULTIPAR* b = wanted.first;
@@ -82,7 +82,7 @@ void appendChanges(Records& out, const Run& present, const Run& wanted) {
     }
     const int highOld = present.HighestPos();
     const int highNew = wanted.HighestPos();
-    if (highOld < 1 || highNew < 1) { // A scalar, or a vector of one.
+    if (highOld < 1 || highNew < 1) { // A scalar, or a vector with one element.
         append(out, wanted.first, wanted.end);
         return;
     }
@@ -94,7 +94,7 @@ void appendChanges(Records& out, const Run& present, const Run& wanted) {
         }
     }
     append(changes, b, wanted.end);
-    // Counted, not made: behind a hole there can be two billion positions.
+    // Counts deletions before creating them: there can be two billion positions after a hole.
     const long long surplus = highNew < highOld ? static_cast<long long>(highOld) - highNew : 0;
     if (static_cast<long long>(changes.size()) + surplus >= static_cast<long long>(highNew) + 1) {
         append(out, wanted.first, wanted.end);
@@ -103,9 +103,9 @@ void appendChanges(Records& out, const Run& present, const Run& wanted) {
     for (int position = highOld; position > highNew; --position) {
         changes.push_back(deletion(wanted.first->key, position));
     }
-    // There are none where a plug-in shows an element twice.
+    // Can be empty if a plug-in shows an element twice.
     if (!changes.empty() && changes.front().position == POSITION_WHOLE) {
-        changes.front().position = 0; // As the whole key it would replace the other elements.
+        changes.front().position = 0; // POSITION_WHOLE would replace the other elements.
     }
     append(out, changes.data(), changes.data() + changes.size());
 }

@@ -4,13 +4,13 @@
 
 #include "ticket/TicketRecords.h"
 
-/// The plug-in's factory; null until a plug-in is there. The connection to the server sets it.
+/// The plug-in's factory, or null if no plug-in is loaded. The connection to the server sets it.
 extern const ticket::Factory* hSTicketInstance;
 
-/// An empty ticket, to be given back with DestroyTicket. Null without a factory and where the
+/// Returns an empty ticket, to be released with DestroyTicket. Null without a factory and if the
 /// factory refuses. All callers pass a null name.
 const STICKET_ACCESS* CreateTicket(const char* name);
 
-/// Gives a ticket of CreateTicket back; the factory is handed the caller's pointer. Nothing happens
-/// without a factory.
+/// Releases a ticket of CreateTicket; the factory gets the caller's pointer. Does nothing without a
+/// factory.
 void DestroyTicket(const STICKET_ACCESS*& access);

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Reading and writing typed values, vectors and arrays, once for both ways to reach a ticket.
+// Reads and writes typed values, vectors and arrays, for both ways to reach a ticket.
 //
-// A vector costs two calls of the plug-in, its count and one table, whatever its length. `Place` is
+// A vector of any length costs two plug-in calls: its count and one table. `Place` is
 // ticket::Single or ticket::Contained. Pointers that are read belong to the ticket.
 #pragma once
 
@@ -16,7 +16,7 @@
 
 namespace ticket {
 
-/// Types that travel by their address.
+/// Types that are passed by address.
 template<class T>
 concept Number =
     std::same_as<T, int> || std::same_as<T, unsigned int> || std::same_as<T, long long> ||
@@ -29,14 +29,14 @@ concept Pointer = std::same_as<T, void*> || std::same_as<T, const char*>;
 template<class T>
 concept Element = Number<T> || Pointer<T>;
 
-/// The text at a position, or null where there is none.
+/// The text at a position, or null if there is none.
 template<class Place>
 const char* readText(const Place& place, const char* key, int position) {
     const char* text = nullptr;
     return place.get(key, PARAM_STRING, &text, position) ? text : nullptr;
 }
 
-/// False, with `out` emptied, where there is no text.
+/// If there is no text, returns false and empties `out`.
 template<class Place>
 bool readString(const Place& place, const char* key, std::string& out, int position) {
     const char* text = readText(place, key, position);
@@ -44,14 +44,14 @@ bool readString(const Place& place, const char* key, std::string& out, int posit
     return text != nullptr;
 }
 
-/// The text of the key as a whole, or the fallback.
+/// The text of the whole key, or the fallback.
 template<class Place>
 std::string readString(const Place& place, const char* key, const std::string& fallback) {
     const char* text = readText(place, key, POSITION_WHOLE);
     return text != nullptr ? text : fallback;
 }
 
-/// As readString, with forward slashes.
+/// Same as readString, with forward slashes.
 template<class Place>
 bool readFilename(const Place& place, const char* key, std::string& out, int position) {
     const bool found = readString(place, key, out, position);
@@ -66,8 +66,8 @@ int readInt(const Place& place, const char* key, int fallback, int position) {
     return place.get(key, PARAM_INT, &value, position) ? value : fallback;
 }
 
-/// True when the vector is not empty. It keeps its content where the key has no elements. Elements
-/// that can't be read are left out (C127), so those after a hole don't carry their positions.
+/// True if the vector is not empty. A key without elements leaves the vector unchanged. Unreadable
+/// elements are left out (C127), so after a hole, indexes no longer match positions.
 template<class Place, Element T>
 bool readVector(const Place& place, const char* key, std::vector<T>& out) {
     unsigned long count = 0;
@@ -93,7 +93,7 @@ bool readVector(const Place& place, const char* key, std::vector<T>& out) {
     return !out.empty();
 }
 
-/// Booleans from integers: true where not 0. On false the vector is as it was.
+/// Booleans from integers: true if not 0. Leaves the vector unchanged on failure.
 template<class Place>
 bool readVector(const Place& place, const char* key, std::vector<bool>& out) {
     std::vector<int> values;
@@ -107,7 +107,7 @@ bool readVector(const Place& place, const char* key, std::vector<bool>& out) {
     return true;
 }
 
-/// On a key without readable elements the vector is as it was.
+/// Leaves the vector unchanged if no element can be read.
 template<class Place>
 bool readVector(const Place& place, const char* key, std::vector<std::string>& out) {
     std::vector<const char*> texts;
@@ -119,7 +119,7 @@ bool readVector(const Place& place, const char* key, std::vector<std::string>& o
     return !out.empty();
 }
 
-/// File names, with forward slashes; empty on false.
+/// File names, with forward slashes. Empties `out` on failure.
 template<class Place>
 bool readFilenames(const Place& place, const char* key, std::vector<std::string>& out) {
     out.clear();
@@ -134,7 +134,7 @@ bool readFilenames(const Place& place, const char* key, std::vector<std::string>
     return true;
 }
 
-/// True when every element was read; those that were not stay as they were.
+/// True if every element was read. Elements that could not be read keep their values.
 template<class Place, Element T>
 bool readArray(const Place& place, const char* key, T* out, unsigned long count) {
     if (count == 0) {
@@ -151,7 +151,7 @@ bool readArray(const Place& place, const char* key, T* out, unsigned long count)
     return AllMultiParameterOk(table.get());
 }
 
-/// All of the array or nothing of it.
+/// Reads all elements or changes none.
 template<class Place>
 bool readArray(const Place& place, const char* key, bool* out, unsigned long count) {
     if (count == 0) {
@@ -167,8 +167,8 @@ bool readArray(const Place& place, const char* key, bool* out, unsigned long cou
     return true;
 }
 
-/// Replaces the key. True when every element was taken; without elements the key is deleted, and
-/// the result is true whatever came of that.
+/// Replaces the key. True if every element was accepted. Without elements, deletes the key and
+/// always returns true.
 template<class Place, Element T>
 bool writeElements(const Place& place, const char* key, const T* values, unsigned long count) {
     if (count == 0) {
@@ -222,7 +222,7 @@ bool writeArray(const Place& place, const char* key, const T* values, unsigned l
     return writeElements(place, key, values, count);
 }
 
-/// Without elements the key is left alone (C126), where every other form deletes it.
+/// Without elements, leaves the key unchanged (C126). Every other form deletes it.
 template<class Place>
 bool writeArray(const Place& place, const char* key, const bool* values, unsigned long count) {
     if (count == 0) {
@@ -232,7 +232,7 @@ bool writeArray(const Place& place, const char* key, const bool* values, unsigne
     if (!numbers) {
         return false;
     }
-    // Of a bool from elsewhere bit 0 alone is sure, hence the bytes.
+    // Only bit 0 of a foreign bool is defined, so this reads bytes.
     const auto* bytes = reinterpret_cast<const unsigned char*>(values);
     for (unsigned long i = 0; i < count; ++i) {
         numbers[i] = bytes[i] & 1;
@@ -242,8 +242,8 @@ bool writeArray(const Place& place, const char* key, const bool* values, unsigne
 
 } // namespace ticket
 
-// The same for callers that hold a record and no view: x for values that travel by their address,
-// xp for pointers. Results as told above.
+// The same functions for callers that have a record instead of a view: x for values passed by
+// address, xp for pointers. Results are as described above.
 
 template<ticket::Element T>
 bool xGetVectorParameter(const STICKET_ACCESS& access, const char* key, std::vector<T>& out) {

@@ -1,15 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
-// File names in tickets have forward slashes, whatever system they come from.
+// File names in tickets have forward slashes on every system.
 #pragma once
 
 #include <string>
 #include <vector>
 
-/// The name with every backslash made a forward slash.
+/// Returns the name with every backslash replaced by a forward slash.
 std::string FilenameToTicket(const std::string& name);
 
-/// The same and not its reverse (C125): file names have forward slashes on both ways.
+/// Same, not the inverse (C125): file names have forward slashes in both directions.
 std::string FilenameFromTicket_C(const std::string& name);
 
-/// FilenameToTicket of each name, in order; `out` is cleared first.
+/// Applies FilenameToTicket to each name, in order. Clears `out` first.
 void FilenamesToTicket(std::vector<std::string>& out, const std::vector<std::string>& in);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The flush of a TICKET_UPDATE_LIST: per ticket, what the server holds is compared with what it
-// should hold, and the difference is sent as one table.
+// The flush of a TICKET_UPDATE_LIST. For each ticket, compares what the server has with what it
+// should have, and sends the difference as one table.
 #include "ticket/ParameterList.h"
 #include "ticket/ParameterTables.h"
 #include "ticket/TicketAccess.h"
@@ -32,7 +32,7 @@ class Scratch {
     const STICKET_ACCESS* m_ticket;
 };
 
-/// The table of a list, or of nothing.
+/// The list's table, or an empty table if the list has none.
 const SETMULTIPAR* tableOf(SETMULTIPAR_LIST& list) {
     static constexpr SETMULTIPAR nothing{};
     const SETMULTIPAR* table = list.Table(false);
@@ -69,7 +69,7 @@ bool TICKET_UPDATE_LIST::FlushToContainer(const MTICKET_ACCESS* container, unsig
                                 scratch.view(), type, id, entry, anyOk);
         }
     }
-    Clear(); // What failed is gone too, and is not tried again (C142).
+    Clear(); // Failed changes are discarded too and not retried (C142).
     return anyOk;
 }
 
@@ -133,14 +133,14 @@ void TICKET_UPDATE_LIST::OneFlushToContainer(const MTICKET_ADMIN& admin, unsigne
         return;
     }
 
-    // With no key deleted the second set empties the mode, so that the whole ticket is copied:
-    // binary values and NaNs that nobody touched are then sent again (C144).
+    // If no key was deleted, the second set empties the mode, so the whole ticket is copied.
+    // Unchanged binary values and NaNs are then sent again (C144).
     PARTIAL_MODE mode;
     mode.set(entry.changedKeys, false);
     mode.set(entry.deletedKeys, false);
     scratch.Assign(admin.OpenTicket(type, id), PARTIAL_TABLE(mode));
 
-    // Deep, since the scratch ticket changes between the two.
+    // Deep, because the scratch ticket changes before the comparison.
     SETMULTIPAR_LIST present(true);
     present.Merge(&scratch, allKeys);
     for (const std::string& key : entry.deletedKeys) {

@@ -1,13 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
-// Who wants to know which addresses of tickets a flush replaced.
+// Reports which ticket addresses a flush replaced.
 #pragma once
 
-/// Told of each substitution of a flush: a virtual ticket's type or id became another one. An id
-/// that became -1 could not be made.
+/// Called for each replacement during a flush: a virtual ticket's type or id was replaced. An id of
+/// -1 means that the ticket could not be created.
 struct TICKET_UPDATE_CALLBACK {
     using Function = void (*)(void* context, bool isId, int from, int to);
 
-    Function function = nullptr; ///< Null: nobody wants to know.
+    Function function = nullptr; ///< Null: no callback.
     void* context = nullptr;
 
     void operator()(bool isId, int from, int to) const {

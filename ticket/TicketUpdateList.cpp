@@ -20,7 +20,7 @@ const STICKET_MODIFY& view(const STICKET_ACCESS* access) {
     return ticket::as<STICKET_MODIFY>(*access);
 }
 
-/// Null without a container, as if the ticket were not there.
+/// Returns null if there is no container, as if the ticket did not exist.
 const STICKET_ACCESS* openTicket(const MTICKET_ACCESS* container, int type, int id) {
     return container != nullptr ? ticket::as<MTICKET_READ>(*container).OpenTicket(type, id)
                                 : nullptr;
@@ -31,7 +31,7 @@ T valueAt(const void* value) {
     return *static_cast<const T*>(value);
 }
 
-/// Nothing is read through a null value: it is a deletion, whatever its type.
+/// Does not dereference a null value: it means a deletion, whatever its type.
 void logValue(clTICKET_UPDATE_LOG& log, PARAM_TYPE type, const void* value) {
     if (type == PARAM_DELETE) {
         log.printf("DEL");
@@ -57,13 +57,13 @@ void logValue(clTICKET_UPDATE_LOG& log, PARAM_TYPE type, const void* value) {
     }
 }
 
-/// Types that a walk shows and a list takes: those that carry values.
+/// True for the types that carry values, which a walk shows and a list stores.
 bool carriesValue(PARAM_TYPE type) {
     return (type >= PARAM_POINTER && type <= PARAM_BINARY) ||
            (type >= PARAM_INT64 && type <= PARAM_UINT64);
 }
 
-/// Inserts an entry with a work ticket, or gives the one that is there.
+/// Inserts an entry with a work ticket, or returns the existing one.
 TICKET_UPDATE_LIST::ENTRY* insertEntry(std::map<TICKET_TYPE_ID, TICKET_UPDATE_LIST::ENTRY>& entries,
                                        int type, int id) {
     if (!TICKET_UPDATE_LIST::TicketValid(type, id)) {
@@ -207,7 +207,7 @@ bool TICKET_UPDATE_LIST::xSetParameter(int type, int id, const char* key, PARAM_
     const bool isNew = entry->changedKeys.insert(key).second;
     m_empty = false;
 
-    // A single element changes: the others of the server's key have to be there around it.
+    // Changing a single element requires the server's other elements of the key around it.
     if (position != POSITION_WHOLE && isNew && m_container != nullptr && TICKET_Valid(type, id)) {
         const char* const keys[] = {key, nullptr};
         view(entry->ticket).Merge(openTicket(m_container, type, id), keys);
@@ -253,7 +253,7 @@ void TICKET_UPDATE_LIST::KeepDeleted(const ENTRY& kept, int type, int id, const 
         break;
     }
     if (value != nullptr) {
-        // Appended, deleted elements line up in the order of their deletion.
+        // Appended, so that deleted elements are in the order of their deletion.
         view(kept.ticket)
             .xSetParameter(key, ptype, value,
                            position == POSITION_WHOLE ? POSITION_WHOLE : POSITION_APPEND);
@@ -314,7 +314,7 @@ int TICKET_UPDATE_LIST::xGetParameter(int type, int id, const char* key, PARAM_T
 }
 
 void TICKET_UPDATE_LIST::ConvertHandedOut(const char*& text) {
-    LocaleSettings::GetMacSystemEncoding(); // Nothing looks at the result (C139).
+    LocaleSettings::GetMacSystemEncoding(); // The result is not used (C139).
     std::string converted;
     if (CharSetsWx::Io2Controls(CharSetsWx::Context, converted, text) == 1) {
         const wxCriticalSectionLocker lock(m_cacheLock);
@@ -459,7 +459,7 @@ bool TICKET_UPDATE_LIST::Clear(int type, int id) {
     if (!EraseDeletedMap(type, id)) {
         return false;
     }
-    // It follows the kept values alone, be there changes of other tickets or not (C137).
+    // Only the deleted values count here, not the changes of other tickets (C137).
     m_empty = m_toDelete.empty();
     return true;
 }

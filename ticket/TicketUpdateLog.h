@@ -2,9 +2,9 @@
 // The diagnostic sink of a ticket update list.
 #pragma once
 
-/// Takes the texts that tell what a list and its flush do, one line for each event. As built here
-/// it keeps nothing and writes nothing (C141); arguments are evaluated all the same. It stands in a
-/// source file of its own so that a program can be linked with a sink that listens.
+/// Receives one line for each event of a list and its flush. This version stores and writes nothing
+/// (C141), but arguments are still evaluated. It has a source file of its own so that a program can
+/// be linked with a sink that writes.
 class clTICKET_UPDATE_LOG {
   public:
     explicit clTICKET_UPDATE_LOG(const char* name);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Views on one ticket's record, which add what the plug-in does not offer: strings, vectors,
+// Views of one ticket's record, which add what the plug-in does not offer: strings, vectors,
 // arrays, booleans and file names.
 #pragma once
 
@@ -8,49 +8,49 @@
 
 #include "ticket/TicketFamilies.h"
 
-/// Reading. The view is the plug-in's record itself, at the same address (ticket::as), and has no
-/// data. A false is all there is of a failure. Positions: POSITION_WHOLE or an element.
+/// Read access. The view has no data: it is the plug-in's record, at the same address (ticket::as).
+/// A failure returns false without a reason. Positions are POSITION_WHOLE or an element.
 class STICKET_READ : public STICKET_ACCESS {
   public:
     bool ParameterExists(const char* key, int position) const;
 
-    /// On false `out` is empty.
+    /// Empties `out` on failure.
     bool GetParameter(const char* key, std::string& out, int position) const;
-    /// On false `out` is as it was.
+    /// Leaves `out` unchanged on failure.
     bool GetParameter(const char* key, int& out, int position) const;
 
     int GetIntParameter(const char* key, int fallback) const;
     std::string GetStringParameter(const char* key, const std::string& fallback) const;
 
-    /// A file name, with forward slashes; empty on false.
+    /// A file name, with forward slashes. Empties `out` on failure.
     bool GetFilenameParameterChk_C(const char* key, std::string& out, int position) const;
 
-    /// The first element that equals the value, or -1. Elements are tried from 0 up to the first
-    /// that can't be read. V is int or std::string.
+    /// Position of the first element that equals the value, or -1. Stops at the first element that
+    /// can't be read. V is int or std::string.
     template<class V>
     int FindParameterPosition(const char* key, const V& value) const;
 
     /// T is void*, int, unsigned int, long long, unsigned long long, double, const char*, bool or
-    /// std::string; ticket/TicketFamilies.h tells what becomes of holes and failures.
+    /// std::string. ticket/TicketFamilies.h describes holes and failures.
     template<class T>
     bool GetVectorParameter(const char* key, std::vector<T>& out) const {
         return ticket::readVector(ticket::Single(*this), key, out);
     }
 
-    /// File names, with forward slashes; empty on false.
+    /// File names, with forward slashes. Empties `out` on failure.
     bool GetFilenameVectorParameter_C(const char* key, std::vector<std::string>& out) const;
 
-    /// T as for vectors, without std::string.
+    /// T as for vectors, except std::string.
     template<class T>
     bool GetArrayParameter(const char* key, T* out, unsigned long count) const {
         return ticket::readArray(ticket::Single(*this), key, out, count);
     }
 
-    /// Asks the plug-in to fill the record; null, -1, -1 where it refuses.
+    /// Asks the plug-in to fill the record. If it refuses, the record becomes null, -1, -1.
     bool WhoAmI(STICKET_OPTION_WHOAMI& out) const;
 };
 
-/// Changing. Const, since the change is made behind the plug-in.
+/// Write access. The functions are const because the plug-in makes the change.
 class STICKET_MODIFY : public STICKET_READ {
   public:
     /// Stores the pointer itself.
@@ -59,10 +59,10 @@ class STICKET_MODIFY : public STICKET_READ {
     bool xSetParameter(const char* key, PARAM_TYPE type, const void* value, int position) const;
     bool DelParameter(const char* key, int position) const;
 
-    /// True when the plug-in took the table; each record tells what became of it.
+    /// True if the plug-in accepted the table. Each record contains its own result.
     bool SetMultiParameter(SETMULTIPAR* table) const;
 
-    /// Replaces the key; no elements delete it. T as for GetVectorParameter.
+    /// Replaces the key. An empty vector deletes it. T as for GetVectorParameter.
     template<class T>
     bool SetVectorParameter(const char* key, const std::vector<T>& values) const {
         return ticket::writeVector(ticket::Single(*this), key, values);
@@ -70,14 +70,14 @@ class STICKET_MODIFY : public STICKET_READ {
 
     bool SetFilenameVectorParameter(const char* key, const std::vector<std::string>& names) const;
 
-    /// Replaces the key; no elements delete it, but for bool, where they leave it alone.
+    /// Replaces the key. An empty array deletes it, except for bool, which leaves it unchanged.
     template<class T>
     bool SetArrayParameter(const char* key, const T* values, unsigned long count) const {
         return ticket::writeArray(ticket::Single(*this), key, values, count);
     }
 
-    /// This ticket's content becomes the source's: of the listed keys, or of all for null.
+    /// Replaces this ticket's content by the source's listed keys, or by all for null.
     bool Assign(const STICKET_ACCESS* source, const char* const* keys) const;
-    /// The source's keys take their places in this ticket.
+    /// Copies the source's keys over those of this ticket.
     bool Merge(const STICKET_ACCESS* source, const char* const* keys) const;
 };

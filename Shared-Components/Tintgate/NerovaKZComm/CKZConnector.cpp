@@ -23,7 +23,7 @@ namespace {
 constexpr int serverPort = 50005;
 constexpr int oldestServer = 5;
 
-// UTF-8, but byte for byte where a path is none.
+// UTF-8. A path that is not valid text keeps its bytes.
 std::string pathBytes(const wxString& path) {
     return base::bytesFromWide(path.ToStdWstring());
 }
@@ -66,7 +66,7 @@ bool isToBeVerified(const JobStatus& job, bool remeasure) {
                      : (isWaiting || job.showInVerifier == 1) && suitable;
 }
 
-// Null where the number is beyond what a type can have or memory is short.
+// Null if the number exceeds what a type can have or if memory runs out.
 ticket::Block<int> roomForIds(int number) {
     const std::size_t bytes = static_cast<std::size_t>(number) * sizeof(int);
     const bool possible = static_cast<unsigned long>(number) <= ticket::maxElements;
@@ -93,12 +93,12 @@ CKZConnector::~CKZConnector() {
         m_manager->Logout();
         m_manager->Uninitialize();
     } catch (...) {
-        // What a plug-in throws at the end concerns nobody any more.
+        // A plug-in's exception during logout has no further consequence.
     }
     m_loggedIn = false;
 }
 
-// The code of the step that ended the login.
+// Returns the code of the last step of the login.
 int CKZConnector::LogIn(int applicationID) {
     const std::string user = StringUtilsComGUI::stringFromwstring(m_userName);
     const std::string password = StringUtilsComGUI::stringFromwstring(m_password);
@@ -166,7 +166,7 @@ int CKZConnector::GetJobTicketKeyValue(int type, int id, const char* key, PARAM_
     if (Read(type, id, key, ptype, out, position) == 1) {
         return 0;
     }
-    // An int's default is the pointer itself, a double's is what it points to (C112).
+    // An int's default is the pointer's own value; a double's is the value it points to (C112).
     if (ptype == PARAM_INT) {
         *static_cast<int*>(out) = static_cast<int>(reinterpret_cast<std::intptr_t>(fallback));
     } else if (ptype == PARAM_DOUBLE && fallback != nullptr) {
@@ -227,12 +227,12 @@ int CKZConnector::GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure)
     *ids = selected.release();
     size = number * static_cast<int>(sizeof(int));
     if (m_manager->GetTicketData(jobkeys::jobType, idsKind, 0, &size, all.get()) != 0) {
-        return -1; // *ids stays with the caller (C115).
+        return -1; // The caller keeps *ids (C115).
     }
-    // Jobs may have gone since they were counted.
+    // Jobs may have been deleted since they were counted.
     number = std::clamp(size / static_cast<int>(sizeof(int)), 0, number);
 
-    JobStatus status; // A job that lacks a value is judged by the one before it (C114).
+    JobStatus status; // A missing value keeps that of the previous job (C114).
     for (int i = 0; i < number; ++i) {
         GetJobStatus(all[i], &status.displayStatus, &status.subType, &status.fileType,
                      &status.showInVerifier, &status.verifyActive);
@@ -254,7 +254,7 @@ bool CKZConnector::DownloadFile(wxString localPath, wxString serverPath, int lim
     }
     const std::string local = pathBytes(localPath);
     if (!isRemovedOrMissing(local)) {
-        return false; // The old file must not be taken for the new one.
+        return false; // The old file must not be mistaken for the new one.
     }
     const int code = m_manager->GetFile(local.c_str(), pathBytes(serverPath).c_str(), false);
     int waited = 0;

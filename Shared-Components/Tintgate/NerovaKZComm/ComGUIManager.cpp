@@ -93,7 +93,7 @@ bool ComGUIManager::FindInterface() {
         return true;
     }
     __CFBundle* plugIn = nullptr;
-    RegisterPlugIn(&plugIn); // What it failed at, it has said.
+    RegisterPlugIn(&plugIn); // It has reported its own failure.
     return CreateComGUIModuleInterface(plugIn, &m_interface) == 0;
 }
 
@@ -107,7 +107,7 @@ void ComGUIManager::RefuseFromNowOn() {
 std::wstring ComGUIManager::PlugInPath() {
     std::wstring suite = Helper::GetHWBInstallationPath().ToStdWstring();
     if (suite.empty()) {
-        suite = base::wideFromBytes(platform::systemRoot()); // What follows is a fixed path then.
+        suite = base::wideFromBytes(platform::systemRoot()); // The path below is then fixed.
     }
     return suite + static_cast<wchar_t>(wxFileName::GetPathSeparator()) + L"lib/" + pszLibName;
 }
@@ -159,7 +159,7 @@ int ComGUIManager::CreateComGUIModuleInterface(__CFBundle* plugIn,
 
 int ComGUIManager::Initialize(const char* user, const char* password, const char* server, int port,
                               int applicationID) {
-    static std::int32_t localPort = firstLocalPort; // Of the process (C96).
+    static std::int32_t localPort = firstLocalPort; // Per process (C96).
     m_record->clientLevelCompanion = 1;
     m_record->clientLevel = applicationID == jobkeys::verifierApplication ? 7 : 5;
     m_record->reservedFlag = 0;
@@ -257,7 +257,7 @@ int ComGUIManager::SetCallback(void* user) {
         m_notificationID =
             ticket::as<STICKET_READ>(*work).GetIntParameter("iGUINotificationID", -1);
     }
-    // Whatever became of the command (C100), so with a former id or -1 too.
+    // Done even if the command failed (C100), with the previous id or -1.
     if (m_container != nullptr) {
         m_container->DisableNotification(jobs, TICKET_ID_ALL, m_notificationID);
         m_container->EnableNotification(jobs, TICKET_ID_NEW, m_notificationID, jobKeys);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tickets, commands and files: the working surface of the manager.
+// Ticket, command and file operations of the manager.
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
 
 #include <algorithm>
@@ -24,7 +24,7 @@ int codeOf(bool found) {
     return found ? 1 : 0;
 }
 
-// wx takes surrogates and what is above U+10FFFF for UTF-8 as well.
+// wx would also accept surrogates and code points above U+10FFFF.
 bool isUtf8(const std::string& text) {
     return platform::Owned<CFStringRef>(CFStringCreateWithCString(
                kCFAllocatorDefault, text.c_str(), kCFStringEncodingUTF8)) != nullptr;
@@ -34,7 +34,7 @@ wxString fromUtf8(const std::string& text) {
     return isUtf8(text) ? wxString(text.c_str(), wxConvUTF8) : wxString();
 }
 
-// Two more decodings are tried where UTF-8 gives nothing, and UTF-8 is what counts in the end
+// If UTF-8 gives nothing, two more decodings are tried, but the UTF-8 result is returned anyway
 // (C103): text that is not UTF-8 comes back empty.
 wxString decoded(const std::string& text) {
     wxString result = fromUtf8(text);
@@ -49,7 +49,7 @@ wxString decoded(const std::string& text) {
     return result;
 }
 
-// Enters a key's deletion and then its new elements. False if one was refused.
+// Adds a deletion of the key, then its new elements. False if a record was refused.
 bool enterArray(void* list, const char* key, PARAM_TYPE ptype, int count, void* values) {
     bool done = MultiParListSetParameter(list, key, PARAM_DELETE, nullptr, POSITION_WHOLE);
     if (ptype == PARAM_INT || ptype == PARAM_DOUBLE) {
@@ -213,7 +213,7 @@ int ComGUIManager::Delete_all_Tickets(const MTICKET_ADMIN* container, int type) 
     if (container == nullptr) {
         return 0;
     }
-    // A container is not changed while it is walked.
+    // Collect ids first: a container must not change during a walk.
     std::vector<int> ids;
     container->WalkTickets(WalkGetTicketIds, &ids, type);
     for (const int id : ids) {
@@ -250,7 +250,7 @@ int ComGUIManager::SetTicketData(int type, int kind, int index, int* size, void*
     if (kind == 10 || kind == 11) {
         constexpr int scratchSize = 12040;
         const int given = size == nullptr ? 0 : *size;
-        const int length = std::max(given, scratchSize); // The plug-in may read as much as given.
+        const int length = std::max(given, scratchSize); // The plug-in may read `given` bytes.
         scratch.reset(static_cast<char*>(std::calloc(static_cast<std::size_t>(length), 1)));
         if (scratch == nullptr) {
             return -1;

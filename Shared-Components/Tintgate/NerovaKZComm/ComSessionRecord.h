@@ -1,23 +1,23 @@
 // SPDX-License-Identifier: Apache-2.0
-// The record that a session's client and its comm plug-in share. Size and offsets are a contract
+// The record shared by a session's client and its comm plug-in. Size and offsets are a contract
 // with plug-ins that were built without this header (C95).
 #pragma once
 
 #include <cstddef>
 #include <cstdint>
 
-/// Made zero-filled by the client. What is not named belongs to the plug-in.
+/// Created zero-filled by the client. Members without a name belong to the plug-in.
 struct ComSessionRecord {
     std::uint32_t size = sizeof(ComSessionRecord);
-    char user[128] = {};     ///< At most 127 bytes, ended by NUL, as all texts here.
-    char password[128] = {}; ///< As given; not hashed.
+    char user[128] = {};     ///< At most 127 bytes and a NUL, like all texts here.
+    char password[128] = {}; ///< Not hashed.
     std::uint8_t unnamed1[128] = {};
     std::int32_t localPort = 0;
     std::uint8_t unnamed2[128] = {};
     char server[128] = {}; ///< Host name or address.
     std::int32_t serverPort = 0;
     std::uint8_t unnamed3[132] = {};
-    std::uint64_t session = 0; ///< Handle; written by the plug-in alone.
+    std::uint64_t session = 0; ///< Handle; only the plug-in writes it.
     std::int32_t applicationID = 0;
     std::uint8_t unnamed4[32] = {};
     std::int32_t clientLevel = 0;

@@ -3,6 +3,6 @@
 
 #include <string>
 
-/// The MD5 digest (RFC 1321) of exactly the text's bytes, as 32 upper-case hexadecimal digits.
-/// Nothing in the login uses it (C170): passwords reach the plug-in as they are.
+/// The MD5 digest (RFC 1321) of exactly the text's bytes, as 32 upper-case hexadecimal digits. The
+/// login does not use it (C170): passwords reach the plug-in unchanged.
 std::string EncodeUsingMD5(std::string text);

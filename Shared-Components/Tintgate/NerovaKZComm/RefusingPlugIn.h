@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// What stands in for the plug-in where it could not be loaded.
+// Replaces the plug-in if it could not be loaded.
 #pragma once
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
 
-/// Initialize and Uninitialize succeed and no server ever answers, so that a login ends as with a
-/// server that can't be reached. There are no tickets; everything else fails.
+/// Initialize and Uninitialize succeed, but no server answers, so a login fails as with an
+/// unreachable server. There are no tickets, and everything else fails.
 extern ComGUIModuleInterface refusingPlugIn;

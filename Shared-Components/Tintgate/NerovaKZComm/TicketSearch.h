@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Walks over the tickets of a container. Each function below is a TicketWalk and takes what its
-// comment says as context.
+// Callbacks for walks over the tickets of a container. Each function below is a TicketWalk; its
+// comment names the context that it expects.
 #pragma once
 
 #include <string>
@@ -8,28 +8,28 @@
 
 #include "ticket/TicketRecords.h"
 
-/// The search for the first ticket that has a text.
+/// Search for the first ticket with a text.
 struct stSearchKey {
     std::string key;
     std::string value;
-    int ticketID = -1; ///< Of the ticket that was found.
+    int ticketID = -1; ///< The ticket found.
 };
 
-/// The search for all tickets that have a value.
+/// Search for all tickets with a value.
 struct stSearchTickets {
-    std::vector<int> ids; ///< Of the tickets that were found, as they were walked.
+    std::vector<int> ids; ///< The tickets found, in walk order.
     std::string key;
     const void* value = nullptr; ///< An int or a NUL-terminated text.
-    PARAM_TYPE type = PARAM_INT; ///< PARAM_INT or PARAM_STRING; nothing matches another type.
-    bool inArray = false;        ///< Look among the elements, not at the single value.
+    PARAM_TYPE type = PARAM_INT; ///< PARAM_INT or PARAM_STRING; other types match nothing.
+    bool inArray = false;        ///< Compare the elements, not the single value.
 };
 
-/// Appends each ticket's id to a std::vector<int>.
+/// Context: a std::vector<int>, to which each ticket's id is appended.
 bool WalkGetTicketIds(void* context, int type, int id, const STICKET_ACCESS* ticket);
 
-/// Of an stSearchKey. Ends the walk at the first match.
+/// Context: an stSearchKey. Ends the walk at the first match.
 bool WalkSearchTicket(void* context, int type, int id, const STICKET_ACCESS* ticket);
 
-/// Of an stSearchTickets. Only integers are looked for in every ticket: for a text the walk ends
-/// after the first ticket, whether it matched or not (C106).
+/// Context: an stSearchTickets. For a text, the walk ends after the first ticket even without a
+/// match; only integers are compared in every ticket (C106).
 bool WalkSearchTickets(void* context, int type, int id, const STICKET_ACCESS* ticket);
