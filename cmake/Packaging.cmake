@@ -70,10 +70,15 @@ install(TARGETS TintgateJob LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}/tintgat
 install(DIRECTORY presets/ DESTINATION "${_share}/presets" COMPONENT tintgate)
 install(FILES "${_made}/Tintgate.1.gz" DESTINATION "${CMAKE_INSTALL_MANDIR}/man1"
   COMPONENT tintgate)
-install(FILES README.md "${_made}/exit-codes.md" DESTINATION "${_doc}/tintgate"
+# Installed, README.md is in one folder with the pages that it links to.
+file(READ README.md _readme)
+string(REPLACE "](docs/" "](" _readme "${_readme}")
+file(GENERATE OUTPUT "${_made}/README.md" CONTENT "${_readme}")
+set_property(DIRECTORY APPEND PROPERTY CMAKE_CONFIGURE_DEPENDS README.md)
+install(FILES "${_made}/README.md" "${_made}/exit-codes.md" DESTINATION "${_doc}/tintgate"
   COMPONENT tintgate)
 install(DIRECTORY docs/ DESTINATION "${_doc}/tintgate" COMPONENT tintgate
-  FILES_MATCHING PATTERN "*.md" PATTERN "*.json")
+  FILES_MATCHING PATTERN "*.md" PATTERN "*.json" PATTERN "*.csv")
 install(FILES docs/Tintgate.completion RENAME Tintgate
   DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions" COMPONENT tintgate)
 

@@ -129,8 +129,8 @@ def table(rows):
     parts = ("code", "from", "meaning", "cause", "remedy")
     return (
         "# Exit codes\n\n"
-        "Of the tool itself, of a job on the print server, and of the analysis library. "
-        "What a client does with those of a job is in jobs.md.\n\n"
+        "These are the exit codes of the tool, of jobs on a print server, and of the analysis "
+        "library. jobs.md describes what a client does with those of a job.\n\n"
         + markdown((*parts, "cause in a job"),
                    [[stars(row[part]) for part in parts] + [stars(own_job_cause(row) or "")]
                     for row in rows])
@@ -139,9 +139,9 @@ def table(rows):
 
 def outcomes(rows):
     return markdown(
-        ("Code", "Meaning", "Cause in a job", "Who acts", "Retry"),
-        [[row["code"], *(stars(text) for text in (row["meaning"], row["job"]["job_cause"])),
-          row["job"]["who"], row["job"]["retry"]] for row in rows if row["job"]],
+        ("Code", "Meaning", "Who acts", "Retry"),
+        [[row["code"], stars(row["meaning"]), row["job"]["who"], row["job"]["retry"]]
+         for row in rows if row["job"]],
     )
 
 

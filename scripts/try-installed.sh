@@ -53,4 +53,4 @@ code=0
 [ "$code" -eq 1 ]
 words=$("$place/compare" "$sets/FOGRA39L.ti3" "$place/none" \
   "$prefix/share/tintgate/presets/CVP_0002.xml" 2>&1) || true
-grep "An input file is not there" <<<"$words"
+grep "An input file is missing" <<<"$words"
