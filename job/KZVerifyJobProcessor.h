@@ -13,10 +13,9 @@ class CKZConnector;
 
 /// One object per process: it makes one pass, and its working folder is found only once.
 ///
-/// The sources follow the steps of that pass: login (this name), Verification, LoadJob, and
-/// StripSources, and below measure/ StoredData, SampleFile, DefinitionFile, MeasuringTool; then
-/// MeasureJob, WriteBack, JobStatus. Integer results are 0 or a code of docs/exit-codes.csv,
-/// where nothing else is said.
+/// The sources follow the steps of that pass: login (this name), Verification, LoadJob with
+/// StripSources, StoredData, MeasureJob, WriteBack, JobStatus. Integer results are 0 or a code of
+/// docs/exit-codes.csv, unless stated otherwise.
 ///
 /// REQUIRES for all that reads or writes tickets or files of the server: m_connector is not null.
 class KZVerifyJobProcessor {

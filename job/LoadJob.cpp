@@ -21,7 +21,7 @@
 #include "jobkeys/Lookups.h"
 #include "jobkeys/StripKeys.h"
 #include "jobkeys/Tickets.h"
-#include "measure/StripLines.h"
+#include "measure/Paths.h"
 #include "ticket/ParameterTables.h"
 
 using namespace jobkeys;

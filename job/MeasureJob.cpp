@@ -1,68 +1,26 @@
 // SPDX-License-Identifier: Apache-2.0
-// The two steps that only a job to be measured takes: measuring it, and handing its result back.
-#include <cstdlib>
-#include <utility>
-
-#include "ExitCodes.h"
-#include "cli/CLogger.h"
-#include "job/FileExists.h"
+// Measuring a job: the members that hand its record to the measuring tool and to the writers of its
+// text files.
 #include "job/KZVerifyJobProcessor.h"
+#include "measure/DefinitionFile.h"
+#include "measure/MeasuringTool.h"
+#include "measure/SampleFile.h"
+#include "measure/StripLines.h"
 
-namespace {
-
-template<class T>
-void freeArray(T*& values) {
-    std::free(std::exchange(values, nullptr));
+int KZVerifyJobProcessor::GetDeviceIDFromIt8ControlStripFileEx(wxString path, int* deviceID) {
+    return measure::readDeviceID(path, deviceID);
 }
 
-} // namespace
-
-// A missing reference file ends this road, though not that of stored measurements. If both files
-// are missing the measurement's code stands (C19).
-int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord* results,
-                                     std::wstring* json) {
-    CLogger::GetLogger()->Log("Veryfing existing measurement job");
-    const int launched = ConfigureAndLaunchNerovaMeasure(job);
-    CLogger::GetLogger()->Log("ConfigureAndLaunchNerovaMeasure returns = %d", launched);
-    if (launched != 0) {
-        return exitMeasuringFailed; // For every failure (C20).
-    }
-    int result = exitDone;
-    if (!isThere(job->referenceFile, "Reference")) {
-        result = exitReferenceMissing;
-    }
-    if (!isThere(job->sampleFile, "Measurement")) {
-        result = exitSampleMissing;
-    }
-    return result == exitDone ? AnalyzeJob(job, results, json) : result;
+int KZVerifyJobProcessor::WriteTemporarySampleFile(KZJobDataStruct job, bool reference) {
+    return measure::writeSampleFile(reference ? job.referenceFile : job.sampleFile,
+                                    job.illuminationMode, job.measurement);
 }
 
-// A nested job is among its parent's jobs, as long as it is open, and the parent comes last
-// (C23). Which of the writes succeed does not matter to the run (C24).
-void KZVerifyJobProcessor::WriteBackResults(int jobID, const KZJobDataStruct& job,
-                                            const analyseResultsRecord& results, bool remeasure) {
-    const auto writeTo = [&](int id) {
-        CopyResulDataToJobTicket(id, job, results, remeasure);
-        SetJobStatus(id, results.overallPassed);
-    };
-    if (job.childJobIDs != nullptr && job.parentID > 0) {
-        CLogger::GetLogger()->Log("Copying resulting data to child jobs and parent");
-        for (int i = 0; i < job.childJobCount; ++i) {
-            writeTo(job.childJobIDs[i]);
-        }
-        writeTo(job.parentID);
-    } else {
-        CLogger::GetLogger()->Log("Copying resulting data to job ticket");
-        writeTo(jobID);
-    }
-    FreeMeasurementData(job);
+wxString KZVerifyJobProcessor::WriteTemporaryMeasurementDefinitionFile(wxString path,
+                                                                       KZJobDataStruct* job) {
+    return measure::writeDefinition(path, *job);
 }
 
-void KZVerifyJobProcessor::FreeMeasurementData(KZJobDataStruct job) {
-    measurementDataRecord& measurement = job.measurement;
-    freeArray(measurement.spectral);
-    freeArray(measurement.xyz);
-    freeArray(measurement.lab);
-    freeArray(measurement.cmyk);
-    freeArray(measurement.reservedValues);
+int KZVerifyJobProcessor::ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job) {
+    return measure::measureStrip(*job);
 }

@@ -7,10 +7,9 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "cli/CLogger.h"
-#include "job/FileExists.h"
 #include "jobkeys/Lookups.h"
 #include "jobkeys/ServerPaths.h"
-#include "measure/StripLines.h"
+#include "measure/Paths.h"
 
 using namespace jobkeys;
 
@@ -140,7 +139,7 @@ int takeStoredReferences(const JobLoad& load) {
         return ReferencesNotLoaded;
     }
     if (load.processor->WriteTemporarySampleFile(job, true) != 0 ||
-        !fileExists(job.referenceFile)) {
+        !measure::fileExists(job.referenceFile)) {
         // The line names the other file (C36).
         CLogger::GetLogger()->Log("Temporary Reference file not found = %s",
                                   measure::pathBytes(job.sampleFile).c_str());

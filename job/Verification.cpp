@@ -11,12 +11,11 @@
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
 #include "base/TextFile.h"
 #include "cli/CLogger.h"
-#include "job/FileExists.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "jobkeys/StripKeys.h"
 #include "jobkeys/Tickets.h"
 #include "measure/Helper.h"
-#include "measure/StripLines.h"
+#include "measure/Paths.h"
 #include "ticket/ParameterTables.h"
 
 namespace {
@@ -54,11 +53,21 @@ std::chrono::milliseconds pauseAfter(steady_clock::duration login) {
 /// Writes a file for the viewer, logging where that fails.
 bool writeForViewer(const wxString& path, const std::wstring& text, const char* complaint) {
     const std::string bytes = measure::pathBytes(path);
-    const bool written = base::writeTextInPlace(bytes, text) && fileExists(path);
+    const bool written = base::writeTextInPlace(bytes, text) && measure::fileExists(path);
     if (!written) {
         CLogger::GetLogger()->Log("Resulting %s file not found = %s", complaint, bytes.c_str());
     }
     return written;
+}
+
+/// Whether there is a regular file of this name. If not, the log gets a line about it.
+bool isThere(const wxString& path, const char* complaint) {
+    const bool found = measure::fileExists(path);
+    if (!found) {
+        CLogger::GetLogger()->Log("%s file not found = %s", complaint,
+                                  measure::pathBytes(path).c_str());
+    }
+    return found;
 }
 
 /// The viewer is ended first where one runs (C18).
@@ -200,6 +209,26 @@ int KZVerifyJobProcessor::CompareStoredData(KZJobDataStruct* job, std::wstring* 
     }
     return isThere(job->sampleFile, "Measurement") ? AnalyzeJob(job, nullptr, json)
                                                    : exitSampleMissing;
+}
+
+// A missing reference file ends this road, though not that of stored measurements. If both files
+// are missing the measurement's code stands (C19).
+int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord* results,
+                                     std::wstring* json) {
+    CLogger::GetLogger()->Log("Veryfing existing measurement job");
+    const int launched = ConfigureAndLaunchNerovaMeasure(job);
+    CLogger::GetLogger()->Log("ConfigureAndLaunchNerovaMeasure returns = %d", launched);
+    if (launched != 0) {
+        return exitMeasuringFailed; // For every failure (C20).
+    }
+    int result = exitDone;
+    if (!isThere(job->referenceFile, "Reference")) {
+        result = exitReferenceMissing;
+    }
+    if (!isThere(job->sampleFile, "Measurement")) {
+        result = exitSampleMissing;
+    }
+    return result == exitDone ? AnalyzeJob(job, results, json) : result;
 }
 
 int KZVerifyJobProcessor::AnalyzeJob(KZJobDataStruct* job, analyseResultsRecord* results,

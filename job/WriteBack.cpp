@@ -16,6 +16,7 @@
 
 #include <wx/datetime.h>
 
+#include "cli/CLogger.h"
 #include "jdf/JdfHandler.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
@@ -244,6 +245,27 @@ int KZVerifyJobProcessor::CopyResulDataToJobTicket(int jobID, KZJobDataStruct jo
     writeVerdicts(ticket, "Approval", isPsd, bytesOf(results.approvals));
     writeVerdicts(ticket, "Decimal", isPsd, bytesOf(results.decimals));
     return result;
+}
+
+// A nested job is among its parent's jobs, as long as it is open, and the parent comes last
+// (C23). Which of the writes succeed does not matter to the run (C24).
+void KZVerifyJobProcessor::WriteBackResults(int jobID, const KZJobDataStruct& job,
+                                            const analyseResultsRecord& results, bool remeasure) {
+    const auto writeTo = [&](int id) {
+        CopyResulDataToJobTicket(id, job, results, remeasure);
+        SetJobStatus(id, results.overallPassed);
+    };
+    if (job.childJobIDs != nullptr && job.parentID > 0) {
+        CLogger::GetLogger()->Log("Copying resulting data to child jobs and parent");
+        for (int i = 0; i < job.childJobCount; ++i) {
+            writeTo(job.childJobIDs[i]);
+        }
+        writeTo(job.parentID);
+    } else {
+        CLogger::GetLogger()->Log("Copying resulting data to job ticket");
+        writeTo(jobID);
+    }
+    FreeMeasurementData(job);
 }
 
 int KZVerifyJobProcessor::WrietErrorToJobTicket(int errorCode, int jobID) {

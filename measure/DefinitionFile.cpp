@@ -26,6 +26,8 @@
 //     1 0 0 0 100 16 0 0 2.1 2.2 1.8
 //     ...
 //     END_DATA
+#include "measure/DefinitionFile.h"
+
 #include <algorithm>
 #include <fstream>
 #include <initializer_list>
@@ -34,7 +36,8 @@
 
 #include <unistd.h>
 
-#include "job/KZVerifyJobProcessor.h"
+#include "job/JobRecords.h"
+#include "measure/Paths.h"
 #include "measure/StripLines.h"
 #include "measure/StripText.h"
 
@@ -268,15 +271,14 @@ void write(const wxString& path, const std::string& text) {
 } // namespace
 
 // The strip is read whole before anything is removed: it may bear the definition's name itself.
-wxString KZVerifyJobProcessor::WriteTemporaryMeasurementDefinitionFile(wxString path,
-                                                                       KZJobDataStruct* job) {
-    measure::StripText strip;
+wxString measure::writeDefinition(const wxString& path, const KZJobDataStruct& job) {
+    StripText strip;
     if (!strip.read(path)) {
         return {};
     }
-    const wxString output = measure::pathBeside(path, measure::definitionName);
+    const wxString output = pathBeside(path, definitionName);
     {
-        Definition definition(strip, *job);
+        Definition definition(strip, job);
         const bool isWhole = definition.build();
         write(output, definition.text());
         if (!isWhole) {
@@ -285,7 +287,7 @@ wxString KZVerifyJobProcessor::WriteTemporaryMeasurementDefinitionFile(wxString 
     }
     wxString line;
     if (strip.find("File_Format=BARBIERI", &line) || strip.find("iSis_INFO", &line)) {
-        write(measure::pathBeside(path, "NMPatchSetDefinition.dcf"), headOf(strip));
+        write(pathBeside(path, "NMPatchSetDefinition.dcf"), headOf(strip));
     }
     return output;
 }

@@ -11,10 +11,11 @@
 
 #include <wx/filename.h>
 
-#include "job/KZVerifyJobProcessor.h"
+#include "job/JobRecords.h"
+#include "measure/DefinitionFile.h"
 #include "measure/Helper.h"
 #include "measure/NerovaMeasureParams.h"
-#include "measure/StripLines.h"
+#include "measure/Paths.h"
 
 namespace {
 
@@ -100,20 +101,20 @@ int GetLanguageID(KZJobDataStruct* job) {
     return anyLanguage;
 }
 
-int KZVerifyJobProcessor::ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job) {
-    const wxString& controlStrip = job->controlStripFile;
+int measure::measureStrip(KZJobDataStruct& job) {
+    const wxString& controlStrip = job.controlStripFile;
     if (controlStrip.empty()) {
         return NoControlStrip;
     }
     const ReplacedStrip replacedStrip(controlStrip);
-    const wxString definition = WriteTemporaryMeasurementDefinitionFile(controlStrip, job);
+    const wxString definition = writeDefinition(controlStrip, job);
     if (definition.empty()) {
         return NoDefinition;
     }
-    removeFile(job->sampleFile); // An old one is not to be taken for a new one.
+    removeFile(job.sampleFile); // An old one is not to be taken for a new one.
     NerovaMeasureParams params;
     params.apnm = "Nerova Verify";
-    params.l = wxString::Format("%d", GetLanguageID(job));
+    params.l = wxString::Format("%d", GetLanguageID(&job));
     params.createchart4meas = "False";
     params.patchname = wxFileName(controlStrip).GetFullName();
     params.patch = definition;
@@ -122,7 +123,7 @@ int KZVerifyJobProcessor::ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job) 
     }
     params.i = instrumentOf(definition);
     params.m = "measure";
-    params.o = job->sampleFile;
+    params.o = job.sampleFile;
     params.forcemeasure = "True";
     const Outcome outcome = launch(params);
     if (!replacedStrip) {

@@ -13,6 +13,8 @@
 //     BEGIN_DATA
 //     1 0 0 0 100 16.25 0.25 -0.5
 //     END_DATA
+#include "measure/SampleFile.h"
+
 #include <array>
 #include <charconv>
 #include <cstdint>
@@ -21,8 +23,9 @@
 #include <string>
 #include <string_view>
 
-#include "job/KZVerifyJobProcessor.h"
+#include "job/JobRecords.h"
 #include "measure/NumberText.h"
+#include "measure/Paths.h"
 
 namespace {
 
@@ -115,10 +118,9 @@ void writeRows(const measurementDataRecord& measurement, std::ofstream& file) {
 
 } // namespace
 
-int KZVerifyJobProcessor::WriteTemporarySampleFile(KZJobDataStruct job, bool reference) {
-    const wxString& path = reference ? job.referenceFile : job.sampleFile;
-    std::ofstream file(wstringToString(path.ToStdWstring()));
-    const measurementDataRecord& measurement = job.measurement;
+int measure::writeSampleFile(const wxString& path, int illuminationMode,
+                             const measurementDataRecord& measurement) {
+    std::ofstream file(pathBytes(path));
     if (measurement.cmyk == nullptr) {
         return -1;
     }
@@ -126,7 +128,7 @@ int KZVerifyJobProcessor::WriteTemporarySampleFile(KZJobDataStruct job, bool ref
     file << "CGATS.17\n"
             "KEYWORD ILLUMINATION_CONDITION\n"
             "ILLUMINATION_CONDITION "
-         << std::to_string(job.illuminationMode) << "\nNUMBER_OF_FIELDS "
+         << std::to_string(illuminationMode) << "\nNUMBER_OF_FIELDS "
          << std::to_string(fields.count) << "\nBEGIN_DATA_FORMAT\n"
          << fields.names << "\nEND_DATA_FORMAT\nNUMBER_OF_SETS "
          << std::to_string(measurement.numPatches) << "\nBEGIN_DATA\n";

@@ -3,10 +3,8 @@
 
 #include <algorithm>
 #include <limits>
+#include <string>
 
-#include <wx/filename.h>
-
-#include "job/KZVerifyJobProcessor.h"
 #include "measure/StripText.h"
 
 namespace {
@@ -53,32 +51,22 @@ wxString StringConditioning(wxString line) {
     return wxString::FromUTF8(bytes) + "\r\n";
 }
 
-wxString measure::pathBeside(const wxString& path, const char* name) {
-    wxFileName beside(path);
-    beside.SetFullName(name);
-    return beside.GetFullPath();
-}
-
-std::string measure::pathBytes(const wxString& path) {
-    return wstringToString(path.ToStdWstring());
-}
-
 long measure::numberBehind(const wxString& line, std::size_t offset) {
     long number = 0;
     // A number that is followed by something else is stored all the same.
     return line.Mid(offset).BeforeFirst('\n').ToLong(&number, 10) ? number : 0;
 }
 
-int KZVerifyJobProcessor::GetDeviceIDFromIt8ControlStripFileEx(wxString path, int* deviceID) {
+int measure::readDeviceID(const wxString& strip, int* deviceID) {
     *deviceID = 0;
-    measure::StripText strip;
-    if (!strip.read(path)) {
+    StripText text;
+    if (!text.read(strip)) {
         return noSuchFile;
     }
     wxString line;
     constexpr std::size_t afterKeyword = 6;
-    if (strip.find("DEVICE", &line)) {
-        const long number = measure::numberBehind(line, afterKeyword);
+    if (text.find("DEVICE", &line)) {
+        const long number = numberBehind(line, afterKeyword);
         using Limits = std::numeric_limits<int>;
         *deviceID = number < Limits::min() || number > Limits::max() ? 0 : static_cast<int>(number);
     }

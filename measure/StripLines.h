@@ -1,10 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// Text files of control strips, line by line, as the definition for the measuring tool is made from
-// them.
+// Lines of a control strip's text file, and what they name.
 #pragma once
 
 #include <cstddef>
-#include <string>
 
 #include <wx/string.h>
 #include <wx/textfile.h>
@@ -24,16 +22,12 @@ wxString StringConditioning(wxString line);
 
 namespace measure {
 
-inline constexpr const char* definitionName = "NMPatchSetDefinition.it8";
-
-/// A file of this name in the folder of another one.
-wxString pathBeside(const wxString& path, const char* name);
-
-/// A path as the bytes that the system knows it by.
-std::string pathBytes(const wxString& path);
-
 /// The whole number that a line ends with, behind its first `offset` characters; 0 where that is
 /// anything else.
 long numberBehind(const wxString& line, std::size_t offset);
+
+/// The instrument of a control-strip file; 0 if it names none (C49). Returns 10 if there is no such
+/// file, otherwise 0.
+int readDeviceID(const wxString& strip, int* deviceID);
 
 } // namespace measure

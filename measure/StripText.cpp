@@ -11,8 +11,7 @@
 
 #include <wx/convauto.h>
 
-#include "job/FileExists.h"
-#include "measure/StripLines.h"
+#include "measure/Paths.h"
 
 namespace measure {
 

@@ -187,3 +187,12 @@ int KZVerifyJobProcessor::LoadKZJobReferences(KZJobDataStruct* job) {
     }
     return code;
 }
+
+void KZVerifyJobProcessor::FreeMeasurementData(KZJobDataStruct job) {
+    measurementDataRecord& measurement = job.measurement;
+    freeArray(measurement.spectral);
+    freeArray(measurement.xyz);
+    freeArray(measurement.lab);
+    freeArray(measurement.cmyk);
+    freeArray(measurement.reservedValues);
+}
