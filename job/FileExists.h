@@ -4,9 +4,8 @@
 
 #include <wx/string.h>
 
-/// Whether there is a regular file of this name.
+/// Whether the path is a regular file.
 bool fileExists(const wxString& path);
 
-/// The same, with a line in the log where there is none: the complaint, " file not found = " and
-/// the path.
+/// Same. If there is no such file, logs the complaint, " file not found = " and the path.
 bool isThere(const wxString& path, const char* complaint);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The two steps that only a job to be measured takes: measuring it, and handing its result back.
+// The steps that only jobs to be measured need: measuring, and writing the result back.
 #include <cstdlib>
 #include <utility>
 
@@ -17,8 +17,8 @@ void freeArray(T*& values) {
 
 } // namespace
 
-// A missing reference file ends this road, though not that of stored measurements. If both files
-// are missing the measurement's code stands (C19).
+// A missing reference file ends the run here, unlike with stored measurements. If both files are
+// missing, the code of the measurement is returned (C19).
 int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord* results,
                                      std::wstring* json) {
     CLogger::GetLogger()->Log("Veryfing existing measurement job");
@@ -37,8 +37,8 @@ int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord*
     return result == exitDone ? AnalyzeJob(job, results, json) : result;
 }
 
-// A nested job is among its parent's jobs, as long as it is open, and the parent comes last
-// (C23). Which of the writes succeed does not matter to the run (C24).
+// An open nested job is one of its parent's jobs. The parent comes last (C23). The run ignores
+// which of the writes succeed (C24).
 void KZVerifyJobProcessor::WriteBackResults(int jobID, const KZJobDataStruct& job,
                                             const analyseResultsRecord& results, bool remeasure) {
     const auto writeTo = [&](int id) {
