@@ -245,7 +245,7 @@ TEST(Diagnosis, NamesWhyAJobDoesNotLoad) {
         {"cut preset", 103, {preset, "42, The tolerance preset is not well-formed XML"}, put(preset,
          "<preset")},
         {"misspelt criterion", 103, {preset, "48, "}, replaceIn(preset, "<average ", "<averag ")},
-        {"no number of references", 103, {"Reference/Numpatches", "a profile is looked for"},
+        {"no number of references", 103, {"Reference/Numpatches", "a profile is looked up"},
          set("Remote/Measurement/Reference/Numpatches=-")},
         {"too many references", 103, {"Reference/Numpatches", "is 2000000"},
          set("Remote/Measurement/Reference/Numpatches=2000000")},
@@ -344,7 +344,7 @@ TEST(Diagnosis, NamesWhyAMeasurementFails) {
         {"one name for two files", 106, {"NUMBER_OF_COLS", "example.it8", "same name as", strip},
          all({putFile("/server/IT8_CharacterizationData/example.it8", fogra39),
          set("Workflow/Verify/CharacterizationData='example.it8", 9)}), job9},
-        {"another chart", 30, {"example.it8", "does not go with", "30, "}, put(chart,
+        {"another chart", 30, {"example.it8", "does not match", "30, "}, put(chart,
          "CGATS.17\nNUMBER_OF_FIELDS 8\nBEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M "
          "CMYK_Y CMYK_K LAB_L LAB_A LAB_B\nEND_DATA_FORMAT\nNUMBER_OF_SETS 1\n"
          "BEGIN_DATA\nx 1 2 3 4 50 0 0\nEND_DATA\n"), job9},
