@@ -47,7 +47,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
          made + "11 100 0 0 0 55 -37 -50\n12 39.6 27.4 27 0 60 1 2\n" + whites + end},
         {"ids that are names here",
          labels + "A4 95 0 -3\nA1 55 -37 -50\nA2 60 1 2\nA3 95 0 -2\n" + end},
-        {"two too few", made + two + end, 8, "2 patches where 4"},
+        {"two too few", made + two + end, 8, "2 patches, but 4"},
         {"another patch", made + "1 100 0 0 0 55 -37 -50\n2 40 27 29 0 60 1 2\n" + whites + end, 8,
          "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
         {"another patch among rounded ones",
@@ -57,10 +57,10 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
          8, "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
         {"another patch in another order",
          made + "2 40 27 29 0 60 1 2\n" + whites + "1 100 0 0 0 55 -37 -50\n" + end, 8,
-         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not asked for"},
+         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not requested"},
         {"another patch among rounded ones in another order",
          made + "2 40 27 29 0 60 1 2\n" + whites + "1 99.7 0 0 0 55 -37 -50\n" + end, 8,
-         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not asked for"},
+         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not requested"},
         {"rounded and in another order",
          made + "2 40.4 27 27 0 60 1 2\n" + whites + "1 100 0 0 0 55 -37 -50\n" + end, 8,
          "in another order and their device values are rounded"},
@@ -71,8 +71,8 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         {"another condition",
          made.substr(0, made.find("M1")) + "M2" + made.substr(made.find("M1") + 2) + two + whites +
              end,
-         12, "was measured under M2, and the job asks for M1"},
-        {"no colours", head + format(cmyk) + rows + end, 7, "holds no measured colours"},
+         12, "was measured under M2, but the job requires M1"},
+        {"no colours", head + format(cmyk) + rows + end, 7, "has no measured colours"},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
@@ -95,7 +95,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         EXPECT_EQ(set.conditions.measurement, states ? "M1" : "");
         EXPECT_EQ(m_log.find("does not state its measurement condition") == m_log.npos, states);
     }
-    // Of an export with several conditions, the one that the job asks for.
+    // From an export with several conditions, takes the one that the job requires.
     const auto object = [](const char* cyan, const char* condition, const char* L) {
         return std::string("<Object Id='1'><DeviceColorValues><ColorCMYK><Cyan>") + cyan +
                "</Cyan><Magenta>0</Magenta><Yellow>0</Yellow><Black>0</Black></ColorCMYK>"
@@ -132,7 +132,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
     m_folder.write("export.txt",
                    std::regex_replace(made, std::regex("M1"), "M3") + two + whites + end);
     EXPECT_EQ(measured(anyCondition, "instrument = file\nfile = export.txt\n").patchCount, 4u);
-    expectFailure(measure(definition, "instrument = file\nfile = missing\n"), 7, "is not there");
+    expectFailure(measure(definition, "instrument = file\nfile = missing\n"), 7, "does not exist");
     expectFailure(measure(definition, "instrument = file\nfile = missing/export\nwait = 600\n"), 7,
                   "missing, the folder of the export, can't be used: No such file");
 }
@@ -163,12 +163,12 @@ TEST_F(MeasureTool, WaitsForANewExport) {
         EXPECT_THAT(m_log,
                     testing::ContainsRegex("Waiting for .*export.txt, until 2.*\n.*Not "
                                            "accepted: .*patch 1, which is 100 0 0 0, and row "
-                                           "1, which is 99 0 0 0, was not asked for\n$"));
+                                           "1, which is 99 0 0 0, was not requested\n$"));
     }
     {
         const auto other = after(200, [=, this] { m_folder.write("export.txt", wrong + "\n"); });
         expectFailure(measure(definition, settings + "wait = 2\n"), 8,
-                      "was not asked for; no other export came in time");
+                      "was not requested; no other export arrived in time");
     }
     // The time is up also while a read of the export blocks.
     const std::string pipe = m_folder.path("pipe");

@@ -143,7 +143,7 @@ TEST_F(MeasureTool, TellsTheOperatorWhoseTurnItIs) {
     const std::string path = m_folder.path("<new>.txt");
     const std::string shown = m_folder.path("&lt;new&gt;.txt");
     const std::string problem = ": there is no patch 1, which is 100 0 0 0, and row 1, which is 99 "
-                                "0 0 0, was not asked for";
+                                "0 0 0, was not requested";
     EXPECT_THAT(desktop.calls(),
                 testing::ElementsAre(
                     testing::StartsWith("notify 0: Measure strip.it8 | Export it as " + shown +
