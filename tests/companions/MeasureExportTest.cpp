@@ -78,7 +78,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         SCOPED_TRACE(c.what);
         const bool wide = std::string(c.what) == "in another order";
         m_folder.write("export.txt", wide ? support::utf16(c.text, "LE") : c.text);
-        // A relative path starts from the settings.
+        // A relative path is relative to the settings file.
         const std::string settings = "instrument = file\nfile = export.txt\n";
         if (c.exitCode != 0) {
             expectFailure(measure(definition, settings), c.exitCode, c.words);
@@ -122,7 +122,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         EXPECT_EQ(set.lab[0].L, L);
         EXPECT_EQ(set.conditions.measurement, std::string("M") + number);
     }
-    // What the settings permit, and what the definition leaves open.
+    // Permitted by the settings, or not specified by the definition.
     m_folder.write("export.txt",
                    labels + "0004 95 0 -3\n0001 55 -37 -50\n0002 60 1 2\n3 95 0 -2\n" + end);
     EXPECT_EQ(measured(definition, "instrument = file\nfile = export.txt\nmatch = ids\n").lab[3].b,
@@ -151,7 +151,7 @@ TEST_F(MeasureTool, WaitsForANewExport) {
     };
     expectFailure(measure(definition, settings + "wait = 1\n"), 7, "was not exported in time");
     {
-        // Another strip first, then a slow program whose file rests before it is done.
+        // First another strip, then a slow program whose file pauses before it is complete.
         const auto first = after(200, [=, this] { m_folder.write("export.txt", wrong); });
         const auto second = after(1500, [=] {
             std::ofstream file(path);
@@ -170,7 +170,7 @@ TEST_F(MeasureTool, WaitsForANewExport) {
         expectFailure(measure(definition, settings + "wait = 2\n"), 8,
                       "was not requested; no other export arrived in time");
     }
-    // The time is up also while a read of the export blocks.
+    // The time limit also works while a read of the export blocks.
     const std::string pipe = m_folder.path("pipe");
     ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
     const int silent = open(pipe.c_str(), O_RDWR | O_CLOEXEC);
