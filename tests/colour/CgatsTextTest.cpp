@@ -136,18 +136,18 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
         {"declared keywords", with("ORIGINATOR", "KEYWORD \"ORIGINATOR\"\nORIGINATOR"), ""},
         {"a keyword behind the format", with("NUMBER_OF_S", "DEVICE 28\nNUMBER_OF_S"), ""},
         {"no NUMBER_OF_SETS", with("NUMBER_OF_SETS 3\n", ""), ""},
-        {"count too low", with("SETS 3", "SETS 2"), "NUMBER_OF_SETS says 2, there are 3"},
+        {"count too low", with("SETS 3", "SETS 2"), "NUMBER_OF_SETS is 2, but there are 3"},
         {"count too high", with("SETS 3", "SETS 4000000000"), "there are 3 rows"},
-        {"a name too many", with("LAB_B\n", "LAB_B SPECTRAL_NM_7\n"), "8, there are 9"},
+        {"a name too many", with("LAB_B\n", "LAB_B SPECTRAL_NM_7\n"), "8, but there are 9"},
         {"names in lines", with("CMYK_K LAB_L", "CMYK_K\n\nLAB_L"), ""},
         {"no end of the format", with("END_DATA_FORMAT\n", ""), "END_DATA_FORMAT is missing"},
         {"names without a format", replaced(noFormat, "BEGIN_DATA\n", names + "BEGIN_DATA\n"),
-         "no BEGIN_DATA_FORMAT"},
+         "BEGIN_DATA_FORMAT is missing"},
         {"names as the first row", replaced(noFormat, "BEGIN_DATA\n", "BEGIN_DATA\n" + names),
-         "no BEGIN_DATA_FORMAT"},
+         "BEGIN_DATA_FORMAT is missing"},
         {"bare list of rows",
          names + plain.substr(plain.find("A1"), plain.find("END_DATA\n") - plain.find("A1")),
-         "no BEGIN_DATA:"},
+         "BEGIN_DATA is missing"},
         {"END_DATA missing, count right", with("END_DATA\n", ""), "END_DATA is missing"},
         {"quoted numbers", with("71.25 33", "\"71.25\" \"33\""), ""},
         {"decimal commas", commas, "Commas"},
@@ -164,7 +164,7 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
          replaced(replaced(commas, "A2 0", "\"A2 0"), "-0,5\n", "-0,5\"\t\t\n"), "Commas"},
         {"rows over two lines", with(" 0 0 ", " 0\n0 "), "over several lines"},
         {"two rows in a line", with("-50.75\n", "-50.75 "), "several rows"},
-        {"a remark behind a row", with("-50.75\n", "-50.75 checked twice\n"), "Words behind"},
+        {"a remark behind a row", with("-50.75\n", "-50.75 checked twice\n"), "Words after"},
         {"unknown columns",
          replaced(replaced(with("SAMPLE_ID", "LGOROWLENGTH SAMPLE_ID Remark"), "A1 ",
                            "8 A1 \"a \"\"b\"\" 5\" "),
@@ -381,7 +381,7 @@ TEST(CgatsText, WorksOutWhatIsNotStated) {
     // A whole group without numbers is absent.
     const DataSet half = readWell(table(labNames + " XYZ_X XYZ_Y XYZ_Z", "1 60 1 2 - n/a -\n"));
     EXPECT_EQ(half.xyz.at(0).Y, xyzFromLab({60, 1, 2}).Y);
-    EXPECT_THAT(notesOf(half), HasSubstr("XYZ columns hold no numbers"));
+    EXPECT_THAT(notesOf(half), HasSubstr("XYZ columns contain no numbers"));
 }
 
 TEST(CgatsText, JoinsTables) {
