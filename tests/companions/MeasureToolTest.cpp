@@ -205,7 +205,8 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
          "line 4 requires a number from 0 to 50 for error"},
         {options, "\xEF\xBB\xBF" + virtualPrint + "error = 51", 3, "line 3 requires"},
         {options, virtualPrint + "\x1b[2J\u009b = yes", 3, "\"?[2J?\", which"},
-        {options, "instrument = virtual\nprofile = /usr/share/color/icc/sRGB.icc", 6, "not a CMYK profile"},
+        {options, "instrument = virtual\nprofile = /usr/share/color/icc/sRGB.icc", 6,
+         "not a CMYK profile"},
     };
     for (const auto& c : cases) {
         const std::string path = m_folder.write("options", c.options);
