@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What benchmarks of any folder share.
+// Shared by all benchmarks.
 #pragma once
 
 #include <chrono>
@@ -17,7 +17,7 @@ inline double secondsOf(const std::function<void()>& work) {
     return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
 }
 
-/// A benchmark whose work fails says nothing.
+/// Exits if the work failed: its time would mean nothing.
 inline void check(bool done, const char* what) {
     if (!done) {
         std::fprintf(stderr, "%s failed\n", what);
@@ -25,7 +25,7 @@ inline void check(bool done, const char* what) {
     }
 }
 
-/// As the program itself does: what is freed stays at hand.
+/// Keeps freed memory for reuse, as the program itself does.
 inline void keepFreedMemory() {
     constexpr int piece = 32 << 20;
     mallopt(M_MMAP_THRESHOLD, piece);

@@ -1,10 +1,10 @@
 # SPDX-License-Identifier: Apache-2.0
-# Everything from outside comes from Debian's packages; scripts/setup.sh installs them.
+# All dependencies are Debian packages; scripts/setup.sh installs them.
 
 find_package(PkgConfig REQUIRED)
 find_package(Threads REQUIRED)
 
-# wxWidgets, base library alone: what `wx-config` names for the default build would pull in GTK.
+# Only the base library of wxWidgets: the default of `wx-config` would pull in GTK.
 find_program(WX_CONFIG NAMES wx-config REQUIRED)
 execute_process(COMMAND ${WX_CONFIG} --cxxflags base
   OUTPUT_VARIABLE _wx_cxxflags OUTPUT_STRIP_TRAILING_WHITESPACE COMMAND_ERROR_IS_FATAL ANY)
@@ -16,14 +16,14 @@ set(TINTGATE_PC_WX_LIBS "${_wx_libs}")
 separate_arguments(_wx_cxxflags UNIX_COMMAND "${_wx_cxxflags}")
 separate_arguments(_wx_libs UNIX_COMMAND "${_wx_libs}")
 list(TRANSFORM _wx_cxxflags REPLACE "^-I" "-isystem")
-# The records at the library's boundary need no more of wx than what its headers bring inline.
+# For the records at the library's boundary, wx's inline code is sufficient.
 add_library(wxheaders INTERFACE)
 target_compile_options(wxheaders INTERFACE ${_wx_cxxflags})
 add_library(wx INTERFACE)
 target_link_libraries(wx INTERFACE wxheaders ${_wx_libs})
 
 pkg_check_modules(lcms2 REQUIRED IMPORTED_TARGET lcms2)
-# Opened when a property list is read: only the headers are for building.
+# Opened when a property list is read, so only the headers are needed to build.
 pkg_check_modules(libplist REQUIRED libplist-2.0)
 add_library(libplistheaders INTERFACE)
 target_include_directories(libplistheaders SYSTEM INTERFACE ${libplist_INCLUDE_DIRS})
@@ -36,7 +36,7 @@ pkg_check_modules(libxxhash REQUIRED libxxhash)
 add_library(xxhash INTERFACE)
 target_include_directories(xxhash SYSTEM INTERFACE ${libxxhash_INCLUDE_DIRS})
 pkg_check_modules(libsystemd REQUIRED IMPORTED_TARGET libsystemd)
-# The store's plug-in loads libpq itself, when it is needed: only the headers are for building.
+# The store's plug-in loads libpq on demand, so only the headers are needed to build.
 pkg_check_modules(libpq REQUIRED IMPORTED_TARGET libpq)
 add_library(libpqheaders INTERFACE)
 target_include_directories(libpqheaders SYSTEM INTERFACE ${libpq_INCLUDE_DIRS})

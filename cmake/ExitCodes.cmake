@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
-# docs/exit-codes.csv is the one place that states exit codes, and docs/job-outcomes.csv the one that
-# states what they ask of whom in a job. "ExitCodes.h" is made from both.
+# docs/exit-codes.csv is the single source of exit codes, and docs/job-outcomes.csv of what they
+# require of whom in a job. "ExitCodes.h" is generated from both.
 
 find_package(Python3 REQUIRED COMPONENTS Interpreter)
 
@@ -21,7 +21,7 @@ add_library(exitcodes INTERFACE)
 target_include_directories(exitcodes INTERFACE "${PROJECT_BINARY_DIR}/see/exitcodes")
 add_dependencies(exitcodes exitcodes_header)
 
-# docs/companion-statuses.csv does the same for the companion programs.
+# docs/companion-statuses.csv is the source for the companion programs.
 set(_statuses "${PROJECT_SOURCE_DIR}/docs/companion-statuses.csv")
 set(_maker "${PROJECT_SOURCE_DIR}/scripts/make-companion-statuses.py")
 set(_header "${PROJECT_BINARY_DIR}/see/statuses/CompanionStatuses.h")

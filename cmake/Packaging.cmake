@@ -1,18 +1,18 @@
 # SPDX-License-Identifier: Apache-2.0
-# What an installation holds, and the Debian packages made of it by scripts/package.sh: tintgate (the
-# tool, presets, pages), libtintgate1 (the analysis library), libtintgate-dev (its headers),
-# tintgate-comgui (the comm plug-in) and tintgate-companions (the programs beside the tool).
+# The contents of an installation, and the Debian packages that scripts/package.sh makes: tintgate
+# (the tool, presets, pages), libtintgate1 (the analysis library), libtintgate-dev (its headers),
+# tintgate-comgui (the comm plug-in) and tintgate-companions (the companion programs).
 #
-# The packages share a system root, with which the packaged tool is built (TINTGATE_PACKAGE):
-# tintgate-comgui and tintgate-companions each bring their part of what Suite.cmake installs.
+# The packages share a system root, which is built into the packaged tool (TINTGATE_PACKAGE).
+# tintgate-comgui and tintgate-companions each contain a part of what Suite.cmake installs.
 
 set(_share "${CMAKE_INSTALL_DATADIR}/tintgate")
 set(_doc "${CMAKE_INSTALL_DATADIR}/doc")
-set(_include "${CMAKE_INSTALL_INCLUDEDIR}/tintgate") # Includes are written from the root in here.
+set(_include "${CMAKE_INSTALL_INCLUDEDIR}/tintgate")  # Root of the includes.
 set(_made "${PROJECT_BINARY_DIR}/docs")
 
-# Pages that are made from the list of exit codes, and what Debian wants compressed, without a time
-# stamp.
+# Pages generated from the list of exit codes, and files that Debian requires compressed, without a
+# time stamp.
 set(_codes "${PROJECT_SOURCE_DIR}/docs/exit-codes.csv")
 set(_outcomes "${PROJECT_SOURCE_DIR}/docs/job-outcomes.csv")
 set(_maker "${PROJECT_SOURCE_DIR}/scripts/make-exit-codes.py")
@@ -31,7 +31,7 @@ add_custom_command(OUTPUT ${_pages}
   DEPENDS "${_codes}" "${_outcomes}" "${_maker}" "${_tables}" "${_page}" "${_changes}"
   COMMENT "Making the pages that list exit codes" VERBATIM)
 
-# Programs that explain themselves: name of the page, and the target that is asked.
+# Pages made from a program's --help: name of the page, and the target that is run.
 set(_explained
   tintgate-store=tintgate-store
   tintgate-report=tintgate-report)
@@ -82,7 +82,7 @@ install(DIRECTORY docs/ DESTINATION "${_doc}/tintgate" COMPONENT tintgate
 install(FILES docs/Tintgate.completion RENAME Tintgate
   DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions" COMPONENT tintgate)
 
-# Installs the suite into its root below the prefix. A package leaves out what the other package
+# Installs the suite into its root below the prefix. A package omits what the other package
 # installs. An installation without a component gets the whole suite, once.
 function(install_suite code component)
   install(CODE "
@@ -106,8 +106,8 @@ install_suite("" suite)
 install_suite_for(tintgate-comgui Applications Library/Preferences/NerovaMeasure.conf.example
   Library/Preferences/ApplicationsUsingNerovaMeasure_x64.plist)
 install_suite_for(tintgate-companions lib usr Library/Preferences/Qen)
-# A room's settings of the measuring tool belong to its administrator. Without packages they are a
-# file in the root.
+# The settings of the measuring tool belong to the print room's administrator. Without packages they
+# are a file in the root.
 install(CODE "
   set(_settings \"${TINTGATE_PACKAGE_ROOT}/Library/Preferences/NerovaMeasure.conf\")
   file(CREATE_LINK /etc/tintgate/measure.conf
@@ -120,7 +120,7 @@ install(FILES job/AnalysisLibrary.h job/JobRecords.h DESTINATION "${_include}/jo
   COMPONENT libtintgate-dev)
 install(FILES "${PROJECT_BINARY_DIR}/see/exitcodes/ExitCodes.h" DESTINATION "${_include}"
   COMPONENT libtintgate-dev)
-# The version is the library's own. The prefix is found from the file's place.
+# The version is the library's own. The prefix is derived from the file's location.
 get_target_property(TINTGATE_PC_VERSION libTintgate VERSION)
 file(RELATIVE_PATH TINTGATE_PREFIX_FROM_PC "/${CMAKE_INSTALL_LIBDIR}/pkgconfig" "/")
 configure_file(cmake/tintgate.pc.in "${_made}/tintgate.pc" @ONLY)
@@ -140,9 +140,9 @@ set(CPACK_GENERATOR DEB)
 set(CPACK_PACKAGE_NAME tintgate)
 set(CPACK_PACKAGE_VENDOR "Tintgate")
 set(CPACK_PACKAGE_CONTACT "Tintgate maintainers <maintainers@tintgate.example>")
-set(CPACK_PACKAGE_DESCRIPTION_SUMMARY "") # Each package has one of its own.
+set(CPACK_PACKAGE_DESCRIPTION_SUMMARY "")  # Each package has its own.
 set(CPACK_PACKAGING_INSTALL_PREFIX /usr)
-set(CPACK_SET_DESTDIR ON) # What is written at installation names its final place.
+set(CPACK_SET_DESTDIR ON)  # Files written at installation contain their final path.
 set(CPACK_INSTALL_PREFIX /usr)
 set(CPACK_STRIP_FILES ON)
 set(CPACK_INSTALL_DEFAULT_DIRECTORY_PERMISSIONS OWNER_READ OWNER_WRITE OWNER_EXECUTE
@@ -156,7 +156,7 @@ set(CPACK_DEBIAN_PACKAGE_SHLIBDEPS_PRIVATE_DIRS "${CMAKE_LIBRARY_OUTPUT_DIRECTOR
 
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_NAME tintgate)
 set(CPACK_DEBIAN_TINTGATE_PACKAGE_SECTION graphics)
-# These are opened when a property list or a text needs them, so the linker does not know of them.
+# Opened on demand for property lists and texts, so the linker does not know about them.
 set(_plist "libplist3 (>= 2.2.0)")
 file(STRINGS "${ICU_INCLUDE_DIR}/unicode/uvernum.h" _icu REGEX "^#define U_ICU_VERSION_SHORT ")
 string(REGEX MATCH "[0-9]+" _icu "${_icu}")
@@ -182,7 +182,7 @@ set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_NAME libtintgate-dev)
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_SECTION libdevel)
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_DEPENDS
   "libtintgate1 (= ${PROJECT_VERSION}), libwxgtk3.2-dev")
-# Texts of ExitCodes.h for people name programs and pages of these.
+# The texts in ExitCodes.h refer to programs and pages of these packages.
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_PACKAGE_SUGGESTS "tintgate, tintgate-companions")
 set(CPACK_DEBIAN_LIBTINTGATE-DEV_DESCRIPTION "analysis library of Tintgate, for developers
 Compares colour data, judges the outcome by a tolerance preset and writes it as
@@ -191,7 +191,7 @@ JSON. This package contains the headers, a pkg-config file and an example.")
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_NAME tintgate-comgui)
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_SECTION graphics)
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_DEPENDS "${_plist}")
-# Opened when a store's address names a server.
+# Opened if a store's address names a server.
 set(CPACK_DEBIAN_TINTGATE-COMGUI_PACKAGE_RECOMMENDS "libpq5 (>= 14)")
 set(CPACK_DEBIAN_TINTGATE-COMGUI_DESCRIPTION "ticket stores for Tintgate
 The plug-in that connects Tintgate to a print server's jobs: a store in a

@@ -1,22 +1,22 @@
 # SPDX-License-Identifier: Apache-2.0
-# Targets that see no more than stands behind their arrows.
+# Targets that see only the headers that their dependencies allow.
 #
-# Includes are written from the root of the tree ("ticket/PartialMode.h"), yet the root itself is on
-# no include path: that would show every header to everybody. Instead each target publishes its
-# headers as links in a folder of its own under the build tree, keeps that folder on its include
-# path, and sees those of the targets that it links.
+# Includes are written from the root of the tree ("ticket/PartialMode.h"), but the root itself is on
+# no include path, because that would expose every header to every target. Instead, each target
+# publishes its headers as links in its own folder in the build tree. Its include path has that
+# folder and those of the targets that it links.
 #
 #   tintgate_target(NAME KIND                 STATIC, SHARED, MODULE, EXECUTABLE or HEADERS
 #     HEADERS  a.h ...                        published headers, relative to the current folder
-#     PRIVATE_HEADERS  b.h ...                headers that this target's own sources include only
+#     PRIVATE_HEADERS  b.h ...                headers included only by this target's sources
 #     SOURCES  a.cpp ...
-#     EXPOSES  target ...                     targets that the published headers themselves need
-#     LINKS    target ...)                    targets that only the sources need
+#     EXPOSES  target ...                     targets needed by the published headers
+#     LINKS    target ...)                    targets needed only by the sources
 #
-# Generated headers are published by a target of their own (see cmake/ExitCodes.cmake).
+# Generated headers have their own targets (see cmake/ExitCodes.cmake).
 
-# Made anew at every configuration, so that nothing lingers of a header or a target that moved. Two
-# folders are of generated headers, which the build makes.
+# Recreated at every configuration, so that no moved header or target stays in its old place. Two
+# folders have generated headers, which the build creates.
 file(GLOB _published "${PROJECT_BINARY_DIR}/see/*")
 list(FILTER _published EXCLUDE REGEX "/(exitcodes|statuses)$")
 if(_published)
@@ -61,7 +61,7 @@ function(tintgate_target target kind)
     target_link_libraries(${target} PRIVATE tintgate_options)
   endif()
 
-  # What the test of the arrows walks over.
+  # Input of the test of the dependencies.
   if(T_HEADERS)
     list(GET T_HEADERS 0 _first)
     get_filename_component(_first "${_first}" ABSOLUTE)
@@ -73,8 +73,7 @@ function(tintgate_target target kind)
   endif()
 endfunction()
 
-# A test program. It may look inside the target that it tests: the private headers of the targets
-# under LOOKS_INTO are on its include path too.
+# A test program. Its include path also has the private headers of the targets in LOOKS_INTO.
 #
 #   tintgate_test(NAME SOURCES a.cpp ... LINKS target ... [LOOKS_INTO target ...] [LABELS ...])
 function(tintgate_test target)
@@ -90,9 +89,9 @@ function(tintgate_test target)
   target_link_libraries(${target} PRIVATE ${T_LINKS} GTest::gmock GTest::gtest_main tintgate_options)
   target_compile_definitions(${target} PRIVATE
     TINTGATE_SOURCE_DIR="${PROJECT_SOURCE_DIR}" TINTGATE_BINARY_DIR="${PROJECT_BINARY_DIR}")
-  # Only what is tested is worth optimising: this halves the time that tests take to compile. The
-  # headers of the test framework are read once for all (tests/support), which takes options that
-  # agree with those of wx.
+  # Only the code under test is worth optimising: this halves the compile time of tests. The headers
+  # of the test framework are precompiled once (tests/support), with options that agree with those
+  # of wx.
   target_compile_options(${target} PRIVATE -O0 -pthread -D_FILE_OFFSET_BITS=64)
   target_precompile_headers(${target} REUSE_FROM test_headers)
   add_test(NAME ${target} COMMAND ${target})

@@ -15,7 +15,7 @@ namespace {
 using Names = std::vector<std::string>;
 using Meanings = std::vector<ColumnMeaning>;
 
-// Spellings without their underscores and blanks, the best first: a table may have several.
+// Spellings without underscores and blanks, best first: a table may have several.
 constexpr std::string_view idSpellings[] = {"SAMPLEID",    "SAMPLENO", "SAMPLENUMBER", "SAMPLENR",
                                             "PATCHID",     "PATCHNO",  "PATCHNUMBER",  "PATCHNR",
                                             "SAMPLEINDEX", "ID",       "NO",           "NR"};
@@ -25,7 +25,7 @@ constexpr std::string_view nameSpellings[] = {"SAMPLENAME", "PATCHNAME",      "N
 
 struct Run {
     Quantity quantity;
-    std::array<std::string_view, 4> names; ///< The last is empty for a group of three.
+    std::array<std::string_view, 4> names; ///< The last one is empty for a group of three.
     std::size_t size() const { return names[3].empty() ? 3 : 4; }
 };
 constexpr Run runs[] = {
@@ -57,7 +57,7 @@ constexpr SpectralPrefix spectralPrefixes[] = {
     {"LAMBDA", SpectralUnit::Unstated},
 };
 
-// Wavelengths that instruments report, in nm. A name that was cut off falls below.
+// Wavelengths that instruments report, in nm. A truncated name gives a smaller number.
 constexpr int shortestWavelength = 200;
 constexpr int longestWavelength = 2500;
 
@@ -68,7 +68,7 @@ bool isDigit(char c) {
     return c >= '0' && c <= '9';
 }
 
-/// Capitals, underscores for blanks and hyphens, no asterisks, no CIE in front.
+/// Upper case, underscores for blanks and hyphens, no asterisks, no leading CIE.
 std::string normalised(std::string_view name) {
     std::string result;
     for (const char c : upperCase(name.substr(0, 256))) {
@@ -97,7 +97,7 @@ std::optional<int> rankIn(const std::string_view (&spellings)[N], std::string_vi
     return static_cast<int>(found - std::begin(spellings));
 }
 
-/// The whole number that a text of one to four digits is.
+/// The integer in a text of one to four digits.
 std::optional<int> smallNumber(std::string_view text) {
     if (text.empty() || text.size() > 4 || !std::all_of(text.begin(), text.end(), isDigit)) {
         return std::nullopt;
@@ -109,7 +109,7 @@ std::optional<int> smallNumber(std::string_view text) {
     return value;
 }
 
-/// SPECTRAL_NM380, SPEC_380, nm380, 380_NM, R_380, 380.00 and so on.
+/// SPECTRAL_NM380, SPEC_380, nm380, 380_NM, R_380, 380.00 and similar.
 std::optional<ColumnMeaning> spectralMeaning(std::string_view squeezedName) {
     std::string_view name = squeezedName;
     const auto digit =
@@ -139,7 +139,7 @@ std::optional<ColumnMeaning> spectralMeaning(std::string_view squeezedName) {
     return ColumnMeaning{Quantity::Spectral, *wavelength, known->unit};
 }
 
-/// Numbers above nine as one letter, as in PCA_A: A is 10, D is 13.
+/// Numbers above nine as a single letter, as in PCA_A: A is 10, D is 13.
 std::optional<int> inkLetter(std::string_view text) {
     if (text.size() != 1 || text[0] < 'A' || text[0] > 'D') {
         return std::nullopt;
@@ -147,7 +147,7 @@ std::optional<int> inkLetter(std::string_view text) {
     return text[0] - 'A' + 10;
 }
 
-/// 7CLR_1, CLR_1, PC7_1, PCA_A: the number of the ink from 0.
+/// 7CLR_1, CLR_1, PC7_1, PCA_A: the ink's number, from 0.
 std::optional<int> colorantIndex(std::string_view name) {
     while (!name.empty() && isDigit(name.front())) {
         name.remove_prefix(1);
@@ -180,7 +180,7 @@ int letterIndex(std::string_view letters, std::string_view suffix) {
 /// Channels of CMYK and of CMYK with more inks, as in CMYK_C, CMYKOG_O, CMYKcm_c or CMYK_5.
 ColumnMeaning cmykMeaning(std::string_view rawName, std::string_view prefix,
                           std::string_view suffix) {
-    // Light inks have the small letter, and only the case tells them from the full ones.
+    // Light inks have a lower-case letter; only the case distinguishes them from full inks.
     const bool lightInk = prefix.size() > 4 && suffix.size() == 1 &&
                           rawName.back() != suffix.back() && rawName.starts_with("CMYK");
     if (const int letter = letterIndex("CMYK", suffix); letter >= 0 && !lightInk) {
@@ -250,7 +250,7 @@ ColumnMeaning meaningOf(const std::string& rawName) {
     return {};
 }
 
-/// Gives the columns of one quantity by their index, the first of each.
+/// The columns of one quantity by index, the first for each.
 std::vector<std::size_t> columnsOf(const Meanings& meanings, Quantity quantity, int count) {
     std::vector<std::size_t> columns;
     for (int index = 0; index < count; ++index) {
@@ -274,7 +274,7 @@ std::vector<std::size_t> allOf(const Meanings& meanings, Quantity quantity) {
     return columns;
 }
 
-/// The best spelt column of ids or names.
+/// The column of ids or names with the best spelling.
 std::optional<std::size_t> bestOf(const Meanings& meanings, Quantity quantity) {
     std::optional<std::size_t> best;
     for (const std::size_t i : allOf(meanings, quantity)) {
@@ -293,7 +293,7 @@ Group addGroup(Layout& layout, const std::vector<std::size_t>& columns) {
     return group;
 }
 
-/// Five or more numbered inks are C, M, Y, K and what is printed beside them. Of four nobody knows.
+/// Five or more numbered inks are C, M, Y, K and additional inks. Four may be anything.
 void takeProcessInks(Meanings& meanings) {
     constexpr int fewest = 5;
     if (columnsOf(meanings, Quantity::Cmyk, 4).empty() &&
@@ -306,7 +306,7 @@ void takeProcessInks(Meanings& meanings) {
     }
 }
 
-/// The columns of the inks beside C, M, Y, K: numbered ones in their order, then by place.
+/// The columns of inks other than C, M, Y, K: numbered ones in their order, then by position.
 std::vector<std::size_t> furtherInks(const Meanings& meanings) {
     std::vector<std::size_t> columns;
     for (std::size_t i = 0; i < meanings.size(); ++i) {
@@ -361,8 +361,8 @@ void layOutDevice(const Names& names, Meanings meanings, Layout& layout) {
     layout.device = addGroup(layout, columns);
 }
 
-/// Turns SPECTRAL_NM / SPECTRAL_PCT pairs into plain spectral columns, by the wavelengths that the
-/// first row states, and has these wavelengths read along.
+/// Converts SPECTRAL_NM / SPECTRAL_PCT pairs to plain spectral columns with the wavelengths of the
+/// first row, and marks the wavelengths to be read in every row.
 void resolvePairs(const std::vector<double>& firstRow, Meanings& meanings,
                   std::vector<std::size_t>& stated) {
     constexpr std::size_t none = ~std::size_t{0};
@@ -432,7 +432,7 @@ void noteOddGroups(const Meanings& meanings, Layout& layout) {
         }
         if (allOf(meanings, group.quantity).size() > found && found > 0) {
             layout.notes.push_back(std::string(group.name) +
-                                   " columns stand there more than once: the first ones count.");
+                                   " columns are repeated: the first ones are used.");
         }
     }
 }
@@ -458,7 +458,7 @@ std::vector<ColumnMeaning> meaningsOf(const std::vector<std::string>& names) {
             }
         }
     }
-    // One bare number among the names may be anything; a row of them is a spectrum.
+    // A single bare number among the names may be anything; several are a spectrum.
     const auto isBare = [&](std::size_t i) {
         return meanings[i].quantity == Quantity::Spectral && isDigit(plain[i].front()) &&
                !plain[i].ends_with("NM");
@@ -481,7 +481,7 @@ bool isNumberedInk(std::string_view channel) {
         return true;
     }
     const std::size_t digits = name.find_last_not_of("0123456789") + 1;
-    constexpr std::size_t mostDigits = 2; // More are a name, such as that of an ink in a fan.
+    constexpr std::size_t mostDigits = 2; // More digits are a name, such as an ink of a colour fan.
     if (digits == name.size() || name.size() - digits > mostDigits) {
         return false;
     }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Statements as they are met:
+// Statements found in practice:
 //
 //     ILLUMINANT "D50"                              OBSERVER "CIE 2 degree"
 //     WEIGHTING_FUNCTION "ILLUMINANT, D50"          WEIGHTING_FUNCTION "OBSERVER, 2 degree"
@@ -29,7 +29,7 @@ bool isDigit(char c) {
     return c >= '0' && c <= '9';
 }
 
-/// Runs of ASCII letters and digits, in capitals.
+/// Runs of ASCII letters and digits, in upper case.
 std::vector<std::string> wordsOf(std::string_view text) {
     std::vector<std::string> words;
     for (std::size_t i = 0; i < text.size();) {
@@ -49,7 +49,7 @@ bool isMeasurementCondition(std::string_view word) {
     return word.size() == 2 && word[0] == 'M' && word[1] >= '0' && word[1] <= '3';
 }
 
-/// D50 and its like, F1 to F12, and, where the keyword asks for nothing else, A, C and E.
+/// D50 and similar, F1 to F12, and, for a dedicated keyword, A, C and E.
 bool isIlluminant(std::string_view word, bool ownKeyword) {
     for (const char* daylight : {"D50", "D55", "D65", "D75"}) {
         if (word == daylight) {
@@ -64,7 +64,7 @@ bool isIlluminant(std::string_view word, bool ownKeyword) {
     return fluorescent || word == "A" || word == "C" || word == "E";
 }
 
-/// "2" or "10" where a number of degrees stands: "2 degree", "10°", "2-deg".
+/// "2" or "10" from a number of degrees: "2 degree", "10°", "2-deg".
 std::optional<std::string> observerIn(std::string_view text) {
     const std::string upper = upperCase(text);
     std::optional<std::string> found;
@@ -95,7 +95,7 @@ std::optional<std::string> observerIn(std::string_view text) {
     return found;
 }
 
-/// As observerIn, for a text that is about the observer alone: "2", "CIE 1931".
+/// Like observerIn, for a text that is only about the observer: "2", "CIE 1931".
 std::optional<std::string> observerAlone(std::string_view text) {
     if (auto observer = observerIn(text)) {
         return observer;
@@ -162,7 +162,7 @@ void ConditionFinder::see(std::string_view keyword, std::string_view value) {
     }
     if (keyword == "ILLUMINATION_CONDITION" && value.size() == 1 && value[0] >= '0' &&
         value[0] <= '3') {
-        // The mode of the measuring tool, numbered as ISO 13655 numbers its conditions.
+        // The measuring tool's mode, with the condition numbers of ISO 13655.
         m_measurement.add(Keyword, "M" + std::string(value));
     } else if (is({"ILLUMINATION_CONDITION", "MEASUREMENT_CONDITION", "MEASUREMENT_CONDITIONS",
                    "MEASUREMENT_MODE", "MEASUREMENT_STANDARD"})) {
@@ -191,7 +191,7 @@ void ConditionFinder::see(std::string_view keyword, std::string_view value) {
     }
 }
 
-/// Looks for all three in a text, and for named parts such as Filter=UVcut.
+/// Searches a text for all three, and for named parts such as Filter=UVcut.
 void ConditionFinder::seeProse(Rank rank, std::string_view text) {
     std::string rest; // without the named parts
     for (std::size_t at = 0; at < text.size();) {
@@ -220,7 +220,7 @@ void ConditionFinder::seeProse(Rank rank, std::string_view text) {
     }
 }
 
-/// `name` in capitals.
+/// `name` in upper case.
 void ConditionFinder::seeNamed(std::string_view name, std::string_view value) {
     if (name.ends_with("OBSERVERANGLE") || name.ends_with("OBSERVER")) {
         if (const auto observer = observerAlone(value)) {
@@ -245,8 +245,8 @@ void ConditionFinder::seeNamed(std::string_view name, std::string_view value) {
     }
 }
 
-/// ISO 13655: M1 is daylight, which some software calls a D50 filter, M2 is without ultraviolet, M3
-/// polarised. No filter is the word for M0, but devices that only know M1 write it too.
+/// ISO 13655: M1 is daylight, which some software calls a D50 filter; M2 excludes ultraviolet; M3
+/// is polarised. "No filter" means M0, but devices that only support M1 write it too.
 void ConditionFinder::seeFilter(std::string_view text) {
     const std::vector<std::string> words = wordsOf(text);
     const auto holds = [&](std::initializer_list<std::string_view> names) {

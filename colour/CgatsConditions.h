@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Illuminant, observer and measurement condition from what a header says of them.
+// Finds illuminant, observer and measurement condition in a header.
 #pragma once
 
 #include <string>
@@ -9,23 +9,23 @@
 
 namespace colour::cgats {
 
-/// Gathers statements. The plainest kind of statement counts, in the order of Rank. Statements of
-/// one kind that differ cancel out.
+/// Collects statements. Only the most explicit kind counts, in the order of Rank. Different
+/// statements of the same kind cancel out.
 class ConditionFinder {
   public:
-    /// `keyword` in capitals, `value` UTF-8.
+    /// `keyword` in upper case, `value` in UTF-8.
     void see(std::string_view keyword, std::string_view value);
 
     Conditions result() const;
 
   private:
     enum Rank {
-        Keyword,  ///< A keyword of its own, such as MEASUREMENT_CONDITION.
+        Keyword,  ///< A dedicated keyword, such as MEASUREMENT_CONDITION.
         Named,    ///< A named part of a text, such as MeasurementCondition=M1.
-        Filter,   ///< A filter that is in the way of the light.
+        Filter,   ///< A filter in the light path.
         Geometry, ///< A word in MEASUREMENT_GEOMETRY.
         Prose,    ///< A word in a text about the instrument.
-        Hint,     ///< No filter at all, or a lamp: M0 in practice.
+        Hint,     ///< No filter, or a lamp: M0 in practice.
         None
     };
     struct Statement {

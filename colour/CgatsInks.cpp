@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Statements as they are met:
+// Statements found in practice:
 //
 //     LGOMCCHANNEL05 "InkName = 'Orange' InkSample = '[0.4 0.3 0.1]'"
 //     COLOR_REP "CMYKOGV"          or, in texts of ArgyllCMS, "CMYKOG_XYZ"

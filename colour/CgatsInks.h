@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Names of the inks beside C, M, Y and K, from where a header states them reliably.
+// Names of the inks other than C, M, Y and K, from reliable parts of a header.
 #pragma once
 
 #include <map>
@@ -11,20 +11,21 @@
 
 namespace colour::cgats {
 
-/// Gathers statements. Names of channels (LGOMCCHANNEL01) count before the letters of COLOR_REP.
-/// PLUS_1_COLOR and its like do not count: they are met with the exporter's defaults.
+/// Collects statements. Names of channels (LGOMCCHANNEL01) have priority over the letters of
+/// COLOR_REP. PLUS_1_COLOR and similar keywords are ignored, because exporters write them with
+/// defaults.
 class InkNames {
   public:
-    /// `keyword` in capitals, `value` UTF-8.
+    /// `keyword` in upper case, `value` in UTF-8.
     void see(std::string_view keyword, std::string_view value);
 
-    /// Renames the channels after the first four to "SPOT_" and the ink's name, if all of them are
+    /// Renames the channels after the first four to "SPOT_" plus the ink's name, if all of them are
     /// named and the first four are C, M, Y and K.
     void name(DataSet& set) const;
 
   private:
-    std::map<int, std::string> m_channels; ///< From 1.
-    std::vector<std::string> m_letters;    ///< Of COLOR_REP, after CMYK.
+    std::map<int, std::string> m_channels; ///< Numbered from 1.
+    std::vector<std::string> m_letters;    ///< From COLOR_REP, after CMYK.
 };
 
 } // namespace colour::cgats

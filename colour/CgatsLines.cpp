@@ -16,18 +16,18 @@ bool isKeywordSign(char c) {
     return (c >= 'A' && c <= 'Z') || (c >= '0' && c <= '9') || c == '_';
 }
 
-/// True for a quote that is followed by nothing that belongs to its text.
+/// True for a quote that is not followed by more of its text.
 bool closes(const char* quote, const char* end, const CharTable& chars) {
     return quote + 1 == end || !chars.isPlain(quote[1]);
 }
 
-/// 80 to 9F of Windows-1252; the five that it leaves free stay what they are in Latin-1.
+/// 80 to 9F of Windows-1252. The five undefined codes keep their Latin-1 meaning.
 constexpr char16_t windowsSigns[32] = {
     0x20AC, 0x0081, 0x201A, 0x0192, 0x201E, 0x2026, 0x2020, 0x2021, 0x02C6, 0x2030, 0x0160,
     0x2039, 0x0152, 0x008D, 0x017D, 0x008F, 0x0090, 0x2018, 0x2019, 0x201C, 0x201D, 0x2022,
     0x2013, 0x2014, 0x02DC, 0x2122, 0x0161, 0x203A, 0x0153, 0x009D, 0x017E, 0x0178};
 
-/// Length of the valid UTF-8 sequence at `at`, or 0. No surrogates, nothing above U+10FFFF.
+/// Length of the valid UTF-8 sequence at `at`, or 0. Surrogates and overflows are invalid.
 std::size_t sequenceLength(const char* at, const char* end) {
     const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(at[i]); };
     const auto follows = [&](std::size_t i) { return (byte(i) & 0xC0) == 0x80; };
@@ -71,7 +71,7 @@ bool isUtf8(std::string_view text) {
     return true;
 }
 
-/// Cuts a text that is longer than is kept, never inside a UTF-8 character.
+/// Truncates a text that is too long, never inside a UTF-8 character.
 std::string_view bounded(std::string_view text) {
     if (text.size() <= maxHeaderValue) {
         return text;
@@ -206,7 +206,7 @@ bool unwrapLine(std::string_view line, std::string& inner) {
         return false;
     }
     inner = wordText(word);
-    // A spreadsheet doubles every quote inside; others belong to cells of their own.
+    // A spreadsheet doubles every quote inside. Single quotes belong to separate cells.
     const auto quotes = [](std::string_view text) {
         return std::count(text.begin(), text.end(), '"');
     };
@@ -214,7 +214,7 @@ bool unwrapLine(std::string_view line, std::string& inner) {
 }
 
 KeywordLine keywordLine(std::string_view line) {
-    // Trailing separators are what a spreadsheet leaves of empty cells.
+    // Trailing separators are a spreadsheet's empty cells.
     while (!line.empty() && (line.back() == ',' || line.back() == ';' || line.back() == '\t')) {
         line.remove_suffix(1);
     }
@@ -222,7 +222,7 @@ KeywordLine keywordLine(std::string_view line) {
     KeywordLine result;
     std::string inner;
     if (unwrapLine(line, inner)) {
-        // A sentence in quotes is no keyword line, whatever word it begins with.
+        // A quoted sentence is not a keyword line, whatever its first word is.
         const auto signs = static_cast<std::size_t>(
             std::find_if_not(inner.begin(), inner.end(), isKeywordSign) - inner.begin());
         if (signs >= 2 && signs < inner.size() && !blanksSeparate.isPlain(inner[signs])) {

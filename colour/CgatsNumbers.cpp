@@ -10,7 +10,7 @@ namespace colour::cgats {
 
 namespace {
 
-/// Up to here every whole number is a double, so that one division gives the nearest double.
+/// Up to here every integer is a double, so a single division gives the nearest double.
 constexpr std::uint64_t largestExact = std::uint64_t{1} << 53;
 
 constexpr double notANumber = std::numeric_limits<double>::quiet_NaN();
@@ -71,7 +71,7 @@ double NumberReader::read(std::string_view text) {
     return value;
 }
 
-/// Any number of digits that a double holds exactly; then its only division is exact too.
+/// As many digits as a double represents exactly, so that the single division is exact too.
 bool NumberReader::readLong(const char*& at, const char* end, double& value) {
     const char* p = at;
     const bool negative = *p == '-';

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Numbers as they stand in the cells of a table.
+// Numbers in the cells of a table.
 #pragma once
 
 #include <bit>
@@ -11,28 +11,28 @@
 
 namespace colour::cgats {
 
-/// The number that a cell holds, with a point or with `comma` for its point; a NaN for anything
-/// else, infinities included.
+/// The number in a cell, with a point or `comma` as the decimal point. NaN for anything else,
+/// including infinities.
 double numberIn(std::string_view text, char comma);
 
-/// Reads numbers and keeps in mind how they are written. All come out as the nearest double.
+/// Reads numbers and records how they are written. Each result is the nearest double.
 class NumberReader {
   public:
-    /// `chars` outlives the reader.
+    /// `chars` must outlive the reader.
     explicit NumberReader(const CharTable& chars) : m_chars(&chars) {}
 
-    /// A number in any writing, NaN for what is none.
+    /// Reads a number in any notation. NaN if it is not a number.
     double read(std::string_view text);
 
-    /// Reads the number at `at` if it is written as nearly all are: digits and a point, up to a
-    /// blank or line end. Else gives false and leaves `at`. REQUIRES: at < end.
+    /// Reads a number in the most common notation: digits and a point, up to a blank or line end.
+    /// Otherwise returns false and leaves `at` unchanged. REQUIRES: at < end.
     bool readPlain(const char*& at, const char* end, double& value) {
         return readShort(at, end, value) || readLong(at, end, value);
     }
 
     bool sawCommas() const { return m_commas; }
 
-    /// True if a comma is as likely to part thousands as to be a decimal point: 1,234 beside 1.5.
+    /// True if commas may be thousands separators instead of decimal points: 1,234 next to 1.5.
     bool isAmbiguous() const { return m_thousands && m_points; }
 
   private:
@@ -46,15 +46,15 @@ class NumberReader {
     bool m_thousands = false;
 };
 
-/// Digits of a decimal that fit an unsigned 64-bit number, whatever they are.
+/// Any decimal with so many digits fits an unsigned 64-bit number.
 inline constexpr std::size_t mostDigits = 18;
 
 inline constexpr double powersOfTen[mostDigits + 1] = {1e0,  1e1,  1e2,  1e3,  1e4,  1e5,  1e6,
                                                        1e7,  1e8,  1e9,  1e10, 1e11, 1e12, 1e13,
                                                        1e14, 1e15, 1e16, 1e17, 1e18};
 
-/// Up to seven digits and a point without a loop: eight bytes are taken as one word, whose lowest
-/// byte is the first character.
+/// Reads up to seven digits and a point without a loop: eight bytes are loaded as one word, with
+/// the first character in the lowest byte.
 inline bool NumberReader::readShort(const char*& at, const char* end, double& value) {
     if (std::endian::native != std::endian::little || end - at < 9) {
         return false;
@@ -64,7 +64,7 @@ inline bool NumberReader::readShort(const char*& at, const char* end, double& va
     std::uint64_t digits = 0;
     std::memcpy(&digits, p, sizeof digits);
     digits ^= 0x3030303030303030; // digits become 0 to 9
-    // The top bit of every byte that is no digit, exact up to the second such byte.
+    // The top bit of every byte that is not a digit, exact up to the second one.
     std::uint64_t others = (digits | (digits + 0x7676767676767676)) & 0x8080808080808080;
     if (others == 0) {
         return false;
@@ -87,7 +87,7 @@ inline bool NumberReader::readShort(const char*& at, const char* end, double& va
     if (count == 0 || m_chars->isPlain(p[length])) {
         return false;
     }
-    // Zeros in front make eight digits; then pairs, fours and all eight are put together.
+    // Pads to eight digits with zeros in front, then combines pairs, fours and all eight.
     digits <<= 8 * (8 - count);
     digits = 10 * digits + (digits >> 8);
     constexpr std::uint64_t pairs = 0x000000FF000000FF;

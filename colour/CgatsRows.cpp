@@ -7,8 +7,8 @@
 //     3  Light cyan  50  0  0  0   75,4 -18,1 -25,9    not quoted, decimal commas
 //     END_DATA
 //
-// Nearly all rows take the quick way: one pass over the bytes, numbers straight into the row's
-// values. A row that does not come out even is looked at once more, with care.
+// Nearly all rows take the fast path: one pass over the bytes, with numbers stored directly in the
+// row's values. A row that does not fit is parsed again more carefully.
 #include "colour/CgatsRows.h"
 
 #include <algorithm>
@@ -21,7 +21,7 @@ namespace {
 
 constexpr std::size_t mostNotes = 50;
 
-/// Words of a line beyond its columns that are still looked at: names with many blanks.
+/// Maximum number of words after a line's columns: names with many blanks.
 constexpr std::size_t surplusWords = 64;
 
 std::string counted(std::size_t number, const char* what) {
@@ -88,8 +88,8 @@ void RowReader::useNames(const std::vector<std::string>& names,
     m_unreadable.assign(m_layout.valueCount, 0);
 }
 
-/// Makes room for the stated number of rows. A cell takes two bytes at least, so that a count that
-/// lies can't ask for more than the text holds.
+/// Reserves the stated number of rows. A cell takes at least two bytes, so a wrong count can't
+/// request more than the text can contain.
 void RowReader::reserveRows() {
     const std::size_t room =
         static_cast<std::size_t>(m_end - m_at) / (2 * m_layout.columns.size()) + 1;
@@ -127,7 +127,7 @@ Failure RowReader::readRows(Form form) {
     return Failure::None;
 }
 
-/// Goes to the next line that is neither blank nor a comment. False at END_DATA and at the end.
+/// Moves to the next line that is not blank or a comment. False at END_DATA and at the end.
 bool RowReader::findRow() {
     while (true) {
         while (m_at != m_end && !m_chars->isPlain(*m_at)) {
@@ -144,7 +144,7 @@ bool RowReader::findRow() {
     return !takeEndOfData();
 }
 
-/// The whole line, with the separators in front of an empty first cell.
+/// The whole line, including separators before an empty first cell.
 std::string_view RowReader::lineAtHand() const {
     const char* start = m_at;
     while (start != m_begin && m_chars->isBlank(start[-1])) {
@@ -162,7 +162,7 @@ bool RowReader::takeEndOfData() {
     if (!sameWord(word.text, "END_DATA")) {
         return false;
     }
-    if (word.quoted) { // alone in its line; else it is an id
+    if (word.quoted) { // alone in its line; otherwise it is an id
         behind = skipBlanks(behind, m_end, *m_chars);
         if (behind != m_end && !m_chars->isLineEnd(*behind)) {
             return false;
@@ -173,14 +173,14 @@ bool RowReader::takeEndOfData() {
     return true;
 }
 
-/// Settles, by the first row, what separates cells, how many there are, and whether lines count.
+/// Determines from the first row the cells' separator, their number, and whether lines matter.
 RowReader::Form RowReader::inspectFirstRow() {
     const std::string_view line = lineAtHand();
     const std::string_view row = unwrapLine(line, m_unwrapped) ? m_unwrapped : line;
     Form form = Form::Cells;
     if (!cellsBySeparator(row) && !cellsBySpreadsheet(row)) {
         if (!splitWords(row, *m_chars, mostWords(),
-                        m_words)) { // as many whole rows as were looked at
+                        m_words)) { // the inspected text has only whole rows
             m_words.resize(m_words.size() - m_words.size() % m_layout.columns.size());
         }
         form = formOfWords(line.data() + line.size());
@@ -189,7 +189,7 @@ RowReader::Form RowReader::inspectFirstRow() {
     if (form == Form::Lines && m_words.size() > names.size() &&
         namesAreLost(line.data() + line.size())) {
         m_notes.add("There are " + counted(names.size(), "column names for rows of ") +
-                    counted(m_words.size(), "cells: the cells behind the named ones are skipped."));
+                    counted(m_words.size(), "cells: the cells after the named ones are skipped."));
         names.resize(m_words.size());
     }
     std::vector<double> numbers; // for SPECTRAL_NM
@@ -202,27 +202,27 @@ RowReader::Form RowReader::inspectFirstRow() {
     return form;
 }
 
-/// Form of a table whose first row, in m_words, is parted by blanks in any number.
+/// Form of a table whose first row, in m_words, is separated by any number of blanks.
 RowReader::Form RowReader::formOfWords(const char* behind) {
     const std::size_t width = m_layout.columns.size();
     const std::size_t found = m_words.size();
     if (found < width && completedByNextLines(behind)) {
-        m_notes.add("Rows run on over several lines.");
+        m_notes.add("Rows continue over several lines.");
         return Form::Stream;
     }
     if (m_header.fieldCount != found && holdSeveralRows()) {
-        m_notes.add("Some lines hold several rows.");
+        m_notes.add("Some lines contain several rows.");
         return Form::Stream;
     }
     return Form::Lines;
 }
 
-/// Words of a line that are looked at; beyond them no line makes sense.
+/// Maximum number of words in a line; longer lines are invalid.
 std::size_t RowReader::mostWords() const {
     return std::max(2 * m_layout.columns.size(), maxCgatsColumns) + surplusWords;
 }
 
-/// True if semicolons or commas give the row that blanks don't, though the names don't show it.
+/// True if semicolons or commas, but not blanks, give a whole row, although not used by the names.
 bool RowReader::cellsBySpreadsheet(std::string_view row) {
     splitWords(row, *m_chars, mostWords(), m_words);
     if (m_chars != &blanksSeparate || m_words.size() >= m_layout.columns.size()) {
@@ -238,7 +238,7 @@ bool RowReader::cellsBySpreadsheet(std::string_view row) {
     return false;
 }
 
-/// True if the lines from `at` on bring m_words to exactly one row, at a line end.
+/// True if the lines from `at` on complete m_words to exactly one row, at a line end.
 bool RowReader::completedByNextLines(const char* at) {
     const std::size_t width = m_layout.columns.size();
     const std::size_t have = m_words.size();
@@ -262,8 +262,8 @@ bool RowReader::completedByNextLines(const char* at) {
     return false;
 }
 
-/// True if a first row with more cells than names belongs to columns whose names were lost: the
-/// header counts them, or the next row has as many and no name with blanks explains it.
+/// True if a first row with more cells than names belongs to columns with lost names: the header
+/// counts them, or the next row has as many and no name with blanks explains it.
 bool RowReader::namesAreLost(const char* behind) const {
     if (!allNumbers(m_words.data()) || m_header.fieldCount == m_layout.columns.size()) {
         return false;
@@ -281,7 +281,7 @@ bool RowReader::namesAreLost(const char* behind) const {
     return words.size() == m_words.size() && joinedNames().empty();
 }
 
-/// Goes to the first sign of the next cell, or to where there is none.
+/// Moves to the first character of the next cell, or to the place of a missing one.
 template<RowReader::Form form>
 inline const char* RowReader::toCell(const char* at, bool isFirst) const {
     const CharTable& chars = *m_chars;
@@ -307,8 +307,8 @@ inline const char* RowReader::toCell(const char* at, bool isFirst) const {
     return at;
 }
 
-/// Reads the row at hand in one pass. False if it needs care or, in a stream, breaks off; then
-/// nothing has moved.
+/// Reads the current row in one pass. False if it needs careful parsing or, in a stream, is
+/// incomplete; then nothing has moved.
 template<RowReader::Form form>
 bool RowReader::quickRow() {
     const CharTable& chars = *m_chars;
@@ -353,7 +353,7 @@ bool RowReader::quickRow() {
     return true;
 }
 
-/// A stream has no lines that could be looked at once more: there a text counts at once.
+/// A stream can't be parsed again by lines, so text in place of a number is final.
 template<RowReader::Form form>
 inline bool RowReader::quickNumber(const char*& at, std::size_t slot) {
     if (m_numbers.readPlain(at, m_end, m_values[slot])) {
@@ -371,8 +371,8 @@ inline bool RowReader::quickNumber(const char*& at, std::size_t slot) {
     return true;
 }
 
-/// Reads the line at hand in every way that makes a row of it: cells between strict separators,
-/// words, several rows, a name with blanks, a remark behind the last cell, missing last cells.
+/// Tries all ways to read the current line as rows: cells between strict separators, words, several
+/// rows, a name with blanks, a remark after the last cell, missing last cells.
 Failure RowReader::carefulRow() {
     const std::string_view line = lineAtHand();
     m_at = line.data() + line.size();
@@ -392,7 +392,7 @@ Failure RowReader::carefulRow() {
         m_ended = true;
     }
     if (m_words.size() < width) {
-        // Only what nobody needs may be missing at the end of a row.
+        // Only cells that are not needed may be missing at the end of a row.
         const bool needed = std::any_of(
             m_layout.columns.begin() + static_cast<std::ptrdiff_t>(m_words.size()),
             m_layout.columns.end(), [](const Column& c) { return c.kind == Column::Number; });
@@ -412,7 +412,7 @@ Failure RowReader::carefulRow() {
             if (!remark || !allNumbers(m_words.data())) {
                 return Failure::Damaged;
             }
-            m_notes.add("Words behind the last cell of a row are skipped.");
+            m_notes.add("Words after the last cell of a row are skipped.");
         }
     }
     place(m_words.data());
@@ -420,7 +420,7 @@ Failure RowReader::carefulRow() {
     return Failure::None;
 }
 
-/// Splits the row by its strict separator. True if this gives one cell for each column.
+/// Splits the row by its strict separator. True if this gives one cell per column.
 bool RowReader::cellsBySeparator(std::string_view row) {
     const std::size_t width = m_layout.columns.size();
     if (row.find(m_chars->cellSeparator()) == std::string_view::npos) {
@@ -435,8 +435,8 @@ bool RowReader::cellsBySeparator(std::string_view row) {
     return m_words.size() == width;
 }
 
-/// The cells of a row with more words than cells whose name or id has blanks; empty if it is not
-/// such a row: all numbers must fall into place, and numbers alone are no name.
+/// The cells of a row with more words than columns, if a name or id contains blanks. Empty
+/// otherwise: all numbers must fit, and a name can't consist of numbers only.
 std::vector<Word> RowReader::joinedNames() const {
     const auto surplus = static_cast<std::ptrdiff_t>(m_words.size() - m_layout.columns.size());
     for (const Column::Kind kind : {Column::Name, Column::Id}) {
@@ -463,7 +463,7 @@ std::vector<Word> RowReader::joinedNames() const {
     return {};
 }
 
-/// True if the words are two rows or more.
+/// True if the words form two or more rows.
 bool RowReader::holdSeveralRows() const {
     const std::size_t width = m_layout.columns.size();
     bool numbers = m_words.size() >= 2 * width && m_words.size() % width == 0;
@@ -481,11 +481,11 @@ Failure RowReader::appendSeveralRows() {
         place(m_words.data() + first);
         append();
     }
-    m_notes.add("Some lines hold several rows.");
+    m_notes.add("Some lines contain several rows.");
     return Failure::None;
 }
 
-/// True if every cell that is to be a number is one. REQUIRES: a word for every column.
+/// True if every number cell is a number. REQUIRES: a word for every column.
 bool RowReader::allNumbers(const Word* cells) const {
     for (const Column& column : m_layout.columns) {
         if (column.kind == Column::Number &&
@@ -497,8 +497,8 @@ bool RowReader::allNumbers(const Word* cells) const {
     return true;
 }
 
-/// Puts cells into the row's values. What is no number is counted: whether that ruins a group of
-/// columns is for the whole table to say.
+/// Stores cells in the row's values. Invalid numbers are counted; the whole table decides whether
+/// they invalidate a group of columns.
 void RowReader::place(const Word* cells) {
     for (const Column& column : m_layout.columns) {
         const Word& cell = *cells++;
@@ -554,8 +554,8 @@ void RowReader::append() {
     }
 }
 
-/// Holds the rows against the counts of the header. A count that lies is noted and the rows rule,
-/// but rows that just stop are the mark of a text that was cut off.
+/// Checks the rows against the header's counts. A wrong count is noted, and the actual rows are
+/// used. But missing rows at the end mean a truncated text.
 Failure RowReader::checkEnd() {
     const std::size_t rows = m_set.patchCount;
     if (!m_ended && m_header.hasBegin) {
@@ -563,15 +563,15 @@ Failure RowReader::checkEnd() {
         if (m_header.setCount != rows || !lineIsWhole) {
             return Failure::Damaged;
         }
-        m_notes.add("END_DATA is missing; the number of rows is the one stated.");
+        m_notes.add("END_DATA is missing, but the number of rows is as stated.");
     }
     if (m_header.setCount && *m_header.setCount != rows) {
-        m_notes.add("NUMBER_OF_SETS says " + std::to_string(*m_header.setCount) + ", there are " +
-                    counted(rows, "rows: the rows count."));
+        m_notes.add("NUMBER_OF_SETS is " + std::to_string(*m_header.setCount) + ", but there are " +
+                    counted(rows, "rows, which are used."));
     }
     if (m_header.fieldCount && *m_header.fieldCount != m_layout.columns.size()) {
-        m_notes.add("NUMBER_OF_FIELDS says " + std::to_string(*m_header.fieldCount) +
-                    ", there are " + counted(m_layout.columns.size(), "columns."));
+        m_notes.add("NUMBER_OF_FIELDS is " + std::to_string(*m_header.fieldCount) +
+                    ", but there are " + counted(m_layout.columns.size(), "columns."));
     }
     return Failure::None;
 }
@@ -584,8 +584,8 @@ std::size_t RowReader::unreadableIn(const Group& group) const {
     return sum;
 }
 
-/// A group of columns that holds no number at all counts as absent. One that holds some can't be
-/// used, nor left out without hiding a fault.
+/// A group of columns without any number counts as absent. A group with some numbers can't be used,
+/// and leaving it out would hide an error.
 Failure RowReader::dropUnreadableGroups() {
     DataSet& set = m_set;
     const auto dropDevice = [&] {
@@ -604,7 +604,7 @@ Failure RowReader::dropUnreadableGroups() {
         if (unreadable == 0 || unreadable != group.count * set.patchCount) {
             return;
         }
-        m_notes.add(std::string(name) + " columns hold no numbers.");
+        m_notes.add(std::string(name) + " columns contain no numbers.");
         left -= unreadable;
         dropped = true;
         clear();

@@ -14,7 +14,7 @@
 
 namespace colour::cgats {
 
-/// What a reader had to assume or mend: each remark once, and no more than a person reads.
+/// Assumptions and repairs of a reader: each remark once, and only as many as a person reads.
 class Notes {
   public:
     void add(std::string note);
@@ -24,17 +24,17 @@ class Notes {
     std::vector<std::string> m_notes;
 };
 
-/// One table as the file has it: scales are not decided, nothing is derived.
+/// One table as in the file: scales are not determined and nothing is derived yet.
 struct Table {
-    DataSet set; ///< Rows and columns alone; no header texts.
+    DataSet set; ///< Only rows and columns; no header texts.
     SpectralUnit unit = SpectralUnit::Unstated;
     bool unevenSpectra = false;
     TableKind kind = TableKind::Patches;
 };
 
-/// What the header said of the rows.
+/// Information on the rows from the header.
 struct TableHeader {
-    std::vector<std::string> names; ///< One at least.
+    std::vector<std::string> names; ///< At least one.
     const CharTable* chars = &blanksSeparate;
     std::optional<unsigned long long> fieldCount;
     std::optional<unsigned long long> setCount;
@@ -44,22 +44,22 @@ struct TableHeader {
 /// Reads the rows of one table, up to END_DATA or the end of the text.
 class RowReader {
   public:
-    /// `text` is the whole text, `ascii` whether it is ASCII throughout. All arguments outlive the
-    /// reader.
+    /// `text` is the whole text; `ascii` tells whether all of it is ASCII. All arguments must
+    /// outlive the reader.
     RowReader(std::string_view text, bool ascii, const TableHeader& header, const CgatsWants& wants,
               Notes& notes);
 
-    /// Reads the rows that start at `at`, which is behind END_DATA afterwards.
+    /// Reads the rows that start at `at` and moves `at` past END_DATA.
     Failure read(const char*& at, Table& table);
 
   private:
     enum class Form {
-        Lines, ///< A row is a line, blanks and tabs in any number part its cells.
-        Cells, ///< A row is a line, each separator ends a cell, so that cells can be empty.
-        Stream ///< Rows run on over line ends: only the number of cells parts them.
+        Lines, ///< A row is a line; any number of blanks and tabs separates cells.
+        Cells, ///< A row is a line; each separator ends a cell, so cells can be empty.
+        Stream ///< Rows ignore line ends; only the number of cells separates them.
     };
 
-    // The first row settles how the others are read.
+    // Based on the first row.
     Form inspectFirstRow();
     Form formOfWords(const char* behind);
     std::size_t mostWords() const;
@@ -69,7 +69,7 @@ class RowReader {
     void useNames(const std::vector<std::string>& names, const std::vector<double>& firstRow);
     void reserveRows();
 
-    // Each row.
+    // For each row.
     Failure readRows(Form form);
     bool findRow();
     bool takeEndOfData();
@@ -90,7 +90,7 @@ class RowReader {
     std::string textOf(const Word& word) const;
     void append();
 
-    // All rows together.
+    // After all rows.
     Failure checkEnd();
     std::size_t unreadableIn(const Group& group) const;
     Failure dropUnreadableGroups();
@@ -101,22 +101,22 @@ class RowReader {
     const CgatsWants& m_wants;
     Notes& m_notes;
 
-    const char* m_begin = nullptr; ///< Where the rows begin.
-    const char* m_at = nullptr;    ///< The row at hand, or behind the last one.
-    bool m_ended = false;          ///< END_DATA was met.
+    const char* m_begin = nullptr; ///< Start of the rows.
+    const char* m_at = nullptr;    ///< The current row, or the end of the last one.
+    bool m_ended = false;          ///< END_DATA was found.
     const CharTable* m_chars;
     NumberReader m_numbers;
     Layout m_layout;
     DataSet m_set;
-    std::vector<std::size_t> m_unreadable; ///< Cells that are no number, by slot.
+    std::vector<std::size_t> m_unreadable; ///< Cells that are not numbers, by slot.
     bool m_wavelengthsDiffer = false;
 
-    // The row at hand.
+    // The current row.
     std::vector<double> m_values;
     Word m_id;
     Word m_name;
     std::vector<Word> m_words;
-    std::string m_unwrapped; ///< A line that stood in quotes; m_words point into it.
+    std::string m_unwrapped; ///< An unquoted line; m_words point into it.
 };
 
 } // namespace colour::cgats

@@ -14,21 +14,21 @@ namespace colour::cgats {
 
 namespace {
 
-// Largest values of a column that is scaled 0 to 1. Brightened paper reflects up to 1.3 where it is
-// bluest and fluorescent inks more; its Z stays below 1.1.
+// Maximum values of a column with the scale 0 to 1. Brightened paper reflects up to 1.3 at its
+// bluest wavelengths, and fluorescent inks more; its Z stays below 1.1.
 constexpr double largestXyzOfOne = 1.2;
 constexpr double largestReflectance = 2.0;
 
-// Rounded device values go slightly beyond their end.
+// Rounded device values can slightly exceed their range.
 constexpr double largestPercent = 101;
 constexpr double largestByte = 255.5;
-constexpr double smallestWord = 4096; ///< A 16-bit chart has an entry above this.
+constexpr double smallestWord = 4096; ///< A 16-bit chart has a value above this.
 constexpr double largestWord = 65535.5;
 
-/// No colour and no device value is larger; sums and squares of such numbers stay finite.
+/// Limit of all colour and device values. Sums and squares of such numbers stay finite.
 constexpr double largestValue = 1e9;
 
-/// Rows that are compared to tell two scales apart; spread over the whole table.
+/// Number of rows compared to determine a scale, spread over the whole table.
 constexpr std::size_t comparedRows = 4096;
 
 bool isZero(const Lab& lab) {
@@ -66,8 +66,8 @@ bool holdsPatches(const Table& table) {
 
 // Joining ------------------------------------------------------------------------------------
 
-/// For each row of `first` the row of `next` with the same label, the k-th of equal labels for the
-/// k-th. Empty if the labels are not the same ones.
+/// For each row of `first`, the row of `next` with the same label; equal labels are paired in
+/// order. Empty if the labels differ.
 std::vector<std::size_t> matchLabels(const std::vector<std::string>& first,
                                      const std::vector<std::string>& next) {
     std::vector<std::size_t> rows(first.size());
@@ -75,7 +75,7 @@ std::vector<std::size_t> matchLabels(const std::vector<std::string>& first,
     if (first == next) {
         return rows;
     }
-    // A chain of equal labels for each label, in the order of the rows.
+    // For each label, a chain of its rows, in their order.
     std::unordered_map<std::string_view, std::size_t> heads;
     std::vector<std::size_t> following(next.size());
     for (std::size_t row = next.size(); row-- > 0;) {
@@ -94,8 +94,7 @@ std::vector<std::size_t> matchLabels(const std::vector<std::string>& first,
     return rows;
 }
 
-/// For each row of `first` the row of `next` that is the same patch; empty if they are not the same
-/// patches.
+/// For each row of `first`, the row of `next` with the same patch. Empty if the patches differ.
 std::vector<std::size_t> matchRows(const DataSet& first, const DataSet& next) {
     if (first.patchCount != next.patchCount) {
         return {};
@@ -124,7 +123,7 @@ std::vector<std::size_t> matchRows(const DataSet& first, const DataSet& next) {
     return rows;
 }
 
-/// Takes `width` values a row over where there are none yet. True if there were any to take.
+/// Moves `width` values per row to `target` if it is empty. True if there were any to move.
 template<typename T>
 bool takeColumns(std::vector<T>& target, std::vector<T>& source,
                  const std::vector<std::size_t>& rows, std::size_t width) {
@@ -195,7 +194,7 @@ void appendRows(DataSet& set, DataSet& more) {
 
 // Scales -------------------------------------------------------------------------------------
 
-/// Y, of 100, that belongs to an L* (CIE 15).
+/// Y, of 100, for an L* (CIE 15).
 double luminanceOf(double lightness) {
     return xyzFromLab({lightness, 0, 0}).Y;
 }
@@ -204,7 +203,7 @@ std::size_t strideOver(std::size_t rows) {
     return std::max<std::size_t>(1, rows / comparedRows);
 }
 
-/// The sum of Y of the compared rows, of 100, as Lab or else XYZ state it; 0 if neither does.
+/// The sum of Y, of 100, of the compared rows, from Lab or else XYZ; 0 if there is neither.
 double statedLuminance(const DataSet& set) {
     double sum = 0;
     for (std::size_t row = 0; row < set.patchCount; row += strideOver(set.patchCount)) {
@@ -285,22 +284,22 @@ void scaleDevice(DataSet& set, ScaleHint hint, Notes& notes) {
         full = 65535;
     } else if (largest > largestByte) {
         notes.add("Device values go up to " + std::to_string(std::lround(largest)) +
-                  " and are taken as they stand.");
+                  " and are used unchanged.");
     }
     if (full == 100) {
         return;
     }
     for (double& value : set.device) {
         value =
-            value * 100 / full; // in this order 255 gives 100, and what percents gave comes back
+            value * 100 / full; // in this order 255 gives 100, and percents are restored exactly
     }
     notes.add("Device values are taken as 0 to " + std::to_string(std::lround(full)) + ".");
 }
 
 // Derived values -----------------------------------------------------------------------------
 
-/// Values that are zero throughout, beside others that are not, were never measured: a store that
-/// lacks them leaves zeros.
+/// If all values of a column are zero and other columns have values, it was not measured: stores
+/// without a value write zeros.
 void dropZeroColumns(DataSet& set, Notes& notes) {
     const bool lab = !set.lab.empty() && !allZero(set.lab);
     const bool xyz = !set.xyz.empty() && !allZero(set.xyz);

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// CGATS text, as it should be:
+// Correct CGATS text:
 //
 //     CGATS.17
-//     ORIGINATOR "Printing house"          standard keywords need no declaration
-//     KEYWORD "MEASUREMENT_CONDITION"      others do
+//     ORIGINATOR "Printing house"          standard keyword: no declaration
+//     KEYWORD "MEASUREMENT_CONDITION"      others need one
 //     MEASUREMENT_CONDITION "M1"
 //     NUMBER_OF_FIELDS 8
 //     BEGIN_DATA_FORMAT
@@ -14,9 +14,9 @@
 //     1 0 0 0 0 95.0 0.0 -2.0
 //     END_DATA
 //
-// and all of it may be missing, doubled, wrong or quoted but the names of the columns and the rows.
-// This file reads the header and finds the tables; CgatsRows.cpp reads a table, CgatsTables.cpp
-// makes one data set of them.
+// Everything except the column names and the rows may be missing, repeated, wrong or quoted. This
+// file reads the header and finds the tables. CgatsRows.cpp reads a table, CgatsTables.cpp combines
+// them into one data set.
 #include "colour/CgatsText.h"
 
 #include <algorithm>
@@ -37,8 +37,8 @@ namespace {
 
 using namespace cgats;
 
-/// So much of a header, in bytes, is searched for keywords and for a line of names that no
-/// BEGIN_DATA_FORMAT announces.
+/// Size of the header, in bytes, that is searched for keywords and for a line of names without
+/// BEGIN_DATA_FORMAT.
 constexpr std::size_t searchedHeader = std::size_t{1} << 20;
 
 constexpr std::string_view firstWords[] = {"CGATS", "IT8.", "ISO28178", "CTI1",
@@ -62,7 +62,7 @@ constexpr std::string_view knownKeywords[] = {
     "WEIGHTING_FUNCTION",
 };
 
-/// Goes through the lines of a header: neither blank nor comment, without blanks in front.
+/// Iterates over header lines, without blank lines, comments and leading blanks.
 class Lines {
   public:
     explicit Lines(std::string_view text) : m_at(text.data()), m_end(m_at + text.size()) {}
@@ -100,7 +100,7 @@ std::string_view firstWordOf(std::string_view line) {
     return takeWord(at, line.data() + line.size(), anySeparates).text;
 }
 
-/// Where a line has a word, in either case, that stands alone; npos without one.
+/// Position of a separate word in a line, ignoring case; npos if there is none.
 std::size_t findWord(std::string_view line, std::string_view word) {
     const auto isPart = [](char c) { return anySeparates.isPlain(c) && c != '"'; };
     for (std::size_t at = 0; at + word.size() <= line.size(); ++at) {
@@ -123,11 +123,11 @@ bool isStructure(std::string_view word) {
     return false;
 }
 
-/// The names of columns that some lines hold, and what separates them.
+/// Column names found in some lines, and their separator.
 struct NameList {
     std::vector<std::string> names;
     const CharTable* chars = &blanksSeparate;
-    std::vector<std::string> others; ///< The same line parted in the other way, if that differs.
+    std::vector<std::string> others; ///< The line split the other way, if that differs.
 };
 
 std::size_t knownNames(const std::vector<std::string>& names) {
@@ -152,7 +152,7 @@ void dropEmptyEnd(std::vector<Word>& cells) {
     }
 }
 
-/// What separates the names of a line: that which gives the most names that mean something.
+/// The separator of a line of names: the one that gives the most meaningful names.
 const CharTable* separatorOf(std::string_view line) {
     const CharTable* best = &blanksSeparate;
     if (line.find_first_of(",;") == std::string_view::npos) {
@@ -171,7 +171,7 @@ const CharTable* separatorOf(std::string_view line) {
     return best;
 }
 
-/// Adds the names of one line. False if there are more than may be.
+/// Adds the names of one line. False if the limit is exceeded.
 bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount, NameList& list) {
     std::string inner;
     if (unwrapLine(line, inner)) {
@@ -191,8 +191,8 @@ bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount
         return true;
     }
 
-    // Names may have blanks in them: tabs alone part them if that gives the count stated, or names
-    // that mean more. The rows may decide otherwise.
+    // Names may contain blanks: only tabs separate them if that gives the stated count, or names
+    // with more meanings. The rows may override this.
     list.others.clear();
     if (isFirst && splitCells(line, *list.chars, room, words)) {
         dropEmptyEnd(words);
@@ -209,7 +209,7 @@ bool addLine(std::string_view line, std::optional<unsigned long long> fieldCount
     return true;
 }
 
-/// The names in a line that nothing announces, or none if they are not surely names.
+/// The names in a line without BEGIN_DATA_FORMAT. Empty unless they are certainly names.
 NameList unannouncedNames(std::string_view line) {
     NameList list;
     if (!addLine(line, std::nullopt, list) || list.names.size() < 3 ||
@@ -219,7 +219,7 @@ NameList unannouncedNames(std::string_view line) {
     return list;
 }
 
-/// True if a line looks like a row: numbers for the most part.
+/// True if a line looks like a row: mostly numbers.
 bool isRow(std::string_view line, const CharTable& chars) {
     std::vector<Word> words;
     splitWords(line, chars, maxCgatsColumns, words);
@@ -229,7 +229,7 @@ bool isRow(std::string_view line, const CharTable& chars) {
     return numbers >= 3 && 2 * static_cast<std::size_t>(numbers) >= words.size();
 }
 
-/// A count as it stands behind its keyword.
+/// A count from a keyword's value.
 std::optional<unsigned long long> countIn(const std::string& value) {
     unsigned long long count = 0;
     const auto [stop, error] = std::from_chars(value.data(), value.data() + value.size(), count);
@@ -239,7 +239,7 @@ std::optional<unsigned long long> countIn(const std::string& value) {
     return count;
 }
 
-/// Some exporters write the time of a date as a comment: CREATED "11/21/2026"  # Time: 09:15
+/// Some exporters write the time of a date as a comment: CREATED "11/21/2026" # Time: 09:15
 std::string timeBehind(std::string_view line) {
     constexpr std::string_view mark = "# Time:";
     constexpr std::size_t longest = 40;
@@ -249,13 +249,13 @@ std::string timeBehind(std::string_view line) {
     return at == line.npos || inQuotes ? "" : " " + toUtf8(line.substr(at, longest));
 }
 
-/// Reads one text from its first line to its last.
+/// Reads one text from beginning to end.
 class TextReader {
   public:
     TextReader(std::string_view text, const CgatsWants& wants)
         : m_text(text), m_lines(text), m_wants(wants), m_ascii(isAscii(text)) {}
 
-    /// On success `set` is whole; on failure it may hold anything.
+    /// On success, `set` is complete. On failure, it may contain anything.
     Failure read(DataSet& set);
 
   private:
@@ -273,15 +273,15 @@ class TextReader {
     bool m_ascii;
     Notes m_notes;
 
-    NameList m_names;       ///< Of the format at hand, else of the table before.
-    NameList m_unannounced; ///< Of a line that looks like names, until BEGIN_DATA tells.
+    NameList m_names;       ///< From the current format, or else from the previous table.
+    NameList m_unannounced; ///< From a line that looks like names, until BEGIN_DATA confirms it.
     bool m_hasFormat = false;
     std::optional<unsigned long long> m_fieldCount;
     std::optional<unsigned long long> m_setCount;
 
     std::size_t m_tables = 0;
     Table m_table;
-    DataSet m_texts; ///< Header texts alone.
+    DataSet m_texts; ///< Only header texts.
     std::string m_printConditions;
     ScaleHint m_scaleHint = ScaleHint::None;
     ConditionFinder m_conditions;
@@ -296,7 +296,7 @@ Failure TextReader::read(DataSet& set) {
         }
     }
     if (m_tables == 0) {
-        return Failure::Damaged; // breaks off before its rows
+        return Failure::Damaged; // truncated before its rows
     }
     if (const Failure failure = complete(m_table, m_scaleHint, m_wants, m_notes);
         failure != Failure::None) {
@@ -344,7 +344,7 @@ Failure TextReader::readLine(std::string_view line) {
     return Failure::None;
 }
 
-/// Reads the names from behind BEGIN_DATA_FORMAT on, in as many lines as there are.
+/// Reads the names after BEGIN_DATA_FORMAT, from any number of lines.
 Failure TextReader::readFormat(std::string_view line) {
     m_names = {};
     m_hasFormat = true;
@@ -358,7 +358,7 @@ Failure TextReader::readFormat(std::string_view line) {
             m_lines.moveTo(start);
             return Failure::None;
         }
-        const std::size_t end = findWord(line, "END_DATA_FORMAT"); // also behind the last name
+        const std::size_t end = findWord(line, "END_DATA_FORMAT"); // may also follow the last name
         if (!addLine(line.substr(0, end), m_fieldCount, m_names)) {
             return Failure::TooLarge;
         }
@@ -368,8 +368,8 @@ Failure TextReader::readFormat(std::string_view line) {
     }
 }
 
-/// Notices a line of names without BEGIN_DATA_FORMAT. Where rows follow at once, the text has no
-/// BEGIN_DATA either and the rows are read.
+/// Handles a line of names without BEGIN_DATA_FORMAT. If rows follow immediately, BEGIN_DATA is
+/// missing too, and the rows are read.
 Failure TextReader::seeUnannounced(std::string_view line) {
     const auto searched = static_cast<std::size_t>(line.data() - m_text.data()) + line.size();
     if (m_hasFormat || searched > searchedHeader) {
@@ -385,11 +385,11 @@ Failure TextReader::seeUnannounced(std::string_view line) {
     if (!ahead.next(next) || isStructure(firstWordOf(next)) || !isRow(next, *m_unannounced.chars)) {
         return Failure::None;
     }
-    m_notes.add("There is no BEGIN_DATA: the rows are taken to follow the names of the columns.");
+    m_notes.add("BEGIN_DATA is missing: the rows are assumed to follow the column names.");
     return readRows(line.data() + line.size(), false);
 }
 
-/// Settles the names of the columns for the rows behind BEGIN_DATA.
+/// Determines the column names for the rows after BEGIN_DATA.
 Failure TextReader::findNames(Lines& rows) {
     if (m_hasFormat) {
         return m_names.names.empty() ? Failure::Damaged : Failure::None;
@@ -407,17 +407,17 @@ Failure TextReader::findNames(Lines& rows) {
             m_names = std::move(names);
             rows = ahead;
         } else if (m_names.names.empty()) {
-            return Failure::Damaged; // nothing says what the columns are
+            return Failure::Damaged; // no column names anywhere
         } else {
-            return Failure::None; // as in the table before
+            return Failure::None; // same as in the previous table
         }
     }
-    m_notes.add("There is no BEGIN_DATA_FORMAT: a line of names serves as one.");
+    m_notes.add("BEGIN_DATA_FORMAT is missing: a line of column names replaces it.");
     return Failure::None;
 }
 
-/// A line of names that mixes blanks and tabs can be parted in two ways, and a wrong
-/// NUMBER_OF_FIELDS picks the wrong one. The cells of the first row decide.
+/// A line of names with blanks and tabs can be split in two ways, and a wrong NUMBER_OF_FIELDS
+/// selects the wrong one. The number of cells in the first row decides.
 void TextReader::letRowDecide(Lines rows) {
     std::string_view line;
     if (m_names.others.empty() || !rows.next(line)) {
@@ -467,7 +467,7 @@ Failure TextReader::readRows(const char* at, bool hasBegin) {
     return m_table.set.patchCount > maxCgatsPatches ? Failure::TooLarge : Failure::None;
 }
 
-/// Keeps what a data set has of its header. Of repeated keywords the first counts.
+/// Stores the header texts of a data set. The first of several equal keywords counts.
 void TextReader::seeHeader(const KeywordLine& line) {
     const auto keep = [&](std::string& text) {
         if (text.empty()) {
@@ -560,7 +560,7 @@ Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set)
             return failure;
         }
         if (!wants.spectra && result.hasColour() && isBlack(result)) {
-            // Where a store had neither Lab nor XYZ these are zeros, and the spectra tell.
+            // Stores without Lab and XYZ write zeros for them; then the spectra are used.
             DataSet withSpectra;
             if (TextReader(bytes, {}).read(withSpectra) == Failure::None && !isBlack(withSpectra)) {
                 result = std::move(withSpectra);

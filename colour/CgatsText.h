@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Reading CGATS.17 / IT8 text as it is met in the wild, and writing it as the standard has it.
+// Reads CGATS.17 / IT8 text as found in practice, and writes it as the standard specifies.
 #pragma once
 
 #include <cstddef>
@@ -12,47 +12,47 @@
 
 namespace colour {
 
-/// Beyond these a text is refused with TooLarge. They bound time and memory under hostile input.
+/// A text above these limits is TooLarge. They bound time and memory for hostile input.
 inline constexpr std::size_t maxCgatsBytes = std::size_t{4} << 30;
 inline constexpr std::size_t maxCgatsColumns = 4096;
 inline constexpr std::size_t maxCgatsPatches = 10'000'000;
 
-/// What a caller needs of a file; the reader skips the rest.
+/// The data that a caller needs; the reader skips the rest.
 struct CgatsWants {
-    bool spectra = true;     ///< False: spectra are kept only if they are the sole colour values.
-    bool calculated = false; ///< True: usable spectra take the place of stated colour values.
-    std::string condition = {}; ///< "M1": read this one of several that a file has (readCxf).
+    bool spectra = true;        ///< False: keep spectra only if they are the only colour values.
+    bool calculated = false;    ///< True: usable spectra replace stated colour values.
+    std::string condition = {}; ///< "M1": read this condition if a file has several (readCxf).
 };
 
-/// In all of this, text is UTF-8, Latin-1 or Windows-1252, or UTF-16 with a byte order mark.
+/// In these functions, text is UTF-8, Latin-1, Windows-1252, or UTF-16 with a byte order mark.
 
-/// True if the bytes could be CGATS text: no NUL, and a known first line, a keyword, or a format.
+/// True if the bytes may be CGATS text: no NUL, and a known first line, a keyword, or a format.
 bool looksLikeCgats(std::string_view bytes);
 
-/// Reads all tables of a text and joins them into one data set (columns of tables with the same
-/// rows are joined by id; a table that adds nothing is skipped).
+/// Reads all tables of a text and joins them into one data set. Columns of tables with the same
+/// rows are joined by id; a table that adds nothing is skipped.
 ///
-/// Rows stay in the text's order, repeated ids included. Scales are decided by whole columns. What
-/// had to be assumed or mended is in the set's notes, but a text that breaks off is Damaged:
-/// without END_DATA it must hold the stated number of rows, the last one with its line end.
+/// Rows keep the text's order, including repeated ids. Scales are determined from whole columns.
+/// The set's notes list assumptions and repairs. A truncated text is Damaged: without END_DATA it
+/// must have the stated number of rows, and the last row must have its line end.
 ///
-/// A text that states another illuminant than D50 or another observer than 2 degrees is read as if
-/// `wants.calculated` were true.
+/// If a text states an illuminant other than D50 or an observer other than 2 degrees, it is read as
+/// if `wants.calculated` were true.
 ///
-/// Gives a data set with colour values, device values, or both, all of them finite; which of them a
-/// caller needs is the caller's affair. On failure `set` is left as it was.
+/// The data set has colour values, device values, or both, all of them finite. The caller checks
+/// whether it has what it needs. On failure, `set` is unchanged.
 Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set);
 
-/// Value of a header keyword (in either case), UTF-8: the quoted text, else the rest of the line.
-/// The first line that begins with the keyword counts, KEYWORD lines don't; empty where it has no
-/// value.
+/// Value of a header keyword (upper or lower case), in UTF-8: the quoted text, or else the rest of
+/// the line. The first line that starts with the keyword counts; KEYWORD lines do not. Empty if the
+/// keyword has no value.
 ///
-/// The text may be incomplete, as definitions for measuring tools are: the keyword not declared or
-/// behind the format, counts that lie or are missing, no END_DATA.
+/// The text may be incomplete, like definitions for measuring tools: an undeclared keyword, or one
+/// after the format; wrong or missing counts; no END_DATA.
 std::optional<std::string> cgatsKeyword(std::string_view bytes, std::string_view keyword);
 
-/// Text of a data set: CGATS.17, LF, ids, device values, XYZ, Lab and spectra where there are any,
-/// written so that readCgats gives the same numbers again.
+/// Text of a data set: CGATS.17 with LF, ids, device values, and any XYZ, Lab and spectra, so that
+/// readCgats returns the same numbers.
 std::string writeCgats(const DataSet& set);
 
 } // namespace colour

@@ -10,7 +10,7 @@ namespace colour {
 
 namespace {
 
-/// Line ends would end a value, NULs the text: neither has a place in one.
+/// Line ends would end a value, and NULs the text, so values must not contain them.
 bool isForbidden(char c) {
     return c == '\n' || c == '\r' || c == '\0';
 }
@@ -26,7 +26,7 @@ void addQuoted(std::string& text, std::string_view value) {
     text += '"';
 }
 
-/// A word as it is where every reader takes it for one word, else in quotes.
+/// Writes a word unquoted if every reader parses it as one word, otherwise in quotes.
 void addWord(std::string& text, std::string_view word) {
     const bool simple = !word.empty() && std::all_of(word.begin(), word.end(), [](char c) {
         return (c >= '0' && c <= '9') || (c >= 'A' && c <= 'Z') || (c >= 'a' && c <= 'z') ||
@@ -39,7 +39,7 @@ void addWord(std::string& text, std::string_view word) {
     }
 }
 
-/// The shortest text that reads back as the same number.
+/// Writes the shortest text that gives the same number when read.
 void addNumber(std::string& text, double value) {
     char digits[32];
     const auto [end, error] = std::to_chars(digits, digits + sizeof digits, value);
@@ -64,7 +64,7 @@ void addHeader(std::string& text, const DataSet& set) {
     addHeaderText(text, "CREATED", set.created);
     addHeaderText(text, "INSTRUMENTATION", set.instrumentation);
     Conditions conditions = set.conditions;
-    if (set.calculated) { // the colours are no longer for what the source stated
+    if (set.calculated) { // the colours no longer match the source's stated conditions
         conditions.illuminant = "D50";
         conditions.observer = "2";
     }
@@ -78,12 +78,12 @@ void addHeader(std::string& text, const DataSet& set) {
         text += "KEYWORD \"MEASUREMENT_CONDITION\"\n";
         addHeaderText(text, "MEASUREMENT_CONDITION", conditions.measurement);
     }
-    // Dark or small sets would not tell their scales.
+    // Dark or small sets would not reveal their scales.
     text += "KEYWORD \"TINTGATE_SCALES\"\n"
             "TINTGATE_SCALES \"device 100, XYZ 100, spectra 1\"\n";
 }
 
-/// What of a data set goes into its text.
+/// The columns of a data set's text.
 struct Columns {
     explicit Columns(const DataSet& set)
         : ids(set.ids.size() == set.patchCount), names(set.names.size() == set.patchCount),

@@ -19,17 +19,17 @@ namespace colour {
 
 namespace {
 
-/// Of a pipe or device, which don't say how long they are.
+/// Limit for pipes and devices, which don't report their size.
 constexpr std::size_t maxStreamBytes = std::size_t{512} << 20;
 
-/// How long a pipe may stay silent.
+/// Maximum silence of a pipe.
 constexpr int patience = 30'000; // ms
 
-/// How long nobody may have a pipe open to write. A writer that starts together with the reader
-/// takes a moment.
+/// Maximum time without a writer of a pipe. A writer started together with the reader needs a
+/// moment.
 constexpr int patienceForWriter = 2'000; // ms
 
-/// Enough to tell whether the rest is worth reading.
+/// Enough to decide whether to read the rest.
 constexpr std::size_t headBytes = std::size_t{64} << 10;
 
 class Descriptor {
@@ -48,14 +48,14 @@ class Descriptor {
     int m_number;
 };
 
-/// What is read from, and how long to wait for it.
+/// What to read from, and how long to wait for it.
 struct Source {
     int descriptor;
     bool isStream;
-    bool awaitsWriter; ///< Nothing has shown yet that anybody has the pipe open to write.
+    bool awaitsWriter; ///< Nobody is known to have the pipe open for writing yet.
 };
 
-/// One read that waits for data but not for ever. Bytes read, 0 at the end, -1 for a failure.
+/// Reads once, with a limited wait for data. Returns the bytes read, 0 at the end, -1 on failure.
 ssize_t readSome(Source& source, char* target, std::size_t room) {
     while (true) {
         bool silent = false;
@@ -87,19 +87,19 @@ bool anything(std::string_view) {
     return true;
 }
 
-/// Text without NULs or a profile: all else need not be read to its end.
+/// Text without NULs or a profile: anything else need not be read to its end.
 bool textOrProfile(std::string_view head) {
     return looksLikeProfile(head) || isUtf16(head) ||
            std::memchr(head.data(), 0, head.size()) == nullptr;
 }
 
-/// NotRecognised where the first bytes are not worth the rest.
+/// NotRecognised if the first bytes show that the rest is not worth reading.
 Failure readBytes(const std::string& path, std::size_t limit, WorthReading worthReading,
                   std::string& bytes) {
     if (path.find('\0') != std::string::npos) {
         return Failure::Missing;
     }
-    // Without O_NONBLOCK the opening of a pipe waits for its other end.
+    // Without O_NONBLOCK, opening a pipe would wait for its other end.
     const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK | O_NOCTTY));
     if (file.number() < 0) {
         const bool missing = errno == ENOENT || errno == ENOTDIR || errno == ENAMETOOLONG;
@@ -140,7 +140,7 @@ Failure readBytes(const std::string& path, std::size_t limit, WorthReading worth
             break;
         }
         if (used == contents.size()) {
-            // One byte more than a file says, so that its end is seen without another growth.
+            // One byte more than the file's size, so that its end is found without growing again.
             const auto stated =
                 isStream ? std::size_t{0} : static_cast<std::size_t>(status.st_size);
             contents.resize(stated >= used ? stated + 1 : 2 * used);

@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A file that names colour: CGATS text, CxF3 or ICC profile, told apart by its bytes, never by its
-// name.
+// A file with colours: CGATS text, CxF3 or ICC profile, recognised by its bytes, never by its name.
 #pragma once
 
 #include <optional>
@@ -14,29 +13,29 @@
 
 namespace colour {
 
-/// Exactly one of the two is set after a successful load.
+/// After a successful load, exactly one of the two is set.
 struct ColourFile {
     std::optional<DataSet> set;
     std::optional<Profile> profile;
 };
 
-/// Loads the file at `path` (bytes as the file system has them). On failure `file` is untouched.
+/// Loads the file at `path` (bytes of the file system). On failure, `file` is unchanged.
 Failure loadColourFile(const std::string& path, const CgatsWants& wants, ColourFile& file);
 
-/// Loads the file at `path` as a profile; NotRecognised if it is anything else. It need not be read
-/// to its end for that. On failure `profile` may hold no profile.
+/// Loads the file at `path` as a profile. Anything else is NotRecognised, possibly before all of it
+/// is read. On failure, `profile` may be empty.
 Failure loadProfile(const std::string& path, Profile& profile);
 
-/// The same of a file's bytes.
+/// Same for the bytes of a file.
 Failure readColourFile(std::string_view bytes, const CgatsWants& wants, ColourFile& file);
 
-/// Whole contents of a file; Missing, Unreadable, TooLarge (above `limit`) or OutOfMemory. Devices
-/// and pipes are read to their end, but no more than 512 MB of them (TooLarge), and a pipe that
-/// stays silent for 30 seconds is Unreadable, and so is one that nobody opens to write within 2.
+/// Whole contents of a file. Fails with Missing, Unreadable, TooLarge (above `limit`) or
+/// OutOfMemory. Devices and pipes are read to their end, up to 512 MB (TooLarge). A pipe is
+/// Unreadable if it is silent for 30 seconds, or if nobody opens it for writing within 2 seconds.
 Failure readWholeFile(const std::string& path, std::size_t limit, std::string& bytes);
 
-/// True unless `path` is a regular file with contents of another kind than CGATS text. False for a
-/// regular file that can't be read.
+/// True unless `path` is a regular file with non-CGATS contents. False for an unreadable regular
+/// file.
 bool isEmptyOrCgats(const std::string& path);
 
 } // namespace colour

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A CxF3 file, as far as it is read:
+// The parts of a CxF3 file that are read:
 //
 //     <cc:CxF xmlns:cc="http://colorexchangeformat.com/CxF3-core">
 //       <cc:FileInformation><cc:Creator>...</cc:Creator>...</cc:FileInformation>
@@ -21,7 +21,7 @@
 //             <cc:MeasurementSpec><cc:WavelengthRange StartWL="380" Increment="10"/>
 //               <cc:Device>...<cc:DeviceIllumination>M1_Daylight</cc:DeviceIllumination>
 //
-// CxfXml.h parses, CxfObjects.h tells what there is; this file makes patches of it.
+// CxfXml.h parses the file, CxfObjects.h lists its objects, and this file converts them to patches.
 #include "colour/Cxf.h"
 
 #include <algorithm>
@@ -56,7 +56,7 @@ std::string counted(std::size_t count, const char* one, const char* many) {
     return std::to_string(count) + ' ' + (count == 1 ? one : many);
 }
 
-/// A patch, before its values are read. At least one of the two is set.
+/// A patch whose values have not been read yet. At least one of the two is set.
 struct Patch {
     const Object* device = nullptr;
     const Object* colour = nullptr;
@@ -68,7 +68,7 @@ std::string conditionName(int condition) {
     return condition == unstated ? "" : "M" + std::to_string(condition);
 }
 
-/// The condition whose values are read; `unstated` if the file states none.
+/// The condition whose values are read. `unstated` if the file states none.
 std::int8_t chosenCondition(const Content& content, const std::string& wanted,
                             cgats::Notes& notes) {
     bool stated[4] = {};
@@ -102,8 +102,8 @@ std::int8_t chosenCondition(const Content& content, const std::string& wanted,
     return chosen;
 }
 
-/// The best of an object's values of one kind: under the condition, then under none that is stated;
-/// among these for D50 and 2 degrees first. Null if there is none.
+/// The best of an object's values of one kind: first for the condition, then without a stated
+/// condition; within each, D50 and 2 degrees first. Null if there is none.
 const Value* valueOf(const Content& content, const Object& object, Value::Kind kind,
                      std::int8_t condition) {
     const Value* best = nullptr;
@@ -139,7 +139,7 @@ bool isUnder(const Content& content, const Object& object, std::int8_t condition
 using Objects = std::vector<const Object*>;
 using Labels = std::vector<std::string>;
 
-/// What may tell which measurement belongs to which target, the surest first.
+/// Labels that may identify the target of a measurement, most reliable kind first.
 Labels labelsOf(const Document& document, const Objects& objects, int kind) {
     Labels labels;
     labels.reserve(objects.size());
@@ -163,8 +163,8 @@ Labels labelsOf(const Document& document, const Objects& objects, int kind) {
 }
 constexpr int labelKinds = 4;
 
-/// For each measurement the index of the target of the same label, or -1. Nothing if a target has
-/// none, or two share one.
+/// For each measurement, the index of the target with the same label, or -1. Empty if a target has
+/// no label or shares it.
 std::vector<std::ptrdiff_t> joined(const Labels& targets, const Labels& measurements) {
     std::unordered_map<std::string_view, std::ptrdiff_t> byLabel;
     for (std::size_t i = 0; i < targets.size(); ++i) {
@@ -187,7 +187,7 @@ std::size_t partnerCount(const std::vector<std::ptrdiff_t>& partners) {
         partners.begin(), partners.end(), [](std::ptrdiff_t partner) { return partner >= 0; }));
 }
 
-/// Order counts only for targets without colours: beside others, a measurement may be of anything.
+/// Order counts only if no target has colours. Otherwise a measurement may belong to anything.
 std::vector<std::ptrdiff_t> bestJoin(const Document& document, const Objects& targets,
                                      const Objects& measurements, bool orderCounts,
                                      cgats::Notes& notes) {
@@ -209,11 +209,11 @@ std::vector<std::ptrdiff_t> bestJoin(const Document& document, const Objects& ta
     return best;
 }
 
-/// Joins device values and colours to patches.
+/// Joins device values and colours into patches.
 std::vector<Patch> patchesOf(const Document& document, const Content& content,
                              std::int8_t condition, cgats::Notes& notes) {
-    Objects targets;      // Device values, perhaps with colours.
-    Objects measurements; // Colours alone.
+    Objects targets;      // With device values, perhaps with colours.
+    Objects measurements; // Only colours.
     std::size_t complete = 0;
     for (const Object& object : content.objects) {
         if (object.hasDevice()) {
@@ -250,14 +250,14 @@ std::vector<Patch> patchesOf(const Document& document, const Content& content,
         if (!ofTarget[i].empty()) {
             if (targets[i]->hasColour()) {
                 notes.add("Objects with device values and colours have measurements of their own, "
-                          "which count.");
+                          "which are used.");
             }
             continue;
         }
         if (targets[i]->hasColour() && isUnder(content, *targets[i], condition)) {
             patches.push_back({targets[i], targets[i]});
         } else if (joinedCount + complete == 0) {
-            patches.push_back({targets[i], nullptr}); // A chart that nobody has measured.
+            patches.push_back({targets[i], nullptr}); // A chart that has not been measured.
         } else {
             ++unmeasured;
         }
@@ -282,7 +282,7 @@ class SetReader {
         : m_document(document), m_content(content), m_condition(condition), m_notes(notes),
           m_ascii(ascii) {}
 
-    /// On success the table is as a reader of CGATS text makes one: scales are not decided yet.
+    /// On success, the table is like one read from CGATS text: scales are not determined yet.
     Failure read(const std::vector<Patch>& patches, cgats::Table& table) {
         m_table = &table;
         table.set.patchCount = patches.size();
@@ -297,8 +297,8 @@ class SetReader {
         return failure;
     }
 
-    /// False if the colour values that count are stated for another light than D50 or another
-    /// observer than 2 degrees.
+    /// False if the colour values in use are stated for an illuminant other than D50 or an observer
+    /// other than 2 degrees.
     bool isUsual() const { return m_usual; }
 
   private:
@@ -356,7 +356,7 @@ class SetReader {
         return Failure::None;
     }
 
-    /// C, M, Y, K and inks by name. An ink that a patch does not name is not printed there.
+    /// C, M, Y, K and inks by name. If a patch does not name an ink, its amount is 0.
     Failure readInks(const std::vector<Patch>& patches, DeviceKind kind) {
         m_inks.clear();
         if (kind == DeviceKind::Cmyk) {
@@ -400,7 +400,7 @@ class SetReader {
         return Failure::None;
     }
 
-    /// Makes room for all inks behind the first `fixed` ones of each patch.
+    /// Makes room for all inks after the first `fixed` ones of each patch.
     void widenDevice(std::size_t fixed) {
         DataSet& set = m_table->set;
         std::vector<double> wide(set.patchCount * m_inks.size(), 0);
@@ -411,8 +411,8 @@ class SetReader {
         set.device = std::move(wide);
     }
 
-    /// Place of a named ink, which may be new. C, M, Y and K of the first `fixed` places are no
-    /// spot colours, whatever a spot colour is called.
+    /// Index of a named ink, added if new. C, M, Y and K at the first `fixed` places are not spot
+    /// colours, even if a spot colour has such a name.
     std::size_t inkNamed(const std::string& name, std::size_t fixed) {
         const auto start = m_inks.begin() + static_cast<std::ptrdiff_t>(fixed);
         const auto found = std::find(start, m_inks.end(), name);
@@ -423,7 +423,7 @@ class SetReader {
         return place;
     }
 
-    /// Inks that are all given by name are CMYK if the four are among them.
+    /// If all inks are given by name, they are CMYK if these four are among them.
     void nameChannels(DeviceKind kind) {
         DataSet& set = m_table->set;
         set.deviceSpace = DeviceSpace::Cmyk;
@@ -432,7 +432,7 @@ class SetReader {
         } else {
             set.channels.assign(std::begin(processNames), std::end(processNames));
         }
-        // As columns of CGATS text are named, so that the names survive there.
+        // Named like columns of CGATS text, so that the names survive there.
         for (std::size_t ink = set.channels.size(); ink < m_inks.size(); ++ink) {
             set.channels.push_back("SPOT_" + m_inks[ink]);
         }
@@ -562,8 +562,8 @@ class SetReader {
         return true;
     }
 
-    /// Where a file does not state the wavelengths, they are those that end with the visible light.
-    /// Step 0 if they can't be told.
+    /// If a file does not state the wavelengths, they are assumed to end with the visible range.
+    /// The step is 0 if that is not possible.
     SpectralAxis axisOf(const Value& value, std::size_t count) const {
         const auto length = static_cast<int>(std::min<std::size_t>(count, 100'000));
         const ColorSpecification* const colorSpecification = value.colorSpecification;
@@ -588,14 +588,14 @@ class SetReader {
         return {base, 0, length};
     }
 
-    /// What the values of one quantity are stated for.
+    /// The stated conditions of one quantity's values.
     struct Light {
         bool seen = false;
-        Conditions stated; ///< If any value is not for D50 and 2 degrees, the first such statement.
+        Conditions stated; ///< The first statement that is not D50 and 2 degrees, if any.
         const ColorSpecification* last = nullptr;
     };
 
-    /// Usual statements that differ (one value states D50, another one nothing) cancel out.
+    /// Usual statements that differ (one states D50, the other nothing) cancel out.
     void see(const Value& value, Light& light) {
         if (light.seen && value.colorSpecification == light.last) {
             return;
@@ -620,8 +620,8 @@ class SetReader {
         }
     }
 
-    /// The conditions of the colour values that count. L*a*b* and XYZ of a file can be stated for
-    /// different ones: those for D50 and 2 degrees serve alone then.
+    /// The conditions of the colour values in use. If L*a*b* and XYZ are stated for different ones,
+    /// only those for D50 and 2 degrees are used.
     Conditions settleLight() {
         DataSet& set = m_table->set;
         if (!set.lab.empty() && !set.xyz.empty() &&
@@ -646,7 +646,7 @@ class SetReader {
         return both;
     }
 
-    /// A quantity counts if every measured patch has it.
+    /// A quantity is used only if every measured patch has it.
     Failure settleColours(std::size_t measured) {
         DataSet& set = m_table->set;
         bool partial = false;
@@ -657,7 +657,7 @@ class SetReader {
             partial = true;
             clear();
             m_notes.add(std::string("Only ") + counted(count, "object has ", "objects have ") +
-                        name + ": it does not count.");
+                        name + ": it is ignored.");
         };
         settle(set.lab.size(), "L*a*b*", [&] { set.lab.clear(); });
         settle(set.xyz.size(), "XYZ", [&] { set.xyz.clear(); });
@@ -685,7 +685,7 @@ class SetReader {
 
     // Texts
 
-    /// Character references apart, text of an ASCII file is UTF-8 as it stands.
+    /// Except for character references, the text of an ASCII file is valid UTF-8 already.
     std::string labelOf(std::string_view text) const {
         return m_ascii ? std::string(text) : cgats::toUtf8(text);
     }

@@ -26,7 +26,7 @@ constexpr struct {
                    {"ColorRGB", DeviceKind::Rgb},
                    {"ColorCustom", DeviceKind::Custom}};
 
-/// 1 of M1_Daylight, M1_Measurement and the like.
+/// 1 from M1_Daylight, M1_Measurement and similar.
 std::int8_t conditionIn(std::string_view text) {
     const bool stated =
         text.size() > 2 && text[0] == 'M' && text[1] >= '0' && text[1] <= '3' && text[2] == '_';
@@ -54,7 +54,7 @@ class Reader {
 
     Content read() {
         const pugi::xml_node resources = m_document.child(m_document.root(), "Resources");
-        constexpr std::size_t elementsOfObject = 8; // Of a small one.
+        constexpr std::size_t elementsOfObject = 8; // Number of elements of a small object.
         m_content.objects.reserve(m_document.elementCount() / elementsOfObject);
         m_content.values.reserve(m_document.elementCount() / elementsOfObject);
         m_document.forEach(resources, "ColorSpecificationCollection", [&](pugi::xml_node all) {
@@ -106,7 +106,7 @@ class Reader {
         return colorSpecification;
     }
 
-    /// The illumination first: a filter for M2 or a polariser is mentioned beside it, too.
+    /// The illumination has priority: filters for M2 and polarisers are mentioned elsewhere too.
     std::int8_t measuredUnder(pugi::xml_node device) const {
         const std::int8_t condition = conditionIn(text(device, "DeviceIllumination"));
         if (condition != unstated) {
@@ -120,7 +120,7 @@ class Reader {
     }
 
     const ColorSpecification* specificationNamed(const char* id) {
-        // Nearly always that of the object before.
+        // Nearly always the same as for the previous object.
         if (m_lastId != id) {
             const auto found = m_content.specifications.find(id);
             m_last = found != m_content.specifications.end() ? &found->second : nullptr;
@@ -150,8 +150,8 @@ class Reader {
         }
     }
 
-    /// The numbers of children of these names, which are nearly always in this order. `next` is
-    /// what follows the last of them.
+    /// The numbers of the children with these names, usually in this order. `next` is the node
+    /// after the last of them.
     template<std::size_t N>
     bool numbers(pugi::xml_node parent, const std::array<Name, N>& names, double* values,
                  pugi::xml_node& next) {
@@ -262,13 +262,13 @@ class Reader {
     const std::array<Name, 3> m_rgbNames = named("R", "G", "B");
     const std::array<Name, 3> m_partNames[3] = {
         named("L", "A", "B"), named("L", "C", "H"),
-        named("X", "Y", "Z")}; ///< By Value::Kind, from Lab on.
+        named("X", "Y", "Z")}; ///< By Value::Kind, starting with Lab.
     std::array<Name, std::size(valueNames)> m_valueNames;
     std::array<Name, std::size(deviceNames)> m_deviceNames;
     cgats::NumberReader m_numbers{cgats::blanksSeparate};
     std::string m_storage;
     Content m_content;
-    std::string_view m_lastId = "\xFF"; // No attribute has this byte alone.
+    std::string_view m_lastId = "\xFF"; // No attribute consists of this byte.
     const ColorSpecification* m_last = nullptr;
 };
 

@@ -10,7 +10,7 @@
 namespace colour::cxf {
 namespace {
 
-constexpr std::string_view versionMark = "CxF3"; ///< In the namespace of all revisions of CxF 3.
+constexpr std::string_view versionMark = "CxF3"; ///< In the namespaces of all CxF 3 revisions.
 constexpr std::string_view rootName = "CxF";
 
 bool isBlank(char c) {
@@ -21,11 +21,11 @@ std::string_view localName(std::string_view name) {
     return name.substr(name.find(':') + 1);
 }
 
-/// The first quote or ">" of a tag, eight bytes at a time.
+/// The first quote or ">" of a tag; checks eight bytes at a time.
 const char* nextSign(const char* at, const char* end) {
     constexpr std::uint64_t ones = 0x0101010101010101;
     constexpr std::uint64_t tops = 0x8080808080808080;
-    // The top bit of every byte that is zero, exact up to the first of them.
+    // The top bit of every zero byte, exact up to the first one.
     const auto zeros = [](std::uint64_t word) { return (word - ones) & ~word & tops; };
     while (std::endian::native == std::endian::little && end - at >= 8) {
         std::uint64_t word = 0;
@@ -40,8 +40,8 @@ const char* nextSign(const char* at, const char* end) {
     return std::find_if(at, end, [](char c) { return c == '>' || c == '"' || c == '\''; });
 }
 
-/// Goes from tag to tag, past comments, CDATA sections and processing instructions. Whether the
-/// text is well-formed is for the parser to say.
+/// Iterates over tags and skips comments, CDATA sections and processing instructions. The parser
+/// checks whether the text is well-formed.
 class Tags {
   public:
     enum Kind { Start, End, Empty, Declaration, Broken, Nothing };
@@ -49,8 +49,8 @@ class Tags {
     explicit Tags(std::string_view text)
         : m_start(text.data()), m_at(m_start), m_end(m_start + text.size()) {}
 
-    /// The next tag; `name` is what follows the "<" of a start. Declaration is a document type and
-    /// its like.
+    /// The next tag; `name` is the text after the "<" of a start tag. Declaration is a document
+    /// type or similar.
     Kind next(std::string_view& name) {
         while (true) {
             const void* const found =
@@ -79,7 +79,7 @@ class Tags {
         }
     }
 
-    /// Where the last tag ended.
+    /// The end of the last tag.
     std::size_t at() const { return static_cast<std::size_t>(m_at - m_start); }
 
   private:
@@ -102,7 +102,7 @@ class Tags {
         return false;
     }
 
-    /// To the tag's '>': one in a quoted value is none.
+    /// Moves to the tag's '>', ignoring any in quoted values.
     Kind startTag(std::string_view& name) {
         const char* const start = m_at;
         while ((m_at = nextSign(m_at, m_end)) != m_end && *m_at != '>') {
@@ -126,8 +126,8 @@ class Tags {
     const char* m_end;
 };
 
-/// What must be known before a parser makes a tree of it. `endOfRootTag` is where the start tag of
-/// the root ends, `elements` their number.
+/// Checks before parsing. `endOfRootTag` is the end of the root's start tag, `elements` the number
+/// of elements.
 Failure checkStructure(std::string_view utf8, std::size_t& endOfRootTag, std::size_t& elements) {
     Tags tags(utf8);
     elements = 0;
@@ -163,7 +163,7 @@ Failure checkStructure(std::string_view utf8, std::size_t& endOfRootTag, std::si
     }
 }
 
-/// The namespace that a prefix (with its colon; empty for none) is bound to at a node.
+/// The namespace bound to a prefix (with its colon, or empty) at a node.
 std::string_view namespaceOf(pugi::xml_node node, std::string_view prefix) {
     std::string attribute = "xmlns";
     if (!prefix.empty()) {
@@ -201,7 +201,7 @@ bool hasRoot(std::string_view utf8) {
     Tags tags(utf8);
     std::string_view name;
     const Tags::Kind kind = tags.next(name);
-    if (kind == Tags::Declaration) { // Refused later, with a code of its own.
+    if (kind == Tags::Declaration) { // Refused later, with its own code.
         return utf8.find("<CxF") != utf8.npos || utf8.find(":CxF") != utf8.npos;
     }
     name = name.substr(0, name.find_first_of(" \t\r\n/"));
@@ -220,7 +220,7 @@ Failure Document::load(std::string_view utf8) {
         failure != Failure::None) {
         return failure;
     }
-    // The instance namespace of XML Schema, which roots declare as well, is no element's.
+    // Roots also declare the instance namespace of XML Schema, which no element uses.
     m_manyNamespaces = utf8.find("xmlns", endOfRootTag) != utf8.npos ||
                        declarationsIn(utf8.substr(0, endOfRootTag)) > 1;
     constexpr unsigned flags = pugi::parse_cdata | pugi::parse_escapes |

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// XML of colour exchange files: checked before it is parsed, and its elements known by namespace.
+// XML of colour exchange files, checked before it is parsed. Elements are identified by namespace.
 #pragma once
 
 #include <cstring>
@@ -13,27 +13,27 @@
 
 namespace colour::cxf {
 
-/// Beyond these a file is refused. The parser's tree takes about 50 bytes for each element.
+/// A file above these limits is refused. The parser's tree takes about 50 bytes per element.
 inline constexpr std::size_t maxBytes = std::size_t{1} << 30;
 inline constexpr std::size_t maxElements = 20'000'000;
 inline constexpr int maxDepth = 64; ///< The format needs about ten.
 
-/// True if the root element is named CxF, in whatever namespace.
+/// True if the root element is named CxF, in any namespace.
 bool hasRoot(std::string_view utf8);
 
-/// The name of an element as one document spells it. Made once and compared often.
+/// An element's name as spelled in one document. Created once and compared often.
 class Name {
   private:
     friend class Document;
-    std::string m_whole; ///< With the root's prefix.
+    std::string m_whole; ///< Includes the root's prefix.
     std::string_view m_local;
 };
 
 /// A parsed file. Nodes live as long as the document.
 class Document {
   public:
-    /// TooLarge, XmlRefused (a document type, or nested too deeply), Damaged (not well-formed),
-    /// NotRecognised (another root, or a version of the format that is not known) or OutOfMemory.
+    /// Fails with TooLarge, XmlRefused (a document type, or too deep nesting), Damaged (not
+    /// well-formed), NotRecognised (another root, or unknown version) or OutOfMemory.
     Failure load(std::string_view utf8);
 
     pugi::xml_node root() const { return m_root; }
@@ -48,13 +48,13 @@ class Document {
         const bool same = std::strcmp(node.name(), name.m_whole.c_str()) == 0;
         return m_manyNamespaces ? resolvesTo(node, name) : same;
     }
-    /// The first such child; null if there is none.
+    /// The first such child, or null.
     pugi::xml_node child(pugi::xml_node parent, const Name& name) const;
     pugi::xml_node child(pugi::xml_node parent, std::string_view local) const {
         return child(parent, name(local));
     }
 
-    /// Calls `take(child)` for each child element in the root's namespace that has the local name.
+    /// Calls `take(child)` for each child element with this local name in the root's namespace.
     template<class Take>
     void forEach(pugi::xml_node parent, std::string_view local, const Take& take) const {
         forEach(parent, name(local), take);
@@ -74,16 +74,16 @@ class Document {
     pugi::xml_document m_document;
     pugi::xml_node m_root;
     std::size_t m_elementCount = 0;
-    std::string m_prefix; ///< Of the root, with its colon.
+    std::string m_prefix; ///< The root's prefix with its colon.
     std::string m_namespace;
-    bool m_manyNamespaces = false; ///< There is a second declaration of a namespace.
+    bool m_manyNamespaces = false; ///< There is more than one namespace declaration.
 };
 
-/// The whole text of an element: comments and CDATA sections split it into several nodes. The view
-/// points into the document or into `storage`.
+/// The whole text of an element, which comments and CDATA sections split into several nodes. The
+/// view points into the document or into `storage`.
 std::string_view textOf(pugi::xml_node element, std::string& storage);
 
-/// The text as a finite number, blanks around it allowed; nothing for any other.
+/// The text as a finite number, with optional blanks around it. Nothing for any other text.
 std::optional<double> numberOf(std::string_view text);
 
 } // namespace colour::cxf

@@ -10,7 +10,7 @@ namespace {
 
 constexpr double radians = std::numbers::pi / 180;
 
-// White of the ICC profile connection space, which print data and colour tools divide by. (The sums
+// White of the ICC profile connection space, as used for print data and by colour tools. (The sums
 // of the ASTM weights, 96.422 and 82.521, differ by up to 0.02 in b*.)
 constexpr Xyz white{96.42, 100.0, 82.49};
 
@@ -26,7 +26,7 @@ double chroma(const Lab& lab) {
     return std::sqrt(lab.a * lab.a + lab.b * lab.b);
 }
 
-/// A colour in the plane of a* and b*, or of a' and b'.
+/// A colour in the a*b* plane or the a'b' plane.
 struct Plane {
     double a;
     double b;
@@ -39,8 +39,8 @@ Plane planeOf(const Lab& lab) {
 
 /// Delta H with its sign: 2 sqrt(C1 C2) sin((h2 - h1) / 2), the hue step taken the short way round.
 ///
-/// Worked out from cross and dot product, with no angle and without the cancellation of
-/// sqrt(dE^2 - dL^2 - dC^2). Exactly opposite hues, where both ways are as long, go from h1 to h2
+/// Computed from cross and dot product, without angles and without the cancellation of sqrt(dE^2 -
+/// dL^2 - dC^2). For exactly opposite hues, both ways are equally long; the step goes from h1 to h2
 /// without passing 0.
 double hueStep(const Plane& first, const Plane& second) {
     const double chromas = first.chroma * second.chroma;
@@ -57,8 +57,8 @@ double hueStep(const Plane& first, const Plane& second) {
     return backwards ? -step : step;
 }
 
-/// Direction of the mean hue as cosine and sine: the bisector of the smaller angle. A colour
-/// without a hue leaves the other's.
+/// Direction of the mean hue as cosine and sine: the bisector of the smaller angle. If one colour
+/// has no hue, it is the other's.
 void meanHue(const Plane& first, const Plane& second, double step, double& cosine, double& sine) {
     double x = first.a + second.a;
     double y = first.b + second.b;
@@ -67,7 +67,8 @@ void meanHue(const Plane& first, const Plane& second, double step, double& cosin
         if (dot >= 0) {
             x = first.a * second.chroma + second.a * first.chroma;
             y = first.b * second.chroma + second.b * first.chroma;
-        } else { // The sum may cancel: turn the difference by 90 degrees towards the smaller angle.
+        } else { // The sum may cancel: rotate the difference by 90 degrees towards the smaller
+                 // angle.
             const double turn = step < 0 ? -1 : 1;
             x = turn * (second.b * first.chroma - first.b * second.chroma);
             y = turn * (first.a * second.chroma - second.a * first.chroma);
@@ -86,7 +87,7 @@ double seventhPowerShare(double chroma) {
     return std::sqrt(pow7 / (pow7 + pow25To7));
 }
 
-/// Hue of a colour in degrees, 0 up to 360; 0 without a hue.
+/// Hue of a colour in degrees, from 0 to below 360; 0 without a hue.
 double hueAngle(const Plane& colour) {
     const double angle = std::atan2(colour.b, colour.a) / radians;
     return angle < 0 ? angle + 360 : angle;
@@ -155,8 +156,8 @@ double deltaE76(const Lab& target, const Lab& measured) {
                      squared(measured.b - target.b));
 }
 
-// CIE 116-1995 with the parameters of the graphic arts. The chroma in the weights is the
-// reference's, as the publication has it for a pair with a standard.
+// CIE 116-1995 with the parameters for graphic arts. The weights use the reference's chroma, as the
+// publication specifies for a pair with a standard.
 double deltaE94(const Lab& target, const Lab& measured) {
     const Plane reference = planeOf(target);
     const Plane sample = planeOf(measured);
@@ -168,7 +169,7 @@ double deltaE94(const Lab& target, const Lab& measured) {
 }
 
 // CIE 142-2001, in the notation of Sharma, Wu and Dalal (Color Research and Application 30, 2005).
-// One arc tangent is left of the angles: all cosines of the mean hue follow from its direction.
+// Only one arc tangent is needed: the direction of the mean hue gives all its cosines.
 double deltaE2000(const Lab& target, const Lab& measured) {
     const double meanChroma = (chroma(target) + chroma(measured)) / 2;
     const double stretch = 1 + 0.5 * (1 - seventhPowerShare(meanChroma));
@@ -216,7 +217,7 @@ double deltaE2000(const Lab& target, const Lab& measured) {
     return std::sqrt(std::max(0.0, l * l + c * c + h * h + RT * c * h));
 }
 
-// BS 6923:1988, after Clarke, McDonald and Rigg.
+// BS 6923:1988, following Clarke, McDonald and Rigg.
 double deltaECmc(const Lab& target, const Lab& measured, double lightness, double chroma) {
     const Plane reference = planeOf(target);
     const Plane sample = planeOf(measured);

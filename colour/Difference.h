@@ -1,12 +1,12 @@
 // SPDX-License-Identifier: Apache-2.0
-// Colour differences, under the names and in the notation of the literature.
+// Colour differences, with the names and notation of the literature.
 #pragma once
 
 #include "colour/DataSet.h"
 
 namespace colour {
 
-/// In the numbering of measurementDataRecord::deltaEType; every other number means Cie76.
+/// Numbered like measurementDataRecord::deltaEType; any other number means Cie76.
 enum class Formula {
     Cie76 = 0,
     Cmc11 = 2,
@@ -40,7 +40,7 @@ double deltaH(const Lab& target, const Lab& measured);
 /// Chromaticness difference delta Ch of greys: sqrt(da^2 + db^2).
 double deltaCh(const Lab& target, const Lab& measured);
 
-/// Both under the white of the ICC profile connection space, 96.42, 100, 82.49.
+/// Both for the white of the ICC profile connection space, 96.42, 100, 82.49.
 Lab labFromXyz(const Xyz& xyz);
 Xyz xyzFromLab(const Lab& lab);
 

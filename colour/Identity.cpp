@@ -13,7 +13,7 @@
 namespace colour {
 namespace {
 
-/// Hashes integers, in blocks.
+/// Hashes integers in blocks.
 class Digest {
   public:
     void add(double value, double scale) {
@@ -36,15 +36,15 @@ class Digest {
     }
 
   private:
-    /// The nearest integer (the even one of two), as the bytes of a little-endian int32. Numbers
-    /// beyond two billion count as that, which no colour comes near; NaN and infinity count as 0.
+    /// The nearest integer (ties to even) as the bytes of a little-endian int32. Values are clamped
+    /// to two billion, far beyond any colour; NaN and infinity count as 0.
     static std::uint32_t rounded(double number) {
         constexpr double most = 2'000'000'000;
         if (!(std::fabs(number) <= most)) {
             number = std::isfinite(number) ? std::copysign(most, number) : 0;
         }
-        // In a double of this size the last bit is worth 1, so the addition rounds, and the lower
-        // half of the bits is the integer. lround costs several times as much.
+        // In a double of this size the last bit has the value 1, so the addition rounds, and the
+        // lower half of the bits is the integer. lround takes several times as long.
         constexpr double unit = 6'755'399'441'055'744; // 1.5 * 2^52
         const auto integer =
             static_cast<std::uint32_t>(std::bit_cast<std::uint64_t>(number + unit));

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Which colours a file asks for, as one short text: equal texts are equal targets.
+// Identifies the target colours of a file by a short text: equal texts mean equal targets.
 #pragma once
 
 #include <string>
@@ -12,14 +12,14 @@ namespace colour {
 /// for each patch in order its device values in 1/10000 percent and its L*a*b* in 1/1000, rounded
 /// to the nearest (halves to even), all as 32-bit little-endian integers. Headers, ids, names,
 /// spectra and the file format do not count. A set without colour values has no identity (empty).
-/// The hash separates what was aimed at different colours; it does not protect against forgery.
+/// The hash distinguishes different targets; it does not protect against forgery.
 std::string identityOf(const DataSet& set);
 
 /// The identity of the patches of all combinations of 0, 20, ... 100 percent C, M, Y, K (K varies
 /// fastest) as the profile evaluates them; empty if it can't.
 std::string identityOf(const Profile& profile);
 
-/// Of either kind.
+/// Of whichever the file contains.
 std::string identityOf(const ColourFile& file);
 
 } // namespace colour

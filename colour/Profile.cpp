@@ -11,13 +11,13 @@
 namespace colour {
 namespace {
 
-// ICC.1, 7.2: a header of 128 bytes, of which these are looked at before the profile is opened.
+// ICC.1, 7.2: a header of 128 bytes. These fields are checked before the profile is opened.
 constexpr std::size_t headerBytes = 128;
 constexpr std::size_t classOffset = 12;
 constexpr std::size_t spaceOffset = 16;
 constexpr std::size_t signatureOffset = 36;
 
-constexpr std::size_t batch = 512; ///< Patches handed to LittleCMS at a time.
+constexpr std::size_t batch = 512; ///< Patches per call of LittleCMS.
 
 std::uint32_t wordAt(std::string_view bytes, std::size_t offset) {
     std::uint32_t word = 0;
@@ -27,8 +27,8 @@ std::uint32_t wordAt(std::string_view bytes, std::size_t offset) {
     return word;
 }
 
-/// What the header alone rules out. A profile shorter than its header says is cut off: LittleCMS
-/// would pass over the tags that are gone and might evaluate another one in their place.
+/// Checks the header. A profile shorter than its stated size is truncated: LittleCMS would ignore
+/// the missing tags and might use another one instead.
 Failure checkHeader(std::string_view bytes) {
     if (!looksLikeProfile(bytes) || bytes.size() < headerBytes || wordAt(bytes, 0) > bytes.size()) {
         return Failure::ProfileDamaged;
@@ -46,19 +46,19 @@ Failure checkHeader(std::string_view bytes) {
                                                         : Failure::ProfileColourSpace;
 }
 
-/// Absolute colorimetry rests on the media white; LittleCMS would take D50 where there is none.
+/// Absolute colorimetry needs the media white; LittleCMS would assume D50 if it is missing.
 bool hasMediaWhite(cmsHPROFILE profile) {
     const auto* white =
         static_cast<const cmsCIEXYZ*>(cmsReadTag(profile, cmsSigMediaWhitePointTag));
     return white && white->X > 0 && white->Y > 0 && white->Z > 0;
 }
 
-/// 0 to 100; what is no number counts as no ink.
+/// Clamps to 0 to 100; NaN counts as no ink.
 double inkAmount(double percent) {
     return percent > 0 ? std::min(percent, 100.0) : 0;
 }
 
-/// False for what only a damaged table of floats can give.
+/// False for values that only a damaged table of floats can give.
 bool isColour(const cmsCIELab& lab) {
     constexpr double farOut = 10'000;
     return std::abs(lab.L) < farOut && std::abs(lab.a) < farOut && std::abs(lab.b) < farOut;
@@ -82,9 +82,9 @@ void appendUtf8(std::string& text, std::uint32_t point) {
     }
 }
 
-/// The description in English, else in the profile's first language. LittleCMS hands out UTF-16
-/// units, one in each wide character, and the bytes of an older profile's text with their sign
-/// extended: those are read as Latin-1.
+/// The description in English, or else in the profile's first language. LittleCMS returns one
+/// UTF-16 unit per wide character; for older profiles it returns sign-extended bytes, which are
+/// read as Latin-1.
 std::string descriptionOf(cmsHPROFILE profile) {
     std::array<wchar_t, 1024> units{};
     cmsGetProfileInfo(profile, cmsInfoDescription, "en", "US", units.data(),
@@ -121,8 +121,8 @@ using Owned = std::unique_ptr<std::remove_pointer_t<Handle>, Deleter>;
 } // namespace
 
 struct Profile::State {
-    // A context of its own: nothing that other code sets in the process (error handler, adaptation
-    // state, plug-ins) reaches the transform. It goes last.
+    // A private context: no setting of other code in the process (error handler, adaptation state,
+    // plug-ins) affects the transform. It must be destroyed last.
     Owned<cmsContext, ContextDeleter> context;
     Owned<cmsHTRANSFORM, TransformDeleter> transform;
     std::string description;
@@ -162,10 +162,10 @@ Failure Profile::open(std::string_view bytes) {
         return Failure::ProfileUnusable;
     }
 
-    // The observer counts as fully adapted, which is the absolute colorimetry of ICC.1: the media
-    // white scales XYZ. (Profiles of ArgyllCMS bring a matrix of their own for that in a private
-    // tag, which its tools alone obey; they differ by up to one unit.) Formats of doubles keep
-    // LittleCMS on its floating-point road.
+    // The observer is fully adapted, as in the absolute colorimetry of ICC.1: the media white
+    // scales XYZ. (ArgyllCMS profiles have their own matrix for that in a private tag, which only
+    // its tools use; results differ by up to one unit.) Formats of doubles select LittleCMS's
+    // floating-point path.
     std::array<cmsHPROFILE, 2> chain{profile.get(), lab.get()};
     std::array<cmsBool, 2> blackPoint{FALSE, FALSE};
     std::array<cmsUInt32Number, 2> intents{INTENT_ABSOLUTE_COLORIMETRIC,

@@ -13,10 +13,10 @@
 
 namespace colour {
 
-/// True if the bytes carry the signature of an ICC profile.
+/// True if the bytes have the signature of an ICC profile.
 bool looksLikeProfile(std::string_view bytes);
 
-/// Owns the profile and its transform. Movable; not to be used by two threads at once.
+/// Owns the profile and its transform. Movable; use it in one thread at a time.
 class Profile {
   public:
     Profile();
@@ -24,17 +24,16 @@ class Profile {
     Profile(Profile&&) noexcept;
     Profile& operator=(Profile&&) noexcept;
 
-    /// Opens a v2 or v4 profile from memory; the bytes may go afterwards. On failure the profile
-    /// that was open stays.
+    /// Opens a v2 or v4 profile from memory; the bytes are not needed afterwards. On failure, keeps
+    /// the profile that was open.
     Failure open(std::string_view bytes);
 
-    /// Lab of `count` patches of C, M, Y, K in percent, `stride` values apart. Amounts beyond 0 to
-    /// 100 are cut. ProfileUnusable, with `lab` in part written, where a damaged profile gives no
-    /// colours.
-    /// REQUIRES: open gave None.
+    /// Lab of `count` patches of C, M, Y, K in percent, `stride` values apart. Amounts are clamped
+    /// to 0 to 100. ProfileUnusable, with `lab` partly written, if a damaged profile yields no
+    /// colours. REQUIRES: open returned None.
     Failure evaluate(const double* cmyk, std::size_t count, std::size_t stride, Lab* lab) const;
 
-    /// The profile's own description, UTF-8; empty where it has none.
+    /// The profile's own description in UTF-8; empty if it has none.
     const std::string& description() const;
 
   private:

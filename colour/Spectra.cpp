@@ -1,10 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
-// XYZ from reflectances after ASTM E308: one weight for each wavelength and coordinate.
+// XYZ from reflectances by ASTM E308: one weight per wavelength and coordinate.
 //
-// The weights are worked out for the axis at hand in the manner of ASTM E2022, which the printed
-// tables for 10 and 20 nm come from: between its wavelengths a spectrum is a cubic through four
-// neighbours (a parabola in the first and the last interval), which is integrated every nm against
-// observer times illuminant. At 10 nm this gives the printed figures to their last decimal.
+// The weights are computed for the given axis by the method of ASTM E2022, the source of the
+// printed tables for 10 and 20 nm: between its wavelengths a spectrum is a cubic through four
+// neighbours (a parabola in the first and the last interval), integrated every nm against observer
+// times illuminant. At 10 nm the result equals the printed figures to their last decimal.
 #include "colour/Spectra.h"
 
 #include <algorithm>
@@ -15,7 +15,7 @@
 namespace colour {
 namespace {
 
-/// ASTM E308 has no tables coarser than 20 nm, and wants 400 to 700 nm at least.
+/// ASTM E308 has no tables coarser than 20 nm and requires at least 400 to 700 nm.
 constexpr int coarsestStep = 20;
 constexpr int latestStart = 400;
 constexpr int earliestEnd = 700;
@@ -25,7 +25,7 @@ long long lastWavelength(const SpectralAxis& axis) {
     return axis.base + static_cast<long long>(axis.step) * (axis.length - 1);
 }
 
-/// Value of coefficient `which` of the polynomial through the integer points 0 .. points - 1.
+/// Value of coefficient `which` of the polynomial through the integer points 0 to points - 1.
 double lagrange(int points, int which, double at) {
     double value = 1;
     for (int other = 0; other < points; ++other) {
@@ -36,7 +36,7 @@ double lagrange(int points, int which, double at) {
     return value;
 }
 
-/// How a value at `position` (in steps from point 0) is made up of `count` points one step apart.
+/// Composition of a value at `position` (in steps from point 0) from `count` points one step apart.
 struct Interpolation {
     int first = 0;  ///< First of the points.
     int points = 0; ///< Number of coefficients.
@@ -54,8 +54,8 @@ Interpolation interpolate(int count, int interval, double within) {
     return result;
 }
 
-/// D50 at a whole nm, a cubic through the 5 nm table as ASTM E308 takes it. (Straight lines between
-/// the entries, as the CIE has it for other uses, move Z of a dark blue by a hundredth.)
+/// D50 at an integer nm: a cubic through the 5 nm table, as in ASTM E308. (Linear interpolation,
+/// which the CIE specifies for other uses, changes Z of a dark blue by a hundredth.)
 double illuminantAt(int wavelength) {
     const int offset = wavelength - illuminantFirst;
     const int interval = std::min(offset / illuminantStep, illuminantLength - 2);
@@ -93,8 +93,8 @@ bool spectraUsable(const SpectralAxis& axis) {
 }
 
 SpectralWeights::SpectralWeights(const SpectralAxis& axis) : m_weights(axis.length) {
-    // The axis's own wavelengths, continued or cut so that they just cover the observer. Weights of
-    // wavelengths that were not measured go to the nearest one that was (ASTM E308, 7.3.2.2).
+    // The axis's own wavelengths, extended or cut to just cover the observer. Weights of unmeasured
+    // wavelengths are added to the nearest measured one (ASTM E308, 7.3.2.2).
     const int step = axis.step;
     const auto cover = [&](int wavelength) { return (wavelength - axis.base) / step; };
     const int first =

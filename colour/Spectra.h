@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// From reflectances to XYZ.
+// Converts reflectances to XYZ.
 #pragma once
 
 #include <vector>
@@ -8,12 +8,12 @@
 
 namespace colour {
 
-/// True if spectra on this axis can be turned into XYZ: steps of 1 to 20 nm, and at least 400 to
-/// 700 nm, the limits of ASTM E308.
+/// True if spectra on this axis can be converted to XYZ: steps of 1 to 20 nm covering at least 400
+/// to 700 nm, the limits of ASTM E308.
 bool spectraUsable(const SpectralAxis& axis);
 
-/// Weights of one axis, made once and used for every patch (D50, CIE 1931 2 degree observer; ASTM
-/// E308). The perfect diffuser gives 96.422, 100, 82.521.
+/// Weights of one axis, computed once and used for every patch (D50, CIE 1931 2 degree observer;
+/// ASTM E308). The perfect diffuser gives 96.422, 100, 82.521.
 class SpectralWeights {
   public:
     /// REQUIRES: spectraUsable(axis).
@@ -23,7 +23,7 @@ class SpectralWeights {
     Xyz xyz(const double* reflectances) const;
 
   private:
-    std::vector<Xyz> m_weights; ///< One for each wavelength of the axis.
+    std::vector<Xyz> m_weights; ///< One per wavelength of the axis.
 };
 
 } // namespace colour

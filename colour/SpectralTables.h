@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The figures of the CIE that XYZ is made from.
+// CIE data from which XYZ is computed.
 #pragma once
 
 #include "colour/DataSet.h"

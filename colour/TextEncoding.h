@@ -7,12 +7,12 @@
 
 namespace colour {
 
-/// True if the bytes begin with the byte order mark of UTF-16, of either order.
+/// True if the bytes start with a UTF-16 byte order mark, in either byte order.
 bool isUtf16(std::string_view bytes);
 
-/// The text as UTF-8 without a byte order mark. Text that is not UTF-16 is returned as it is, apart
-/// from a mark of UTF-8; otherwise the result is in `storage`. Lone surrogates and half a unit at
-/// the end become U+FFFD.
+/// Converts the text to UTF-8 without a byte order mark. Text that is not UTF-16 is returned
+/// unchanged, except for a UTF-8 mark; otherwise the result is in `storage`. Lone surrogates and
+/// half a unit at the end become U+FFFD.
 std::string_view withoutUtf16(std::string_view bytes, std::string& storage);
 
 } // namespace colour

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// ComGUI.Bundle's shared object: the table of operations, and the function that makes its object.
+// ComGUI.Bundle's shared object: the table of operations, and the function that creates its object.
 //
-// Instances, sessions and tickets that come back from outside are looked up before anything is done
-// with them, and no exception leaves a slot.
+// Instances, sessions and tickets passed in by a client are looked up before use, and no exception
+// leaves a slot.
 #include <cstring>
 #include <map>
 #include <memory>
@@ -18,29 +18,29 @@ namespace store {
 
 namespace {
 
-/// 33FC3B14-6CFF-11D8-AB09-003065B1346E, that is comGUIInterfaceID.
+/// The bytes of comGUIInterfaceID.
 constexpr CFUUIDBytes interfaceId = {{0x33, 0xFC, 0x3B, 0x14, 0x6C, 0xFF, 0x11, 0xD8, 0xAB, 0x09,
                                       0x00, 0x30, 0x65, 0xB1, 0x34, 0x6E}};
 
-/// What CreateInstance makes.
+/// Created by CreateInstance.
 struct Instance {
     std::map<std::uint64_t, std::unique_ptr<Session>> sessions; ///< By handle.
 };
 
-/// Neither instances nor sessions that nobody closed are destroyed with the process: a client may
-/// still hold pointers into them while it ends.
+/// Open instances and sessions are never destroyed, not even at exit: a client may still have
+/// pointers into them.
 std::map<const void*, std::unique_ptr<Instance>>& instances() {
     static auto& all = *new std::map<const void*, std::unique_ptr<Instance>>;
     return all;
 }
 
-/// Null for an instance that was never made.
+/// Null for an unknown instance.
 Instance* find(const void* instance) {
     const auto found = instances().find(instance);
     return found == instances().end() ? nullptr : found->second.get();
 }
 
-/// Null for a session that is not open, or that another instance opened.
+/// Null if the session is not open or belongs to another instance.
 Session* find(const void* instance, std::uint64_t handle) {
     auto* const known = find(instance);
     if (known == nullptr) {
@@ -50,7 +50,7 @@ Session* find(const void* instance, std::uint64_t handle) {
     return found == known->sessions.end() ? nullptr : found->second.get();
 }
 
-/// Runs a slot. Failures become codes here.
+/// Runs a slot and converts failures to codes.
 template<class Body>
 std::int32_t answer(Body body) {
     try {
@@ -70,7 +70,7 @@ std::int32_t inSession(const void* instance, std::uint64_t handle, Body body) {
     });
 }
 
-/// A text of the record, be it without an end.
+/// A text of the record, with or without a terminator.
 template<std::size_t Size>
 std::string textOf(const char (&field)[Size]) {
     return {field, strnlen(field, Size - 1)};
@@ -93,7 +93,7 @@ std::int32_t createInstance(void** instance) {
     });
 }
 
-/// Login reads the record again, since the client may change it until then.
+/// Stores nothing: Login reads the record, and the client may change it until then.
 std::int32_t initialize(void* instance, ComSessionRecord* record) {
     return answer([&] {
         return find(instance) == nullptr || !isUsable(record) ? Code::Refused : Code::Done;
@@ -104,7 +104,7 @@ std::int32_t uninitialize(void* instance, ComSessionRecord* record) {
     return initialize(instance, record);
 }
 
-/// What keeps a client from opening a store is, but for the formats, that there is none for it.
+/// Any failure to open a store is reported as a missing store, except an unsupported format.
 std::unique_ptr<StoreEngine> openForLogin(const std::string& address) {
     try {
         return openStoreAt(address);
@@ -132,7 +132,7 @@ std::int32_t login(void* instance, ComSessionRecord* record) {
         case LoginAnswer::Welcome:
             break;
         }
-        // Never used twice, so that a handle of a session that has ended is none.
+        // Never reused, so that the handle of an ended session stays invalid.
         static std::uint64_t lastHandle = 0;
         known->sessions.emplace(lastHandle + 1,
                                 std::make_unique<Session>(address, std::move(engine)));
@@ -160,7 +160,7 @@ std::int32_t getTicketData(void* instance, std::uint64_t handle, int type, int k
     });
 }
 
-/// No kind of whole-ticket data is written here.
+/// No kind of whole-ticket data can be written.
 std::int32_t setTicketData(void*, std::uint64_t, int, int, int, int*, void*) {
     return Code::Refused;
 }
@@ -186,14 +186,14 @@ std::int32_t getFile(void* instance, std::uint64_t handle, const char* first, co
     });
 }
 
-/// A store prints nothing: there is nobody to hand a job to.
+/// A store can't print, so it can't accept jobs.
 std::int32_t sendJob(void*, std::uint64_t, TJobIdentification*, const char*, const char*) {
     return Code::Refused;
 }
 
-/// Answered from a session with this store if there is one, which then tries to reach a server that
-/// it has lost; otherwise from the store itself. A store
-/// of another format is alive: what is wrong with it is for the login to say.
+/// Answers from an open session with this store if there is one, which then tries to reconnect to a
+/// lost server; otherwise opens the store. A store of another format counts as alive: the login
+/// reports that problem.
 std::int32_t isAlive(void* instance, const char* host, int) {
     constexpr std::int32_t alive = 0;
     constexpr std::int32_t silent = 2;
@@ -225,7 +225,7 @@ std::int32_t queryInterface(void* object, CFUUIDBytes id, void** interface) {
     return known ? 0 : noInterface;
 }
 
-/// There is one object, which stays for good; who counts its references may do so.
+/// There is a single permanent object, so references need no count.
 std::uint32_t countReference(void*) {
     return 1;
 }
@@ -260,7 +260,7 @@ const ComGUIModuleInterface* theObject() {
 
 } // namespace store
 
-/// Named in the bundle's Info.plist.
+/// Info.plist names this function.
 extern "C" __attribute__((visibility("default"))) void* makeComGUI(const void*, const void*) {
     static const ComGUIModuleInterface* object = store::theObject();
     return &object;

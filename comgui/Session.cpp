@@ -36,7 +36,7 @@ std::string utf8FromLatin1(const std::string& text) {
     return utf8;
 }
 
-/// A local file under another name in its folder, until it is complete.
+/// Writes a local file under a temporary name in its folder until it is complete.
 class LocalCopy {
   public:
     explicit LocalCopy(const std::string& path)
@@ -46,7 +46,7 @@ class LocalCopy {
             m_part.clear();
             return;
         }
-        // As any new file has it, where mkstemp leaves nothing to others.
+        // Gives it the usual permissions of a new file; mkstemp grants others none.
         const mode_t mask = umask(0);
         umask(mask);
         fchmod(file, 0666 & ~mask);
@@ -75,7 +75,7 @@ class LocalCopy {
 
   private:
     const std::string m_path;
-    std::string m_part; ///< Empty where there is none (any more).
+    std::string m_part; ///< Empty if there is no temporary file.
     std::ofstream m_stream;
 };
 
@@ -176,8 +176,8 @@ Code Session::sendCommand(std::string_view command, int size, void* data) {
     return Code::Done;
 }
 
-/// Takes the client's pointer out of the ticket, and gives it the number under which the client
-/// then enables notifications. This store accepts and remembers them, and has none to send.
+/// Takes the client's pointer from the ticket, and stores the number with which the client then
+/// enables notifications. This store accepts and remembers them but never sends any.
 Code Session::setCallback(void* ticket) {
     const auto found = findTicket(ticket);
     if (found == nullptr) {
@@ -200,7 +200,7 @@ Code Session::setCallback(void* ticket) {
 
 Code Session::putFile(const std::string& local, const std::string& server) {
     std::error_code failure;
-    // A pipe would have us wait for its writer.
+    // A pipe would block until it has a writer.
     if (!std::filesystem::is_regular_file(local, failure)) {
         return Code::NoFile;
     }

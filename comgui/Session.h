@@ -13,24 +13,24 @@
 
 namespace store {
 
-/// What slots of the plug-in's table answer. A login that fails gives one of the first five.
+/// Result codes of the plug-in's slots. A failed login gives one of the first five.
 enum Code : std::int32_t {
     Done = 0,
     WrongUserOrPassword = -2004,
-    NoStore = -2005, ///< Nor one that this process may use.
+    NoStore = -2005, ///< No store, or one that this process may not use.
     UserDisabled = -2030,
     StoreIsNewer = -2031,
     StoreIsOlder = -2033,
-    Refused = -1,    ///< An argument, handle or command that means nothing here.
+    Refused = -1,    ///< An invalid argument, handle or command.
     NoFile = -2050,  ///< The server has no such file.
-    BadPath = -2051, ///< A server path that leads out of the store's files, or to a folder.
+    BadPath = -2051, ///< A server path outside the store's files, or a folder.
     NotWritten = -2052,
 };
 
 Code codeOf(const StoreFailure& failure);
 
-/// Opens the store at a server address, which has at most 127 bytes. Client programs pass it one
-/// byte a character, so that what leads nowhere as it stands is tried as Latin-1.
+/// Opens the store at a server address of at most 127 bytes. Clients pass it as one byte per
+/// character, so an address that leads nowhere is tried again as Latin-1.
 std::unique_ptr<StoreEngine> openStoreAt(const std::string& address);
 
 class Session {
@@ -41,13 +41,13 @@ class Session {
     bool alive() const { return m_engine->alive(); }
     const MTICKET_ACCESS* container() const { return m_container.access(); }
 
-    // As the slots of these names, with what came from outside checked for null.
+    // Like the slots of these names, with external arguments checked for null.
 
     Code getTicketData(int type, int kind, int index, int* size, void* buffer);
     Code sendCommand(std::string_view command, int size, void* data);
     /// From a local file to a server path.
     Code putFile(const std::string& local, const std::string& server);
-    /// The local file appears complete, and does so before this returns.
+    /// The local file appears complete, before this returns.
     Code getFile(const std::string& local, const std::string& server);
 
     const std::string& previewFolder() const { return m_previewFolder; }
@@ -62,7 +62,7 @@ class Session {
     const std::shared_ptr<StoreEngine> m_engine;
     const std::shared_ptr<CachingStorage> m_storage;
     TicketContainer m_container;
-    int m_notificationId = 0; ///< 0: there is no callback.
+    int m_notificationId = 0; ///< 0 if there is no callback.
     void* m_callbackUser = nullptr;
     std::string m_previewFolder;
     std::string m_thumbnailFolder;

@@ -36,7 +36,7 @@ int FindToken(const char* token, char* start, char* end, char** found, long* fou
     *found = start;
     *foundLength = 0;
     const std::size_t length = std::strlen(token);
-    // The last byte is left out of the search, which is what keeps the token from ending there.
+    // Leaving the last byte out of the search prevents a match that ends there.
     if (start < end) {
         const auto size = static_cast<std::size_t>(end - start) - 1;
         if (void* const at = memmem(start, size, token, length)) {

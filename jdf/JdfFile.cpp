@@ -28,7 +28,7 @@ class Descriptor {
         m_number = number;
     }
 
-    /// Closing can be the first to tell of a failed write.
+    /// close can be the first call to report a failed write.
     bool close() {
         const int number = m_number;
         m_number = -1;
@@ -39,7 +39,7 @@ class Descriptor {
     int m_number;
 };
 
-/// Calls read or write until size bytes have gone through.
+/// Calls read or write until `size` bytes are transferred.
 template<class Byte>
 bool transfer(ssize_t (*call)(int, Byte*, std::size_t), const Descriptor& file, Byte* bytes,
               long size) {
@@ -61,8 +61,8 @@ std::string withoutLinks(const std::string& path) {
     return real == nullptr ? path : std::string(real.get());
 }
 
-/// A new file in a folder. It has no name while it is written, so that a process that is killed
-/// leaves nothing, or has one where there are no such files.
+/// A new file in a folder. It has no name while it is written, so that a killed process leaves
+/// nothing behind. It gets a name at once if the file system does not support that.
 class NewFile {
   public:
     NewFile(std::string folder, bool isNamed) : m_folder(std::move(folder)), m_file(-1) {
@@ -87,7 +87,7 @@ class NewFile {
                fchmod(m_file.number(), mode) == 0;
     }
 
-    /// Puts it in place of the target.
+    /// Replaces the target.
     bool replace(const std::string& target) {
         if (!giveName() || !m_file.close() || std::rename(m_name.c_str(), target.c_str()) != 0) {
             return false;
@@ -97,7 +97,7 @@ class NewFile {
     }
 
   private:
-    /// Independent of the target's name, which may be as long as names can be.
+    /// Does not depend on the target's name, which can have the maximum length.
     std::string nameFor(const std::string& ending) const {
         return m_folder + "/.tintgate-jdf-" + ending;
     }
@@ -108,7 +108,7 @@ class NewFile {
         }
         const std::string open = "/proc/self/fd/" + std::to_string(m_file.number());
         const std::string name = nameFor(std::to_string(getpid()));
-        unlink(name.c_str()); // Of a process that was killed between the next two steps.
+        unlink(name.c_str()); // Left by a process killed between the next two steps.
         if (linkat(AT_FDCWD, open.c_str(), AT_FDCWD, name.c_str(), AT_SYMLINK_FOLLOW) != 0) {
             return false;
         }
@@ -118,13 +118,13 @@ class NewFile {
 
     const std::string m_folder;
     Descriptor m_file;
-    std::string m_name; ///< Empty without one.
+    std::string m_name; ///< Empty if unnamed.
 };
 
 } // namespace
 
 Contents readFile(const std::string& path, long smallest, long more) {
-    // Not blocking, so that a pipe in the file's place is refused and not waited for.
+    // Non-blocking, so that a pipe in the file's place is refused at once.
     const Descriptor file(open(path.c_str(), O_RDONLY | O_CLOEXEC | O_NONBLOCK));
     struct stat status = {};
     if (!file.isOpen() || fstat(file.number(), &status) != 0 || !S_ISREG(status.st_mode) ||

@@ -11,10 +11,10 @@
 
 namespace {
 
-constexpr long smallestFile = 5000; // A smaller one counts as missing (C81).
+constexpr long smallestFile = 5000; // A smaller file counts as missing (C81).
 constexpr int mostPatches = 1'000'000;
 constexpr long roomForAll = 2048;
-constexpr long roomForPatch = 200 + 700; // Colour values, and spectral ones.
+constexpr long roomForPatch = 200 + 700; // Colour values and spectral values.
 
 constexpr char linkElement[] =
     "<tazo:MeasurementDataLink rRef=\"BJDFLink0000006\" Usage=\"Input\"/>\n";
@@ -30,7 +30,7 @@ void store(char (&field)[N], const wxString& text) {
     field[N - 1] = '\0';
 }
 
-/// One update: the contents, where the last search stopped, and the first failure.
+/// One update: the contents, the position of the last search, and the latest failure.
 class Update {
   public:
     explicit Update(jdf::Contents contents)
@@ -45,7 +45,7 @@ class Update {
         }
     }
 
-    /// Sees to it that the pool of resource links ends with the link to our resource.
+    /// Ensures that the pool of resource links ends with the link to our resource.
     void ensureLink() {
         if (m_error != jdf::Done || find("<tazo:MeasurementDataLink")) {
             return;
@@ -58,7 +58,7 @@ class Update {
         insert(linkElement);
     }
 
-    /// Deletes from a tag of our resource, or of the remains of one, to the end of its pool.
+    /// Deletes from a tag of our resource, complete or not, to the end of its pool.
     void deleteResource(const char* tag) {
         if (!find(tag)) {
             return;
@@ -70,7 +70,7 @@ class Update {
         }
     }
 
-    /// Sees to it that our resource is there, and goes to its closing tag.
+    /// Ensures that our resource exists, and moves to its closing tag.
     void ensureResource() {
         if (m_error != jdf::Done) {
             return;
@@ -89,8 +89,8 @@ class Update {
         findFrom(m_position, closingTag);
     }
 
-    /// Behind what the resource holds already. After a failure this is where the last search
-    /// stopped: the start of the contents if it found nothing.
+    /// The position after the resource's existing content. After a failure, the position of the
+    /// last search: the start of the contents if it found nothing.
     char* insertionPoint(bool isSecondStrip) {
         skipBack();
         if (isSecondStrip && m_error == jdf::Done) {
@@ -105,7 +105,7 @@ class Update {
   private:
     bool find(const char* token) { return findFrom(m_contents.start, token); }
 
-    /// Goes to the token, or to where the search began.
+    /// Moves to the token. If it is not found, moves to `from`.
     bool findFrom(char* from, const char* token) {
         long length = 0;
         FindToken(token, from, m_contents.end(), &m_position, &length);
@@ -121,8 +121,8 @@ class Update {
                                       &m_contents.length));
     }
 
-    /// Puts a text in front of an attribute's value. The value is deleted first, and so is there
-    /// twice (see JdfBuffer.h). Goes to the attribute.
+    /// Inserts a text before an attribute's value. The value is first deleted, which duplicates it
+    /// instead (see JdfBuffer.h). Moves to the attribute.
     void stampAttribute(const char* attribute, const std::string& text) {
         if (!findFrom(m_position, attribute)) {
             return;
@@ -138,7 +138,7 @@ class Update {
         insertAt(value, text.c_str());
     }
 
-    /// A success does not take an earlier failure away.
+    /// A success does not clear an earlier failure.
     void check(int code) {
         if (code != jdf::Done) {
             m_error = code;
@@ -199,8 +199,8 @@ int JdfHandler::AppendJDFFileData(KZJobDataStruct job, wxString comment,
     update.ensureResource();
     char* const at = update.insertionPoint(job.secondStrip == 1);
 
-    // From here on only the result of this step counts: after -13 and -14 the measurement is
-    // written all the same, and the file too (C74).
+    // Only the result of this step counts: after -13 and -14, the measurement and the file are
+    // still written (C74).
     jdf::Contents& all = update.contents();
     const int code = WriteJDFMeasureData(at, all.start, all.limit, &all.length, job.measurement,
                                          header, comment);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Writing a measurement and its result into a job's JDF file.
+// Writes a measurement and its result into a job's JDF file.
 #pragma once
 
 #include <wx/string.h>
@@ -7,20 +7,20 @@
 #include "jdf/JdfMeasurement.h"
 #include "job/JobRecords.h"
 
-/// Holds no data.
+/// Has no data.
 class JdfHandler {
   public:
-    /// Print date and time of now, no date of measuring, formula "CMC", and all else empty, zero or
-    /// false, except for secondStrip and measurement, which stay as they are.
+    /// Sets print date and time to now, no measuring date and the formula "CMC". Everything else
+    /// becomes empty, zero or false, except secondStrip and measurement, which are unchanged.
     static void SetJDFMeasurementHeaderDefaults(JDFMeasurementHeader* header);
 
     /// Updates the file at job.jdfLocalFile: stamps the print date and time on the header's party,
-    /// sees to the resource link and the resource that hold measurements, and appends the job's
-    /// measurement to that resource. With replace, old measurements are to go first; since the
-    /// delete is none (see JdfBuffer.h), a file that has some is damaged (C71).
+    /// ensures the resource link and the resource for measurements, and appends the job's
+    /// measurement to that resource. With `replace`, old measurements are deleted first. Since that
+    /// delete does not work (see JdfBuffer.h), it damages a file that has old measurements (C71).
     ///
-    /// Returns a code of JdfBuffer.h. The file changes only with code 0, and then as a whole: it is
-    /// written under another name in the same folder and renamed.
+    /// Returns a code of JdfBuffer.h. Only code 0 changes the file, and then completely: a new file
+    /// in the same folder is renamed.
     static int AppendJDFFileData(KZJobDataStruct job, wxString comment,
                                  JDFMeasurementHeader* header, bool replace);
 };

@@ -25,8 +25,7 @@ std::string_view textOf(const char (&field)[N]) {
     return {field, strnlen(field, N)};
 }
 
-/// Toward zero. What does not fit, and what is no number, gives the smallest, as the processor has
-/// it.
+/// Truncates toward zero. NaN and values out of range give LONG_MIN, as the processor does.
 long truncated(double value) {
     return value >= -0x1p63 && value < 0x1p63 ? static_cast<long>(value) : LONG_MIN;
 }
@@ -35,21 +34,21 @@ long micro(double value) {
     return truncated(value * 1000000);
 }
 
-/// Halves away from zero. What does not fit gives the smallest, as above.
+/// Rounds halves away from zero. NaN and values out of range give INT_MIN.
 int roundedMicro(double value) {
     const double rounded = std::round(value * 1000000);
     return rounded >= INT_MIN && rounded <= INT_MAX ? static_cast<int>(rounded) : INT_MIN;
 }
 
-/// Whole percent of a device value of 0 to 255, as a 16-bit number.
+/// Converts a device value of 0 to 255 to whole percent, as a 16-bit integer.
 double percent(double value) {
     const auto whole = static_cast<std::uint64_t>(truncated(std::floor(value / 2.55 + 0.5)));
     return static_cast<double>(whole & 0xFFFF);
 }
 
-/// Writes pieces at one place of a buffer. Meanwhile the text after that place is at the buffer's
-/// end, so that it moves twice, whatever the number of pieces, and nothing has to be allocated.
-/// Each piece is counted against the limit as if it were inserted by itself.
+/// Writes pieces at one position of a buffer. Meanwhile the text after that position is kept at the
+/// buffer's end. So it moves only twice, whatever the number of pieces, and nothing is allocated.
+/// Each piece is checked against the limit as if it were inserted alone.
 class Pieces {
   public:
     Pieces(char* at, char* buffer, char* limit, long* length)
@@ -82,7 +81,7 @@ class Pieces {
     /// Length of the unfinished piece.
     long size() const { return m_used - m_done; }
 
-    /// Ends the piece. 0, or -30 and the piece is dropped.
+    /// Ends the piece. Returns 0, or -30 if the piece is dropped.
     int end() {
         if (m_used >= m_room) {
             m_used = m_done;
@@ -95,17 +94,17 @@ class Pieces {
   private:
     char* const m_at;
     const long m_room;
-    const long m_after; ///< Length of the text after the place.
+    const long m_after; ///< Length of the text after the position.
     long& m_length;
     long m_done = 0; ///< Length of the finished pieces.
-    long m_used = 0; ///< With the unfinished piece, which may be longer than the room.
+    long m_used = 0; ///< Includes the unfinished piece, which may exceed the room.
 };
 
 std::string_view boolean(bool value) {
     return value ? "true" : "false";
 }
 
-/// The element's name, or nothing for a strip that has none (C80).
+/// The element's name. Empty for a strip without an element (C80).
 std::string_view elementName(const JDFMeasurementHeader& header) {
     constexpr std::string_view names[] = {"tazo:Measurement", "tazo:Measurement2"};
     return header.secondStrip < std::size(names) ? names[header.secondStrip] : "";
@@ -125,7 +124,7 @@ int writeOpening(Pieces& pieces, const JDFMeasurementHeader& header, std::string
     return pieces.end();
 }
 
-/// What each of the next parts returns is lost to the one after it: only the last counts (C78).
+/// Only the result of the last piece is returned (C78).
 int writeAttributes(Pieces& pieces, const measurementDataRecord& measurement,
                     JDFMeasurementHeader& header) {
     pieces << "Approval=\"" << boolean(header.approval) << "\" MaxDeltaE=\""
@@ -188,7 +187,7 @@ int writeSpectrum(Pieces& pieces, int patch, const spectralRow& row) {
     return pieces.end();
 }
 
-/// One family of lines after the other, up to the first refused piece.
+/// Writes one kind of line after the other, up to the first refused piece.
 int writePatches(Pieces& pieces, const measurementDataRecord& measurement, bool definitions) {
     int error = jdf::Done;
     const auto forEachPatch = [&](bool isThere, auto write) {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// The boundary to libTintgate: ten functions, linked by name, and the two records that exist for
-// them. Another vendor's library may stand in the place of ours, so the order and the widths of all
-// members are a contract, those of members that nothing here touches included (C27).
+// The boundary to libTintgate: ten functions, linked by name, and their two records. Another
+// vendor's library may replace ours, so the order and widths of all members are a contract, even of
+// members that nothing here uses (C27).
 #pragma once
 
 #include <cstddef>
@@ -31,20 +31,20 @@ struct tolerancePresetParameterRecord {
     int reserved2 = 0;
     double presetValues[presetValueCount] = {}; ///< Tolerances; 0 is the average, 1 the maximum.
     double psdPresetValues[psdPresetValueCount] = {};
-    int usedForResult[presetValueCount] = {}; ///< Not 0: the entry takes part in the verdict.
+    int usedForResult[presetValueCount] = {}; ///< Not 0: the entry counts for the verdict.
     int decimalPlaces[presetValueCount] = {};
     int usedForPSDResult[psdPresetValueCount] = {};
 };
 
-/// What an analysis says. criteria.md describes every entry.
+/// The result of an analysis. criteria.md describes every entry.
 struct analyseResultsRecord {
-    double values[resultValueCount] = {}; ///< -1.0 where the data can't answer.
+    double values[resultValueCount] = {}; ///< -1.0 if the data can't answer.
     bool approvals[presetValueCount] = {};
     bool decimals[presetValueCount] = {};
     bool overallPassed = false;
 };
 
-// Sizes and offsets as libraries built elsewhere know them, with a wxString of 48 bytes.
+// Sizes and offsets expected by libraries built elsewhere, with a wxString of 48 bytes.
 static_assert(sizeof(wxString) == 48);
 static_assert(sizeof(tolerancePresetParameterRecord) == 1008);
 static_assert(offsetof(tolerancePresetParameterRecord, filePath) == 0);
@@ -75,25 +75,25 @@ static_assert(offsetof(analyseResultsRecord, overallPassed) == 920);
 #define TINTGATE_API
 #endif
 
-// Every integer result is a status: 0 is success, anything else a code of ExitCodes.h. The
-// library is not reentrant: all calls come from one thread.
+// Every integer result is a status: 0 is success, other values are codes of ExitCodes.h. The
+// library is not reentrant: make all calls from one thread.
 
 /// Compares target with measurement, each an ICC profile or a CGATS text, under a preset.
 ///
-/// patchSet may be empty; else it names a CGATS text whose CMYK values serve all calculations.
-/// On success *json holds the result as ASCII JSON, *results (where not null) the values, and the
-/// measurement record of *job (where not null) the measured patches. On failure all three are left
-/// as they were.
+/// patchSet is empty or names a CGATS text whose CMYK values are used for all calculations. On
+/// success, *json is the result as ASCII JSON, *results (if not null) contains the values, and the
+/// measurement record of *job (if not null) the measured patches. On failure all three are
+/// unchanged.
 TINTGATE_API int analyzeMeasurements(std::wstring target, std::wstring measurement,
                                      std::wstring patchSet,
                                      tolerancePresetParameterRecord tolerance,
                                      analyseResultsRecord* results, std::wstring* json,
                                      KZJobDataStruct* job);
 
-/// Reads a preset's XML file into *tolerance, which is left as it was on failure.
+/// Reads a preset's XML file into *tolerance, which is unchanged on failure.
 ///
-/// With keepJobChoice the presetID and the deltaEMode that the job has chosen stay, and all else
-/// comes from the file; without it the formula comes from the file too.
+/// With keepJobChoice, presetID and deltaEMode keep the job's values and the rest comes from the
+/// file. Without it, the formula comes from the file too.
 TINTGATE_API int parsePresetParameterXMLFile(std::wstring path,
                                              tolerancePresetParameterRecord* tolerance,
                                              bool keepJobChoice);
@@ -102,26 +102,26 @@ TINTGATE_API int parsePresetParameterXMLFile(std::wstring path,
 TINTGATE_API int validateInputFile(std::wstring path);
 
 /// Writes the Lab values that a CMYK profile gives for the device values of a CGATS text, absolute
-/// colorimetric (D50, 2 degrees). An existing output file survives every failure.
+/// colorimetric (D50, 2 degrees). On every failure, an existing output file is kept.
 TINTGATE_API int writeLabFromReferencesAndICCProfile(std::wstring reference, std::wstring profile,
                                                      std::wstring output);
 
-/// The meta file of a job as ASCII JSON. Reads no value array of the job: they may be gone by then.
+/// The meta file of a job as ASCII JSON. Reads no value array of the job, since these may be freed.
 TINTGATE_API std::wstring getJsonMetaFileString(KZJobDataStruct* job);
 
-/// The instrument's display name: from the names file beside the presets, else "Instrument N".
+/// The instrument's display name from the names file next to the presets, or else "Instrument N".
 TINTGATE_API wxString GetInstrumentNameFromID(unsigned int deviceID);
 
-/// Reads the instrument's display name from the DEVICE line of a definition file. *name is left as
-/// it was on failure.
+/// Reads the instrument's display name from the DEVICE line of a definition file. On failure, *name
+/// is unchanged.
 TINTGATE_API int getDeviceNameFromIt8ControlStripFile(wxString path, wxString* name);
 
 /// Version of the library, not of the tool.
 TINTGATE_API void getLibVersion(unsigned int& major, unsigned int& minor, unsigned int& patch);
 
-/// Multibyte text of the process's locale to wide text. Bytes that are no valid UTF-8 become U+DC80
-/// to U+DCFF, so that wstringToString gives back the same bytes whatever they were.
+/// Converts multibyte text of the process's locale to wide text. Bytes that are not valid UTF-8
+/// become U+DC80 to U+DCFF, so that wstringToString restores the same bytes.
 TINTGATE_API std::wstring stringToWstring(const std::string& text);
 
-/// The reverse of stringToWstring.
+/// The inverse of stringToWstring.
 TINTGATE_API std::string wstringToString(const std::wstring& text);

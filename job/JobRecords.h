@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// All that is known of one job. The records cross the boundary to libTintgate (see
-// AnalysisLibrary.h): the order and the widths of all members are a contract (C27).
+// The data of one job. The records cross the boundary to libTintgate (see AnalysisLibrary.h): the
+// order and widths of all members are a contract (C27).
 #pragma once
 
 #include <cstddef>
@@ -9,20 +9,20 @@
 
 #include "job/AnalysisLibrary.h"
 
-inline constexpr int spectralValueCount = 36; ///< Room of one spectral row: 380 to 730 nm by 10.
+inline constexpr int spectralValueCount = 36; ///< Capacity of a spectral row: 380 to 730 nm by 10.
 
 /// Reflectances of one patch, 0 to 1.
 struct spectralRow {
     double values[spectralValueCount];
     int base;     ///< First wavelength in nm.
-    int stepsize; ///< Distance of the wavelengths in nm.
+    int stepsize; ///< Wavelength interval in nm.
     int length;   ///< Used entries of values.
 };
 
 /// One measurement or reference data set.
 ///
-/// The arrays come from malloc and hold numPatches rows each. A copy of the record shares them;
-/// destruction frees nothing: the owner of the job does, with free.
+/// The arrays come from malloc and have numPatches rows each. Copies of the record share them, and
+/// destruction does not free them: the owner of the job does, with free.
 struct measurementDataRecord {
     wxString reservedText1;
     wxString reservedText2;
@@ -32,10 +32,10 @@ struct measurementDataRecord {
     int reservedInt1 = 0;
     int reservedInt2 = 0;
     int reservedInt3 = 0;
-    int hasSpectral = 0;             ///< 1 when spectral holds all rows.
+    int hasSpectral = 0;             ///< 1 if spectral contains all rows.
     double* xyz = nullptr;           ///< X, Y, Z of each patch, 0 to 100.
     double* lab = nullptr;           ///< L*, a*, b* of each patch.
-    spectralRow* spectral = nullptr; ///< Null when there are no spectra.
+    spectralRow* spectral = nullptr; ///< Null if there are no spectra.
     double* cmyk = nullptr;          ///< C, M, Y, K of each patch: percent if loaded from the
                                      ///< ticket, 0 to 255 if stored by the library's analysis.
     double* reservedValues = nullptr;
@@ -44,9 +44,9 @@ struct measurementDataRecord {
     int deltaEType = 0; ///< 2 CIECMC, 3 CIE94, 4 CIE2000, 5 CIECMC_2_1, any other CIE76.
 };
 
-/// One job, built once per run.
+/// One job, created once per run.
 ///
-/// A copy has its own texts and shares childJobIDs and the arrays of measurement. Destruction frees
+/// A copy has its own texts but shares childJobIDs and the measurement's arrays. Destruction frees
 /// no pointer.
 struct KZJobDataStruct {
     wxString reservedText;
@@ -58,7 +58,7 @@ struct KZJobDataStruct {
     int parentID = 0;
     int useDynstrip = 0;
     int deviceID = 0;           ///< Measuring instrument; 0 is unknown.
-    int nestedStrip = 0;        ///< 1 when a nesting control strip was fetched.
+    int nestedStrip = 0;        ///< 1 if a nesting control strip was fetched.
     int* childJobIDs = nullptr; ///< From malloc; freed by the owner of the job.
     int childJobCount = 0;
     int presetID = 0;
@@ -87,7 +87,7 @@ struct KZJobDataStruct {
     wxString jdfServerFile; ///< A path on the server.
     measurementDataRecord measurement;
     tolerancePresetParameterRecord tolerance;
-    double measuredValues[presetValueCount] = {}; ///< Of an inline job; all -1.0 when absent.
+    double measuredValues[presetValueCount] = {}; ///< For an inline job; all -1.0 if absent.
 };
 
 // As in AnalysisLibrary.h.

@@ -10,7 +10,7 @@ using namespace jobkeys;
 
 namespace {
 
-/// A strip's result, and so its number; an approval of 0 is one, too (C91). It is logged (C92).
+/// Whether a strip has a result. An approval of 0 is one too (C91). Logs the read (C92).
 bool hasResult(const JobTicket& ticket, Strip strip) {
     int approval = -1;
     const int code = ticket.read(measurementKey(strip, "Approval"), -1, &approval);
@@ -25,9 +25,8 @@ bool hasResult(const JobTicket& ticket, Strip strip) {
 
 } // namespace
 
-// Nothing but the ticket tells what other runs have done. The strips are verified by processes of
-// their own, each of which writes its result before it asks for the other's: so whichever comes
-// second sees both.
+// Only the ticket shows what other runs have done. Each strip is verified by its own process, which
+// writes its result before it reads the other strip's. So the process that comes second sees both.
 int KZVerifyJobProcessor::SetJobStatus(int jobID, bool approved) {
     const JobTicket ticket(m_connector, jobID);
     int active = 0;

@@ -10,12 +10,12 @@
 
 namespace {
 
-/// Where the program has no folder of its own: nothing can be made below it, so that log and files
-/// fail to open. An empty name would put them at the top of the machine.
+/// Used if the program has no folder of its own. Nothing can be created below it, so log and files
+/// fail to open. With an empty name they would be written to the root folder.
 constexpr const char* nowhere = "/dev/null/Tintgate";
 
-/// The program's folder in the temporary folder; nowhere if that is no folder of this user's own.
-/// As bytes throughout: a folder's name need not be valid text.
+/// The program's folder in the temporary folder, or `nowhere` if this user does not own that
+/// folder. Paths are handled as bytes: a folder's name need not be valid text.
 wxString makeWorkingDir() {
     std::string folder = platform::temporaryFolder();
     if (folder.empty()) {
@@ -32,7 +32,7 @@ wxString makeWorkingDir() {
 } // namespace
 
 KZVerifyJobProcessor::KZVerifyJobProcessor() : m_workingDir(SetWorkingDir()) {
-    // A second processor of a process has no folder (C13).
+    // The second processor of a process has no folder (C13).
     CLogger::InitLogger((m_workingDir.empty() ? nowhere : GetNerovaKZJobDataDir()) +
                         "/TintgateKZ.log");
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The object that carries one job of a print server from its arguments to its result code.
+// Takes one job of a print server from the arguments to the result code.
 #pragma once
 
 #include <string>
@@ -11,110 +11,110 @@
 
 class CKZConnector;
 
-/// One object per process: it makes one pass, and its working folder is found only once.
+/// Use one object per process: it makes one pass, and it finds its working folder only once.
 ///
 /// The sources follow the steps of that pass: login (this name), Verification, LoadJob with
 /// StripSources, StoredData, MeasureJob, WriteBack, JobStatus. Integer results are 0 or a code of
 /// docs/exit-codes.csv, unless stated otherwise.
 ///
-/// REQUIRES for all that reads or writes tickets or files of the server: m_connector is not null.
+/// REQUIRES m_connector not null for everything that reads or writes tickets or server files.
 class KZVerifyJobProcessor {
   public:
-    /// Makes the working folder and opens the job's log in it.
+    /// Creates the working folder and opens the job's log in it.
     KZVerifyJobProcessor();
-    /// Closes the log first, and logs out after that.
+    /// Closes the log, then logs out.
     ~KZVerifyJobProcessor();
     KZVerifyJobProcessor(const KZVerifyJobProcessor&) = delete;
     KZVerifyJobProcessor& operator=(const KZVerifyJobProcessor&) = delete;
 
-    /// Finds the program's folder in the temporary folder, making it where it is missing. Where
-    /// that is a link or somebody else's, a name below which nothing can be made: what a job writes
-    /// holds passwords. Only the first call in a process looks; a later one returns an empty text
-    /// (C13).
+    /// Returns the program's folder in the temporary folder and creates it if it is missing. If
+    /// that path is a symlink or belongs to another user, returns a path under /dev/null, so that
+    /// nothing can be created there: a job writes passwords. Only the first call in a process does
+    /// this; later calls return an empty text (C13).
     wxString SetWorkingDir();
     /// m_workingDir as bytes.
     std::string GetNerovaKZJobDataDir() const;
 
-    /// Logs in. Null if that failed, with the reason in m_lastRetCode. The caller owns the result.
+    /// Logs in. On failure returns null and sets m_lastRetCode. The caller owns the result.
     CKZConnector* ConnectToKZWithLoginCredentials(std::wstring host, std::wstring user,
                                                   std::wstring password, int applicationID,
                                                   bool flag);
 
-    /// Verifies one job; the result is the process's exit code. With job id -1 it starts the viewer
-    /// and does nothing else (C14). `strip` is 1 for the second strip.
+    /// Verifies one job and returns the exit code of the process. For job id -1 it only starts the
+    /// viewer (C14). `strip` is 1 for the second strip.
     int VerifyKZJob(std::wstring host, std::wstring user, std::wstring password, std::wstring jobID,
                     std::wstring strip, std::wstring language, bool remeasure);
 
-    /// Fills the record from the job's ticket and the job's folder from the server.
+    /// Fills the record from the job's ticket and downloads the job's files to its folder.
     /// REQUIRES: secondStrip of the record is set.
     int LoadKZJobData(int jobID, KZJobDataStruct* job);
-    /// Fills childJobIDs (from malloc, freed by VerifyKZJob) with all jobs to verify that name this
-    /// job's parent, itself included (C41).
+    /// Fills childJobIDs (from malloc, freed by VerifyKZJob) with all jobs to verify that have this
+    /// job's parent, including the job itself (C41).
     void GetChildJobIDsFromParent(KZJobDataStruct* job);
-    /// Fills jdfServerFile, or empties it and returns the code of the read that failed.
+    /// Fills jdfServerFile. On failure empties it and returns the code of the failed read.
     int GetJobJDFFileName(KZJobDataStruct* job);
 
-    /// Puts the values that the ticket holds for the record's strip into its measurement: arrays
-    /// from malloc, in place of those that were there. A missing array is no failure.
+    /// Replaces the arrays of the record's measurement by the ticket's values for the record's
+    /// strip. The new arrays come from malloc. A missing array is not a failure.
     int LoadKZJobMeasurements(KZJobDataStruct* job);
-    /// The same for the stored references, CMYK in whole percent, never with spectra.
+    /// Same for the stored references: CMYK in whole percent, never with spectra.
     int LoadKZJobReferences(KZJobDataStruct* job);
 
-    /// The instrument of a control-strip file, 0 where it names none (C49). Returns 10 if there
-    /// is no such file.
+    /// The instrument of a control-strip file, or 0 if it names none (C49). Returns 10 if there is
+    /// no such file.
     int GetDeviceIDFromIt8ControlStripFileEx(wxString path, int* deviceID);
 
-    /// Writes the record's measurement as CGATS text to its referenceFile or sampleFile. -1 without
-    /// device values; a file that can't be opened is not reported (C48).
+    /// Writes the record's measurement as CGATS text to its referenceFile or sampleFile. Returns -1
+    /// if there are no device values. Does not report a file that can't be opened (C48).
     int WriteTemporarySampleFile(KZJobDataStruct job, bool reference);
 
-    /// Makes the measuring tool's definition from a control-strip file, in the same folder. Returns
-    /// its path, or an empty text, in which case a partial file can remain.
+    /// Creates the measuring tool's definition from a control-strip file, in the same folder, and
+    /// returns its path. On failure returns an empty text and can leave a partial file.
     wxString WriteTemporaryMeasurementDefinitionFile(wxString path, KZJobDataStruct* job);
 
-    /// Has the measuring tool measure the job's control strip, and waits for it. 0, or -1 if it was
-    /// running already, -2 if it could not be started, -3 without a control strip, -4 or -5
-    /// (C65) if there is no definition.
+    /// Runs the measuring tool on the job's control strip and waits for it. Returns 0, or -1 if the
+    /// tool was already running, -2 if it could not be started, -3 if there is no control strip, -4
+    /// or -5 (C65) if there is no definition.
     int ConfigureAndLaunchNerovaMeasure(KZJobDataStruct* job);
 
-    /// Writes a result and its measurement to a job's JDF and ticket (C84). Returns the code of
-    /// the last write that counts (C86).
+    /// Writes a result and its measurement to a job's JDF and ticket (C84). Returns the code of the
+    /// last relevant write (C86).
     int CopyResulDataToJobTicket(int jobID, KZJobDataStruct job, analyseResultsRecord results,
                                  bool remeasure);
-    /// Adds an error to a job's messages (C93). Returns the code of the write.
+    /// Appends an error to a job's messages (C93). Returns the code of the write.
     int WrietErrorToJobTicket(int errorCode, int jobID);
-    /// Closes a job, unless it has two strips and one of them still lacks a result. 0, or the code
-    /// of the read that should have told the number of strips.
+    /// Closes a job, unless it has two strips and one of them has no result yet. Returns 0, or the
+    /// code of the read of the number of strips if that failed.
     int SetJobStatus(int jobID, bool approved);
 
-    /// Frees the arrays of the job's measurement. The caller's pointers to them stay set (C25).
+    /// Frees the arrays of the job's measurement but does not reset the caller's pointers (C25).
     void FreeMeasurementData(KZJobDataStruct job);
 
     wxString m_workingDir;
     CKZConnector* m_connector = nullptr; ///< Owned; null until a login has succeeded.
     int m_lastRetCode = 0;               ///< Last return code of the connector.
 
-    /// Whether the loaded job's ticket contains the measurement to compare. If not, or if a new
-    /// measurement is asked for, the job is measured.
+    /// Whether to compare the measurement in the loaded job's ticket. If false, which it always is
+    /// with remeasure, the job is measured.
     static bool IsToBeCompared(const KZJobDataStruct& job, bool remeasure);
-    /// Compares the measurement that the ticket holds. Writes nothing to the ticket (C21).
+    /// Compares the measurement in the ticket. Writes nothing to the ticket (C21).
     int CompareStoredData(KZJobDataStruct* job, std::wstring* json);
 
   private:
     /// Whether the server lists the job among those to be verified or remeasured.
     bool IsListed(int jobID, bool remeasure);
-    /// All that follows once a job is loaded.
+    /// All steps after a job was loaded.
     int VerifyLoadedJob(KZJobDataStruct* job, bool remeasure);
     /// Compares referenceFile with sampleFile. *results may be null.
     int AnalyzeJob(KZJobDataStruct* job, analyseResultsRecord* results, std::wstring* json);
-    /// A new measurement and its comparison.
+    /// Measures the job and compares the result.
     int MeasureJob(KZJobDataStruct* job, analyseResultsRecord* results, std::wstring* json);
-    /// To the job, or to all jobs of its parent and the parent. The arrays of the job's measurement
-    /// are gone afterwards.
+    /// Writes to the job, or to all jobs of its parent and to the parent. Afterwards the arrays of
+    /// the job's measurement are freed.
     void WriteBackResults(int jobID, const KZJobDataStruct& job,
                           const analyseResultsRecord& results, bool remeasure);
 };
 
-/// Does what KZVerifyJobProcessor::SetWorkingDir does, once per process as well (C13). Nothing
-/// in the flow calls it (C171).
+/// Same as KZVerifyJobProcessor::SetWorkingDir, also once per process (C13). Not called in the flow
+/// (C171).
 wxString myMkTmpDirName();

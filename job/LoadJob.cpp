@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// Loading a job: what its ticket says, and the files that it names.
+// Loads a job: its ticket, and the files that the ticket names.
 //
-// The steps keep this order (C29), and so does what becomes of their codes: most reads replace
-// the code of the one before, and the step of the JDF, which comes last, replaces them all. What a
-// failed step leaves out is found later, by whatever needs it.
+// The order of the steps and the handling of their codes are required (C29): most reads replace the
+// previous code, and the last step, the JDF, replaces all of them. Data that a failed step leaves
+// out is noticed later, by the step that needs it.
 #include <algorithm>
 #include <cstdlib>
 #include <filesystem>
@@ -28,8 +28,8 @@ using namespace jobkeys;
 
 namespace {
 
-constexpr int presetIncomplete = 102; ///< Never leaves a load (C29).
-constexpr int fileWait = 1000;        ///< Milliseconds that a preset or a JDF is waited for.
+constexpr int presetIncomplete = 102; ///< Not returned by a load (C29).
+constexpr int fileWait = 1000;        ///< Time limit for a preset or a JDF, in ms.
 
 template<class Values>
 bool isOneOf(const Values& values, int number) {
@@ -45,8 +45,8 @@ void makeJobFolder(JobLoad& load, const wxString& workingDir) {
     job.sampleFile = job.tempDir + "/Measured sample.txt";
 }
 
-/// The control strip is looked up whatever could be read before it. The install folder is one of
-/// the job's keys (C32).
+/// Looks up the control strip even if earlier reads failed. The install folder is one of the job's
+/// own keys (C32).
 int loadControlStrip(JobLoad& load) {
     KZJobDataStruct& job = *load.job;
     int code = load.ticket.read("System/InstallFolder", &load.installFolder);
@@ -60,8 +60,8 @@ int loadControlStrip(JobLoad& load) {
     return code;
 }
 
-/// Of these reads only the workflow's depends on what came before: without a control strip the job
-/// has none (C31). None of their failures stands (C37).
+/// Only the workflow depends on an earlier step: without a control strip it is not read (C31).
+/// Failures of these reads are ignored (C37).
 void readMeasurementKeys(JobLoad& load, int code) {
     constexpr int devicesOfModeZero[] = {5, 11, 13, 15, 25};
     KZJobDataStruct& job = *load.job;
@@ -83,7 +83,7 @@ void readMeasurementKeys(JobLoad& load, int code) {
     }
 }
 
-/// How colours are compared, and under which preset.
+/// Reads how colours are compared, and the preset's id.
 int readComparison(JobLoad& load) {
     KZJobDataStruct& job = *load.job;
     const int code = load.ticket.read(stripKey(load.strip, "Workflow/Verify/DeltaEMode"), 0,
@@ -93,8 +93,8 @@ int readComparison(JobLoad& load) {
                                         &job.presetID);
 }
 
-/// Values of the preset's ticket. The first that is missing ends the row, without a consequence
-/// (C39).
+/// Reads values of the preset's ticket. Stops at the first missing one; the required behaviour
+/// ignores this failure (C39).
 void readPresetKeys(const JobTicket& ticket, tolerancePresetParameterRecord& tolerance) {
     const struct {
         const char* key;
@@ -113,8 +113,8 @@ void readPresetKeys(const JobTicket& ticket, tolerancePresetParameterRecord& tol
     }
 }
 
-/// Its file is fetched, and what its ticket says is read. Returns 0, or presetIncomplete for a
-/// preset without a name.
+/// Downloads the preset's file and reads its ticket. Returns 0, or presetIncomplete for a preset
+/// without a name.
 int loadTolerance(JobLoad& load) {
     KZJobDataStruct& job = *load.job;
     tolerancePresetParameterRecord& tolerance = job.tolerance;
@@ -129,8 +129,8 @@ int loadTolerance(JobLoad& load) {
     fetchFile(load, wxString::FromUTF8(presetPath(load.installFolder.utf8_string(), job.presetID)),
               fileWait, &tolerance.filePath);
     readPresetKeys(ticket, tolerance);
-    // The ticket's "FograPSDPreset" does not count, and the arrays of the plain kind are read in
-    // any case (C38): only the preset's file can make it one of the PSD kind.
+    // The ticket's "FograPSDPreset" is ignored, and the arrays of the plain kind are always read
+    // (C38): only the preset's file can turn the preset into one of the PSD kind.
     tolerance.fograPSDPreset = 0;
     ticket.readArray("Values/UsedForResult", presetValueCount, tolerance.usedForResult);
     ticket.readArray("Values/Preset", presetValueCount, tolerance.presetValues);
@@ -138,7 +138,7 @@ int loadTolerance(JobLoad& load) {
     return 0;
 }
 
-/// The strip that a job shares with the others of its parent takes the place of its own.
+/// Replaces the job's own strip by the strip that all jobs of its parent share.
 void loadNesting(JobLoad& load) {
     KZJobDataStruct& job = *load.job;
     load.ticket.read("General/ParentID", 0, &job.parentID);
@@ -148,7 +148,7 @@ void loadNesting(JobLoad& load) {
     }
     int mode = 0;
     load.ticket.read("Footer/Nesting/ControlstripMode", 0, &mode);
-    // A job without this text keeps its own strip (C40).
+    // Without this text, a job keeps its own strip (C40).
     int code = load.ticket.read("Footer/Nesting/PSDAssessment", &job.psdAssessment);
     if (mode == 1 && code == 0) {
         wxString name;
@@ -167,12 +167,12 @@ void readInlineValues(JobLoad& load) {
         0) {
         job.illuminationMode = -1;
     }
-    // Missing values stay 0 (C42): -1 is for a server that refuses the read, which this never does.
+    // Missing values stay 0 (C42): -1 means a refused read, and this read is never refused.
     load.ticket.readArray(measurementKey(load.strip, "Values/Measured"), presetValueCount,
                           job.measuredValues);
 }
 
-/// The type that the number of measurements gives.
+/// The job type for a number of measurements.
 int typeFor(int measurements) {
     constexpr int types[] = {0, 2, 3};
     return types[std::clamp(measurements, 0, 2)];
@@ -190,8 +190,9 @@ void decideJobType(JobLoad& load) {
         job.jobType = typeFor(job.measurementStatus);
     } else if (isInline) {
         readInlineValues(load);
-        job.jobType = typeFor(std::max(job.measurementStatus, 1)); // Never one to be measured.
-    } else if (job.measurementStatus >= 0) { // Else as the references left it (C43).
+        job.jobType = typeFor(std::max(job.measurementStatus, 1)); // Never a job to be measured.
+    } else if (job.measurementStatus >=
+               0) { // Otherwise keep the type set with the references (C43).
         job.jobType = typeFor(job.measurementStatus);
     }
 }
@@ -260,7 +261,7 @@ void KZVerifyJobProcessor::GetChildJobIDsFromParent(KZJobDataStruct* job) {
     }
 }
 
-// Only jobs that the server calls verifications (type 1) name the whole path.
+// Only a verification (type 1) names the whole path.
 int KZVerifyJobProcessor::GetJobJDFFileName(KZJobDataStruct* job) {
     const JobTicket ticket(m_connector, job->jobID);
     wxString name;
@@ -270,7 +271,7 @@ int KZVerifyJobProcessor::GetJobJDFFileName(KZJobDataStruct* job) {
         return code;
     }
     if (job->jobType == 0 || job->jobType == 2 || job->jobType == 3) {
-        // In bytes: a folder that is not valid UTF-8 is not missing, so nothing takes its place.
+        // Compared as bytes: a folder that is not valid UTF-8 still counts as present.
         const std::string folder = jdfFolder(ticket.texts(&code));
         if (!folder.empty()) {
             job->jdfServerFile = wxString::FromUTF8(folder) + "/" + name;

@@ -15,13 +15,13 @@ using namespace jobkeys;
 
 namespace {
 
-// Milliseconds that a file is waited for.
+// Time limits for downloads in milliseconds.
 constexpr int usualWait = 1000;
 constexpr int definitionWait = 200;
 constexpr int dynstripWait = 500;
 constexpr int profileWait = 5000;
 
-/// The path as wxFileName writes it, with doubled slashes as one. Nothing is looked up.
+/// The path in wxFileName's notation, with double slashes reduced. Does not access the file.
 wxString normalised(const wxString& path) {
     return wxFileName(path).GetFullPath();
 }
@@ -35,8 +35,8 @@ bool isDynamic(const JobLoad& load) {
     return isDynamic(load.strip, load.job->useDynstrip);
 }
 
-/// The definition that the server made of a dynamic strip lies beside the strip, and takes the name
-/// that a definition of ours would have. It need not be there (C34).
+/// Downloads the server's definition of a dynamic strip, which is next to the strip, under the name
+/// that our own definition would have. It is optional (C34).
 void fetchDynamicDefinition(const JobLoad& load, wxString stripServerPath) {
     stripServerPath.Replace(".it8", ".dcf");
     load.processor->m_connector->DownloadFile(load.job->tempDir + "/NMPatchSetDefinition.dcf",
@@ -73,8 +73,8 @@ int lookUpFixedStrip(const JobLoad& load) {
     return code;
 }
 
-/// A job of a packaging workflow: characterisation data, else the values of its strip. The last
-/// read alone decides: if it finds a strip, references that were not found are no failure (C35).
+/// A packaging job: characterization data, or else the values of its strip. Only the last read
+/// determines the result: if it finds a strip, missing references are not a failure (C35).
 int lookUpEskoReferences(const JobLoad& load) {
     wxString path;
     if (load.ticket.read(characterisationKey, &path) != 0) {
@@ -86,7 +86,7 @@ int lookUpEskoReferences(const JobLoad& load) {
     if (!path.empty()) {
         fetchFile(load, path, usualWait, &load.job->referenceFile);
     }
-    std::string strip; // As for a profile: a path that is no UTF-8 is one.
+    std::string strip; // As in lookUpProfile, any bytes are a path.
     if (load.ticket.read("Footer/ControlstripIT8", &strip) != 0 || strip.empty()) {
         return NoReference;
     }
@@ -94,7 +94,7 @@ int lookUpEskoReferences(const JobLoad& load) {
     return 0;
 }
 
-/// A path that is no UTF-8 leads nowhere, but is one: another profile must not take its place.
+/// A path that is not UTF-8 leads nowhere but still counts: no other profile may replace it.
 int lookUpProfile(const JobLoad& load) {
     if (load.job->measurementStatus > 0) {
         load.job->jobType = 3;
@@ -108,7 +108,7 @@ int lookUpProfile(const JobLoad& load) {
     return 0;
 }
 
-/// The values of the strip itself.
+/// Uses the values of the strip itself.
 int takeStripAsReference(const JobLoad& load) {
     load.job->referenceFile = load.job->controlStripFile;
     return 0;
@@ -120,7 +120,7 @@ int lookUpCharacterisation(const JobLoad& load) {
     if (value.empty()) {
         return NoReference;
     }
-    // A value that is not valid UTF-8 is empty from here on.
+    // From here on, a value that is not valid UTF-8 is empty.
     const std::string text = wxString::FromUTF8(value).utf8_string();
     const wxString path =
         wxString::FromUTF8(characterisationPath(load.installFolder.utf8_string(), text));
@@ -140,7 +140,7 @@ int takeStoredReferences(const JobLoad& load) {
     }
     if (load.processor->WriteTemporarySampleFile(job, true) != 0 ||
         !measure::fileExists(job.referenceFile)) {
-        // The line names the other file (C36).
+        // The log line names the wrong file (C36).
         CLogger::GetLogger()->Log("Temporary Reference file not found = %s",
                                   measure::pathBytes(job.sampleFile).c_str());
         return NoReference;

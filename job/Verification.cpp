@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The way of a job from its arguments to its result code. Its folder stays (C26).
+// The steps of a job from its arguments to its result code. The job's folder is kept (C26).
 #include <algorithm>
 #include <chrono>
 #include <iterator>
@@ -22,12 +22,12 @@ namespace {
 
 using std::chrono::steady_clock;
 
-/// Bytes that were widened one by one become text again.
+/// Restores text from bytes that were widened one by one.
 wxString textOf(const std::wstring& text) {
     return stringToWstring(wstringToString(text));
 }
 
-/// Result of a login, by the connector's code (C16).
+/// Maps the connector's code to the exit code of a failed login (C16).
 int loginFailure(int code) {
     switch (code) {
     case -2005:
@@ -43,14 +43,14 @@ int loginFailure(int code) {
     }
 }
 
-/// How long a job waits for its server: a third of the time that the login took (C15).
+/// The time that a job waits for its server: a third of the duration of the login (C15).
 std::chrono::milliseconds pauseAfter(steady_clock::duration login) {
     constexpr double longest = 5000.0;
     const double pause = std::chrono::duration<double>(login).count() * 1000.0 / 3.0;
     return std::chrono::milliseconds(static_cast<int>(std::min(pause, longest)));
 }
 
-/// Writes a file for the viewer, logging where that fails.
+/// Writes a file for the viewer. Logs a failure.
 bool writeForViewer(const wxString& path, const std::wstring& text, const char* complaint) {
     const std::string bytes = measure::pathBytes(path);
     const bool written = base::writeTextInPlace(bytes, text) && measure::fileExists(path);
@@ -70,7 +70,7 @@ bool isThere(const wxString& path, const char* complaint) {
     return found;
 }
 
-/// The viewer is ended first where one runs (C18).
+/// A running viewer is terminated first (C18).
 int showResult(KZJobDataStruct& job, const std::wstring& json) {
     if (!writeForViewer(job.tempDir + "/output.json", json, "json")) {
         return exitResultNotWritten;
@@ -90,7 +90,7 @@ int showResult(KZJobDataStruct& job, const std::wstring& json) {
 
 } // namespace
 
-// A job id that is not a number ends the process by an uncaught exception (C8).
+// A job id that is not a number ends the process with an uncaught exception (C8).
 int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std::wstring password,
                                       std::wstring jobID, std::wstring strip, std::wstring language,
                                       bool remeasure) {
@@ -136,11 +136,11 @@ int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std:
         return exitJobNotListed;
     }
 
-    // Spelt like this in every log (C17).
+    // Every log has this spelling (C17).
     CLogger::GetLogger()->Log("Veryfing Job ID = %s", wstringToString(jobID).c_str());
     int result = LoadKZJobData(id, &job);
     const ticket::Block<int> children(job.childJobIDs);
-    // wxMilliSleep would end at the signal of any child that ends.
+    // wxMilliSleep would be interrupted by SIGCHLD.
     std::this_thread::sleep_for(pause);
     CLogger::GetLogger()->Log("LoadKZJobData returns = %d", result);
     if (result == exitDone) {
@@ -179,7 +179,7 @@ int KZVerifyJobProcessor::VerifyLoadedJob(KZJobDataStruct* job, bool remeasure) 
     if (result == exitDone) {
         WriteBackResults(job->jobID, *job, results, remeasure);
         result = showResult(*job, json);
-        job->measurement = measurementDataRecord(); // Its arrays went with the write-back.
+        job->measurement = measurementDataRecord(); // The write-back has freed its arrays.
     }
     return result;
 }
@@ -193,7 +193,7 @@ bool KZVerifyJobProcessor::IsToBeCompared(const KZJobDataStruct& job, bool remea
     return !remeasure && isMeasured;
 }
 
-// A missing reference file is logged and does not end this road: the analysis reports it (C19).
+// A missing reference file is logged but does not end the run here: the analysis reports it (C19).
 int KZVerifyJobProcessor::CompareStoredData(KZJobDataStruct* job, std::wstring* json) {
     CLogger::GetLogger()->Log("Comparing existing data");
     const int loaded = LoadKZJobMeasurements(job);

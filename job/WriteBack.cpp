@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The result of one strip, written to its job: into the JDF, where the job's workflow asks for it,
-// and into the ticket, under the keys of the strip.
+// Writes the result of one strip to its job: into the JDF, if the job's workflow requires it, and
+// into the ticket, under the keys of the strip.
 #include <algorithm>
 #include <array>
 #include <cmath>
@@ -31,10 +31,10 @@ using namespace jobkeys;
 
 namespace {
 
-constexpr int workflowWithJdf = 3; ///< Of KZJobDataStruct::measurementWorkflow.
+constexpr int workflowWithJdf = 3; ///< Value of KZJobDataStruct::measurementWorkflow.
 
-constexpr int paperWhite = 4;    ///< Of analyseResultsRecord::approvals.
-constexpr int averageDeltaE = 5; ///< Of analyseResultsRecord::values.
+constexpr int paperWhite = 4;    ///< Index in analyseResultsRecord::approvals.
+constexpr int averageDeltaE = 5; ///< Index in analyseResultsRecord::values.
 constexpr int maximumDeltaE = 6;
 
 /// A job's ticket, below the root of one of its strips.
@@ -64,7 +64,7 @@ std::string commentOf(Strip strip) {
     return strip == Strip::First ? "Remote confirmation M1" : "Remote confirmation M2";
 }
 
-/// How the JDF names a formula.
+/// The formula's name in the JDF.
 const char* formulaName(int deltaEType) {
     switch (deltaEType) {
     case 2:
@@ -80,8 +80,8 @@ const char* formulaName(int deltaEType) {
     }
 }
 
-/// A device value of 0 to 255 in percent: of the first strip with two decimals, of the second one,
-/// as a 16-bit number, without any (C85).
+/// Converts a device value of 0 to 255 to percent: with two decimals for the first strip, as a
+/// 16-bit integer for the second (C85).
 double percentOf(double value, Strip strip) {
     if (strip == Strip::First) {
         return round_(value / 2.55, 2);
@@ -92,7 +92,7 @@ double percentOf(double value, Strip strip) {
 
 using Bytes = std::array<unsigned char, presetValueCount>;
 
-/// Flags as they lie in the record: another vendor's library may mean more than 0 and 1 by them.
+/// Copies the flags as bytes: another vendor's library may store other values than 0 and 1.
 Bytes bytesOf(const bool (&flags)[presetValueCount]) {
     static_assert(sizeof flags == sizeof(Bytes));
     Bytes bytes;
@@ -100,7 +100,7 @@ Bytes bytesOf(const bool (&flags)[presetValueCount]) {
     return bytes;
 }
 
-/// The JDF calls every measurement approved (C82); whether it passed is another attribute.
+/// The JDF marks every measurement as approved (C82). Another attribute shows whether it passed.
 JDFMeasurementHeader headerOf(KZJobDataStruct& job, const analyseResultsRecord& results) {
     JDFMeasurementHeader header;
     JdfHandler::SetJDFMeasurementHeaderDefaults(&header);
@@ -120,7 +120,7 @@ JDFMeasurementHeader headerOf(KZJobDataStruct& job, const analyseResultsRecord& 
     return header;
 }
 
-/// What fails here changes nothing of the rest (C83).
+/// Failures here do not affect the other steps (C83).
 void updateJdf(CKZConnector& connector, KZJobDataStruct& job, const analyseResultsRecord& results) {
     JDFMeasurementHeader header = headerOf(job, results);
     JdfHandler::AppendJDFFileData(job, commentOf(stripOf(job.secondStrip)), &header, true);
@@ -128,11 +128,11 @@ void updateJdf(CKZConnector& connector, KZJobDataStruct& job, const analyseResul
 }
 
 int oneMore(int count) {
-    return static_cast<int>(static_cast<unsigned>(count) + 1U); // It wraps (C89).
+    return static_cast<int>(static_cast<unsigned>(count) + 1U); // Wraps around (C89).
 }
 
-/// The verdict, and when it was found. Date and time are read one after the other, so that midnight
-/// can fall between them, and the code is that of the last write (C86).
+/// Writes the verdict and its date and time. These are read one after the other, so midnight can
+/// fall between them. Returns the code of the last write (C86).
 int writeVerdict(const StripTicket& ticket, bool passed) {
     ticket.write("Approval", passed ? 1 : 0);
     ticket.write("Comment", commentOf(ticket.strip()));
@@ -142,14 +142,14 @@ int writeVerdict(const StripTicket& ticket, bool passed) {
     return ticket.write("Time", std::string(time.mb_str(wxConvLibc)));
 }
 
-/// A number of samples that does not fit a row is damage.
+/// A number of samples that does not fit a row is invalid.
 bool hasSpectra(const measurementDataRecord& measurement) {
     return measurement.spectral != nullptr && measurement.numPatches > 0 &&
            measurement.spectral->length >= 0 && measurement.spectral->length <= spectralValueCount;
 }
 
-/// The columns of one of the record's arrays, each value as `convert` gives it; `values` has room
-/// for one column.
+/// Writes the columns of one of the record's arrays, with `convert` applied to each value. `values`
+/// is a buffer for one column.
 template<class Convert>
 void writeColumns(const StripTicket& ticket, std::span<const char* const> names, const double* rows,
                   int patches, double* values, Convert convert) {
@@ -165,8 +165,8 @@ void writeColumns(const StripTicket& ticket, std::span<const char* const> names,
     }
 }
 
-/// Only a measurement with spectra has its patches written, XYZ, Lab and device values included
-/// (C88). The first patch tells the range of all spectra.
+/// Patches, including XYZ, Lab and device values, are written only if the measurement has spectra
+/// (C88). The first patch determines the range of all spectra.
 void writePatches(const StripTicket& ticket, const measurementDataRecord& measurement) {
     const spectralRow& first = measurement.spectral[0];
     const int patches = measurement.numPatches;
@@ -209,7 +209,7 @@ void writeMeasured(const StripTicket& ticket, const tolerancePresetParameterReco
     ticket.writeArray("Values/Measured", positionCount, measured);
 }
 
-/// Approvals or decimals: those of a PSD preset under a name and in an order of their own.
+/// Writes approvals or decimals. Those of a PSD preset have their own key and order.
 void writeVerdicts(const StripTicket& ticket, const std::string& name, bool isPsd,
                    const Bytes& verdicts) {
     int numbers[positionCount];
@@ -222,7 +222,7 @@ void writeVerdicts(const StripTicket& ticket, const std::string& name, bool isPs
 
 } // namespace
 
-// What can't be written is passed over: the job goes on without it (C90).
+// Failed writes are skipped: the job continues without them (C90).
 int KZVerifyJobProcessor::CopyResulDataToJobTicket(int jobID, KZJobDataStruct job,
                                                    analyseResultsRecord results, bool remeasure) {
     if (jobID < 0 || (job.secondStrip != 0 && job.secondStrip != 1)) {

@@ -1,14 +1,14 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Times the parts and the whole program against their peers; takes about five minutes on a machine
-# that does nothing else.
+# Times the parts and the whole program against their peers. Takes about five minutes on an idle
+# machine.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
 scripts/setup.sh
 cmake --preset release >/dev/null
 
-# Each prints a ratio against a peer or a bare loop that it times in the same run.
+# Each prints a ratio against a peer or a bare loop timed in the same run.
 benches=(colour_cgats_bench colour_cxf_bench colour_difference_bench ticket_list_bench ticket_flush_bench jdf_bench
   store_bench measure_bench job_bench)
 cmake --build --preset release --target Tintgate empty_wx store_postgres_bench "${benches[@]}"

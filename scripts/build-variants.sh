@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Builds everything with the second compiler and with each build type, as somebody does who knows no
-# preset. Installs each build and runs a job there. Takes an hour on two cores; build/variants-NAME
-# is kept. The names of variants as arguments select some of them.
+# Builds everything with the second compiler and with each build type, without presets. Installs
+# each build and runs a job there. Takes an hour on two cores and keeps build/variants-NAME.
+# Arguments select variants by name.
 #
 #   default      no build type: must be optimised
 #   Release, Debug, MinSizeRel       g++

@@ -1,6 +1,6 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Runs the file forms of the tool on real data and shows what came out.
+"""Runs the file forms of the tool on real data and shows the results.
 
 demo.py TINTGATE FOLDER
 """
@@ -38,7 +38,7 @@ class Demo:
         print(f"exit code {code}: {self.meanings.get(code, 'not in the list')}")
         if code != expected:
             self.surprises += 1
-            print(f"  expected was {expected}")
+            print(f"  expected: {expected}")
 
     def compare(self, target, measurement, output, verdict):
         self.run(target, measurement, PRESET, output)
@@ -46,7 +46,7 @@ class Demo:
         show(result)
         if result["verdict"] != verdict:
             self.surprises += 1
-            print(f"  expected was {verdict}")
+            print(f"  expected: {verdict}")
 
 
 def show(result):
@@ -113,7 +113,7 @@ def main(tool, folder):
     demo.run("README.md", expected=22)
     demo.run(f"{folder}/missing.ti3", expected=20)
 
-    print(f"\nThe files are in {folder}. docs/result.md explains what a result holds.")
+    print(f"\nThe files are in {folder}. docs/result.md explains what a result contains.")
     return 1 if demo.surprises else 0
 
 

@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Builds the tool and shows it at work on real data: characterisations of printing conditions, and
-# CMYK profiles, as Debian ships them. First it compares files, then it verifies the jobs of a print
-# room. What comes out stays in build/demo.
+# Builds the tool and demonstrates it on real data from Debian packages: characterization data of
+# printing conditions, and CMYK profiles. First it compares files, then it verifies the jobs of a
+# print room. The results stay in build/demo.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 

@@ -1,11 +1,11 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Verifies jobs of a print server: makes a store with real data, runs the tool on each job as a
-client does, and shows what came out.
+"""Verifies jobs of a print server: creates a store with real data, runs the tool on each job as a
+client does, and shows the results.
 
 demo_jobs.py BUILD FOLDER
 
-Each run has a system root and a temporary folder of its own, so that they can run side by side.
+Each run has its own system root and temporary folder, so runs can execute in parallel.
 """
 
 import csv
@@ -23,7 +23,7 @@ ICC = Path("/usr/share/color/icc")
 PROFILE = ICC / "ghostscript/default_cmyk.icc"
 USER, PASSWORD = "anna", "gate-44"
 REMEASURE = "KEY_KZ_REMEASURE:=:true"
-PATIENCE = 30  # Seconds for a report, which the tool does not wait for.
+PATIENCE = 30  # Seconds to wait for a report; the tool itself does not wait for it.
 
 
 @dataclass
@@ -36,7 +36,7 @@ class Job:
 
 @dataclass
 class Run:
-    """One start of the tool."""
+    """One run of the tool."""
     job: int
     title: str
     strip: int = 1
@@ -53,8 +53,8 @@ STORED = [
 ]
 
 
-# Jobs that are still to be measured, printed by the virtual instrument. Nobody uses the results of a
-# virtual instrument for a print.
+# Jobs still to be measured, printed by the virtual instrument. Never use its results for real
+# prints.
 PRINTED = f"instrument = virtual\nprofile = {PROFILE}\nerror = 0.6\n"
 TINTED = PRINTED + "bias = -1.5 0.5 4\n"
 TO_MEASURE = ["--unmeasured", "--references", PROFILE]
@@ -64,7 +64,7 @@ UNMEASURED = [
     Job(7, "Nested, left", [*TO_MEASURE, "--parent", "100"]),
     Job(8, "Nested, right", [*TO_MEASURE, "--parent", "100"]),
 ]
-# One after the other; the runs of a batch side by side.
+# Batches run one after the other; the runs of a batch run in parallel.
 BATCHES = [
     ("One strip, the first of two, and a strip for two nested jobs",
      [Run(5, "One strip", instrument=TINTED), Run(6, "First of two strips", instrument=PRINTED),
@@ -88,10 +88,10 @@ def meanings():
 
 
 class Room:
-    """A print room: its store, and the programs beside it."""
+    """A print room: its store and the companion programs."""
 
     def __init__(self, build, folder, store=None):
-        """In the folder; the store in it too, or at another address."""
+        """`folder` contains the store too, unless it is at another address."""
         self.build = build
         self.folder = folder
         self.store = store or str((folder / "store").resolve())
@@ -101,7 +101,7 @@ class Room:
         self.administer("user", "add", USER, "--password-file", "-", text=PASSWORD)
 
     def administer(self, *words, text=None):
-        """What tintgate-store answers."""
+        """The output of tintgate-store."""
         done = subprocess.run([self.build / "bin/tintgate-store", "--store", self.store, *words],
                               input=text, capture_output=True, text=True, check=False)
         if done.returncode != 0:
@@ -109,7 +109,7 @@ class Room:
         return done.stdout
 
     def deliver(self, job):
-        """Brings a job to the server, as its clients would."""
+        """Adds a job to the server, as its clients would."""
         parts = self.folder / f"delivered-{job.number}"
         subprocess.run([sys.executable, "docs/example-job/make-job.py", parts, "--job",
                         str(job.number), "--title", job.title, *job.options],
@@ -118,7 +118,7 @@ class Room:
         self.administer("file", "put", parts / "server", "/server")
 
     def make_place(self, name):
-        """A system root and a temporary folder, for one run at a time."""
+        """A system root and a temporary folder, used by one run at a time."""
         place = self.folder / name
         (place / "tmp").mkdir(parents=True)
         subprocess.run(["cmake", "--install", self.build, "--component", "companions", "--prefix",
@@ -126,11 +126,11 @@ class Room:
         return place
 
     def start(self, run, place=None):
-        """The tool's process on a run, and the job's folder."""
+        """Starts the tool on a run. Returns the process and the job's folder."""
         again = "-again" if run.remeasure else ""
         place = place or self.make_place(f"run-{run.job}-{run.strip}{again}")
         environment = {name: value for name, value in os.environ.items()
-                       if name not in ("DISPLAY", "WAYLAND_DISPLAY")}  # No browser for each.
+                       if name not in ("DISPLAY", "WAYLAND_DISPLAY")}  # Prevents a browser for each run.
         environment |= {"TINTGATE_ROOT": str((place / "root").resolve()),
                         "TMPDIR": str((place / "tmp").resolve())}
         if run.instrument:
@@ -146,7 +146,7 @@ class Room:
 
 
 def report_of(job_folder):
-    """The page that the viewer makes of a run."""
+    """The viewer's page of a run."""
     end = time.monotonic() + PATIENCE
     while time.monotonic() < end:
         pages = sorted(job_folder.glob("report-*.html"))
@@ -157,7 +157,7 @@ def report_of(job_folder):
 
 
 def run_all(room, runs, codes):
-    """Starts all runs at once and shows a row for each. Returns how many went wrong."""
+    """Starts all runs at once and shows a row for each. Returns the number of failures."""
     started = [(run, *room.start(run)) for run in runs]
     surprises = 0
     print(f"\n  {'JOB':>3}  {'STRIP':>5}  {'TITLE':30} {'EXIT':>4}  {'VERDICT':10} LARGEST FAILURE")
@@ -189,7 +189,7 @@ def verdict_of(result):
 
 
 def show_tickets(room, numbers):
-    """What the write-back changes, of some tickets."""
+    """What the write-back changes in some tickets."""
     rows = [(f"job {number}", [held(room, number, key) for key in SHOWN]) for number in numbers]
     names = [key.removeprefix("Remote/").replace("Measurement", "M") for key in SHOWN]
     widths = [max(len(name), *(len(values[index]) for _, values in rows))
@@ -207,7 +207,7 @@ def held(room, number, key):
 
 
 def show_jdf(room, number):
-    """The element that the write-back puts into a job's JDF, without its many patches."""
+    """The element that the write-back adds to a job's JDF, without most of its patches."""
     path = room.folder / f"job-{number}.jdf"
     room.administer("file", "get", f"/server/temp/job-{number}.jdf", path)
     text = path.read_text(encoding="utf-8", errors="replace")
@@ -215,7 +215,7 @@ def show_jdf(room, number):
     lines = [line.strip() for line in text.splitlines() if "<tazo:" in line]
     for line in lines[:2]:
         print(textwrap.fill(line, 100, initial_indent="  ", subsequent_indent="      "))
-    print(f"  ... and {len(lines) - 2} lines more")
+    print(f"  ... and {len(lines) - 2} more lines")
     return len(lines) == 0
 
 
@@ -231,7 +231,7 @@ def main(build, folder):
         room, [Run(job.number, job.title, strip) for job in STORED for strip in job.strips], codes)
 
     headline("Jobs to be measured: printed by a virtual instrument, results written back")
-    # Each JDF is made ready for its updates at delivery.
+    # Each JDF is prepared for updates when it is delivered.
     room.administer("key", "set", "system", "System/Jdf/Updates", "int", "6")
     for job in UNMEASURED:
         room.deliver(job)

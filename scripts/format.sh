@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Formats all C++ of the tree as .clang-format says; with --check it changes nothing, prints what
-# differs and fails.
+# Formats all C++ in the tree with clang-format. With --check, changes nothing, prints the
+# differences and fails if there are any.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 

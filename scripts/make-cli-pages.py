@@ -1,7 +1,7 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Makes a manual page or a bash completion of what a program says to --help, its commands included,
-so that neither can tell anything else than the program.
+"""Makes a manual page or a bash completion from the --help output of a program and its commands, so
+that both always match the program.
 
 make-cli-pages.py man        PROGRAM VERSION page.1
 make-cli-pages.py completion PROGRAM completion
@@ -16,19 +16,19 @@ from pathlib import Path
 
 @dataclass
 class Command:
-    words: tuple  # Of the command behind the program's name.
+    words: tuple  # Of the command, without the program's name.
     summary: str = ""
     usage: str = ""
     positionals: list = field(default_factory=list)  # Pairs of name and text.
     options: list = field(default_factory=list)
-    groups: list = field(default_factory=list)  # Pairs of a heading and further options.
-    names: list = field(default_factory=list)  # Pairs of a command below and its text.
+    groups: list = field(default_factory=list)  # Pairs of a heading and more options.
+    names: list = field(default_factory=list)  # Pairs of a subcommand and its text.
     footer: list = field(default_factory=list)  # Lines.
     below: list = field(default_factory=list)
 
 
 def entries(lines):
-    """Rows of a name and its text; a text may begin on the line behind the name, and go on."""
+    """Rows of a name and its text. A text may start on the next line and have several lines."""
     rows = []
     for line in lines:
         start = re.match(r"  (\S.*?)(?:\s{2,}(\S.*))?$", line)
@@ -55,7 +55,7 @@ def ask(program, words=()):
             current = line[:-1]
             sections[current] = []
         elif current and line and not line.startswith(" "):
-            current = "footer"  # All that stands behind the last list.
+            current = "footer"  # Everything after the last list.
             sections.setdefault(current, []).append(line)
         else:
             sections[current].append(line)
@@ -84,7 +84,7 @@ def described(rows):
 
 
 def footer_lines(lines):
-    """Lines as they stand: a footer is laid out by hand."""
+    """Keeps the lines unchanged: footers are formatted by hand."""
     while lines and not lines[-1]:
         lines = lines[:-1]
     return [".PP", ".nf", *map(roff, lines), ".fi"] if lines else []
@@ -123,7 +123,7 @@ def man(program, version):
 
 
 def words_of(command):
-    """What can stand behind a command: its long options, and the names of commands below."""
+    """Possible words after a command: its long options and its subcommands."""
     rows = sum((rows for _, rows in command.groups), command.options)
     options = re.findall(r"--[a-z][a-z-]*", " ".join(name for name, _ in rows))
     return sorted(dict.fromkeys(options)) + [name for name, _ in command.names]

@@ -1,7 +1,8 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Makes whatever states exit statuses of the companion programs from docs/companion-statuses.csv:
-the header that the programs and their help use, and the lists in their pages of docs/.
+"""Generates everything that lists exit statuses of the companion programs from
+docs/companion-statuses.csv: the header for the programs and their help, and the lists in their
+pages in docs/.
 
 make-companion-statuses.py header docs/companion-statuses.csv CompanionStatuses.h
 make-companion-statuses.py pages  docs/companion-statuses.csv    replaces the lists in the pages
@@ -12,7 +13,7 @@ import re
 import sys
 from pathlib import Path
 
-sys.dont_write_bytecode = True  # The source tree stays as it is.
+sys.dont_write_bytecode = True  # Keeps the source tree unchanged.
 from tables import (c_text, expect_rising, markdown, read, replaced, roff, sentence,  # noqa: E402
                     write_or_check)
 
@@ -37,7 +38,7 @@ MARKS = {
     ".md": (f"<!-- {MADE} -->\n\n", "\n<!-- End of the table. -->\n"),
     ".1": (f'.\\" {MADE}\n', '.\\" End of the statuses.\n'),
 }
-# Pages that list the statuses of a program. The manual pages of other programs are made of their help.
+# Pages that list a program's statuses. Other programs' manual pages are made from their help.
 PAGES = {
     "tintgate-store": ("stores.md",),
     "tintgate-report": ("report.md",),
@@ -60,7 +61,7 @@ def statuses_of(path):
 
 
 def plain(text):
-    """Without Markdown's backticks."""
+    """Removes Markdown's backticks."""
     return text.replace("`", "")
 
 

@@ -1,7 +1,8 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Makes whatever states exit codes, so that each is described in one place: docs/exit-codes.csv
-describes the codes, docs/job-outcomes.csv beside it what those that a job can end with ask of whom.
+"""Generates everything that lists exit codes, so that each is described in one place:
+docs/exit-codes.csv describes the codes; docs/job-outcomes.csv, next to it, describes what the codes
+of jobs require of whom.
 
 make-exit-codes.py header docs/exit-codes.csv ExitCodes.h
 make-exit-codes.py man    docs/exit-codes.csv page.1.in page.1
@@ -14,33 +15,33 @@ import re
 import sys
 from pathlib import Path
 
-sys.dont_write_bytecode = True  # The source tree stays as it is.
+sys.dont_write_bytecode = True  # Keeps the source tree unchanged.
 from tables import (c_text, expect_rising, markdown, read, replaced, roff,  # noqa: E402
                     write_or_check)
 
 HEADER = """\
-// Made from the lists that document exit codes.
+// Generated from docs/exit-codes.csv and docs/job-outcomes.csv; change those files instead.
 #pragma once
 
-/// Exit codes of the tool, and statuses of the analysis library. One code for one cause.
+/// Exit codes of the tool, and statuses of the analysis library. Each code has one cause.
 enum ExitCode : int {{
 {enumerators}
 }};
 
-/// What a code means to the person who meets it. All texts are ASCII, without a full stop at their
-/// end, and neither empty nor null. The last three are null if no job ends with the code.
+/// Explains a code to people. All texts are ASCII without a final full stop, and not empty. Only the
+/// last three can be null: if no job ends with the code.
 struct ExitCodeText {{
     int code;
     const char* name;
     const char* meaning;
     const char* cause;
     const char* remedy;
-    const char* jobCause; ///< What causes the code in a job: often `cause`.
+    const char* jobCause; ///< Cause of the code in a job: often `cause`.
     const char* jobActor; ///< Who can change the outcome: client, operator or administrator.
     const char* jobRetry; ///< Whether the same call can help: begins with no, after a fix, or yes.
 }};
 
-/// Every code, in rising order.
+/// Every code, in ascending order.
 inline constexpr ExitCodeText exitCodeTexts[] = {{
 {rows}
 }};
@@ -62,7 +63,7 @@ def by_code(path, columns):
 
 
 def outcomes_of(path, codes):
-    """Of the codes that a job can end with: the row, with the code's own cause if it has none."""
+    """The rows of the codes that a job can end with. If a row has no cause, gets the code's own."""
     outcomes = by_code(path, ("who", "retry"))
     for code, row in outcomes.items():
         if code not in codes:
@@ -79,7 +80,7 @@ def outcomes_of(path, codes):
 
 
 def rows_of(path):
-    """All codes in rising order; "job" is the outcome, or None."""
+    """All codes in ascending order. "job" is the outcome, or None."""
     codes = by_code(path, ("name", "from", "meaning", "cause", "remedy"))
     outcomes = outcomes_of(Path(path).with_name("job-outcomes.csv"), codes)
     return [row | {"job": outcomes.get(code)} for code, row in codes.items()]
@@ -104,7 +105,7 @@ def header(rows):
 
 
 def own_job_cause(row):
-    """The cause in a job, if it differs from the code's."""
+    """The cause in a job if it differs from the code's."""
     job = row["job"]
     return job["job_cause"] if job and job["job_cause"] != row["cause"] else None
 
@@ -121,7 +122,7 @@ def man(rows, template):
 
 
 def stars(text):
-    """L*a*b* is not emphasis."""
+    """Prevents L*a*b* from being read as emphasis."""
     return text.replace("*", "\\*")
 
 

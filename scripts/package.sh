@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Builds the Debian packages; they stand in build/package.
+# Builds the Debian packages in build/package.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 

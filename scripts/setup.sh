@@ -1,6 +1,6 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Installs the Debian packages for building, testing and the demo; quick where all are there.
+# Installs the Debian packages for building, testing and the demo. Fast if they are all there.
 set -euo pipefail
 
 packages=(

@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
-"""What the makers of lists of codes have in common: reading a CSV file, writing its texts into C++,
-manual pages and Markdown, and replacing the made part of a page that is otherwise written by hand.
+"""Shared by the generators of code lists: reads a CSV file, writes its texts into C++, manual pages
+and Markdown, and replaces the generated part of a handwritten page.
 """
 
 import csv
@@ -8,7 +8,7 @@ import sys
 
 
 def read(path, columns):
-    """The rows. Ends the program if one of these columns is empty, not ASCII or ends with a stop."""
+    """The rows. Exits if one of these columns is empty, is not ASCII or ends with a full stop."""
     with open(path, newline="", encoding="utf-8") as source:
         rows = list(csv.DictReader(source, strict=True))
     for row in rows:
@@ -44,7 +44,7 @@ def markdown(heads, rows):
 
 
 def replaced(path, start, made, end):
-    """The page with `made` between its marks, which are whole lines and stay."""
+    """The page with `made` between its marks, which are whole lines and are kept."""
     page = path.read_text(encoding="utf-8")
     head, found_start, rest = page.partition(start)
     _, found_end, tail = rest.partition(end)
@@ -54,7 +54,7 @@ def replaced(path, start, made, end):
 
 
 def write_or_check(path, text, check, command):
-    """Ends the program if the page is to be checked and is out of date."""
+    """With check, exits if the page is out of date."""
     if not check:
         path.write_text(text, encoding="utf-8")
     elif text != path.read_text(encoding="utf-8"):

@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Builds everything and runs all tests: as it is delivered, then under the address and
-# undefined-behaviour sanitizers. Names of presets as arguments choose others.
+# Builds everything and runs all tests, first as delivered, then under the address and
+# undefined-behaviour sanitizers. Arguments select other presets by name.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 

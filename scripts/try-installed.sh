@@ -1,8 +1,8 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Tries what `cmake --install` put into a prefix. Verifies a job with nothing in the environment that
-# leads to a suite: measured by the virtual instrument, then shown. Then builds the example of the
-# library's users against the installed headers and library.
+# Tests the result of `cmake --install` in a prefix. Verifies a job without environment variables
+# that refer to a suite: measures it with the virtual instrument, then shows it. Then builds the
+# library's example against the installed headers and library.
 #
 #   try-installed.sh PREFIX [COMPILER OPTION...]
 set -euo pipefail

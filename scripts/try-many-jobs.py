@@ -1,23 +1,23 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Has many processes verify many jobs of one store at the same time, and checks that each job is
-closed exactly when it should be, that nothing is lost and nothing is done twice.
+"""Lets many processes verify many jobs of one store at the same time. Checks that each job is
+closed exactly when it should be, and that nothing is lost or done twice.
 
   try-many-jobs.py BUILD FOLDER [STORE] [--jobs N] [--processes N] [--stops N --server FOLDER]
 
-STORE is the address of a store that is to be made: a folder, or a connection service such as
-with-postgres.sh gives, whose name there is "tintgate". Of ten jobs, four are stored measurements,
-three are to be measured, one of two strips, which two runs measure, and two are nested and have a
-parent: one run measures them for all three. Tickets are judged, and watched while the runs go on.
+STORE is the address of the store to create: a folder, or a connection service such as "tintgate" of
+with-postgres.sh. Of ten jobs, four are stored measurements; three are to be measured; one has two
+strips, measured by two runs; and two are nested and have a parent: one run measures them for all
+three. Tickets are checked during and after the runs.
 
-Each process runs at a place of its own. No two places measure alike, and every other one prints so
-that its jobs fail, but a place measures all its jobs alike. So a ticket tells whether the whole of
-a result comes from the run that it is to come from.
+Each process runs at its own place. No two places measure the same values, and at every other place
+the jobs fail, but each place measures all its jobs alike. So a ticket shows whether a result comes
+completely from the expected run.
 
-With --stops the PostgreSQL server of with-postgres.sh's FOLDER (that of the command it runs, where
-none is given) is stopped as by a crash so many times, at random moments. Then each run must end in
-a documented code within its time, each array of a ticket and each file must be whole or not there,
-what a run wrote must end where the server went away, and a job whose results were cut off must be
+With --stops, the PostgreSQL server of with-postgres.sh's FOLDER (by default, the server of the
+command that it runs) is stopped N times, as by a crash, at random moments. Then each run must end
+with a documented code in time; each array of a ticket and each file must be complete or absent; a
+run's writes must stop where the server went away; and a job with incomplete results must be
 complete after a reset and another run.
 """
 
@@ -39,13 +39,13 @@ from pathlib import Path
 
 from demo_jobs import PRINTED, TINTED, TO_MEASURE, Job, Room, Run
 
-# Keys that differ from run to run, or from strip to strip: CMYK is rounded in two ways.
+# Keys that differ between runs or strips: CMYK is rounded in two ways.
 OF_A_RUN = ("Date", "Time", "Comment", "CMYKValues/")
-PATCHES = 48  # Of the example job.
-TIME_LIMIT = 120  # Seconds that a run may take, whatever becomes of its server.
+PATCHES = 48  # In the example job.
+TIME_LIMIT = 120  # Seconds that a run may take, whatever happens to its server.
 ROOTS = {1: "Remote/Measurement", 2: "Remote/Measurement2"}
 VERDICTS = {0: (212, "Verification Failed"), 1: (211, "Verified")}  # By approval.
-# Keys of a strip in the order in which a run writes them, each by a change of its own.
+# Keys of a strip in the order in which a run writes them, one change each.
 WRITTEN = ["Status", "Approval", "Comment", "Date", "Time", "SpectralValues/Length", "Numpatches",
            "SpectralValues/DValues", "XYZValues/XValues", "LabValues/BValues",
            "CMYKValues/KValues", "Values/Measured", "Values/Approval", "Values/Decimal"]
@@ -59,14 +59,14 @@ def strips_of(kind):
 
 
 def keys_of(room, kind, number):
-    """The job's keys and files on the server, made once for all of its kind."""
+    """The job's keys and files on the server, created once for all jobs of its kind."""
     room.deliver(Job(number, kind, KINDS[kind]))
     exported = json.loads(room.administer("export", f"job/{number}"))
     return exported["tickets"][0]["keys"]
 
 
 def fill(room, count):
-    """Tickets of so many jobs. Returns the runs that they take, each job's kind and its keys."""
+    """Tickets of `count` jobs. Returns their runs, each job's kind and its keys."""
     models = {kind: keys_of(room, kind, 1 + index) for index, kind in enumerate(KINDS)}
     jdf = room.folder / "job.jdf"
     room.administer("file", "get", "/server/temp/job-1.jdf", jdf)
@@ -112,7 +112,7 @@ def fill(room, count):
 
 
 def ask(room, *words):
-    """What tintgate-store answers, as bytes; asked again while the server is away."""
+    """The output of tintgate-store as bytes. Retries while the server is down."""
     for _ in range(100):
         done = subprocess.run([room.build / "bin/tintgate-store", "--store", room.store, *words],
                               capture_output=True, check=False)
@@ -131,7 +131,7 @@ ARRAYS = {"XYZValues/XValues": PATCHES, "CMYKValues/KValues": PATCHES,
 
 
 def strip_fault(keys, root):
-    """What is wrong with the measurement of a strip; nothing where it is whole and counted once."""
+    """Describes an error in a strip's measurement. Empty if it is complete and counted once."""
     for name, value in {"Status": {"int": 1}, "Numpatches": {"int": PATCHES}}.items():
         if keys.get(f"{root}/{name}") != value:
             return f"{root}/{name} is {keys.get(f'{root}/{name}')}"
@@ -149,7 +149,7 @@ def torn_arrays(keys):
 
 
 def has_gap(keys, root):
-    """Whether something was written behind something that was not."""
+    """Whether something was written after something else was not."""
     there = [f"{root}/{name}" in keys for name in WRITTEN]
     return there != sorted(there, reverse=True)
 
@@ -159,12 +159,12 @@ def is_closed(keys):
 
 
 def fault_of(kind, keys):
-    """What is wrong with the ticket of a job that is to be closed."""
+    """Describes an error in the ticket of a job that must be closed."""
     roots = [ROOTS[strip] for strip in strips_of(kind)]
     for fault in (strip_fault(keys, root) for root in roots):
         if fault:
             return fault
-    # The verdict is that of the strip that came second, and when both come at once, of either.
+    # The verdict is that of the strip that came second. If both came at once, it is either's.
     verdicts = [VERDICTS.get(keys.get(f"{root}/Approval", {}).get("int")) for root in roots]
     if None in verdicts:
         return "a strip has no verdict"
@@ -179,7 +179,7 @@ def fault_of(kind, keys):
 
 
 def watch(room, kinds, ended, faults):
-    """A job must never be closed while a strip has no result, and one that is compared never."""
+    """A job needs all strips' results to be closed. A compared job is never closed."""
     while not ended.wait(0.5):
         for row in json.loads(ask(room, "jobs", "--json")):
             kind = kinds[row["job"]]
@@ -198,7 +198,7 @@ def documented_codes():
 
 
 class Workers:
-    """Processes that take runs from one list, until it is empty."""
+    """Processes that take runs from one list until it is empty."""
 
     def __init__(self, room, runs, kinds, stopping):
         self.room, self.kinds, self.stopping = room, kinds, stopping
@@ -206,9 +206,9 @@ class Workers:
         self.lock = threading.Lock()
         self.stopping_ended = threading.Event()
         self.compared = [run for run in runs if kinds[run.job] == "stored"]
-        self.left = collections.Counter(run.job for run in runs)  # Runs to come, by job.
-        self.places = {}  # The one that measured a strip of a job last.
-        self.updated = collections.defaultdict(list)  # JDFs that runs made of a job's, as hashes.
+        self.left = collections.Counter(run.job for run in runs)  # Remaining runs by job.
+        self.places = {}  # The place that last measured a strip of a job.
+        self.updated = collections.defaultdict(list)  # Hashes of a job's JDFs written by runs.
         self.repeated = set()
         self.waiting = queue.SimpleQueue()
         for run in runs:
@@ -237,8 +237,9 @@ class Workers:
                 self.look_after(run, code)
 
     def next_run(self):
-        """None when all is done. While the server is still to be stopped, a run is always at work:
-        a comparison can be repeated at will."""
+        """None when all is done. Until the last stop of the server there is always a run: a
+        comparison can be repeated at will.
+        """
         try:
             return self.waiting.get_nowait()
         except queue.Empty:
@@ -257,7 +258,7 @@ class Workers:
             self.faults.append(f"job {run.job} was not closed by its last run")
 
     def look_after(self, run, code):
-        """What an operator does after a server's crash: has cut-off jobs measured again."""
+        """What an operator does after a server crash: has incomplete jobs measured again."""
         keys = ticket_of(self.room, run.job)
         self.faults += [f"job {run.job}: {name} is torn" for name in torn_arrays(keys)]
         kind = self.kinds[run.job]
@@ -282,11 +283,11 @@ class Workers:
             self.waiting.put(run)
 
     def judge(self, delivered):
-        """All tickets and JDFs, now that nothing runs any more."""
+        """All tickets and JDFs, after all runs have ended."""
         results = {}  # By place.
         for job, kind in self.kinds.items():
             keys = ticket_of(self.room, job)
-            if kind == "stored":  # The comparison of stored values changes no ticket.
+            if kind == "stored":  # Comparing stored values changes no ticket.
                 fault = None if keys == delivered[job] else "was changed"
             else:
                 fault = fault_of(kind, keys) or self.origin_fault(job, kind, keys, results)
@@ -298,7 +299,7 @@ class Workers:
                 self.faults.append(f"places {one} and {other} measure alike")
 
     def origin_fault(self, job, kind, keys, results):
-        """Whether a result is all that the place measures that it is from."""
+        """Whether a result consists of exactly what its place measures."""
         measured = job - 100000 + 1 if kind == "parent" else job
         if (measured, 1) not in self.places:
             measured -= 1  # The second of two nested jobs.
@@ -319,7 +320,7 @@ class Workers:
         kept.append(hash_of(ask(self.room, "file", "get", path, "-")))
         made = [self.fresh, *self.updated[job]]
         if kind == "nested" and self.updated[job]:
-            # A run updates it for each of its three jobs, and only the last is left at the place.
+            # A run updates it for each of its three jobs, and the place keeps only the last.
             return None if kept[0] == self.fresh and (self.stopping or (
                 len(kept) == 4 and kept[-1] == made[-1])) else f"{len(kept)} versions of the JDF"
         if self.stopping:
@@ -328,7 +329,7 @@ class Workers:
 
 
 def stop_server(server, count, all_work):
-    """Lets the server crash so many times."""
+    """Crashes the server this many times."""
     script = [Path(__file__).with_name("with-postgres.sh")]
     try:
         for _ in range(count):

@@ -1,15 +1,15 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Installs the packages of scripts/package.sh in a fresh Debian 12 without a compiler, and verifies a
-# job there: measured by the virtual instrument, then shown. Then installs a compiler and builds the
-# example of libtintgate-dev. Needs root, debootstrap and a mirror.
+# Installs the packages of scripts/package.sh in a fresh Debian 12 without a compiler and verifies a
+# job there: measures it with the virtual instrument, then shows it. Then installs a compiler and
+# builds the example of libtintgate-dev. Needs root, debootstrap and a mirror.
 #
-#   try-packages.sh [FOLDER]      a folder for the root, kept; else one that is removed again
+#   try-packages.sh [FOLDER]      a folder for the root, which is kept (default: a temporary one)
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
 packages=(build/package/*.deb)
-[ -e "${packages[0]}" ] || { echo "There are no packages: scripts/package.sh makes them" >&2; exit 1; }
+[ -e "${packages[0]}" ] || { echo "There are no packages; run scripts/package.sh first" >&2; exit 1; }
 root=${1:-$(mktemp -d)}
 leave() {
   umount "$root/proc" 2>/dev/null || true
@@ -17,7 +17,7 @@ leave() {
 }
 trap 'leave '"${1:+kept}" EXIT
 
-chmod 755 "$root" # Of a root for its owner alone no other user of it could enter "/".
+chmod 755 "$root"  # Otherwise only its owner could enter "/".
 [ -e "$root/bin/sh" ] || debootstrap --variant=minbase bookworm "$root" >/dev/null
 mount -t proc proc "$root/proc"
 cp /etc/resolv.conf "$root/etc/"

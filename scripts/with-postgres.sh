@@ -1,18 +1,18 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
-# Gives a command a PostgreSQL server of its own:
+# Runs a command with a private PostgreSQL server:
 #
 #   with-postgres.sh COMMAND ARGUMENT...     starts a server, runs the command, stops the server
-#   with-postgres.sh start FOLDER            starts a new one that stays
+#   with-postgres.sh start FOLDER            starts a new one that keeps running
 #   with-postgres.sh stop FOLDER [MODE]      stops it (fast, or immediate as a crash would) ...
-#   with-postgres.sh again FOLDER            ... and starts it again with what it holds
-#   with-postgres.sh remove FOLDER           stops it, and removes all it held
+#   with-postgres.sh again FOLDER            ... and restarts it with its data
+#   with-postgres.sh remove FOLDER           stops it and removes its data
 #
-# The server listens on a Unix socket in its folder and nowhere else. PGSERVICEFILE, which the
-# command finds set, is FOLDER/pg_service.conf, with the service "tintgate".
+# The server listens only on a Unix socket in its folder. The command's PGSERVICEFILE is
+# FOLDER/pg_service.conf, with the service "tintgate".
 #
-# PostgreSQL refuses to run as root: root's server runs as the user postgres, which Debian's package
-# brings. PG_OPTIONS is handed to the server, such as "-c fsync=off".
+# PostgreSQL refuses to run as root, so root's server runs as the user postgres of Debian's package.
+# PG_OPTIONS, such as "-c fsync=off", is passed to the server.
 set -euo pipefail
 
 binaries=$(ls -d /usr/lib/postgresql/*/bin 2>/dev/null | sort -V | tail -1)
@@ -44,13 +44,13 @@ again() {
 
 remove() {
   if [ -f "$folder/data/PG_VERSION" ]; then
-    control stop --mode=immediate 2>/dev/null || true # It may have been stopped.
+    control stop --mode=immediate 2>/dev/null || true  # It may be stopped already.
     rm -rf "$folder"
   fi
 }
 
 start() {
-  remove # What was left by a run that was cut off.
+  remove  # Left over from an interrupted run.
   mkdir -p "$folder"
   chmod 0700 "$folder"
   if [ "$(id -u)" -eq 0 ]; then
@@ -69,7 +69,7 @@ start() {
 case ${1:-} in
 start | again | stop | remove)
   if [ $# -lt 2 ]; then
-    echo "with-postgres.sh: $1 which folder?" >&2
+    echo "with-postgres.sh: $1 needs a FOLDER" >&2
     exit 64
   fi
   folder=$(realpath -m "$2")
@@ -84,7 +84,7 @@ start | again | stop | remove)
   exit 64
   ;;
 *)
-  # A socket has a path of at most 107 bytes, and its folder must be in reach of that user.
+  # A socket's path has at most 107 bytes, and that user must have access to its folder.
   folder=$(mktemp -d /tmp/tintgate-postgres.XXXXXX)
   trap remove EXIT
   start

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Colour differences of 100,000 pairs, against LittleCMS where it has the formula.
+// Colour differences of 100,000 pairs, against LittleCMS if it has the formula.
 #include <algorithm>
 #include <chrono>
 #include <cstdio>

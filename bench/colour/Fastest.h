@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// How long a piece of work takes at best.
+// The shortest time of a piece of work.
 #pragma once
 
 #include <algorithm>

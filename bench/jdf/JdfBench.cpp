@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Updating a JDF file, against the least that any update must do: read the file, insert the text
-// once, write the file.
+// Updating a JDF file, against the minimum of any update: read the file, insert the text once,
+// write the file.
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
@@ -21,9 +21,9 @@
 
 namespace {
 
-/// Processor seconds, those of the system calls among them, of the fastest of several runs, each
-/// after a preparation that is not timed. They say more than the clock on the wall, which the disk
-/// and other programs disturb.
+/// Processor seconds, including system calls, of the fastest of several runs. The preparation
+/// before each is not timed. Elapsed time would be less reliable, because the disk and other
+/// programs disturb it.
 double fastest(const std::function<void()>& prepare, const std::function<void()>& work) {
     double best = std::numeric_limits<double>::max();
     for (int run = 0; run < 15; ++run) {
@@ -42,7 +42,7 @@ void require(bool done, const char* what) {
     }
 }
 
-/// A job's ticket with its measurement resource in the middle and dates to be stamped in front.
+/// A job's JDF with its measurement resource in the middle, after the dates to be stamped.
 std::string fileOf(std::size_t size) {
     const std::string line =
         "    <Media ID=\"M0001\" Class=\"Consumable\" Status=\"Available\" Weight=\"115\"/>\n";
@@ -81,7 +81,7 @@ struct Measurement {
     KZJobDataStruct job;
 };
 
-/// Reads, inserts and writes, with nothing to think about.
+/// Reads, inserts and writes, without any analysis.
 void bare(const std::string& path, const std::string& text, long at) {
     const int in = open(path.c_str(), O_RDONLY);
     const long size = lseek(in, 0, SEEK_END);
@@ -98,7 +98,7 @@ void bare(const std::string& path, const std::string& text, long at) {
     std::filesystem::rename(path + ".new", path);
 }
 
-/// Returns the seconds of the update.
+/// Returns the update's time in seconds.
 double compare(std::size_t size, int patches, const std::string& path) {
     const std::string before = fileOf(size);
     Measurement measurement(patches);

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Writing a measurement back, against the same tables made beforehand and sent straight to the
-// plug-in's tickets: 1,617 patches with spectra, through the real bundle and into a real store.
+// Writing a measurement back, against prepared tables with the same content that are sent directly
+// to the plug-in's tickets: 1,617 patches with spectra, through the real bundle into a real store.
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
@@ -30,7 +30,7 @@ constexpr int patches = 1617;
 constexpr int job = 1;
 constexpr int rounds = 25;
 
-/// As measured: no two values alike, in no order.
+/// Like measured values: all different, in random order.
 struct Measurement {
     Measurement()
         : xyz(valuesOf(3 * patches, 100)), lab(valuesOf(3 * patches, 100)),
@@ -66,7 +66,7 @@ struct Measurement {
     std::mt19937 m_random{3}; // NOLINT: the same each time
 };
 
-/// A key with the table that replaces it, or the one value that does. It stays where it is made.
+/// A key with the table that replaces it, or with its single value. Must not move.
 class Table {
   public:
     Table(std::string key, const store::Elements& elements) : m_key(std::move(key)) {
@@ -94,7 +94,7 @@ class Table {
     Table(const Table&) = delete;
     Table& operator=(const Table&) = delete;
 
-    /// The same with values that all differ from this one's.
+    /// The same with values that all differ from these.
     std::unique_ptr<Table> different() const {
         store::Elements elements;
         for (const store::Value& value : m_values) {
@@ -189,7 +189,7 @@ int main() {
             table->send(manager);
         }
     };
-    // Nothing is written of what is there already, so each side finds other values in all places.
+    // Unchanged values are not written, so each side must find different values everywhere.
     double best = std::numeric_limits<double>::max();
     double bareBest = best;
     for (int round = 0; round < rounds; ++round) {

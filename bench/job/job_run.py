@@ -5,12 +5,12 @@
 job_run.py BUILD SOURCE
 
 The job has 1,617 stored patches (FOGRA40L), each with 36 spectral values, and is compared with a
-file of characterisation data (FOGRA39L). The login and the pause of a third of it are left out: a
-run with a job that is not on the server's list ends right after the login, and what it takes beyond
-`-version` is the login. Nearly all of it would be the hash of the password, ten times as long as
-what is to be measured and of a length that changes with all that the machine does; so the store
-gets the cheapest hash of the password that there is. The sides take turns and the medians of
-processor time are compared; time on the clock is printed beside it.
+file of characterization data (FOGRA39L). The login and the pause of a third of its time are
+excluded: a run whose job is not on the server's list ends right after the login, so its time beyond
+that of `-version` is the login. Nearly all of that would be the hash of the password, which takes
+ten times as long as the measured work and varies with the machine's load. So the store uses the
+cheapest possible password hash. The sides take turns, and the medians of processor time are
+compared; elapsed time is printed too.
 """
 
 import contextlib
@@ -35,7 +35,7 @@ BANDS = 36
 
 
 def timed(command, environment, expected):
-    """Processor seconds and seconds on the clock of one run."""
+    """Processor seconds and elapsed seconds of one run."""
     start = time.perf_counter()
     child = os.posix_spawn(command[0], command, environment)
     _, status, usage = os.wait4(child, 0)
@@ -76,7 +76,7 @@ def fill_store(store, folder, source):
         for axis in axes:
             keys[f"{root}/{group}/{axis}Values"] = {
                 "double": [row[f"{field}_{axis}"] for row in rows]}
-    # Spectra of grey patches: their values are written and read, and not looked at.
+    # Spectra of grey patches: their values are written and read but not evaluated.
     keys[f"{root}/SpectralValues/DValues"] = {
         "double": [row["XYZ_Y"] / 100 + band / 1e4 for row in rows for band in range(BANDS)]}
     (folder / "job/tickets.json").write_text(json.dumps(tickets), encoding="ascii")
@@ -88,7 +88,7 @@ def fill_store(store, folder, source):
 
 
 def make_login_cheap(tickets):
-    """Replaces the hash of the password by one with the least memory and work that is allowed."""
+    """Replaces the password's hash by one with the least memory and work that is allowed."""
     sodium = ctypes.CDLL(ctypes.util.find_library("sodium"))
     text = ctypes.create_string_buffer(sodium.crypto_pwhash_strbytes())
     if sodium.sodium_init() < 0 or sodium.crypto_pwhash_str(
@@ -106,7 +106,7 @@ def main(build, source):
         make_login_cheap(folder / "store/tickets.db")
         subprocess.run(["cmake", "--install", build, "--component", "companions", "--prefix",
                         folder / "root"], check=True, stdout=subprocess.DEVNULL)
-        # No viewer: its start is its own affair, and it would run beside what is timed.
+        # No viewer: it would run in parallel and disturb the times.
         viewer = folder / "root/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify"
         viewer.unlink()
         viewer.symlink_to("/bin/true")
@@ -126,7 +126,7 @@ def main(build, source):
         os.dup2(os.open("/dev/null", os.O_WRONLY), 3)
         sys.stdout.flush()
         quiet = os.dup(1)
-        os.dup2(3, 1)  # -version says something.
+        os.dup2(3, 1)  # -version prints a line.
         runs = {side: [] for side in sides}
         for _ in range(RUNS):
             for side, (command, code) in sides.items():

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The text files of a job. The sample file, against a C++ stream that writes the same text; the
-// definition, against a bare walk over the strip's lines that writes each one anew.
+// The text files of a job. The sample file, against a C++ stream that writes the same text. The
+// definition, against a bare loop that copies the strip's lines.
 #include <algorithm>
 #include <cstdio>
 #include <cstdlib>
@@ -25,7 +25,7 @@ namespace {
 
 using bench::secondsOf;
 
-/// By turns, each at its best of several.
+/// Takes turns; each side counts with its best time.
 void compare(const std::string& name, const std::function<void()>& ours,
              const std::function<void()>& peer) {
     double best = std::numeric_limits<double>::max();

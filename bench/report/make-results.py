@@ -1,12 +1,12 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Makes results as a print room has them after some months, with the tool itself.
+"""Creates results like those of a print room after some months, with the tool itself.
 
 make-results.py TINTGATE PRESET FOLDER COUNT [--seed N]
 
 Job N is FOLDER/JobID_N with "output.json" and "meta.json". A control strip of FOGRA39L is measured
-with noise, and cyan grows lighter and yellower over the second half, so that it drifts and at last
-fails. The same arguments give the same results.
+with noise. In the second half, cyan becomes lighter and yellower, so it drifts and finally fails.
+The same arguments give the same results.
 """
 
 import argparse
@@ -25,7 +25,7 @@ GREYS = ((10, 6, 6, 0), (20, 12, 12, 0), (40, 27, 27, 0), (60, 45, 45, 0), (80, 
 
 
 def strip():
-    """The chart's patches that a strip has: paper, ramps of each ink, overprints, greys."""
+    """The chart's patches in a strip: paper, ramps of each ink, overprints, greys."""
     wanted = {tuple(tone if i == ink else 0 for i in range(4)) for ink in range(4) for tone in TONES}
     wanted |= {(0, 100, 100, 0), (100, 0, 100, 0), (100, 100, 0, 0), *GREYS}
     text = CHART.read_text(encoding="latin-1")

@@ -4,10 +4,9 @@
 
 page-times.py TINTGATE TINTGATE_REPORT PRESET [--results N] [--pairs N] [--keep FOLDER]
 
-Both are opened in turns, so that whatever else the machine does strikes both. Two ratios of medians
-are printed: of the whole run of the browser, and of the time within the page, from the start of its
-loading until all charts are drawn. Each page must come without a word on the browser's console,
-and with the numbers that belong in it.
+Both are opened in turns, so that other load affects both. Prints two ratios of medians: of the
+browser's whole run, and of the time within the page, from the start of loading until all charts are
+drawn. Each page must produce no output on the browser's console and contain the expected numbers.
 """
 
 import argparse
@@ -24,8 +23,8 @@ from pathlib import Path
 HERE = Path(__file__).resolve().parent
 LIMIT = 3
 
-# Behind the page's own scripts. Reading a pixel of each chart has the browser carry out all that
-# was drawn there.
+# Runs after the page's own scripts. Reading a pixel of each chart makes the browser finish all
+# drawing there.
 PROBE = """<script>
 for (const chart of document.querySelectorAll("canvas")) {
   chart.getContext("2d").getImageData(0, 0, 1, 1);
@@ -36,7 +35,7 @@ document.body.append(`[ready after ${performance.now()} ms]`);
 
 
 def with_probe(page):
-    """A copy of the page whose policy lets the probe in."""
+    """A copy of the page whose content security policy allows the probe."""
     text = page.read_text()
     text = re.sub(r'<meta http-equiv="Content-Security-Policy".*?>', "", text, count=1)
     end = text.rindex("</body>")
@@ -46,7 +45,7 @@ def with_probe(page):
 
 
 def open_page(page, profile):
-    """Seconds on the clock and the document as its scripts leave it."""
+    """Elapsed seconds, and the document after its scripts have run."""
     command = ["chromium", "--headless", "--disable-gpu", "--no-first-run", "--disable-sync",
                "--disable-background-networking", "--disable-component-update",
                "--enable-logging=stderr", "--timeout=20000", "--dump-dom",

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// A store on a PostgreSQL server through the real bundle and the manager, against statements that
-// are sent with libpq by hand. Run by scripts/with-postgres.sh, for a server of its own.
+// A store on a PostgreSQL server through the real bundle and the manager, against statements sent
+// directly with libpq. scripts/with-postgres.sh runs it with a private server.
 #include <memory>
 #include <string>
 
@@ -20,7 +20,7 @@ namespace {
 using bench::check;
 using Result = std::unique_ptr<PGresult, void (*)(PGresult*)>;
 
-/// A statement with values in binary form, prepared before.
+/// Executes a prepared statement with binary values.
 Result execute(PGconn* connection, const char* name, const std::vector<std::string_view>& values) {
     std::vector<const char*> pointers;
     std::vector<int> lengths;
@@ -51,7 +51,8 @@ std::string_view bytesOf(const std::vector<double>& values, std::size_t count) {
     return {reinterpret_cast<const char*>(values.data()), count * sizeof(double)};
 }
 
-/// The keys of a measurement of 1,617 patches with spectra: arrays of numbers, then single ones.
+/// The keys of a measurement of 1,617 patches with spectra: first arrays of numbers, then single
+/// numbers.
 struct Key {
     std::string name;
     int count;
@@ -86,7 +87,7 @@ int main() {
     root.installCommBundle(COMGUI_BUNDLE);
     store::makeStore("room", "Bench");
     store::openStore("room")->putUser({"bench", store::passwordHash("bench"), false});
-    // Also commits in between, so that neither side can use what it fetched before.
+    // Also commits in between, so that neither side can reuse what it has fetched.
     const support::BarePostgres somebody("room");
     somebody.run("INSERT INTO tintgate.tickets (type, id) SELECT 3, generate_series(1, " +
                  std::to_string(bench::jobs) + ")");
@@ -106,8 +107,7 @@ int main() {
                  "ALTER TABLE bench ALTER value SET STORAGE EXTERNAL");
     somebody.run("ANALYZE");
 
-    // Which has done nothing so far, as the store's: a server process keeps memory at hand by what
-    // it has done before.
+    // A new connection, like the store's: earlier work of a server process affects its memory.
     const support::BarePostgres bare("room");
     PGconn* const connection = bare.get();
     CKZConnector connector(L"room", L"bench", L"bench", 0x5071103, false, false);
@@ -165,7 +165,7 @@ int main() {
             bench::readBare(copy);
         });
 
-    // As a write-back does it: a table for each key.
+    // As in a write-back: one table per key.
     const std::vector<Key> keys = measurementKeys();
     prepare(connection, "lock",
             "UPDATE tintgate.tickets SET changes = changes + 1"

@@ -50,7 +50,7 @@ class BareDatabase {
     sqlite3* m_database = nullptr;
 };
 
-/// Gives ticket 2 that many keys of three elements; their names.
+/// Adds `count` keys of three elements to ticket 2 and returns their names.
 std::vector<std::string> makeArrays(ComGUIManager& manager, int count) {
     std::vector<std::string> names;
     SETMULTIPAR_LIST list(true);
@@ -82,7 +82,7 @@ int main() {
         const std::shared_ptr<store::StoreEngine> engine = store::openStore(address);
         engine->putUser({"bench", store::passwordHash("bench"), false});
         store::CachingStorage keep(engine);
-        // Made without waiting for the disk: the log is written through at the end.
+        // Does not wait for the disk; the log is written at the end.
         BareDatabase bare(address + "/tickets.db");
         bare.run("BEGIN");
         std::string sql;
@@ -114,7 +114,7 @@ int main() {
     bare.run("CREATE TABLE bench (id INTEGER PRIMARY KEY, value BLOB)");
     bare.run("INSERT INTO bench VALUES (1, x'00')");
     const int bytes = elements * static_cast<int>(sizeof(double));
-    // Somebody else commits, so that neither side can use what it fetched before.
+    // Another connection commits, so that neither side can reuse what it has fetched.
     BareDatabase somebody(address + "/tickets.db");
     const auto touch = [&] {
         somebody.run("UPDATE tickets SET changes = changes + 1 WHERE id = 5");
@@ -182,8 +182,8 @@ int main() {
             check(rows == 5 * jobs, "the bare select");
         });
 
-    // The first edit of a key's element fetches the key. What a key costs must not grow with the
-    // number of keys that the ticket has.
+    // The first edit of a key's element fetches the key. Its cost must not grow with the number of
+    // the ticket's keys.
     sqlite3_stmt* const readKey =
         bare.prepare("SELECT k.value FROM tickets t JOIN keys k ON k.ticket = t.number"
                      " WHERE t.type = 3 AND t.id = 2 AND k.name = ?");

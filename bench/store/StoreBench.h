@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the benchmarks of stores share.
+// Shared by the benchmarks of stores.
 //
-// The two sides of a ratio run by turns, each at its best of several, so that a machine that is
-// busy with something else slows both.
+// The two sides of a ratio take turns, and each counts with its best time, so that other load slows
+// both.
 #pragma once
 
 #include <algorithm>
@@ -24,7 +24,7 @@ constexpr const char* overviewKeys[] = {"Input/SubType", "Job/Display/Status",
                                         "Remote/ShowInVerifier", "Input/FileType",
                                         "Workflow/Verify/Active"};
 
-/// Before is not timed.
+/// `before` is not timed.
 inline void compare(const char* name, double limit, int rounds, const std::function<void()>& before,
                     const std::function<void()>& ours, const std::function<void()>& bare) {
     double best = std::numeric_limits<double>::max();
@@ -39,7 +39,7 @@ inline void compare(const char* name, double limit, int rounds, const std::funct
                 best / bareBest, bareBest * 1e3, limit);
 }
 
-/// Reflectances, as measured: no two alike, in no order.
+/// Reflectances, like measured ones: all different, in random order.
 inline std::vector<double> measuredValues(std::size_t count) {
     std::mt19937 random(3); // NOLINT: the same each time
     std::vector<double> values(count);
@@ -57,7 +57,7 @@ struct Call {
     std::size_t count;
 };
 
-/// What a slot has to do at the least: tell by type, id and key whether this is the one.
+/// The minimum work of a slot: check type, id and key.
 inline int bareGet(const Call* call, int type, int id, const char* key, int position, double* out) {
     if (type != 3 || id != 1 || std::strcmp(key, arrayKey) != 0 ||
         static_cast<std::size_t>(position) >= call->count) {
@@ -68,9 +68,9 @@ inline int bareGet(const Call* call, int type, int id, const char* key, int posi
 }
 
 using BareSlot = int (*)(const Call*, int, int, const char*, int, double*);
-inline volatile BareSlot g_slot = bareGet; // Asked for at each call, as a slot of a table is.
+inline volatile BareSlot g_slot = bareGet; // Loaded at each call, like a slot of a table.
 
-/// Reads an array as the loop of calls does, without anything behind it.
+/// Reads an array with a loop of calls, without anything else.
 inline void readBare(const std::vector<double>& values) {
     const Call call = {values.data(), values.size()};
     double sum = 0;

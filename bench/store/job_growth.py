@@ -4,10 +4,10 @@
 
 job_growth.py BUILD SOURCE [JOBS...]
 
-All jobs but one are closed. The stores are a folder and, where PGSERVICEFILE has the service
-"tintgate" (scripts/with-postgres.sh), a server's database. Each run is a whole one: login, looking
-through all jobs, comparing, writing back. The sizes take turns and each counts at its best, so that
-a machine that is busy with something else slows all of them.
+All jobs but one are closed. The stores are a folder and, if PGSERVICEFILE has the service
+"tintgate" (scripts/with-postgres.sh), a server's database. Each run is complete: login, search
+through all jobs, comparison, write-back. The sizes take turns, and each counts with its best time,
+so that other load slows all of them.
 """
 
 import contextlib
@@ -21,19 +21,19 @@ from pathlib import Path
 
 SIZES = (100, 10_000, 100_000, 1_000_000)
 RUNS = 15
-JOB = 2_000_000  # Behind all the others.
+JOB = 2_000_000  # Higher than all other ids.
 LIMITS = {"folder": {100_000: 1.5, 1_000_000: 6}, "server": {100_000: 1.5, 1_000_000: 8}}
 KEYS = {"Input/SubType": 0, "Job/Display/Status": 211, "Remote/ShowInVerifier": 0,
         "Input/FileType": 0, "Workflow/Verify/Active": 1}
 
 
 def stored(number):
-    """A key of one int, as a store keeps it, in hexadecimal."""
+    """A key of one int in the store's format, in hexadecimal."""
     return "010201000000" + number.to_bytes(4, "little").hex()
 
 
 def fill_folder(path, jobs):
-    """Makes jobs behind the store's back, and has the store make its overview of them."""
+    """Inserts jobs directly into the database and makes the store rebuild its overview of them."""
     with contextlib.closing(sqlite3.connect(path / "tickets.db")) as database, database:
         database.execute("PRAGMA synchronous = OFF")
         numbers = f"WITH RECURSIVE n (id) AS (VALUES (1) UNION ALL SELECT id + 1 FROM n WHERE id < {jobs})"
@@ -66,7 +66,7 @@ def fill_server(service, jobs):
 
 
 def run(command, environment):
-    """Processor seconds and seconds on the clock."""
+    """Processor seconds and elapsed seconds."""
     start = time.perf_counter()
     child = os.posix_spawn(command[0], command, environment)
     _, status, usage = os.wait4(child, 0)
@@ -84,7 +84,7 @@ class Bench:
         subprocess.run(["cmake", "--install", build, "--component", "companions", "--prefix",
                         folder / "root"], check=True, stdout=subprocess.DEVNULL)
         viewer = folder / "root/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify"
-        viewer.unlink()  # Its start is its own affair, and it would run beside what is timed.
+        viewer.unlink()  # It would run in parallel and disturb the times.
         viewer.symlink_to("/bin/true")
         (folder / "tmp").mkdir()
         self.environment = {"TINTGATE_ROOT": str(folder / "root"), "TMPDIR": str(folder / "tmp"),
@@ -103,7 +103,7 @@ class Bench:
         self.admin(address, "file", "put", str(self.folder / "job/server"), "/server")
 
     def measure(self, place, addresses):
-        """Prints the times of stores, by their number of jobs. False where one takes too long."""
+        """Prints the times of the stores by number of jobs. False if one takes too long."""
         best = {jobs: (1e9, 1e9) for jobs in addresses}
         for _ in range(RUNS):
             for jobs, address in addresses.items():
@@ -112,7 +112,7 @@ class Bench:
                 best[jobs] = tuple(map(min, best[jobs], taken))
         kept = True
         for jobs, (processor, clock) in best.items():
-            # A server's work is not in the program's processor time.
+            # The program's processor time does not include the server's work.
             which = 0 if place == "folder" else 1
             ratio = best[jobs][which] / best[min(best)][which]
             limit = LIMITS[place].get(jobs)

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// A flush that changes one element in each of many vectors: what it costs an element, at growing
-// numbers of elements. A flush that walked a vector once for each change would show a rising
-// figure.
+// A flush that changes one element in each of many vectors: the cost per element for growing
+// numbers of elements. If a flush walked a vector once for each change, the figure would rise.
 #include <chrono>
 #include <cstdio>
 #include <memory>

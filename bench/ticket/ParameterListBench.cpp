@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Filling a parameter list, against bare sets that take the same keys and values.
+// Filling a parameter list, against bare sets that receive the same keys and values.
 #include <algorithm>
 #include <chrono>
 #include <cstdio>
@@ -20,7 +20,7 @@ struct Times {
     double peer = std::numeric_limits<double>::max();
 };
 
-/// The fastest of several runs of each; they take turns, so that a busy machine slows both.
+/// The fastest of several runs of each. They take turns, so that other load slows both.
 Times fastest(const std::function<void()>& work, const std::function<void()>& peer) {
     const auto keepFastest = [](double& best, const std::function<void()>& run) {
         const auto start = std::chrono::steady_clock::now();
@@ -39,7 +39,7 @@ Times fastest(const std::function<void()>& work, const std::function<void()>& pe
 /// Keeps a result from being optimised away.
 volatile std::size_t g_sink;
 
-/// Fills a list and makes its table; the bare loop inserts the same into two sets and no more.
+/// Fills a list and creates its table. The bare loop only inserts the same data into two sets.
 void fill(const char* name, const std::vector<std::string>& keys,
           const std::vector<double>& values) {
     const auto bareSets = [&] {

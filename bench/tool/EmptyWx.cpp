@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What any program on the wx base library costs to start and end: the measure for -version.
+// The cost of starting and ending any program with the wx base library: the peer of -version.
 
 #include <wx/string.h>
 

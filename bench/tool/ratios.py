@@ -1,15 +1,15 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Times the whole program against its peers, and prints ratios.
+"""Times the whole program against its peers and prints ratios.
 
 ratios.py TINTGATE EMPTY_WX PRESET [--quick]
 
-The two sides of a ratio run in turns, so that whatever else the machine does strikes both, and the
-medians are compared: of the processor time (all are single threads), which a busy machine stretches
-less than the time on the clock. That is printed beside it. Peers: colverify -k of ArgyllCMS, which reads the same files and computes the
-same differences, and a program that does no more than start with the wx base library. The large
-files repeat the rows of FOGRA39L and FOGRA40L under new ids. --quick leaves out colverify at
-100,000 patches, which takes about half a minute a run.
+The two sides of a ratio take turns, so that other load affects both. The medians of processor time
+are compared (all programs are single-threaded), because other load affects it less than elapsed
+time, which is printed too. Peers: colverify -k of ArgyllCMS, which reads the same files and
+computes the same differences, and a program that only starts with the wx base library. The large
+files repeat the rows of FOGRA39L and FOGRA40L under new ids. --quick skips colverify at 100,000
+patches, which takes about half a minute per run.
 """
 
 import os
@@ -23,7 +23,7 @@ SETS = ("39", "40")
 
 
 def repeat_rows(source, count, target):
-    """A data set with `count` rows: those of `source` over and over, numbered from 1."""
+    """A data set with `count` rows: the rows of `source` repeated and numbered from 1."""
     with open(source, encoding="latin-1") as file:
         head, rest = file.read().split("BEGIN_DATA\n")
     rows = [row.split(None, 1)[1] for row in rest.split("END_DATA")[0].splitlines() if row.strip()]
@@ -35,7 +35,7 @@ def repeat_rows(source, count, target):
 
 
 def run(command):
-    """Processor seconds, seconds on the clock and peak memory in MB of one run."""
+    """Processor seconds, elapsed seconds and peak memory in MB of one run."""
     nowhere = [(os.POSIX_SPAWN_OPEN, 1, "/dev/null", os.O_WRONLY, 0)]
     start = time.perf_counter()
     child = os.posix_spawnp(command[0], command, os.environ, file_actions=nowhere)

@@ -40,9 +40,9 @@ namespace {
 
 namespace fs = std::filesystem;
 
-constexpr int oneCodeForAll = 255; ///< What a run's -1 becomes as the exit code of a process.
+constexpr int oneCodeForAll = 255; ///< The process exit code for a run's result of -1.
 
-/// The temporary folder of this process until the object ends: what the tool writes goes there.
+/// Replaces this process's temporary folder until the object is destroyed; the tool writes there.
 class PrivateTemporaryFolder {
   public:
     explicit PrivateTemporaryFolder(const std::string& usual)
@@ -64,7 +64,7 @@ class PrivateTemporaryFolder {
     std::string m_path;
 };
 
-/// As the tool starts: texts and file names in the user's locale, and wx silent.
+/// Same setup as in the tool: texts and file names in the user's locale, and wx silent.
 void prepareProcess() {
     const char* const locale = std::setlocale(LC_CTYPE, "");
     if (locale == nullptr || std::string_view(nl_langinfo(CODESET)) != "UTF-8") {
@@ -74,7 +74,7 @@ void prepareProcess() {
     wxLog::EnableLogging(false);
 }
 
-/// One examination, whose steps fill its result.
+/// One examination. Its steps fill the result.
 class Examination {
   public:
     Examination(const std::string& address, const Request& request)
@@ -101,7 +101,7 @@ class Examination {
     const AskedKey* asked(const std::string& key) const {
         return findKey(m_server->keys(), jobType, m_request.job, key);
     }
-    /// "file /server/x" for a local file, or its name if it did not come from the server.
+    /// "file /server/x" for a downloaded file, otherwise the name of the local file.
     std::string placeOf(const wxString& local) const;
 
     void add(std::string where, std::string text, std::vector<int> codes = {},
@@ -118,7 +118,7 @@ class Examination {
 
     const std::string m_address;
     const Request m_request;
-    std::string m_temporaryFolder; ///< That of the user's runs, or empty.
+    std::string m_temporaryFolder; ///< The folder that the user's runs use, or empty.
     std::shared_ptr<store::StoreEngine> m_engine;
     std::unique_ptr<ReadOnlyServer> m_server;
     std::unique_ptr<KZVerifyJobProcessor> m_processor;
@@ -169,15 +169,15 @@ bool Examination::checkCall() {
     if (*selector != 0 && *selector != 1) {
         add(where,
             "is neither 0, the first strip, nor 1, the second. The run reads the keys of the "
-            "second strip, writes no result to the ticket and can close the job all the same.",
+            "second strip and writes no result to the ticket, but can still close the job.",
             {}, true);
     }
     constexpr std::size_t longestAddress = 127;
     if (m_address.size() > longestAddress || m_address.find(':') != std::string::npos) {
         add("store " + m_address,
             m_address.size() > longestAddress
-                ? "has an address of more than 127 bytes, and a login carries no more."
-                : "has an address with a \":\". A call keeps only what follows the last one.",
+                ? "has an address of more than 127 bytes, the limit of a login."
+                : "has an address with a \":\". A run uses only the text after the last one.",
             {exitLoginNoServer});
         return end(exitLoginNoServer);
     }
@@ -229,7 +229,7 @@ bool Examination::logIn() {
         numberIn(findKey(m_server->keys(), systemType, 0, "System/Product/MajorVersion"));
     if (version) {
         add("system System/Product/MajorVersion",
-            "is " + std::to_string(*version) + ". A login needs a server of version 5 or above.",
+            "is " + std::to_string(*version) + ". A login needs a server of version 5 or later.",
             {exitLoginRefused});
     }
     return end(exitLoginRefused);
@@ -257,7 +257,7 @@ bool Examination::checkList() {
                                   : problemOf(*found, false);
     };
     if (numberIn(asked(jobkeys::fileTypeKey)) == jobkeys::unsuitableFileType) {
-        add(jobKey("Input/FileType"), "is 4096, which keeps a job from being verified.", codes);
+        add(jobKey("Input/FileType"), "is 4096. Jobs of this type are not verified.", codes);
     }
     const std::string status = text("Job/Display/Status");
     if (m_request.remeasure) {
@@ -268,8 +268,8 @@ bool Examination::checkList() {
     } else {
         add(jobKey("Job/Display/Status"),
             status + ", and Remote/ShowInVerifier " + text("Remote/ShowInVerifier") +
-                ". A job is verified if the former is 208 or the latter 1. A job that lacks a key "
-                "is judged by the value of the job that precedes it.",
+                ". A job is verified if the former is 208 or the latter 1. A missing key "
+                "counts as the value of the preceding job.",
             codes);
     }
     return end(exitJobNotListed);
@@ -293,7 +293,7 @@ bool Examination::checkPreset() {
     return end(exitPresetFailed);
 }
 
-/// Names which of the two compared files can't be used by itself. True if both can.
+/// Reports the compared files that can't be used at all. True if both can.
 bool Examination::checkInputs() {
     bool sound = true;
     for (const auto& [path, what] : {std::pair(m_job.referenceFile, "reference"),
@@ -338,7 +338,7 @@ void Examination::measure() {
     if (definition.empty()) {
         const bool dynamic = jobkeys::isDynamic(m_strip, m_job.useDynstrip);
         add("control strip " + fileName(bytesOf(strip)),
-            std::string("No definition for the measuring tool can be made from it: ") +
+            std::string("No definition for the measuring tool can be created from it: ") +
                 (dynamic ? "a dynamic strip needs NUMBER_OF_STRIPS and NUMBER_OF_COLS"
                          : "a strip needs NUMBER_OF_COLS, or both NUMBER_OF_SETS and "
                            "NUMBER_OF_STRIPS") +
@@ -349,7 +349,7 @@ void Examination::measure() {
     }
     if (definition != strip) {
         std::error_code ignored;
-        fs::remove(bytesOf(definition), ignored); // As after a measurement.
+        fs::remove(bytesOf(definition), ignored); // As the run does after a measurement.
     }
     if (!fs::is_regular_file(bytesOf(m_job.referenceFile))) {
         end(exitReferenceMissing);
@@ -360,8 +360,8 @@ void Examination::measure() {
     }
 }
 
-/// The strip's file has the device values that the measurement will have. Colours of its own it
-/// need not have, so that only what the library says about pairing counts.
+/// The strip's file has the device values that the measurement will have, but need not have
+/// colours. So only the library's answer on pairing counts.
 void Examination::checkPairing() {
     std::wstring ignored;
     const int code = analyzeMeasurements(m_job.referenceFile.ToStdWstring(),
@@ -369,7 +369,7 @@ void Examination::checkPairing() {
                                          m_job.tolerance, nullptr, &ignored, nullptr);
     if (code == exitNothingToPair || code == exitNoDeviceValues) {
         add("control strip " + fileName(bytesOf(m_job.controlStripFile)),
-            "does not go with the reference " + fileName(bytesOf(m_job.referenceFile)) +
+            "does not match the reference " + fileName(bytesOf(m_job.referenceFile)) +
                 ": the library refuses them with " + explained(code) + ".",
             {code});
         end(code);
@@ -379,13 +379,13 @@ void Examination::checkPairing() {
 std::string Examination::placeOf(const wxString& local) const {
     const std::string path = bytesOf(local);
     const auto& files = m_server->files();
-    // Of files with one name the last one is there.
+    // If files have the same name, the last one remains.
     const auto file = std::find_if(files.rbegin(), files.rend(),
                                    [&](const AskedFile& asked) { return asked.localPath == path; });
     return file == files.rend() ? fileName(path) : "file " + file->serverPath;
 }
 
-/// Keys first: what they lack explains most of the rest.
+/// Keys first: missing keys explain most of the rest.
 void Examination::judgeReads() {
     SimilarKeys similar(*m_engine, m_server->keys());
     const auto append = [&](std::vector<Finding> findings) {

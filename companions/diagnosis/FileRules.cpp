@@ -13,7 +13,7 @@ namespace diagnosis {
 
 namespace {
 
-/// Names of a job's folder that the tool itself writes, and what becomes of a job's file there.
+/// File names that the tool itself uses in a job's folder, and the effect on a job's own file.
 struct ReservedName {
     const char* name;
     std::vector<int> codes;
@@ -26,7 +26,7 @@ const std::vector<ReservedName>& reservedNames() {
         {"Measured sample.txt",
          {exitReferenceMissing, exitTargetIsMeasurement, exitSampleMissing},
          true,
-         "The measurement is written to this name, so that it would be compared with itself."},
+         "The measurement is written to this name and would be compared with itself."},
         {"Measured reference.txt",
          {},
          false,
@@ -46,16 +46,16 @@ const std::vector<ReservedName>& reservedNames() {
     return all;
 }
 
-/// Whether a load had asked for this key when it requested the file.
+/// Whether the load had read this key when it requested the file.
 bool isAfter(const ReadOnlyServer& server, const AskedFile& file, const std::string& key) {
     const auto& keys = server.keys();
     return std::any_of(keys.begin(), keys.begin() + static_cast<std::ptrdiff_t>(file.asked),
                        [&](const AskedKey& asked) { return asked.key == key; });
 }
 
-/// What a file is for.
+/// The purpose of a file.
 struct Role {
-    const char* key; ///< That names the file, in the first strip's form.
+    const char* key; ///< The key that names the file, for the first strip.
     const char* what;
     std::vector<int> codes;
     bool spoilsResult = false;
@@ -80,12 +80,12 @@ Role roleOf(const ReadOnlyServer& server, const KZJobDataStruct& job, const Aske
     const bool isJdf = isAfter(server, file, "Output/Jdf/FileName");
     if (isAfter(server, file, "Footer/Nesting/PSDAssessment") && !isJdf) {
         return {nullptr,
-                "strip that the parent's jobs share; the job uses its own, and the result goes to "
+                "strip shared by the parent's jobs; the job uses its own, and the result goes to "
                 "this job alone",
                 {},
                 true};
     }
-    // A packaging job names its references by the key of a strip.
+    // A packaging job names its references by the key of a strip, which must not match below.
     const bool isReference = isAfter(server, file, "Workflow/Name") &&
                              !isAfter(server, file, "Footer/ControlstripIT8") && !isJdf;
     for (const Role& role : roles) {
@@ -103,20 +103,20 @@ Finding judgeMissing(const ReadOnlyServer& server, const KZJobDataStruct& job,
     const Role role = roleOf(server, job, file);
     const bool isNamed = !file.namedBy.empty() && role.what != std::string_view("preset");
     return {.where = "file " + file.serverPath,
-            .text = "does not come: " + file.problem + ". It is the " + role.what +
+            .text = "can't be downloaded: " + file.problem + ". It is the " + role.what +
                     (isNamed ? ", named by " + file.namedBy : "") + ".",
             .codes = role.codes,
             .spoilsResult = role.spoilsResult};
 }
 
-/// All files of a job come into one folder under the last parts of their paths.
+/// All files of a job are stored in one folder, under the last parts of their paths.
 std::vector<Finding> judgeNames(const ReadOnlyServer& server, bool measures) {
     std::vector<Finding> findings;
     std::map<std::string, std::string> first; // Local name to server path.
     for (const AskedFile& file : server.files()) {
         const std::string name = fileName(file.localPath);
         for (const ReservedName& reserved : reservedNames()) {
-            const bool isOwn = file.serverPath.ends_with(".dcf"); // Brought for this very name.
+            const bool isOwn = file.serverPath.ends_with(".dcf"); // Downloaded to be this file.
             if (name == reserved.name && !isOwn) {
                 findings.push_back({"file " + file.serverPath,
                                     "has a name that is reserved in the job's folder. " +
@@ -126,14 +126,13 @@ std::vector<Finding> judgeNames(const ReadOnlyServer& server, bool measures) {
         }
         const auto [other, isNew] = first.emplace(name, file.serverPath);
         if (!isNew && other->second != file.serverPath) {
-            // A comparison needs the reference alone, which only nesting and the JDF come after.
+            // A comparison needs only the reference. Only nesting and the JDF are loaded later.
             const bool spoils = measures || isAfter(server, file, "General/ParentID");
-            findings.push_back(
-                {"file " + file.serverPath,
-                 "has the same name as " + other->second +
-                     ". In the job's folder the one that comes later replaces the other.",
-                 {exitReferenceMissing, exitMeasuringFailed, exitPresetFailed},
-                 spoils});
+            findings.push_back({"file " + file.serverPath,
+                                "has the same name as " + other->second +
+                                    ". In the job's folder, the later one replaces the other.",
+                                {exitReferenceMissing, exitMeasuringFailed, exitPresetFailed},
+                                spoils});
         }
     }
     return findings;
@@ -145,7 +144,7 @@ std::vector<Finding> judgeFiles(const ReadOnlyServer& server, const KZJobDataStr
                                 bool measures) {
     std::vector<Finding> findings = judgeNames(server, measures);
     for (const AskedFile& file : server.files()) {
-        // The definition beside a dynamic strip is optional.
+        // The definition next to a dynamic strip is optional.
         if (!file.problem.empty() && !file.serverPath.ends_with(".dcf")) {
             findings.push_back(judgeMissing(server, job, file));
         }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// What follows if a file of a job does not come, or if its name is one that the job's folder can't
-// hold beside the others.
+// Consequences of files of a job that can't be downloaded, or whose names conflict in the job's
+// folder.
 #pragma once
 
 #include <vector>
@@ -12,7 +12,7 @@
 
 namespace diagnosis {
 
-/// Judges all files that a load has requested.
+/// Evaluates all files that a load has requested.
 std::vector<Finding> judgeFiles(const ReadOnlyServer& server, const KZJobDataStruct& job,
                                 bool measures);
 

@@ -12,20 +12,20 @@ namespace diagnosis {
 
 namespace {
 
-/// How the key of the second strip is made from that of the first.
+/// How the second strip's key is derived from the first strip's.
 enum class Form { Shared, Suffix, Measurement };
 
-/// When a key that can't be read is reported. Many keys are absent from sound tickets: these are
-/// reported only if the ticket contains something that looks like a mistake.
+/// When to report a key that can't be read. Many keys are absent from correct tickets. These are
+/// reported only if the ticket has something that looks like a mistake.
 enum class Report { Always, IfSuspicious };
 
 struct Rule {
     int ticketType;
     Form form;
-    const char* key;      ///< Of the first strip; for Form::Measurement without its root.
-    const char* previous; ///< Applies only if this key was asked directly before it. May be null.
+    const char* key;      ///< The first strip's key; for Form::Measurement without its root.
+    const char* previous; ///< Applies only if this key was read directly before it. May be null.
     Report report;
-    bool emptyCounts; ///< An empty text is as bad as none.
+    bool emptyCounts; ///< An empty text counts as missing.
     bool spoilsResult;
     std::vector<int> codes;
     const char* consequence; ///< One or more sentences.
@@ -41,11 +41,11 @@ const char* const assessment = "Footer/Nesting/PSDAssessment";
 const char* const jdfFolder = jobkeys::temporaryFolderKey;
 const char* const profile = jobkeys::stripProfileKey;
 const char* const dynamicEnds =
-    "The lookup of the dynamic strip ends with it: there is no control strip, and the workflow is "
+    "The lookup of the dynamic strip stops here: there is no control strip, and the workflow is "
     "not read.";
 const char* const spectraNeedIt =
-    "The stored measurement is not read without it, even if there are no spectra (Length 0).";
-const char* const fileOfPresetCounts = "It is for clients; the preset's file counts.";
+    "Without it, the stored measurement is not read, even if there are no spectra (Length 0).";
+const char* const fileOfPresetCounts = "It is for clients; the run uses the preset's file.";
 
 const std::vector<Rule>& rules() {
     using enum Form;
@@ -53,10 +53,10 @@ const std::vector<Rule>& rules() {
     // clang-format off
     static const std::vector<Rule> all = {
         {systemType, Shared, "System/Product/MajorVersion", nullptr, Always, emptyIsFine, false, {151},
-         "A login needs a server of version 5 or above."},
+         "A login needs a server of version 5 or later."},
 
         {jobType, Shared, "System/InstallFolder", nullptr, Always, emptyToo, false, {103, 106, 10, 20},
-         "Without the install folder no strip, preset or characterisation file is found, and "
+         "Without the install folder, no strip, preset or characterization file is found, and "
          "Footer/Dynstrip/UseDynstrip is not read."},
         {jobType, Shared, "Input/Title", nullptr, IfSuspicious, emptyIsFine, false, {}, "It is shown to people only."},
         {jobType, Shared, "CMM/PaperName", nullptr, IfSuspicious, emptyIsFine, false, {}, "It is shown to people only."},
@@ -69,26 +69,26 @@ const std::vector<Rule>& rules() {
         {jobType, Shared, "Footer/Dynstrip/DeviceID", nullptr, Always, emptyIsFine, false, {106, 20}, dynamicEnds},
         {jobType, Shared, "Footer/Dynstrip/IT8", nullptr, Always, emptyToo, false, {106, 20}, dynamicEnds},
         {jobType, Shared, "Footer/Dynstrip/File", nullptr, Always, emptyIsFine, true, {},
-         "The workflow is not read after it: the references come from the strip, and the JDF is not updated."},
+         "Without it, the workflow is not read: the references come from the strip, and the JDF is not updated."},
         {jobType, Suffix, "Footer/Nesting/ControlstripFile", ownStrip, Always, emptyIsFine, false, {103, 106},
-         "One of them has to name the control strip, with at least 4 bytes. Without a strip the workflow is not read, and then neither references nor a preset are looked for."},
+         "One of them must name the control strip, with at least 4 bytes. Without a strip, the workflow is not read, and no references and no preset are looked up."},
 
         {jobType, Suffix, "Workflow/Verify/MeasurementWorkflow", nullptr, Always, emptyIsFine, false, {103},
          "It counts as 0: a fixed control strip then has no references, and without references the preset is not loaded."},
         {jobType, Measurement, "Illumination/Mode", nullptr, IfSuspicious, emptyIsFine, false, {}, "It counts as 1 (M1)."},
         {jobType, Measurement, "Status", nullptr, IfSuspicious, emptyIsFine, true, {}, "It counts as 0: the job is measured."},
         {jobType, Measurement, "Reference/Numpatches", nullptr, Always, emptyIsFine, true, {103},
-         "The references in the ticket do not count without it: a profile is looked for instead."},
+         "Without it, the references in the ticket are ignored: a profile is looked up instead."},
         {jobType, Suffix, characterisation, nullptr, Always, emptyToo, false, {103},
-         "There are no references without it, and without references the preset is not loaded."},
+         "Without it, there are no references, and without references the preset is not loaded."},
         {jobType, Shared, "Remote/UsedICCProfile", profile, Always, emptyToo, false, {103},
-         "One of them has to name the reference profile. Without references the preset is not loaded."},
+         "One of them must name the reference profile. Without references, the preset is not loaded."},
         {jobType, Shared, "Footer/ControlstripIT8", nullptr, Always, emptyToo, false, {103},
          "A packaging job (Job/FromEsko 1, workflow 4) needs its strip's server path here."},
         {jobType, Suffix, "Workflow/Verify/DeltaEMode", nullptr, Always, emptyIsFine, false, {103},
-         "The preset is not loaded without it."},
+         "Without it, the preset is not loaded."},
         {jobType, Suffix, "Workflow/Verify/ComparisonMethod", nullptr, Always, emptyIsFine, false, {103},
-         "It is the number of the preset; no preset is loaded without it."},
+         "It is the number of the preset. Without it, no preset is loaded."},
 
         {presetType, Shared, "Name", nullptr, Always, emptyToo, false, {103},
          "A preset without a name is not used: its file is not fetched."},
@@ -102,23 +102,23 @@ const std::vector<Rule>& rules() {
         {jobType, Shared, modeKey, nullptr, IfSuspicious, emptyIsFine, true, {},
          "It counts as 0: the job uses its own strip, and the result goes to this job alone."},
         {jobType, Shared, assessment, modeKey, Always, emptyIsFine, true, {},
-         "The strip that the parent's jobs share is not looked for without it, not even with an empty text, "
+         "Without it (an empty text is enough), the strip shared by the parent's jobs is not looked up, "
          "and the result goes to this job alone."},
         {jobType, Suffix, "Footer/Nesting/ControlstripFile", assessment, Always, emptyIsFine, true, {},
-         "The strip that the parent's jobs share is not found: the job uses its own, and the result goes to this job alone."},
+         "The strip shared by the parent's jobs is not found: the job uses its own, and the result goes to this job alone."},
 
         {jobType, Shared, "Output/Prn/Specific/Measurement/VerifyMode", nullptr, Always, emptyIsFine, false, {},
          "The measuring condition of the inline instrument counts as unknown (-1)."},
 
         {jobType, Shared, "Output/Jdf/FileName", nullptr, Always, emptyToo, false, {255, 111},
-         "Every job needs the name of its JDF, whatever its workflow."},
+         "Every job needs the name of its JDF, regardless of its workflow."},
         {jobType, Shared, "Workflow/RemoteOutFolder", jdfFolder, Always, emptyToo, false, {255, 111},
-         "One of them has to name the folder of the JDF."},
+         "One of them must name the folder of the JDF."},
         {jobType, Shared, "Remote/JDFName", nullptr, Always, emptyToo, false, {255, 111},
          "A job of sub type 80, 81 or 86 names the server path of its JDF here."},
 
         {jobType, Measurement, "Numpatches", nullptr, Always, emptyIsFine, false, {107},
-         "It is the number of measured patches; the stored measurement is not read without it."},
+         "It is the number of measured patches. Without it, the stored measurement is not read."},
         {jobType, Measurement, "SpectralValues/Base", nullptr, Always, emptyIsFine, false, {107}, spectraNeedIt},
         {jobType, Measurement, "SpectralValues/Length", nullptr, Always, emptyIsFine, false, {107}, spectraNeedIt},
         {jobType, Measurement, "SpectralValues/Stepsize", nullptr, Always, emptyIsFine, false, {107}, spectraNeedIt},
@@ -143,18 +143,18 @@ std::string article(PARAM_TYPE type) {
     return (type == PARAM_INT || type == PARAM_INT64 ? "an " : "a ") + std::string(typeName(type));
 }
 
-/// As the load asks: text that it can't decode is empty for it.
+/// Same check as in the load, which treats text that it can't decode as empty.
 bool isUtf8(const std::string& text) {
     return text.empty() || !wxString::FromUTF8(text).empty();
 }
 
-/// Two keys are asked twice in a load: the strip's name for itself and for a nested job.
+/// A load reads two keys twice: the strip's name, for the strip itself and for a nested job.
 bool applies(const Rule& rule, const std::vector<AskedKey>& keys, std::size_t index, Strip strip) {
     const AskedKey& asked = keys[index];
     if (asked.type != rule.ticketType || asked.key != keyOf(rule, strip)) {
         return false;
     }
-    // A packaging job does without characterisation data.
+    // A packaging job does not need characterization data.
     if (rule.key == characterisation && index + 1 < keys.size() &&
         keys[index + 1].key.starts_with("Footer/Controlstrip")) {
         return false;
@@ -171,12 +171,12 @@ bool applies(const Rule& rule, const std::vector<AskedKey>& keys, std::size_t in
                : before.key == rule.previous || before.key == stripKey(strip, rule.previous);
 }
 
-/// Whether the key is asked because the one before it was of no use.
+/// Whether the key is read because the one before it was not usable.
 bool isFallback(const Rule& rule) {
     return rule.previous == ownStrip || rule.previous == profile || rule.previous == jdfFolder;
 }
 
-/// What the elements of an array lack, or an empty text.
+/// Describes missing elements of an array. Empty if there are none.
 std::string arrayProblem(const AskedKey& asked, int wanted) {
     if (!asked.found) {
         return "is missing";
@@ -194,7 +194,7 @@ std::string arrayProblem(const AskedKey& asked, int wanted) {
                                  " elements";
 }
 
-/// The arrays of patches: what they lack counts as 0, and nothing fails.
+/// Checks arrays of patches. Missing elements count as 0, so nothing fails.
 void judgeArray(const AskedKey& asked, int patches, int samples, std::vector<Finding>* findings) {
     const bool isPatches =
         asked.key.ends_with("Values") && asked.key.starts_with("Remote/Measurement");
@@ -268,12 +268,12 @@ std::string problemOf(const AskedKey& asked, bool emptyCounts) {
 std::vector<Finding> judgeKeys(const std::vector<AskedKey>& keys, int job, Strip strip,
                                const std::function<std::string(const AskedKey&)>& similar) {
     std::vector<Finding> findings;
-    int patches = 0; // Of the data set whose arrays follow, and below the samples of a spectrum.
+    int patches = 0; // Of the data set whose arrays follow; `samples` are those of one spectrum.
     int samples = 0;
     for (std::size_t i = 0; i < keys.size(); ++i) {
         const AskedKey& asked = keys[i];
         if (asked.type == jobType && asked.id != job) {
-            continue; // Of another job in the list.
+            continue; // Belongs to another job in the list.
         }
         if (asked.isArray) {
             judgeArray(asked, patches, samples, &findings);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What follows if a key of a job is missing or not readable.
+// Consequences of keys of a job that are missing or can't be read.
 #pragma once
 
 #include <functional>
@@ -29,15 +29,15 @@ std::string keyName(const AskedKey& asked);
 const AskedKey* findKey(const std::vector<AskedKey>& keys, int type, int id,
                         const std::string& key);
 
-/// The whole number that a read has given. Nothing if it gave none; null is no read.
+/// The integer that a read returned, or nothing if it returned none. Null means no read.
 std::optional<int> numberIn(const AskedKey* asked);
 
-/// What keeps a key from being read, as a clause such as "is missing" or "is stored as a double,
-/// but an int is read". Empty if it was read. An empty text counts if emptyCounts is true.
+/// Describes why a key could not be read, as a clause such as "is missing" or "is stored as a
+/// double, but an int is read". Empty if it was read. With emptyCounts, an empty text is one too.
 std::string problemOf(const AskedKey& asked, bool emptyCounts);
 
-/// Judges all keys that were asked. `similar` gives the name of a key of the same ticket that looks
-/// like the missing one, or an empty text.
+/// Evaluates all keys that were read. `similar` returns the name of a key of the same ticket that
+/// resembles the missing one, or an empty text.
 std::vector<Finding> judgeKeys(const std::vector<AskedKey>& keys, int job, Strip strip,
                                const std::function<std::string(const AskedKey&)>& similar);
 

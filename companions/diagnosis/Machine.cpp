@@ -30,7 +30,7 @@ std::vector<Finding> judgeMachine(const std::string& temporaryFolder, bool measu
              "is missing or can't be executed. The job can't be measured.",
              {exitMeasuringFailed, exitSampleMissing});
     } else if (measures && Helper::IsNMRunning()) {
-        tell(tool, "runs now. A second measurement can't start until it ends.",
+        tell(tool, "is running. Another measurement can't start until it ends.",
              {exitMeasuringFailed});
     }
     const std::string viewer = bytesOf(Helper::GetNerovaVerifyPath().GetFullPath());
@@ -42,7 +42,7 @@ std::vector<Finding> judgeMachine(const std::string& temporaryFolder, bool measu
     if (folder.find_first_of("\"'\\") != std::string::npos ||
         folder.find("  ") != std::string::npos) {
         tell(folder,
-             "contains a quote, a backslash or two blanks in a row: the viewer gets a wrong "
+             "contains a quote, a backslash or two consecutive blanks: the viewer gets a wrong "
              "path and shows no page.",
              {});
     }
@@ -51,7 +51,7 @@ std::vector<Finding> judgeMachine(const std::string& temporaryFolder, bool measu
     if (folder.empty() || (lstat(working.c_str(), &status) == 0 &&
                            (!S_ISDIR(status.st_mode) || status.st_uid != geteuid()))) {
         tell(folder.empty() ? "/tmp" : working,
-             "is not a folder of this user. A run can keep no files.", {exitJdfMissing});
+             "is not a folder of this user. Runs can't store files.", {exitJdfMissing});
     }
     return findings;
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the suite lacks on this machine.
+// Missing parts of the suite on this machine.
 #pragma once
 
 #include <string>
@@ -9,9 +9,9 @@
 
 namespace diagnosis {
 
-/// Findings about the installation. The client may run on another machine, so they are no causes.
-/// The temporary folder is that of the user's runs, empty if there is none; the measuring tool
-/// matters only for a job that is measured.
+/// Findings about the installation. They are not causes, because the client may run on another
+/// machine. `temporaryFolder` is the folder that the user's runs use, empty if there is none. The
+/// measuring tool is checked only if the job is measured.
 std::vector<Finding> judgeMachine(const std::string& temporaryFolder, bool measures);
 
 } // namespace diagnosis

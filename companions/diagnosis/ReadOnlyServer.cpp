@@ -72,8 +72,8 @@ int getParameter(void* handle, int type, int id, const char* key, PARAM_TYPE pty
     return serverOf(handle).readKey(type, id, key, ptype, out, position) ? 1 : 0;
 }
 
-/// Of the operations on a ticket only the question whether there is one changes nothing. An opened
-/// ticket could be written.
+/// Of the operations on a ticket, only the test whether it exists changes nothing. An opened ticket
+/// could be written.
 int ticketOperation(void* handle, int type, int id, TICKET_OP op, void*) {
     return op.code == MTICKET_OP_EXISTS && serverOf(handle).exists(type, id) ? 1 : 0;
 }
@@ -145,7 +145,7 @@ void ReadOnlyServer::removePlaceholder() {
     std::filesystem::remove(std::exchange(m_placeholder, std::string()), ignored);
 }
 
-/// The count and the elements of an array are one record.
+/// The count and the elements of an array share one record.
 AskedKey& ReadOnlyServer::recordOf(int type, int id, const char* key, PARAM_TYPE ptype,
                                    int position) {
     if (position >= 0 && !m_keys.empty()) {
@@ -171,7 +171,7 @@ bool ReadOnlyServer::readKey(int type, int id, const char* key, PARAM_TYPE ptype
             asked.wanted = ptype;
         }
         if (!asked.isArray || position < 0) {
-            asked.found = found && asked.stored != nullptr; // It may have been set just now.
+            asked.found = found && asked.stored != nullptr; // Another process may just have set it.
         } else if (!found && asked.firstUnread < 0) {
             asked.firstUnread = position;
         }
@@ -210,7 +210,7 @@ std::int32_t ReadOnlyServer::getFile(const char* local, const char* server) {
         std::ofstream copy(local, std::ios::binary | std::ios::trunc);
         try {
             if (!copy) {
-                file.problem = "no file of this name can be made in the job's folder";
+                file.problem = "no file of this name can be created in the job's folder";
             } else {
                 m_engine->getFile(server, copy);
                 copy.close();
@@ -220,7 +220,7 @@ std::int32_t ReadOnlyServer::getFile(const char* local, const char* server) {
             using store::Fault;
             if (failure.fault == Fault::Lost || failure.fault == Fault::Busy ||
                 failure.fault == Fault::Damaged) {
-                throw; // Not this file alone.
+                throw; // The failure affects more than this file.
             }
             file.problem = failure.what();
         }
@@ -228,7 +228,7 @@ std::int32_t ReadOnlyServer::getFile(const char* local, const char* server) {
             copy.close();
         }
         if (!file.problem.empty()) {
-            std::ofstream(local, std::ios::trunc).flush(); // Without a part of the file.
+            std::ofstream(local, std::ios::trunc).flush(); // Truncates a partial download.
             m_placeholder = local;
         }
         m_files.push_back(file);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A store as a server that records what it is asked and changes nothing.
+// Presents a store as a server that records every read and changes nothing.
 #pragma once
 
 #include <cstdint>
@@ -21,27 +21,27 @@ struct AskedKey {
     int type = 0;
     int id = 0;
     std::string key;
-    PARAM_TYPE wanted = PARAM_DELETE; ///< Of the value or of the elements.
+    PARAM_TYPE wanted = PARAM_DELETE; ///< Type of the value or of the elements.
     bool isArray = false;
-    bool found = false;   ///< The value, or for an array its count.
-    int firstUnread = -1; ///< The first element of an array that is no value of this type.
-    std::shared_ptr<const store::Elements> stored; ///< Null if there is no such key.
+    bool found = false;   ///< The value, or an array's count.
+    int firstUnread = -1; ///< The first element that can't be read as this type.
+    std::shared_ptr<const store::Elements> stored; ///< Null if the key does not exist.
 };
 
 /// A file that was requested.
 struct AskedFile {
     std::string serverPath;
     std::string localPath;
-    std::string problem;   ///< Why it did not come, as a clause for people; empty if it came.
-    std::string namedBy;   ///< The text key that was read last before the request.
-    std::size_t asked = 0; ///< Number of keys that were asked before.
+    std::string problem;   ///< Why it was not downloaded, as a clause; empty if it was.
+    std::string namedBy;   ///< The last text key read before the request.
+    std::size_t asked = 0; ///< Number of keys read before the request.
 };
 
-/// The interface of a comm plug-in over a store. Everybody may log in: who examines a store can
-/// read its folder or its database anyway. Reads are recorded in their order. Every operation that
-/// would change the store is refused.
+/// A comm plug-in's interface to a store. Any login succeeds: whoever examines a store can read its
+/// folder or its database anyway. Reads are recorded in their order. Every operation that would
+/// change the store is refused.
 ///
-/// One object at a time, since the interface's first operation carries no context.
+/// Only one object may exist at a time, because the interface's first operation has no context.
 class ReadOnlyServer {
   public:
     explicit ReadOnlyServer(std::shared_ptr<store::StoreEngine> engine);
@@ -49,21 +49,21 @@ class ReadOnlyServer {
     ReadOnlyServer(const ReadOnlyServer&) = delete;
     ReadOnlyServer& operator=(const ReadOnlyServer&) = delete;
 
-    /// For ComGUIManager::UseInterface. Good for as long as this object.
+    /// For ComGUIManager::UseInterface. Valid as long as this object.
     ComGUIModuleInterface** interface() { return &m_interface; }
 
     const std::vector<AskedKey>& keys() const { return m_keys; }
     const std::vector<AskedFile>& files() const { return m_files; }
 
-    /// Removes the empty file that took the place of a file that did not come. The connector waits
-    /// for files; the empty one ends the wait. It is removed before the next read in any case.
+    /// Removes the empty file that replaces a file that could not be downloaded. It exists because
+    /// the connector waits for files. It is also removed before the next read.
     void removePlaceholder();
 
-    /// Throws the store's failure if one has interrupted the recording. What was recorded then
-    /// describes the failure and not the job.
+    /// Throws the store's failure if one has interrupted the recording. The records made after it
+    /// describe the failure and not the job.
     void throwFailure() const;
 
-    // What the interface's operations do.
+    // Implementation of the interface's operations.
 
     const MTICKET_ACCESS* container() const { return &m_access; }
     bool readKey(int type, int id, const char* key, PARAM_TYPE ptype, void* out, int position);

@@ -11,8 +11,8 @@ namespace {
 
 constexpr std::size_t tooFar = 3;
 
-/// How many characters differ, or tooFar for as many and more. Keys are short, so the plain table
-/// will do.
+/// Number of differing characters, at most tooFar. Keys are short, so the plain table is
+/// sufficient.
 std::size_t distanceOf(const std::string& a, const std::string& b) {
     if (a.size() > b.size() + 2 || b.size() > a.size() + 2) {
         return tooFar;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Keys that look like another one, for misspelt names.
+// Finds keys with similar names, to detect misspelt ones.
 #pragma once
 
 #include <map>
@@ -12,14 +12,14 @@
 
 namespace diagnosis {
 
-/// Of the tickets of a store whose keys were asked. Refers to both.
+/// Searches the tickets whose keys were read. Keeps references to both arguments.
 class SimilarKeys {
   public:
     SimilarKeys(store::StoreEngine& engine, const std::vector<AskedKey>& asked)
         : m_engine(engine), m_asked(asked) {}
 
-    /// A key of the same ticket that nobody asked for and that differs in at most two characters,
-    /// not counting case: a misspelt one, or that of the other strip. Empty if there is none.
+    /// A key of the same ticket that was not read and differs in at most two characters, ignoring
+    /// case: a misspelt key, or the other strip's. Empty if there is none.
     std::string like(const AskedKey& wanted);
 
   private:
@@ -27,7 +27,7 @@ class SimilarKeys {
 
     store::StoreEngine& m_engine;
     const std::vector<AskedKey>& m_asked;
-    std::map<std::pair<int, int>, std::vector<std::string>> m_names; ///< Of each ticket.
+    std::map<std::pair<int, int>, std::vector<std::string>> m_names; ///< Key names by ticket.
 };
 
 } // namespace diagnosis

@@ -18,7 +18,7 @@ namespace diagnosis {
 
 namespace {
 
-/// The keys of one job, and what is found in their values.
+/// The keys of one job, and the findings on their values.
 class Values {
   public:
     explicit Values(const Examined& run)
@@ -55,8 +55,8 @@ void Values::judgeReferences() {
     if (workflow && (*workflow < 1 || *workflow > 3) && !isDynamic() && !isPackaging) {
         add(key,
             "is " + std::to_string(*workflow) +
-                ". References come with 1 (profile), 2 (characterisation data), 3 (ticket or "
-                "profile), and with 4 if Job/FromEsko is 1. Without references the preset is not "
+                ". References require 1 (profile), 2 (characterization data), 3 (ticket or "
+                "profile), or 4 if Job/FromEsko is 1. Without references, the preset is not "
                 "loaded.",
             {exitPresetFailed});
     }
@@ -99,24 +99,23 @@ void Values::judgeComparison() {
     }
 }
 
-/// Values that lead a run another way than a person may expect.
+/// Values that make a run do something else than a person may expect.
 void Values::judgeRoad() {
     if (m_strip == Strip::Second &&
         numberOf(jobkeys::verifyActiveKey) != jobkeys::activeForTwoStrips) {
         add("Workflow/Verify/Active",
-            "is not 3: the job counts as one with a single strip, and a run on the second closes "
-            "it.");
+            "is not 3: the job counts as one with a single strip, and a run on the second strip "
+            "closes it.");
     }
     const std::string patches = measurementKey(m_strip, "Numpatches");
     if (m_run.measures && !m_run.remeasure && m_run.job.measurementStatus < 1 &&
         m_run.engine.key(jobType, m_run.job.jobID, patches) != nullptr) {
         add(measurementKey(m_strip, "Status"),
-            "is missing or 0, so that the job is measured although the ticket has " + patches +
-                ".");
+            "is missing or 0, so the job is measured although the ticket has " + patches + ".");
     }
 }
 
-/// The number of the instrument is read from the strip's file, and 0 if it can't be.
+/// The number of the instrument is read from the strip's file. It is 0 if it can't be read.
 void Values::judgeInstrument() {
     const KZJobDataStruct& job = m_run.job;
     if (job.deviceID != 0 || job.controlStripFile.empty() || isDynamic()) {
@@ -131,12 +130,12 @@ void Values::judgeInstrument() {
     const bool isInline = job.inlineVerifyJob == 1;
     findings.push_back(
         {.where = "control strip " + fileName(bytesOf(job.controlStripFile)),
-         .text = "The number of the instrument reads as 0: " +
-                 (line.empty() ? "no line has the word DEVICE."
+         .text = "The instrument number reads as 0: " +
+                 (line.empty() ? "no line contains the word DEVICE."
                                : "the first line with the word DEVICE is \"" + line +
-                                     "\", and has to be the word, one blank and a number.") +
-                 (isInline ? " With sub type 96 such a job counts as one that an inline "
-                             "instrument has measured: it is compared and never measured."
+                                     "\", but must be the word, one blank and a number.") +
+                 (isInline ? " With sub type 96, such a job counts as measured by an inline "
+                             "instrument: it is compared and never measured."
                            : ""),
          .codes = isInline ? std::vector<int>{exitStoredDataFailed, exitSampleMissing}
                            : std::vector<int>{}});

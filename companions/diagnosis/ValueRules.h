@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Values of a job's keys that are there and can be read, and still are not what a run needs.
+// Values of a job's keys that can be read but are not what a run needs.
 #pragma once
 
 #include <vector>
@@ -11,13 +11,13 @@
 
 namespace diagnosis {
 
-/// A run as far as it was examined.
+/// The examined part of a run.
 struct Examined {
     const ReadOnlyServer& server;
     store::StoreEngine& engine;
-    const KZJobDataStruct& job; ///< As the load has left it.
+    const KZJobDataStruct& job; ///< As filled by the load.
     bool measures;
-    bool remeasure; ///< Asked for by the client.
+    bool remeasure; ///< Requested by the client.
 };
 
 std::vector<Finding> judgeValues(const Examined& run);

@@ -8,14 +8,14 @@
 
 namespace diagnosis {
 
-/// A path of the tool's as bytes.
+/// The bytes of a path of the tool.
 std::string bytesOf(const wxString& text);
 
 /// The last part of a path.
 std::string fileName(const std::string& path);
 
-/// An exit code with what it means: "22, An input is neither CGATS text nor an ICC profile. ...".
-/// Without a full stop. A code that is not known is its number.
+/// An exit code and its meaning: "22, An input is neither CGATS text nor an ICC profile. ...",
+/// without the final full stop. An unknown code gives only its number.
 std::string explained(int code);
 
 } // namespace diagnosis

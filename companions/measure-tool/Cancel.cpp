@@ -22,7 +22,7 @@ namespace {
 
 constexpr int cancelling[] = {SIGINT, SIGHUP, SIGTERM};
 
-/// One wait; longer ones are made of several.
+/// Limit of a single wait; longer waits are split.
 constexpr std::chrono::milliseconds longestWait = std::chrono::hours(1);
 
 std::size_t worksLeft = 0;
@@ -36,7 +36,7 @@ sigset_t cancellingSet() {
     return set;
 }
 
-/// Waits for one of the signals, which are held back and so can't be missed between two waits.
+/// Waits for one of the signals. They are blocked, so none is missed between two waits.
 void waitAtMost(std::chrono::nanoseconds time) {
     const auto whole = std::chrono::duration_cast<std::chrono::seconds>(time);
     const timespec limit{static_cast<time_t>(whole.count()),
@@ -54,7 +54,7 @@ base::Descriptor checked(int number) {
     return base::Descriptor(number);
 }
 
-/// Waits until the event has happened. False if `end` comes first.
+/// Waits for the event. False if `end` comes first.
 bool awaitEvent(const base::Descriptor& event, Clock::time_point end) {
     const sigset_t set = cancellingSet();
     const base::Descriptor signals = checked(signalfd(-1, &set, SFD_CLOEXEC | SFD_NONBLOCK));
@@ -89,15 +89,15 @@ void checkCancelled() {
 
 void pauseFor(std::chrono::milliseconds time) {
     const auto end = Clock::now() + time;
-    // Another signal, such as that of a changed window, ends a wait early.
+    // Another signal, such as the one for a resized window, can end a wait early.
     for (auto left = end - Clock::now(); left.count() > 0; left = end - Clock::now()) {
         waitAtMost(left);
     }
     checkCancelled();
 }
 
-// A signal could interrupt a read only by a handler, and not even then where the file system waits
-// for a server. So the read gets a thread, which is given up.
+// Only a handler could make a signal interrupt a read, and even that fails while the file system
+// waits for a server. So the read runs in a thread, which is abandoned on a cancel.
 bool awaitWork(std::function<void()> work, Clock::time_point end) {
     checkCancelled();
     const auto done = std::make_shared<base::Descriptor>(checked(eventfd(0, EFD_CLOEXEC)));
@@ -105,7 +105,7 @@ bool awaitWork(std::function<void()> work, Clock::time_point end) {
         work();
         eventfd_write(done->get(), 1);
     }).detach();
-    ++worksLeft; // Also if the wait ends by an exception.
+    ++worksLeft; // Counts even if the wait ends with an exception.
     if (!awaitEvent(*done, end)) {
         return false;
     }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The person's way to end a measurement: Ctrl-C, a closed terminal, or an application that asks for
-// it (SIGINT, SIGHUP, SIGTERM).
+// Lets a person end a measurement: with Ctrl-C, by closing the terminal, or through an application
+// (SIGINT, SIGHUP, SIGTERM).
 #pragma once
 
 #include <chrono>
@@ -15,27 +15,27 @@ namespace measuretool {
 
 using Clock = std::chrono::steady_clock;
 
-/// From here on these signals no longer end the process; they are seen by the other functions.
-/// REQUIRES: no other thread runs yet.
+/// After this call these signals no longer end the process; the other functions handle them.
+/// REQUIRES: no other thread is running yet.
 void listenForCancel();
 
 /// Throws Failure (Cancelled) if the run was cancelled.
 void checkCancelled();
 
-/// Waits, and throws Failure (Cancelled) as soon as the run is cancelled.
+/// Waits. Throws Failure (Cancelled) as soon as the run is cancelled.
 void pauseFor(std::chrono::milliseconds time);
 
-/// Runs `work` on a thread of its own and waits for its end. False if `end` comes first. Throws
-/// Failure (Cancelled) as soon as the run is cancelled. In both cases the work goes on by itself.
+/// Runs `work` in its own thread and waits for it. Returns false if `end` comes first. Throws
+/// Failure (Cancelled) as soon as the run is cancelled. In both cases the work continues alone.
 bool awaitWork(std::function<void()> work, Clock::time_point end);
 
-/// True if awaitWork has left a thread behind, whose work may never end. Then a process must end
+/// True if awaitWork has left a thread running that may never end. The process must then exit
 /// without the destructors of static objects, which the thread may still use.
 bool hasLeftWork();
 
-/// The result of `work`, which may block in the file system: a pipe, or a share whose server is
-/// gone. Empty if `end` comes first. Throws what the work throws, and Failure (Cancelled).
-/// REQUIRES: the work owns all that it touches, since it may outlive the caller.
+/// Returns the result of `work`, which may block in the file system: on a pipe, or on a share with
+/// a lost server. Empty if `end` comes first. Throws what the work throws, and Failure (Cancelled).
+/// REQUIRES: the work owns everything it uses, since it may outlive the caller.
 template<class Work>
 std::optional<std::invoke_result_t<Work>> resultBefore(Clock::time_point end, Work work) {
     const auto task =
@@ -47,7 +47,7 @@ std::optional<std::invoke_result_t<Work>> resultBefore(Clock::time_point end, Wo
     return result.get();
 }
 
-/// The same without a limit of time.
+/// Same without a time limit.
 template<class Work>
 std::invoke_result_t<Work> unlessCancelled(Work work) {
     return *resultBefore(Clock::time_point::max(), std::move(work));

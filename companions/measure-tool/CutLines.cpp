@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
-// A row that loses two bytes, because its name has two more bytes than characters:
+// A row that loses two bytes because its name has two more bytes than characters:
 //
 //     SAMPLE_ID SAMPLE_NAME CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B
 //     1         Größe       0      0      0      100    16    0     0
 //
-// arrives without the last cell and the tab before it. Here that costs a reference, which nobody
-// needs. Without the Lab columns, or with few bytes in them, it would turn black 100 into 1.
+// arrives without the last cell and the preceding tab. Here that loses a reference value, which is
+// not needed. Without the Lab columns, or if they are short, it would turn black 100 into 1.
 #include "companions/measure-tool/CutLines.h"
 
 #include <algorithm>
@@ -25,7 +25,7 @@ using colour::cgats::Column;
 using colour::cgats::Layout;
 using colour::cgats::Quantity;
 
-/// A line has at most 511 bytes, and up to three fewer if a character would be cut in half.
+/// A cut line has 511 bytes, or up to three less so as not to split a character.
 constexpr std::size_t shortestCut = 511 - 3;
 
 constexpr std::string_view blanks = " \t";
@@ -36,7 +36,7 @@ enum class Separator {
     Unknown,
 };
 
-/// Cells point into their line.
+/// Views of their line.
 using Cells = std::vector<std::string_view>;
 
 bool mayBeCut(const std::string& line) {
@@ -63,7 +63,7 @@ Cells cellsByTabs(std::string_view line) {
     return cells;
 }
 
-/// The end of the cell that starts at `at`. A quote closes only if a blank or the end follows.
+/// The end of the cell that starts at `at`. A quote closes only before a blank or the line's end.
 std::size_t endOfWord(std::string_view line, std::size_t at) {
     if (line[at] != '"') {
         return std::min(line.find_first_of(blanks, at), line.size());
@@ -92,7 +92,7 @@ Cells cellsOf(std::string_view line, Separator separator) {
     return separator == Separator::Tab ? cellsByTabs(line) : cellsByBlanks(line);
 }
 
-/// Told by the names, and by the rows if the names leave a choice.
+/// Detected from the names. If they are ambiguous, detected from the rows.
 Separator separatorOf(const TableLines& table) {
     if (table.names.find_first_of("\",;") != table.names.npos) {
         return Separator::Unknown;
@@ -123,7 +123,7 @@ bool isReference(Quantity quantity) {
     throw Failure(Status::BadDefinition, problem);
 }
 
-/// A name up to its first digit, in capitals.
+/// A name up to its first digit, in upper case.
 std::string startOf(const std::string& name) {
     std::string start = name.substr(0, name.find_first_of("0123456789"));
     std::transform(start.begin(), start.end(), start.begin(),
@@ -131,8 +131,8 @@ std::string startOf(const std::string& name) {
     return start;
 }
 
-/// A cut list of columns ends in a damaged name, and the columns after it are unknown. They are
-/// taken for references if the name before is one, and the damaged name may be another.
+/// A cut list of columns ends with a damaged name, and the columns after it are unknown. They count
+/// as references if the previous name is one and the damaged name can be another.
 void checkCutNames(std::vector<std::string>& names) {
     const std::size_t whole = names.size() - 1;
     const auto meanings = colour::cgats::meaningsOf(names);
@@ -145,16 +145,16 @@ void checkCutNames(std::vector<std::string>& names) {
                         [&](const std::string& start) { return start.starts_with(damaged); });
     }
     if (!references) {
-        refuse("the definition's list of columns has lost its end: in the strip it has at most "
-               "511 bytes, and names outside ASCII take more of them");
+        refuse("the definition's list of columns is cut off: the strip may use at most 511 bytes "
+               "for it, and non-ASCII names take more of them");
     }
     names[whole] = "-";
 }
 
-/// What stays of a table.
+/// The part of a table that is kept.
 struct Kept {
     std::vector<std::size_t> columns;
-    std::size_t needed = 0; ///< Cells up to the last id or device value; a name may suffer.
+    std::size_t needed = 0; ///< Cells up to the last id or device value. Names may be cut.
     bool hasDevice = false;
 };
 
@@ -181,38 +181,40 @@ bool isNumber(std::string_view cell) {
     return error == std::errc() && end == cell.data() + cell.size();
 }
 
-/// Without this, a reader would pass over cells that nobody names: a spot ink, say, if the strip
-/// has its list of columns on two lines.
+/// Without this check, a reader would skip cells of unnamed columns, such as a spot ink if the
+/// strip's list of columns is on two lines.
 void checkAllNamed(const TableLines& table, std::size_t nameCount, Separator separator) {
     const auto first = std::find_if(table.rows.begin(), table.rows.end(), isRow);
     if (first == table.rows.end()) {
         return;
     }
     const Cells cells = cellsOf(*first, separator);
-    // Among blanks the surplus may be a name of several words, unless the strip counts its columns.
+    // With blanks, extra cells may be a name of several words, unless the strip counts columns.
     const bool surplus = cells.size() > nameCount && isNumber(cells[nameCount]);
     if (surplus && (separator == Separator::Tab || cells.size() == table.fieldCount)) {
-        refuse("the rows of the definition have more cells than columns are named: the strip's "
-               "list of columns must be on one line");
+        refuse(
+            "the rows of the definition have more cells than there are column names: the strip's "
+            "list of columns must be on one line");
     }
 }
 
-/// Takes from a row what stays.
+/// The cells of a row that are kept.
 std::string keptCells(const std::string& line, std::size_t number, const Kept& kept,
                       std::size_t nameCount, Separator separator) {
     const Cells cells = cellsOf(line, separator);
     const std::string row = "row " + std::to_string(number) + " of the definition ";
     if (cells.size() < kept.needed) {
-        refuse(row + "has lost device values, or does not have all of them on one line");
+        refuse(row + "lacks device values, or they are not all on one line");
     }
     if (separator == Separator::Blanks && cells.size() > nameCount) {
-        refuse(row + "can't be split into cells: in the strip, names with blanks are quoted");
+        refuse(row + "can't be split into cells: in the strip, names with blanks must be quoted");
     }
     if (kept.needed > 0 && mayBeCut(line)) {
         const std::string_view last = cells[kept.needed - 1];
         if (last.data() + last.size() == line.data() + line.size()) {
-            refuse(row + "may have lost the end of its device values, which a name outside ASCII "
-                         "or 511 bytes before them cause: in the strip, names go after them");
+            refuse(row +
+                   "may have lost the end of its device values, because of a non-ASCII name or "
+                   "of 511 bytes before them: in the strip, names must follow them");
         }
     }
     std::string result;
@@ -231,7 +233,7 @@ std::string joined(const std::vector<std::string>& names, const std::vector<std:
     return line;
 }
 
-/// The names of all columns, without those of references: what is in their cells does not count.
+/// The names of all columns, with those of references replaced: their cells are ignored.
 std::string withoutReferences(const std::vector<std::string>& names, const Kept& kept,
                               Separator separator) {
     std::string line;
@@ -256,8 +258,8 @@ void dropCutCells(const TableLines& table) {
                                        [](const auto& row) { return isRow(row) && mayBeCut(row); });
     const bool anyCut = namesCut || rowsCut;
     if (anyCut && separator == Separator::Unknown) {
-        refuse("the definition has lines that may have lost their end, and its columns can't be "
-               "told apart: in the strip, tabs separate them");
+        refuse("the definition has lines that may be cut off, and its columns can't be separated: "
+               "in the strip, tabs must separate them");
     }
     if (names.empty() || separator == Separator::Unknown) {
         return;
@@ -274,7 +276,7 @@ void dropCutCells(const TableLines& table) {
             continue;
         }
         std::string cells = keptCells(row, ++number, kept, names.size(), separator);
-        // Without device values the references stay: the reader wants one or the other.
+        // Without device values, the references stay, because the reader needs one or the other.
         if (kept.hasDevice) {
             row = std::move(cells);
         }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tables of definitions, whose lines the writer may have cut.
+// Repairs tables of definitions that may have cut lines.
 #pragma once
 
 #include <cstddef>
@@ -10,22 +10,21 @@ namespace measuretool {
 
 /// The lines of one table, without their line ends.
 struct TableLines {
-    std::string& names;          ///< The one line that names the columns.
-    std::span<std::string> rows; ///< Blank lines and comments may be among them.
-    std::size_t fieldCount = 0;  ///< As NUMBER_OF_FIELDS states it; 0 if nothing does.
-    bool isWritten = true;       ///< False for a strip as it is, which no writer has cut.
+    std::string& names;          ///< The line with the column names.
+    std::span<std::string> rows; ///< May include blank lines and comments.
+    std::size_t fieldCount = 0;  ///< From NUMBER_OF_FIELDS; 0 if absent.
+    bool isWritten = true; ///< False for a strip in its original form, which no writer has cut.
 };
 
-/// The writer ends each line after 511 bytes, and earlier by one byte for each byte that its
-/// characters have beyond their first. If any line may have been cut like this, only ids, names and
-/// device values stay in the table, one tab between two of them: what a cut may have damaged after
-/// these is not needed. Otherwise only the names of references go.
+/// The writer cuts each line after 511 bytes, and one byte earlier for each continuation byte of
+/// its characters. If any line may have been cut like this, only ids, names and device values stay
+/// in the table, separated by one tab: the cells that a cut may have damaged are not needed.
+/// Otherwise only the names of references are replaced.
 ///
-/// A table without device values keeps its references: by them a reader recognises it.
+/// A table without device values keeps its references, because a reader recognises it by them.
 ///
-/// Throws Failure (BadDefinition) if a cut may have reached an id, a device value or the name of
-/// their column, or if the table's columns can't be told apart. Also throws if rows have cells
-/// that no column's name belongs to.
+/// Throws Failure (BadDefinition) if a cut may have reached an id, a device value or their column's
+/// name, if the columns can't be separated, or if rows have cells without a column name.
 void dropCutCells(const TableLines& table);
 
 } // namespace measuretool

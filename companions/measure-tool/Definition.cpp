@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A definition, all lines ending in CR LF but the last:
+// A definition. All lines but the last end with CR LF:
 //
 //     CGATS.17
 //     ORIGINATOR "Nerova Verify"
@@ -20,7 +20,7 @@
 //     END_DATA
 //
 // The writer may have cut lines: CutLines.h describes how. Filling rows have these cells whatever
-// the columns of the strip are, so that they are taken out before the text is read.
+// the strip's columns are, so they are removed before the text is parsed.
 #include "companions/measure-tool/Definition.h"
 
 #include <algorithm>
@@ -42,7 +42,7 @@ namespace {
 
 constexpr std::size_t largestFile = 64 << 20;
 
-/// A rounded amount may exceed 100 percent by this much.
+/// Rounding may raise an amount above 100 percent, up to this limit.
 constexpr double largestAmount = 101;
 
 constexpr std::string_view fillings[] = {
@@ -50,15 +50,15 @@ constexpr std::string_view fillings[] = {
     "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00",
 };
 
-/// The line by which a definition differs from a strip that was given by hand.
+/// Distinguishes a definition from a strip that a person supplies.
 constexpr const char* writer = "ORIGINATOR \"Nerova Verify\"";
 
-/// Makes the reader take values as they are, instead of judging their scale by the largest.
+/// Makes the reader use values as they are, instead of guessing their scale from the largest.
 constexpr const char* statedScales = "TINTGATE_SCALES \"device 100, XYZ 100, spectra 1\"";
 
 using Lines = std::vector<std::string>;
 
-/// Blank lines mean nothing and are left out: of a file of line ends, nothing stays.
+/// Drops blank lines, so a file of line ends gives no lines.
 Lines linesOf(std::string_view text) {
     Lines lines;
     while (!text.empty()) {
@@ -76,7 +76,7 @@ std::string firstWordOf(const std::string& line) {
     return line.substr(start, line.find_first_of(" \t", start) - start);
 }
 
-/// The first line from `first` on that begins with this word, else `last`.
+/// The first line from `first` on that begins with this word, or `last`.
 std::size_t findLine(const Lines& lines, const char* word, std::size_t first, std::size_t last) {
     while (first < last && firstWordOf(lines[first]) != word) {
         ++first;
@@ -92,7 +92,7 @@ std::string numberOfFilling(std::string_view line) {
     return std::string(line.substr(0, filling ? digits : 0));
 }
 
-/// Takes the filling rows from the end of the rows. A strip of nothing else keeps them as rows.
+/// Removes filling rows from the end of the rows. A strip of nothing else keeps them as rows.
 Lines takeFillings(Lines& lines, std::size_t firstRow, std::size_t lastRow) {
     Lines numbers;
     std::size_t first = lastRow;
@@ -113,7 +113,7 @@ Lines takeFillings(Lines& lines, std::size_t firstRow, std::size_t lastRow) {
     return numbers;
 }
 
-/// The whole number that follows a keyword in the lines before `last`; 0 if there is none.
+/// The integer that follows a keyword in the lines before `last`; 0 if there is none.
 std::size_t countIn(const Lines& lines, const char* keyword, std::size_t last) {
     const std::size_t line = findLine(lines, keyword, 0, last);
     std::size_t count = 0;
@@ -125,13 +125,13 @@ std::size_t countIn(const Lines& lines, const char* keyword, std::size_t last) {
     return count;
 }
 
-/// Makes a text that the reader of colour files takes whole. Returns the numbers of filling rows.
+/// Makes the lines acceptable for the reader of colour files. Returns the numbers of filling rows.
 Lines prepare(Lines& lines) {
     const std::size_t format = findLine(lines, "BEGIN_DATA_FORMAT", 0, lines.size());
     const std::size_t firstRow = findLine(lines, "BEGIN_DATA", format, lines.size()) + 1;
     const std::size_t lastRow = findLine(lines, "END_DATA", firstRow, lines.size());
-    // The writer expects the names on one line. A strip that was given by hand may have them on
-    // several: its lines were never cut, and it stays as it is.
+    // The writer puts the names on one line. A strip supplied by a person may have them on several.
+    // Its lines were never cut, and it stays unchanged.
     const std::size_t names = format + 1;
     if (firstRow > lines.size() ||
         findLine(lines, "END_DATA_FORMAT", format, firstRow) != names + 1) {
@@ -146,7 +146,7 @@ Lines prepare(Lines& lines) {
     return numbers;
 }
 
-/// The last line stays without an end: by this the reader recognises a text that was cut off.
+/// Keeps a missing line end of the last line: the reader uses it to detect truncated text.
 std::string textOf(const Lines& lines, const std::string& original) {
     std::string text;
     for (const std::string& line : lines) {
@@ -158,8 +158,8 @@ std::string textOf(const Lines& lines, const std::string& original) {
     return text;
 }
 
-/// Amounts of ink are percent, whatever the largest is: a strip with one row of 120 is damaged, and
-/// not a strip of 0 to 255, in which cyan 100 would be 39 percent.
+/// Amounts of ink are percent, whatever the largest value is. A strip with one row of 120 is
+/// damaged; it is not a strip of 0 to 255, in which cyan 100 would be 39 percent.
 void takeAmountsAsPercent(Lines lines, const std::string& original, colour::DataSet& set) {
     lines.insert(lines.begin() + 1, statedScales);
     colour::DataSet stated;
@@ -168,7 +168,7 @@ void takeAmountsAsPercent(Lines lines, const std::string& original, colour::Data
         stated.device.size() != set.device.size()) {
         return;
     }
-    // Fractions of 1 are left to the reader, which makes percent of them.
+    // Fractions of 1 are left to the reader, which converts them to percent.
     const double largest = *std::max_element(stated.device.begin(), stated.device.end());
     if (largest > 1) {
         set.device = std::move(stated.device);
@@ -188,7 +188,7 @@ void checkAmounts(const colour::DataSet& set) {
     throw Failure(Status::BadDefinition, "row " + std::to_string(index / channels + 1) +
                                              " of the definition has " + amount + " for " +
                                              set.channels[index % channels] +
-                                             ", which is beyond 100 percent");
+                                             ", which is above 100 percent");
 }
 
 void addPaper(colour::DataSet& chart, const Lines& numbers) {
@@ -205,8 +205,8 @@ void addPaper(colour::DataSet& chart, const Lines& numbers) {
     }
 }
 
-/// What ILLUMINATION_CONDITION asks for: 0 to 3 are M0 to M3, and -1 is any. Other numbers have no
-/// meaning that an export could be held against.
+/// Decodes ILLUMINATION_CONDITION: 0 to 3 are M0 to M3, and -1 is any. Other numbers have no
+/// meaning that an export could be checked against.
 std::string conditionIn(const std::string& bytes) {
     const std::string number =
         colour::cgatsKeyword(bytes, "ILLUMINATION_CONDITION").value_or(std::string());

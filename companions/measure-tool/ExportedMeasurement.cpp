@@ -47,7 +47,7 @@ State stateOf(const std::string& path) {
             {status.st_mtim.tv_sec, status.st_mtim.tv_nsec}};
 }
 
-/// An export can never come if its folder is not there. Better to say so before anybody measures.
+/// Without its folder, an export can never arrive. Reports that before anybody measures.
 void checkFolder(const std::string& path) {
     const std::filesystem::path parent = std::filesystem::path(path).parent_path();
     const std::string folder = parent.empty() ? "." : parent.string();
@@ -62,15 +62,15 @@ void checkFolder(const std::string& path) {
                   folder + ", the folder of the export, can't be used: " + reason);
 }
 
-/// Loads a file that has colours: of several measurement conditions the one that is asked for.
-/// Throws Failure (BadExport) if it has none.
+/// Loads a file with colours; if it has several measurement conditions, the requested one. Throws
+/// Failure (BadExport) if there are no colours.
 colour::DataSet load(const std::string& path, const std::string& condition) {
     colour::ColourFile file;
     colour::CgatsWants wants;
     wants.condition = condition;
     expectUsable(colour::loadColourFile(path, wants, file), Status::BadExport, path);
     if (!file.set || !file.set->hasColour()) {
-        throw Failure(Status::BadExport, path + " holds no measured colours");
+        throw Failure(Status::BadExport, path + " has no measured colours");
     }
     return std::move(*file.set);
 }
@@ -80,12 +80,12 @@ struct Accepted {
     std::vector<std::size_t> rows;
 };
 
-/// Throws Failure (OtherPatches, OtherCondition) unless the export is what was asked for.
+/// Throws Failure (OtherPatches, OtherCondition) unless the export matches the request.
 Accepted accept(colour::DataSet set, const Settings& settings, const Definition& definition) {
     const std::string& stated = set.conditions.measurement;
     if (!definition.condition.empty() && !stated.empty() && stated != definition.condition) {
         throw Failure(Status::OtherCondition, settings.file + " was measured under " + stated +
-                                                  ", and the job asks for " + definition.condition);
+                                                  ", but the job requires " + definition.condition);
     }
     try {
         std::vector<std::size_t> rows = matchPatches(definition.chart, set, settings.bareIds);
@@ -95,7 +95,7 @@ Accepted accept(colour::DataSet set, const Settings& settings, const Definition&
     }
 }
 
-/// Waits for a file that is newly written and can be accepted.
+/// Waits for a newly written file that can be accepted.
 class Wait {
   public:
     Wait(const Settings& settings, const Definition& definition, Operator& person)
@@ -130,7 +130,7 @@ class Wait {
         return resultBefore(m_end, [path = m_settings.file] { return stateOf(path); });
     }
 
-    /// True if there is a file at rest that was not tried yet.
+    /// True if there is a stable file that has not been tried yet.
     bool isNew() {
         const State now = look().value_or(State());
         const bool atRest = now == m_last;
@@ -176,18 +176,18 @@ class Wait {
             throw Failure(Status::BadExport, m_settings.file + " was not exported in time");
         }
         throw Failure(m_problem->status,
-                      std::string(m_problem->what()) + "; no other export came in time");
+                      std::string(m_problem->what()) + "; no other export arrived in time");
     }
 
     const Settings& m_settings;
     const Definition& m_definition;
     Operator& m_person;
     const Clock::time_point m_end;
-    State m_tried; ///< Too old, or tried in vain.
+    State m_tried; ///< Too old, or already refused.
     State m_last;
-    std::optional<Failure> m_problem; ///< Of the last attempt.
+    std::optional<Failure> m_problem; ///< From the latest attempt.
     Clock::time_point m_failed;
-    bool m_open = false; ///< The operator does not know of the problem yet.
+    bool m_open = false; ///< The problem has not been reported to the operator yet.
 };
 
 } // namespace
@@ -208,7 +208,7 @@ ExportedMeasurement::ExportedMeasurement(const Settings& settings, const Definit
     m_set = std::move(accepted.set);
     m_rows = std::move(accepted.rows);
     if (!definition.condition.empty() && m_set.conditions.measurement.empty()) {
-        person.remark(path + " does not state its measurement condition, and the job asks for " +
+        person.remark(path + " does not state its measurement condition; the job requires " +
                       definition.condition);
     }
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A measurement that an instrument's own software has exported.
+// A measurement exported by an instrument's own software.
 #pragma once
 
 #include <cstddef>
@@ -12,13 +12,13 @@
 
 namespace measuretool {
 
-/// Hands over what was exported for the patches of a definition.
+/// Returns exported values for the patches of a definition.
 class ExportedMeasurement : public Instrument {
   public:
-    /// Takes the file that is there. With a time to wait, it asks the operator instead and takes a
-    /// file that is newly written: it differs from the one that was there, and has come to rest.
-    /// A file that can't be accepted is reported to the operator, and the wait goes on; when the
-    /// time is up, the last such problem is the failure.
+    /// Takes the existing file. With a time to wait, asks the operator and takes a newly written
+    /// file: one that differs from the existing file and no longer changes. A file that can't be
+    /// accepted is reported to the operator, and the wait continues. When the time is up, the last
+    /// such problem is the failure.
     ///
     /// Throws Failure: BadExport, OtherPatches, OtherCondition, Cancelled.
     ExportedMeasurement(const Settings& settings, const Definition& definition, Operator& person);
@@ -28,7 +28,7 @@ class ExportedMeasurement : public Instrument {
 
   private:
     colour::DataSet m_set;
-    std::vector<std::size_t> m_rows; ///< Of each patch of the chart.
+    std::vector<std::size_t> m_rows; ///< Row of each patch of the chart.
 };
 
 } // namespace measuretool

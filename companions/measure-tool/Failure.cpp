@@ -6,7 +6,7 @@ namespace measuretool {
 const char* wordsFor(colour::Failure failure) {
     switch (failure) {
     case colour::Failure::Missing:
-        return "is not there";
+        return "does not exist";
     case colour::Failure::TooLarge:
         return "is too large";
     case colour::Failure::NotRecognised:
@@ -17,19 +17,19 @@ const char* wordsFor(colour::Failure failure) {
         return "has no patches";
     case colour::Failure::NoColourValues:
     case colour::Failure::SpectraUnusable:
-        return "has no colour values that can be used";
+        return "has no usable colour values";
     case colour::Failure::NoDeviceValues:
         return "has no device values";
     case colour::Failure::NotNumeric:
-        return "has a text where a number belongs";
+        return "has text in place of a number";
     case colour::Failure::ProfileDamaged:
-        return "is no intact ICC profile";
+        return "is not an intact ICC profile";
     case colour::Failure::ProfileClass:
-        return "is a profile of a class that describes no print";
+        return "is a profile of a class that does not describe prints";
     case colour::Failure::ProfileColourSpace:
-        return "is no profile for CMYK";
+        return "is not a CMYK profile";
     case colour::Failure::ProfileUnusable:
-        return "is a profile that gives no colours";
+        return "is a profile that yields no colours";
     default:
         return "can't be read";
     }

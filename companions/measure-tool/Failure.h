@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// How a run of the measuring tool ends.
+// Failures of the measuring tool.
 #pragma once
 
 #include <stdexcept>
@@ -12,7 +12,7 @@ namespace measuretool {
 
 using Status = NerovaMeasureStatus; ///< Listed in docs/companion-statuses.csv.
 
-/// Ends the run. The text is a sentence for people, without a full stop.
+/// Ends the run. The text is a sentence without a full stop.
 class Failure : public std::runtime_error {
   public:
     Failure(Status status, const std::string& text) : std::runtime_error(text), status(status) {}
@@ -20,10 +20,10 @@ class Failure : public std::runtime_error {
     const Status status;
 };
 
-/// What is wrong with a file, as the end of a sentence that begins with its path.
+/// Describes a problem with a file, as the end of a sentence that begins with the file's path.
 const char* wordsFor(colour::Failure failure);
 
-/// Throws Failure (`status`, or OutOfMemory) unless the file at `path` could be used.
+/// Throws Failure (`status`, or OutOfMemory) unless the file at `path` was usable.
 void expectUsable(colour::Failure failure, Status status, const std::string& path);
 
 } // namespace measuretool

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What measures patches.
+// The interface of an instrument.
 #pragma once
 
 #include <cstddef>
@@ -9,11 +9,11 @@
 
 namespace measuretool {
 
-/// What an instrument says of one patch.
+/// The reading of one patch.
 struct Reading {
     colour::Lab lab;
     colour::Xyz xyz;
-    std::vector<double> spectrum; ///< As many values as the instrument's axis has.
+    std::vector<double> spectrum; ///< As many values as the instrument's spectral axis.
 };
 
 class Instrument {
@@ -23,11 +23,11 @@ class Instrument {
     Instrument(const Instrument&) = delete;
     Instrument& operator=(const Instrument&) = delete;
 
-    /// Fills in who measures and under which conditions, and the axis of the spectra, if there are
-    /// any. Knows nothing of patches.
+    /// Fills in the instrument, its conditions, and the axis of the spectra, if any, but no
+    /// patches.
     virtual void describe(colour::DataSet& measurement) const = 0;
 
-    /// Measures a patch of the chart, each once and in their order. May throw Failure.
+    /// Measures a patch of the chart. Called once for each patch, in order. May throw Failure.
     virtual Reading measure(std::size_t patch) = 0;
 };
 

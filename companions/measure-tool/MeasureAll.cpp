@@ -15,11 +15,11 @@ namespace {
 
 [[noreturn]] void crash() {
     const rlimit none{0, 0};
-    setrlimit(RLIMIT_CORE, &none); // it is no fault that anybody wants to look into
+    setrlimit(RLIMIT_CORE, &none); // an intended crash needs no core file
     std::abort();
 }
 
-/// What goes wrong in front of a patch.
+/// Performs the mishap before a patch is measured.
 void meet(Mishap mishap, std::size_t patch) {
     switch (mishap) {
     case Mishap::None:
@@ -27,10 +27,10 @@ void meet(Mishap mishap, std::size_t patch) {
     case Mishap::Fail:
         throw Failure(Status::InstrumentFailed, "the instrument failed at patch " +
                                                     std::to_string(patch + 1) +
-                                                    ", as the settings want it");
+                                                    ", as the settings request");
     case Mishap::Cancel:
         throw Failure(Status::Cancelled, "cancelled at patch " + std::to_string(patch + 1) +
-                                             ", as the settings want it");
+                                             ", as the settings request");
     case Mishap::Hang:
         while (true) {
             pauseFor(std::chrono::hours(1));

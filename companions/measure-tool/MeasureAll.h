@@ -9,7 +9,7 @@
 
 namespace measuretool {
 
-/// Measures all patches of a chart, at the pace and with the mishap that the settings want. Throws
+/// Measures all patches of a chart, with the delay and the mishap that the settings specify. Throws
 /// Failure: InstrumentFailed, Cancelled, and what the instrument throws.
 colour::DataSet measureAll(const colour::DataSet& chart, Instrument& instrument,
                            const Settings& settings, Progress& progress);

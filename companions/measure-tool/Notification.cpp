@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Desktop Notifications Specification 1.2.
+// Implements Desktop Notifications Specification 1.2.
 #include "companions/measure-tool/Notification.h"
 
 #include <chrono>
@@ -22,7 +22,7 @@ constexpr std::chrono::seconds patience{2};
 constexpr const char* service = "org.freedesktop.Notifications";
 constexpr const char* object = "/org/freedesktop/Notifications";
 
-/// Stays on the screen until somebody sees to it: the job waits for this person.
+/// Stays on the screen until dismissed: the job waits for this person.
 constexpr int critical = 2;
 
 using Bus = std::unique_ptr<sd_bus, decltype(&sd_bus_flush_close_unref)>;
@@ -50,7 +50,7 @@ Message call(const Bus& bus, const char* method, const char* types, Arguments...
     return {reply, &sd_bus_message_unref};
 }
 
-/// True if the desktop reads the text as mark-up.
+/// True if the desktop interprets markup in the text.
 bool readsMarkUp(const Bus& bus) {
     const Message reply = call(bus, "GetCapabilities", "");
     char** names = nullptr;
@@ -74,11 +74,11 @@ std::string escaped(const std::string& text) {
     return result;
 }
 
-/// The number of the notification, or 0 if the desktop did not show it.
+/// The notification's id, or 0 if the desktop did not show it.
 std::uint32_t show(std::uint32_t replaced, const std::string& title, const std::string& text) {
     const Bus bus = openBus();
     const std::string body = readsMarkUp(bus) ? escaped(text) : text;
-    // No actions; it never expires by itself.
+    // No actions, and no expiry.
     const Message reply = call(bus, "Notify", "susssasa{sv}i", "NerovaMeasure", replaced, "",
                                title.c_str(), body.c_str(), 0, 1, "urgency", "y", critical, 0);
     std::uint32_t number = 0;
@@ -99,7 +99,7 @@ Notification::~Notification() {
             return call(openBus(), "CloseNotification", "u", number) != nullptr;
         });
     } catch (const std::exception&) {
-        // Cancelled once more, or out of threads: it stays on the screen.
+        // Cancelled again, or no thread available: the notification stays on the screen.
     }
 }
 
@@ -112,7 +112,7 @@ void Notification::show(const std::string& title, std::initializer_list<std::str
     for (const std::string& line : lines) {
         text += (text.empty() ? "" : "\n") + printable(line);
     }
-    // The bus itself may be slow to answer, which the limit of a call does not cover.
+    // The bus itself may be slow to answer; the limit of a call does not cover that.
     const auto number = resultBefore(Clock::now() + patience,
                                      [replaced = m_number, title = printable(title), text] {
                                          return measuretool::show(replaced, title, text);

@@ -8,24 +8,24 @@
 
 namespace measuretool {
 
-/// Shown by whatever serves org.freedesktop.Notifications on the session bus; there is none without
-/// DBUS_SESSION_BUS_ADDRESS. A desktop that fails or does not answer within two seconds is not
-/// asked again, and nobody learns of it: the notification is an offer beside the terminal.
+/// Shown by the service org.freedesktop.Notifications on the session bus; without
+/// DBUS_SESSION_BUS_ADDRESS there is none. If the desktop fails or does not answer within two
+/// seconds, it is not asked again, and no error is reported: the notification only supplements the
+/// terminal.
 ///
-/// The bus is spoken to with sd-bus. Its library is part of every Debian installation, and unlike a
-/// program that shows notifications it need not be looked for or watched.
+/// Uses sd-bus, which every Debian installation has, instead of a program that has to be found.
 class Notification {
   public:
     Notification() = default;
-    ~Notification(); ///< Takes the notification away.
+    ~Notification(); ///< Closes the notification.
     Notification(const Notification&) = delete;
     Notification& operator=(const Notification&) = delete;
 
-    /// Shows some lines in place of those before. Throws Failure (Cancelled).
+    /// Shows some lines, replacing the previous ones. Throws Failure (Cancelled).
     void show(const std::string& title, std::initializer_list<std::string> lines);
 
   private:
-    std::uint32_t m_number = 0; ///< As the desktop counts them; 0 if none is shown.
+    std::uint32_t m_number = 0; ///< Assigned by the desktop; 0 if none is shown.
     bool m_failed = false;
 };
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The person who is to measure and export.
+// The person who measures and exports.
 #pragma once
 
 #include <string>
@@ -11,23 +11,23 @@
 
 namespace measuretool {
 
-/// Tells the operator what to do, on the terminal and the desktop, and keeps it in the log.
+/// Gives the operator instructions on the terminal and the desktop, and logs them.
 class Operator {
   public:
-    /// `strip` is what people call the strip; may be empty. The others outlive this object.
+    /// `strip` is its name for people, or empty. The others must outlive this object.
     Operator(const std::string& strip, Progress& progress, const RunLog& log);
 
-    /// It is the operator's turn: the export must be at `path` before `end`. The notification goes
-    /// with this object.
+    /// Asks for an export, which must be at `path` before `end`. The notification disappears with
+    /// this object.
     void askForExport(const std::string& path, Clock::time_point end);
 
-    /// Shows the time that is left.
+    /// Shows the remaining time.
     void showTime();
 
-    /// An export was refused, and another one is waited for.
+    /// Reports that an export was refused and asks for another one.
     void refuse(const std::string& problem);
 
-    /// Something worth knowing about an export that was accepted.
+    /// Reports a remark on an accepted export.
     void remark(const std::string& sentence);
 
   private:
@@ -38,9 +38,9 @@ class Operator {
     const RunLog& m_log;
     Notification m_notification;
     std::string m_path;
-    std::string m_shown; ///< The time on the terminal.
+    std::string m_shown; ///< The time shown on the terminal.
     Clock::time_point m_end;
-    std::string m_until; ///< The same on the operator's clock.
+    std::string m_until; ///< The end of the wait as clock time.
 };
 
 } // namespace measuretool

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The options file: a line with a name, a line with its value, and so on. Nothing is escaped; the
-// value of -pwd alone stands in quotes.
+// The options file: a line with a name, a line with its value, and so on. Nothing is escaped; only
+// the value of -pwd is quoted.
 //
 //     -apnm
 //     Nerova Verify
@@ -41,9 +41,9 @@ std::map<std::string, std::string> pairsOf(const std::string& path) {
     std::map<std::string, std::string> pairs;
     for (std::string_view rest = bytes; !rest.empty();) {
         const std::string name = takeLine(rest);
-        // A value with a line break in it shifts all that follows.
+        // A value with a line break shifts all following lines.
         if (name.size() < 2 || name.front() != '-') {
-            refuse("\"" + name + "\" for an option's name");
+            refuse("\"" + name + "\" as an option name");
         }
         if (rest.empty()) {
             refuse("no value for " + name);
@@ -71,7 +71,7 @@ Options readOptions(const std::string& path) {
         return value;
     };
     if (needed("-m") != "measure") {
-        throw Failure(Status::BadOptions, path + " asks for something else than to measure");
+        throw Failure(Status::BadOptions, path + " requests something other than measuring");
     }
     return {needed("-patch"), needed("-o"), valueOf("-patchname"), valueOf("-i")};
 }

@@ -1,21 +1,21 @@
 // SPDX-License-Identifier: Apache-2.0
-// What this run is to do.
+// The options of this run.
 #pragma once
 
 #include <string>
 
 namespace measuretool {
 
-/// The options that matter here; the others are read over. Paths are bytes.
+/// The relevant options; others are ignored. Paths are bytes.
 struct Options {
     std::string definition; ///< -patch: the definition of the patches.
-    std::string output;     ///< -o: where the measurement goes.
-    std::string title;      ///< -patchname: what people call the strip; may be empty.
+    std::string output;     ///< -o: path of the measurement.
+    std::string title;      ///< -patchname: the strip's name for people; may be empty.
     std::string instrument; ///< -i: the instrument's name; may be empty.
 };
 
-/// Reads an options file. Throws Failure (BadOptions) where it can't be read, where its lines are
-/// no pairs, or where -m is not "measure" or a path is missing.
+/// Reads an options file. Throws Failure (BadOptions) if it can't be read, if its lines are not
+/// pairs, if -m is not "measure", or if a path is missing.
 Options readOptions(const std::string& path);
 
 } // namespace measuretool

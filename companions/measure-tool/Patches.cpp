@@ -20,24 +20,23 @@ using Rows = std::vector<std::size_t>;
 
 constexpr std::size_t none = ~std::size_t{0};
 
-/// Other software exports whole percents, or what 0 to 255 makes of them.
+/// Other software exports integer percents, or percents converted from 0 to 255.
 constexpr double rounding = 0.51; ///< In percent.
 
-/// With more unpaired patches than this, nearly all are wrong, and it does not matter which one a
-/// message names.
+/// With more unpaired patches than this, nearly all are wrong, and a message can name any of them.
 constexpr std::size_t mostCompared = 2000;
 
 [[noreturn]] void refuse(const std::string& text) {
     throw Failure(Status::OtherPatches, text);
 }
 
-/// Pairs equal keys, the first of the chart with the first of the measurement. A patch without a
-/// counterpart gets no row.
+/// Pairs equal keys: the first of the chart with the first of the measurement, and so on. A patch
+/// without a counterpart gets no row.
 template<class Key>
 Rows pairByKeys(const std::vector<Key>& chart, const std::vector<Key>& measured) {
     std::map<Key, Rows> rowsOf;
     for (std::size_t row = measured.size(); row-- > 0;) {
-        rowsOf[measured[row]].push_back(row); // the first is at the back
+        rowsOf[measured[row]].push_back(row); // the first row is at the back
     }
     Rows rows;
     for (const Key& key : chart) {
@@ -82,7 +81,7 @@ std::string nameOf(const DataSet& set, std::size_t patch) {
 
 // Device values ------------------------------------------------------------------------------
 
-/// Channels that a set lacks are 0: a process chart goes with one that has unused spot channels.
+/// Missing channels count as 0, so a process chart matches one with unused spot channels.
 double deviceValue(const DataSet& set, std::size_t patch, std::size_t channel) {
     const std::size_t channels = set.channels.size();
     return channel < channels ? set.device[patch * channels + channel] : 0;
@@ -102,7 +101,7 @@ bool alike(const DataSet& chart, std::size_t patch, const DataSet& measured, std
     return true;
 }
 
-/// Device values in hundredths of a percent, as sets of the same origin state them.
+/// Device values in hundredths of a percent, the precision of sets with the same origin.
 std::vector<std::vector<long>> deviceKeys(const DataSet& set, std::size_t channels) {
     std::vector<std::vector<long>> keys(set.patchCount, std::vector<long>(channels));
     for (std::size_t patch = 0; patch < set.patchCount; ++patch) {
@@ -120,7 +119,7 @@ bool comparableDevices(const DataSet& chart, const DataSet& measured) {
     return chart.deviceSpace != colour::DeviceSpace::Other || chart.channels == measured.channels;
 }
 
-/// Gives patches without a row one that is alike.
+/// Assigns similar rows to patches without a row.
 void pairAlike(const DataSet& chart, const DataSet& measured, Rows& rows) {
     Rows left = unpaired(rows, measured.patchCount);
     if (left.size() > mostCompared) {
@@ -140,7 +139,7 @@ void pairAlike(const DataSet& chart, const DataSet& measured, Rows& rows) {
     }
 }
 
-/// Names what is wrong: in the strip's order if the rows fit better that way, else in any order.
+/// Reports the problem: for the strip's order if that fits better, otherwise for any order.
 [[noreturn]] void refuseDevices(const DataSet& chart, const DataSet& measured, Rows rows) {
     std::size_t inOrder = 0;
     std::size_t differing = none;
@@ -164,7 +163,7 @@ void pairAlike(const DataSet& chart, const DataSet& measured, Rows& rows) {
     const std::size_t surplus = unpaired(rows, measured.patchCount).front();
     refuse("there is no patch " + nameOf(chart, missing) + ", which is " +
            deviceText(chart, missing) + ", and row " + std::to_string(surplus + 1) + ", which is " +
-           deviceText(measured, surplus) + ", was not asked for");
+           deviceText(measured, surplus) + ", was not requested");
 }
 
 Rows matchDevices(const DataSet& chart, const DataSet& measured) {
@@ -184,7 +183,7 @@ Rows matchDevices(const DataSet& chart, const DataSet& measured) {
 
 // Labels -------------------------------------------------------------------------------------
 
-/// "0012" becomes "12"; other labels stay.
+/// "0012" becomes "12"; other labels are unchanged.
 Labels withoutZeros(Labels labels) {
     for (std::string& label : labels) {
         if (label.find_first_not_of("0123456789") == label.npos) {
@@ -215,7 +214,7 @@ Rows pairLabels(const Labels& wanted, const Labels& present) {
 }
 
 Rows matchLabels(const DataSet& chart, const DataSet& measured, bool bareIds) {
-    // An export may call a name what the strip calls an id.
+    // An export may use the strip's ids as names.
     const std::pair<const Labels*, const Labels*> ways[] = {{&chart.ids, &measured.ids},
                                                             {&chart.names, &measured.names},
                                                             {&chart.ids, &measured.names},
@@ -240,11 +239,11 @@ Rows matchLabels(const DataSet& chart, const DataSet& measured, bool bareIds) {
     }
     if (onlyCounted) {
         refuse("only the ids 1 to " + std::to_string(chart.patchCount) +
-               " identify the patches, and every strip of as many patches has these; the setting "
+               " identify the patches, and every strip of this size has these; the setting "
                "match = ids accepts them");
     }
     if (bestLabels == nullptr) {
-        refuse("neither device values nor ids tell which patches were measured");
+        refuse("neither device values nor ids identify the measured patches");
     }
     refuse("there is no patch " + (*bestLabels)[firstWithout(best)]);
 }
@@ -253,8 +252,8 @@ Rows matchLabels(const DataSet& chart, const DataSet& measured, bool bareIds) {
 
 std::vector<std::size_t> matchPatches(const DataSet& chart, const DataSet& measured, bool bareIds) {
     if (chart.patchCount != measured.patchCount) {
-        refuse("there are " + std::to_string(measured.patchCount) + " patches where " +
-               std::to_string(chart.patchCount) + " were asked for");
+        refuse("there are " + std::to_string(measured.patchCount) + " patches, but " +
+               std::to_string(chart.patchCount) + " were requested");
     }
     if (chart.hasDevice() && measured.hasDevice() && !comparableDevices(chart, measured)) {
         refuse("the device values are of other colorants");

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Which measured patch is which of the patches asked for.
+// Identifies which measured patch belongs to which requested patch.
 #pragma once
 
 #include <cstddef>
@@ -10,17 +10,16 @@
 
 namespace measuretool {
 
-/// For each patch of the chart, the row of `measured` that is the same patch. Throws Failure
-/// (OtherPatches) unless both are the same patches, all of them and no others. The failure names a
-/// patch that is missing, and the row that is there in its place or belongs to no patch.
+/// For each patch of the chart, returns the row of `measured` with the same patch. Throws Failure
+/// (OtherPatches) unless both contain the same patches, all of them and no others. The failure
+/// names a missing patch, and the row that replaces it or belongs to no patch.
 ///
-/// If both sides have device values, these decide: row by row in the order at hand, with half a
-/// percent for rounding, or else in any order to a hundredth of a percent. If one side has none,
-/// ids or names decide; numbers may have zeros in front. Of patches that are alike, the first goes
-/// with the first.
+/// If both sides have device values, these decide: row by row in the present order, with half a
+/// percent for rounding, or else in any order, to a hundredth of a percent. If one side has none,
+/// ids or names decide; numbers may have leading zeros. Identical patches are paired in order.
 ///
-/// Ids that are the numbers 1 to N fit every strip of N patches. Alone they prove the right strip
-/// only with `bareIds`.
+/// Ids that are the numbers 1 to N fit every strip of N patches. With `bareIds`, they are
+/// sufficient to identify the strip.
 std::vector<std::size_t> matchPatches(const colour::DataSet& chart, const colour::DataSet& measured,
                                       bool bareIds);
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a person at a terminal sees of a measurement.
+// Shows a measurement's progress to a person at a terminal.
 #pragma once
 
 #include <chrono>
@@ -11,30 +11,30 @@
 
 namespace measuretool {
 
-/// One line that changes from patch to patch; nothing at all where nobody looks. Standard error, or
-/// where that is no terminal, standard output.
+/// One line that changes with each patch. Uses standard error, or standard output if that is not a
+/// terminal. Shows nothing if neither is one.
 class Progress {
   public:
     Progress();
-    ~Progress(); ///< Leaves the line as it is and goes to the next.
+    ~Progress(); ///< Keeps the line and moves to the next.
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;
 
-    /// The measurement of a chart begins: its size and its first patch.
+    /// Starts the measurement of a chart: shows its size and its first patch.
     void begin(const colour::DataSet& chart);
 
-    /// The patches of the measurement so far, of `total`. Faster than an eye, some are passed over.
+    /// Shows the patches measured so far, of `total`. Skips some if they change too fast.
     void show(const colour::DataSet& measurement, std::size_t done, std::size_t total);
 
-    /// A sentence on a line of its own.
+    /// Shows a sentence on its own line.
     void say(const std::string& sentence);
 
-    /// A text in the line that changes.
+    /// Replaces the text of the changing line.
     void line(const std::string& text);
 
   private:
     std::FILE* m_terminal = nullptr;
-    bool m_open = false; ///< The cursor stands in a line.
+    bool m_open = false; ///< The cursor is in an unfinished line.
     std::chrono::steady_clock::time_point m_next{};
 };
 

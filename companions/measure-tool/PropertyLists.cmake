@@ -1,5 +1,5 @@
 # SPDX-License-Identifier: Apache-2.0
-# Run at installation: writes the property lists, whose paths are absolute and hold the root.
+# Runs at installation: writes the property lists with absolute paths that contain the root.
 get_filename_component(_root "${CMAKE_INSTALL_PREFIX}" ABSOLUTE)
 if(_root MATCHES "[\"'$`\\\\]")
   message(FATAL_ERROR "${_root} can't be a system root: it has a quote, $, ` or backslash in it")

@@ -13,7 +13,7 @@ namespace {
 constexpr int mostSteps = 200;
 constexpr double shortestStep = 1e-6;
 constexpr double exactEnough = 1e-12;
-constexpr double darkest = 1e-6; ///< XYZ, of 100, below which a patch is black.
+constexpr double darkest = 1e-6; ///< Black below this XYZ value, on a scale of 100.
 
 /// Solves a linear system in place by Gaussian elimination; false if it is singular.
 template<class Matrix, class Vector>
@@ -68,8 +68,8 @@ ReflectanceMaker::ReflectanceMaker() {
 }
 
 /// The unknowns are z, one for each wavelength, with reflectance = most (tanh z + 1) / 2, and three
-/// multipliers. What has to vanish is the derivative of the sum of squared steps of z plus the
-/// multipliers times the errors of X, Y and Z, and these errors. Returns the largest of it.
+/// multipliers. The residuals are the derivative of the sum of squared steps of z plus the
+/// multipliers times the errors of X, Y and Z, and these errors. Returns the largest residual.
 double ReflectanceMaker::residual(const std::array<double, 3>& target, double most,
                                   const Vector& at, Vector& value, Matrix* slope) const {
     value.fill(0);
@@ -119,11 +119,11 @@ double ReflectanceMaker::residual(const std::array<double, 3>& target, double mo
     return largest;
 }
 
-/// Newton's method. Saturated and dark colours lie where a whole step leads astray, so that a step
-/// is halved until it comes nearer.
+/// Newton's method. A full step can diverge for saturated and dark colours, so it is halved until
+/// it improves the result.
 bool ReflectanceMaker::solve(const std::array<double, 3>& target, double most,
                              Vector& solution) const {
-    // A flat spectrum of the right luminance is where to start from.
+    // Starts from a flat spectrum of the right luminance.
     const double grey = std::clamp(target[1] / most, 1e-6, 1 - 1e-6);
     solution.fill(0);
     std::fill_n(solution.begin(), length, std::atanh(2 * grey - 1));
@@ -157,7 +157,7 @@ bool ReflectanceMaker::solve(const std::array<double, 3>& target, double most,
 bool ReflectanceMaker::make(const colour::Xyz& xyz, std::vector<double>& reflectance) const {
     const std::array<double, 3> target{xyz.X / 100, xyz.Y / 100, xyz.Z / 100};
     if (std::max({std::abs(xyz.X), std::abs(xyz.Y), std::abs(xyz.Z)}) < darkest) {
-        reflectance.assign(length, 0); // where tanh never comes to
+        reflectance.assign(length, 0); // a value that tanh never reaches
         return true;
     }
     Vector solution;

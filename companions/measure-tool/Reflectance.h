@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// From XYZ back to a reflectance that has it.
+// Computes a reflectance for given XYZ values.
 #pragma once
 
 #include <array>
@@ -9,23 +9,24 @@
 
 namespace measuretool {
 
-/// Countless reflectances have the same XYZ. This one is the smoothest that stays between 0 and 1:
-/// "least hyperbolic tangent slope squared", Scott A. Burns, "Numerical methods for smoothest
-/// reflectance reconstruction", Color Research and Application 45 (2020).
+/// Many reflectances have the same XYZ. This computes the smoothest one between 0 and 1: "least
+/// hyperbolic tangent slope squared", Scott A. Burns, "Numerical methods for smoothest reflectance
+/// reconstruction", Color Research and Application 45 (2020).
 class ReflectanceMaker {
   public:
     static constexpr colour::SpectralAxis axis{380, 10, 36};
 
     ReflectanceMaker();
 
-    /// A reflectance whose XYZ under D50 for the 2 degree observer is `xyz`, in eight decimals.
-    /// Papers with brighteners may reflect more than they get, so up to 1.5 is tried where 1 does
-    /// not do. False, with the reflectance untouched, where there is none.
+    /// Computes a reflectance with this XYZ under D50 for the 2 degree observer, to eight decimals.
+    /// Papers with brighteners may reflect more light than they receive, so it tries a maximum of
+    /// up to 1.5 if 1 fails. Returns false and leaves the reflectance unchanged if there is none.
     bool make(const colour::Xyz& xyz, std::vector<double>& reflectance) const;
 
   private:
     static constexpr std::size_t length = 36;
-    static constexpr std::size_t unknowns = length + 3; ///< And a multiplier for X, Y and Z each.
+    static constexpr std::size_t unknowns =
+        length + 3; ///< Plus one multiplier each for X, Y and Z.
 
     using Vector = std::array<double, unknowns>;
     using Matrix = std::array<Vector, unknowns>;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 // 2024-05-01T12:34:56Z Waiting for /srv/exports/measurement.txt, until 2024-05-01T12:49:56Z
-// 2024-05-01T12:40:02Z Not accepted: there are 40 patches where 48 were asked for
+// 2024-05-01T12:40:02Z Not accepted: there are 40 patches, but 48 were requested
 #include "companions/measure-tool/RunLog.h"
 
 #include <algorithm>
@@ -18,7 +18,7 @@
 namespace measuretool {
 namespace {
 
-/// True if a file starts as each line of a log does, or is empty.
+/// True if a file is empty or starts like a line of a log.
 bool holdsLog(const std::string& path) {
     constexpr std::string_view form = "0000-00-00T00:00:00Z ";
     char head[form.size()];

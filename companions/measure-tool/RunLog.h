@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a run reports, kept in a file: the standard error of a program that another one starts is
-// often lost.
+// Keeps a run's reports in a file, because the standard error of a started program is often lost.
 #pragma once
 
 #include <string>
@@ -13,13 +12,13 @@ class RunLog {
   public:
     static constexpr const char* name = "NerovaMeasure.log";
 
-    /// From now on the log is the file of this name in the folder of the output, which is the
-    /// job's folder. Removes that of an earlier run. Keeps no log if the file is the output itself
-    /// or one of `inputs`, or is anything else than an earlier log: files of the job are there too.
+    /// Logs to a file of fixed name in the folder of the output, which is the job's folder. Removes
+    /// the log of an earlier run. Does not log if the file is the output or one of `inputs`, or is
+    /// not an earlier log: the folder contains files of the job too.
     void start(const std::string& output, const std::vector<std::string>& inputs);
 
-    /// Adds a line with the time. Does nothing before start(). A log that can't be written is not
-    /// a failure of the run.
+    /// Adds a line with the time. Does nothing before start(). A failure to write the log does not
+    /// fail the run.
     void add(std::string_view sentence) const;
 
   private:

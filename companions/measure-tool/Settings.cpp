@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The settings file: UTF-8 lines of a name and a value.
+// The settings file: UTF-8 text, one name and value per line.
 //
 //     # A printer that drifts towards yellow
 //     instrument = virtual
@@ -24,12 +24,12 @@ namespace measuretool {
 namespace {
 
 constexpr std::size_t largestFile = 1 << 20;
-constexpr double largestError = 50; ///< In units of CIELAB, of size and bias alike.
+constexpr double largestError = 50; ///< In CIELAB units, for both error and bias.
 constexpr int longestDelay = 60'000;
 constexpr int longestWait = 86'400;
 constexpr std::size_t lastPatch = 10'000'000;
 
-/// Some editors put it before UTF-8.
+/// Some editors write it at the start of UTF-8 files.
 constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
 
 std::string_view trimmed(std::string_view text) {
@@ -43,7 +43,7 @@ template<class Number>
 bool readNumber(std::string_view text, Number least, Number most, Number& number) {
     Number value{};
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), value);
-    // In this order of comparisons not-a-number is refused too.
+    // This order of comparisons also refuses NaN.
     if (error != std::errc() || end != text.data() + text.size() ||
         !(value >= least && value <= most)) {
         return false;
@@ -148,7 +148,7 @@ const Entry* entryOf(std::string_view name) {
     return nullptr;
 }
 
-/// What is wrong with a line; empty if nothing is.
+/// Describes an error in a line. Empty if there is none.
 std::string readLine(std::string_view line, Settings& settings, std::set<const Entry*>& seen) {
     line = trimmed(line);
     if (line.empty() || line.front() == '#') {
@@ -161,14 +161,14 @@ std::string readLine(std::string_view line, Settings& settings, std::set<const E
     const std::string name(trimmed(line.substr(0, equals)));
     const Entry* const entry = entryOf(name);
     if (entry == nullptr) {
-        return "names \"" + name + "\", which is no setting";
+        return "names \"" + name + "\", which is not a setting";
     }
     if (!seen.insert(entry).second) {
-        return "has " + name + " a second time";
+        return "repeats " + name;
     }
     return entry->read(trimmed(line.substr(equals + 1)), settings)
                ? std::string()
-               : "wants " + std::string(entry->expected) + " for " + name;
+               : "requires " + std::string(entry->expected) + " for " + name;
 }
 
 void checkComplete(const Settings& settings, const std::string& path) {
@@ -190,7 +190,7 @@ std::string valueOf(const char* variable) {
     return value == nullptr ? std::string() : std::string(value);
 }
 
-/// As XDG has it: a folder whose path is not absolute does not count.
+/// By the XDG specification, a relative path is ignored.
 std::string configurationFolder() {
     const std::string folder = valueOf("XDG_CONFIG_HOME");
     return folder.starts_with('/') ? folder : valueOf("HOME") + "/.config";
@@ -213,7 +213,7 @@ std::string settingsPath() {
         }
     }
     throw Failure(Status::BadSettings,
-                  "no instrument is chosen: there is no TINTGATE_MEASURE, no " + places[0] +
+                  "no instrument is selected: there is no TINTGATE_MEASURE, no " + places[0] +
                       " and no " + places[1]);
 }
 
@@ -242,7 +242,7 @@ Settings readSettings(const std::string& path) {
     const std::filesystem::path folder = std::filesystem::path(path).parent_path();
     for (std::string* name : {&settings.profile, &settings.file}) {
         if (!name->empty()) {
-            *name = folder / *name; // an absolute path stays itself
+            *name = folder / *name; // an absolute path stays unchanged
         }
     }
     return settings;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Which instrument measures, and how: the settings file.
+// The settings file: the instrument and its parameters.
 #pragma once
 
 #include <chrono>
@@ -12,7 +12,7 @@
 
 namespace measuretool {
 
-/// What goes wrong on purpose, for tests and training.
+/// Deliberate failures, for tests and training.
 enum class Mishap { None, Fail, Cancel, Hang, Crash };
 
 struct Settings {
@@ -20,33 +20,33 @@ struct Settings {
     Instrument instrument = Instrument::None;
 
     // The virtual instrument.
-    std::string profile;    ///< Of the printing condition.
-    double error = 0;       ///< Mean CIELAB difference (CIE76) that the random error makes.
-    colour::Lab bias;       ///< What every patch is off by.
+    std::string profile;    ///< Profile of the printing condition.
+    double error = 0;       ///< Mean CIELAB difference (CIE76) caused by the random error.
+    colour::Lab bias;       ///< Added to every patch.
     std::uint64_t seed = 1; ///< The same seed gives the same errors.
     bool spectra = false;   ///< Whether spectra are measured too.
 
     // The exported measurement.
     std::string file;
-    std::chrono::seconds wait{0}; ///< For a new file; 0: the one that is there is taken.
-    bool bareIds = false; ///< Whether ids that are the numbers 1 to N prove the right strip.
+    std::chrono::seconds wait{0}; ///< Time to wait for a new file; 0 takes the existing one.
+    bool bareIds = false;         ///< Whether ids 1 to N are enough to identify the strip.
 
-    // Both.
-    std::chrono::milliseconds delay{0}; ///< Time that a patch takes.
+    // Both instruments.
+    std::chrono::milliseconds delay{0}; ///< Time per patch.
     Mishap mishap = Mishap::None;
-    std::optional<std::size_t> mishapAt; ///< Number of the patch, from 1; else the middle one.
+    std::optional<std::size_t> mishapAt; ///< Number of the patch, from 1; if empty, the middle one.
 };
 
-/// The settings file of this run: what TINTGATE_MEASURE names, else
-/// Library/Preferences/NerovaMeasure.conf below the system root, else tintgate/measure.conf in the
+/// The settings file of this run, the first of: the value of TINTGATE_MEASURE;
+/// Library/Preferences/NerovaMeasure.conf below the system root; tintgate/measure.conf in the
 /// user's configuration folder. Throws Failure (BadSettings) if there is none.
 ///
-/// There are no default settings: a file without an instrument must not lead to values that nobody
+/// There are no default settings: a file without an instrument must not produce values that nobody
 /// has measured.
 std::string settingsPath();
 
-/// Reads a settings file; the paths in it are made relative to its folder. Throws Failure
-/// (BadSettings), with the line, for whatever is not as described in docs/measuring.md.
+/// Reads a settings file and resolves its relative paths against its folder. Throws Failure
+/// (BadSettings), with the line, for anything not described in docs/measuring.md.
 Settings readSettings(const std::string& path);
 
 } // namespace measuretool

@@ -1,6 +1,6 @@
 # SPDX-License-Identifier: Apache-2.0
-# One folder with a whole suite: `cmake --install BUILD --component companions --prefix ROOT` makes
-# a system root, which TINTGATE_ROOT then names.
+# Installs a whole suite in one folder: `cmake --install BUILD --component companions --prefix ROOT`
+# creates a system root, to be named by TINTGATE_ROOT.
 #
 #   ROOT/Applications/Nerova/NerovaMeasure.app/Contents/MacOS/NerovaMeasure
 #   ROOT/Applications/Nerova/Nerova Verify.app/...          the viewer, by its own list

@@ -15,12 +15,12 @@
 namespace measuretool {
 namespace {
 
-/// Six decimals: more than a print can mean, and short enough to read.
+/// Six decimals: more precise than any print, and still readable.
 double sixDecimals(double value) {
-    return std::round(value * 1e6) / 1e6 + 0.0; // no zero with a sign
+    return std::round(value * 1e6) / 1e6 + 0.0; // avoids negative zero
 }
 
-/// An error can't make a patch darker than black.
+/// A patch with an error can't be darker than black.
 colour::Lab possible(const colour::Lab& lab) {
     return lab.L > 0 ? lab : colour::Lab{};
 }
@@ -33,12 +33,12 @@ colour::Profile openProfile(const std::string& path) {
         return loaded;
     });
     if (!file.profile) {
-        throw Failure(Status::BadProfile, path + " is no ICC profile");
+        throw Failure(Status::BadProfile, path + " is not an ICC profile");
     }
     return std::move(*file.profile);
 }
 
-/// Spot inks are in no profile for CMYK; where none is printed they don't matter.
+/// A CMYK profile has no spot inks; patches without spot ink can still be printed.
 void checkPrintable(const colour::DataSet& chart) {
     const std::size_t channels = chart.channels.size();
     bool printable = chart.hasCmyk() || chart.deviceSpace == colour::DeviceSpace::Rgb;
@@ -47,18 +47,18 @@ void checkPrintable(const colour::DataSet& chart) {
     }
     if (!printable) {
         throw Failure(Status::NotMeasurable,
-                      "the virtual instrument prints CMYK and RGB, and the definition has patches "
+                      "the virtual instrument prints CMYK and RGB, but the definition has patches "
                       "of other colorants");
     }
 }
 
-/// Uniform in 0 to 1, both excluded. The distributions of the standard library differ from one to
-/// the next; the engine does not.
+/// Uniform in 0 to 1, both excluded. The standard library's distributions differ between
+/// implementations; its engines do not.
 double uniform(std::mt19937_64& engine) {
     return (static_cast<double>(engine() >> 12) + 0.5) * 0x1p-52;
 }
 
-/// The mean length of a vector of three normal deviates of deviation 1: Maxwell's distribution.
+/// The mean length of a vector of three normal deviates with deviation 1 (Maxwell's distribution).
 const double meanLength = std::sqrt(8 / std::numbers::pi);
 
 } // namespace
@@ -72,7 +72,7 @@ VirtualInstrument::VirtualInstrument(const Settings& settings, const std::string
 }
 
 void VirtualInstrument::describe(colour::DataSet& measurement) const {
-    // Nobody is to take this for a measurement.
+    // Nobody must mistake this for a measurement.
     measurement.originator = "NerovaMeasure, virtual instrument";
     measurement.instrumentation =
         m_name.empty() ? "Virtual instrument" : "Virtual instrument in place of " + m_name;
@@ -82,13 +82,13 @@ void VirtualInstrument::describe(colour::DataSet& measurement) const {
     }
 }
 
-/// Lab of a patch by the profile.
+/// The profile's Lab of a patch.
 colour::Lab VirtualInstrument::print(std::size_t patch) const {
     const double* const values = &m_chart.device[patch * m_chart.channels.size()];
     std::array<double, 4> inks{};
     if (m_chart.hasCmyk()) {
         std::copy(values, values + 4, inks.begin());
-    } else { // Each ink takes away what its colour lacks, and there is no black: white stays paper.
+    } else { // Each ink absorbs its complement; there is no black, and white stays paper.
         std::transform(values, values + 3, inks.begin(), [](double value) { return 100 - value; });
     }
     colour::Lab lab;
@@ -96,7 +96,7 @@ colour::Lab VirtualInstrument::print(std::size_t patch) const {
     return lab;
 }
 
-/// Normal deviates after Box and Muller, in pairs, of which the fourth is left over.
+/// Normal deviates by Box and Muller, in pairs. The fourth deviate is not used.
 colour::Lab VirtualInstrument::randomError() {
     std::array<double, 4> deviates{};
     for (std::size_t i = 0; i < deviates.size(); i += 2) {
@@ -121,7 +121,7 @@ Reading VirtualInstrument::measure(std::size_t patch) {
     if (m_spectra && !m_reflectances.make(xyz, reading.spectrum)) {
         throw Failure(Status::NotMeasurable, "no spectrum has the colour of patch " +
                                                  std::to_string(patch + 1) +
-                                                 "; a smaller error or bias helps");
+                                                 "; try a smaller error or bias");
     }
     return reading;
 }

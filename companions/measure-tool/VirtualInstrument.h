@@ -12,13 +12,12 @@
 
 namespace measuretool {
 
-/// Prints what the profile says, absolute colorimetric, and adds Settings::bias and an error to
-/// each patch. Errors follow a fixed sequence, a row after the other, so that equal settings
-/// measure equal values.
+/// Prints the profile's colours, absolute colorimetric, and adds Settings::bias and an error to
+/// each patch. Errors follow a fixed sequence, row by row, so equal settings measure equal values.
 class VirtualInstrument : public Instrument {
   public:
-    /// `name` is that of the instrument that it stands for; may be empty. The chart outlives it.
-    /// Throws Failure: BadProfile, or NotMeasurable for patches that no CMYK press prints.
+    /// `name` is that of the replaced instrument, or empty. The chart must outlive this object.
+    /// Throws Failure: BadProfile, or NotMeasurable for patches that a CMYK press can't print.
     VirtualInstrument(const Settings& settings, const std::string& name,
                       const colour::DataSet& chart);
 
@@ -30,9 +29,9 @@ class VirtualInstrument : public Instrument {
     colour::Lab randomError();
 
     const colour::DataSet& m_chart;
-    const std::string m_path; ///< Of the profile.
+    const std::string m_path; ///< Path of the profile.
     const std::string m_name;
-    const double m_deviation; ///< Of an error, for each of L*, a* and b*.
+    const double m_deviation; ///< Standard deviation of the error of L*, a* and b* each.
     const colour::Lab m_bias;
     const bool m_spectra;
     colour::Profile m_profile;

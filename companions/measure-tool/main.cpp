@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// Measures the patches of a definition. Below the system root this program stands at
-// "/Applications/Nerova/NerovaMeasure.app/Contents/MacOS/NerovaMeasure", and a property list of the
-// Library leads the tool to it.
+// Measures the patches of a definition. This program is
+// "/Applications/Nerova/NerovaMeasure.app/Contents/MacOS/NerovaMeasure" below the system root. A
+// property list in Library refers the tool to it.
 #include <sys/stat.h>
 #include <unistd.h>
 
@@ -44,14 +44,14 @@ handing over what an instrument's own software has exported.
 
   -m          measure
   -patch      path of the definition
-  -o          path of the measurement, which appears whole or not at all
-  -patchname  what people call the strip
+  -o          path of the measurement, which appears complete or not at all
+  -patchname  the strip's name for people
   -i          the instrument's name
-Other options are read over. On a terminal the progress is shown. What is reported is
-also kept in NerovaMeasure.log, in the folder of the measurement.
+Other options are ignored. On a terminal, the progress is shown. All messages are
+also written to NerovaMeasure.log, in the folder of the measurement.
 
-Which instrument measures stands in the settings file: TINTGATE_MEASURE names it, else it is
-Library/Preferences/NerovaMeasure.conf below TINTGATE_ROOT, else ~/.config/tintgate/measure.conf.
+The settings file selects the instrument. It is the first of: the file that TINTGATE_MEASURE names,
+Library/Preferences/NerovaMeasure.conf below TINTGATE_ROOT, ~/.config/tintgate/measure.conf.
 
   instrument = virtual      profile = FILE.icc, error = SIZE, bias = L a b, seed = NUMBER,
                             spectra = yes
@@ -71,7 +71,7 @@ int fail(Status status, const std::string& words, const RunLog& log) {
     return end(status);
 }
 
-/// True if both names lead to one file, or will once it is there.
+/// True if both names lead to one file, even if it does not exist yet.
 bool isSameFile(const std::string& left, const std::string& right) {
     namespace fs = std::filesystem;
     std::error_code ignored;
@@ -83,8 +83,7 @@ bool isSameFile(const std::string& left, const std::string& right) {
     return !failed && first == fs::weakly_canonical(right, failed) && !failed;
 }
 
-/// Finds out before the first patch what would stop the result at the last one, and protects the
-/// files that are read.
+/// Checks before the first patch whether the result can be written, and protects the input files.
 void checkOutput(const std::string& output, const std::vector<std::string>& inputs) {
     for (const std::string& input : inputs) {
         if (!input.empty() && isSameFile(input, output)) {
@@ -93,12 +92,12 @@ void checkOutput(const std::string& output, const std::vector<std::string>& inpu
     }
     struct stat status {};
     if (lstat(output.c_str(), &status) == 0 && !S_ISREG(status.st_mode)) {
-        throw Failure(Status::NotWritten, output + " is no ordinary file");
+        throw Failure(Status::NotWritten, output + " is not a regular file");
     }
     const std::filesystem::path parent = std::filesystem::path(output).parent_path();
     const std::string folder = parent.empty() ? "./" : parent.string();
     if (access(folder.c_str(), W_OK | X_OK) != 0) {
-        throw Failure(Status::NotWritten, "nothing can be written in " + folder);
+        throw Failure(Status::NotWritten, "can't write in " + folder);
     }
 }
 
@@ -110,7 +109,7 @@ std::unique_ptr<Instrument> connect(const Settings& settings, const Options& opt
     return std::make_unique<ExportedMeasurement>(settings, definition, person);
 }
 
-/// Each step that reads can be cancelled, since each may meet a share whose server is gone.
+/// Each step that reads can be cancelled, because a share's server may be lost.
 void measure(const std::string& optionsFile, RunLog& log) {
     listenForCancel();
     const Options options = unlessCancelled([optionsFile] { return readOptions(optionsFile); });
@@ -149,7 +148,7 @@ void measure(const std::string& optionsFile, RunLog& log) {
 
 int run(const std::vector<std::string_view>& words, RunLog& log) {
     if (words.size() != 1) {
-        return fail(Status::BadCommand, "not understood; --help tells how it is called", log);
+        return fail(Status::BadCommand, "invalid arguments; see --help", log);
     }
     if (words[0] == "--help" || words[0] == "-h") {
         return end(std::fputs((std::string(help) + nerovaMeasureStatusHelp).c_str(), stdout) < 0
@@ -170,7 +169,7 @@ int runAndReport(const std::vector<std::string_view>& words) {
         return fail(Status::OutOfMemory, "out of memory", log);
     } catch (const std::length_error&) {
         return fail(Status::OutOfMemory, "out of memory", log);
-    } catch (const std::system_error& error) { // neither a thread nor a descriptor is left
+    } catch (const std::system_error& error) { // out of threads or descriptors
         return fail(Status::OutOfMemory, error.what(), log);
     }
 }

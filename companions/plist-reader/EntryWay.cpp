@@ -12,7 +12,7 @@ void skipBlanks(std::string_view& text) {
     text.remove_prefix(std::min(text.find_first_not_of(" \t"), text.size()));
 }
 
-// Takes a name from the front of the text, up to a colon outside of quotes.
+// Takes a name from the front of the text, up to a colon outside quotes.
 std::optional<std::string> takeName(std::string_view& text) {
     char end = ':';
     if (!text.empty() && (text.front() == '"' || text.front() == '\'')) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The command of the property-list reader: "Print" and the way to an entry.
+// The command of the property-list reader: "Print" and the path of an entry.
 //
 //   Print :installed_path
 //   Print :'Nerova Hue Workbench':library_path
@@ -10,9 +10,9 @@
 #include <string>
 #include <vector>
 
-/// The names on the way to the entry that a command asks for, from the outside in; nothing if the
-/// command is not of this form.
+/// The names on the path to the requested entry, from the outside in. Nothing if the command does
+/// not have this form.
 ///
-/// A colon stands in front of each name; the first may be left out. A name that stands in single or
-/// double quotes as a whole may hold colons; a backslash takes the character behind it as it is.
+/// A colon precedes each name; the first may be omitted. A name completely in single or double
+/// quotes may contain colons. A backslash makes the next character literal.
 std::optional<std::vector<std::string>> parsePrintCommand(const std::string& command);

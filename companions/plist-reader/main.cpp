@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Prints one value of a property list. Below the system root this program stands at
-// usr/libexec/Plistbuddy, where the tool looks for it.
+// Prints one value of a property list. The tool looks for this program at usr/libexec/Plistbuddy
+// below the system root.
 #include <cstdio>
 #include <string>
 
@@ -26,7 +26,7 @@ int end(Status status) {
     return static_cast<int>(status);
 }
 
-// A program reads what comes from here, so there are no words but on request.
+// A program reads the output, so messages are printed only on request.
 int fail(Status status, bool verbose, const std::string& words) {
     if (verbose) {
         std::fprintf(stderr, "%s\n", words.c_str());
@@ -49,11 +49,11 @@ int main(int argumentCount, char** arguments) {
     std::string command;
     std::string path;
     bool verbose = false;
-    app.add_option("-c", command, "What to print: the word Print and the way to the value")
+    app.add_option("-c", command, "What to print: the word Print and the path of the value")
         ->required()
         ->type_name("COMMAND");
     app.add_option("file", path, "The property list")->required();
-    app.add_flag("-v,--verbose", verbose, "Say on standard error what is wrong");
+    app.add_flag("-v,--verbose", verbose, "Report errors on standard error");
     app.footer(std::string(footer) + plistbuddyStatusHelp);
     try {
         app.parse(argumentCount, arguments);
@@ -63,17 +63,17 @@ int main(int argumentCount, char** arguments) {
 
     const auto way = parsePrintCommand(command);
     if (!way) {
-        return fail(Status::BadCommand, verbose, "Not understood: " + command);
+        return fail(Status::BadCommand, verbose, "Invalid command: " + command);
     }
     const auto list = platform::PropertyList::read(path);
     if (!list) {
-        return fail(Status::NoPropertyList, verbose, "No property list: " + path);
+        return fail(Status::NoPropertyList, verbose, "Not a property list: " + path);
     }
     const auto value = list->text(*way);
     if (!value) {
         return list->exists(*way) ? fail(Status::NoSuchValue, verbose,
                                          "Not a single value: " + command + namesAt(*list, *way))
-                                  : fail(Status::NoSuchValue, verbose, "Not there: " + command);
+                                  : fail(Status::NoSuchValue, verbose, "No such value: " + command);
     }
     std::fwrite(value->data(), 1, value->size(), stdout);
     std::fputc('\n', stdout);

@@ -22,7 +22,7 @@ bool hasDisplay() {
 }
 
 bool openFile(const std::string& path, std::string& problem) {
-    // The browser may outlive everybody: it must not hold the pipes of whoever started us.
+    // The browser may outlive the caller, so it must not keep the caller's pipes open.
     posix_spawn_file_actions_t files;
     posix_spawn_file_actions_init(&files);
     for (const int stream : {STDIN_FILENO, STDOUT_FILENO, STDERR_FILENO}) {

@@ -6,11 +6,11 @@
 
 namespace viewer {
 
-/// True if there is a display to show something on (X11 or Wayland).
+/// True if there is a display (X11 or Wayland).
 bool hasDisplay();
 
-/// Starts the desktop's own opener with a file, and does not wait for it. False with the reason in
-/// `problem` if it can't be started.
+/// Opens a file with the desktop's opener and does not wait for it. If that can't be started,
+/// returns false with the reason in `problem`.
 bool openFile(const std::string& path, std::string& problem);
 
 } // namespace viewer

@@ -11,7 +11,7 @@ namespace viewer {
 
 namespace {
 
-/// Of 2024-05-01T12:34:56+02:00, in seconds since 1970.
+/// Converts 2024-05-01T12:34:56+02:00 to seconds since 1970.
 std::int64_t secondsOf(const std::string& stamp) {
     std::tm parts = {};
     const char* const zone = strptime(stamp.c_str(), "%Y-%m-%dT%H:%M:%S", &parts);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the server does not have of a job's result.
+// Finds the parts of a job's result that the server does not have.
 #pragma once
 
 #include <string>
@@ -10,8 +10,8 @@
 
 namespace viewer {
 
-/// A paragraph for the job's page; empty if the server took all that the run wrote. The writes of a
-/// run are between its sample file, in the job's folder, and its meta file.
+/// Returns a paragraph for the job's page. Empty if the server accepted all writes of the run.
+/// These are newer than its sample file, in the job's folder, and older than its meta file.
 std::string missingWrites(const std::vector<store::WriteFailure>& failures,
                           const std::string& folder, const report::Meta& meta);
 

@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Shows a verified job: makes a page of its result and opens it. Below the system root this program
-// stands at "/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify", where the tool
-// looks for it.
+// Shows a verified job: creates a page of its result and opens it. The tool looks for this program
+// at "/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify" below the system root.
 #include <csignal>
 #include <cstdio>
 #include <new>
@@ -26,15 +25,15 @@ namespace {
 
 using Status = NerovaVerifyStatus; ///< Listed in docs/companion-statuses.csv.
 
-constexpr std::size_t mostBytes = std::size_t{1} << 30; ///< Of a result: millions of patches.
+constexpr std::size_t mostBytes = std::size_t{1} << 30; ///< Limit of a result: millions of patches.
 
 constexpr const char* help = R"(Shows the result of a verified job as a page in the browser.
 
   Nerova Verify                       the index of all reports in the temporary folder
   Nerova Verify -detail -meta PATH    the report of the job whose meta file is PATH
 
-The page is written beside the meta file, as report-strip1-2024-05-01-123456.html, and opened where
-there is a display. PATH is all words behind -meta, with one blank in between. On a terminal the
+The page is written next to the meta file, as report-strip1-2024-05-01-123456.html, and opened if
+there is a display. PATH is all words after -meta, joined by single blanks. On a terminal, the
 page's path is printed.
 
 )";
@@ -63,7 +62,7 @@ int show(const std::string& page) {
     }
     std::string problem;
     if (viewer::hasDisplay() && !viewer::openFile(page, problem)) {
-        return fail(Status::PageNotOpened, page + " is not opened: " + problem);
+        return fail(Status::PageNotOpened, page + " can't be opened: " + problem);
     }
     return end(Status::Done);
 }
@@ -103,9 +102,9 @@ int showReport(const std::string& metaPath) {
 int showIndex() {
     const std::string temporary = platform::temporaryFolder();
     if (temporary.empty()) {
-        return fail(Status::PageNotWritten, "there is no temporary folder that may be used");
+        return fail(Status::PageNotWritten, "there is no usable temporary folder");
     }
-    // The tool's working folder, or the temporary folder as long as there is none.
+    // The tool's working folder, or the temporary folder if that does not exist yet.
     const std::string working = temporary + "/Tintgate";
     const std::string folder = access(working.c_str(), W_OK | X_OK) == 0 ? working : temporary;
     const std::string path = folder + "/reports.html";
@@ -128,9 +127,9 @@ int run(const std::vector<std::string_view>& words) {
     }
     const std::size_t meta = words[0] == "-detail" ? 1 : 0;
     if (words.size() < meta + 2 || words[meta] != "-meta") {
-        return fail(Status::BadCommand, "not understood; --help tells how it is called");
+        return fail(Status::BadCommand, "invalid arguments; see --help");
     }
-    // Whoever starts this program does not quote the path, so blanks part it into words.
+    // Callers do not quote the path, so blanks split it into words.
     std::string path(words[meta + 1]);
     for (std::size_t i = meta + 2; i < words.size(); ++i) {
         path.append(" ").append(words[i]);
@@ -141,7 +140,7 @@ int run(const std::vector<std::string_view>& words) {
 } // namespace
 
 int main(int argumentCount, char** arguments) {
-    // The page is wanted also if the terminal of the run that it shows is closed meanwhile.
+    // The page is wanted even if the terminal of the run is closed meanwhile.
     std::signal(SIGHUP, SIG_IGN);
     try {
         return run({arguments + (argumentCount > 0), arguments + argumentCount});

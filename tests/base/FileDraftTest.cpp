@@ -51,7 +51,7 @@ TEST(WriteWholeFile, LeavesTheOldFileIfItFails) {
     EXPECT_FALSE(base::writeWholeFile(folder.path("missing/a"), "new"));
     EXPECT_EQ(errno, ENOENT);
 
-    // A limit on the size of files stands for a full disk.
+    // A file size limit simulates a full disk.
     const auto before = std::signal(SIGXFSZ, SIG_IGN);
     rlimit limit = {};
     ASSERT_EQ(getrlimit(RLIMIT_FSIZE, &limit), 0);

@@ -57,8 +57,8 @@ TEST_F(CLoggerTest, OneLogAtATimeAndNoneIsHarmless) {
     EXPECT_FALSE(support::exists(m_folder.path("second")));
 }
 
-// Each name is one that somebody else could have put where the log goes. Only root can make another
-// user's file, and only root could write into it.
+// Names that another user could have put in the log's place. Only root can create another user's
+// file, and only root could write to it.
 TEST_F(CLoggerTest, StaysClosedWhereTheNameIsNotOurs) {
     const std::string victim = m_folder.write("victim", "untouched");
     symlink(victim.c_str(), m_folder.path("link").c_str());

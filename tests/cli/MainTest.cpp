@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The program as its callers see it: arguments in; exit code, standard output and files out.
+// The program's external behaviour: arguments in; exit code, standard output and files out.
 
 #include <filesystem>
 #include <regex>
@@ -22,7 +22,7 @@ using support::Outcome;
 using support::RunOptions;
 using testing::EndsWith;
 
-/// A folder that is the program's temporary folder and holds its files.
+/// A folder for the program's files, which is also its temporary folder.
 class MainTest : public testing::Test {
   protected:
     using Settings = std::map<std::string, std::optional<std::string>>;
@@ -36,7 +36,7 @@ class MainTest : public testing::Test {
         return support::run(arguments, options);
     }
 
-    /// Runs the program with the scripted library, which answers as the settings say.
+    /// Runs the program with the scripted library, which answers according to the settings.
     Outcome runScripted(const std::vector<std::string>& arguments, Settings settings) const {
         m_folder.write("calls", "");
         settings.insert({"CALLS", m_folder.path("calls")});
@@ -44,7 +44,7 @@ class MainTest : public testing::Test {
         return run(arguments, settings);
     }
 
-    /// What the scripted library was asked, a line for each call.
+    /// The calls of the scripted library, one per line.
     std::string calls() const { return contentsOf(m_folder.path("calls")); }
 
     support::ScratchFolder m_folder;
@@ -93,11 +93,11 @@ TEST_F(MainTest, TheArgumentCountDecides) {
 TEST_F(MainTest, HelpHasItsLines) {
     const std::string text = run({"-help"}).output;
     EXPECT_EQ(std::count(text.begin(), text.end(), '\n'), 35);
-    EXPECT_THAT(text, testing::HasSubstr("icc profile: \n")); // With a blank at its end.
+    EXPECT_THAT(text, testing::HasSubstr("icc profile: \n")); // The blank at its end is required.
     EXPECT_THAT(text, EndsWith("\n" + std::string(86, '*') + "\n\n"));
 }
 
-// The job form is a module beside the program's libraries; the file forms do without it and wx.
+// The job form is a separate module; the file forms work without it and without wx.
 TEST_F(MainTest, RefusesJobsWithoutTheModule) {
     m_program = m_folder.path("Tintgate");
     std::filesystem::copy_file(TINTGATE_PROGRAM, m_program);
@@ -108,7 +108,7 @@ TEST_F(MainTest, RefusesJobsWithoutTheModule) {
     EXPECT_EQ(refused.output + refused.error, "");
 }
 
-// A caller that starts the program anew must not lose the result that it has.
+// A caller that runs the program again must not lose the previous result.
 TEST_F(MainTest, AFailedComparisonTouchesNoOutput) {
     const std::string old = m_folder.write("out.json", "last result");
     for (const char* failing : {"ANALYZE", "PARSE"}) {
@@ -121,7 +121,7 @@ TEST_F(MainTest, AFailedComparisonTouchesNoOutput) {
     EXPECT_EQ(calls(), "parse [x] false\n");
 }
 
-// Another vendor's text need not be ASCII, and a long one is written in pieces.
+// Another vendor's text may be non-ASCII, and long text is written in pieces.
 TEST_F(MainTest, WritesEveryCharacterThroughALink) {
     std::string json;
     for (int i = 0; i < 10'000; ++i) {
@@ -136,7 +136,7 @@ TEST_F(MainTest, WritesEveryCharacterThroughALink) {
 }
 
 TEST_F(MainTest, AnOutputThatCannotBeWrittenGives71) {
-    const std::string little = "{}"; // Held in the stream's buffer until it is closed.
+    const std::string little = "{}"; // Stays in the stream's buffer until it is closed.
     const std::pair<std::string, std::string> outputs[] = {
         {m_folder.path("missing/out.json"), little},
         {m_folder.makeFolder("folder"), little},
@@ -170,8 +170,8 @@ TEST_F(MainTest, TheLogFollowsTheTemporaryFolder) {
     }
 }
 
-// Without a folder of the environment's, one is made in /tmp, where others may have been before.
-// Root alone can do so as a user of this test's own.
+// Without a folder from the environment, the program creates one in /tmp, where other users may
+// have been first. Only root can test that, as another user.
 TEST_F(MainTest, AFolderOfTheUsersOwnIsMadeAndTrustedOnlyIfItIs) {
     if (geteuid() != 0) {
         return;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Stands in the place of libTintgate, as another vendor's library could. It writes each call to the
-// file that CALLS names, and answers as the environment says: VALIDATE, LAB, PARSE and ANALYZE are
+// Replaces libTintgate, as another vendor's library could. It writes each call to the file that
+// CALLS names and answers according to the environment: VALIDATE, LAB, PARSE and ANALYZE are
 // statuses, JSON is the result's text.
 
 #include <cstdlib>
@@ -72,7 +72,7 @@ void getLibVersion(unsigned int& major, unsigned int& minor, unsigned int& patch
     patch = 9;
 }
 
-// A character for each byte: what the tool does with these texts in between must not matter.
+// One character per byte: the tool must not depend on the intermediate form of these texts.
 std::wstring stringToWstring(const std::string& text) {
     return wxString::From8BitData(text.data(), text.size()).ToStdWstring();
 }

@@ -34,7 +34,7 @@ Failure failureOf(const std::string& text) {
     return failure;
 }
 
-/// A text as it should be.
+/// A correct text.
 std::string table(const std::string& names, const std::string& rows,
                   const std::string& header = "CGATS.17\n") {
     return header + "BEGIN_DATA_FORMAT\n" + names + "\nEND_DATA_FORMAT\nNUMBER_OF_SETS " +
@@ -65,7 +65,7 @@ const std::string plain = table(plainNames,
                                 "A2 0 40.5 0 0 71.25 33 -0.5\n",
                                 "CGATS.17\nORIGINATOR \"Press\"\nNUMBER_OF_FIELDS 8\n");
 
-/// L*, a*, b* of all patches, one behind the other.
+/// L*, a*, b* of all patches in one list.
 std::vector<double> labsOf(const DataSet& set) {
     std::vector<double> values;
     for (const Lab& lab : set.lab) {
@@ -88,7 +88,7 @@ std::string deviceOf(const DataSet& set) {
     return replaced(text.str(), "CMYK_C CMYK_M CMYK_Y CMYK_K", "CMYK");
 }
 
-/// Reads one patch with a spectrum of 400 to 700 nm that has one value throughout.
+/// Reads one patch with a spectrum of 400 to 700 nm with equal values.
 DataSet readSpectrum(const std::string& name, const std::string& value,
                      std::string columns = "SAMPLE_ID", std::string row = "1", bool wanted = true) {
     for (int nm = 700; nm >= 400; nm -= 20) {
@@ -108,8 +108,8 @@ void expectPlain(const DataSet& set, const char* what) {
 
 } // namespace
 
-// One set of patches in every writing that is met. `remark` is a part of a note that must be there;
-// without one nothing was assumed.
+// One set of patches in all notations found in practice. `remark` is part of an expected note; if
+// empty, no note is expected.
 TEST(CgatsText, ReadsTextAsItIsMet) {
     const auto with = [](const std::string& what, const std::string& by) {
         return replaced(plain, what, by);
@@ -136,18 +136,18 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
         {"declared keywords", with("ORIGINATOR", "KEYWORD \"ORIGINATOR\"\nORIGINATOR"), ""},
         {"a keyword behind the format", with("NUMBER_OF_S", "DEVICE 28\nNUMBER_OF_S"), ""},
         {"no NUMBER_OF_SETS", with("NUMBER_OF_SETS 3\n", ""), ""},
-        {"count too low", with("SETS 3", "SETS 2"), "NUMBER_OF_SETS says 2, there are 3"},
+        {"count too low", with("SETS 3", "SETS 2"), "NUMBER_OF_SETS is 2, but there are 3"},
         {"count too high", with("SETS 3", "SETS 4000000000"), "there are 3 rows"},
-        {"a name too many", with("LAB_B\n", "LAB_B SPECTRAL_NM_7\n"), "8, there are 9"},
+        {"a name too many", with("LAB_B\n", "LAB_B SPECTRAL_NM_7\n"), "8, but there are 9"},
         {"names in lines", with("CMYK_K LAB_L", "CMYK_K\n\nLAB_L"), ""},
         {"no end of the format", with("END_DATA_FORMAT\n", ""), "END_DATA_FORMAT is missing"},
         {"names without a format", replaced(noFormat, "BEGIN_DATA\n", names + "BEGIN_DATA\n"),
-         "no BEGIN_DATA_FORMAT"},
+         "BEGIN_DATA_FORMAT is missing"},
         {"names as the first row", replaced(noFormat, "BEGIN_DATA\n", "BEGIN_DATA\n" + names),
-         "no BEGIN_DATA_FORMAT"},
+         "BEGIN_DATA_FORMAT is missing"},
         {"bare list of rows",
          names + plain.substr(plain.find("A1"), plain.find("END_DATA\n") - plain.find("A1")),
-         "no BEGIN_DATA:"},
+         "BEGIN_DATA is missing"},
         {"END_DATA missing, count right", with("END_DATA\n", ""), "END_DATA is missing"},
         {"quoted numbers", with("71.25 33", "\"71.25\" \"33\""), ""},
         {"decimal commas", commas, "Commas"},
@@ -164,7 +164,7 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
          replaced(replaced(commas, "A2 0", "\"A2 0"), "-0,5\n", "-0,5\"\t\t\n"), "Commas"},
         {"rows over two lines", with(" 0 0 ", " 0\n0 "), "over several lines"},
         {"two rows in a line", with("-50.75\n", "-50.75 "), "several rows"},
-        {"a remark behind a row", with("-50.75\n", "-50.75 checked twice\n"), "Words behind"},
+        {"a remark behind a row", with("-50.75\n", "-50.75 checked twice\n"), "Words after"},
         {"unknown columns",
          replaced(replaced(with("SAMPLE_ID", "LGOROWLENGTH SAMPLE_ID Remark"), "A1 ",
                            "8 A1 \"a \"\"b\"\" 5\" "),
@@ -185,7 +185,7 @@ TEST(CgatsText, ReadsTextAsItIsMet) {
 TEST(CgatsText, LetsTheFirstRowPartNamesOfBlanksAndTabs) {
     const struct {
         const char* what;
-        std::string format; ///< With the stated number of fields in front of it.
+        std::string format; ///< Preceded by the stated number of fields.
         std::string row;
         std::string id;
         std::string name;
@@ -227,7 +227,7 @@ TEST(CgatsText, KeepsHeaderTextsAsUtf8) {
     EXPECT_EQ(set.descriptor, "ß 5” \"x\""); // 94 is a quote in Windows-1252
     EXPECT_EQ(set.created, "3 May 2024");
     EXPECT_EQ(set.instrumentation, "a\tb, € 5");
-    // The time of day follows as a comment of a form of its own.
+    // The time of day follows in a comment of a special form.
     const auto createdOf = [](const std::string& line) {
         return readWell(table(labNames, "1 50 0 0\n", "CGATS.17\n" + line + "\n")).created;
     };
@@ -235,7 +235,7 @@ TEST(CgatsText, KeepsHeaderTextsAsUtf8) {
     EXPECT_EQ(createdOf("CREATED \"11/21/2026  # Time: 09:15\""), "11/21/2026  # Time: 09:15");
 }
 
-// The columns stand before those of Lab; a row with tabs has its cells by them alone.
+// The columns precede those of Lab. In a row with tabs, only tabs separate cells.
 TEST(CgatsText, TellsIdsAndNames) {
     const std::tuple<std::string, std::string, std::string, std::string> cases[] = {
         {"SampleID", "007", "007", ""},
@@ -304,7 +304,7 @@ TEST(CgatsText, NamesInksFromWhereTheyCanBeTrusted) {
          {"SPOT_Gold", "SPOT_Deep Sea"}},
         {"COLOR_REP \"CMYKOG_LAB\"\n", {"SPOT_Orange", "SPOT_Green"}},
         {"COLOR_REP \"CMYKcm\"\n", {"SPOT_Light cyan", "SPOT_Light magenta"}},
-        {process + channel(5, "Gold"), {"CMYKOG_O", "CMYKOG_G"}}, // One is not named,
+        {process + channel(5, "Gold"), {"CMYKOG_O", "CMYKOG_G"}}, // One has no name,
         {"COLOR_REP \"CMYKOGV\"\n", {"CMYKOG_O", "CMYKOG_G"}},    // one is too many,
         {"COLOR_REP \"CMYKXZ\"\n", {"CMYKOG_O", "CMYKOG_G"}},     // unknown letters,
         {channel(1, "Gold") + process.substr(process.find('\n') + 1) + channel(5, "Cyan") +
@@ -322,18 +322,18 @@ TEST(CgatsText, NamesInksFromWhereTheyCanBeTrusted) {
 TEST(CgatsText, TellsSpectralColumns) {
     for (const char* name : {"SPECTRAL_NM*", "SPECTRAL_NM_*", "SPEC_*", "nm*", "*nm", "R_*", "*_NM",
                              "spectral_dec*", "*", "nm*.00"}) {
-        const DataSet set = readSpectrum(name, "0.*"); // put in order by the reader
+        const DataSet set = readSpectrum(name, "0.*"); // sorted by the reader
         ASSERT_EQ(set.axis.length, 16) << name;
         EXPECT_EQ(set.axis.base, 400) << name;
         EXPECT_EQ(set.axis.step, 20) << name;
         EXPECT_EQ(set.spectra[15], 0.7) << name;
         EXPECT_EQ(set.lab.size(), 1U);
     }
-    // Pairs of wavelength and value, percent by their name.
+    // Pairs of wavelength and value, in percent according to their name.
     const DataSet pairs = readSpectrum("SPECTRAL_NM SPECTRAL_PCT", "* 1.5");
     EXPECT_EQ(pairs.axis.base, 400);
     EXPECT_THAT(pairs.spectra, testing::ElementsAreArray(std::vector<double>(16, 0.015)));
-    // Rows that state other wavelengths are no spectra of one axis.
+    // Rows with different wavelengths are not spectra on one axis.
     EXPECT_EQ(failureOf(table("SPECTRAL_NM SPECTRAL_PCT SPECTRAL_NM SPECTRAL_PCT",
                               "400 50 700 50\n400 50 705 50\n")),
               Failure::SpectraUnusable);
@@ -344,7 +344,7 @@ TEST(CgatsText, DecidesScalesByWholeColumns) {
     const std::tuple<std::string, const char*, double> lights[] = {
         {xyz, "0.5 0.25 0.5\n0.9 1 1.1\n", 25},
         {xyz, "0.5 0.25 0.5\n80 85 70\n", 0.25},
-        // A black patch alone: Lab tells that 0.9 is of 100 (L* 8.1) or of 1 (L* 96).
+        // A single black patch: Lab shows whether 0.9 is of 100 (L* 8.1) or of 1 (L* 96).
         {xyz + " LAB_L LAB_A LAB_B", "0.8 0.9 0.7 8.1 0 0\n", 0.9},
         {xyz + " LAB_L LAB_A LAB_B", "0.8 0.9 0.7 96 0 0\n", 90},
     };
@@ -361,7 +361,7 @@ TEST(CgatsText, DecidesScalesByWholeColumns) {
     EXPECT_EQ(readSpectrum("nm*", "1.25").spectra.at(0), 1.25); // brightened
     EXPECT_EQ(readSpectrum("nm*", "62.5").spectra.at(0), 0.625);
     EXPECT_EQ(readSpectrum("SPECTRAL_PCT*", "1.5").spectra.at(0), 0.015);
-    // Y tells a black from a fluorescent white.
+    // Y distinguishes a black from a fluorescent white.
     EXPECT_EQ(readSpectrum("nm*", "1.5", xyz, "1.4 1.5 1.2").spectra.at(0), 0.015);
     EXPECT_EQ(readSpectrum("nm*", "2.5", xyz, "241 250 206").spectra.at(0), 2.5);
 }
@@ -372,29 +372,29 @@ TEST(CgatsText, WorksOutWhatIsNotStated) {
     const DataSet both = readSpectrum("nm*", "0.5", "LAB_L LAB_A LAB_B", "95.5 0.25 -2");
     EXPECT_EQ(both.lab.at(0).L, 95.5);       // as stated
     EXPECT_NEAR(both.xyz.at(0).Y, 50, 1e-9); // from the spectrum
-    // A store without Lab leaves zeros: then the spectrum tells, wanted or not.
+    // A store without Lab writes zeros: then the spectrum is used, requested or not.
     for (const bool wanted : {true, false}) {
         const DataSet zeros = readSpectrum("nm*", "0.5", "LAB_L LAB_A LAB_B", "0 0 0", wanted);
         EXPECT_NEAR(zeros.lab.at(0).L, 76.069, 1e-3);
         EXPECT_THAT(notesOf(zeros), HasSubstr("Lab is zero throughout"));
     }
-    // A whole group without numbers is absent.
+    // A group without any number counts as absent.
     const DataSet half = readWell(table(labNames + " XYZ_X XYZ_Y XYZ_Z", "1 60 1 2 - n/a -\n"));
     EXPECT_EQ(half.xyz.at(0).Y, xyzFromLab({60, 1, 2}).Y);
-    EXPECT_THAT(notesOf(half), HasSubstr("XYZ columns hold no numbers"));
+    EXPECT_THAT(notesOf(half), HasSubstr("XYZ columns contain no numbers"));
 }
 
 TEST(CgatsText, JoinsTables) {
     const std::string inks = "SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K";
-    // The same ids in another order; the second 1 belongs to the second 1.
+    // The same ids in another order. The second 1 is joined with the second 1.
     const DataSet joined = readWell(table(inks, "1 0 0 0 0\n2 100 0 0 0\n1 0 0 0 100\n") +
                                     table(labNames, "2 55 0 0\n1 95 0 0\n1 16 0 0\n"));
     EXPECT_THAT(joined.ids, ElementsAre("1", "2", "1"));
     EXPECT_THAT(labsOf(joined), ElementsAre(95, 0, 0, 55, 0, 0, 16, 0, 0));
     EXPECT_EQ(deviceOf(joined), "cmyk CMYK 0 0 0 0 100 0 0 0 0 0 0 100");
 
-    // Pages of one chart, the second with the format of the first; ids that start anew where the
-    // inks differ.
+    // Pages of one chart; the second uses the format of the first. Ids that restart with other
+    // inks.
     const std::string page = table(labNames, "1 50 0 0\n2 60 0 0\n");
     const DataSet pages = readWell(page + "BEGIN_DATA\n3 70 0 0\nEND_DATA\n");
     EXPECT_THAT(labsOf(pages), ElementsAre(50, 0, 0, 60, 0, 0, 70, 0, 0));
@@ -413,7 +413,7 @@ TEST(CgatsText, JoinsTables) {
     }
 }
 
-// Spellings of measuring software, of data sets that are published and of our own measuring tool.
+// Notations of measuring software, of published data sets and of our own measuring tool.
 TEST(CgatsText, FindsConditions) {
     const std::string source = "MEASUREMENT_SOURCE \"";
     const std::pair<std::string, Conditions> cases[] = {
@@ -455,7 +455,7 @@ TEST(CgatsText, FindsConditions) {
     }
 }
 
-// The spectrum is a flat grey of 50 %, whatever the text states for it.
+// The spectrum is a flat grey of 50 %, whatever conditions the text states.
 TEST(CgatsText, CalculatesColoursThatAreStatedForOtherLight) {
     const std::string spectrum = "SPECTRAL_400 SPECTRAL_420 SPECTRAL_440 SPECTRAL_460 SPECTRAL_480 "
                                  "SPECTRAL_500 SPECTRAL_520 SPECTRAL_540 SPECTRAL_560 SPECTRAL_580 "
@@ -492,7 +492,7 @@ TEST(CgatsText, CalculatesColoursThatAreStatedForOtherLight) {
             EXPECT_EQ(again.conditions.areUsual(), c.calculated || set.conditions.areUsual());
         }
     }
-    // Without other values, too: a reader of the set must not take the colours for those of D65.
+    // Even without other values: the colours must not be mistaken for those of D65.
     const DataSet alone =
         readWell(table("SAMPLE_ID " + spectrum, "1" + halves + "\n", "CGATS.17\nILLUMINANT D65\n"));
     EXPECT_TRUE(alone.calculated);
@@ -514,8 +514,8 @@ TEST(CgatsText, NamesOneCauseForEachFailure) {
         {table("SAMPLE_ID D_RED D_GREEN LAB_L", "1 0.1 0.2 50\n"), Failure::NoColourValues},
         {rows("1 50 0 0\n2 50 x 0\n"), Failure::NotNumeric},
         {replaced(rows("1 50 0 0\n2 50  0\n"), " ", "\t"), Failure::NotNumeric}, // an empty cell
-        {rows("1 1e10 0 0\n2 50 0 0\n"), Failure::NotNumeric},    // beyond all colours
-        {rows("1 1,234 0 0\n2 50.5 0 0\n"), Failure::NotNumeric}, // a thousand or one point ...
+        {rows("1 1e10 0 0\n2 50 0 0\n"), Failure::NotNumeric},    // above the limit of colours
+        {rows("1 1,234 0 0\n2 50.5 0 0\n"), Failure::NotNumeric}, // a thousand or a decimal ...
         {table("ID nm400 nm425 nm700", "1 0.1 0.1 0.1\n"), Failure::SpectraUnusable},
         {table("ID nm400 nm410 nm420", "1 0.1 0.1 0.1\n"), Failure::SpectraUnusable},
     };
@@ -524,7 +524,7 @@ TEST(CgatsText, NamesOneCauseForEachFailure) {
     }
 }
 
-// However a text is cut, its rest never passes for a set: patches would be missing unnoticed.
+// A truncated text must never pass for a complete set: missing patches would go unnoticed.
 TEST(CgatsText, NeverTakesACutTextForAWholeOne) {
     for (const std::string& text : {plain, replaced(plain, "NUMBER_OF_SETS 3\n", ""),
                                     replaced(plain, "\n", "\r\n"), replaced(plain, " ", "\t")}) {
@@ -533,7 +533,7 @@ TEST(CgatsText, NeverTakesACutTextForAWholeOne) {
             const std::string cut = text.substr(0, length);
             DataSet set;
             if (readCgats(cut, {}, set) == Failure::None) {
-                // All rows are there and whole, as many as stated.
+                // All rows are present and complete, and their number is as stated.
                 expectPlain(set, cut.c_str());
                 EXPECT_THAT(cut, HasSubstr("NUMBER_OF_SETS"));
             }
@@ -566,7 +566,7 @@ TEST(CgatsText, BearsHostileSizes) {
     EXPECT_EQ(readWell(table(labNames, "3 50 0 0\n") + many(2500, page)).patchCount, 5001U);
 }
 
-// Every number as strtod gives it, in all writings that occur.
+// Every number must equal strtod's result, in all notations that occur.
 TEST(CgatsText, ReadsNumbersToTheLastBit) {
     std::mt19937_64 engine(7);
     std::uniform_real_distribution<double> value(-120, 120);

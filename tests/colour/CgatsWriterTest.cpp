@@ -30,7 +30,7 @@ void expectReadBack(const DataSet& set) {
     EXPECT_EQ(back.conditions, set.conditions);
     EXPECT_EQ(back.originator + back.created, set.originator + set.created);
     EXPECT_EQ(back.descriptor + back.instrumentation, set.descriptor + set.instrumentation);
-    for (const std::string& note : back.notes) { // nothing assumed, nothing mended
+    for (const std::string& note : back.notes) { // no assumptions, no repairs
         EXPECT_THAT(note, HasSubstr("other conditions than D50"));
     }
 }
@@ -78,7 +78,7 @@ TEST(CgatsWriter, IsReadBackToTheLastBit) {
     expectReadBack(set);
 }
 
-// A set that does not show its own scales.
+// A set whose values don't reveal its scales.
 TEST(CgatsWriter, StatesItsScales) {
     DataSet dark;
     dark.patchCount = 1;
@@ -93,7 +93,7 @@ TEST(CgatsWriter, StatesItsScales) {
     expectReadBack(dark);
 }
 
-// ArgyllCMS as a second reader, which makes a profile's input of a text of ours.
+// ArgyllCMS as a second reader, which converts our text to a profile's input.
 TEST(CgatsWriter, IsReadByArgyll) {
     const support::ScratchFolder folder;
     const DataSet set = randomSet(50);

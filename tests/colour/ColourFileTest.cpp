@@ -47,7 +47,7 @@ TEST(ColourFile, TellsFilesByTheirBytes) {
                                                      5))),
               Failure::NotRecognised);
     EXPECT_EQ(load("/dev/zero"), Failure::NotRecognised);
-    EXPECT_TRUE(file.profile); // as it was
+    EXPECT_TRUE(file.profile); // unchanged
 }
 
 TEST(ColourFile, TellsWhyAFileCannotBeRead) {
@@ -65,7 +65,7 @@ TEST(ColourFile, TellsWhyAFileCannotBeRead) {
     EXPECT_EQ(readWholeFile(folder.path("file"), text.size(), bytes), Failure::None);
     EXPECT_EQ(bytes, text);
     EXPECT_EQ(readWholeFile("/proc/self/status", 1'000'000, bytes), Failure::None);
-    EXPECT_EQ(bytes.substr(0, 5), "Name:"); // a file that says it has no bytes
+    EXPECT_EQ(bytes.substr(0, 5), "Name:"); // a file that reports a size of 0
 }
 
 TEST(ColourFile, WaitsForPipes) {
@@ -78,9 +78,9 @@ TEST(ColourFile, WaitsForPipes) {
     ASSERT_EQ(std::system(pieces.c_str()), 0);
     EXPECT_EQ(load(path), Failure::None);
     const auto start = std::chrono::steady_clock::now();
-    EXPECT_EQ(load(path), Failure::Unreadable); // Nobody writes, so nobody ever will.
+    EXPECT_EQ(load(path), Failure::Unreadable); // Nobody has the pipe open for writing.
     EXPECT_LT(std::chrono::steady_clock::now() - start, std::chrono::seconds(10));
-    // A writer that is there but slow has more time than one that is not.
+    // A slow writer gets more time than a missing one.
     const std::string late = "(sleep 2.5; cat " + file + ") > " + path + " &";
     ASSERT_EQ(std::system(late.c_str()), 0);
     EXPECT_EQ(load(path), Failure::None);

@@ -22,7 +22,7 @@ namespace {
 const std::string core = "http://colorexchangeformat.com/CxF3-core";
 
 /// Objects in a file with the specifications "s" (D50, 2 degrees, 380 nm by 10, M1), "m0", "d65",
-/// "ten" (10 degrees) and "lamp" (an illuminant of its own).
+/// "ten" (10 degrees) and "lamp" (a special illuminant).
 std::string file(const std::string& objects,
                  const std::string& start = "<CxF xmlns='" + core + "'>",
                  const std::string& end = "</CxF>") {
@@ -330,7 +330,7 @@ TEST(Cxf, ReadsFilesAsTheyAreMet) {
     }
 }
 
-// The spectra are a flat grey of 50 %, whatever the file states beside them.
+// The spectra are a flat grey of 50 %, whatever conditions the file states.
 TEST(Cxf, CalculatesColoursThatAreStatedForOtherLight) {
     const double grey = 116 * std::cbrt(0.5) - 16;
     const std::string bands = spectrum(repeated("0.5 ", 36), "ColorSpecification='s'");
@@ -470,7 +470,7 @@ TEST(Cxf, ChoosesAmongConditionsAndLights) {
     }
 }
 
-// The L*a*b* form writes what it reads.
+// The form with L*a*b* writes what it reads.
 TEST(Cxf, KeepsItsInksInCgats) {
     for (const std::string& objects :
          {object(lab("50") + cmyk("0", spot("Deep \"Sea\" 485", "7") + spot("Orange", "5"))),
@@ -486,7 +486,7 @@ TEST(Cxf, KeepsItsInksInCgats) {
 }
 
 TEST(Cxf, BearsHostileSizes) {
-    // Refused before a tree is made of it, which would take a gigabyte.
+    // Refused before parsing, because the tree would take a gigabyte.
     DataSet set;
     EXPECT_EQ(readCxf(file(repeated("<a/>", 20'000'001)), {}, set), Failure::TooLarge);
     std::string inks;

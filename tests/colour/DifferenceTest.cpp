@@ -46,7 +46,7 @@ TEST(Difference, OtherFormulasGiveThePublishedFigures) {
     EXPECT_STREQ(formulaName(formulaFromNumber(4)), "CIE2000");
 }
 
-// Near and far pairs over all hues, greys among them.
+// Near and far pairs of all hues, including greys.
 TEST(Difference, AgreesWithLittleCms) {
     std::mt19937 engine(20); // NOLINT: the same pairs each time
     std::uniform_real_distribution<double> lightness(0, 100);

@@ -30,7 +30,7 @@ const std::string rows = "1 0 0 0 0 95 0 -2\n2 100 0 0 0 55 -37 -50\n"
 
 } // namespace
 
-// The digests are those of xxh128sum over Python's struct.pack("<i") of the documented integers.
+// Expected digests: xxh128sum of Python's struct.pack("<i") of the documented integers.
 TEST(Identity, IsThatOfTheColoursAlone) {
     const std::string expected = "d17e455f60da1d6cdc7da694595a425b";
     EXPECT_EQ(identityIn(text("", rows)), expected);

@@ -18,10 +18,10 @@ using support::contentsOf;
 namespace {
 
 const std::string iccFolder = "/usr/share/color/icc/";
-const std::string press = iccFolder + "ghostscript/default_cmyk.icc"; // version 2, its paper grey
+const std::string press = iccFolder + "ghostscript/default_cmyk.icc"; // version 2, with grey paper
 const std::string newer = iccFolder + "ghostscript/ps_cmyk.icc";      // version 4
 
-/// Paper, the solids and all inks, then anything.
+/// Paper, the solids, all inks together, then random patches.
 std::vector<double> someInks(std::size_t count) {
     std::mt19937 engine(4); // NOLINT: the same patches each time
     std::uniform_real_distribution<double> percent(0, 100);
@@ -33,7 +33,7 @@ std::vector<double> someInks(std::size_t count) {
     return inks;
 }
 
-/// The colours that a command prints, fed with the inks one patch a line.
+/// The colours printed by a command whose input is the inks, one patch per line.
 std::vector<Lab> ask(const std::string& command, const std::vector<double>& inks, double scale) {
     const support::ScratchFolder folder;
     std::ostringstream lines;
@@ -61,10 +61,10 @@ std::vector<Lab> evaluate(const Profile& profile, const std::vector<double>& ink
 
 } // namespace
 
-// icclu interpolates in another way, so that it is asked for nodes of the table alone; it knows
-// nothing newer than version 2.
+// icclu interpolates differently, so it is asked only for nodes of the table. It supports nothing
+// newer than version 2.
 TEST(Profile, AgreesWithTransiccAndIcclu) {
-    const std::vector<double> inks = someInks(1200); // more than LittleCMS is given at a time
+    const std::vector<double> inks = someInks(1200); // more than one call of LittleCMS
     for (const std::string& path : {press, newer}) {
         Profile profile;
         ASSERT_EQ(profile.open(contentsOf(path)), Failure::None);
@@ -85,7 +85,7 @@ TEST(Profile, AgreesWithTransiccAndIcclu) {
         EXPECT_LE(deltaE76(nodes[i], icclu[i]), 0.01) << i;
     }
 
-    // Further channels behind the four are skipped, and inks beyond 0 and 100 are cut.
+    // Channels after the first four are skipped, and inks are clamped to 0 to 100.
     const auto wide = evaluate(profile, {-3, 130, 0, 0, 55, 99, 0, 0, 100, 0, 55, 99}, 6);
     EXPECT_EQ(deltaE76(wide[0], nodes[2]), 0);
     EXPECT_EQ(deltaE76(wide[1], nodes[3]), 0);

@@ -17,7 +17,7 @@ using namespace colour;
 
 namespace {
 
-/// Smooth reflectances as inks have them: a base, a hump and an edge that wander with `patch`.
+/// Smooth reflectances like those of inks: a base, a hump and an edge that move with `patch`.
 double reflectance(int patch, int wavelength) {
     const double hump = std::exp(-std::pow((wavelength - 400 - 11 * patch) / 45.0, 2));
     const double edge = 1 / (1 + std::exp((650 - 9 * patch - wavelength) / 18.0));
@@ -32,7 +32,7 @@ std::vector<double> reflectances(int patch, const SpectralAxis& axis) {
     return values;
 }
 
-/// Colours of some spectra by spec2cie, which is given them every nm.
+/// Colours of some spectra by spec2cie, with one value per nm.
 std::vector<Lab> askSpec2cie(int patches) {
     const SpectralAxis axis{360, 1, 471};
     std::ostringstream text;
@@ -64,9 +64,9 @@ std::vector<Lab> askSpec2cie(int patches) {
 
 } // namespace
 
-// On every axis the perfect diffuser is the white point of ASTM E308, and spectra give what
-// spec2cie makes of them at 1 nm. It draws D50 in straight lines between the entries of its table,
-// which is good for a hundredth; the edges here are 18 nm wide, so that 20 nm must miss something.
+// On every axis, the perfect diffuser is the white point of ASTM E308, and spectra agree with
+// spec2cie at 1 nm. It interpolates D50 linearly, which differs by up to a hundredth. The edges
+// here are 18 nm wide, so 20 nm must lose some detail.
 TEST(Spectra, AllAxesAgreeWithSpec2cie) {
     const int patches = 30;
     const std::vector<Lab> expected = askSpec2cie(patches);

@@ -4,8 +4,8 @@
 
 cxf_samples.py CHARACTERISATION.ti3 FOLDER
 
-The CxF files follow the schema of CxF3 (CxF3_Core.xsd); the texts have the same numbers, digit by
-digit. Spectra and spot colours are made up from the process inks, since no free set has them.
+The CxF files follow the schema of CxF3 (CxF3_Core.xsd). The texts have the same numbers, digit by
+digit. Spectra and spot colours are derived from the process inks, because no free set has them.
 """
 
 import math
@@ -22,7 +22,7 @@ BANDS = range(380, 731, 10)
 
 
 def read(path):
-    """Rows of a well-behaved CGATS text as dictionaries of the cells' texts."""
+    """Rows of a simple CGATS text as dictionaries of the cells' texts."""
     text = Path(path).read_text(encoding="latin-1")
     names = text.split("BEGIN_DATA_FORMAT")[1].split("END_DATA_FORMAT")[0].split()
     body = text.split("BEGIN_DATA\n")[1].split("END_DATA")[0]
@@ -125,8 +125,9 @@ def location(row):
 
 
 def parted_objects(rows, columns):
-    """As a chart reader exports it: measurements first, in another order, under two conditions,
-    with nothing in common with their targets but the place on the sheet."""
+    """As exported by a chart reader: measurements first, in another order, under two conditions,
+    with only the position on the sheet in common with their targets.
+    """
     darker = []
     for row in rows:
         darker.append(dict(row))

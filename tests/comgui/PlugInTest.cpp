@@ -35,14 +35,14 @@ class ComGUIPlugIn : public StoreTest {
         return std::make_unique<CKZConnector>(server, user, password, 0x5071103, false, false);
     }
 
-    /// Hashing is slow by intent.
+    /// Computed once, because hashing is slow by design.
     inline static const std::string hash = store::passwordHash("room");
     const support::SuiteRoot root;
     const std::wstring here = base::wideFromBytes(address);
 };
 ON_BOTH_ENGINES(ComGUIPlugIn);
 
-/// Calls of the bundle's table itself, with one session open. Where the store is is all one to it.
+/// Calls the bundle's table directly, with one session open. Any kind of store is suitable.
 class ComGUISlots : public ComGUIPlugIn {
   protected:
     ComGUISlots() : ComGUIPlugIn(Engine::Sqlite) {
@@ -86,7 +86,7 @@ TEST_P(ComGUIPlugIn, MovesFilesWholeAndLeavesNoParts) {
 
 TEST_P(ComGUIPlugIn, LetsInWhoKnowsThePassword) {
     open()->putUser({"left", hash, true});
-    // Who is disabled is for who knows the password.
+    // Only a correct password reveals that a user is disabled.
     const std::tuple<const wchar_t*, const wchar_t*, int> logins[] = {{L"press", L"room", 0},
                                                                       {L"press", L"Room", -2004},
                                                                       {L"Press", L"room", -2004},
@@ -133,7 +133,7 @@ TEST_P(ComGUIPlugIn, NotesEachWriteThatTheStoreDoesNotTake) {
                      "file /x/../y: server path \"/x/../y\" names no file of the store\n");
     EXPECT_EQ(support::modeOf(failures.path()), 0600U);
 
-    // A large file is put aside, and another's is left alone.
+    // A large file is renamed, and another user's file is left alone.
     std::filesystem::resize_file(failures.path(), 1 << 20);
     set(8, "d", -1);
     EXPECT_EQ(failures.all().size(), 1U);
@@ -149,7 +149,7 @@ TEST_F(ComGUISlots, AddressesArriveOneByteACharacterAndAreLimited) {
     std::string longest = folder.path() + "/";
     longest.resize(127, 'x');
     const std::tuple<std::string, std::wstring, bool> addresses[] = {
-        // Given in UTF-8, as the tool's arguments are; it reaches the plug-in as Latin-1.
+        // Passed in UTF-8, like the tool's arguments; reaches the plug-in as Latin-1.
         {folder.path("Größe"), base::wideFromBytes(folder.path()) + L"/Gr\u00F6\u00DFe", true},
         {longest, base::wideFromBytes(longest), true},
         {longest + "x", base::wideFromBytes(longest + "x"), false},
@@ -195,7 +195,7 @@ TEST_F(ComGUISlots, RefusesArgumentsThatMeanNothing) {
     void* found = buffer;
     ComSessionRecord wrongSize = record;
     wrongSize.size = 4;
-    ComSessionRecord unending; // Not one text of it ends.
+    ComSessionRecord unending; // None of its texts is terminated.
     for (auto* const text : {&unending.user, &unending.password, &unending.server}) {
         std::memset(text, '/', sizeof *text);
     }
@@ -217,7 +217,7 @@ TEST_F(ComGUISlots, RefusesArgumentsThatMeanNothing) {
                          slots.GetTicketData(instance, session, 3, 1, 0, &size, nullptr),
                          slots.GetTicketData(instance, session, 3, 1, 0, &negative, buffer),
                          command(nullptr, 0, nullptr),
-                         command("local.set.callback", 0, buffer), // That is no ticket.
+                         command("local.set.callback", 0, buffer), // Not a ticket.
                          command("local.set.previewfolder", -1, buffer),
                          command("format.disk", 0, nullptr),
                          slots.QueryInterface(nullptr, CFUUIDBytes{}, &found)};

@@ -38,7 +38,7 @@ TEST_F(ConnectorTest, LogsInStepByStep) {
     connector.reset();
     EXPECT_THAT(takeCalls(), ElementsAre("10", "11"));
 
-    plugIn->set(0, 0, "System/Product/MajorVersion=4"); // Too old: it is left at once.
+    plugIn->set(0, 0, "System/Product/MajorVersion=4"); // Too old: logs out at once.
     connector = connect();
     EXPECT_FALSE(connector->IsLoggedIn());
     EXPECT_EQ(connector->getLastRetCode(), 0);
@@ -58,7 +58,7 @@ TEST_F(ConnectorTest, ReadsValuesWithDefaultsAndArraysUpToAMaximum) {
             connector->GetJobTicketKeyValue(3, job, "none", PARAM_DOUBLE, values, fallback, 0), -1);
         EXPECT_EQ(values[0], fallback == nullptr ? 9 : half);
     }
-    int number = 0; // The pointer itself is the default.
+    int number = 0; // The pointer value itself is the default.
     connector->GetJobTicketKeyValue(3, job, "none", PARAM_INT, &number,
                                     reinterpret_cast<void*>(0x1FFFFFFFEL), 0);
     EXPECT_EQ(number, -2);
@@ -81,7 +81,7 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
     } tickets[] = {{20, 208, 1, 0, 3}, {21, 208, 4096, 0, 3}, {22, 208, 1, 0, 1},
                    {23, 209, 1, 0, 0}, {24, 212, 4096, 0, 0}, {25, 213, 1, 1, 0},
                    {26, 207, 1, 0, 3}, {27, 212, 1, 1, 0}};
-    // Job 12 holds nothing: it is judged by the one before it, but for verify active.
+    // Job 12 has no values: those of the previous job count, except for verify active.
     const int ids[] = {20, job, 21, 22, 23, 24, 25, 26, 27};
     for (const auto& [id, displayStatus, fileType, showInVerifier, verifyActive] : tickets) {
         std::ostringstream records;
@@ -92,7 +92,7 @@ TEST_F(ConnectorTest, FindsTheJobsToVerify) {
     }
     const struct {
         bool remeasure;
-        int counted, written, code; // By the plug-in: how many it says, then gives, and its result.
+        int counted, written, code; // What the plug-in reports, writes and returns.
         int result;
         std::vector<int> found;
     } cases[] = {
@@ -131,7 +131,7 @@ TEST_F(ConnectorTest, WaitsForAFileAndTakesNoOldOne) {
     std::thread delivery;
     plugIn->onCall = [&](int slot) {
         if (slot == 18) {
-            EXPECT_FALSE(support::exists(local)); // The old one is not taken for the new one.
+            EXPECT_FALSE(support::exists(local)); // The old one is not mistaken for the new one.
             delivery = std::thread([&] {
                 std::this_thread::sleep_for(std::chrono::milliseconds(50));
                 std::ofstream(local) << "new";
@@ -146,7 +146,7 @@ TEST_F(ConnectorTest, WaitsForAFileAndTakesNoOldOne) {
         std::ofstream(local) << "old";
         plugIn->results[18] = code;
         EXPECT_EQ(connector->DownloadFile(local, "server.txt", limit), result) << limit;
-        // Refused by the plug-in, it is waited for all the same.
+        // Waits for the file even if the plug-in refuses.
         EXPECT_TRUE(limit < 5000 || support::exists(local)) << code;
         delivery.join();
     }

@@ -76,7 +76,7 @@ TEST_F(ManagerTest, LogsInWithWhatIsGiven) {
     plugIn->set(0, 0, "System/ServerName='N\xe4me");
     plugIn->results[26] = 1;
     EXPECT_EQ(manager->IsAlive("other", 9), 0);
-    // In MacRoman 0x80 is a capital A with diaeresis; only the user's name is converted.
+    // In MacRoman, 0x80 is a capital A with diaeresis. Only the user's name is converted.
     EXPECT_EQ(manager->Login("\x80", "\x80", "other", 7), 0);
     EXPECT_STREQ(plugIn->record.user, "\xc3\x84");
     EXPECT_STREQ(plugIn->record.password, "\x80");
@@ -84,7 +84,7 @@ TEST_F(ManagerTest, LogsInWithWhatIsGiven) {
     EXPECT_EQ(manager->GetServerName(), (std::wstring{L'N', wchar_t(0xFFFFFFE4), L'm', L'e'}));
     EXPECT_EQ(takeCalls(), (Calls{"26 other 9", "9", "12"}));
 
-    plugIn->results[9] = -2004; // What was there stays.
+    plugIn->results[9] = -2004; // Keeps the previous state.
     EXPECT_EQ(manager->Login(nullptr, nullptr, "third", -1), -2004);
     EXPECT_EQ(manager->GetServerIP(), L"other");
     plugIn->results.clear();
@@ -141,7 +141,7 @@ TEST_F(ManagerTest, HandsTextsOut) {
 
 TEST_F(ManagerTest, ReadsAndWritesArrays) {
     plugIn->set(3, job, "holes[1]=5 holes[2]='\xf6 holes[3]=6");
-    const wxString umlaut = L"\u00f6"; // One byte a character.
+    const wxString umlaut = L"\u00f6"; // One character per byte.
     EXPECT_THAT(manager->GetIntArray(3, job, "holes"), ElementsAre(0, 5, 5, 6));
     EXPECT_THAT(manager->GetStringArray(3, job, "holes"), ElementsAre("", "", umlaut, umlaut));
 
@@ -159,7 +159,7 @@ TEST_F(ManagerTest, SearchesAndDeletesTickets) {
     EXPECT_THAT(manager->SearchTickets(3, "n", PARAM_INT, &value, false), ElementsAre(13, 14, 15));
     EXPECT_EQ(manager->SearchTicket(3, "t", text), 13);
     EXPECT_EQ(manager->SearchTicket(3, "t", "y"), -1);
-    // Of texts only the first ticket, 12, is examined.
+    // For texts, only the first ticket, 12, is examined.
     EXPECT_THAT(manager->SearchTickets(3, "t", PARAM_STRING, text, false), ElementsAre());
     plugIn->set(3, job, "t='x");
     EXPECT_THAT(manager->SearchTickets(3, "t", PARAM_STRING, text, true), ElementsAre(job));

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A suite in a system root of the test's own, with the scripted plug-in as its comm bundle.
+// A suite in the test's own system root, with the scripted plug-in as its comm bundle.
 #pragma once
 
 #include <string>
@@ -33,7 +33,7 @@ class CommTest : public testing::Test {
         plugIn->set(3, job, "");
     }
 
-    /// The calls since the last time.
+    /// The calls since the previous takeCalls.
     Calls takeCalls() { return std::exchange(plugIn->calls, {}); }
 
     const support::SuiteRoot m_root;

@@ -25,7 +25,7 @@ namespace {
 constexpr std::uint64_t handle = 0x8877665544332211;
 int instanceWord = 0;
 
-/// An argument as a call shows it. The last record, size and data are kept.
+/// Formats an argument of a call. Keeps the last record, size and data.
 template<class Argument>
 std::string shown(Argument argument) {
     ScriptedPlugIn& plugIn = *scriptedPlugIn();
@@ -103,7 +103,7 @@ std::uint32_t release(void*) {
 
 } // namespace
 
-// The object that the factory makes is not the interface that it is asked for.
+// The object that the factory creates differs from the requested interface.
 EXPORTED void* makeScriptedPlugIn(const void*, const void*) {
     static ComGUIModuleInterface header = {.QueryInterface = queryInterface, .Release = release};
     static ComGUIModuleInterface* object = &header;

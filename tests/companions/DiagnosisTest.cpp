@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Broken jobs: what is changed in a sound job, the exit code that the tool then ends with, and the
-// words by which tintgate-store names the cause.
+// Broken jobs: the change to a correct job, the tool's exit code, and the words with which
+// tintgate-store names the cause.
 #include <algorithm>
 #include <filesystem>
 #include <functional>
@@ -22,8 +22,8 @@ using support::Call;
 using support::Place;
 using testing::HasSubstr;
 
-/// Beside the jobs of a place: 9 is measured against characterisation data, 10 has two strips, 11
-/// is nested.
+/// In addition to the jobs of a place: 9 is measured against characterization data, 10 has two
+/// strips, 11 is nested.
 constexpr char moreJobs[] = "--job 9 --unmeasured,--job 10 --two-strips,--job 11 --parent 12";
 
 enum class Then { Fails, IsWrong, Succeeds };
@@ -31,19 +31,19 @@ enum class Then { Fails, IsWrong, Succeeds };
 struct Case {
     std::string what;
     int code;
-    std::vector<std::string> words; ///< Are in the report, in this order.
+    std::vector<std::string> words; ///< Must appear in the report, in this order.
     std::function<void(const Place&)> change = {};
     Call call = {};
-    Then then = Then::Fails; ///< Of a code of 0: whether the result is right.
+    Then then = Then::Fails; ///< For code 0: whether the result is correct.
 };
 
-/// Changes of a place. They can follow one another.
+/// A change of a place. Changes can be chained.
 using Change = std::function<void(const Place&)>;
 
 Change set(const std::string& records, int id = 7, int type = 3) {
     return [=](const Place& place) { place.set(records, id, type); };
 }
-/// A text with blanks.
+/// Sets a text that may contain blanks.
 Change setText(const std::string& key, const std::string& text) {
     return [=](const Place& place) {
         place.administer({"key", "set", "job/7", key, "string", text});
@@ -120,7 +120,7 @@ support::Outcome diagnose(const Place& place, const Call& call, bool json = fals
     return support::run(words, options);
 }
 
-/// What follows a heading of a report, up to the next one.
+/// The text under a heading of a report, up to the next heading.
 std::string partOf(const std::string& report, const std::string& heading) {
     const std::size_t start = report.find(heading);
     if (heading.empty() || start == std::string::npos) {
@@ -130,7 +130,7 @@ std::string partOf(const std::string& report, const std::string& heading) {
     return part.substr(0, std::min(part.find("Also noticed:\n"), part.find("On this machine:\n")));
 }
 
-/// The same broken job for the diagnosis and for the tool: what the one foresees the other does.
+/// Runs the diagnosis and the tool on the same broken job: the prediction must match.
 void expectCauses(const std::vector<Case>& cases) {
     std::vector<std::unique_ptr<Place>> places;
     for (const Case& row : cases) {
@@ -245,7 +245,7 @@ TEST(Diagnosis, NamesWhyAJobDoesNotLoad) {
         {"cut preset", 103, {preset, "42, The tolerance preset is not well-formed XML"}, put(preset,
          "<preset")},
         {"misspelt criterion", 103, {preset, "48, "}, replaceIn(preset, "<average ", "<averag ")},
-        {"no number of references", 103, {"Reference/Numpatches", "a profile is looked for"},
+        {"no number of references", 103, {"Reference/Numpatches", "a profile is looked up"},
          set("Remote/Measurement/Reference/Numpatches=-")},
         {"too many references", 103, {"Reference/Numpatches", "is 2000000"},
          set("Remote/Measurement/Reference/Numpatches=2000000")},
@@ -289,7 +289,7 @@ TEST(Diagnosis, NamesWhyAComparisonFails) {
          all({putFile("/server/a(TEMP)/Measured sample.txt", fogra39),
               setText(dataKey, "/server/a(TEMP)/Measured sample.txt"),
               set("Workflow/Verify/MeasurementWorkflow=2")})},
-        // These succeed, and should not.
+        // These succeed although they should not.
         {"ints", 0, {measured + "XYZValues/YValues", "contains an int as element 0"}, set(measured +
          "XYZValues/YValues=1,2,3"), {}, Then::IsWrong},
         {"short array", 0, {measured + "LabValues/AValues", "contains 2 of 48 elements"},
@@ -344,7 +344,7 @@ TEST(Diagnosis, NamesWhyAMeasurementFails) {
         {"one name for two files", 106, {"NUMBER_OF_COLS", "example.it8", "same name as", strip},
          all({putFile("/server/IT8_CharacterizationData/example.it8", fogra39),
          set("Workflow/Verify/CharacterizationData='example.it8", 9)}), job9},
-        {"another chart", 30, {"example.it8", "does not go with", "30, "}, put(chart,
+        {"another chart", 30, {"example.it8", "does not match", "30, "}, put(chart,
          "CGATS.17\nNUMBER_OF_FIELDS 8\nBEGIN_DATA_FORMAT\nSAMPLE_ID CMYK_C CMYK_M "
          "CMYK_Y CMYK_K LAB_L LAB_A LAB_B\nEND_DATA_FORMAT\nNUMBER_OF_SETS 1\n"
          "BEGIN_DATA\nx 1 2 3 4 50 0 0\nEND_DATA\n"), job9},
@@ -355,7 +355,7 @@ TEST(Diagnosis, NamesWhyAMeasurementFails) {
     });
 }
 
-// What is read is shown in its order, and nothing of the store has changed.
+// The reads are listed in order, and the store is unchanged.
 TEST(Diagnosis, ReadsAndChangesNothing) {
     const Place place(moreJobs);
     const std::string before = everything(place);

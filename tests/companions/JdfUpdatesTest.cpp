@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// JDFs in a store, prepared by the administration tool and then updated as the job's results are
-// written back. An XML library judges what has become of them.
+// JDFs in a store, prepared by the administration tool and then updated by write-backs of the job's
+// results. An XML library checks the outcome.
 
 #include <filesystem>
 #include <random>
@@ -25,7 +25,7 @@ using testing::HasSubstr;
 
 const std::string jdfPath = "/server/temp/job-7.jdf";
 
-// Lines of a nested JDF, of which each has something that a careless hand would lose.
+// Lines of a nested JDF. Each contains something that a careless edit would lose.
 const std::string head =
     "\xEF\xBB\xBF<?xml version=\"1.0\"?>\r\n<!DOCTYPE JDF [<!ENTITY e \"x\">]>\n"
     "<JDF xmlns=\"http://www.CIP4.org/JDFSchema_1_1\" xmlns:tazo='urn:t' "
@@ -58,7 +58,7 @@ std::string withoutBlanks(std::string text) {
     return text.erase(text.find_last_not_of(' ') + 1);
 }
 
-/// Large enough for updates, with nothing behind its end.
+/// Makes the text large enough for updates, with nothing after its end.
 std::string enlarged(std::string text) {
     return text.insert(head.size(), "<!--" + std::string(9000, '.') + "-->");
 }
@@ -89,13 +89,13 @@ class JdfUpdates : public StoreProgram {
         return to.str();
     }
     int lastVersion() { return m_store->versions(jdfPath).back().number; }
-    /// What the last delivery replaced.
+    /// The content that the latest delivery replaced.
     std::string replaced() {
         return answer({"file", "get", jdfPath, "-", "--version", std::to_string(lastVersion())});
     }
 
-    /// Updates the local copy as a result is written back. Each update is of a day of its
-    /// own, and those of odd days have spectra.
+    /// Updates the local copy like a write-back of a result. Each update has its own day, and those
+    /// of odd days have spectra.
     void update(char party, char strip) {
         JDFMeasurementHeader header;
         JdfHandler::SetJDFMeasurementHeaderDefaults(&header);
@@ -113,9 +113,8 @@ class JdfUpdates : public StoreProgram {
         job.measurement.spectral = m_day % 2 == 1 ? m_spectral : nullptr;
         ASSERT_EQ(JdfHandler::AppendJDFFileData(job, "Remote confirmation M1", &header, true), 0);
     }
-    /// Runs in a row, each a word. A run downloads the JDF, and writes to it once, or for each job
-    /// of a sheet: s is for the sender, r for the receiver, that of a remeasure, with the strip
-    /// behind.
+    /// Performs runs, one per word. A run downloads the JDF and updates it once, or once for each
+    /// job of a sheet. "s" means the sender, "r" the receiver (a remeasure); the strip follows.
     void runJobs(const std::string& runs) {
         std::istringstream words(runs);
         for (std::string run; words >> run;) {
@@ -127,10 +126,10 @@ class JdfUpdates : public StoreProgram {
         }
     }
 
-    /// "1:01 2:02" and so on: strip and day of each measurement, read by the XML library, or
+    /// Strip and day of each measurement, such as "1:01 2:02", read by the XML library, or
     /// "damaged".
     static std::string measurements(const std::string& text) {
-        // The update leaves out the blank between two spectral values.
+        // The update omits the blank between two spectral values.
         const auto readable = std::regex_replace(text, std::regex("\"dvalue"), "\" dvalue");
         pugi::xml_document document;
         if (!document.load_string(readable.c_str())) {
@@ -149,7 +148,7 @@ class JdfUpdates : public StoreProgram {
         }
         return found;
     }
-    /// The text without what updates put into it, and without the blanks behind its end.
+    /// The text without the updates' additions and without the blanks after its end.
     static std::string rest(const std::string& text) {
         const std::regex measurement("<tazo:Measurement(2?) [^]*?</tazo:Measurement\\1>\n");
         const std::regex date("(<(?:Sender|Receiver)(?=\\s)[^>]*\\sprint(?:date|time)=\")[^\"]+");
@@ -173,7 +172,7 @@ TEST_F(JdfUpdates, LoseNothingOfAPreparedJdf) {
     const struct {
         const char* runs;
         const char* measurements;
-        std::size_t blanks; ///< That are left of those for six.
+        std::size_t blanks; ///< Remaining blanks of those for six.
     } cases[] = {
         {"s1 r1", "1:01 1:02", 2052},
         {"s2s2s2", "2:01 2:02 2:03", 2052 - 4 * 36},
@@ -194,10 +193,10 @@ TEST_F(JdfUpdates, LoseNothingOfAPreparedJdf) {
 
         runJobs(runs);
         expectWhole(prepared, expected);
-        const std::size_t padding = 5000 - prepared.size(); // Updates want that many bytes.
+        const std::size_t padding = 5000 - prepared.size(); // Updates require that many bytes.
         EXPECT_EQ(stored().size() - withoutBlanks(stored()).size(), padding + blanks);
     }
-    // Made ready again it bears more of them; a JDF that isn't is damaged by the second.
+    // If prepared again, it accepts more. If not, the second one damages it.
     answer({"jdf", "ready", "7"});
     runJobs("s1 s1 s1");
     expectWhole(prepared, "1:01 2:02 1:03 2:04 1:05 1:06 1:07 1:08 1:09");
@@ -214,7 +213,7 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
         return "<JDF xmlns:tazo='t'>" + party + "<ResourcePool>" + inside + "</ResourcePool>" +
                linkTo() + "</JDF>";
     };
-    // Before and after, without blanks.
+    // Before and after preparation, without blanks.
     const std::pair<std::string, std::string> cases[] = {
         {"<JDF><x/></JDF>", "<JDF><x/><ResourcePool>" + holder(none) +
                                 "</ResourcePool>\n<ResourceLinkPool>" + linkTo(none) +
@@ -223,17 +222,17 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
          "<j:JDF xmlns:j='j'><j:ResourcePool>" + holder(none) +
              "</j:ResourcePool><j:ResourceLinkPool a='/>' >" + linkTo(none) +
              "</j:ResourceLinkPool></j:JDF>"},
-        {pooled(full + "</tazo:MeasurementData>"), pooled(holder())}, // As an update made it.
+        {pooled(full + "</tazo:MeasurementData>"), pooled(holder())}, // As written by an update.
         {pooled(full.substr(0, full.size() - 1) + "/>"), pooled(holder())},
         {pooled("<tazo:MeasurementData ID='a'/>"),
          pooled("<tazo:MeasurementData ID='a'></tazo:MeasurementData>")},
         {pooled(holder(), "<Sender printdate=\"\" printtime='1'/>"),
          pooled(holder(), "<Sender printdate=\"\" printtime=\"\"/>")},
-        // A date that only looks like the sender's.
+        // A date that only resembles the sender's.
         {pooled(holder(), "<SenderId/><Sender aprintdate=\"2020\" printtime='1' printdate=\"\"/>"),
          pooled(holder(),
                 "<SenderId/><Sender printdate=\"\" printtime=\"\" aprintdate=\"2020\"/>")},
-        // Dates of others, which an update would find first.
+        // Dates of other elements, which an update would find first.
         {pooled(holder(), "<Senders><Note printdate=\"\"/></Senders><Sender/>"),
          pooled(holder(), "<Senders><Note printdate =\"\"/></Senders>"
                           "<Sender printdate=\"\" printtime=\"\"/>")},
@@ -266,7 +265,7 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
     }
 }
 
-// Pieces of a JDF in any order: one that is made ready takes updates, and can be made ready again.
+// JDFs with elements in any order: once prepared, they accept updates and can be prepared again.
 TEST_F(JdfUpdates, LeaveNoTraceInAnyJdfThatIsReady) {
     const std::string pieces[] = {
         "<Sender/>",
@@ -325,7 +324,7 @@ TEST_F(JdfUpdates, LeaveNoTraceInAnyJdfThatIsReady) {
 TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     put(enlarged(delivered));
     runJobs("s1 s2s2 r1");
-    put(stored() + "<tazo:Measurement a='1'><b></tazo:Measurement>"); // Nothing to rebuild from.
+    put(stored() + "<tazo:Measurement a='1'><b></tazo:Measurement>"); // No version to rebuild from.
     const std::string damaged = stored();
     ASSERT_EQ(measurements(damaged), "damaged");
     const auto rebuilt = json::parse(answer({"jdf", "rebuild", "7", "--json"}));
@@ -342,8 +341,8 @@ TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
     answer({"jdf", "rebuild", "7", "--from", std::to_string(lastVersion())});
     expectWhole(whole, "1:01 2:02 2:03 1:04 1:05 1:06");
 
-    // Another document under the same name has nothing to do with what was before, and may be the
-    // one that is damaged: that is for people to say.
+    // Another document of the same name is unrelated to the previous one, and may be the damaged
+    // one: a person must decide.
     put("<JDF><new/></JDF>");
     for (const std::string& current : {stored(), enlarged(delivered), std::string("<JDF><new>")}) {
         put(current);
@@ -359,7 +358,7 @@ TEST_F(JdfUpdates, ThatDidDamageAreUndone) {
 TEST_F(JdfUpdates, OfStripsAtOverlappingTimesAreBroughtTogether) {
     put(delivered);
     answer({"jdf", "ready", "7"});
-    const std::string downloaded = stored(); // By the second strip's run, before the first ends.
+    const std::string downloaded = stored(); // As downloaded by the second strip's run.
     runJobs("s1");
     m_folder.write("local.jdf", downloaded);
     update('s', '2');
@@ -376,7 +375,7 @@ TEST_F(JdfUpdates, RefuseTextsThatTakeMoreThanTheirShare) {
     }
     many += "</JDF>";
     put("");
-    m_folder.write("store/files" + jdfPath, many); // Without waiting for the disk.
+    m_folder.write("store/files" + jdfPath, many); // Avoids waiting for the disk.
     expectRefusal({"jdf", "ready", "7"}, 16, "more than 2000000 elements");
     std::filesystem::resize_file(m_address + "/files" + jdfPath, (256U << 20) + 1);
     expectRefusal({"jdf", "ready", "7"}, 16, "256 MiB");
@@ -389,7 +388,7 @@ TEST_F(JdfUpdates, AreOfTheJdfsThatAJobNames) {
     put(delivered);
     expectRefusal({"jdf", "ready", "7", "--updates", "17"}, 16, "too many");
 
-    // The folder's other key; and the second JDF of a job that is printed elsewhere.
+    // The alternative key for the folder, and the second JDF of a job printed elsewhere.
     answer({"key", "delete", "job/7", "System/Folders/Temp"});
     expectRefusal({"jdf", "ready", "7"}, 1, "names no JDF");
     setText("Workflow/RemoteOutFolder", "/server/temp");
@@ -420,7 +419,7 @@ TEST_F(JdfUpdates, ArePreparedForAtDeliveryWhereTheStoreSaysSo) {
     putTree(delivered, "");
     answer({"key", "set", "system", "System/Jdf/Updates", "int", "6"});
     putTree(prepared, "delivered as it is, /tree/broken.jdf: it is not well-formed");
-    EXPECT_EQ(m_store->versions("/tree/a.JDF").size(), 2U); // As delivered both times.
+    EXPECT_EQ(m_store->versions("/tree/a.JDF").size(), 2U); // Stored as delivered both times.
 }
 
 } // namespace

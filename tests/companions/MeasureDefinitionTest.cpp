@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Random control strips on their way: through the writer of definitions, which cuts lines, and the
-// measuring tool's reader. What the reader gives is what was in the strip, or it refuses.
+// Sends random control strips through the definition writer, which cuts lines, and the measuring
+// tool's reader. The reader must return the strip's content or refuse it.
 #include <algorithm>
 #include <cmath>
 #include <cstdlib>
@@ -28,8 +28,8 @@ struct Patch {
 
 struct Strip {
     std::string text;
-    std::vector<Patch> patches; ///< Filling rows included.
-    Names wholeRows;            ///< Of each row, as much as must arrive for it to be read.
+    std::vector<Patch> patches; ///< Including filling rows.
+    Names wholeRows;            ///< The part of each row that must be complete to be read.
     std::string names;          ///< The line of column names.
     bool dynamic = false;
     bool tooMuchInk = false;
@@ -62,7 +62,7 @@ class StripMaker {
             columns.push_back("SAMPLE_NAME");
         }
         const Names references = makeReferences();
-        // Some strips have their references first.
+        // Some strips start with their references.
         const bool referencesFirst = chance(15);
         const auto place = referencesFirst ? columns.begin() + 1 : columns.end();
         columns.insert(place, references.begin(), references.end());
@@ -167,7 +167,7 @@ class StripMaker {
             } else {
                 double percent = 0;
                 std::string amount = makeAmount(percent);
-                // The scale of a strip shows in its largest amount: one has all of an ink.
+                // The largest amount shows the strip's scale, so one patch has a full ink.
                 if (row == 0 && patch.device.empty()) {
                     percent = 100;
                     amount = m_isRgb ? "255" : "100";
@@ -195,11 +195,11 @@ class StripMaker {
     bool m_isRgb = false;
     bool m_tabs = true;
     bool m_overInked = false;
-    std::size_t m_foreign = 0; ///< Percent of characters outside ASCII in names.
+    std::size_t m_foreign = 0; ///< Percentage of non-ASCII characters in names.
     std::size_t m_needed = 0;  ///< Cells of a row up to the last device value.
 };
 
-/// True if nothing that is needed can have been cut: then the reader has no reason to refuse.
+/// True if no needed part can have been cut: then the reader must not refuse.
 bool mustBeRead(const Strip& strip, const std::string& definition) {
     const auto isPlain = [](const std::string& line) {
         return line.size() < 508 &&
@@ -207,7 +207,7 @@ bool mustBeRead(const Strip& strip, const std::string& definition) {
     };
     bool whole = isPlain(strip.names) && !strip.tooMuchInk;
     for (const std::string& row : strip.wholeRows) {
-        // A row that ends with a needed cell is above suspicion only if it can't have been cut.
+        // A row that ends with a needed cell is safe only if it can't have been cut.
         const bool arrived = definition.find("\n" + row) != definition.npos;
         whole = whole && arrived && (row.back() != '\r' || isPlain(row));
     }
@@ -253,7 +253,7 @@ TEST(MeasureDefinition, IsReadRightOrRefused) {
             ASSERT_FALSE(mustBe) << failure.what() << "\n" << definition;
         }
     }
-    // Both kinds are met, or the test is worth nothing.
+    // Both outcomes must occur, or the test proves nothing.
     EXPECT_GT(read, 250);
     EXPECT_GT(refused, 50);
 }

@@ -47,7 +47,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
          made + "11 100 0 0 0 55 -37 -50\n12 39.6 27.4 27 0 60 1 2\n" + whites + end},
         {"ids that are names here",
          labels + "A4 95 0 -3\nA1 55 -37 -50\nA2 60 1 2\nA3 95 0 -2\n" + end},
-        {"two too few", made + two + end, 8, "2 patches where 4"},
+        {"two too few", made + two + end, 8, "2 patches, but 4"},
         {"another patch", made + "1 100 0 0 0 55 -37 -50\n2 40 27 29 0 60 1 2\n" + whites + end, 8,
          "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
         {"another patch among rounded ones",
@@ -57,10 +57,10 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
          8, "patch 2 should be 40 27 27 0, and row 2 is 40 27 29 0"},
         {"another patch in another order",
          made + "2 40 27 29 0 60 1 2\n" + whites + "1 100 0 0 0 55 -37 -50\n" + end, 8,
-         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not asked for"},
+         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not requested"},
         {"another patch among rounded ones in another order",
          made + "2 40 27 29 0 60 1 2\n" + whites + "1 99.7 0 0 0 55 -37 -50\n" + end, 8,
-         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not asked for"},
+         "no patch 2, which is 40 27 27 0, and row 1, which is 40 27 29 0, was not requested"},
         {"rounded and in another order",
          made + "2 40.4 27 27 0 60 1 2\n" + whites + "1 100 0 0 0 55 -37 -50\n" + end, 8,
          "in another order and their device values are rounded"},
@@ -71,14 +71,14 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         {"another condition",
          made.substr(0, made.find("M1")) + "M2" + made.substr(made.find("M1") + 2) + two + whites +
              end,
-         12, "was measured under M2, and the job asks for M1"},
-        {"no colours", head + format(cmyk) + rows + end, 7, "holds no measured colours"},
+         12, "was measured under M2, but the job requires M1"},
+        {"no colours", head + format(cmyk) + rows + end, 7, "has no measured colours"},
     };
     for (const auto& c : cases) {
         SCOPED_TRACE(c.what);
         const bool wide = std::string(c.what) == "in another order";
         m_folder.write("export.txt", wide ? support::utf16(c.text, "LE") : c.text);
-        // A relative path starts from the settings.
+        // A relative path is relative to the settings file.
         const std::string settings = "instrument = file\nfile = export.txt\n";
         if (c.exitCode != 0) {
             expectFailure(measure(definition, settings), c.exitCode, c.words);
@@ -95,7 +95,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         EXPECT_EQ(set.conditions.measurement, states ? "M1" : "");
         EXPECT_EQ(m_log.find("does not state its measurement condition") == m_log.npos, states);
     }
-    // Of an export with several conditions, the one that the job asks for.
+    // From an export with several conditions, takes the one that the job requires.
     const auto object = [](const char* cyan, const char* condition, const char* L) {
         return std::string("<Object Id='1'><DeviceColorValues><ColorCMYK><Cyan>") + cyan +
                "</Cyan><Magenta>0</Magenta><Yellow>0</Yellow><Black>0</Black></ColorCMYK>"
@@ -122,7 +122,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
         EXPECT_EQ(set.lab[0].L, L);
         EXPECT_EQ(set.conditions.measurement, std::string("M") + number);
     }
-    // What the settings permit, and what the definition leaves open.
+    // Permitted by the settings, or not specified by the definition.
     m_folder.write("export.txt",
                    labels + "0004 95 0 -3\n0001 55 -37 -50\n0002 60 1 2\n3 95 0 -2\n" + end);
     EXPECT_EQ(measured(definition, "instrument = file\nfile = export.txt\nmatch = ids\n").lab[3].b,
@@ -132,7 +132,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
     m_folder.write("export.txt",
                    std::regex_replace(made, std::regex("M1"), "M3") + two + whites + end);
     EXPECT_EQ(measured(anyCondition, "instrument = file\nfile = export.txt\n").patchCount, 4u);
-    expectFailure(measure(definition, "instrument = file\nfile = missing\n"), 7, "is not there");
+    expectFailure(measure(definition, "instrument = file\nfile = missing\n"), 7, "does not exist");
     expectFailure(measure(definition, "instrument = file\nfile = missing/export\nwait = 600\n"), 7,
                   "missing, the folder of the export, can't be used: No such file");
 }
@@ -151,7 +151,7 @@ TEST_F(MeasureTool, WaitsForANewExport) {
     };
     expectFailure(measure(definition, settings + "wait = 1\n"), 7, "was not exported in time");
     {
-        // Another strip first, then a slow program whose file rests before it is done.
+        // First another strip, then a slow program whose file pauses before it is complete.
         const auto first = after(200, [=, this] { m_folder.write("export.txt", wrong); });
         const auto second = after(1500, [=] {
             std::ofstream file(path);
@@ -163,14 +163,14 @@ TEST_F(MeasureTool, WaitsForANewExport) {
         EXPECT_THAT(m_log,
                     testing::ContainsRegex("Waiting for .*export.txt, until 2.*\n.*Not "
                                            "accepted: .*patch 1, which is 100 0 0 0, and row "
-                                           "1, which is 99 0 0 0, was not asked for\n$"));
+                                           "1, which is 99 0 0 0, was not requested\n$"));
     }
     {
         const auto other = after(200, [=, this] { m_folder.write("export.txt", wrong + "\n"); });
         expectFailure(measure(definition, settings + "wait = 2\n"), 8,
-                      "was not asked for; no other export came in time");
+                      "was not requested; no other export arrived in time");
     }
-    // The time is up also while a read of the export blocks.
+    // The time limit also works while a read of the export blocks.
     const std::string pipe = m_folder.path("pipe");
     ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
     const int silent = open(pipe.c_str(), O_RDWR | O_CLOEXEC);

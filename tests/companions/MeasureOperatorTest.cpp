@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the operator sees of a run of the measuring tool: on a terminal, and on a desktop.
+// Output of the measuring tool for the operator: on a terminal and on a desktop.
 #include <atomic>
 #include <chrono>
 #include <cstdint>
@@ -26,7 +26,7 @@ namespace {
 using namespace measuretool;
 using testing::HasSubstr;
 
-/// A desktop that shows notifications, on a session bus of its own.
+/// A desktop that shows notifications, on its own session bus.
 class Desktop {
   public:
     Desktop() {
@@ -51,7 +51,7 @@ class Desktop {
 
     const std::string& address() const { return m_address; }
 
-    /// Each call as a line: "notify REPLACED: TITLE | TEXT", "close NUMBER".
+    /// Each call as one line: "notify REPLACED: TITLE | TEXT", "close NUMBER".
     std::vector<std::string> calls() const {
         const std::lock_guard lock(m_mutex);
         return m_calls;
@@ -132,7 +132,7 @@ TEST_F(MeasureTool, TellsTheOperatorWhoseTurnItIs) {
             m_folder.write("<new>.txt", text);
         }
     });
-    // A terminal: the program's own output comes out of script's.
+    // On a terminal, the output of `script` is the program's output.
     const std::string command = std::string(MEASURE_TOOL) + " " + writeOptions();
     const support::Outcome outcome =
         support::run({"script", "--quiet", "--return", "--command", command, "/dev/null"}, options);
@@ -143,7 +143,7 @@ TEST_F(MeasureTool, TellsTheOperatorWhoseTurnItIs) {
     const std::string path = m_folder.path("<new>.txt");
     const std::string shown = m_folder.path("&lt;new&gt;.txt");
     const std::string problem = ": there is no patch 1, which is 100 0 0 0, and row 1, which is 99 "
-                                "0 0 0, was not asked for";
+                                "0 0 0, was not requested";
     EXPECT_THAT(desktop.calls(),
                 testing::ElementsAre(
                     testing::StartsWith("notify 0: Measure strip.it8 | Export it as " + shown +
@@ -161,11 +161,11 @@ TEST_F(MeasureTool, TellsTheOperatorWhoseTurnItIs) {
     }
 }
 
-// A desktop that does not answer, or none, costs at most a moment.
+// A desktop that does not answer, or none, causes only a short delay.
 TEST_F(MeasureTool, DoesWithoutADesktop) {
     const std::string definition = definitionOf({"100\t0\t0\t0"});
     m_folder.write("definition.it8", definition);
-    // A bus that takes connections and never says a word.
+    // A bus that accepts connections but never answers.
     const int silent = socket(AF_UNIX, SOCK_STREAM | SOCK_CLOEXEC, 0);
     sockaddr_un name{};
     name.sun_family = AF_UNIX;

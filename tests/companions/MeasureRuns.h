@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Runs of the measuring tool on definitions as the writer makes them.
+// Runs the measuring tool on definitions as the writer makes them.
 #pragma once
 
 #include <cmath>
@@ -32,12 +32,12 @@ inline std::string format(const std::string& names) {
     return "BEGIN_DATA_FORMAT\nSAMPLE_ID\t" + names + "\nEND_DATA_FORMAT\n";
 }
 
-/// The lines of a definition end in CR LF.
+/// Converts line ends to CR LF, as in definitions.
 inline std::string crlf(const std::string& text) {
     return std::regex_replace(text, std::regex("\n"), "\r\n");
 }
 
-/// A definition of these patches, such as "100\t0\t0\t0".
+/// A definition of patches such as "100\t0\t0\t0".
 inline std::string definitionOf(const std::vector<std::string>& patches) {
     std::string lines;
     for (std::size_t i = 0; i < patches.size(); ++i) {
@@ -83,7 +83,7 @@ class MeasureTool : public testing::Test {
         return options;
     }
 
-    /// What was measured; empties the folder that it was written to.
+    /// Returns the measurement and empties its folder.
     colour::DataSet takeResult() const {
         m_log = support::exists(m_logPath) ? support::contentsOf(m_logPath) : "";
         std::filesystem::remove(m_logPath);
@@ -97,7 +97,7 @@ class MeasureTool : public testing::Test {
         return set;
     }
 
-    /// Measures with what works.
+    /// Measures, and expects success.
     colour::DataSet measured(const std::string& definition, const std::string& settings) const {
         const support::Outcome outcome = measure(definition, settings);
         EXPECT_EQ(outcome.exitCode, 0) << outcome.error;
@@ -105,7 +105,7 @@ class MeasureTool : public testing::Test {
         return takeResult();
     }
 
-    /// One distinct failure, one line, and no measurement. The log beside it keeps the line.
+    /// Expects one distinct failure, one line, and no measurement. The log must have the line too.
     void expectFailure(const support::Outcome& outcome, int exitCode, const std::string& words,
                        bool isLogged = true) const {
         EXPECT_EQ(outcome.exitCode, exitCode) << words;
@@ -119,7 +119,7 @@ class MeasureTool : public testing::Test {
     const support::ScratchFolder m_folder;
     const std::string m_output = m_folder.path("out/Measured sample.txt");
     const std::string m_logPath = m_folder.path("out/NerovaMeasure.log");
-    mutable std::string m_log; ///< Of the last run.
+    mutable std::string m_log; ///< From the latest run.
 };
 
 } // namespace measuretool

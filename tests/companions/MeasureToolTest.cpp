@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Runs of the measuring tool with the virtual instrument, and what is refused before the first
-// patch.
+// Runs of the measuring tool with the virtual instrument, and refusals before the first patch.
 #include <algorithm>
 #include <chrono>
 #include <string>
@@ -50,7 +49,7 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
         int exitCode = 0;
         const char* words = "";
     } cases[] = {
-        // Names of several bytes and none, in rows that are cut off.
+        // Multi-byte names, and none, in rows that are cut off.
         {table("SAMPLE_NAME\t" + cmyk + colours,
                "1\tGröße a\t100\t0\t0\t0\t55\t-36\t-50\t1\t2\t74.\n"
                "2\t白い 紙\t40\t27\t27\t0\t95.00\t0.00\t0.00\t84.00\n"
@@ -61,13 +60,13 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
         {table(longNames, ("1\t100\t0\t0\t0" + values).substr(0, 511) + "\n" +
                               ("2\t40\t27\t27\t0" + values).substr(0, 511) + "\n" + end),
          simple},
-        // Rows that fill a strip, with columns of their own.
+        // Filling rows, with their own columns.
         {table("SAMPLE_NAME\tCMYK_K\tCMYK_C\tCMYK_M\tCMYK_Y\tSPOT_1",
                "1\tA1\t5\t100\t0\t0\t0\n2" + white + "3" + white + "END_DATA"),
          "1: 100 0 0 5 0; 2: 0 0 0 0 0; 3: 0 0 0 0 0; "},
         {table("RGB_R\tRGB_G\tRGB_B" + lab, "1\t0\t20\t100\t3\t0\t0\n2" + whiteRgb + "END_DATA"),
          "1: 0 20 100; 2: 100 100 100; "},
-        // A strip that was given by hand has lost nothing.
+        // A strip supplied by a person is complete.
         {"CGATS.17\n" + format("SAMPLE_NAME\t" + cmyk) + begin + "1\tGröße\t100\t0\t0\t0\n" + end,
          "1: 100 0 0 0; "},
         {"", "", 4, "is neither"},
@@ -78,14 +77,13 @@ TEST_F(MeasureTool, ReadsEveryDefinition) {
          "row 1 of the definition may have lost"},
         {table(cmyk + "\tSPOT_485", "1\t0\t0\t0\t0\t9\n" + end), "", 5, "other colorants"},
         {table(cmyk, "1\t100\t0\t0\t0\n2\t0\t120\t0\t0\n" + end), "", 4,
-         "row 2 of the definition has 120 for CMYK_M, which is beyond 100 percent"},
-        // The last name may have been SPOT_485, or that of a column before other inks.
+         "row 2 of the definition has 120 for CMYK_M, which is above 100 percent"},
+        // The last name may have been SPOT_485, or a column before other inks.
         {table("Größe\t" + cmyk + "\tLAB_L\tSPOT_4", "1\tx\t0\t0\t0\t0\t50\t20\n" + end), "", 4,
-         "list of columns has lost its end"},
-        {table("Größe\t" + cmyk, "1\tx\t0\t0\t0\t0\n" + end), "", 4,
-         "list of columns has lost its end"},
+         "list of columns is cut off"},
+        {table("Größe\t" + cmyk, "1\tx\t0\t0\t0\t0\n" + end), "", 4, "list of columns is cut off"},
         {table("CMYK_C\tCMYK_M\tCMYK_Y", "1\t0\t0\t0\t100\n" + end), "", 4,
-         "more cells than columns are named"},
+         "more cells than there are column names"},
         {table(cmyk + "\tSPOT_1", "1\t0\t0\t0\t0\t9\n" + end), "", 5, "other colorants"},
     };
     for (const auto& [text, patches, exitCode, words] : cases) {
@@ -132,7 +130,7 @@ TEST_F(MeasureTool, ErrorsHaveTheirSizeAndCanBeRepeated) {
         size += colour::deltaE76(lab, {printed.L + 1, printed.a - 2, printed.b + 0.5}) / 4000;
     }
     EXPECT_NEAR(size, 2, 0.06);
-    EXPECT_THAT(set.instrumentation, HasSubstr("Virtual")); // Nobody is to take it for real.
+    EXPECT_THAT(set.instrumentation, HasSubstr("Virtual")); // Must not pass for a real one.
 
     const auto last = [&](const std::string& more) {
         return measured(definition, settings + more).lab.back().a;
@@ -144,7 +142,7 @@ TEST_F(MeasureTool, ErrorsHaveTheirSizeAndCanBeRepeated) {
 TEST_F(MeasureTool, IsCancelledBySignals) {
     const std::string pipe = m_folder.path("pipe");
     ASSERT_EQ(mkfifo(pipe.c_str(), 0600), 0);
-    // Somebody has the pipe open and never writes, like a share whose server is gone.
+    // The pipe is open for writing, but nobody writes, as on a share with a lost server.
     const int silent = open(pipe.c_str(), O_RDWR | O_CLOEXEC);
     m_folder.write("definition.it8", definitionOf({paper}));
     const std::string options = support::contentsOf(writeOptions());
@@ -202,11 +200,13 @@ TEST_F(MeasureTool, RefusesOptionsSettingsAndPlaces) {
         {options, "instrument = file\nwait = 9\nfile = out/Measured sample.txt", 2,
          "would replace"},
         {replaced("-o\n" + m_output, "-o\n" + m_folder.path("out")), virtualPrint, 9,
-         "is no ordinary file"},
-        {options, virtualPrint + "\nerror = 51", 3, "line 4 wants a number from 0 to 50 for error"},
-        {options, "\xEF\xBB\xBF" + virtualPrint + "error = 51", 3, "line 3 wants"},
+         "is not a regular file"},
+        {options, virtualPrint + "\nerror = 51", 3,
+         "line 4 requires a number from 0 to 50 for error"},
+        {options, "\xEF\xBB\xBF" + virtualPrint + "error = 51", 3, "line 3 requires"},
         {options, virtualPrint + "\x1b[2J\u009b = yes", 3, "\"?[2J?\", which"},
-        {options, "instrument = virtual\nprofile = /usr/share/color/icc/sRGB.icc", 6, "for CMYK"},
+        {options, "instrument = virtual\nprofile = /usr/share/color/icc/sRGB.icc", 6,
+         "not a CMYK profile"},
     };
     for (const auto& c : cases) {
         const std::string path = m_folder.write("options", c.options);
@@ -235,14 +235,14 @@ TEST_F(MeasureTool, KeepsItsLogAndNobodyElsesFile) {
          {std::string("CGATS.17\nand more than a time\n"), old.substr(1)}) {
         EXPECT_EQ(logAfter(other, fails), other);
     }
-    // The measurement itself may have the name.
+    // The measurement itself may have this name.
     std::string options = support::contentsOf(writeOptions());
     options.replace(options.find(m_output), m_output.size(), m_logPath);
     support::run({MEASURE_TOOL, m_folder.write("options", options)}, environmentWith(fails));
     EXPECT_FALSE(support::exists(m_logPath));
 }
 
-// One installation is a whole system root.
+// One installation is a complete system root.
 TEST_F(MeasureTool, IsInstalledWithItsSuite) {
     const support::SuiteRoot root("a root");
     ASSERT_EQ(support::run({CMAKE, "--install", TINTGATE_BINARY_DIR, "--component", "companions",

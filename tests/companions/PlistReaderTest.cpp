@@ -12,7 +12,7 @@ support::Outcome print(const std::string& command, const std::string& path) {
     return support::run({PLIST_READER, "-c", command, path});
 }
 
-// The lists come from another writer, in both forms.
+// Another program writes the lists, in both forms.
 TEST(PlistReader, PrintsOneValueOrNothing) {
     const struct {
         const char* command;

@@ -26,7 +26,7 @@ support::RunOptions withoutDisplay() {
     return options;
 }
 
-/// A job's folder, its name with blanks and a sign outside ASCII, holding both files of a run.
+/// A job's folder with both files of a run. Its name has blanks and a non-ASCII character.
 class Viewer : public testing::Test {
   protected:
     Viewer() {
@@ -48,7 +48,7 @@ class Viewer : public testing::Test {
 
 TEST_F(Viewer, ShowsTheVerdictAndRunsNothingOfATicket) {
     ASSERT_EQ(show().exitCode, 0);
-    // Even what got in as markup is stopped by the page's policy: script, image and handler.
+    // The page's policy blocks even injected markup: script, image and handler.
     std::string page = support::contentsOf(m_page);
     page.insert(page.find("<header>"),
                 "<script>document.documentElement.lang='ran'</script>"
@@ -74,7 +74,7 @@ TEST_F(Viewer, ShowsTheVerdictAndRunsNothingOfATicket) {
         EXPECT_THAT(seen.output, Not(HasSubstr(part)));
     }
 
-    // The worst patch leads the table, with both its colours and all its numbers.
+    // The worst patch is first in the table, with both its colours and all its numbers.
     const std::size_t table = seen.output.find("<tbody>", seen.output.find("id=\"patches\""));
     const std::string first = seen.output.substr(table, seen.output.find("</tr>", table) - table);
     for (const char* part : {"<td class=\"patch\">=2+5 <span class=\"name\">", "100 0 0 0",
@@ -100,7 +100,7 @@ TEST_F(Viewer, NamesWhatTheServerDoesNotHave) {
         EXPECT_EQ(show(options).exitCode, 0);
         return support::contentsOf(m_page);
     };
-    // The run of the meta file was at 10:34:56 UTC, and its measurement half an hour before.
+    // The meta file's run was at 10:34:56 UTC, its measurement half an hour earlier.
     const utimbuf made = {0, 1'714'557'600}; // 10:00 UTC
     const std::string sample = m_folder + "/Measured sample.txt";
     const char* const within[] = {"2024-05-01T10:00:00Z", "2024-05-01T10:34:57Z"};
@@ -150,7 +150,7 @@ TEST_F(Viewer, SortsFindsAndSavesPatches) {
     }
 }
 
-// As results are written now: a patch with other labels on the sheet, and what leaves a doubt.
+// Results in the current format: patches with other labels on the sheet, and warnings.
 TEST_F(Viewer, ShowsWhereAPatchIsOnTheSheetAndWhatIsInDoubt) {
     std::string result = support::contentsOf(data + "output.json");
     const auto change = [&](const std::string& from, const std::string& to) {
@@ -206,7 +206,7 @@ TEST_F(Viewer, ListsAPageARunAndPassesOverWhatIsNone) {
 TEST_F(Viewer, OpensThePageWhereThereIsADisplay) {
     const std::string opener =
         m_scratch.write("xdg-open",
-                        // Neither the viewer nor the browser ends with the terminal.
+                        // The viewer and the browser outlive the terminal.
                         "#!/bin/sh\nkill -HUP $$\nprintf '%s' \"$*\" > \"$OPENED.part\" && mv "
                         "\"$OPENED.part\" \"$OPENED\"\n");
     std::filesystem::permissions(opener, std::filesystem::perms::owner_all);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Whatever the bytes: no crash, no hang, and a data set that is whole, finite and survives writing.
+// For any bytes: no crash, no hang, and a data set that is complete, finite and survives writing.
 #include <algorithm>
 #include <cmath>
 #include <cstddef>
@@ -49,7 +49,7 @@ void checkWhole(const DataSet& set) {
 void checkWriting(const DataSet& set) {
     DataSet back;
     const Failure failure = readCgats(writeCgats(set), {}, back);
-    // Derived values may have left the range in which a file may state them.
+    // Derived values may exceed the range that a file may state.
     const bool isLarge = std::any_of(set.xyz.begin(), set.xyz.end(), [](const Xyz& xyz) {
         return std::abs(xyz.X) > 1e9 || std::abs(xyz.Y) > 1e9 || std::abs(xyz.Z) > 1e9;
     });
@@ -61,7 +61,7 @@ void checkWriting(const DataSet& set) {
     require(back.channels == set.channels && back.device == set.device, "device read back");
     require(set.ids.empty() || back.ids == set.ids, "ids read back");
     require(back.names == set.names, "names read back");
-    // Where statements cancelled out, the one that is written may stand alone now.
+    // If statements cancelled out, the one that is written may now be the only one.
     const auto kept = [](const std::string& before, const std::string& after) {
         return before.empty() || before == after;
     };

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Whatever the bytes: no crash, no hang, and a data set that is whole and finite.
+// For any bytes: no crash, no hang, and a data set that is complete and finite.
 #include <algorithm>
 #include <cmath>
 #include <cstddef>

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Presets made of any bytes: read or refused, never more than that.
+// Presets from any bytes: read or refused, without any other effect.
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>

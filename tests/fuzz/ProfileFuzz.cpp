@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Profiles made of any bytes: opened or refused, and what was opened gives colours or a failure.
+// Profiles from any bytes: opened or refused. An opened one gives colours or a failure.
 #include <cmath>
 #include <cstdint>
 #include <cstdlib>
@@ -9,7 +9,7 @@
 
 extern "C" int LLVMFuzzerTestOneInput(const std::uint8_t* data, std::size_t size) {
     std::string bytes(reinterpret_cast<const char*>(data), size);
-    if (bytes.size() >= 128) { // the header is mended, so that damage reaches the tags
+    if (bytes.size() >= 128) { // repairs the header, so that damage reaches the tags
         bytes.replace(36, 4, "acsp").replace(12, 8, "prtrCMYK");
         for (std::size_t i = 0; i < 4; ++i) {
             bytes[i] = static_cast<char>(size >> (24 - 8 * i));

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Feeds every file of the folders that it is given to a fuzz target, where no fuzzer is built in.
+// Feeds every file of the given folders to a fuzz target, in builds without a fuzzer.
 #include <cstdint>
 #include <cstdio>
 #include <filesystem>

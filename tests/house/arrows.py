@@ -1,12 +1,12 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
-"""Checks that each target sees the headers behind its arrows, and no others.
+"""Checks that each target sees the headers that its dependencies allow, and no others.
 
 arrows.py COMPILER SOURCE_DIR BINARY_DIR TARGET...
 
-The build tree holds, for each target, the headers that it publishes (see/TARGET), those of its own
-(see/TARGET.own) and its include path (arrows/TARGET). Whether a header is found is left to the
-compiler's preprocessor.
+For each target, the build tree contains its published headers (see/TARGET), its private headers
+(see/TARGET.own) and its include path (arrows/TARGET). The compiler's preprocessor decides whether a
+header is found.
 """
 
 import re
@@ -14,12 +14,12 @@ import subprocess
 import sys
 from pathlib import Path
 
-# The table of docs/architecture.md is the one place that states what each target may see.
+# The table in docs/architecture.md is the single source of what each target may see.
 ROW = re.compile(r"^\| `([\w-]+)` \| `[^`]*` \|([^|]*)\|([^|]*)\|[^|]+\|$", re.MULTILINE)
 
 
 def read_table(source_dir):
-    """Of each target, the names of the targets that it sees, and of those that it passes on."""
+    """By target, the names of the targets that it sees, and of the targets that it passes on."""
     rows = ROW.findall((source_dir / "docs" / "architecture.md").read_text(encoding="utf-8"))
     if not rows:
         sys.exit("docs/architecture.md has no table of targets")
@@ -27,7 +27,7 @@ def read_table(source_dir):
             {name: passes.split() for name, _, passes in rows})
 
 
-# Made by the build for everybody who returns or explains an exit code or a status.
+# Generated for every target that returns or explains an exit code or a status.
 FOR_ALL = {"ExitCodes.h", "CompanionStatuses.h"}
 
 
@@ -43,7 +43,7 @@ def seen_by(target, arrows, exposes):
 
 
 def check_circles(arrows):
-    """Yields a sentence for each target that can be reached from itself."""
+    """Yields a sentence for each target that depends on itself."""
     for start in arrows:
         seen, ahead = set(), list(arrows[start])
         while ahead:
@@ -60,12 +60,12 @@ def headers_under(folder):
 
 
 def found(compiler, include_path, headers):
-    """Those of the headers that the compiler finds on an include path."""
+    """The headers that the compiler finds on an include path."""
     source = "".join(
         f'#if __has_include("{header}")\nfound {header}\n#endif\n' for header in headers
     )
     command = [compiler, "-E", "-P", "-x", "c++", *(f"-I{name}" for name in include_path), "-"]
-    # In a folder without headers: the current one counts as that of the source.
+    # Runs in a folder without headers, because the current folder counts as the source's.
     result = subprocess.run(
         command, input=source, capture_output=True, text=True, check=True, cwd="/"
     )
@@ -73,7 +73,7 @@ def found(compiler, include_path, headers):
 
 
 def check_arrows(compiler, binary_dir, targets, arrows, exposes):
-    """Yields a sentence for each header that a target sees and should not, or the reverse."""
+    """Yields a sentence for each header that a target sees but should not, or the reverse."""
     see = binary_dir / "see"
     published = {
         folder.name: headers_under(folder)
@@ -100,9 +100,10 @@ def check_arrows(compiler, binary_dir, targets, arrows, exposes):
 
 
 def check_includes(source_dir):
-    """Yields a sentence for each include that goes around the arrows: not written from the root.
+    """Yields a sentence for each include that is not written from the root.
 
-    Tests and benchmarks, which no target sees, may have helpers beside them or atop their tree.
+    Tests and benchmarks, which no target sees, may have helpers next to them or in their top
+    folder.
     """
     shared = {path.name for path in (source_dir / "tests" / "support").glob("*.h")} | FOR_ALL
     for path in sorted(source_dir.rglob("*")):

@@ -29,7 +29,7 @@ const std::string links = "  <MediaLink/>\n";
 const std::string linkPool = "  </ResourceLinkPool>\n";
 const std::string fresh = padding + sender + media + pool + links + linkPool;
 
-/// A job with one patch, whose measurement comes out as `element`.
+/// A job with one patch and its measurement as `element`.
 class JdfFile : public testing::Test {
   protected:
     JdfFile() {
@@ -57,7 +57,7 @@ class JdfFile : public testing::Test {
     std::string element;
 };
 
-/// What the required delete of all from one token to another leaves of a text.
+/// Applies the required faulty deletion, from one token to another.
 std::string deleted(const std::string& text, const std::string& from, const std::string& to) {
     const auto at = text.find(from);
     const auto count = text.find(to, at) - at;
@@ -96,7 +96,7 @@ TEST_F(JdfFile, ReceivesDateLinkResourceAndMeasurement) {
         {"no pool of links", false, padding + sender + pool, element + padding + stamped + pool},
         {"a pool that ends with the file is none", false, linked + "</ResourcePool>",
          element + linked + "</ResourcePool>"},
-        // The delete that is none:
+        // The deletion that does not delete:
         {"an old date stands twice", false, dated,
          inserted(inserted(deleted(dated, "2020", "\""), "2020", "2025-01-02"), pool, holder)},
         {"an old measurement stays", true, full,
@@ -119,7 +119,7 @@ TEST_F(JdfFile, StaysUntouchedAfterAFailure) {
         job.measurement.numPatches = patches;
         EXPECT_EQ(update(path), code);
     }
-    // More than 900 bytes a patch: numbers as long as they get.
+    // More than 900 bytes per patch: numbers of maximum length.
     std::vector<double> high(300, 1e30);
     std::vector<spectralRow> spectral(100);
     for (spectralRow& row : spectral) {
@@ -136,7 +136,7 @@ TEST_F(JdfFile, StaysUntouchedAfterAFailure) {
     EXPECT_EQ(update(folder.path("missing")), -1);
     EXPECT_EQ(update(folder.path()), -1);
     EXPECT_EQ(update(folder.write("job.jdf", std::string(4999, ' '))), -1);
-    // A program that runs can't be written to, not even by root.
+    // A running program's file can't be written, not even by root.
     fs::copy_file("/bin/sleep", path, fs::copy_options::overwrite_existing);
     fs::permissions(path, fs::perms(0700));
     const support::RunningProgram program(path);
@@ -182,10 +182,10 @@ TEST_F(JdfFile, IsWholeAndAloneAfterARunThatWasKilled) {
     }
 }
 
-#ifndef __SANITIZE_ADDRESS__ // Which takes more room for addresses than a limit may leave.
+#ifndef __SANITIZE_ADDRESS__ // It needs more address space than the limit allows.
 TEST_F(JdfFile, GoesWithoutAnUpdateThatMemoryIsTooSmallFor) {
     const std::string path = folder.write("job.jdf", fresh);
-    job.measurement.numPatches = 1'000'000; // Which may need 900 MB.
+    job.measurement.numPatches = 1'000'000; // May need 900 MB.
     job.measurement.xyz = nullptr;
     const std::pair<rlim_t, int> limits[] = {{500'000'000, -1}, {1'200'000'000, 0}};
     for (const auto& [room, code] : limits) {

@@ -11,8 +11,8 @@
 
 namespace {
 
-/// Two patches with values at the edges of their conversions; tests/data/jdf/measurement.txt is
-/// their element.
+/// Two patches with values at the edges of their conversions. tests/data/jdf/measurement.txt is the
+/// expected element.
 class Element : public testing::Test {
   protected:
     Element() {
@@ -24,7 +24,7 @@ class Element : public testing::Test {
         record.spectral = spectral;
     }
 
-    /// What is written into `abc`, behind its first byte.
+    /// The text inserted into `abc`, after its first byte.
     std::string written(long capacity = 10'000, const wxString& comment = "Proof 100%s") {
         std::string buffer = "abc" + std::string(10'000, '.');
         long length = 3;
@@ -60,17 +60,17 @@ TEST_F(Element, IsThatOfItsStrip) {
     second.insert(second.rfind('>'), "2").insert(second.find(' '), "2");
     header.secondStrip = 1;
     EXPECT_EQ(written(), "a" + second + "bc");
-    header.secondStrip = 2; // no strip, and so no tags of its own
+    header.secondStrip = 2; // not a strip, so without its own tags
     const auto inside = first.find("Approval");
     EXPECT_EQ(written(), "a" + first.substr(inside, first.rfind("</") - inside) + "bc");
 }
 
 TEST_F(Element, LeavesOutWhatIsNotThereAndCutsWhatIsTooLong) {
-    record.spectral = nullptr; // the flag alone makes the count
+    record.spectral = nullptr; // the flag alone determines the count
     record.xyz = record.cmyk = nullptr;
     std::memset(header.cmmVersion, '9', sizeof header.cmmVersion);
     std::memset(header.profileName, 'p', sizeof header.profileName);
-    header.measureDate[0] = '\0'; // the time alone is enough
+    header.measureDate[0] = '\0'; // the time alone is sufficient
     const std::string text = written(10'000, wxString('c', 181));
     for (const std::string& part :
          {"Date=\"\" Time=\"13:37:00\" Comment=\"" + std::string(180, 'c') + "\"",
@@ -87,14 +87,14 @@ TEST_F(Element, CountsEachPieceAgainstTheLimit) {
     const std::string whole = written();
     const auto size = static_cast<long>(whole.size());
     EXPECT_EQ(written(size + 1), whole);
-    // One byte less: the closing tag has no room.
+    // One byte less: the closing tag does not fit.
     EXPECT_EQ(written(size), whole.substr(0, whole.find("</tazo:M")) + "bc");
     EXPECT_EQ(code, -30);
-    // Of the last spectrum the last piece has no room; those of more than 200 bytes before it stay.
+    // The last piece of the last spectrum does not fit; its pieces of more than 200 bytes stay.
     const std::string cut = written(size - 20);
     EXPECT_EQ(cut, whole.substr(0, cut.size() - 2) + "bc");
     EXPECT_GT(cut.size() - 2, whole.find("<tazo:SpectralData1") + 400);
-    // Up to FileSpec a piece is tried though those before it had no room.
+    // Up to FileSpec, a piece is tried even if earlier ones did not fit.
     const auto third = whole.find("Spectral");
     const std::string some = whole.substr(0, whole.find("Approval")) +
                              whole.substr(third, whole.find("<FileSpec") - third) + "bc";

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A job on a store of the test's own, and a processor that reaches it through the real comm bundle.
+// A job on the test's own store, and a processor that accesses it through the real comm bundle.
 #pragma once
 
 #include <charconv>
@@ -32,14 +32,14 @@ class JobOnStore : public testing::Test {
         engine = store::openStore(address);
         engine->putUser({"press", hash, false});
         engine->create(3, job);
-        CLogger::InitLogger(logPath()); // Once one is open, the processor opens none of its own.
+        CLogger::InitLogger(logPath()); // The processor then opens no log of its own.
         processor.emplace();
         processor->m_connector = new CKZConnector(std::wstring(address.begin(), address.end()),
                                                   L"press", L"room", 0x5071103, false, false);
         EXPECT_TRUE(processor->m_connector->IsLoggedIn());
     }
 
-    /// Sends a table, in the words of TicketText.h.
+    /// Sends a table in the notation of TicketText.h.
     void set(const std::string& records, int id = job) const {
         store::CachingStorage keep(engine);
         support::RecordTable table(records);
@@ -60,7 +60,7 @@ class JobOnStore : public testing::Test {
         return all;
     }
 
-    /// The log's messages since the last time.
+    /// The log's messages since the previous takeLog.
     std::string takeLog() const {
         CLogger::DeleteLogger();
         const std::string text = std::regex_replace(support::contentsOf(logPath()),
@@ -89,6 +89,6 @@ class JobOnStore : public testing::Test {
         return std::to_string(std::get<int>(value));
     }
 
-    /// Hashing is slow by intent.
+    /// Computed once, because hashing is slow by design.
     inline static const std::string hash = store::passwordHash("room");
 };

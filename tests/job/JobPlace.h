@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// A place where the real program verifies jobs as a client has it do: a store, a system root with
-// the suite in it, and a temporary folder.
+// A place in which the real program verifies jobs for a client: a store, a system root with the
+// suite, and a temporary folder.
 #pragma once
 
 #include <atomic>
@@ -45,7 +45,7 @@ inline constexpr char makeExample[] = R"sh(
     done
     "$3" -s "$2/store" file put "$2/made/server" /server)sh";
 
-/// The arguments of a job form that are not the usual ones.
+/// The arguments of the job form that differ from the usual ones.
 struct Call {
     std::string job = "7";
     std::string strip = "0";
@@ -55,11 +55,11 @@ struct Call {
     std::string remeasure = {}; ///< Empty: none.
 };
 
-/// A system root with the viewer, a temporary folder, and a store with the example job 7, which
-/// holds its measurement, and 8, which is to be measured.
+/// A system root with the viewer, a temporary folder, and a store with the example jobs: 7 has its
+/// measurement, 8 is to be measured.
 class Place {
   public:
-    /// More jobs are lists of options of make-job.py, with a comma between two.
+    /// `moreJobs` is a comma-separated list of option lists for make-job.py.
     explicit Place(const std::string& moreJobs = {}) {
         fs::copy(example(moreJobs).path("store"), address, fs::copy_options::recursive);
         m_root.installPlistReader(PLIST_READER);
@@ -77,8 +77,7 @@ class Place {
         return m_root.write(name, text);
     }
 
-    /// Puts a measuring tool in its place, by default ours with its virtual instrument. Returns its
-    /// path.
+    /// Installs a measuring tool, by default ours with its virtual instrument. Returns its path.
     std::string installTool(const std::string& settings = {},
                             const std::string& program = MEASURING_TOOL) const {
         m_root.writePreferences("ApplicationsUsingNerovaMeasure_x64.plist",
@@ -121,7 +120,7 @@ class Place {
 
     support::Outcome run(const Call& call = {}) const { return run(words(call)); }
 
-    /// The messages of the job's log, with marks for the folders; empty where there is none.
+    /// The messages of the job's log, with placeholders for the folders. Empty if there is no log.
     std::string log() const {
         const std::string file = temporary + "/Tintgate/TintgateKZ.log";
         std::string text = support::exists(file) ? support::contentsOf(file) : "";
@@ -132,7 +131,7 @@ class Place {
 
     std::shared_ptr<store::StoreEngine> engine() const { return store::openStore(address); }
 
-    /// Changes a ticket, in the words of TicketText.h.
+    /// Changes a ticket, in the notation of TicketText.h.
     void set(const std::string& records, int id = 7, int type = 3) const {
         store::CachingStorage keep(engine());
         ASSERT_TRUE(keep.apply(type, id, support::RecordTable(records).records())) << records;
@@ -155,13 +154,13 @@ class Place {
         return all;
     }
 
-    /// What the server shows of a job: 208 to be verified, 211 passed, 212 failed.
+    /// The job's status on the server: 208 to be verified, 211 passed, 212 failed.
     int status(const std::string& job) const {
         const auto content = engine()->content(3, std::stoi(job), store::KeyFilter());
         return std::get<int>(*content->find("Job/Display/Status")->first());
     }
 
-    /// What the viewer was started with. It is not waited for, so it may be late.
+    /// The viewer's arguments. The tool does not wait for the viewer, so this may have to.
     std::string shown() const {
         for (int i = 0; i < 200 && !support::exists(path("shown")); ++i) {
             std::this_thread::sleep_for(std::chrono::milliseconds(20));
@@ -170,7 +169,7 @@ class Place {
     }
 
   private:
-    /// Made once; a store is copied like any folder.
+    /// Created once; a store can be copied like any folder.
     static const support::ScratchFolder& example(const std::string& moreJobs) {
         static std::map<std::string, support::ScratchFolder> folders;
         const auto [found, isNew] = folders.try_emplace(moreJobs);
@@ -192,10 +191,10 @@ class Place {
   public:
     const std::string address = m_root.path("store");
     std::string temporary = m_root.path("tmp");
-    std::unique_ptr<support::RunningProgram> beside; ///< A program that runs for as long.
+    std::unique_ptr<support::RunningProgram> beside; ///< A program running during the test.
 };
 
-/// Most of a run is waiting, so several go side by side.
+/// Runs mostly wait, so several run in parallel.
 template<class Work>
 void sideBySide(std::size_t count, Work work) {
     std::atomic<std::size_t> next = 0;

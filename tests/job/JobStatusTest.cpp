@@ -16,12 +16,12 @@ TEST_F(JobStatus, IsClosedOnceAllStripsHaveAResult) {
         std::string ticket;
         bool approved;
         int code;
-        int status; ///< 0 where the job stays as it is.
+        int status; ///< 0 if the job is unchanged.
         std::string log;
     } cases[] = {
         {"Workflow/Verify/Active=1", true, 0, 211, single},
         {"other=1", true, -1, 211, single},
-        {"Workflow/Verify/Active=3.0", false, -1, 212, single}, // Of another type: not there.
+        {"Workflow/Verify/Active=3.0", false, -1, 212, single}, // Another type counts as missing.
         {two + second, true, 0, 0, twoLine + "Read Approvals1, err=-1, iTmp==-1\n"},
         {two + first, true, 0, 0, twoLine + firstLines + "Read Approvals2, err=-1, iTmp==-1\n"},
         {two + first + second, true, 0, 211,

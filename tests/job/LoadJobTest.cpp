@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A ticket in; the record, the job's folder and the code out.
+// Loads jobs: a ticket in; the record, the job's folder and the code out.
 #include <filesystem>
 #include <map>
 #include <sstream>
@@ -12,10 +12,10 @@
 
 namespace {
 
-/// What a load gives, by name. Files stand as the server's path that their copy is from.
+/// The result of a load, by name. A file is shown as the server path of its original.
 using Members = std::map<std::string, std::string>;
 
-/// Every file of the server holds its own path, so that a copy tells where it came from.
+/// Every file of the server contains its own path, so that a copy shows its origin.
 constexpr char serverFiles[] =
     "ControlCharts/.it8 ControlCharts/abc.it8 ControlCharts/nest.it8 ControlCharts/strip.it8 "
     "IT8_CharacterizationData/Fogra_MKCheck10/x_MKCheck10_MKCheck11.it8 "
@@ -24,7 +24,7 @@ constexpr char serverFiles[] =
     "jdf/whole.jdf profile.icc profile2.icc tickets/CVP_0007.xml tickets/CVP_0010.xml "
     "tickets/CVP_1000.xml";
 
-// An ordinary job, not measured so far, with characterisation data as its references.
+// An ordinary job, not measured yet, with characterization data as its references.
 constexpr char usualTicket[] =
     "System/InstallFolder='/s Input/Title='Title CMM/PaperName='Paper Workflow/Name='Flow "
     "Footer/Dynstrip/UseDynstrip=0 Footer/ControlstripFile='strip.it8 "
@@ -59,7 +59,7 @@ class LoadJob : public JobOnStore {
         ASSERT_TRUE(keep.apply(27, id, support::RecordTable(records).records()));
     }
 
-    /// Where the file at a path of the job's folder is from; for one of our own its name.
+    /// The origin of a file in the job's folder. For a file that the tool wrote, its name.
     static std::string shown(const KZJobDataStruct& job, const wxString& path) {
         if (path.empty() || !path.StartsWith(job.tempDir)) {
             return path.utf8_string();
@@ -82,8 +82,8 @@ class LoadJob : public JobOnStore {
         return text.str();
     }
 
-    /// Id, name, file, the ticket's four numbers, which entries are used, limits and decimals;
-    /// whether it is of the PSD kind.
+    /// Id, name, file, the ticket's four numbers, the used entries, limits and decimals; whether it
+    /// is of the PSD kind.
     static std::string presetOf(const KZJobDataStruct& job) {
         const tolerancePresetParameterRecord& preset = job.tolerance;
         const int flags[] = {preset.editable, preset.showInClient, preset.usedForDynamicWedge,
@@ -152,8 +152,8 @@ class LoadJob : public JobOnStore {
     }
 
     struct Case {
-        std::string changes; ///< Of the usual ticket.
-        std::string outcome; ///< The members that they change.
+        std::string changes; ///< Changes to the usual ticket.
+        std::string outcome; ///< The members that differ as a result.
     };
 
     void expectOutcomes(const std::vector<Case>& cases, int secondStrip = 0) {
@@ -168,7 +168,7 @@ class LoadJob : public JobOnStore {
 };
 
 TEST_F(LoadJob, AnUsualJob) {
-    // The preset is not of the PSD kind, whatever its ticket says.
+    // The preset is not of the PSD kind, even if its ticket says so.
     EXPECT_EQ(differences(membersOf({}, 0), m_usual),
               "device=33 formula=4 jdf=/s/jdf/job.jdf jdfServer=/s/jdf/job.jdf mode=2 "
               "preset=7 Proof /s/tickets/CVP_0007.xml 1,1,1,3 1,0,1 1.5,2.5,0 2,0 0 "
@@ -183,7 +183,7 @@ TEST_F(LoadJob, FindsTheControlStrip) {
     expectOutcomes({
         {name + "'/any/where/abc.ti3" + nested, "strip=/s/ControlCharts/abc.it8"},
         {name + "'abc" + nested, "strip=/s/ControlCharts/nest.it8"},
-        // Without a strip there is no workflow, and so no references and no preset.
+        // Without a strip, there is no workflow, so no references and no preset.
         {name + "'abc", "device=0 formula=0 preset=none reference= strip= workflow=0"},
         {name + "'none.it8", "device=0 strip="},
         {dynamic, "device=0 dynstrip=1 reference= strip= workflow=0"},
@@ -217,7 +217,7 @@ TEST_F(LoadJob, FindsReferences) {
         {workflow + "1" + first + "'/s/profile.icc" + other, "reference=/s/profile.icc workflow=1"},
         {workflow + "1" + first + "'" + other, "reference=/s/profile2.icc workflow=1"},
         {workflow + "1" + first + "'\xff" + other, "reference= workflow=1"},
-        {stored + "2" + other, "reference=/s/profile2.icc workflow=3"}, // Not measured so far.
+        {stored + "2" + other, "reference=/s/profile2.icc workflow=3"}, // Not measured yet.
         {stored + "2 Remote/Measurement/Status=2",
          "patches=2 reference=/Measured reference.txt status=2 type=3 workflow=3"},
         {esko, "formula=0 jdf= preset=none reference= workflow=4"},
@@ -234,7 +234,7 @@ TEST_F(LoadJob, GoesOnWithoutWhatIsMissing) {
         {"Remote/Measurement/Illumination/Mode='two Remote/Measurement/Status='many "
          "CMM/PaperName=- Workflow/Name=7 Input/Title=-",
          "mode=1 texts=,,"},
-        // Without an install folder the switch behind it is not read, and a lookup still made.
+        // Without an install folder, the following switch is not read, but lookups continue.
         {"System/InstallFolder=- Footer/Dynstrip/UseDynstrip=1 "
          "Workflow/Verify/CharacterizationData='/s/a(TEMP)/MKCheck10.it8",
          "device=0 preset=7 Proof  1,1,1,3 1,0,1 1.5,2.5,0 2,0 0 "
@@ -309,7 +309,7 @@ TEST_F(LoadJob, DecidesTheType) {
     });
 }
 
-// Measured while printing: values and mode come from the ticket, and there is nothing to measure.
+// Measured while printing: values and mode come from the ticket, and nothing is to be measured.
 TEST_F(LoadJob, KnowsInlineInstruments) {
     const std::string device = "Input/SubType=96 Footer/Dynstrip/UseDynstrip=1 "
                                "Footer/Dynstrip/IT8='/s/dyn/dyn.it8 "
@@ -366,7 +366,7 @@ TEST_F(LoadJob, TheSecondStripHasKeysOfItsOwn) {
     expectOutcomes({cases[0]}, -1);
 }
 
-// By requirement: the fixture's own has asked before.
+// Required. The fixture's processor was the first to ask.
 TEST_F(LoadJob, OnlyTheFirstProcessorHasAFolder) {
     EXPECT_EQ(processor->SetWorkingDir(), wxString());
     const support::ScratchFolder temporary;

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Runs of the real program on jobs, as a client starts it: arguments and a store in; the exit code,
-// the log, the job's folder and the tickets out.
+// Runs the real program on jobs as a client does: arguments and a store in; the exit code, the log,
+// the job's folder and the tickets out.
 #include <atomic>
 #include <chrono>
 #include <filesystem>
@@ -43,13 +43,13 @@ using testing::HasSubstr;
 struct Case {
     std::string what;
     int code;
-    std::string log; ///< Is in it.
+    std::string log; ///< Must appear in the log.
     std::function<void(Place&)> prepare = {};
     Call call = {};
 };
 
-/// The log of a run that comes to its job ends in its code. A job to be measured whose run fails
-/// stays one, and the viewer gets JSON of every run that does not.
+/// If a run reaches its job, its log ends with its code. A job whose measurement fails stays to be
+/// measured. The viewer gets JSON from every run that does not fail.
 void expectRuns(const std::vector<Case>& cases) {
     std::vector<Place> places(cases.size());
     std::vector<support::Outcome> outcomes(cases.size());
@@ -79,7 +79,7 @@ void expectRuns(const std::vector<Case>& cases) {
     }
 }
 
-/// Preparations.
+/// Changes before a run.
 auto setting(const std::string& records) {
     return [=](const Place& place) { place.set(records); };
 }
@@ -124,7 +124,7 @@ TEST(Verification, ComparesStoredValuesAndShowsThem) {
     EXPECT_EQ(place.administer({"export"}), before);
     EXPECT_EQ(support::modeOf(place.temporary + "/Tintgate/TintgateKZ.log"), 0600u);
 
-    // The file forms say the same of the two files.
+    // The file forms must give the same result for the two files.
     const std::string result = place.path("files.json");
     const support::Outcome files = place.run(std::vector<std::string>{
         TINTGATE_PROGRAM, place.jobFile("Measured reference.txt"),
@@ -166,7 +166,7 @@ TEST(Verification, EndsWithTheCodeOfWhatWentWrong) {
          setting("Remote/Measurement/Numpatches=-")},
         {"no sample", 105, "Measurement file not found = JOB/Measured sample.txt",
          blocked("Measured sample.txt")},
-        // On this road a missing reference is left to the analysis.
+        // For a comparison, the analysis reports a missing reference.
         {"no references", 20,
          "Reference file not found = \nReference file = \n"
          "Measurement file = JOB/Measured sample.txt\nanalyzeMeasurements returns = 20\n",
@@ -185,7 +185,7 @@ TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
     const auto tool = [](const std::string& settings, bool withReferences = true) {
         return [=](const Place& place) {
             place.installTool(settings);
-            // An old measurement, which must not be taken for a new one.
+            // An old measurement, which must not be mistaken for a new one.
             place.write("tmp/Tintgate/JobID_8/Measured sample.txt", "old");
             if (!withReferences) {
                 fs::remove(place.address + "/files/server/default_cmyk.icc");
@@ -200,7 +200,7 @@ TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
         const std::string path = place.installTool("", "/bin/sleep");
         place.beside = std::make_unique<support::RunningProgram>(path);
     };
-    // An instrument that measures the second strip while it prints: there is nothing to measure.
+    // An inline instrument measures the second strip during printing: nothing is to be measured.
     const Call second = {.strip = "1"};
     const auto inlineStrip = [](const std::string& device) {
         return [=](const Place& place) {
@@ -227,7 +227,7 @@ TEST(Verification, MeasuresAndEndsWithTheCodeOfWhatWentWrong) {
     });
 }
 
-// Whatever a ticket holds, a run ends with a code and without much memory.
+// Any ticket content must give an exit code without using much memory.
 TEST(Verification, BearsHostileTickets) {
     const std::string root = "Remote/Measurement/";
     const std::pair<std::string, int> tickets[] = {
@@ -253,7 +253,7 @@ TEST(Verification, BearsHostileTickets) {
     expectRuns(cases);
 }
 
-// Names outside ASCII in a locale that has no such characters.
+// Non-ASCII names in a locale without these characters.
 TEST(Verification, KeepsEveryCharacterInEveryLocale) {
     Place place;
     place.temporary = place.path("d\xc3\xa9p\xc3\xb4t \xe5\x88\xb7");
@@ -279,7 +279,7 @@ TEST(Verification, ReadsItsArgumentsByPlace) {
         int code;
     } cases[] = {
         {"x KEY_KZ_HOST y:" + place.address, "7", 0},
-        {"KEY_KZ_HOST", "7", 150}, // A host of this name.
+        {"KEY_KZ_HOST", "7", 150}, // Used as the host's name.
         {"KEY_KZ_HOST:a:" + place.address, "K::7 and more", 0},
         {place.address, "7", 255},
         {"KEY_KZ_HOST:" + place.address, "seven", -1},
@@ -301,7 +301,7 @@ TEST(Verification, StartsTheViewerWithoutAJob) {
     EXPECT_EQ(place.run({.job = "-1"}).exitCode, 255);
 }
 
-// What a job writes holds passwords, and in a shared folder anybody may make names.
+// A job writes passwords, and anybody can create names in a shared folder.
 TEST(Verification, UsesNoFolderOfOthers) {
     const Place place;
     fs::create_directories(place.path("theirs"));
@@ -310,7 +310,7 @@ TEST(Verification, UsesNoFolderOfOthers) {
     EXPECT_TRUE(fs::is_empty(place.path("theirs")));
 }
 
-// Kills a run some milliseconds after its JDF has changed, so while it writes the job's keys.
+// Kills a run some milliseconds after its JDF has changed, i.e. while it writes the job's keys.
 constexpr char killWhileItWrites[] = R"sh(
     jdf=$1; delay=$2; shift 2
     "$@" & run=$!

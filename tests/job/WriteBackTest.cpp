@@ -17,7 +17,7 @@ namespace {
 using Keys = std::map<std::string, std::string>;
 using testing::HasSubstr;
 
-/// A print of two patches, with numbers that differ wherever one could stand for another.
+/// A print of two patches. All numbers differ, so that mix-ups are detected.
 class WriteBack : public JobOnStore {
   protected:
     WriteBack() {
@@ -38,7 +38,7 @@ class WriteBack : public JobOnStore {
         return processor->CopyResulDataToJobTicket(id, print, results, remeasure);
     }
 
-    /// Of a ticket that no other test has written to.
+    /// The keys of a new ticket after a write-back.
     Keys freshKeys() {
         engine->remove(3, job);
         engine->create(3, job);
@@ -54,7 +54,7 @@ class WriteBack : public JobOnStore {
     analyseResultsRecord results;
 };
 
-/// What both strips write of the values of a print's patches, below their root.
+/// Keys that both strips write for a print's patches, below their root.
 const Keys patchKeys = {
     {"SpectralValues/Stepsize", "20"},
     {"SpectralValues/Base", "380"},
@@ -92,7 +92,7 @@ TEST_F(WriteBack, WritesTheKeysOfItsStripAndNoOther) {
         engine->remove(3, job);
         engine->create(3, job);
         const std::string root = second ? "Remote/Measurement2/" : "Remote/Measurement/";
-        // What was there before: a number that a remeasure keeps, and a longer array.
+        // Existing values: a number that a remeasure keeps, and a longer array.
         set(root + "Status=9 " + root + "LabValues/LValues=1.0,2.0,3.0,4.0 General/ParentID=5");
 
         print.secondStrip = second ? 1 : 0;
@@ -136,14 +136,14 @@ TEST_F(WriteBack, WritesTheKeysOfItsStripAndNoOther) {
 }
 
 TEST_F(WriteBack, PutsResultsInTheServersOrder) {
-    // Entries of the results by position. Position 12 has none of the values.
+    // Entries of the results by position. Position 12 has no value.
     const int values[] = {0,  1,  2,  3,  4,  5,  6,  7,  14, 12, 19, 20, -1, 27,
                           13, 28, 29, 32, 33, 30, 31, 36, 34, 37, 38, 39, 26};
     const int verdicts[] = {6,  7,  8,  9,  4,  0,  1,  5,  12, 10, 13, 3,  2, 19,
                             11, 20, 21, 24, 25, 22, 23, 28, 26, 27, 30, 31, 18};
     unsigned char approvals[presetValueCount];
     unsigned char decimals[presetValueCount];
-    std::iota(std::begin(approvals), std::end(approvals), 100); // Beyond 127 on the way.
+    std::iota(std::begin(approvals), std::end(approvals), 100); // Some exceed 127.
     std::iota(std::begin(decimals), std::end(decimals), 200);
     std::memcpy(results.approvals, approvals, sizeof approvals);
     std::memcpy(results.decimals, decimals, sizeof decimals);
@@ -174,7 +174,7 @@ TEST_F(WriteBack, PutsResultsInTheServersOrder) {
     }
 }
 
-// Counts of a measurement that another vendor's library left damaged are not believed.
+// Invalid counts in a measurement, left by another vendor's library, are rejected.
 TEST_F(WriteBack, LeavesOutArraysThatAreNotThere) {
     const Keys groupLetters = {{"CMYKValues/KValues", "c"},
                                {"LabValues/LValues", "l"},
@@ -185,14 +185,14 @@ TEST_F(WriteBack, LeavesOutArraysThatAreNotThere) {
     const struct {
         int patches, length;
         double *xyz, *lab, *cmyk;
-        std::string present; ///< One letter for each group of keys that there is.
+        std::string present; ///< One letter for each group of keys that is present.
     } cases[] = {
         {2, 0, xyz, lab, cmyk, "clnx"},
-        {2, 1, none, none, cmyk, "cns"}, // Fewer samples than a patch has values.
-        {2, 37, xyz, lab, cmyk, ""},     // More than a row holds.
+        {2, 1, none, none, cmyk, "cns"}, // Fewer samples than values in a row.
+        {2, 37, xyz, lab, cmyk, ""},     // More than a row can have.
         {2, -1, xyz, lab, cmyk, ""},
         {0, 3, xyz, lab, cmyk, ""},
-        {1'000'001, 3, xyz, lab, cmyk, "n"}, // More than there is memory for.
+        {1'000'001, 3, xyz, lab, cmyk, "n"}, // More than memory allows.
         {2, 3, xyz, lab, none, "lnsx"},
     };
     for (const auto& [patches, length, withXyz, withLab, withCmyk, present] : cases) {
@@ -233,7 +233,7 @@ class WriteBackToJdf : public WriteBack {
         print.measurementWorkflow = 3;
     }
 
-    /// Writes back with a fresh JDF at hand, and gives what the server then has.
+    /// Writes back with a fresh JDF and returns the server's new version.
     std::string delivered() {
         std::ofstream(print.jdfLocalFile.utf8_string()) << jdf;
         EXPECT_EQ(copy(), 0);
@@ -285,7 +285,7 @@ TEST_F(WriteBackToJdf, TellsThePartiesWhatWasMeasured) {
         EXPECT_THAT(text, HasSubstr("<" + party + " printdate=\"2"));
         EXPECT_EQ(text, support::contentsOf(print.jdfLocalFile.utf8_string()));
     }
-    print.measurementWorkflow = 2; // It is neither changed nor uploaded.
+    print.measurementWorkflow = 2; // The JDF is neither changed nor uploaded.
     EXPECT_NE(delivered(), jdf);
     EXPECT_EQ(support::contentsOf(print.jdfLocalFile.utf8_string()), jdf);
 }
@@ -307,7 +307,7 @@ TEST_F(WriteBack, AddsErrorsBehindThoseThatAreThere) {
     EXPECT_EQ(keys()["Process/ErrorMessage"], "'k_TintgateError: 106,'k_TintgateError: -5");
     EXPECT_EQ(processor->WrietErrorToJobTicket(1, job + 1), -1);
 
-    // Behind what can be read as text: the number goes, the text stays.
+    // Appends after the readable texts: the number is replaced, the text stays.
     set("Process/ErrorMessage[-1]='a Process/ErrorMessage[1]=5 Process/ErrorMessage[2]='c");
     EXPECT_EQ(processor->WrietErrorToJobTicket(7, job), 0);
     EXPECT_EQ(keys()["Process/ErrorMessage"], "'a,'k_TintgateError: 7,'c");

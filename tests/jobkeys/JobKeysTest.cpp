@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Facts about tickets that no program exercises with all their cases.
+// Facts about tickets that no program covers completely.
 #include <map>
 #include <string>
 #include <vector>
@@ -48,7 +48,7 @@ TEST(JobKeys, FindsThePositionOfEachVerdictThatATicketHas) {
     }
 }
 
-/// The keys that a lookup reads of a ticket, and what it gives.
+/// The keys that a lookup reads from a ticket, and its result.
 template<class LookUp>
 std::string traceOf(const std::map<std::string, std::string>& ticket, LookUp lookUp) {
     std::string trace;
@@ -82,7 +82,7 @@ TEST(JobKeys, ReadsAFurtherKeyOnlyIfItIsNeeded) {
 
 TEST(JobKeys, TakesTheFirstWayToReferencesThatApplies) {
     using enum ReferenceWay;
-    // By workflow 0 to 5; bits: 1 of a packaging workflow, 2 a dynamic strip, 4 stored references.
+    // By workflow 0 to 5. Bits: 1 packaging workflow, 2 dynamic strip, 4 stored references.
     const ReferenceWay expected[8][6] = {
         {None, Profile, Characterisation, Profile, None, None},
         {None, Profile, Characterisation, Profile, Packaging, None},

@@ -20,7 +20,7 @@ bool isIcuLoaded() {
 
 } // namespace
 
-// First of all tests, since others load it.
+// Must be the first test, because others load the library.
 TEST(CodePages, LoadIcuForNothingButItsOwnPages) {
     EXPECT_EQ(decoded("ASCII", kCFStringEncodingMacRoman), u"ASCII");
     EXPECT_EQ(decoded("\x8A", kCFStringEncodingMacCroatian), u"ä");

@@ -21,7 +21,7 @@ CFPlugInRef open(const std::string& path) {
     return CFPlugInCreate(nullptr, url.get());
 }
 
-/// What the first factory for the type makes; null without a factory.
+/// The object of the first factory for the type. Null without a factory.
 void* firstInstance(CFPlugInRef plugIn) {
     const Owned<CFStringRef> text(CFStringCreateWithCString(nullptr, type, 0));
     const Owned<CFUUIDRef> uuid(CFUUIDCreateFromString(nullptr, text.get()));

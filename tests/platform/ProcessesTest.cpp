@@ -57,7 +57,7 @@ TEST(Processes, AreThoseThatRunBelowTheRoot) {
     const support::SuiteRoot root;
     const RunningProgram first(root.copyProgram("/bin/sleep", "bin/First"));
     const RunningProgram second(root.copyProgram("/bin/sleep", "Second.app/run"));
-    std::filesystem::remove(root.path("bin/First")); // Replaced while it runs.
+    std::filesystem::remove(root.path("bin/First")); // Replaced while running.
     EXPECT_EQ(runningNames(), (Names{u"First", u"Second"}));
     std::filesystem::create_directory_symlink(root.path(), root.path("link"));
     setenv("TINTGATE_ROOT", root.path("link/").c_str(), 1);
@@ -68,10 +68,10 @@ TEST(Processes, AreThoseThatRunBelowTheRoot) {
 
     EXPECT_EQ(killProcess(second.number()), noErr);
     EXPECT_EQ(second.endingSignal(), SIGTERM);
-    EXPECT_EQ(runningNames(), Names{u"First"}); // Though nobody has waited for the second.
+    EXPECT_EQ(runningNames(), Names{u"First"}); // The second is a zombie.
     for (const pid_t stranger : {second.number(), 0, 1, -1, getppid()}) {
         EXPECT_EQ(killProcess(stranger), procNotFound) << stranger;
     }
-    unsetenv("TINTGATE_ROOT"); // Then this test is an application too.
+    unsetenv("TINTGATE_ROOT"); // This test then counts as an application too.
     EXPECT_EQ(killProcess(getpid()), procNotFound);
 }

@@ -22,7 +22,7 @@ TEST(SystemRoot, CountsOnlyWhereItCanStandInACommand) {
     unsetenv("TINTGATE_ROOT");
 }
 
-// Every character there is, held against the C library.
+// Compares every character with the C library.
 TEST(WideBytes, AgreeWithTheLocalesUtf8) {
     ASSERT_NE(std::setlocale(LC_CTYPE, "C.UTF-8"), nullptr);
     for (wchar_t c = 1; c <= 0x10FFFF; c += c == 0xD7FF ? 0x801 : c < 0x11000 ? 1 : 251) {

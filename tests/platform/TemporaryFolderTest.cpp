@@ -8,7 +8,7 @@
 #include "ScratchFolder.h"
 #include "platform/TemporaryFolder.h"
 
-// Children run in folders of their own, and find the folder in the same variable.
+// Children run in other folders and find the folder in the same variable.
 TEST(TemporaryFolder, IsAbsoluteForChildrenToo) {
     const support::ScratchFolder scratch;
     scratch.makeFolder("a b");

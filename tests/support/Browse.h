@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Pages as a browser shows them.
+// Shows pages in a browser.
 #pragma once
 
 #include <string>
@@ -9,12 +9,12 @@
 
 namespace support {
 
-/// Opens a local page in headless Chromium. The document as its scripts leave it is in `output`,
-/// what its console got in `error`. The profile is in the scratch folder.
+/// Opens a local page in headless Chromium. `output` is the document after its scripts have run,
+/// `error` the console's output. The profile is in the scratch folder.
 Outcome browse(const ScratchFolder& scratch, const std::string& page);
 
-/// Shows a page with a script at its end for a person's hand, which the page's policy has to let in
-/// for once. The script notes what it sees: seen("name", "text") adds "[name: text]" to the page.
+/// Shows a page with an additional script that acts like a person; the page's policy is changed to
+/// allow it. In the script, seen("name", "text") adds "[name: text]" to the page.
 Outcome browseHandled(const ScratchFolder& scratch, const std::string& page,
                       const std::string& script);
 

@@ -1,3 +1,3 @@
 // SPDX-License-Identifier: Apache-2.0
-// Nothing but a place for the headers that tests share in precompiled form.
+// Exists only to precompile the headers that tests share.
 int main() {}

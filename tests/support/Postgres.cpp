@@ -21,7 +21,7 @@ std::string environment(const char* name) {
     return value == nullptr ? "" : value;
 }
 
-/// That of the shared server, which a room hides.
+/// The shared server's file, which a room hides.
 const std::string& sharedServiceFile() {
     static const std::string file = environment(serviceFile);
     if (file.empty()) {
@@ -31,7 +31,7 @@ const std::string& sharedServiceFile() {
     return file;
 }
 
-/// One database for each process, since making one takes a tenth of a second.
+/// One database per process, since creating one takes a tenth of a second.
 const std::string& databaseOfProcess() {
     static const std::string name = [] {
         const std::string made = "test_" + std::to_string(getpid());
@@ -67,7 +67,7 @@ std::string BarePostgres::run(const std::string& statements) const {
 PostgresRoom::PostgresRoom() {
     setenv(serviceFile, sharedServiceFile().c_str(), 1);
     const std::string database = databaseOfProcess();
-    // Of lines for the same thing, the first counts.
+    // The first of several lines for the same setting counts.
     const std::string shared = contentsOf(sharedServiceFile());
     m_lines = "dbname=" + database + shared.substr(shared.find('\n'));
     setenv(serviceFile, m_folder.write("pg_service.conf", "[room]\n" + m_lines).c_str(), 1);
@@ -85,7 +85,7 @@ void PostgresRoom::addService(const std::string& name, const std::string& lines)
 }
 
 PostgresServer::PostgresServer() : m_former(environment(serviceFile)) {
-    // Outside of the build tree: in reach of the server's user, and with a short path.
+    // Outside the build tree, so that the server's user has access and the path is short.
     std::string folder = "/tmp/tintgate-server-XXXXXX";
     if (mkdtemp(folder.data()) == nullptr) {
         throw std::runtime_error("no folder for a server");
@@ -99,7 +99,7 @@ PostgresServer::~PostgresServer() {
     setenv(serviceFile, m_former.c_str(), 1);
     try {
         control("remove");
-    } catch (const std::exception&) { // What is left is in /tmp.
+    } catch (const std::exception&) { // Leaves files in /tmp.
     }
 }
 
@@ -118,7 +118,7 @@ void PostgresServer::control(const std::string& word, const std::string& more) c
         command.push_back(more);
     }
     RunOptions options;
-    options.environment["PG_OPTIONS"] = "-c fsync=off"; // No disk fails in these tests.
+    options.environment["PG_OPTIONS"] = "-c fsync=off"; // Disks don't fail in these tests.
     const Outcome outcome = support::run(command, options);
     if (outcome.exitCode != 0) {
         throw std::runtime_error(word + ": " + outcome.error);

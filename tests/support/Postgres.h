@@ -11,13 +11,13 @@ struct pg_conn;
 
 namespace support {
 
-/// A connection for what a test does behind a store's back. Throws std::runtime_error.
+/// A connection that bypasses the store. Throws std::runtime_error.
 class BarePostgres {
   public:
-    /// To a connection service.
+    /// Connects to a connection service.
     explicit BarePostgres(const std::string& service);
 
-    /// Runs SQL; the first value of the last statement's result, or "".
+    /// Runs SQL and returns the first value of the last statement's result, or "".
     std::string run(const std::string& statements) const;
     pg_conn* get() const { return m_connection.get(); }
 
@@ -25,9 +25,9 @@ class BarePostgres {
     std::unique_ptr<pg_conn, void (*)(pg_conn*)> m_connection;
 };
 
-/// An empty database on the server that the tests share: ctest starts it, and for a program run by
-/// hand scripts/with-postgres.sh. While this lives, PGSERVICEFILE leads to it by the service
-/// "room".
+/// An empty database on the server shared by the tests. ctest starts that server; for a program run
+/// by hand, scripts/with-postgres.sh does. During its lifetime, the service "room" in PGSERVICEFILE
+/// refers to it.
 class PostgresRoom {
   public:
     PostgresRoom();
@@ -35,7 +35,7 @@ class PostgresRoom {
     PostgresRoom(const PostgresRoom&) = delete;
     PostgresRoom& operator=(const PostgresRoom&) = delete;
 
-    /// Adds a service with these lines in place of the room's, which it has otherwise.
+    /// Adds a service like the room's, with these lines replaced.
     void addService(const std::string& name, const std::string& lines) const;
 
   private:
@@ -43,8 +43,8 @@ class PostgresRoom {
     std::string m_lines;
 };
 
-/// A server of a test's own, to be stopped. While this lives, PGSERVICEFILE leads to it by the
-/// service "tintgate".
+/// A private server that a test can stop. During its lifetime, the service "tintgate" in
+/// PGSERVICEFILE refers to it.
 class PostgresServer {
   public:
     PostgresServer();
@@ -59,7 +59,7 @@ class PostgresServer {
     void control(const std::string& word, const std::string& more = {}) const;
 
     std::string m_folder;
-    std::string m_former; ///< PGSERVICEFILE.
+    std::string m_former; ///< The previous PGSERVICEFILE.
 };
 
 } // namespace support

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tickets of the real engine, for tests: records are copied, so that a test can replace single
+// Tickets of the real engine for tests. Records are copied, so that a test can replace single
 // words.
 #pragma once
 
@@ -19,9 +19,9 @@
 #include "ticket/TicketUpdateList.h"
 #include "ticket/TicketViews.h"
 
-constexpr int jobs = 3; ///< The type of a server's tickets.
+constexpr int jobs = 3; ///< The type of a job's tickets.
 
-/// A work ticket, addressed by its own record.
+/// A work ticket, accessed through its own record.
 class WorkTicket {
   public:
     explicit WorkTicket(const std::string& content = "") {
@@ -36,10 +36,10 @@ class WorkTicket {
     WorkTicket& operator=(const WorkTicket&) = delete;
 
     const STICKET_MODIFY& view() const { return ticket::as<STICKET_MODIFY>(record); }
-    /// The engine's own record, which is what a transfer takes as a source.
+    /// The engine's own record, required as the source of a transfer.
     const STICKET_ACCESS* real() const { return m_real; }
 
-    /// Sends a table; its records' results.
+    /// Sends a table and returns the results of its records.
     std::string send(const std::string& records) const {
         support::RecordTable table(records);
         table.records()->result = 1;
@@ -63,7 +63,7 @@ inline std::shared_ptr<store::TicketStorage> memoryKeep() {
     return std::make_shared<store::MemoryStorage>();
 }
 
-/// Where the tickets of a new Server are, unless it is told.
+/// Creates the tickets' storage for a new Server, unless one is given.
 inline std::function<std::shared_ptr<store::TicketStorage>()> newKeep = memoryKeep;
 
 /// A session with a server.
@@ -93,7 +93,7 @@ class Server {
     MTICKET_ACCESS record;
 };
 
-/// An empty ticket 12 of a server, addressed through its container.
+/// An empty ticket 12 of a server, accessed through its container.
 class TicketInside : public Server {
   public:
     static constexpr int id = 12;
@@ -103,14 +103,14 @@ class TicketInside : public Server {
     std::string send(const std::string& records) const { return Server::send(id, records); }
     std::string content() { return Server::content(id); }
 
-    /// Calls with the view, and type and id behind it.
+    /// Calls with the view, followed by type and id.
     template<class Call>
     auto with(Call call) const {
         return call(view(), jobs, id);
     }
 };
 
-/// Sets and deletions as RecordTable reads them; false as soon as one is refused.
+/// Applies sets and deletions in the notation of RecordTable. False at the first refusal.
 inline bool edit(TICKET_UPDATE_LIST& list, int type, int id, const std::string& edits) {
     support::RecordTable table(edits);
     const SETMULTIPAR* r = table.records();

@@ -13,7 +13,7 @@
 #include <sys/wait.h>
 #include <unistd.h>
 
-extern "C" { // Which this header does not say itself.
+extern "C" { // The header itself lacks this.
 #include <sys/pidfd.h>
 }
 
@@ -21,8 +21,8 @@ namespace support {
 
 namespace {
 
-/// A file in memory for what a program prints. Unlike a pipe it never fills up, and does not stay
-/// open for a child that the program leaves behind.
+/// A file in memory for a program's output. Unlike a pipe, it never fills up and is not kept open
+/// by a child that the program leaves behind.
 class Printed {
   public:
     Printed() : descriptor(memfd_create("printed", MFD_CLOEXEC)) {
@@ -73,14 +73,14 @@ std::vector<char*> pointersTo(std::vector<std::string>& texts) {
     return pointers;
 }
 
-// In the child, which must not allocate: another thread may have held the heap's lock at the fork.
-// Its group is its own, so that a time limit ends its children too.
+// Runs in the child, which must not allocate: another thread may have held the heap's lock at the
+// fork. It gets its own process group, so that a time limit ends its children too.
 [[noreturn]] void become(char* const* arguments, char* const* environment, int output, int error,
                          const RunOptions& options) {
     setpgid(0, 0);
     dup2(open("/dev/null", O_RDONLY), STDIN_FILENO);
     dup2(error, STDERR_FILENO);
-    // An ordinary user may not be able to reach the build tree, so the program is opened before.
+    // An ordinary user may not have access to the build tree, so the program is opened first.
     int program = -1;
     if (options.user != 0) {
         program = open(arguments[0], O_RDONLY | O_CLOEXEC);
@@ -121,7 +121,7 @@ Outcome run(const std::vector<std::string>& command, const RunOptions& options) 
     if (child == 0) {
         become(arguments.data(), variables.data(), output.descriptor, error.descriptor, options);
     }
-    setpgid(child, child); // Here as well, so that it is done whoever comes first.
+    setpgid(child, child); // Done in both processes, in any order.
 
     Outcome outcome;
     outcome.timedOut = !awaitEnd(child, options.limit);

@@ -16,7 +16,7 @@ RunningProgram::RunningProgram(const std::string& path) {
     std::string program = path;
     char seconds[] = "60";
     char* arguments[] = {program.data(), seconds, nullptr};
-    // Returns when the program has taken the place of the child.
+    // Returns after the child has executed the program.
     if (posix_spawn(&m_number, path.c_str(), nullptr, nullptr, arguments, environ) != 0) {
         throw std::runtime_error("can't start " + path);
     }

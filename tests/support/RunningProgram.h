@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A program that runs beside the test.
+// A program that runs during a test.
 #pragma once
 
 #include <string>
@@ -8,8 +8,8 @@
 
 namespace support {
 
-/// Started with the argument "60", which lets a copy of sleep(1) run as anything; killed with this
-/// object. While it is not, an ended program stays as a process that nobody has waited for.
+/// Started with the argument "60", so that a copy of sleep(1) can pose as any program. Killed with
+/// this object. Until then, a program that has ended stays as a zombie.
 class RunningProgram {
   public:
     explicit RunningProgram(const std::string& path);
@@ -19,7 +19,7 @@ class RunningProgram {
 
     pid_t number() const { return m_number; }
 
-    /// The signal that has ended the program, or ends it within half a second; else 0.
+    /// The signal that has ended the program or ends it within half a second; otherwise 0.
     int endingSignal() const;
 
   private:

@@ -12,7 +12,7 @@
 namespace support {
 
 ScratchFolder::ScratchFolder() {
-    // Below /tmp rather than the build tree, which an ordinary user may not be able to reach.
+    // In /tmp instead of the build tree, to which an ordinary user may have no access.
     char path[] = "/tmp/tintgate-test-XXXXXX";
     if (mkdtemp(path) == nullptr) {
         throw std::runtime_error("no scratch folder");

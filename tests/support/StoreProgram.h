@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The administration tool, run on a store of a test's own.
+// Runs the administration tool on the test's own store.
 #pragma once
 
 #include <string>

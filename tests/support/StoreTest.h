@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A store of a test's own, and processes that work on it.
+// The test's own store, and processes that use it.
 #pragma once
 
 #include <cstdio>
@@ -24,7 +24,7 @@
 #include "store/StoreEngine.h"
 #include "store/sqlite/Sqlite.h"
 
-/// Starts work in a process of its own, which ends with what work returns; 99 after an exception.
+/// Runs `work` in a new process, whose exit code is its result, or 99 after an exception.
 inline pid_t startProcess(const std::function<int()>& work) {
     const pid_t child = fork();
     if (child == 0) {
@@ -46,13 +46,13 @@ inline int endOf(pid_t child) {
     return WIFEXITED(status) ? WEXITSTATUS(status) : 1000 + WTERMSIG(status);
 }
 
-/// TINTGATE_ROUNDS asks for more rounds than those that every run of the tests takes.
+/// TINTGATE_ROUNDS requests more rounds than the usual number.
 inline int roundsOr(int usual) {
     const char* const wanted = std::getenv("TINTGATE_ROUNDS");
     return wanted == nullptr ? usual : std::atoi(wanted);
 }
 
-/// All that is in a ticket, in the words of TicketText.h.
+/// All content of a ticket, in the notation of TicketText.h.
 inline std::string contentText(const store::TicketContent& content) {
     std::vector<SETMULTIPAR> table;
     content.walk(support::collect, &table);
@@ -62,7 +62,7 @@ inline std::string contentText(const store::TicketContent& content) {
 
 enum class Engine { Sqlite, Postgres };
 
-/// For a suite of tests that hold wherever a store is.
+/// For test suites that apply to both kinds of store.
 #define ON_BOTH_ENGINES(Suite)                                                                     \
     INSTANTIATE_TEST_SUITE_P(                                                                      \
         , Suite, testing::Values(Engine::Sqlite, Engine::Postgres), [](const auto& info) {         \
@@ -71,10 +71,10 @@ enum class Engine { Sqlite, Postgres };
 
 class StoreTest : public testing::TestWithParam<Engine> {
   public:
-    /// Sends a table as a session would; what became of it and of its records.
+    /// Sends a table like a session. Returns the results of the table and of its records.
     static std::string send(store::StoreEngine& engine, int type, int id,
                             const std::string& records) {
-        // The keep is gone before the engine is.
+        // The storage must be destroyed before the engine.
         store::CachingStorage keep(std::shared_ptr<store::StoreEngine>(&engine, [](auto*) {}));
         support::RecordTable table(records);
         const bool taken = keep.apply(type, id, table.records());
@@ -99,7 +99,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
         return to.str();
     }
 
-    /// What a file held before, the oldest first.
+    /// Previous contents of a file, oldest first.
     static std::vector<std::string> versions(store::StoreEngine& engine, const std::string& path) {
         std::vector<std::string> texts;
         for (const auto& version : engine.versions(path)) {
@@ -111,7 +111,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
         return texts;
     }
 
-    /// The fault that work ends with; nothing where it does not fail.
+    /// The fault of a failed `work`; nothing if it succeeds.
     static std::optional<store::Fault> faultOf(const std::function<void()>& work) {
         try {
             work();
@@ -130,7 +130,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
 
     std::unique_ptr<store::StoreEngine> open() const { return store::openStore(address); }
 
-    /// Runs SQL behind the store's back: the first text where it is a folder, else the second.
+    /// Runs SQL directly: the first text if the store is a folder, otherwise the second.
     void sql(const std::string& sqlite, const std::string& postgres) const {
         if (room) {
             support::BarePostgres("room").run(postgres);
@@ -146,6 +146,6 @@ class StoreTest : public testing::TestWithParam<Engine> {
     }
 
     const support::ScratchFolder folder;
-    const std::unique_ptr<support::PostgresRoom> room; ///< Null where the store is a folder.
+    const std::unique_ptr<support::PostgresRoom> room; ///< Null if the store is a folder.
     const std::string address;
 };

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // Parameters as short lines of text, so that a table of test cases shows them side by side.
 //
-// Records are parted by blanks and read key[position]=value:
+// Records are separated by blanks and have the form key[position]=value:
 //
 //   a[-1]=5      int               b[0]=2.5     double; also nan, inf, -inf
 //   c[1]='text   string            d[-1]=#00ff  binary, in hexadecimal
@@ -9,8 +9,8 @@
 //   g[0]=U5      unsigned 64-bit   h[0]=p16     pointer
 //   i[-1]=-      deletion
 //
-// Without a position a list of values is a whole vector as it is sent: a=1,2,3 stands for
-// a[-1]=1 a[1]=2 a[2]=3.
+// Without a position, a list of values is a whole vector as it is sent: a=1,2,3 means a[-1]=1
+// a[1]=2 a[2]=3.
 #pragma once
 
 #include <charconv>
@@ -28,7 +28,7 @@
 
 namespace support {
 
-/// Of hexadecimal digits, two a byte; blanks between bytes are passed over.
+/// Converts hexadecimal digits, two per byte. Blanks between bytes are skipped.
 inline std::string bytesOf(const std::string& digits) {
     std::string bytes;
     for (std::size_t i = 0; i + 1 < digits.size(); i += digits[i] == ' ' ? 1 : 2) {
@@ -105,7 +105,7 @@ inline bool collect(void* records, const char* key, PARAM_TYPE type, const void*
     return true;
 }
 
-/// What a walk shows of a ticket, as a table.
+/// A ticket's values in the order of a walk, as a table.
 inline std::vector<SETMULTIPAR> walked(const STICKET_ACCESS& access) {
     std::vector<SETMULTIPAR> table;
     ticket::single::Walk::call(access, collect, static_cast<void*>(&table), "", 8000);
@@ -113,12 +113,12 @@ inline std::vector<SETMULTIPAR> walked(const STICKET_ACCESS& access) {
     return table;
 }
 
-/// The same in words; "null" for none.
+/// The same as text; "null" if there is no ticket.
 inline std::string ticketText(const STICKET_ACCESS* access) {
     return access == nullptr ? "null" : tableText(walked(*access).data());
 }
 
-/// A table made of text, with all that it points to.
+/// A table parsed from text. Owns everything that it points to.
 class RecordTable {
   public:
     explicit RecordTable(const std::string& text) {
@@ -157,7 +157,7 @@ class RecordTable {
     void add(const std::string& key, const std::string& value, int position) {
         SETMULTIPAR record;
         const bool again = !m_records.empty() && key == m_records.back().key;
-        // One address, as a list gives it.
+        // Equal keys share one address, as in a list.
         record.key = again ? m_records.back().key : own(key)->c_str();
         record.position = position;
         const std::string rest = value.substr(value.empty() ? 0 : 1);

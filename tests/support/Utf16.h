@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Text in UTF-16, as export programs of desktop systems write it.
+// Text in UTF-16, as written by export programs of desktop systems.
 #pragma once
 
 #include <stdexcept>
@@ -9,7 +9,7 @@
 
 namespace support {
 
-/// The UTF-8 text in UTF-16 with its byte order mark. `order` is "LE" or "BE".
+/// Converts UTF-8 text to UTF-16 with a byte order mark. `order` is "LE" or "BE".
 inline std::string utf16(const std::string& text, const std::string& order) {
     const iconv_t conversion = iconv_open(("UTF-16" + order).c_str(), "UTF-8");
     std::string source = "\xEF\xBB\xBF" + text;

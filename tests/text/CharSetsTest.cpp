@@ -31,7 +31,7 @@ TEST(CharSets, FindsMultiByteSequences) {
          {"", "ASCII", "\xC4", "\xE2\x82x", "\x80\x80", "\xF0\x9F\x98", "\xF1\x80\x80\x80"}) {
         EXPECT_FALSE(CharSets::IsUtf8Coded(text)) << text;
     }
-    EXPECT_FALSE(CharSets::IsUtf8Coded("\0\xC3\xA4"s)); // behind the terminator
+    EXPECT_FALSE(CharSets::IsUtf8Coded("\0\xC3\xA4"s)); // after the terminator
 }
 
 TEST(CharSets, CopiesWithinBounds) {
@@ -42,7 +42,7 @@ TEST(CharSets, CopiesWithinBounds) {
     CharSets::Utf82Win(field, "X", 0);
     EXPECT_EQ(std::string(field, 8), "abc\0\0ZZ\0"s);
 
-    // Any method but the first is new[], which a sanitizer tells from malloc.
+    // Any method but the first is new[], which a sanitizer distinguishes from malloc.
     const std::unique_ptr<char[]> copy(
         CharSets::DuplicateAndConvert("\xE4 b", CharSets::WIN2UTF8, CharSets::ALLOC_METHOD(7)));
     EXPECT_STREQ(copy.get(), "\xE4 b");
@@ -55,10 +55,10 @@ TEST(FilterString, AppliesRulesInTheirOrder) {
     EXPECT_EQ(only("abcd\xE4\xF6"), "abc\xE4");
 
     CharSets::FilterString all(true);
-    all.setRemove('\x80', '\xFF'); // as unsigned bytes, so not an empty range
+    all.setRemove('\x80', '\xFF'); // unsigned, so not an inverted range
     all.setReplace('x', 'z', '.');
     all.setReplace("qr", '\0');
-    all.setRemove('9', '0'); // first above last
+    all.setRemove('9', '0'); // inverted range
     all.setBypass("z");
     EXPECT_EQ(all("a0q9\xE4xyz\xFF"), "a09..z");
 }

@@ -12,14 +12,14 @@ TEST(CharSetsWx, ConvertsWhatHoldsNoMultiByteSequence) {
         int (*convert)(void*, std::string&, const char*);
         std::string source;
         int result;
-        std::string target; ///< "old" where it stays.
+        std::string target; ///< "old" if unchanged.
     } cases[] = {
         {toIo, "ASCII", 1, "ASCII"},
         {toIo, "\x80\xDB\xF0", 1, "Ä€\xEF\xA3\xBF"},
         {toIo, "Grün", 0, "old"},
         {toIo, std::string(4094, 'a'), 1, std::string(4094, 'a')},
         {toIo, std::string(4095, 'a'), 2, "old"},
-        {toIo, std::string(2047, '\x80') + "\xDB", 2, "old"}, // 4094 bytes and three
+        {toIo, std::string(2047, '\x80') + "\xDB", 2, "old"}, // 4094 bytes plus three
         {toControls, "ASCII", 1, "ASCII"},
         {toControls, "Grün", 0, "old"},
         {toControls, "ab\xE4", 2, "old"},
@@ -35,7 +35,7 @@ TEST(CharSetsWx, ConvertsWhatHoldsNoMultiByteSequence) {
 TEST(CharSetsWx, ConvertsBetweenTwoEncodings) {
     constexpr unsigned utf8 = 0x08000100;
     std::string target = "old";
-    // Nothing is dropped in silence.
+    // Nothing is dropped silently.
     EXPECT_EQ(CharSetsWx::Io2Controls(target, "soft\u00ADhyphen", utf8, 0), 2);
     EXPECT_EQ(CharSetsWx::Io2Controls(target, nullptr, utf8, 0), 0);
     EXPECT_EQ(target, "old");
@@ -47,7 +47,7 @@ TEST(CharSetsWx, ConvertsBetweenTwoEncodings) {
 
 TEST(CharSetsWx, ConvertsWxStringsAndPointers) {
     const wxString umlaut = wxString::FromUTF8("Grün");
-    for (const char* locale : {"C", "C.UTF-8"}) { // the first has no 8 bits for it
+    for (const char* locale : {"C", "C.UTF-8"}) { // the first has no 8-bit form for it
         ASSERT_NE(std::setlocale(LC_CTYPE, locale), nullptr);
         EXPECT_EQ(CharSetsWx::Controls2Io(umlaut), umlaut);
     }

@@ -15,7 +15,7 @@ TEST(LocaleSettings, TakesTheFirstKnownLanguageOfTheUsersList) {
         EXPECT_EQ(LocaleSettings::GetSystemLanguageString(), row[2]) << row[0];
         EXPECT_EQ(LocaleSettings::GetMacSystemEncoding(), std::stoi(row[3])) << row[0];
     }
-    // Ranges of numbers, of which a user's language is always the first.
+    // Ranges of numbers; a user's language is always the first number of a range.
     for (const auto& [number, identifier] :
          {std::pair{999, 1033}, {7, 1025}, {50, 1028}, {51, 1033}, {199, 3082}}) {
         EXPECT_EQ(LocaleSettings::GetSystemCodePage(number), identifier) << number;
@@ -25,7 +25,7 @@ TEST(LocaleSettings, TakesTheFirstKnownLanguageOfTheUsersList) {
 TEST(LocaleSettings, AsksTheVariablesInTheirOrder) {
     const char* const names[] = {"LANGUAGE", "LC_ALL", "LC_MESSAGES", "LANG"};
     const struct {
-        const char* values[4]; ///< Null for a variable that is not set.
+        const char* values[4]; ///< Null if the variable is not set.
         int number;
     } cases[] = {
         {{}, 59},

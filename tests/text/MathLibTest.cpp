@@ -32,7 +32,7 @@ TEST(MathLib, RoundsAndConvertsLikeExactArithmetic) {
     for (const auto& row : support::readCsv("text/integers.csv")) {
         EXPECT_EQ(U64ToDouble(std::stoull(row[0])), fromBits(row[1])) << row[0];
     }
-    // Adding a half carries it over, though it is nearer to 0.
+    // Adding a half rounds up to 1, although it is nearer to 0.
     EXPECT_EQ(Round(0.49999999999999994), 1.0);
 }
 

@@ -16,7 +16,7 @@ TEST(StringUtilsComGUI, NarrowsAndWidensWithoutConversion) {
 TEST(StringUtilsComGUI, ConvertsWideTextToUtf8) {
     const std::pair<std::wstring, std::string> cases[] = {
         {L"aä€", "aä€"},           {{0xD83D, 0xDE00}, "\U0001F600"}, // a pair is one character,
-        {L"\U0001F600", "\uF600"}, // and one that needs a pair is cut to 16 bits
+        {L"\U0001F600", "\uF600"},                                   // above 16 bits: truncated
         {L"a\U00010000b", "a"},    {{L'a', 0xD83D}, "old"},
     };
     for (const auto& [text, expected] : cases) {

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tests of lists and flushes that run wherever tickets are kept: in memory and in a store of each
-// kind.
+// Tests of lists and flushes that run in all places for tickets: in memory and in each kind of
+// store.
 #pragma once
 
 #include <memory>
@@ -16,8 +16,8 @@
 
 enum class Place { Memory, Sqlite, Postgres };
 
-/// While it lives, each Server that names no place of its own gets an empty one of this kind. They
-/// share a store, so that only the last one made may be used.
+/// During its lifetime, each Server created without a place gets an empty one of this kind. They
+/// share a store, so only the latest one may be used.
 class AnyPlace : public testing::TestWithParam<Place> {
   protected:
     AnyPlace() {

@@ -9,7 +9,7 @@ namespace {
 class Flush : public AnyPlace {};
 IN_ANY_PLACE(Flush);
 
-/// A server that remembers each table that is sent to it.
+/// A server that records each table sent to it.
 class Recorder : public Server {
   public:
     Recorder() {
@@ -41,7 +41,7 @@ TEST_P(Flush, SendsTheDifferenceAlone) {
     } cases[] = {
         {each, each, ""},
         {each, other, other},
-        // Single elements, where they are fewer than the whole.
+        // Single elements, if they are fewer than the whole.
         {"a=1,2,3,4,5", "a[0]=9 a[4]='x", "a[0]=9 a[4]='x"},
         {"a=1,2,3", "a[3]=4 a[4]=5", "a[3]=4 a[4]=5"},
         {"a=1,2,3,4,5", "a[4]=- a[3]=-", "a[4]=- a[3]=-"},
@@ -55,7 +55,7 @@ TEST_P(Flush, SendsTheDifferenceAlone) {
         // Deleted keys.
         {"a[-1]=1 c[-1]=3", "c[-1]=- b[-1]=- a[-1]=-", "a[-1]=- c[-1]=-"},
         {"a=1,2", "a[1]=- a[0]=-", "a[-1]=-"},
-        // What never equals itself is sent with the whole ticket, but not beside a deleted key.
+        // Values unequal to themselves are sent with the whole ticket, but not if a key is deleted.
         {unequal, "c[-1]=2", "b[-1]=#00ff c[-1]=2 d[-1]=nan e[-1]=nan"},
         {unequal, "c[-1]=-", "c[-1]=-"},
     };
@@ -68,15 +68,15 @@ TEST_P(Flush, SendsTheDifferenceAlone) {
         EXPECT_EQ(list.FlushToContainer(&server.record, &count, {}), !sent.empty());
         EXPECT_EQ(server.sent, sent.empty() ? "" : "3/13 " + sent + ";") << present << " " << edits;
         EXPECT_EQ(count, static_cast<unsigned long>(std::ranges::count(sent, '=')));
-        EXPECT_TRUE(list.FlushToContainer(&server.record, &count, {})); // Nothing is left.
+        EXPECT_TRUE(list.FlushToContainer(&server.record, &count, {})); // Nothing is left to send.
         EXPECT_EQ(count, 0u);
     }
 }
 
-// After a flush the server's ticket is what the same edits make of a ticket directly. Left out,
+// After a flush, the server's ticket equals a ticket with the same edits made directly. Excluded,
 // since a flush can't send them: holes, infinities, the sign of zero.
 TEST_P(Flush, EqualsTheEditsMadeDirectly) {
-    // Few different values, so that many edits change nothing, and some deletions.
+    // Few different values, so that many edits change nothing. Includes deletions.
     const char* const values[] = {"-", "-",  "-",  "1",  "2",   "3",   "1",   "2",  "3",   "'1",
                                   "-", "'2", "u1", "l1", "l-2", "U18", "1.5", "p1", "#01", "nan"};
     const char* const keys[] = {"a", "b", "ab", "c"};
@@ -101,7 +101,7 @@ TEST_P(Flush, EqualsTheEditsMadeDirectly) {
             unsigned long count = 0;
             server.engine.get(jobs, direct, key.c_str(), PARAM_COUNT, &count, POSITION_WHOLE);
             const int end = static_cast<int>(count);
-            int position = upTo(end + 2) - 2; // Up to behind the end, which leaves no hole.
+            int position = upTo(end + 2) - 2; // At most one after the end, so without holes.
             if (value == "-" && (position == POSITION_APPEND || position == end)) {
                 position = POSITION_WHOLE;
             }
@@ -121,7 +121,7 @@ TEST_P(Flush, BearsAPlugInThatShowsAnElementTwice) {
     EXPECT_TRUE(ticket::difference(present, wanted).empty());
 }
 
-/// Appends substitutions as "type -1>3;" and "id -9999>1;" to a text.
+/// Appends replacements such as "type -1>3;" and "id -9999>1;" to a text.
 TICKET_UPDATE_CALLBACK writeTo(std::string& text) {
     const auto append = [](void* context, bool isId, int from, int to) {
         *static_cast<std::string*>(context) += std::string(isId ? "id " : "type ") +
@@ -131,14 +131,14 @@ TICKET_UPDATE_CALLBACK writeTo(std::string& text) {
     return {append, &text};
 }
 
-using Ids = std::map<int, int>; ///< Real ones by the virtual ones that a flush replaced.
+using Ids = std::map<int, int>; ///< Real ids by the virtual ids that a flush replaced.
 
 TEST_P(Flush, CreatesVirtualTicketsFirst) {
     Recorder server;
     TICKET_UPDATE_LIST list(&server.record);
     edit(list, jobs, 12, "a[-1]=2");
     edit(list, jobs, -9998, "a=1,2");
-    edit(list, 50, -9997, "a[-1]=1"); // Filed under type -1, for which there is no fallback.
+    edit(list, 50, -9997, "a[-1]=1"); // Stored under type -1, which has no default type.
     edit(list, TICKET_TYPE_LOCAL, 7, "a[-1]=1");
     std::string substitutions;
     unsigned long count = 0;
@@ -163,7 +163,7 @@ TEST_P(Flush, OfOneTicketLeavesTheOthers) {
     } cases[] = {
         {TICKET_TYPE_LOCAL, 7, true, 7, ""},
         {jobs, -9998, true, 13, "3/13 a[-1]=3;"},
-        {jobs, -9998, false, -9998, ""}, // Nothing is pending there any longer.
+        {jobs, -9998, false, -9998, ""}, // No longer pending there.
         {51, 12, false, 12, ""},
         {jobs, 12, true, 12, "3/12 a[-1]=2;"},
     };
@@ -183,7 +183,7 @@ TEST_P(Flush, OfOneTicketLeavesTheOthers) {
     EXPECT_FALSE(list.IsEmpty(jobs, 14) || list.IsEmpty(TICKET_TYPE_LOCAL, 7));
 }
 
-// Of what a plug-in answers for a table and for a record bit 0 counts.
+// Only bit 0 of a plug-in's result for a table or a record counts.
 TEST_P(Flush, SucceedsWhereAnyRecordDid) {
     static std::pair<int, std::uint8_t> answer;
     for (const auto& each : {std::pair(1, 3), {1, 2}, {2, 1}}) {
@@ -197,7 +197,7 @@ TEST_P(Flush, SucceedsWhereAnyRecordDid) {
         TICKET_UPDATE_LIST list(&server.record);
         edit(list, jobs, 12, "a[-1]=2 b[-1]=3");
         EXPECT_EQ(list.FlushToContainer(&server.record, nullptr, {}), answer.second == 3);
-        EXPECT_TRUE(list.IsEmpty(jobs, 12)); // Nothing is tried again.
+        EXPECT_TRUE(list.IsEmpty(jobs, 12)); // Nothing is retried.
     }
 }
 
@@ -213,7 +213,7 @@ TEST_P(Flush, FailsWithoutTicketsOfItsOwn) {
     EXPECT_FALSE(list.IsEmpty(jobs, 12));
     EXPECT_EQ(server.sent, "");
 
-    // A ticket that can't be made does not stop the others, and one that can't be opened is sent.
+    // A ticket that can't be created does not stop others. One that can't be opened is still sent.
     ticket::container::TicketOperation::put(server.record,
                                             [](void*, int, int, TICKET_OP, void*) { return 0; });
     std::string substitutions;

@@ -17,7 +17,7 @@ const std::string each = "k[0]=p16 k[1]=-5 k[2]=0.25 k[3]='text k[4]=#610062 k[5
 
 using Set = bool (SETMULTIPAR_LIST::*)(const char*, PARAM_TYPE, const void*, int);
 
-/// Adds records; a 1 for each whose value the list owns by then, a 0 for each that it shares.
+/// Adds records. Returns 1 for each value that the list then owns, 0 for each that it shares.
 std::string add(SETMULTIPAR_LIST& list, Set set, const SETMULTIPAR* records) {
     std::string owned;
     for (; records->key != nullptr; ++records) {
@@ -33,7 +33,7 @@ TEST(ParameterList, OwnsKeysAndValuesAsDeepAsItIs) {
     SETMULTIPAR_LIST list(false);
     SETMULTIPAR_LIST deep(true);
     SETMULTIPAR_LIST shallow(false);
-    RecordTable given(each); // Shared values live as long as this.
+    RecordTable given(each); // Must outlive the shared values.
     EXPECT_EQ(add(list, &SETMULTIPAR_LIST::xSetParameter, given.records()), "01111111");
     EXPECT_EQ(add(deep, &SETMULTIPAR_LIST::ySetParameter, given.records()), "01111111");
     EXPECT_EQ(add(shallow, &SETMULTIPAR_LIST::ySetParameter, given.records()), "01001000");
@@ -46,7 +46,7 @@ TEST(ParameterList, OwnsKeysAndValuesAsDeepAsItIs) {
 }
 
 TEST(ParameterList, EqualOnesAreStoredOnceAndNoNumbersAreOneConstant) {
-    // Numbers that differ in their first bits only, in their last only, and in sign.
+    // Numbers that differ only in their first bits, their last bits, or their sign.
     std::vector<double> numbers = {0.0, -0.0, NAN, HUGE_VAL, -HUGE_VAL};
     for (int i = 0; i < 10'000; ++i) {
         numbers.push_back(std::ldexp(i % 2 == 0 ? 1 + i * 1e-15 : -1, i % 997));
@@ -98,15 +98,15 @@ TEST(ParameterList, TableSortsByKeyAndKeepsTheOrderWithinAKey) {
     for (int i = 0; i < 100; ++i) {
         MultiParListSetParameter(opaque, i % 2 == 0 ? "b" : "a", PARAM_DELETE, nullptr, i);
     }
-    EXPECT_EQ(MultiParListTable(opaque, 2)[1].position, 1); // Bit 0 asks for sorting.
+    EXPECT_EQ(MultiParListTable(opaque, 2)[1].position, 1); // Bit 0 requests sorting.
     MultiParListTable(opaque, 3);
     for (int i = 0; i < 100; ++i) { // The list itself is sorted now.
         EXPECT_EQ(list.Table(false)[i].position, i < 50 ? 2 * i + 1 : 2 * (i - 50));
     }
-    list.DelParameter("a", 100); // Goes behind what is sorted until the next sort.
+    list.DelParameter("a", 100); // Stays after the sorted records until the next sort.
     EXPECT_EQ(list.Table(false)[100].position, 100);
     EXPECT_EQ(list.Table(true)[50].position, 100);
-    // A missing key ends a table; sorted, it takes nothing with it.
+    // A missing key ends a table. Sorting does not lose any other record.
     list.Clear();
     for (const char* key : {static_cast<const char*>(nullptr), "\xC3\xA4", "z"}) {
         list.DelParameter(key, -1);
@@ -126,7 +126,7 @@ TEST(ParameterList, CollectsFromATicket) {
     const std::tuple<const char* const*, std::string, std::string> cases[] = {
         {nullptr, all, all},
         {prefix, all.substr(8), all.substr(8)},
-        {subtraction, "", all}, // the table filters, the mode it makes does not
+        {subtraction, "", all}, // the table is a filter, but its mode is empty
     };
     for (const auto& [keys, byTable, byMode] : cases) {
         SETMULTIPAR_LIST list(true);
@@ -140,7 +140,7 @@ TEST(ParameterList, CollectsFromATicket) {
     SETMULTIPAR_LIST list(true);
     list.MergeIf(nullptr, [](const char*) { return true; });
     list.MergeIf(work.real(), nullptr);
-    // A walk that shows a type which carries no value, as the engine never does.
+    // A walk that shows a type without values, as the engine never does.
     STICKET_ACCESS odd{};
     ticket::single::Walk::put(
         odd, +[](void*, SCollect show, void* context, const char*, int) {
@@ -152,7 +152,7 @@ TEST(ParameterList, CollectsFromATicket) {
     list.MergeIf(&odd, [](const char*) { return true; });
     EXPECT_EQ(tableText(list.Table(false)), "ab[-1]=-");
     list.Clear();
-    // Each call finds the predicate as it was given: a count that it keeps never grows.
+    // Each call gets the predicate in its original state: its counter never grows.
     list.MergeIf(work.real(), [calls = 0](const char* key) mutable {
         return ++calls == 1 && std::string_view(key) != "B";
     });
@@ -162,7 +162,7 @@ TEST(ParameterList, CollectsFromATicket) {
 class ShallowList : public AnyPlace {};
 IN_ANY_PLACE(ShallowList);
 
-// Texts and doubles of a shallow list stay the ticket's own.
+// Texts and doubles of a shallow list belong to the ticket.
 TEST_P(ShallowList, HoldsWhatAnyWalkShowedUntilTheTicketChanges) {
     const std::string content = "d[-1]=0.5 l[-1]=l7 n[-1]=1.5 n[1]=2.5 t[-1]='text t[1]='more";
     const std::string texts = content.substr(content.find('t'));
@@ -172,7 +172,7 @@ TEST_P(ShallowList, HoldsWhatAnyWalkShowedUntilTheTicketChanges) {
     const auto& ticket = ticket::as<STICKET_MODIFY>(*server.engine.open(jobs, 12));
     SETMULTIPAR_LIST list(false);
     list.Merge(&ticket, PARTIAL_MODE(std::array<const char*, 2>{"t", nullptr}.data()));
-    const auto unchanged = [&] { // The more it is walked, the more would be freed too early.
+    const auto unchanged = [&] { // Repeated walks would expose values freed too early.
         list.Merge(&ticket, PARTIAL_MODE(std::array<const char*, 2>{"none", nullptr}.data()));
         support::ticketText(&ticket);
         const WorkTicket work;
@@ -183,7 +183,7 @@ TEST_P(ShallowList, HoldsWhatAnyWalkShowedUntilTheTicketChanges) {
     server.send(13, "d[-1]=10");
     EXPECT_EQ(server.send(12, "d[-3]=10 *[0]=1"), "taken 00");
     unchanged();
-    // By another session: what was shown before is still good, and what is shown now is new.
+    // Changed by another session: old values stay valid, and new walks show new ones.
     store::TicketContainer other(server.keep);
     other.apply(jobs, 12, RecordTable("t[1]='changed").records());
     unchanged();

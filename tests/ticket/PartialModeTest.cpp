@@ -17,7 +17,7 @@ PARTIAL_MODE modeOf(const std::string& script) {
     return mode;
 }
 
-/// The mode's table as words; "null" where there is none.
+/// The mode's table as words; "null" if there is none.
 std::string tableOf(const PARTIAL_MODE& mode) {
     const PARTIAL_TABLE table(mode);
     std::string words;
@@ -33,15 +33,15 @@ TEST(PartialMode, KeepsOnePrefixOfAFamilyAndFiltersByIt) {
     };
     const Case cases[] = {
         {"+abc* +ab* +abd*", "ab*", "ab abc abd", "a aB AB b"},
-        {"+abc* +abd* +ab*", "abd*", "abd abdx", "ab abc"}, // the first alone gives way
+        {"+abc* +abd* +ab*", "abd*", "abd abdx", "ab abc"}, // only the first is removed
         {"+x* +*", "*", "x anything", ""},
-        {"+* -x*", "null", "", "x"}, // the empty prefix is what `x` begins with
+        {"+* -x*", "null", "", "x"}, // `x` begins with the empty prefix
         {"+ab* -abc*", "null", "", "ab"},
         {"+ab* -a* -ab", "ab*", "ab abc", "a"},
         {"+abc +ab* -ab*", "abc", "abc", "ab abcd"},
         {"+ab** +a*b", "a*b ab**", "a*b ab* ab*c", "ab a*bc axb"},
         {"+ab* +A +c* +abc", "A ab* abc c*", "A abc cd", "B Ab"},
-        {"+\xC3\xA4* +z*", "z* \xC3\xA4*", "\xC3\xA4x z", "\xC3"}, // bytes order unsigned
+        {"+\xC3\xA4* +z*", "z* \xC3\xA4*", "\xC3\xA4x z", "\xC3"}, // bytes are ordered as unsigned
     };
     for (const Case& c : cases) {
         SCOPED_TRACE(c.script);

@@ -23,7 +23,7 @@ TEST(TicketContainer, FindsTicketsAndTheirValues) {
     EXPECT_STREQ(view.GetPszParameter(jobs, id, "text", "fallback"), "cyan");
     EXPECT_STREQ(view.GetPszParameter(jobs, id, "none", "fallback"), "fallback");
 
-    // Word 57 may be missing, and is not needed for a ticket that is there.
+    // Word 57 may be missing; an existing ticket does not need it.
     EXPECT_NE(view.CreateOrOpenTicket(jobs, 98, nullptr), nullptr);
     ticket::container::CreateWithKeys::put(inside.record, nullptr);
     EXPECT_EQ(view.CreateOrOpenTicket(jobs, id, nullptr), view.OpenTicket(jobs, id));
@@ -42,7 +42,7 @@ TEST(TicketContainer, PassesFiltersAndNotificationsOn) {
     EXPECT_TRUE(inside.engine.notifications().empty());
 }
 
-// What reaches a plug-in where the engine's answers do not show it; of its own, bit 0 counts.
+// Arguments that the engine's answers do not reveal. Only bit 0 of a plug-in's answer counts.
 TEST(TicketContainer, OperationsCarryTheirNumbersAndArguments) {
     static std::string seen;
     static int answer;

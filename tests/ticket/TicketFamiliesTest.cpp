@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What single tickets and tickets in a container have in common, on both of them.
+// Common behaviour of single tickets and tickets in a container, tested on both.
 #include "ticket/TicketFamilies.h"
 
 #include <climits>
@@ -11,7 +11,7 @@ namespace {
 
 using Texts = std::vector<std::string>;
 
-// Calls NAME on the view, with the ticket's type and id in front where it is inside a container.
+// Calls NAME on the view, preceded by the ticket's type and id if it is inside a container.
 #define ON(place, NAME, ...)                                                                       \
     (place).with([&](const auto& view, auto... address) {                                          \
         return view.NAME(address... __VA_OPT__(, ) __VA_ARGS__);                                   \
@@ -24,7 +24,7 @@ struct TicketFamilies : testing::Test {
 using Places = testing::Types<WorkTicket, TicketInside>;
 TYPED_TEST_SUITE(TicketFamilies, Places);
 
-/// Writes as a vector and as an array, looks at what the ticket has then, and reads it.
+/// Writes as a vector and as an array, checks the ticket's content, and reads it back.
 template<class T, class Place>
 void roundTrip(Place& place, const std::vector<T>& values, const std::string& text) {
     std::vector<T> read;
@@ -53,10 +53,10 @@ TYPED_TEST(TicketFamilies, EveryTypeComesBackAsItWent) {
     roundTrip<std::string>(place, {"a", "", "\xC3\xA4"}, "k[0]='a k[1]=' k[2]='\xC3\xA4");
     roundTrip<void*>(place, {nullptr, reinterpret_cast<void*>(7)}, "k[0]=p0 k[1]=p7");
 
-    // A null text is refused alone.
+    // Only the null text is refused.
     EXPECT_FALSE(ON(place, SetVectorParameter, "k", std::vector<const char*>{"c", nullptr, "k"}));
     EXPECT_EQ(place.content(), "k[0]='c k[2]='k");
-    // A bool is sent as its bit 0, and any integer but 0 is true.
+    // A bool is sent as its bit 0. Any integer but 0 is true.
     const unsigned char bytes[] = {3, 2};
     EXPECT_TRUE(ON(place, SetArrayParameter, "k", reinterpret_cast<const bool*>(bytes), 2UL));
     EXPECT_EQ(place.content(), "k[0]=1 k[1]=0");
@@ -78,7 +78,7 @@ TYPED_TEST(TicketFamilies, HolesCloseUpInAVectorAndFailAnArray) {
     EXPECT_TRUE(array[0] == 10 && array[1] == -2 && array[2] == 12);
     EXPECT_FALSE(ON(place, GetArrayParameter, "key", flags, 3UL));
     EXPECT_FALSE(flags[0]); // all or nothing
-    // Elements there, but none of this type: the vector ends up empty, texts stay as they were.
+    // Elements of another type only: the vector is emptied, but texts are unchanged.
     std::vector<long long> none{7};
     Texts texts{"kept"};
     EXPECT_FALSE(ON(place, GetVectorParameter, "key", none));
@@ -108,7 +108,7 @@ TYPED_TEST(TicketFamilies, NoElementsDeleteTheKeyButForBooleanArrays) {
     EXPECT_TRUE(ON(place, SetArrayParameter, "b", static_cast<const int*>(nullptr), 0UL));
     EXPECT_TRUE(ON(place, SetArrayParameter, "c", static_cast<const bool*>(nullptr), 0UL));
     EXPECT_EQ(place.content(), "c[0]=3");
-    // A refused deletion is not looked at. Keys that end in * are refused by the engine.
+    // The result of a deletion is ignored. The engine refuses keys that end with *.
     EXPECT_TRUE(ON(place, SetVectorParameter, "refused*", Texts()));
     EXPECT_FALSE(ON(place, SetVectorParameter, "refused*", std::vector<int>{1}));
 }

@@ -7,7 +7,7 @@ constexpr int id = 12;
 
 using Entries = std::map<TICKET_TYPE_ID, TICKET_UPDATE_LIST::ENTRY>;
 
-/// What a list has for a ticket, as a walk shows it.
+/// A list's values for a ticket, in walk order.
 std::string entryText(const Entries& entries, int type, int ticket) {
     const auto found = entries.find(TICKET_TYPE_ID(type, ticket));
     return found == entries.end() ? "none" : support::ticketText(found->second.ticket);
@@ -66,7 +66,7 @@ TEST_P(UpdateList, OverlaysTheServersValues) {
         int value = 7;
         EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, &value, position), found);
         EXPECT_EQ(value, expected);
-        // Without a place nothing is found, but a deletion is told of.
+        // Without a place for the value, reads find nothing but still report a deletion.
         EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, position),
                   found == 2 ? 2 : 0);
         std::set<std::string> keys;
@@ -76,14 +76,14 @@ TEST_P(UpdateList, OverlaysTheServersValues) {
     }
     edit(list, jobs, id, "a[-1]=-");
     std::vector<int> values{5};
-    EXPECT_EQ(list.xGetVectorParameter(jobs, id, "a", values), 1); // And nothing was read.
+    EXPECT_EQ(list.xGetVectorParameter(jobs, id, "a", values), 1); // Nothing was read.
     EXPECT_EQ(values, std::vector<int>{5});
 }
 
 TEST_P(UpdateList, KeepsWhatDeletionsTakeAway) {
     const std::pair<const char*, const char*> cases[] = {
         {"a[2]=- a[1]=-", "a[0]=3 a[1]=2"},
-        {"a[2]=- a[-1]=-", "a[0]=1"}, // In place of what was kept.
+        {"a[2]=- a[-1]=-", "a[0]=1"}, // Replaces the kept values.
         {"s[-1]=- d[-1]=- u[-1]=-", "d[0]=0.5 s[0]='old"},
         {"a[0]=9", "none"},
     };
@@ -95,11 +95,11 @@ TEST_P(UpdateList, KeepsWhatDeletionsTakeAway) {
     edit(list, jobs, id, "a[0]=-");
     std::vector<int> values;
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "a", values), 1);
-    EXPECT_EQ(values, std::vector<int>{1}); // As the server has it.
+    EXPECT_EQ(values, std::vector<int>{1}); // The server's values.
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, id, "other", values), 1);
     EXPECT_EQ(list.xGetDeletedVectorParameter(jobs, 13, "a", values), 0);
 
-    TICKET_UPDATE_LIST lone(nullptr); // There is no original.
+    TICKET_UPDATE_LIST lone(nullptr); // There are no originals.
     EXPECT_TRUE(edit(lone, jobs, id, "a[0]=9 s[-1]=-"));
     EXPECT_EQ(entryText(lone.m_changed, jobs, id), "a[0]=9");
 }
@@ -110,7 +110,7 @@ TEST_P(UpdateList, CountsAsEmptyByKeptValuesAlone) {
     EXPECT_TRUE(list.Clear(jobs, id));
     EXPECT_TRUE(list.m_empty && !list.IsEmpty(jobs, 13));
     edit(list, jobs, 14, "k[-1]=1");
-    for (const int last : {13, 14}) { // Nothing was kept for these, so that changes count.
+    for (const int last : {13, 14}) { // No deleted values kept for these, so changes count.
         EXPECT_FALSE(list.Clear(jobs, last));
         EXPECT_EQ(list.m_empty, last == 14);
     }
@@ -123,14 +123,14 @@ TEST_P(UpdateList, TellsOfEachChange) {
             told += std::to_string(type) + "/" + std::to_string(ticket) + " " + key + " " +
                     std::to_string(ptype) + " " + support::valueText(ptype, value) + ";";
         });
-    list.AddParameter(jobs, id, "m", "\x80", true);                   // MacRoman: told as UTF-8.
-    EXPECT_FALSE(list.DelParameter(jobs, id, "a", 7, true));          // Refused, and told of.
-    list.SetFilenameVectorParameter(jobs, id, "n", {"a\\b", "\x80"}); // Once, not for its parts.
+    list.AddParameter(jobs, id, "m", "\x80", true);          // MacRoman; reported as UTF-8.
+    EXPECT_FALSE(list.DelParameter(jobs, id, "a", 7, true)); // Refused, but reported.
+    list.SetFilenameVectorParameter(jobs, id, "n", {"a\\b", "\x80"}); // Reported once.
     EXPECT_EQ(told, "3/12 m 4 '\xC3\x84;3/12 a 0 -;3/12 n 6 null;");
     EXPECT_EQ(entryText(list.m_changed, jobs, id).substr(28),
               "m[0]='\xC3\x84 n[0]='a/b n[1]='\xC3\x84");
 
-    // A text that is handed out is the list's own, and lives as long.
+    // A returned text belongs to the list and lives as long.
     const char* text = nullptr;
     EXPECT_EQ(list.xGetParameter(jobs, id, "n", PARAM_STRING, &text, 0), 1);
     EXPECT_STREQ(text, "a/b");
@@ -146,8 +146,8 @@ TEST_P(UpdateList, RefusesWithoutATrace) {
     EXPECT_FALSE(edit(list, jobs, 14, "a[-1]=1"));
     hSTicketInstance = factory;
     EXPECT_TRUE(list.IsEmpty(1000, id));
-    EXPECT_EQ(list.m_changed.size(), 1u); // That of the null key, which is empty.
-    // A numeric type without a value is a deletion, which the work ticket refuses as such.
+    EXPECT_EQ(list.m_changed.size(), 1u); // The null key's entry, which is empty.
+    // A numeric type without a value is a deletion, which the work ticket refuses.
     EXPECT_FALSE(list.xSetParameter(jobs, id, "a", PARAM_INT, nullptr, -1, false));
     EXPECT_EQ(list.xGetParameter(jobs, id, "a", PARAM_INT, nullptr, -1), 2);
 }
@@ -159,7 +159,7 @@ TEST_P(UpdateList, MergesATicketAsItIsWalked) {
     const char* const keys[] = {"ab*", nullptr};
     list.Merge(jobs, 13, source.real(), keys);
     EXPECT_EQ(entryText(list.m_changed, jobs, 13), "ab[0]=1 abc[0]=2");
-    STICKET_ACCESS odd{}; // A plug-in's walk that shows a value without a key.
+    STICKET_ACCESS odd{}; // A plug-in's walk that shows a value with a null key.
     ticket::single::Walk::put(
         odd, +[](void*, SCollect show, void* context, const char*, int) {
             static const int value = 1;

@@ -9,7 +9,7 @@ TEST(TicketViews, FindsTheFirstEqualElement) {
     const WorkTicket work("numbers=4,5,5,0.5,6 scalar[-1]=9 texts='a,'ab,'b");
     const STICKET_MODIFY& view = work.view();
     EXPECT_EQ(view.FindParameterPosition<int>("numbers", 5), 1);
-    EXPECT_EQ(view.FindParameterPosition<int>("numbers", 6), -1); // Behind what is no integer.
+    EXPECT_EQ(view.FindParameterPosition<int>("numbers", 6), -1); // After a non-integer.
     EXPECT_EQ(view.FindParameterPosition<int>("scalar", 9), 0);
     EXPECT_EQ(view.FindParameterPosition<std::string>("texts", "ab"), 1);
     EXPECT_EQ(view.FindParameterPosition<std::string>("texts", ""), -1);
@@ -39,7 +39,7 @@ TEST(TicketViews, BearsAFaultyPlugIn) {
             }
             return answer;
         });
-    // Nothing is put there, and each record says that something was.
+    // Stores nothing, but marks each record as done.
     ticket::single::GetMultiParameter::put(
         work.record, +[](void*, GETMULTIPAR* table) {
             for (; table->key != nullptr; ++table) {
@@ -49,14 +49,14 @@ TEST(TicketViews, BearsAFaultyPlugIn) {
         });
     const STICKET_MODIFY& view = work.view();
 
-    // Of an answer bit 0 counts. A text that is said to be there and is null is missing.
+    // Only bit 0 of an answer counts. A null text counts as missing even if reported as present.
     answer = 0xFE;
     EXPECT_EQ(view.GetIntParameter("key", 1), 1);
     answer = 0x101;
     EXPECT_EQ(view.GetIntParameter("key", 1), 7);
     EXPECT_EQ(view.GetStringParameter("key", "fallback"), "fallback");
 
-    // Null texts fall out of a vector, and counts that can't be allocate nothing.
+    // Null texts are left out of a vector. Counts that are too large allocate nothing.
     std::vector<std::string> texts{"former"};
     count = 1000;
     EXPECT_FALSE(view.GetVectorParameter("key", texts));

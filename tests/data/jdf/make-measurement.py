@@ -1,8 +1,8 @@
 #!/usr/bin/env python3
-"""Writes measurement.txt beside this file: the element that two patches give, as Python formats it.
+"""Writes measurement.txt next to this file: the element for two patches, formatted by Python.
 
-The patches are those of tests/jdf/JdfMeasurementTest.cpp. What does not fit into an integer is the
-smallest one.
+The patches are those of tests/jdf/JdfMeasurementTest.cpp. A value that does not fit an integer
+gives the smallest integer.
 """
 import math
 import pathlib

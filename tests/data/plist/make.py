@@ -1,5 +1,5 @@
 #!/usr/bin/env python3
-"""Writes the property lists of this folder with Python's plistlib, a writer that is not ours."""
+"""Writes the property lists of this folder with Python's plistlib, an independent writer."""
 import datetime
 import plistlib
 from pathlib import Path

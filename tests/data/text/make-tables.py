@@ -1,9 +1,9 @@
 #!/usr/bin/env python3
-"""Writes the tables beside this file, from sources that are not this program:
+"""Writes the tables next to this file, from independent sources:
 
-code-pages.csv  characters 0x80 to 0xFF of the code pages, after Python's codecs (whose source is
+code-pages.csv  characters 0x80 to 0xFF of the code pages, from Python's codecs (whose source is
                 the Unicode Consortium's MAPPINGS/VENDORS/APPLE)
-numbers.csv     a double's bits and what rounding and converting it give, by exact fractions
+numbers.csv     a double's bits and the results of rounding and converting it, by exact fractions
 integers.csv    unsigned 64-bit integers and the bits of the nearest double, by exact integers
 percent.csv     0 to 255 as percent with two decimals, by decimal arithmetic
 """
@@ -30,7 +30,7 @@ def bits(value):
 
 
 def half_away(value):
-    """To the nearest whole number, exactly, halves away from zero."""
+    """Rounds to the nearest integer, exactly, halves away from zero."""
     whole = math.floor(abs(Fraction(value)) + Fraction(1, 2))
     return whole if value > 0 else -whole
 
@@ -52,13 +52,13 @@ def numbers():
              2.0 ** 32 - 0.5, 2.0 ** 32, 2.0 ** 51 + 0.5, 2.0 ** 52 - 1, 2.0 ** 52 + 1, 2.0 ** 53]
     for power in (52, 63, 64):
         edges += [2.0 ** power, math.nextafter(2.0 ** power, 0), math.nextafter(2.0 ** power, 1e30)]
-    edges.remove(math.nextafter(2.0 ** 52, 0))  # has a fraction, and is beyond the limit of one
+    edges.remove(math.nextafter(2.0 ** 52, 0))  # has a fraction but exceeds the limit for one
     edges += [random.uniform(0, 10.0 ** random.randint(0, 20)) for _ in range(40)]
     return [number_row(sign * value) for value in edges for sign in (1, -1)]
 
 
 def nearest_double(number):
-    """Halves to even below 2^63; from there on halves go up, and nothing reaches 2^64."""
+    """Halves to even below 2^63, halves up from there on; nothing reaches 2^64."""
     if number < 2 ** 63:
         return float(number)
     return float(min((number + 1024) // 2048 * 2048, 2 ** 64 - 2048))
