@@ -139,11 +139,13 @@ def table(rows):
 
 
 def outcomes(rows):
-    return markdown(
-        ("Code", "Meaning", "Who acts", "Retry"),
-        [[row["code"], stars(row["meaning"]), row["job"]["who"], row["job"]["retry"]]
-         for row in rows if row["job"]],
-    )
+    """Codes that ask the same of a client are one row."""
+    groups = {}
+    for row in rows:
+        if row["job"]:
+            groups.setdefault((row["job"]["who"], row["job"]["retry"]), []).append(row["code"])
+    return markdown(("Codes", "Who acts", "Retry"),
+                    [[", ".join(codes), *answer] for answer, codes in groups.items()])
 
 
 def main(arguments):

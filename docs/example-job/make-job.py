@@ -2,12 +2,12 @@
 # SPDX-License-Identifier: Apache-2.0
 """Makes a complete job for a store: tickets, and the files that they name.
 
-By itself the job asks whether a print on super-calendered paper (measured: FOGRA40L) keeps to the
-printing condition for coated paper (references: FOGRA39L). Both data sets are in Debian's
-icc-profiles-free. The options make other jobs, also such that are still to be measured.
+The default job compares a print on super-calendered paper (measured: FOGRA40L) with the printing
+condition for coated paper (references: FOGRA39L). Debian's icc-profiles-free contains both data
+sets. Options make other jobs, including jobs without a measurement.
 
-  make-job.py FOLDER          then, with the store made:
-  tintgate-store import FOLDER/tickets.json
+  make-job.py FOLDER
+  tintgate-store import FOLDER/tickets.json           into an existing store
   tintgate-store file put FOLDER/server /server
 """
 
@@ -23,12 +23,12 @@ HERE = Path(__file__).resolve().parent
 ICC = Path("/usr/share/color/icc")
 PRESETS = (HERE.parents[1] / "presets", HERE.parents[2] / "tintgate/presets")  # Source, installed.
 
-INSTALL = "/server"  # The server's own folder, as its jobs name it.
+INSTALL = "/server"  # The server's install folder, as its jobs name it.
 TEMP = "/server/temp"
 STRIP = "example"
 CIEDE2000 = 4
-DEVICE = 33  # Number of the instrument; the names file of docs/instruments.md has its name.
-JDF_BYTES = 8192  # Updates of a JDF want 5,000 at least; blanks behind the end fill it up.
+DEVICE = 33  # Number of the instrument; docs/instruments.md describes how to name it.
+JDF_BYTES = 8192  # An update requires 5,000 bytes; blanks after the end fill the file.
 STRIP_COLUMNS = 16
 
 FIELDS = ("XYZ_X", "XYZ_Y", "XYZ_Z", "LAB_L", "LAB_A", "LAB_B")
@@ -36,7 +36,7 @@ GREYS = ((10, 6, 6), (20, 12, 12), (40, 27, 27), (60, 45, 45), (80, 65, 65), (10
 
 
 def read_chart(path):
-    """Device values in percent to the six values of FIELDS, of the first patch that has them."""
+    """Maps device values in percent to the six FIELDS of the first patch that has them."""
     lines = iter(path.read_text(encoding="latin-1").splitlines())
     for line in lines:
         if line.strip() == "BEGIN_DATA_FORMAT":
@@ -54,7 +54,7 @@ def read_chart(path):
 
 
 def strip_patches():
-    """A strip as contract proofs have it: paper, ramps of each ink, overprints, greys, mixtures."""
+    """A strip as on contract proofs: paper, tone ramps, overprints, greys and mixtures."""
     patches = [(0, 0, 0, 0)]
     for ink in range(4):
         for tone in (10, 20, 40, 70, 100):
@@ -70,7 +70,7 @@ def strip_patches():
 
 
 def criteria_entries():
-    """From the table of docs/criteria.md: name of a criterion to its entry in a preset's arrays."""
+    """Maps the names in the table of docs/criteria.md to entries of a preset's arrays."""
     entries = {}
     for line in (HERE.parent / "criteria.md").read_text(encoding="utf-8").splitlines():
         cells = [cell.strip() for cell in line.split("|")]
@@ -80,13 +80,13 @@ def criteria_entries():
 
 
 def preset_keys(path):
-    """The ticket of a tolerance preset, from its file."""
+    """The keys of a tolerance preset's ticket, from its file."""
     preset = xml.parse(path).getroot()
     used, tolerances, decimals = [0] * 32, [0.0] * 32, [0] * 32
     entries = criteria_entries()
     for criterion in preset.find("criteria"):
         if criterion.tag not in entries:
-            continue  # known by its name alone: the library takes it from the file
+            continue  # Has no entry: the library reads it from the preset's file.
         entry = entries[criterion.tag]
         used[entry] = int(criterion.get("used") == "yes")
         tolerances[entry] = float(criterion.get("tolerance"))
@@ -117,9 +117,9 @@ def value_keys(root, chart, patches):
 
 
 def job_keys(arguments, preset_id):
-    """What is the same for both strips."""
+    """The keys that both strips share."""
     keys = {
-        # What it is, and that it waits for its verification.
+        # Description and status: the job waits to be verified.
         "Input/Title": {"string": arguments.title},
         "Input/SubType": {"int": 0},
         "Input/FileType": {"int": 0},
@@ -128,7 +128,7 @@ def job_keys(arguments, preset_id):
         "Remote/ShowInVerifier": {"int": 1},
         "General/ParentID": {"int": arguments.parent},
         "CMM/PaperName": {"string": arguments.paper},
-        # Where the server keeps its files: server paths.
+        # Server paths of the job's files.
         "System/InstallFolder": {"string": INSTALL},
         "System/Folders/Temp": {"string": TEMP},
         "Output/Jdf/FileName": {"string": f"job-{arguments.job}.jdf"},
@@ -146,7 +146,7 @@ def strips(arguments):
 
 
 def strip_keys(arguments, preset_id, suffix):
-    """How a strip is verified, and against what. The suffix is that of its keys."""
+    """How a strip is verified, and its references. `suffix` ends the keys of the strip."""
     keys = {
         f"Workflow/Verify/DeltaEMode{suffix}": {"int": CIEDE2000},
         f"Workflow/Verify/ComparisonMethod{suffix}": {"int": preset_id},
@@ -154,7 +154,7 @@ def strip_keys(arguments, preset_id, suffix):
     }
     if arguments.parent:
         keys["Footer/Nesting/ControlstripMode"] = {"int": 1}
-        # Without it the nested strip is not looked for, nor are the parent's other jobs.
+        # Without it, neither the nested strip nor the parent's other jobs are found.
         keys["Footer/Nesting/PSDAssessment"] = {"string": ""}
         keys[f"Footer/Nesting/ControlstripFile{suffix}"] = {"string": f"{STRIP}.it8"}
     if is_profile(arguments.references):
@@ -168,8 +168,8 @@ def strip_keys(arguments, preset_id, suffix):
 
 
 def workflow(arguments):
-    """Of a job's ways to its references, the one that fits. The third takes those of the ticket, or
-    a profile where the ticket has none, and is the only one that has a JDF updated."""
+    """The measurement workflow: 1 takes references from a profile, 2 from a file, 3 from the ticket
+    or, if that has none, from a profile. Only 3 updates the JDF."""
     if arguments.unmeasured:
         return 3 if is_profile(arguments.references) else 2
     return 1 if is_profile(arguments.references) else 3
@@ -180,14 +180,14 @@ def is_profile(path):
 
 
 def measurement_keys(root, patches, measured, references):
-    """A measurement below "Remote/Measurement" or "Remote/Measurement2", and the references, where
-    they are values."""
+    """A measurement below "Remote/Measurement" or "Remote/Measurement2", and its references unless
+    these are a profile."""
     keys = {
-        # How many measurements there have been, and the values of the last. CMYK is in percent.
+        # The number of measurements, and the values of the last one. CMYK is in percent.
         f"{root}/Status": {"int": 1},
         f"{root}/Illumination/Mode": {"int": 1},
         f"{root}/Numpatches": {"int": len(patches)},
-        # No spectra. The three keys must be there all the same.
+        # No spectra. The three keys are required nevertheless.
         f"{root}/SpectralValues/Base": {"int": 380},
         f"{root}/SpectralValues/Length": {"int": 0},
         f"{root}/SpectralValues/Stepsize": {"int": 10},
@@ -207,8 +207,8 @@ def measurement_keys(root, patches, measured, references):
 
 
 def strip_text(patches, references):
-    """The control strip, in rows of STRIP_COLUMNS; the value of DEVICE must be the first line that
-    has that word."""
+    """The control strip, in rows of STRIP_COLUMNS. The first line with the word DEVICE must be its
+    value."""
     rows = len(patches) // STRIP_COLUMNS
     lines = ["CGATS.17", f"DEVICE {DEVICE}", f"NUMBER_OF_STRIPS {rows}",
              f"NUMBER_OF_COLS {STRIP_COLUMNS}", "NUMBER_OF_FIELDS 11", "BEGIN_DATA_FORMAT",
@@ -245,21 +245,21 @@ def parse_arguments():
     parser = argparse.ArgumentParser(description=__doc__,
                                      formatter_class=argparse.RawDescriptionHelpFormatter)
     default = next((str(folder) for folder in PRESETS if folder.is_dir()), ".")
-    parser.add_argument("folder", type=Path, help="is made, or filled")
+    parser.add_argument("folder", type=Path, help="folder for the job; created if missing")
     parser.add_argument("--job", type=int, default=7, help="number of the job (default 7)")
     parser.add_argument("--title", default="Summer catalogue, sheet 1")
     parser.add_argument("--paper", default="Super-calendered, 60 g/m2")
     parser.add_argument("--measured", type=Path, default=ICC / "FOGRA40L.ti3",
                         help="chart with the measured values (default FOGRA40L)")
     parser.add_argument("--unmeasured", action="store_true",
-                        help="the job is still to be measured")
+                        help="make a job without a measurement")
     parser.add_argument("--references", type=Path, default=ICC / "FOGRA39L.ti3",
-                        help="chart with the reference values, or CMYK profile that gives them "
+                        help="chart with the reference values, or a CMYK profile "
                              "(default FOGRA39L)")
     parser.add_argument("--two-strips", action="store_true",
-                        help="the job has a second strip, with the same patches")
+                        help="add a second strip with the same patches")
     parser.add_argument("--parent", type=int, default=0,
-                        help="the job is nested: number of its parent, whose ticket is made too")
+                        help="make a nested job and the ticket of its parent with this number")
     parser.add_argument("--preset", type=Path, default=Path(default) / "CVP_0001.xml",
                         help="file of the tolerance preset")
     return parser.parse_args()
@@ -275,7 +275,7 @@ def tickets(arguments, patches, measured, references):
     made = [{"type": 27, "id": preset_id, "keys": preset_keys(arguments.preset)},
             {"type": 3, "id": arguments.job, "keys": keys}]
     if arguments.parent:
-        # No job to be verified itself: it gets the results of its children.
+        # The parent is not verified itself. It receives the results of its children.
         made.append({"type": 3, "id": arguments.parent,
                      "keys": {"Input/Title": {"string": "Sheet with several jobs"},
                               "Job/Display/Status": {"int": 0},
@@ -301,10 +301,10 @@ def main():
     arguments = parse_arguments()
     for path in (arguments.measured, arguments.references, arguments.preset):
         if not path.is_file():
-            sys.exit(f"{path} is not there (the charts are in the package icc-profiles-free)")
+            sys.exit(f"{path} is missing (the charts are in the package icc-profiles-free)")
     measured = read_chart(arguments.measured)
     references = None if is_profile(arguments.references) else read_chart(arguments.references)
-    values = measured if references is None else references  # What a strip's file shows.
+    values = measured if references is None else references  # Colours in the strip's file.
     patches = [patch for patch in strip_patches() if patch in measured and patch in values]
     patches = patches[:len(patches) // STRIP_COLUMNS * STRIP_COLUMNS]
 

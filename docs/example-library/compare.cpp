@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Compares a measurement with a target under a tolerance preset, as a program that uses
-// libTintgate. With libtintgate-dev installed:
+// A program that uses libTintgate to compare a measurement with a target under a tolerance preset.
+// With libtintgate-dev installed:
 //
 //   g++ -std=c++17 compare.cpp $(pkg-config --cflags --libs tintgate) -o compare
 //   ./compare target.ti3 measurement.ti3 /usr/share/tintgate/presets/CVP_0001.xml
@@ -29,7 +29,7 @@ int fail(int status) {
 } // namespace
 
 int main(int count, char** arguments) {
-    std::setlocale(LC_CTYPE, ""); // Paths are texts of the user's locale.
+    std::setlocale(LC_CTYPE, ""); // Paths are in the encoding of the user's locale.
     if (count != 4) {
         std::fprintf(stderr, "compare TARGET MEASUREMENT PRESET\n");
         return 2;
