@@ -301,4 +301,29 @@ Outcome verifyBytes(const Aim& aim, const Measurement& measurement, std::string_
     });
 }
 
+Outcome refuse(const Aim& aim, const Measurement& measurement, int code, const Wanted& wanted) {
+    Outcome outcome;
+    outcome.measurement = measurement;
+    outcome.problem = problemOfFile(code, measurement.path);
+    if (wanted.json) {
+        outcome.json = jsonLine(aim, outcome, {});
+    }
+    return outcome;
+}
+
+std::string brokenJson(const Aim& aim, const Outcome& outcome, const std::string& mark) {
+    constexpr std::size_t usualSize = 1024;
+    analysis::JsonWriter json(usualSize);
+    json.beginObject();
+    json.member("format", "tintgate-error");
+    json.member("formatVersion", std::int64_t{1});
+    json.member("file", analysis::documentText(analysis::widened(outcome.measurement.path)));
+    json.member("sha256", mark);
+    nullable(json, "condition", aim.condition);
+    writeError(json, outcome.problem);
+    json.endObject();
+    json.endLine();
+    return narrow(json.finish());
+}
+
 } // namespace check

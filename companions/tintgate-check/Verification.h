@@ -29,6 +29,7 @@ struct Outcome {
     std::vector<std::string> written;
     std::string json;                       ///< A line of JSON with its line end, if wanted.
     std::shared_ptr<report::Result> result; ///< If wanted.
+    bool isSkipped = false;                 ///< In a watch: nothing was done, or nothing is new.
 
     Status status() const;
 };
@@ -46,5 +47,11 @@ Outcome verify(const Aim& aim, const Measurement& measurement, Outputs& outputs,
 /// The same of a measurement whose bytes have been read. The names of its outputs carry `mark`.
 Outcome verifyBytes(const Aim& aim, const Measurement& measurement, std::string_view bytes,
                     Outputs& outputs, const Wanted& wanted, const std::string& mark);
+
+/// The outcome of a measurement that could not be read, for a code of docs/exit-codes.csv.
+Outcome refuse(const Aim& aim, const Measurement& measurement, int code, const Wanted& wanted);
+
+/// What is written for a measurement that can't be used, in the place of a result.
+std::string brokenJson(const Aim& aim, const Outcome& outcome, const std::string& mark);
 
 } // namespace check

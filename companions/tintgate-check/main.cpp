@@ -21,6 +21,7 @@
 #include "companions/tintgate-check/Screen.h"
 #include "companions/tintgate-check/Shelves.h"
 #include "companions/tintgate-check/Verification.h"
+#include "companions/tintgate-check/Watch.h"
 #include "companions/tintgate-check/Words.h"
 #include "companions/tintgate-report/Terminal.h"
 
@@ -105,11 +106,8 @@ int fail(const Failure& failure) {
     return static_cast<int>(failure.status);
 }
 
-Outputs outputsOf(const Options& options, const Conditions& conditions, const Aim& aim) {
-    return {options.out,
-            options.page,
-            options.result,
-            {aim.targetPath, aim.presetPath, aim.patchSetPath, conditions.file}};
+std::vector<std::string> inputsOf(const Conditions& conditions, const Aim& aim) {
+    return {aim.targetPath, aim.presetPath, aim.patchSetPath, conditions.file};
 }
 
 bool isReferenceData(const Conditions& conditions, const std::string& path) {
@@ -122,7 +120,7 @@ bool isReferenceData(const Conditions& conditions, const std::string& path) {
 /// One file that was named: a whole screen.
 Status showOne(const Options& options, const Conditions& conditions, const Aim& aim,
                const report::Painter& paint, Printer& printer) {
-    Outputs outputs = outputsOf(options, conditions, aim);
+    Outputs outputs(options.out, options.page, options.result, inputsOf(conditions, aim));
     const std::string& path = options.measurements.front();
     const Outcome outcome =
         verify(aim, {path, relativeOf(path)}, outputs, {.json = false, .result = true});
@@ -138,7 +136,7 @@ Status showOne(const Options& options, const Conditions& conditions, const Aim& 
 
 Status showMany(const Options& options, const Conditions& conditions, const Aim& aim,
                 const report::Painter& paint, Printer& printer) {
-    Outputs outputs = outputsOf(options, conditions, aim);
+    Outputs outputs(options.out, options.page, options.result, inputsOf(conditions, aim));
     MeasurementWalk walk(options.measurements);
     Totals totals;
     const bool isTable = !options.json && !options.quiet;
@@ -167,6 +165,31 @@ Status showMany(const Options& options, const Conditions& conditions, const Aim&
     return totals.status();
 }
 
+Status watchFolder(const Options& options, const Conditions& conditions, const Aim& aim,
+                   const report::Painter& paint, Printer& printer) {
+    const WatchWanted wanted{
+        options.watch,    options.out,     options.page, options.poll,
+        options.interval, options.threads, options.json, inputsOf(conditions, aim)};
+    if (!options.quiet && !options.json) {
+        printer.print(say(Say::WatchStarts,
+                          {options.watch, options.out.empty() ? options.watch : options.out}) +
+                      '\n');
+        printer.finish();
+    }
+    const std::size_t width = isatty(STDOUT_FILENO) != 0 ? screenWidth() : 0;
+    watch(aim, wanted, [&](const Outcome& outcome) {
+        if (options.quiet) {
+            return true;
+        }
+        std::string text = options.json ? outcome.json : lineText(outcome, paint, width);
+        if (!options.json && outcome.problem) {
+            text += problemText(*outcome.problem, paint, screenWidth());
+        }
+        return printer.print(text) && printer.finish();
+    });
+    return Status::Passed;
+}
+
 int run(const Options& options) {
     const Conditions conditions =
         options.conditionsFile.empty() ? findConditions() : readConditions(options.conditionsFile);
@@ -187,6 +210,10 @@ int run(const Options& options) {
     }
     const Aim aim = loadAim(conditions, options.aim);
 
+    if (!options.watch.empty()) {
+        const Status status = watchFolder(options, conditions, aim, paint, printer);
+        return static_cast<int>(printer.finish() ? status : Status::NotDone);
+    }
     std::error_code ignored;
     const bool isOne = options.measurements.size() == 1 && !options.json && !options.quiet &&
                        !std::filesystem::is_directory(options.measurements.front(), ignored);
