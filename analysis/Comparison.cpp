@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <map>
+#include <utility>
 
 #include "ExitCodes.h"
 #include "analysis/BoundaryText.h"
@@ -15,42 +16,6 @@ namespace {
 
 using colour::DataSet;
 using colour::Lab;
-
-int load(const std::wstring& path, const colour::CgatsWants& wants, Input& input) {
-    input.path = path;
-    return statusOf(colour::loadColourFile(narrowed(path), wants, input.file));
-}
-
-int loadSide(const std::wstring& path, const colour::CgatsWants& wants, Input& input) {
-    if (const int status = load(path, wants, input)) {
-        return status;
-    }
-    return input.file.set && !input.file.set->hasColour() ? exitNoColourValues : exitDone;
-}
-
-/// A patch set selects by process colours, so it must be a text that has them.
-int loadPatchSet(const std::wstring& path, Input& input) {
-    if (const int status = load(path, {.spectra = false}, input)) {
-        return status;
-    }
-    if (input.file.profile) {
-        return exitPatchSetNotText;
-    }
-    return input.file.set->hasCmyk() ? exitDone : exitNoDeviceValues;
-}
-
-int loadAll(const ComparisonPaths& paths, bool keepSpectra, Comparison& c) {
-    const std::string& condition = paths.condition;
-    if (const int status =
-            loadSide(paths.target, {.spectra = false, .condition = condition}, c.target)) {
-        return status;
-    }
-    if (const int status = loadSide(
-            paths.measurement, {.spectra = keepSpectra, .condition = condition}, c.measurement)) {
-        return status;
-    }
-    return paths.patchSet.empty() ? exitDone : loadPatchSet(paths.patchSet, c.patchSet);
-}
 
 const char* roleOf(const Comparison& c, const Input& input) {
     return &input == &c.target ? "target" : &input == &c.measurement ? "measurement" : "patch set";
@@ -81,9 +46,11 @@ void dropPlaceholders(Comparison& c) {
         if (!input->file.set || !isPlaceholder(*input->file.set)) {
             continue;
         }
-        input->file.set->deviceSpace = colour::DeviceSpace::None;
-        input->file.set->channels.clear();
-        input->file.set->device.clear();
+        auto without = std::make_shared<DataSet>(*input->file.set); // Others may share the file.
+        without->deviceSpace = colour::DeviceSpace::None;
+        without->channels.clear();
+        without->device.clear();
+        input->file = {std::move(without), nullptr, {}};
         c.warnings.push_back(
             {"deviceValuesIgnored", std::string("The device values of the ") + roleOf(c, *input) +
                                         " are the same in every row and were not used."});
@@ -190,7 +157,7 @@ int selectPatches(Comparison& c) {
     }
     c.devices = devicesOf(c);
     for (Input* input : {&c.target, &c.measurement, &c.patchSet}) {
-        if (input->file.set || input->file.profile) {
+        if (input->file.isGiven()) {
             if (const int status = pair(c, *input)) {
                 return status;
             }
@@ -306,11 +273,36 @@ const char* repeatModeName(RepeatMode mode) {
 }
 
 int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparison& c) {
-    c.formula = wants.formula;
-    c.repeatMode = wants.repeats;
-    if (const int status = loadAll(paths, wants.spectra, c)) {
+    // A fault of the measurement precedes one of the patch set.
+    References references;
+    if (const int status = loadReferences(paths.target, {}, paths.condition, references)) {
         return status;
     }
+    SharedFile measurement;
+    if (const int status =
+            loadSide(paths.measurement, {.spectra = wants.spectra, .condition = paths.condition},
+                     measurement)) {
+        return status;
+    }
+    references.patchSetPath = paths.patchSet;
+    if (!paths.patchSet.empty()) {
+        if (const int status = loadPatchSet(paths.patchSet, references.patchSet)) {
+            return status;
+        }
+    }
+    return compare(references, paths.measurement, std::move(measurement), wants, c);
+}
+
+int compare(const References& references, const std::wstring& path, SharedFile measurement,
+            const ComparisonWants& wants, Comparison& c) {
+    c.formula = wants.formula;
+    c.repeatMode = wants.repeats;
+    c.target.path = references.targetPath;
+    c.target.file = references.target;
+    c.measurement.path = path;
+    c.measurement.file = std::move(measurement);
+    c.patchSet.path = references.patchSetPath;
+    c.patchSet.file = references.patchSet;
     dropPlaceholders(c);
     if (const int status = selectPatches(c)) {
         return status;
@@ -339,6 +331,10 @@ int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparis
     }
     passOnNotes(c);
     return exitDone;
+}
+
+void warnOfSameFile(Comparison& c) {
+    c.warnings.push_back({"sameFile", "Target and measurement are the same file."});
 }
 
 } // namespace analysis

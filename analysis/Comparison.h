@@ -6,8 +6,8 @@
 #include <string>
 #include <vector>
 
+#include "analysis/Inputs.h"
 #include "analysis/Pairing.h"
-#include "colour/ColourFile.h"
 #include "colour/Difference.h"
 
 namespace analysis {
@@ -15,7 +15,7 @@ namespace analysis {
 /// One of the files of a comparison, and how its patches were found.
 struct Input {
     std::wstring path;
-    colour::ColourFile file;         ///< Neither member is set for a patch set that is not given.
+    SharedFile file;
     Pairing pairing;                 ///< Of the rows of `Comparison::selection` with this file's.
     std::vector<std::uint32_t> rows; ///< Of each patch its row. Empty for a profile.
     std::vector<std::uint32_t> unpaired; ///< Rows of this file without a counterpart.
@@ -113,5 +113,13 @@ struct ComparisonWants {
 ///
 /// Gives 0 or a code of docs/exit-codes.csv; `comparison` is good for nothing after a failure.
 int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparison& comparison);
+
+/// The same with files that are already loaded. The references are only read, so threads may share
+/// them. `path` is that of the measurement.
+int compare(const References& references, const std::wstring& path, SharedFile measurement,
+            const ComparisonWants& wants, Comparison& comparison);
+
+/// Warns that target and measurement are the same file.
+void warnOfSameFile(Comparison& comparison);
 
 } // namespace analysis

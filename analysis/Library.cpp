@@ -1,9 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The ten functions. Nothing is thrown out of them: another program's code waits behind.
 #include <exception>
-#include <filesystem>
 #include <new>
-#include <system_error>
 #include <utility>
 
 #include "ExitCodes.h"
@@ -62,10 +60,8 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
             analyseResultsRecord* results, std::wstring* json, KZJobDataStruct* job) {
     // Of a job, target and measurement are never one file unless a name has gone wrong: every patch
     // would pass. A person may compare a file with itself.
-    std::error_code error;
-    const bool isSameFile =
-        std::filesystem::equivalent(narrowed(paths.target), narrowed(paths.measurement), error);
-    if (isSameFile && job) {
+    const bool sameFile = isSameFile(paths.target, paths.measurement);
+    if (sameFile && job) {
         return exitTargetIsMeasurement;
     }
     PresetOptions options;
@@ -73,14 +69,13 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
         return status;
     }
     Comparison comparison;
-    const ComparisonWants wants{.formula = colour::formulaFromNumber(preset.deltaEMode),
-                                .repeats = options.repeats,
-                                .spectra = job != nullptr};
+    ComparisonWants wants = wantsOf(preset, options);
+    wants.spectra = job != nullptr;
     if (const int status = compare(paths, wants, comparison)) {
         return status;
     }
-    if (isSameFile) {
-        comparison.warnings.push_back({"sameFile", "Target and measurement are the same file."});
+    if (sameFile) {
+        warnOfSameFile(comparison);
     }
     const Judgement judgement = judge(comparison, preset, options);
 
@@ -117,11 +112,8 @@ int analyzeMeasurements(std::wstring target, std::wstring measurement, std::wstr
                         tolerancePresetParameterRecord tolerance, analyseResultsRecord* results,
                         std::wstring* json, KZJobDataStruct* job) {
     return guarded([&] {
-        // 0 to 3 are M0 to M3; any other number leaves the choice to the reader.
-        const int number = tolerance.illuminationCondition;
-        const std::string condition =
-            number >= 0 && number <= 3 ? "M" + std::to_string(number) : "";
-        return analyse({std::move(target), std::move(measurement), std::move(patchSet), condition},
+        return analyse({std::move(target), std::move(measurement), std::move(patchSet),
+                        conditionOf(tolerance)},
                        tolerance, results, json, job);
     });
 }

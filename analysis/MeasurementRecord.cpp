@@ -57,7 +57,7 @@ struct Origin {
 };
 
 std::vector<Origin> originsOf(const Comparison& c) {
-    const bool isSet = c.measurement.file.set.has_value();
+    const bool isSet = c.measurement.file.set != nullptr;
     const bool asCompared = !isSet || c.selection == &c.patchSet;
     std::vector<Origin> origins(asCompared ? c.patchCount() : c.measurement.file.set->patchCount);
     if (!asCompared) {

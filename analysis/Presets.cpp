@@ -644,6 +644,16 @@ int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOption
     return status;
 }
 
+std::string conditionOf(const tolerancePresetParameterRecord& preset) {
+    const int number = preset.illuminationCondition;
+    return number >= 0 && number <= largestMeasuringCondition ? "M" + std::to_string(number) : "";
+}
+
+ComparisonWants wantsOf(const tolerancePresetParameterRecord& preset,
+                        const PresetOptions& options) {
+    return {.formula = colour::formulaFromNumber(preset.deltaEMode), .repeats = options.repeats};
+}
+
 Setting settingOf(const Criterion& criterion, const tolerancePresetParameterRecord& preset,
                   const PresetOptions& options) {
     if (criterion.index == noEntry) {

@@ -67,6 +67,13 @@ int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParam
 /// ones. Gives the codes of readPreset; `options` is left as it was on failure.
 int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOptions& options);
 
+/// Which of several conditions of a file a preset asks for: "M0" to "M3"; empty leaves the choice
+/// to the reader.
+std::string conditionOf(const tolerancePresetParameterRecord& preset);
+
+/// What a preset asks of a comparison; spectra are not wanted.
+ComparisonWants wantsOf(const tolerancePresetParameterRecord& preset, const PresetOptions& options);
+
 /// How a criterion is judged. With fograPSDPreset above 0 the PSD values of the record decide.
 Setting settingOf(const Criterion& criterion, const tolerancePresetParameterRecord& preset,
                   const PresetOptions& options);

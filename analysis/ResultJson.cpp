@@ -62,9 +62,15 @@ void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset,
     json.endObject();
 }
 
+std::string identityOf(const SharedFile& file) {
+    return !file.identity.empty() ? file.identity
+           : file.set             ? colour::identityOf(*file.set)
+                                  : colour::identityOf(*file.profile);
+}
+
 void writeInput(JsonWriter& json, const char* key, const Input& input) {
     json.key(key);
-    if (!input.file.set && !input.file.profile) {
+    if (!input.file.isGiven()) {
         return json.null();
     }
     const bool isTarget = std::string_view(key) == "target";
@@ -72,7 +78,7 @@ void writeInput(JsonWriter& json, const char* key, const Input& input) {
     json.member("path", documentText(input.path));
     json.member("kind", input.file.profile ? "profile" : "text");
     if (isTarget) {
-        optionalMember(json, "identity", colour::identityOf(input.file));
+        optionalMember(json, "identity", identityOf(input.file));
     }
     json.key("patches");
     if (!input.file.set) {
@@ -171,7 +177,7 @@ void writeFinding(JsonWriter& json, const Finding& finding) {
     json.endObject();
 }
 
-void writeFindings(JsonWriter& json, const std::vector<Finding>& findings) {
+void writeCriteria(JsonWriter& json, const std::vector<Finding>& findings) {
     json.key("criteria");
     json.beginArray();
     for (const Finding& finding : findings) {
@@ -268,7 +274,7 @@ void writeMeasuredLabels(JsonWriter& json, const DataSet& selection, std::size_t
 
 void writePatches(JsonWriter& json, const Comparison& c) {
     const DataSet& labels = *c.selection->file.set;
-    const DataSet* const onSheet = c.measurement.file.set ? &*c.measurement.file.set : nullptr;
+    const DataSet* const onSheet = c.measurement.file.set.get();
     const std::size_t channels = c.devices ? c.devices->file.set->channels.size() : 0;
     json.key("patches");
     json.beginArray();
@@ -290,17 +296,8 @@ void writePatches(JsonWriter& json, const Comparison& c) {
 
 } // namespace
 
-std::wstring resultJson(const Comparison& c, const Judgement& judgement,
-                        const tolerancePresetParameterRecord& preset,
-                        const PresetOptions& options) {
-    constexpr std::size_t charactersOfHead = 8192;
-    constexpr std::size_t charactersOfPatch = 96;
-    JsonWriter json(charactersOfHead + c.patchCount() * charactersOfPatch);
-    json.beginObject();
-    json.member("format", "tintgate-result");
-    json.member("formatVersion", std::int64_t{1});
-    writeProgram(json, "tool", "Tintgate", toolVersion);
-    writeProgram(json, "library", "libTintgate", libraryVersion);
+void writeFindings(JsonWriter& json, const Comparison& c, const Judgement& judgement,
+                   const tolerancePresetParameterRecord& preset, const PresetOptions& options) {
     json.member("verdict", verdictName(judgement.verdict));
     json.member("passed", judgement.verdict == Verdict::Passed);
     json.key("formula");
@@ -318,8 +315,22 @@ std::wstring resultJson(const Comparison& c, const Judgement& judgement,
     writePairing(json, c);
     writeStatistics(json, judgement.statistics);
     writeRepeats(json, c.spread);
-    writeFindings(json, judgement.findings);
+    writeCriteria(json, judgement.findings);
     writeWarnings(json, c.warnings, judgement.warnings);
+}
+
+std::wstring resultJson(const Comparison& c, const Judgement& judgement,
+                        const tolerancePresetParameterRecord& preset,
+                        const PresetOptions& options) {
+    constexpr std::size_t charactersOfHead = 8192;
+    constexpr std::size_t charactersOfPatch = 96;
+    JsonWriter json(charactersOfHead + c.patchCount() * charactersOfPatch);
+    json.beginObject();
+    json.member("format", "tintgate-result");
+    json.member("formatVersion", std::int64_t{1});
+    writeProgram(json, "tool", "Tintgate", toolVersion);
+    writeProgram(json, "library", "libTintgate", libraryVersion);
+    writeFindings(json, c, judgement, preset, options);
     json.key("unpaired");
     json.beginObject();
     writeUnpaired(json, "target", c.target, false);

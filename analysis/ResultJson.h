@@ -5,6 +5,7 @@
 #include <string>
 
 #include "analysis/Comparison.h"
+#include "analysis/JsonWriter.h"
 #include "analysis/Judgement.h"
 #include "job/AnalysisLibrary.h"
 
@@ -13,5 +14,10 @@ namespace analysis {
 /// ASCII JSON with a line end. The same inputs give the same text.
 std::wstring resultJson(const Comparison& comparison, const Judgement& judgement,
                         const tolerancePresetParameterRecord& preset, const PresetOptions& options);
+
+/// The same without patches and lists of them, as members of the object that `json` is writing:
+/// from "verdict" to "warnings".
+void writeFindings(JsonWriter& json, const Comparison& comparison, const Judgement& judgement,
+                   const tolerancePresetParameterRecord& preset, const PresetOptions& options);
 
 } // namespace analysis

@@ -35,6 +35,7 @@ pkg_check_modules(libmd REQUIRED IMPORTED_TARGET libmd)
 pkg_check_modules(libxxhash REQUIRED libxxhash)
 add_library(xxhash INTERFACE)
 target_include_directories(xxhash SYSTEM INTERFACE ${libxxhash_INCLUDE_DIRS})
+pkg_check_modules(tomlplusplus REQUIRED IMPORTED_TARGET tomlplusplus)
 pkg_check_modules(libsystemd REQUIRED IMPORTED_TARGET libsystemd)
 # The store's plug-in loads libpq on demand, so only the headers are needed to build.
 pkg_check_modules(libpq REQUIRED IMPORTED_TARGET libpq)

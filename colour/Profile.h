@@ -16,7 +16,8 @@ namespace colour {
 /// True if the bytes have the signature of an ICC profile.
 bool looksLikeProfile(std::string_view bytes);
 
-/// Owns the profile and its transform. Movable; use it in one thread at a time.
+/// Owns the profile and its transform. Movable. Threads may evaluate one profile at once: the
+/// transform keeps nothing between calls.
 class Profile {
   public:
     Profile();

@@ -42,6 +42,7 @@ MARKS = {
 PAGES = {
     "tintgate-store": ("stores.md",),
     "tintgate-report": ("report.md",),
+    "tintgate-check": ("checking.md", "tintgate-check.1"),
     "NerovaMeasure": ("measuring.md", "NerovaMeasure.1"),
     "Nerova Verify": ("viewer.md", "NerovaVerify.1"),
     "Plistbuddy": (),

@@ -6,11 +6,11 @@
 #include <cstdio>
 #include <cstring>
 #include <filesystem>
-#include <fstream>
 #include <memory>
 
 #include "colour/ColourFile.h"
 #include "companions/tintgate-report/Failure.h"
+#include "report/OwnFile.h"
 #include "report/PageFile.h"
 
 namespace report {
@@ -42,19 +42,6 @@ report::Meta metaOf(const std::string& path) {
         return *meta;
     }
     throw Failure(Status::Broken, path + " is broken: " + problem);
-}
-
-/// Of a file met in a folder, where other JSON lies, too.
-bool beginsAsResult(const fs::directory_entry& entry) {
-    std::error_code ignored;
-    if (!entry.path().filename().string().ends_with(".json") || !entry.is_regular_file(ignored)) {
-        return false;
-    }
-    char start[512];
-    std::ifstream file(entry.path(), std::ios::binary);
-    file.read(start, sizeof start);
-    return std::string_view(start, static_cast<std::size_t>(file.gcount()))
-               .find("\"tintgate-result\"") != std::string_view::npos;
 }
 
 /// Standard output and whatever else is not a plain file.
@@ -121,7 +108,9 @@ std::vector<std::string> filesOf(const std::vector<std::string>& arguments) {
         constexpr auto options = fs::directory_options::skip_permission_denied;
         for (fs::recursive_directory_iterator at(argument, options, failure), end;
              !failure && at != end; at.increment(failure)) {
-            if (beginsAsResult(*at)) {
+            // Other JSON may be there, too.
+            if (at->path().filename().string().ends_with(".json") &&
+                report::isOwnFile(report::OwnKind::Result, at->path())) {
                 inside.push_back(at->path());
             }
         }

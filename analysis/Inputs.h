@@ -1,0 +1,50 @@
+// SPDX-License-Identifier: Apache-2.0
+// The files of a comparison: read once, and shared by as many comparisons as need them.
+#pragma once
+
+#include <memory>
+#include <string>
+#include <string_view>
+
+#include "colour/ColourFile.h"
+
+namespace analysis {
+
+/// The contents of a colour file. Nothing writes to them, so comparisons in several threads may
+/// share one. Neither pointer is set for a file that is not given; otherwise exactly one is.
+struct SharedFile {
+    std::shared_ptr<const colour::DataSet> set;
+    std::shared_ptr<const colour::Profile> profile;
+    std::string identity; ///< colour::identityOf, if it is known already; otherwise empty.
+
+    bool isGiven() const { return set != nullptr || profile != nullptr; }
+};
+
+// Each of these returns 0 or a code of docs/exit-codes.csv, and leaves `file` untouched on failure.
+
+/// Loads a target or a measurement, which must have colour values.
+int loadSide(const std::wstring& path, const colour::CgatsWants& wants, SharedFile& file);
+
+/// The same from the bytes of a file.
+int readSide(std::string_view bytes, const colour::CgatsWants& wants, SharedFile& file);
+
+/// Loads a patch set. It selects by process colours, so it must be a text that has them.
+int loadPatchSet(const std::wstring& path, SharedFile& file);
+
+/// What measurements are compared with.
+struct References {
+    std::wstring targetPath;
+    std::wstring patchSetPath; ///< May be empty.
+    SharedFile target;
+    SharedFile patchSet;
+};
+
+/// Loads the target and, if its path is not empty, the patch set. `condition` as in
+/// colour::CgatsWants.
+int loadReferences(const std::wstring& targetPath, const std::wstring& patchSetPath,
+                   const std::string& condition, References& references);
+
+/// True if both paths lead to one file, whatever its names.
+bool isSameFile(const std::wstring& left, const std::wstring& right);
+
+} // namespace analysis

@@ -1,0 +1,127 @@
+// SPDX-License-Identifier: Apache-2.0
+#include "companions/tintgate-check/Outputs.h"
+
+#include <cerrno>
+#include <cstring>
+#include <filesystem>
+#include <system_error>
+
+#include "ExitCodes.h"
+#include "base/FileDraft.h"
+#include "companions/tintgate-check/Words.h"
+#include "report/OwnFile.h"
+
+namespace check {
+namespace {
+
+namespace fs = std::filesystem;
+
+/// A further kind of output is a further row.
+struct Kind {
+    const char* ending;
+    report::OwnKind mark;
+};
+
+Kind kindOf(Output output) {
+    switch (output) {
+    case Output::Page:
+        return {".html", report::OwnKind::Page};
+    case Output::Broken:
+        return {".error.json", report::OwnKind::Broken};
+    case Output::Result:
+        break;
+    }
+    return {".json", report::OwnKind::Result};
+}
+
+/// Names of files have at most 255 bytes; those of drafts are shorter. A name is cut between
+/// characters.
+std::string shortened(std::string name, std::size_t most) {
+    if (name.size() > most) {
+        while (most > 0 && (static_cast<unsigned char>(name[most]) & 0xC0) == 0x80) {
+            --most;
+        }
+        name.resize(most);
+    }
+    return name;
+}
+
+Problem notWritten(const std::string& path, int reason) {
+    const Say remedy =
+        reason == ENOSPC || reason == EDQUOT || reason == EFBIG  ? Say::OutputFullRemedy
+        : reason == EACCES || reason == EPERM || reason == EROFS ? Say::OutputForbiddenRemedy
+        : reason == ENOENT || reason == ENOTDIR                  ? Say::OutputNoFolderRemedy
+                                                                 : Say::OutputOtherRemedy;
+    return {exitResultNotWritten,
+            say(Say::OutputNotWritten, {path, std::strerror(reason)}),
+            {},
+            say(remedy)};
+}
+
+} // namespace
+
+std::string Outputs::pathOf(const Measurement& measurement, Output output,
+                            const std::string& mark) const {
+    constexpr std::size_t longestName = 255;
+    const fs::path place =
+        m_folder.empty() ? fs::path(measurement.path) : fs::path(m_folder) / measurement.relative;
+    const std::string ending = (mark.empty() ? "" : "." + mark) + kindOf(output).ending;
+    std::string name = place.stem();
+    if (name.empty()) {
+        name = "measurement";
+    }
+    return place.parent_path() / (shortened(name, longestName - ending.size()) + ending);
+}
+
+std::optional<Problem> Outputs::check(const Measurement& measurement, Output output,
+                                      const std::string& path) const {
+    std::error_code ignored;
+    if (!fs::exists(fs::status(path, ignored))) {
+        return std::nullopt;
+    }
+    std::error_code different;
+    bool isInput = fs::equivalent(path, measurement.path, different);
+    for (const std::string& input : m_inputs) {
+        isInput = isInput || fs::equivalent(path, input, different);
+    }
+    if (isInput) {
+        return Problem{
+            exitOutputIsInput, say(Say::OutputIsInput, {path}), {}, say(Say::OutputIsInputRemedy)};
+    }
+    if (!report::isOwnFile(kindOf(output).mark, path)) {
+        return Problem{
+            exitOutputNotOurs, say(Say::OutputNotOurs, {path}), {}, say(Say::OutputNotOursRemedy)};
+    }
+    return std::nullopt;
+}
+
+bool Outputs::claim(const std::string& path) {
+    const std::lock_guard lock(m_mutex);
+    return m_written.insert(path).second;
+}
+
+std::optional<Problem> Outputs::write(const Measurement& measurement, Output output,
+                                      std::string_view text, const std::string& mark) {
+    const std::string path = pathOf(measurement, output, mark);
+    if (auto problem = check(measurement, output, path)) {
+        return problem;
+    }
+    if (mark.empty() && !claim(path)) {
+        return Problem{
+            exitOutputNotOurs, say(Say::OutputTwice, {path}), {}, say(Say::OutputTwiceRemedy)};
+    }
+    std::error_code failure;
+    const fs::path folder = fs::path(path).parent_path();
+    if (!folder.empty()) {
+        fs::create_directories(folder, failure);
+        if (failure && !fs::is_directory(folder)) {
+            return notWritten(path, failure.value());
+        }
+    }
+    if (!base::writeWholeFile(path, text)) {
+        return notWritten(path, errno);
+    }
+    return std::nullopt;
+}
+
+} // namespace check

@@ -1,0 +1,166 @@
+// SPDX-License-Identifier: Apache-2.0
+// Every sentence that this program says to people. A further language is a further table.
+#pragma once
+
+#include <initializer_list>
+#include <string>
+#include <string_view>
+
+namespace check {
+
+enum class Say {
+    // Verdicts and headings
+    Passed,
+    Failed,
+    Incomplete,
+    NotDone,
+    Against,
+    AgainstCondition,
+    Criteria,
+    LargestDifferences,
+    Warnings,
+    WhatToDo,
+    Cause,
+    Remedy,
+    Note,
+    PageIn,
+    ResultIn,
+    Of,
+    PatchesMeasured,
+    MoreCriteria,
+    Progress,
+    Total,
+    TotalPassed,
+    TotalFailed,
+    TotalIncomplete,
+    TotalNotDone,
+    OneMeasurement,
+    SeveralMeasurements,
+    AlreadyVerified,
+
+    // Advice
+    AdvicePassed,
+    AdvicePaper,
+    AdviceSolids,
+    AdviceGreys,
+    AdviceSinglePatches,
+    AdviceFarOff,
+    AdviceCalibrate,
+    AdviceMissingPatches,
+    AdviceDoubt,
+    AdviceNothingJudged,
+    AdviceSwapped,
+    AdviceSameFile,
+    AdviceShowPage,
+
+    // What else is wrong with a file than its exit code tells
+    EmptyFile,
+    EmptyFileRemedy,
+    IsPreset,
+    IsPresetRemedy,
+    IsResult,
+    IsResultRemedy,
+    IsSpreadsheet,
+    IsSpreadsheetRemedy,
+    IsPdf,
+    IsPdfRemedy,
+    IsPicture,
+    IsPictureRemedy,
+    IsFolder,
+    IsFolderRemedy,
+    NoFile,
+    NoFileRemedy,
+    NoMatch,
+    NoMatchRemedy,
+    RgbMeasurement,
+    RgbMeasurementRemedy,
+    OtherChart,
+    OtherChartRemedy,
+    NotAllowedToRead,
+    NotAllowedToReadRemedy,
+    FolderUnreadable,
+    FolderUnreadableRemedy,
+    FolderEmpty,
+    FolderEmptyRemedy,
+    TargetTrouble,
+    PatchSetTrouble,
+    PresetTrouble,
+    PresetFault,
+
+    // Outputs
+    OutputIsInput,
+    OutputIsInputRemedy,
+    OutputNotOurs,
+    OutputNotOursRemedy,
+    OutputTwice,
+    OutputTwiceRemedy,
+    OutputNotWritten,
+    OutputFullRemedy,
+    OutputForbiddenRemedy,
+    OutputNoFolderRemedy,
+    OutputOtherRemedy,
+    StandardOutput,
+
+    // Conditions
+    ConditionsMissing,
+    ConditionsMissingRemedy,
+    ConditionsBroken,
+    ConditionsBrokenRemedy,
+    UnknownKey,
+    UnknownKeyRemedy,
+    NotText,
+    NotTextRemedy,
+    NoTarget,
+    NoTargetRemedy,
+    DefaultUnknown,
+    NoSuchCondition,
+    ConditionIsPreset,
+    ConditionIsDataSet,
+    DidYouMean,
+    SeeList,
+    NothingToHoldAgainst,
+    NothingToHoldAgainstRemedy,
+    NoSuchPreset,
+    PresetIsCondition,
+    NoSuchDataSet,
+    NoSuchDataSetRemedy,
+    AmbiguousDataSet,
+    AmbiguousDataSetRemedy,
+
+    // Lists
+    ListConditions,
+    ListNoConditions,
+    ListDefault,
+    ListPresets,
+    ListNoPresets,
+    ListDataSets,
+    ListNoDataSets,
+    ListPatches,
+    ListProfile,
+    ListLookedIn,
+
+    // Watching
+    WatchStarts,
+    WatchEnds,
+    WatchFolderGone,
+    WatchFolderGoneRemedy,
+    WatchNotPossible,
+    WatchNotPossibleRemedy,
+    WatchBusy,
+    WatchBusyRemedy,
+    WatchLost,
+
+    // Usage
+    NothingToVerify,
+    WatchAndFiles,
+    OnlyWithWatch,
+    QuietOrJson,
+    OutIsFile,
+
+    Count
+};
+
+/// The sentence in the language of the user, with {1}, {2} ... replaced by `values`.
+std::string say(Say what, std::initializer_list<std::string_view> values = {});
+
+} // namespace check
