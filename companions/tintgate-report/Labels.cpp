@@ -6,7 +6,7 @@
 
 #include "companions/tintgate-report/Files.h"
 
-namespace reporting {
+namespace report {
 namespace {
 
 /// 2024-05-01T12:34, or the day alone if the time is not known.
@@ -204,4 +204,4 @@ Status matchLabel(const LabelOptions& options, const std::string& result, const 
     return Status::OtherResult;
 }
 
-} // namespace reporting
+} // namespace report

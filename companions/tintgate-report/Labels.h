@@ -11,7 +11,7 @@
 #include "companions/tintgate-report/Failure.h"
 #include "report/label/Label.h"
 
-namespace reporting {
+namespace report {
 
 struct LabelOptions {
     std::string label;       ///< Its path; empty for none.
@@ -45,4 +45,4 @@ void writeLabels(const LabelOptions& options, const std::string& result, const s
 /// Throws Failure.
 Status matchLabel(const LabelOptions& options, const std::string& result, const std::string& meta);
 
-} // namespace reporting
+} // namespace report

@@ -326,7 +326,7 @@ class Certificate {
         Cells labels;
         Cells values;
         for (const auto& [label, value] : m_content.model.statistics) {
-            labels.push_back({label, lines(small, 1)});
+            labels.push_back({label, small});
             values.push_back({value, bold});
         }
         const std::vector<double> widths = widthsOf(std::vector<double>(cells, -1));

@@ -162,10 +162,18 @@ std::string restText(const std::vector<report::Figure>& judged, std::size_t firs
         open += judged[i].outcome == report::Outcome::Unanswered ||
                 judged[i].outcome == report::Outcome::Unjudged;
     }
-    return filled(failed + open == 0 ? texts().morePassed : texts().more,
-                  {{"count", std::to_string(judged.size() - first)},
-                   {"failed", std::to_string(failed)},
-                   {"open", std::to_string(open)}});
+    const std::size_t all = judged.size() - first;
+    std::string outcomes;
+    for (const auto& [count, text] :
+         {std::pair{failed, texts().countFailed}, std::pair{open, texts().countOpen},
+          std::pair{all - failed - open, texts().countPassed}}) {
+        if (count > 0) {
+            outcomes +=
+                (outcomes.empty() ? "" : ", ") + filled(text, {{"count", std::to_string(count)}});
+        }
+    }
+    return filled(first == 0 ? texts().countedAll : texts().more,
+                  {{"count", std::to_string(all)}, {"outcomes", outcomes}});
 }
 
 } // namespace label

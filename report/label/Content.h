@@ -32,7 +32,7 @@ struct Content {
 /// proof must state them.
 Content contentOf(const Subject& subject);
 
-/// "and 6 more: 2 failed, 1 without data", of the criteria from `first` on.
+/// "and 6 more: 2 failed, 4 passed", of the criteria from `first` on; "6 criteria: ..." of all.
 std::string restText(const std::vector<report::Figure>& judged, std::size_t first);
 
 } // namespace label

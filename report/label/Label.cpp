@@ -11,6 +11,8 @@
 namespace label {
 namespace {
 
+constexpr double millimetresPerInch = 25.4;
+
 Properties propertiesOf(const Content& content) {
     return {std::string(verdictText(content.model.verdict)) + ": " + content.title,
             filled(texts().madeBy, {{"version", content.toolVersion}}), content.code.stamp};
@@ -32,7 +34,8 @@ std::size_t unknownIn(const std::vector<Page>& pages, const Typesetter& typesett
 Drawn drawLabel(const Subject& subject, const Size& size, Format format, double dpi) {
     const Typesetter typesetter;
     const Content content = contentOf(subject);
-    const LabelLayout layout = layOutLabel(content, size, typesetter);
+    const LabelLayout layout = layOutLabel(
+        content, size, format == Format::Png ? millimetresPerInch / dpi : usualDot, typesetter);
     return {draw({layout.page}, propertiesOf(content), format, dpi, typesetter), layout.leftOut,
             layout.criteriaCounted, unknownIn({layout.page}, typesetter)};
 }

@@ -16,8 +16,7 @@ constexpr double pointStep = 0.5;   ///< Between the font sizes that are tried.
 constexpr int linesOfField = 3;     ///< A longer text ends in an ellipsis.
 constexpr double wideRatio = 1.3;   ///< Of width to height, from which the code is at the right.
 constexpr double leastColumns = 50; ///< Width from which fields and criteria are side by side.
-constexpr double smallestModule = 0.375; ///< Three dots of a printer of 203 dpi.
-constexpr double moduleStep = 0.125;     ///< One dot of it.
+constexpr double smallestModule = 0.338; ///< Three dots at 203 dpi, four at 300 dpi.
 
 /// What gives way if the smallest font is too large: fields one by one, and between them how many
 /// criteria are listed at least.
@@ -51,46 +50,36 @@ std::vector<Columns> columnsOf(double width) {
     return all;
 }
 
-/// One row per criterion: sign, title, value with tolerance and unit. If the column is too narrow
-/// for both texts side by side, the value goes below the title.
+/// One row per criterion: sign, title, value with tolerance and unit. The value goes below a title
+/// that does not fit in one line beside it.
 class CriteriaColumn {
   public:
-    CriteriaColumn(const std::vector<report::Figure>& judged, double points, double width,
+    CriteriaColumn(const report::Model& model, double points, double width,
                    const Typesetter& typesetter)
-        : m_judged(judged), m_points(points), m_width(width), m_typesetter(typesetter) {
-        for (const report::Figure& figure : judged) {
-            m_valueWidth =
-                std::max(m_valueWidth, typesetter.widthOf(valueText(figure), valueStyle()));
-        }
-        m_valueWidth += slack;
+        : m_judged(model.judged), m_unit(model.unit), m_points(points), m_width(width),
+          m_typesetter(typesetter) {
         m_line = typesetter.measure("0", titleStyle(), width).height;
-        const double beside = m_width - indent() - m_valueWidth - gap;
-        m_isStacked = beside < 0.4 * width;
-        m_titleWidth = m_isStacked ? m_width - indent() : beside;
-        m_valueWidth = std::min(m_valueWidth, m_width - indent());
+        m_titleWidth = m_width - indent();
         m_headHeight = typesetter.measure(texts().criteria, headStyle(), width).height + rowGap();
         double height = m_headHeight;
         m_heights.push_back(height);
-        for (const report::Figure& figure : judged) {
+        for (const report::Figure& figure : m_judged) {
             height += rowHeight(figure) + rowGap();
             m_heights.push_back(height);
         }
     }
 
     /// Of the first `count` criteria and the line that counts the rest.
-    double height(std::size_t count) const { return m_heights[count] + restHeight(count); }
+    double height(std::size_t count) const {
+        return (count == 0 ? 0 : m_heights[count]) + restHeight(count);
+    }
 
     void place(Page& page, double x, double y, std::size_t count) const {
-        const double headWidth =
-            std::min(m_width, m_typesetter.widthOf(texts().criteria, headStyle()) + slack);
-        addText(page, m_typesetter, {x, y}, headWidth, texts().criteria, headStyle());
-        const double left = m_width - headWidth - gap;
-        Style head = headStyle();
-        head.bold = false;
-        head.align = Align::Right;
-        if (!m_judged.empty() && m_typesetter.widthOf(texts().headOfValues, head) <= left) {
-            addText(page, m_typesetter, {x + headWidth + gap, y}, left, texts().headOfValues, head);
+        if (count == 0) {
+            addText(page, m_typesetter, {x, y}, m_width, restLine(count), restStyle());
+            return;
         }
+        placeHead(page, x, y);
         for (std::size_t i = 0; i < count; ++i) {
             placeRow(page, x, y + m_heights[i], m_judged[i]);
         }
@@ -100,6 +89,20 @@ class CriteriaColumn {
     }
 
   private:
+    void placeHead(Page& page, double x, double y) const {
+        const double headWidth =
+            std::min(m_width, m_typesetter.widthOf(texts().criteria, headStyle()) + slack);
+        addText(page, m_typesetter, {x, y}, headWidth, texts().criteria, headStyle());
+        const double left = m_width - headWidth - gap;
+        Style head = headStyle();
+        head.bold = false;
+        head.align = Align::Right;
+        const std::string values = filled(texts().headOfValues, {{"unit", m_unit}});
+        if (m_typesetter.widthOf(values, head) <= left) {
+            addText(page, m_typesetter, {x + headWidth + gap, y}, left, values, head);
+        }
+    }
+
     static constexpr double slack = 0.1; ///< So that rounding never wraps a measured width.
 
     double indent() const { return m_line * 0.9; } ///< Room of the sign.
@@ -111,10 +114,16 @@ class CriteriaColumn {
     Style headStyle() const { return {.points = m_points, .bold = true}; }
     Style restStyle() const { return {.points = m_points, .lines = 2}; }
 
-    static std::string valueText(const report::Figure& figure) {
+    /// Without the unit if it is that of the head.
+    std::string valueText(const report::Figure& figure) const {
         return filled(texts().valueOfTolerance,
                       {{"value", figure.value}, {"tolerance", figure.tolerance}}) +
-               "\u00a0" + figure.unit;
+               (figure.unit == m_unit ? "" : "\u00a0" + figure.unit);
+    }
+
+    double valueWidth(const report::Figure& figure) const {
+        return std::min(m_typesetter.widthOf(valueText(figure), valueStyle()) + slack,
+                        m_titleWidth);
     }
 
     std::string restLine(std::size_t count) const {
@@ -128,32 +137,40 @@ class CriteriaColumn {
         return rest.empty() ? 0 : m_typesetter.measure(rest, restStyle(), m_width).height;
     }
 
+    bool isBeside(const report::Figure& figure) const {
+        return m_typesetter.widthOf(printable(figure.title), titleStyle()) + gap +
+                   valueWidth(figure) <=
+               m_titleWidth;
+    }
+
     double rowHeight(const report::Figure& figure) const {
         const double title =
             m_typesetter.measure(printable(figure.title), titleStyle(), m_titleWidth).height;
         const double value =
-            m_typesetter.measure(valueText(figure), valueStyle(), m_valueWidth).height;
-        return m_isStacked ? title + value : std::max(title, value);
+            m_typesetter.measure(valueText(figure), valueStyle(), valueWidth(figure)).height;
+        return isBeside(figure) ? std::max(title, value) : title + value;
     }
 
     void placeRow(Page& page, double x, double y, const report::Figure& figure) const {
         const double side = m_line * 0.7;
         addSign(page, signOf(figure.outcome), {x, y + 0.15 * m_line, side, side}, black);
-        const Rect title = addText(page, m_typesetter, {x + indent(), y}, m_titleWidth,
+        const bool beside = isBeside(figure);
+        const double width = valueWidth(figure);
+        const Rect title = addText(page, m_typesetter, {x + indent(), y},
+                                   m_titleWidth - (beside ? width + gap - slack : 0),
                                    printable(figure.title), titleStyle());
-        addText(page, m_typesetter, {x + m_width - m_valueWidth, m_isStacked ? title.bottom() : y},
-                m_valueWidth, valueText(figure), valueStyle());
+        addText(page, m_typesetter, {x + m_width - width, beside ? y : title.bottom()}, width,
+                valueText(figure), valueStyle());
     }
 
     const std::vector<report::Figure>& m_judged;
+    const std::string& m_unit;
     const double m_points;
     const double m_width;
     const Typesetter& m_typesetter;
-    double m_valueWidth = 0;
     double m_line = 0;
     double m_titleWidth = 0;
     double m_headHeight = 0;
-    bool m_isStacked = false;
     std::vector<double> m_heights; ///< Of the head and the first so many rows.
 };
 
@@ -220,8 +237,8 @@ class Body {
   public:
     Body(const Content& content, std::vector<Entry> entries, double width, double height,
          const Typesetter& typesetter)
-        : m_judged(content.model.judged), m_entries(std::move(entries)), m_height(height),
-          m_columns(columnsOf(width)), m_typesetter(typesetter) {}
+        : m_model(content.model), m_judged(m_model.judged), m_entries(std::move(entries)),
+          m_height(height), m_columns(columnsOf(width)), m_typesetter(typesetter) {}
 
     Choice choose() const {
         const std::vector<bool> all(m_entries.size(), true);
@@ -241,7 +258,7 @@ class Body {
         fields.place(page, x, y, choice.isKept);
         const double top = columns.sideBySide ? 0 : fieldsHeight(fields, choice.isKept);
         if (columns.sideBySide || top + criteriaHeight(choice) <= m_height) {
-            CriteriaColumn(m_judged, choice.points, columns.criteria, m_typesetter)
+            CriteriaColumn(m_model, choice.points, columns.criteria, m_typesetter)
                 .place(page, columns.sideBySide ? x + columns.fields + gap : x, y + top,
                        choice.criteria);
         }
@@ -251,7 +268,7 @@ class Body {
 
   private:
     double criteriaHeight(const Choice& choice) const {
-        return CriteriaColumn(m_judged, choice.points, choice.columns.criteria, m_typesetter)
+        return CriteriaColumn(m_model, choice.points, choice.columns.criteria, m_typesetter)
             .height(choice.criteria);
     }
 
@@ -268,7 +285,7 @@ class Body {
         if (fields > m_height) {
             return std::nullopt;
         }
-        const CriteriaColumn criteria(m_judged, points, columns.criteria, m_typesetter);
+        const CriteriaColumn criteria(m_model, points, columns.criteria, m_typesetter);
         const double room = columns.sideBySide ? m_height : m_height - fields;
         for (std::size_t count = m_judged.size();; --count) {
             if (criteria.height(count) <= room) {
@@ -309,6 +326,7 @@ class Body {
         }
     }
 
+    const report::Model& m_model;
     const std::vector<report::Figure>& m_judged;
     const std::vector<Entry> m_entries;
     const double m_height;
@@ -323,7 +341,9 @@ struct Code {
     double side = 0;
 };
 
-Code codeOf(const CodeText& text, double wanted, double most) {
+Code codeOf(const CodeText& text, double wanted, double most, double dot) {
+    constexpr double slack = 0.02; // Of a dot: rounding must not cost a whole one.
+    const double smallest = std::ceil(smallestModule / dot - slack) * dot;
     Code code;
     for (const Correction correction : {Correction::Medium, Correction::Low}) {
         const auto symbol = symbolOf(writeCodeText(text), correction);
@@ -331,8 +351,7 @@ Code codeOf(const CodeText& text, double wanted, double most) {
             continue;
         }
         const double modules = static_cast<double>(symbol->sideWithQuietZone());
-        const double module =
-            std::max(smallestModule, std::floor(wanted / modules / moduleStep) * moduleStep);
+        const double module = std::max(smallest, std::floor(wanted / modules / dot + slack) * dot);
         code = {*symbol, module * modules};
         if (code.side <= most) {
             return code;
@@ -347,8 +366,8 @@ Code codeOf(const CodeText& text, double wanted, double most) {
 /// The parts of one label, placed from the top.
 class Label {
   public:
-    Label(const Content& content, const Size& size, const Typesetter& typesetter)
-        : m_content(content), m_typesetter(typesetter),
+    Label(const Content& content, const Size& size, double dot, const Typesetter& typesetter)
+        : m_content(content), m_typesetter(typesetter), m_dot(dot),
           m_margin(std::clamp(0.04 * std::min(size.width, size.height), 1.2, 4.0)) {
         m_layout.page.size = size;
         m_isWide = size.width >= wideRatio * size.height;
@@ -382,9 +401,9 @@ class Label {
         const double high = size.height - 2 * m_margin;
         const Code code = m_isWide
                               ? codeOf(m_content.code, std::clamp(0.5 * size.height, 20.0, 45.0),
-                                       std::min(high, 0.5 * inside))
+                                       std::min(high, 0.5 * inside), m_dot)
                               : codeOf(m_content.code, std::clamp(0.35 * size.width, 20.0, 45.0),
-                                       std::min(inside, 0.4 * high));
+                                       std::min(inside, 0.4 * high), m_dot);
         Page& page = m_layout.page;
         page.symbol = code.symbol;
         if (m_isWide) {
@@ -406,7 +425,7 @@ class Label {
     void placeFoot(const Rect& area) {
         constexpr double leastWidth = 14;
         constexpr double signatureHeight = 8;
-        constexpr std::size_t digits = 16;
+        constexpr std::size_t digits = 12;
         if (area.width < leastWidth) {
             return;
         }
@@ -458,6 +477,7 @@ class Label {
 
     const Content& m_content;
     const Typesetter& m_typesetter;
+    const double m_dot;
     const double m_margin;
     bool m_isWide = false;
     double m_contentWidth = 0;
@@ -467,8 +487,9 @@ class Label {
 
 } // namespace
 
-LabelLayout layOutLabel(const Content& content, const Size& size, const Typesetter& typesetter) {
-    return Label(content, size, typesetter).layOut();
+LabelLayout layOutLabel(const Content& content, const Size& size, double dot,
+                        const Typesetter& typesetter) {
+    return Label(content, size, dot, typesetter).layOut();
 }
 
 } // namespace label

@@ -37,7 +37,11 @@ struct LabelLayout {
     std::size_t criteriaCounted = 0;  ///< Criteria that are only counted.
 };
 
-/// `size` must be in the range of sizeOf().
-LabelLayout layOutLabel(const Content& content, const Size& size, const Typesetter& typesetter);
+/// A dot of the coarsest usual label printers, in millimetres.
+inline constexpr double usualDot = 25.4 / 203;
+
+/// `size` must be in the range of sizeOf(). The code's modules are whole dots of `dot` millimetres.
+LabelLayout layOutLabel(const Content& content, const Size& size, double dot,
+                        const Typesetter& typesetter);
 
 } // namespace label

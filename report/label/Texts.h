@@ -34,8 +34,11 @@ struct Texts {
     const char* tolerance;
     const char* valueOfTolerance;
     const char* headOfValues;
-    const char* more;
-    const char* morePassed;
+    const char* more;       ///< Criteria that are not listed, by their outcomes:
+    const char* countedAll; ///< The same if none is listed.
+    const char* countFailed;
+    const char* countOpen;
+    const char* countPassed;
     const char* noCriterion;
 
     const char* hash;
