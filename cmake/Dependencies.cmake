@@ -37,6 +37,10 @@ add_library(xxhash INTERFACE)
 target_include_directories(xxhash SYSTEM INTERFACE ${libxxhash_INCLUDE_DIRS})
 pkg_check_modules(tomlplusplus REQUIRED IMPORTED_TARGET tomlplusplus)
 pkg_check_modules(libsystemd REQUIRED IMPORTED_TARGET libsystemd)
+# Labels and certificates; pangocairo brings cairo with its PDF and SVG surfaces.
+pkg_check_modules(pangocairo REQUIRED IMPORTED_TARGET pangocairo cairo-pdf cairo-svg)
+pkg_check_modules(libqrencode REQUIRED IMPORTED_TARGET libqrencode)
+pkg_check_modules(zlib REQUIRED IMPORTED_TARGET zlib)
 # The store's plug-in loads libpq on demand, so only the headers are needed to build.
 pkg_check_modules(libpq REQUIRED IMPORTED_TARGET libpq)
 add_library(libpqheaders INTERFACE)

@@ -1,8 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-#include <ctime>
 #include <filesystem>
-
-#include <sys/stat.h>
 
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
@@ -15,27 +12,6 @@ namespace report {
 namespace {
 
 namespace fs = std::filesystem;
-
-/// When a result was made: by its job, else as its measurement says, else as its file.
-std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile) {
-    byFile = false;
-    if (loaded.meta) {
-        if (const auto time = timeOf(loaded.meta->created)) {
-            return *time;
-        }
-    }
-    for (const auto& [label, text] : loaded.result.measurement.statements) {
-        if (label == "Created") {
-            if (const auto time = timeOf(text)) {
-                return *time;
-            }
-        }
-    }
-    struct stat status {};
-    byFile = true;
-    stat(loaded.path.c_str(), &status);
-    return localTime(status.st_mtime);
-}
 
 /// The path of the job's page from the trend's page.
 std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {

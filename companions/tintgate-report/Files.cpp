@@ -8,10 +8,14 @@
 #include <filesystem>
 #include <memory>
 
+#include <sys/stat.h>
+
 #include "colour/ColourFile.h"
 #include "companions/tintgate-report/Failure.h"
+#include "companions/tintgate-report/Filter.h"
 #include "report/OwnFile.h"
 #include "report/PageFile.h"
+#include "report/label/CodeText.h"
 
 namespace report {
 namespace {
@@ -20,9 +24,9 @@ namespace fs = std::filesystem;
 
 constexpr std::size_t mostBytes = std::size_t{1} << 30; ///< Of a result: millions of patches.
 
-std::string bytesOf(const std::string& path) {
+std::string bytesOf(const std::string& path, std::size_t most = mostBytes) {
     std::string bytes;
-    switch (colour::readWholeFile(path == "-" ? "/dev/stdin" : path, mostBytes, bytes)) {
+    switch (colour::readWholeFile(path == "-" ? "/dev/stdin" : path, most, bytes)) {
     case colour::Failure::None:
         return bytes;
     case colour::Failure::Missing:
@@ -70,15 +74,20 @@ std::string LoadedResult::stem() const {
     return name.ends_with(".json") && name.size() > 5 ? name.substr(0, name.size() - 5) : name;
 }
 
-LoadedResult loadResult(const std::string& path, const std::string& metaPath, std::string& note) {
+LoadedResult loadResult(const std::string& path, const std::string& metaPath, std::string& note,
+                        Hash hash) {
     LoadedResult loaded;
     loaded.path = path;
     std::string problem;
-    auto result = report::readResult(bytesOf(path), problem);
+    const std::string bytes = bytesOf(path);
+    auto result = report::readResult(bytes, problem);
     if (!result) {
         throw Failure(Status::Broken, path + " is broken: " + problem);
     }
     loaded.result = std::move(*result);
+    if (hash == Hash::Wanted) {
+        loaded.hash = label::hashOf(bytes);
+    }
     if (!metaPath.empty()) {
         loaded.meta = metaOf(metaPath);
         return loaded;
@@ -94,6 +103,30 @@ LoadedResult loadResult(const std::string& path, const std::string& metaPath, st
         note = failure.what() + std::string("; the result goes without it");
     }
     return loaded;
+}
+
+std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile) {
+    byFile = false;
+    if (loaded.meta) {
+        if (const auto time = timeOf(loaded.meta->created)) {
+            return *time;
+        }
+    }
+    for (const auto& [label, text] : loaded.result.measurement.statements) {
+        if (label == "Created") {
+            if (const auto time = timeOf(text)) {
+                return *time;
+            }
+        }
+    }
+    struct stat status {};
+    byFile = true;
+    stat(loaded.path.c_str(), &status);
+    return localTime(status.st_mtime);
+}
+
+std::string standardInput(std::size_t mostBytes) {
+    return bytesOf("-", mostBytes);
 }
 
 std::vector<std::string> filesOf(const std::vector<std::string>& arguments) {

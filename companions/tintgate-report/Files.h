@@ -2,6 +2,7 @@
 // Results in files, with the meta file that belongs to each, and where the output goes.
 #pragma once
 
+#include <cstdint>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -16,16 +17,27 @@ struct LoadedResult {
     std::string path;
     Result result;
     std::optional<Meta> meta;
+    std::string hash; ///< SHA-256 of the result's bytes, if it is wanted.
 
     const Meta* metaOrNull() const { return meta ? &*meta : nullptr; }
     std::string folder() const; ///< "." where the path has none.
     std::string stem() const;   ///< Name without folder and ".json".
 };
 
+enum class Hash { Unwanted, Wanted };
+
 /// Reads a result; "-" is standard input. An empty metaPath means "meta.json" beside a result named
 /// "output.json", as a job's run leaves them; where that one can't be used, `note` says so and the
 /// result goes without. Throws Failure (Unreadable, Broken), for a meta file only if it is named.
-LoadedResult loadResult(const std::string& path, const std::string& metaPath, std::string& note);
+LoadedResult loadResult(const std::string& path, const std::string& metaPath, std::string& note,
+                        Hash hash = Hash::Unwanted);
+
+/// When a result was made, in seconds since 1970 on the room's own clock: by its job, else as its
+/// measurement states it, else as its file does; `byFile` is true then.
+std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile);
+
+/// Throws Failure (Unreadable).
+std::string standardInput(std::size_t mostBytes);
 
 /// The files that the arguments mean, in their order: of a folder all results (named "*.json", with
 /// the format's name in their beginning) in it and in the folders below, by name. Links to folders

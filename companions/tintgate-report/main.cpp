@@ -18,6 +18,7 @@
 #include "companions/tintgate-report/Explain.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Files.h"
+#include "companions/tintgate-report/Labels.h"
 #include "companions/tintgate-report/PatchesCsv.h"
 #include "companions/tintgate-report/SummaryText.h"
 #include "companions/tintgate-report/Tidy.h"
@@ -33,6 +34,7 @@ namespace {
 namespace fs = std::filesystem;
 
 using report::Failure;
+using report::LabelOptions;
 using report::Status;
 
 constexpr const char* footer = R"(
@@ -43,6 +45,8 @@ Examples:
   tintgate-report --verdict result.json && echo passed
   tintgate-report results/ -o trend.html          the trend of all results below
   tintgate-report --store /srv/tintgate --since 30d --paper matt -o trend.html
+  tintgate-report result.json --label proof.pdf --label-size 62x100mm --pdf sheet.pdf
+  zbarimg -q --raw label.png | tintgate-report result.json --match -
   tintgate-report --explain $?                    behind a run of Tintgate
   tintgate-report --check-preset my-preset.xml    what is wrong with a preset, and where
   tintgate-report --tidy 30 --dry-run
@@ -74,6 +78,7 @@ struct Options {
     std::optional<int> code;
     std::optional<int> tidyDays;
     std::string preset;
+    LabelOptions labels;
     bool dryRun = false;
 
     bool fromStore() const { return !store.empty(); }
@@ -223,6 +228,11 @@ int run(const Options& options) {
             report::writeOutput("-", report::presetSummary(options.preset));
         } else if (options.tidyDays) {
             return static_cast<int>(tidyFolders(options));
+        } else if (options.labels.areDrawn()) {
+            report::writeLabels(options.labels, options.results[0], options.meta, say);
+        } else if (!options.labels.match.empty()) {
+            return static_cast<int>(
+                report::matchLabel(options.labels, options.results[0], options.meta));
         } else if (wantsTrend(options)) {
             return static_cast<int>(reportTrend(options));
         } else {
@@ -231,6 +241,8 @@ int run(const Options& options) {
         return static_cast<int>(Status::Done);
     } catch (const Failure& failure) {
         return fail(failure.status, failure.what());
+    } catch (const label::CannotDraw& failure) {
+        return fail(Status::NotDrawn, failure.what());
     } catch (const std::bad_alloc&) {
         return fail(Status::Internal, "out of memory");
     } catch (const std::exception& failure) {
@@ -298,6 +310,8 @@ void addOptions(CLI::App& program, Options& options) {
                   "Make no pages of jobs; lead to those that are\nthere")
         ->group(trend);
 
+    report::addLabelOptions(program, options.labels);
+
     const char* const upkeep = "Upkeep";
     program.add_option("--explain", options.code, "What an exit code of Tintgate means")
         ->type_name("CODE")
@@ -362,6 +376,14 @@ void settle(Options& options) {
     }
     if ((options.csv || options.verdict || !options.meta.empty()) && wantsTrend(options)) {
         throw CLI::ValidationError("--csv, --verdict and --meta", "are for one result");
+    }
+    report::settle(options.labels);
+    const bool isLabel = options.labels.areDrawn() || !options.labels.match.empty();
+    if (isLabel && (options.results.size() != 1 || wantsTrend(options))) {
+        throw CLI::ValidationError("--label, --pdf and --match", "are for one result");
+    }
+    if (isLabel && (options.text || options.csv || options.verdict || !options.output.empty())) {
+        throw CLI::ExcludesError("--label, --pdf and --match", "--text, --csv, --verdict and -o");
     }
 }
 

@@ -13,6 +13,8 @@
 #include "CompanionStatuses.h"
 #include "colour/ColourFile.h"
 #include "companions/viewer/Browser.h"
+#include "companions/viewer/LabelProgram.h"
+#include "companions/viewer/LabelSettings.h"
 #include "companions/viewer/MissingWrites.h"
 #include "platform/TemporaryFolder.h"
 #include "report/Meta.h"
@@ -67,13 +69,30 @@ int show(const std::string& page) {
     return end(Status::Done);
 }
 
+/// Has labels made as this machine's settings want it. False if that could not be started.
+bool startLabels(const report::Result& result, const std::string& page,
+                 const viewer::LabelInput& input) {
+    std::string problem;
+    const auto settings = viewer::readLabelSettings(viewer::labelSettingsPath(), problem);
+    const bool isPassed = result.verdict == report::Verdict::Passed;
+    if (settings && (!settings->areWanted() || (settings->onlyPassed && !isPassed))) {
+        return true;
+    }
+    if (settings && viewer::startLabelProgram(*settings, page, input, problem)) {
+        return true;
+    }
+    fail(Status::LabelNotStarted, "no label is made: " + problem);
+    return false;
+}
+
 int showReport(const std::string& metaPath) {
+    std::string metaBytes;
     std::string bytes;
     std::string problem;
-    if (!read(metaPath, bytes)) {
+    if (!read(metaPath, metaBytes)) {
         return fail(Status::MetaMissing, "can't read " + metaPath);
     }
-    const std::optional<report::Meta> meta = report::readMeta(bytes, problem);
+    const std::optional<report::Meta> meta = report::readMeta(metaBytes, problem);
     if (!meta) {
         return fail(Status::MetaBroken, metaPath + " is broken: " + problem);
     }
@@ -96,7 +115,9 @@ int showReport(const std::string& metaPath) {
     if (page.empty()) {
         return fail(Status::PageNotWritten, "can't write a page in " + folder + ": " + problem);
     }
-    return show(page);
+    const bool isLabelled = startLabels(*result, page, {bytes, metaBytes});
+    const int shown = show(page);
+    return shown == end(Status::Done) && !isLabelled ? end(Status::LabelNotStarted) : shown;
 }
 
 int showIndex() {
