@@ -31,6 +31,9 @@ std::shared_ptr<Elements> decoded(std::string_view bytes);
 /// Names and stored values of what every client asks the system ticket for.
 std::vector<std::pair<std::string, std::string>> systemKeys(const std::string& serverName);
 
+/// Whether two tickets hold the same, to the bit.
+bool haveSameKeys(const TicketContent& one, const TicketContent& other);
+
 /// The lowest number from 1 on that is not among ascending ids.
 int lowestFree(const std::vector<int>& ids);
 

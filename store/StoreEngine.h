@@ -8,6 +8,7 @@
 #include <cstdint>
 #include <functional>
 #include <iosfwd>
+#include <limits>
 #include <map>
 #include <memory>
 #include <optional>
@@ -74,6 +75,17 @@ struct FileVersion {
     std::int64_t time = 0; ///< When this content had been written.
 };
 
+/// Which older versions of a file are removed: the oldest ones, as far as both members allow it. A
+/// version that stays keeps all younger ones, so that a gap in the numbers is always a loss.
+struct Pruning {
+    int keepNewest = 0;
+    /// In seconds since 1970: contents that were written at this time or later stay.
+    std::int64_t writtenBefore = std::numeric_limits<std::int64_t>::max();
+};
+
+/// How many of a file's versions, by number, are removed.
+std::size_t countPruned(const std::vector<FileVersion>& versions, const Pruning& which);
+
 /// What a change of a ticket is about to touch.
 struct Scope {
     /// The ticket is emptied first; keys says nothing then.
@@ -118,6 +130,8 @@ class StoreEngine {
     /// used up, under the lowest free one. Its id, or -1.
     virtual int createNext(int type) = 0;
     virtual bool remove(int type, int id) = 0;
+    /// The same, but only if the ticket's keys are still the known ones.
+    virtual bool removeUnchanged(int type, int id, const TicketContent& known) = 0;
 
     /// One key; null when there is no such key or ticket. The same key again costs no more than to
     /// see that it has not changed.
@@ -167,13 +181,21 @@ class StoreEngine {
     /// Copies a file, of one version throughout, to the stream.
     virtual void getFile(std::string_view path, std::ostream& to) = 0;
     virtual std::vector<FileEntry> files() = 0; ///< By path.
+    /// Nothing if there is no such file.
+    virtual std::optional<FileEntry> fileAt(std::string_view path) = 0;
 
     virtual std::vector<FileVersion> versions(std::string_view path) = 0; ///< By number.
     virtual void getVersion(std::string_view path, int number, std::ostream& to) = 0;
     /// Puts a version in place again; what it replaces is kept as a version in turn.
     virtual void restoreVersion(std::string_view path, int number) = 0;
-    /// Removes a file's versions but for the newest ones. The number removed.
-    virtual int pruneVersions(std::string_view path, int keepNewest) = 0;
+    /// Removes versions of a file. The number removed.
+    virtual int pruneVersions(std::string_view path, const Pruning& which) = 0;
+    /// Removes a file with its versions and the numbers that they had: a later file of this path
+    /// starts anew. Nothing of it is left but the folders that it was in. With a number, only if
+    /// highestVersion still gives it, so that nothing was delivered since. False, and nothing is
+    /// changed, if not or if there is neither a file nor a version. If it is cut off, the file is
+    /// still there, maybe without versions, and can be removed again.
+    virtual bool removeFile(std::string_view path, std::optional<int> highestVersion = {}) = 0;
     /// Removes what interrupted deliveries left behind. The number of files removed.
     virtual int removeLeftovers() = 0;
 

@@ -1,6 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "store/Engines.h"
 
+#include <algorithm>
+
 #include "store/KeyBytes.h"
 
 namespace store {
@@ -46,6 +48,25 @@ std::vector<std::pair<std::string, std::string>> systemKeys(const std::string& s
     };
     return {{"System/Product/MajorVersion", stored(majorVersion)},
             {"System/ServerName", stored(Text{std::make_shared<Bytes>(serverName)})}};
+}
+
+std::size_t countPruned(const std::vector<FileVersion>& versions, const Pruning& which) {
+    const auto keep = static_cast<std::size_t>(std::max(which.keepNewest, 0));
+    std::size_t count = 0;
+    while (count + keep < versions.size() && versions[count].time < which.writtenBefore) {
+        ++count;
+    }
+    return count;
+}
+
+bool haveSameKeys(const TicketContent& one, const TicketContent& other) {
+    const auto& left = one.keys();
+    const auto& right = other.keys();
+    return std::equal(
+        left.begin(), left.end(), right.begin(), right.end(), [](const auto& a, const auto& b) {
+            return a.first == b.first &&
+                   (a.second == b.second || keyBytes(*a.second) == keyBytes(*b.second));
+        });
 }
 
 int lowestFree(const std::vector<int>& ids) {

@@ -5,9 +5,11 @@
 
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
+#include "companions/tintgate-store/Days.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/JobJdf.h"
 #include "companions/tintgate-store/LocalFile.h"
+#include "companions/tintgate-store/Removal.h"
 #include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
 #include "companions/tintgate-store/XmlCheck.h"
@@ -23,16 +25,14 @@ struct FileOptions {
     std::string path;
     std::string version;
     std::string keep;
+    std::string older;
+    std::vector<std::string> paths;
     bool all = false;
+    bool dryRun = false;
 };
 
 int versionNumber(const FileOptions& options) {
     return wholeNumber(options.version, 1, std::numeric_limits<int>::max(), "version");
-}
-
-/// Server paths are shown as they are told to the store: from its root.
-std::string shownPath(const std::string& path) {
-    return "/" + path.substr(std::min(path.size(), path.find_first_not_of('/')));
 }
 
 std::string shownTime(std::int64_t seconds) {
@@ -181,25 +181,53 @@ void restore(const Invocation& invocation, const FileOptions& options) {
 }
 
 void prune(const Invocation& invocation, const FileOptions& options) {
-    const int keep =
-        wholeNumber(options.keep, 0, std::numeric_limits<int>::max(), "number of versions");
     if (options.all != options.path.empty()) {
         throw Failure(Status::BadCommand, "say a path, or --all");
     }
+    if (options.keep.empty() && options.older.empty()) {
+        throw Failure(Status::BadCommand, "say --keep, --older or both");
+    }
+    store::Pruning which;
+    if (!options.keep.empty()) {
+        which.keepNewest =
+            wholeNumber(options.keep, 0, std::numeric_limits<int>::max(), "number of versions");
+    }
+    if (!options.older.empty()) {
+        which.writtenBefore = timeBefore(daysOf(options.older, "--older"));
+    }
     const auto store = invocation.open();
-    std::int64_t removed = 0;
+    Removal removal(*store, options.dryRun);
     if (options.all) {
         for (const auto& file : store->files()) {
-            removed += store->pruneVersions(file.path, keep);
+            removal.prune(file.path, which);
         }
     } else {
-        removed = store->pruneVersions(options.path, keep);
+        removal.prune(options.path, which);
     }
-    std::cout << "Removed " << counted(removed, "version") << '\n';
+    removal.show(invocation.json);
+}
+
+void remove(const Invocation& invocation, const FileOptions& options) {
+    const auto store = invocation.open();
+    // All are looked for before the first is removed.
+    for (const auto& path : options.paths) {
+        if (!store->fileAt(path) && store->versions(path).empty()) {
+            throw Failure(Status::NotThere, "there is no file " + printable(shownPath(path)));
+        }
+    }
+    Removal removal(*store, options.dryRun);
+    for (const auto& path : options.paths) {
+        removal.removeFile(path);
+    }
+    removal.show(invocation.json);
 }
 
 void clean(const Invocation& invocation) {
     const int removed = invocation.open()->removeLeftovers();
+    if (invocation.json) {
+        showObject({{"leftovers", removed}}, true);
+        return;
+    }
     std::cout << "Removed " << counted(removed, "leftover") << '\n';
 }
 
@@ -242,7 +270,18 @@ void addFileCommands(Command program, Invocation& invocation) {
     auto pruning = command("prune", "Remove older versions", prune);
     pruning.option("path", options->path, "Server path");
     pruning.flag("--all", options->all, "Of all files");
-    pruning.option("--keep", options->keep, "How many of the newest versions stay").required();
+    pruning.option("--keep", options->keep, "How many of the newest versions stay");
+    pruning.option("--older", options->older,
+                   "Only those that were written so long ago, such as 90d for 90 days");
+    pruning.flag("--dry-run", options->dryRun, "Remove nothing, and say what would be freed");
+    pruning.footer("With both, a version goes if neither keeps it. The oldest go first: a version "
+                   "that stays keeps all\nyounger ones. The file itself stays in any case.");
+
+    auto removing = command("delete", "Remove files with all their versions", remove);
+    removing.option("paths", options->paths, "Server paths").required();
+    removing.flag("--dry-run", options->dryRun, "Remove nothing, and say what would be freed");
+    removing.footer("There is no way back. Whether a job names the file is not looked at: "
+                    "\"job delete\" removes the files\nof a job.");
 
     command("clean", "Remove what interrupted deliveries left behind",
             [](const auto& invoked, const auto&) { clean(invoked); });

@@ -4,7 +4,9 @@
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Failure.h"
+#include "companions/tintgate-store/JobFiles.h"
 #include "companions/tintgate-store/Jobs.h"
+#include "companions/tintgate-store/Removal.h"
 #include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
 
@@ -16,6 +18,12 @@ struct ResetOptions {
     std::string job;
     std::string strip;
     bool family = false;
+};
+
+struct DeleteOptions {
+    std::vector<std::string> jobs;
+    bool family = false;
+    bool dryRun = false;
 };
 
 struct NoOptions {};
@@ -105,6 +113,28 @@ void reset(const Invocation& invocation, const ResetOptions& options) {
     showRows({}, rows, true);
 }
 
+void remove(const Invocation& invocation, const DeleteOptions& options) {
+    const auto store = invocation.open();
+    std::set<int> jobs;
+    for (const auto& text : options.jobs) {
+        const int id = jobNumber(text);
+        if (!store->exists(jobType, id)) {
+            throw Failure(Status::NotThere, "there is no job " + std::to_string(id));
+        }
+        if (options.family) {
+            jobs.merge(familyOf(*store, id));
+        } else {
+            jobs.insert(id);
+        }
+    }
+    const JobFiles files(*store);
+    Removal removal(*store, options.dryRun);
+    for (const int job : jobs) {
+        removal.removeJob(job, files, jobs);
+    }
+    removal.show(invocation.json);
+}
+
 } // namespace
 
 void addJobCommands(Command program, Invocation& invocation) {
@@ -116,6 +146,19 @@ void addJobCommands(Command program, Invocation& invocation) {
             "number that the\njob shows (211 passed, 212 failed). A strip is \"measured\" if it "
             "has a measurement without a result,\nand \"cut off\" if its result is not "
             "complete: see \"A job whose run was cut off\" in docs/stores.md.");
+
+    auto group = program.group("job", "Jobs, with the files that belong to them");
+    const auto removed = std::make_shared<DeleteOptions>();
+    auto removing = addCommand<DeleteOptions>(
+        group, invocation, "delete", "Remove jobs: ticket, JDF and the JDF's versions", removed,
+        [&](const DeleteOptions& given) { remove(invocation, given); });
+    removing.option("jobs", removed->jobs, "Numbers of the jobs").required();
+    removing.flag("--family", removed->family, "The jobs of the same parent and the parent too");
+    removing.flag("--dry-run", removed->dryRun, "Remove nothing, and say what would be freed");
+    removing.footer(
+        "There is no way back; \"archive\" moves jobs to another store instead. A JDF that another "
+        "job names stays,\nand so do control strips, profiles and all other files of the server. "
+        "A removal that was cut off is run again.");
 
     const auto options = std::make_shared<ResetOptions>();
     auto command = addCommand<ResetOptions>(

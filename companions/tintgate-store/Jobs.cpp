@@ -5,6 +5,7 @@
 #include <functional>
 #include <set>
 
+#include "companions/tintgate-store/Days.h"
 #include "companions/tintgate-store/KeyValue.h"
 #include "companions/tintgate-store/TicketName.h"
 #include "jobkeys/JobState.h"
@@ -39,6 +40,15 @@ void noteLastKey(Job& job, const Elements& value) {
     job.strips[strip].hasLastKey = job.strips[strip].hasLastKey || value != nullptr;
 }
 
+/// Days that are not written as a run of the tool does it are passed over.
+void noteDate(Job& job, const Elements& value) {
+    const std::string day = textOf(value).value_or("");
+    if (isDay(day)) {
+        job.measured =
+            std::max(job.measured, day); // In this form the later day is the greater text.
+    }
+}
+
 /// The meaning of each key for a job.
 const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> readers = {
     {"Input/Title",
@@ -70,6 +80,8 @@ const std::vector<std::pair<std::string, void (*)(Job&, const Elements&)>> reade
      [](Job& job, const Elements& value) { job.strips[0].approval = integerOf(value); }},
     {approvalKey(1),
      [](Job& job, const Elements& value) { job.strips[1].approval = integerOf(value); }},
+    {measured(0, "Date"), noteDate},
+    {measured(1, "Date"), noteDate},
     {measured(0, lastKeys[0]), noteLastKey<0>},
     {measured(0, lastKeys[1]), noteLastKey<0>},
     {measured(1, lastKeys[0]), noteLastKey<1>},
@@ -83,24 +95,6 @@ Job jobOf(int id, const std::function<Elements(const std::string& key)>& valueOf
         read(job, valueOf(key));
     }
     return job;
-}
-
-std::set<int> familyOf(store::StoreEngine& store, int id) {
-    const auto jobs = allJobs(store);
-    const auto self =
-        std::find_if(jobs.begin(), jobs.end(), [&](const Job& job) { return job.id == id; });
-    const int parent = self == jobs.end() ? 0 : self->parent;
-    std::set<int> ids;
-    if (parent > 0) {
-        ids.insert(parent);
-    }
-    for (const auto& job : jobs) {
-        if (job.parent == id || (parent > 0 && job.parent == parent)) {
-            ids.insert(job.id);
-        }
-    }
-    ids.erase(id);
-    return ids;
 }
 
 void removeKey(store::TicketContent& content, const std::string& key, ResetResult& result) {
@@ -253,12 +247,31 @@ std::vector<Job> allJobs(store::StoreEngine& store) {
     return sorted;
 }
 
+std::set<int> familyOf(store::StoreEngine& store, int id) {
+    const auto jobs = allJobs(store);
+    const auto self =
+        std::find_if(jobs.begin(), jobs.end(), [&](const Job& job) { return job.id == id; });
+    const int parent = self == jobs.end() ? 0 : self->parent;
+    std::set<int> ids = {id};
+    if (parent > 0) {
+        ids.insert(parent);
+    }
+    for (const auto& job : jobs) {
+        if (job.parent == id || (parent > 0 && job.parent == parent)) {
+            ids.insert(job.id);
+        }
+    }
+    return ids;
+}
+
 std::vector<ResetResult> resetJob(store::StoreEngine& store, int id, const std::vector<int>& strips,
                                   bool family) {
     std::vector<ResetResult> results = {resetOne(store, id, strips)};
     if (family && results[0].there) {
         for (const int relative : familyOf(store, id)) {
-            results.push_back(resetOne(store, relative, strips));
+            if (relative != id) {
+                results.push_back(resetOne(store, relative, strips));
+            }
         }
     }
     return results;

@@ -4,6 +4,7 @@
 
 #include <map>
 #include <optional>
+#include <set>
 #include <string>
 #include <vector>
 
@@ -27,6 +28,7 @@ struct Job {
     int id = 0;
     int parent = 0;
     std::string title;
+    std::string measured; ///< The day of the latest measurement, such as 2024-05-01, or empty.
     int displayStatus = 0;
     int showInVerifier = 0;
     int fileType = 0;
@@ -42,6 +44,10 @@ struct Job {
 
 /// All jobs, by id.
 std::vector<Job> allJobs(store::StoreEngine& store);
+
+/// The job itself, its parent, and the jobs that either of them is the parent of. Only ids that a
+/// job has or names; see exists.
+std::set<int> familyOf(store::StoreEngine& store, int id);
 
 struct ResetResult {
     int id = 0;

@@ -230,13 +230,23 @@ class PostgresEngine : public StoreEngine {
     bool remove(int type, int id) override {
         return m_connection.once([&] {
             noteChange();
-            if (type == jobType) {
-                return m_connection
-                           .run(removeJob, type, id, blockOf(id), std::string(entryBytes, '\0'),
-                                position(entryOffset(id)))
-                           .number(0, 0) != 0;
+            sendRemove(type, id);
+            return isRemoved(type, m_connection.finish()[0]);
+        });
+    }
+
+    bool removeUnchanged(int type, int id, const TicketContent& known) override {
+        return m_connection.once([&] {
+            noteChange();
+            Transaction transaction(m_connection);
+            m_connection.send(lockTicket, type, id);
+            m_connection.send(allKeys, type, id);
+            const auto results = transaction.finish();
+            if (results[0].rows() == 0 || !haveSameKeys(contentOf(results[1]), known)) {
+                return false;
             }
-            return m_connection.run(removeTicket, type, id).changed() != 0;
+            sendRemove(type, id);
+            return isRemoved(type, transaction.commit()[0]);
         });
     }
 
@@ -363,6 +373,9 @@ class PostgresEngine : public StoreEngine {
     std::vector<FileEntry> files() override {
         return m_connection.repeating([&] { return m_files.list(); });
     }
+    std::optional<FileEntry> fileAt(std::string_view path) override {
+        return m_connection.repeating([&] { return m_files.at(path); });
+    }
     std::vector<FileVersion> versions(std::string_view path) override {
         return m_connection.repeating([&] { return m_files.versions(path); });
     }
@@ -375,10 +388,16 @@ class PostgresEngine : public StoreEngine {
             m_files.restoreVersion(path, number);
         });
     }
-    int pruneVersions(std::string_view path, int keepNewest) override {
+    int pruneVersions(std::string_view path, const Pruning& which) override {
         return m_connection.once([&] {
             noteChange();
-            return m_files.pruneVersions(path, keepNewest);
+            return m_files.pruneVersions(path, which);
+        });
+    }
+    bool removeFile(std::string_view path, std::optional<int> highestVersion) override {
+        return m_connection.once([&] {
+            noteChange();
+            return m_files.remove(path, highestVersion);
         });
     }
     int removeLeftovers() override { return 0; } // The server undoes what is cut off.
@@ -503,6 +522,19 @@ class PostgresEngine : public StoreEngine {
             m_connection.send(addEntry, type, id, blockOf(id), block,
                               block.substr(entryOffset(id), entryBytes), position(entryOffset(id)));
         }
+    }
+
+    /// Sends what removes a ticket.
+    void sendRemove(int type, int id) {
+        if (type == jobType) {
+            m_connection.send(removeJob, type, id, blockOf(id), std::string(entryBytes, '\0'),
+                              position(entryOffset(id)));
+        } else {
+            m_connection.send(removeTicket, type, id);
+        }
+    }
+    static bool isRemoved(int type, const Result& result) {
+        return (type == jobType ? result.number(0, 0) : result.changed()) != 0;
     }
 
     /// Sends what a change means for the overview.

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <istream>
+#include <limits>
 #include <ostream>
 
 #include "store/ServerPath.h"
@@ -63,6 +64,9 @@ constexpr Statement piece = {
 constexpr Statement allFiles = {
     "SELECT path, size, written FROM tintgate.files"
     " JOIN tintgate.contents ON contents.number = content ORDER BY path"};
+constexpr Statement oneFile = {
+    "SELECT size, written FROM tintgate.files"
+    " LEFT JOIN tintgate.contents ON contents.number = content WHERE path = $1"};
 constexpr Statement allVersions = {
     "SELECT versions.number, size, written FROM tintgate.versions"
     " JOIN tintgate.contents ON contents.number = content WHERE path = $1"
@@ -72,9 +76,10 @@ constexpr Statement putVersion = {
     " ON CONFLICT (path, number) DO UPDATE SET content = excluded.content,"
     " written = excluded.written"};
 constexpr Statement dropVersions = {
-    "DELETE FROM tintgate.versions WHERE path = $1 AND number NOT IN"
-    " (SELECT number FROM tintgate.versions WHERE path = $1 ORDER BY number DESC LIMIT $2)"
-    " RETURNING content"};
+    "DELETE FROM tintgate.versions WHERE path = $1 AND number <= $2 RETURNING content"};
+constexpr Statement lockWhole = {
+    "SELECT content, last_version FROM tintgate.files WHERE path = $1 FOR UPDATE"};
+constexpr Statement dropFile = {"DELETE FROM tintgate.files WHERE path = $1"};
 constexpr Statement dropContent = {
     "DELETE FROM tintgate.contents WHERE number = $1"
     " AND NOT EXISTS (SELECT FROM tintgate.files WHERE content = $1)"
@@ -162,6 +167,22 @@ void exchangeFile(Connection& connection, Transaction& transaction, const Place&
     transaction.commit();
 }
 
+std::vector<FileVersion> versionsIn(const Result& rows) {
+    std::vector<FileVersion> list;
+    for (int row = 0; row < rows.rows(); ++row) {
+        list.push_back({static_cast<int>(rows.number(row, 0)),
+                        static_cast<std::uint64_t>(rows.number(row, 1)), rows.number(row, 2)});
+    }
+    return list;
+}
+
+/// Sends what removes contents that nothing leads to any more.
+void dropContents(Connection& connection, const Result& numbers) {
+    for (int row = 0; row < numbers.rows(); ++row) {
+        connection.send(dropContent, numbers.number(row, 0));
+    }
+}
+
 /// Why there is nothing at a path.
 [[noreturn]] void failMissing(Connection& connection, const Place& place) {
     const Result among =
@@ -229,15 +250,21 @@ std::vector<FileEntry> Files::list() {
     return entries;
 }
 
+std::optional<FileEntry> Files::at(std::string_view path) {
+    const Place place(path);
+    const Result row = m_connection.run(oneFile, place.path);
+    if (row.rows() == 0) {
+        return std::nullopt;
+    }
+    if (row.isNull(0, 0)) {
+        place.refuse();
+    }
+    return FileEntry{place.path, static_cast<std::uint64_t>(row.number(0, 0)), row.number(0, 1)};
+}
+
 std::vector<FileVersion> Files::versions(std::string_view path) {
     const Place place(path);
-    const Result rows = m_connection.run(allVersions, place.path);
-    std::vector<FileVersion> list;
-    for (int row = 0; row < rows.rows(); ++row) {
-        list.push_back({static_cast<int>(rows.number(row, 0)),
-                        static_cast<std::uint64_t>(rows.number(row, 1)), rows.number(row, 2)});
-    }
-    return list;
+    return versionsIn(m_connection.run(allVersions, place.path));
 }
 
 void Files::getVersion(std::string_view path, int number, std::ostream& to) {
@@ -262,18 +289,42 @@ void Files::restoreVersion(std::string_view path, int number) {
     exchangeFile(m_connection, transaction, place, results[1].number(0, 0));
 }
 
-int Files::pruneVersions(std::string_view path, int keepNewest) {
+int Files::pruneVersions(std::string_view path, const Pruning& which) {
     const Place place(path);
     Transaction transaction(m_connection);
     m_connection.send(lockFile, place.path);
-    m_connection.send(dropVersions, place.path, std::int64_t{std::max(keepNewest, 0)});
-    const auto results = transaction.finish();
-    const Result& dropped = results[1];
-    for (int row = 0; row < dropped.rows(); ++row) {
-        m_connection.send(dropContent, dropped.number(row, 0));
+    m_connection.send(allVersions, place.path);
+    const auto list = versionsIn(transaction.finish()[1]);
+    const std::size_t count = countPruned(list, which);
+    if (count == 0) {
+        return 0;
     }
+    m_connection.send(dropVersions, place.path, list[count - 1].number);
+    const auto results = transaction.finish();
+    dropContents(m_connection, results[0]);
     transaction.commit();
-    return dropped.rows();
+    return results[0].rows();
+}
+
+bool Files::remove(std::string_view path, std::optional<int> highestVersion) {
+    const Place place(path);
+    Transaction transaction(m_connection);
+    m_connection.send(lockWhole, place.path);
+    const auto found = transaction.finish();
+    const Result& file = found[0];
+    if (file.rows() == 0 || (highestVersion && file.number(0, 1) != *highestVersion)) {
+        return false;
+    }
+    if (file.isNull(0, 0)) {
+        place.refuse();
+    }
+    m_connection.send(dropVersions, place.path, std::numeric_limits<int>::max());
+    m_connection.send(dropFile, place.path);
+    const auto dropped = transaction.finish();
+    dropContents(m_connection, dropped[0]);
+    m_connection.send(dropContent, file.number(0, 0));
+    transaction.commit();
+    return true;
 }
 
 void Files::placeVersion(std::string_view path, const FileVersion& version, std::istream& from) {

@@ -3,6 +3,7 @@
 // server. A delivery is one transaction, so that nothing is ever left of one that was cut off.
 #pragma once
 
+#include <optional>
 #include <string_view>
 
 #include "store/postgres/Postgres.h"
@@ -17,10 +18,12 @@ class Files {
     void put(std::string_view path, std::istream& from);
     void get(std::string_view path, std::ostream& to);
     std::vector<FileEntry> list();
+    std::optional<FileEntry> at(std::string_view path);
     std::vector<FileVersion> versions(std::string_view path);
     void getVersion(std::string_view path, int number, std::ostream& to);
     void restoreVersion(std::string_view path, int number);
-    int pruneVersions(std::string_view path, int keepNewest);
+    int pruneVersions(std::string_view path, const Pruning& which);
+    bool remove(std::string_view path, std::optional<int> highestVersion);
     void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
     int highestVersion(std::string_view path);
     void raiseHighestVersion(std::string_view path, int number);

@@ -71,7 +71,8 @@ class Place {
         return folders;
     }
 
-    std::string text() const { return shownServerPath(joinedParts(m_parts, m_parts.size())); }
+    std::string path() const { return joinedParts(m_parts, m_parts.size()); }
+    std::string text() const { return shownServerPath(path()); }
 
   private:
     std::vector<std::string> m_parts;
@@ -411,6 +412,39 @@ void keepVersion(const Descriptor& files, const Descriptor& folder, const Place&
     flush(versions, what);
 }
 
+/// Removes a file's versions, and the folders above them as far as they are empty then. The
+/// exchange lock is held, so that nobody else makes any of them. False if there are none.
+bool removeVersions(const Descriptor& files, const Place& place) {
+    const std::string what = place.text();
+    auto folders = place.versions();
+    bool removed = false;
+    try {
+        const Descriptor versions = walk(files, folders, false, what);
+        for (const auto& version : versionsIn(versions)) {
+            if (unlinkat(versions.get(), versionName(version.version.number).c_str(), 0) != 0) {
+                fail(errno, what);
+            }
+            removed = true;
+        }
+        for (const auto& name : namesIn(versions)) {
+            if (name.starts_with(usedUpPrefix)) {
+                unlinkat(versions.get(), name.c_str(), 0);
+            }
+        }
+        for (; folders.size() > 1; folders.pop_back()) {
+            const Descriptor above = walk(files, {folders.begin(), folders.end() - 1}, false, what);
+            if (unlinkat(above.get(), folders.back().c_str(), AT_REMOVEDIR) != 0) {
+                break; // Versions of other files are in it.
+            }
+        }
+    } catch (const StoreFailure& failure) {
+        if (!isMissing(failure)) {
+            throw;
+        }
+    }
+    return removed;
+}
+
 void deliver(const Descriptor& files, const Place& place, const Source& source) {
     const std::string what = place.text();
     const Descriptor folder = walk(files, place.folders(), true, what);
@@ -589,6 +623,22 @@ std::vector<FileEntry> ServerFiles::list() {
     return entries;
 }
 
+std::optional<FileEntry> ServerFiles::at(std::string_view path) {
+    const Place place(path);
+    try {
+        const Descriptor folder = walk(m_files, place.folders(), false, place.text());
+        const Descriptor file = openFile(folder, place.name(), place.text());
+        const struct stat status = statusOf(file.get(), place.text());
+        return FileEntry{place.path(), static_cast<std::uint64_t>(status.st_size),
+                         std::int64_t{status.st_mtim.tv_sec}};
+    } catch (const StoreFailure& failure) {
+        if (!isMissing(failure)) {
+            throw;
+        }
+        return std::nullopt;
+    }
+}
+
 std::vector<FileVersion> ServerFiles::versions(std::string_view path) {
     const Place place(path);
     const std::string what = place.text();
@@ -634,27 +684,54 @@ void ServerFiles::restoreVersion(std::string_view path, int number) {
             [&](char* block, std::size_t size) { return readBlock(version, block, size, what); });
 }
 
-int ServerFiles::pruneVersions(std::string_view path, int keepNewest) {
+int ServerFiles::pruneVersions(std::string_view path, const Pruning& which) {
     const Place place(path);
     const std::string what = place.text();
     const ExchangeLock lock(m_files);
     const auto list = versions(path);
-    int removed = 0;
-    if (list.empty()) {
-        return removed;
+    const std::size_t count = countPruned(list, which);
+    if (count == 0) {
+        return 0;
     }
     const Descriptor folder = walk(m_files, place.versions(), false, what);
-    const auto keep = static_cast<std::size_t>(std::max(keepNewest, 0));
-    if (keep == 0) {
+    if (count == list.size()) {
         useUp(folder, list.back().number, what);
     }
-    for (std::size_t i = 0; i + keep < list.size(); ++i) {
+    for (std::size_t i = 0; i < count; ++i) {
         if (unlinkat(folder.get(), versionName(list[i].number).c_str(), 0) != 0) {
             fail(errno, what);
         }
-        ++removed;
     }
-    return removed;
+    return static_cast<int>(count);
+}
+
+bool ServerFiles::remove(std::string_view path, std::optional<int> highestVersion) {
+    const Place place(path);
+    const std::string what = place.text();
+    const ExchangeLock lock(m_files);
+    if (highestVersion && this->highestVersion(path) != *highestVersion) {
+        return false;
+    }
+    Descriptor folder;
+    try {
+        Descriptor found = walk(m_files, place.folders(), false, what);
+        openFile(found, place.name(), what); // Throws if it is something else.
+        folder = std::move(found);
+    } catch (const StoreFailure& failure) {
+        if (!isMissing(failure)) {
+            throw;
+        }
+    }
+    // The file goes last: while it is there, a removal that was cut off can be finished.
+    const bool hadVersions = removeVersions(m_files, place);
+    if (folder.get() < 0) {
+        return hadVersions;
+    }
+    if (unlinkat(folder.get(), place.name().c_str(), 0) != 0) {
+        fail(errno, what);
+    }
+    flush(folder, what);
+    return true;
 }
 
 int ServerFiles::removeLeftovers() {

@@ -14,6 +14,7 @@
 // reached or be in the way.
 #pragma once
 
+#include <optional>
 #include <string>
 #include <string_view>
 
@@ -50,10 +51,12 @@ class ServerFiles {
     void put(std::string_view path, std::istream& from);
     void get(std::string_view path, std::ostream& to);
     std::vector<FileEntry> list();
+    std::optional<FileEntry> at(std::string_view path);
     std::vector<FileVersion> versions(std::string_view path);
     void getVersion(std::string_view path, int number, std::ostream& to);
     void restoreVersion(std::string_view path, int number);
-    int pruneVersions(std::string_view path, int keepNewest);
+    int pruneVersions(std::string_view path, const Pruning& which);
+    bool remove(std::string_view path, std::optional<int> highestVersion);
     int removeLeftovers();
     /// Not on the disk before finishCopy.
     void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);

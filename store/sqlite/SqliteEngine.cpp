@@ -242,13 +242,20 @@ class SqliteEngine : public StoreEngine {
             return false;
         }
         Transaction transaction(m_database);
-        m_remove.run(type, id).finish();
-        const bool removed = sqlite3_changes(m_database.get()) != 0;
-        if (removed && type == jobType) {
-            writeEntry(id, {{entryOffset(id), std::string(entryBytes, '\0')}});
-        }
+        const bool removed = removeTicket(type, id);
         transaction.commit();
         return removed;
+    }
+
+    bool removeUnchanged(int type, int id, const TicketContent& known) override {
+        Transaction transaction(m_database);
+        TicketContent stored;
+        if (!take(m_content.run(type, id), stored) || !haveSameKeys(stored, known)) {
+            return false;
+        }
+        removeTicket(type, id);
+        transaction.commit();
+        return true;
     }
 
     std::shared_ptr<const Elements> key(int type, int id, std::string_view name) override {
@@ -411,6 +418,7 @@ class SqliteEngine : public StoreEngine {
     void putFile(std::string_view path, std::istream& from) override { m_files.put(path, from); }
     void getFile(std::string_view path, std::ostream& to) override { m_files.get(path, to); }
     std::vector<FileEntry> files() override { return m_files.list(); }
+    std::optional<FileEntry> fileAt(std::string_view path) override { return m_files.at(path); }
     std::vector<FileVersion> versions(std::string_view path) override {
         return m_files.versions(path);
     }
@@ -420,8 +428,11 @@ class SqliteEngine : public StoreEngine {
     void restoreVersion(std::string_view path, int number) override {
         m_files.restoreVersion(path, number);
     }
-    int pruneVersions(std::string_view path, int keepNewest) override {
-        return m_files.pruneVersions(path, keepNewest);
+    int pruneVersions(std::string_view path, const Pruning& which) override {
+        return m_files.pruneVersions(path, which);
+    }
+    bool removeFile(std::string_view path, std::optional<int> highestVersion) override {
+        return m_files.remove(path, highestVersion);
     }
     int removeLeftovers() override { return m_files.removeLeftovers(); }
 
@@ -489,6 +500,15 @@ class SqliteEngine : public StoreEngine {
             writeEntry(id, {{entryOffset(id), std::string(1, '\1')}});
         }
         return true;
+    }
+
+    bool removeTicket(int type, int id) {
+        m_remove.run(type, id).finish();
+        const bool removed = sqlite3_changes(m_database.get()) != 0;
+        if (removed && type == jobType) {
+            writeEntry(id, {{entryOffset(id), std::string(entryBytes, '\0')}});
+        }
+        return removed;
     }
 
     /// Bytes by where in a block they go.

@@ -93,13 +93,13 @@ TEST_P(ServerFiles, KeepsEachVersionUntilItIsPruned) {
     EXPECT_EQ(versions(*engine, path), (Texts{"one", "two!", "three", "three", ""}));
     EXPECT_EQ(faultOf([&] { engine->restoreVersion(path, 9); }), Fault::NoFile);
 
-    EXPECT_EQ(engine->pruneVersions(path, 2), 3);
+    EXPECT_EQ(engine->pruneVersions(path, {.keepNewest = 2}), 3);
     putFile(*engine, path, "last");
     EXPECT_EQ(versions(*engine, path), (Texts{"three", "", "two!"}));
     EXPECT_EQ(engine->versions(path).back().number, 6) << "numbers are not used twice";
     // A path below a file's versions.
     putFile(*engine, path + ".d/1", "below");
-    EXPECT_EQ(engine->pruneVersions(path, 0), 3);
+    EXPECT_EQ(engine->pruneVersions(path, {.keepNewest = 0}), 3);
     EXPECT_EQ(file(*engine, path), "last");
     EXPECT_EQ(file(*engine, path + ".d/1"), "below");
     EXPECT_EQ(engine->files().size(), 2u);

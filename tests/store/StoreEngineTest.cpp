@@ -56,12 +56,12 @@ TEST_P(StoreEngine, NumbersOfVersionsAndNamesOfUsersAreTakenOnce) {
     for (const char* text : {"one", "two", "three"}) {
         putFile(*engine, "a/b", text);
     }
-    EXPECT_EQ(engine->pruneVersions("a/b", 0), 2);
-    EXPECT_EQ(engine->pruneVersions("a/b", 0), 0);
+    EXPECT_EQ(engine->pruneVersions("a/b", {.keepNewest = 0}), 2);
+    EXPECT_EQ(engine->pruneVersions("a/b", {.keepNewest = 0}), 0);
     putFile(*engine, "a/b", "four");
     ASSERT_EQ(engine->versions("a/b").size(), 1u);
     EXPECT_EQ(engine->versions("a/b")[0].number, 3);
-    EXPECT_EQ(engine->pruneVersions("a/b", 0), 1);
+    EXPECT_EQ(engine->pruneVersions("a/b", {.keepNewest = 0}), 1);
     engine->restoreVersion("a/b", putAndKeep(*engine, "a/b", "five"));
     EXPECT_EQ(engine->versions("a/b").back().number, 5);
     EXPECT_EQ(engine->files().size(), 1u);
