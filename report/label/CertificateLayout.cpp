@@ -5,6 +5,7 @@
 #include <cmath>
 #include <utility>
 
+#include "report/label/ColourCharts.h"
 #include "report/label/HistogramChart.h"
 #include "report/label/Parts.h"
 #include "report/label/Texts.h"
@@ -89,6 +90,7 @@ class Certificate {
         placeHistogram();
         placeWorstPatches();
         placeWarnings();
+        placeColourCharts();
         placeEnd();
         placeFeet();
         return std::move(m_layout);
@@ -297,8 +299,8 @@ class Certificate {
         if (judged.empty()) {
             addParagraph(texts().noCriterion, plain, m_width);
         }
-        const double reserved = chartHeight + 2 * blockGap + patchesHeight(fewestPatches) +
-                                endHeight() + warningsReserve();
+        const double reserved = headingHeight(texts().differences) + chartHeight + 2 * blockGap +
+                                patchesHeight(fewestPatches) + endHeight() + warningsReserve();
         for (std::size_t i = 0; i < judged.size(); ++i) {
             const double height = rowHeight(criterionCells(judged[i]), widths);
             const std::string rest = restText(judged, i);
@@ -457,6 +459,24 @@ class Certificate {
             m_y += rowGap;
         }
         m_y += blockGap;
+    }
+
+    /// As large as there is room left, on the last sheet.
+    void placeColourCharts() {
+        constexpr double least = 45;
+        constexpr double most = 95;
+        const double left = room() - endHeight() - headingHeight(texts().colours) - 2 * blockGap -
+                            heightOf(m_content.model.drawnText, small, m_width);
+        if (left < least) {
+            return;
+        }
+        addHeading(texts().colours);
+        if (!m_content.model.drawnText.empty()) {
+            addParagraph(printable(m_content.model.drawnText), small, m_width);
+        }
+        const Rect area = {margin, m_y, m_width, std::min(left, most)};
+        addColourCharts(page(), m_typesetter, area, m_content.model, m_result);
+        m_y = area.bottom() + blockGap;
     }
 
     double endHeight() const {

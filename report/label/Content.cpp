@@ -147,6 +147,9 @@ Content contentOf(const Subject& subject) {
     Content content;
     content.model = report::makeModel(subject.result, subject.meta);
     content.title = printable(content.model.title);
+    if (content.title.empty()) {
+        content.title = texts().untitled;
+    }
     content.entries = entriesOf(subject);
     content.code = {subject.result.verdict, subject.stamp(), subject.hash,
                     subjectOf(subject.result, subject.meta)};

@@ -74,7 +74,7 @@ class Histogram {
         m_page.shapes.push_back(
             {Mark::Line, {m_plot.x, m_plot.y, m_plot.width, 0}, gridColour, 0.15});
         addLabel(m_area.x, m_plot.y - m_line / 2, 9, std::to_string(m_most), Align::Right);
-        addLabel(m_area.x, m_plot.bottom() - m_line / 2, 9, "0", Align::Right);
+        addLabel(m_area.x, m_plot.bottom() - m_line, 9, "0", Align::Right);
         const double width = m_model.histogram.front().to - m_model.histogram.front().from;
         constexpr double mostLabels = 12;
         const double step =

@@ -3,6 +3,7 @@
 
 #include <algorithm>
 #include <cmath>
+#include <memory>
 #include <optional>
 
 #include "report/label/Parts.h"
@@ -224,98 +225,121 @@ class FieldColumn {
     std::vector<double> m_heights;
 };
 
-/// A choice of font size, columns, fields and criteria.
+/// Fields and criteria in one font size and arrangement.
+class Arrangement {
+  public:
+    Arrangement(const report::Model& model, const std::vector<Entry>& entries, double points,
+                const Columns& columns, const Typesetter& typesetter)
+        : m_columns(columns), m_fields(entries, points, columns.fields, typesetter),
+          m_criteria(model, points, columns.criteria, typesetter), m_judged(model.judged.size()) {}
+
+    /// The largest number of criteria that fit; nothing if not even the line that counts them does.
+    std::optional<std::size_t> most(const std::vector<bool>& isKept, double height) const {
+        const double fields = fieldsHeight(isKept);
+        const double room = m_columns.sideBySide ? height : height - fields;
+        for (std::size_t count = m_judged + 1; fields <= height && count-- > 0;) {
+            if (m_criteria.height(count) <= room) {
+                return count;
+            }
+        }
+        return std::nullopt;
+    }
+
+    void place(Page& page, double x, double y, const std::vector<bool>& isKept,
+               std::size_t criteria) const {
+        m_fields.place(page, x, y, isKept);
+        m_criteria.place(page, m_columns.sideBySide ? x + m_columns.fields + gap : x,
+                         m_columns.sideBySide ? y : y + fieldsHeight(isKept), criteria);
+    }
+
+  private:
+    double fieldsHeight(const std::vector<bool>& isKept) const {
+        const double height = m_fields.height(isKept);
+        return height > 0 ? height + gap / 2 : 0;
+    }
+
+    const Columns m_columns;
+    const FieldColumn m_fields;
+    const CriteriaColumn m_criteria;
+    const std::size_t m_judged;
+};
+
+/// What of fields and criteria goes into an area, and how.
 struct Choice {
-    double points = smallestPoints;
-    Columns columns;
+    std::shared_ptr<const Arrangement> arrangement; ///< Null if not even a count has room.
     std::vector<bool> isKept;
     std::size_t criteria = 0;
 };
 
-/// What of fields and criteria goes into an area, and how.
-class Body {
+class Chooser {
   public:
-    Body(const Content& content, std::vector<Entry> entries, double width, double height,
-         const Typesetter& typesetter)
-        : m_model(content.model), m_judged(m_model.judged), m_entries(std::move(entries)),
-          m_height(height), m_columns(columnsOf(width)), m_typesetter(typesetter) {}
+    Chooser(const report::Model& model, const std::vector<Entry>& entries, double width,
+            double height, const Typesetter& typesetter)
+        : m_model(model), m_entries(entries), m_columns(columnsOf(width)), m_height(height),
+          m_typesetter(typesetter) {}
 
+    /// In the largest font in which everything fits, or else with what the smallest one has room
+    /// for.
     Choice choose() const {
-        const std::vector<bool> all(m_entries.size(), true);
-        for (double points = largestPoints; points >= smallestPoints; points -= pointStep) {
-            for (const Columns& columns : m_columns) {
-                if (most(points, columns, all) == m_judged.size()) {
-                    return {points, columns, all, m_judged.size()};
-                }
+        constexpr int steps = static_cast<int>((largestPoints - smallestPoints) / pointStep);
+        Choice choice = withEverything(smallestPoints);
+        if (choice.arrangement == nullptr) {
+            return concede();
+        }
+        int fits = 0;
+        int tooLarge = steps + 1;
+        while (tooLarge - fits > 1) {
+            const int middle = (fits + tooLarge) / 2;
+            Choice larger = withEverything(smallestPoints + middle * pointStep);
+            if (larger.arrangement != nullptr) {
+                choice = std::move(larger);
+                fits = middle;
+            } else {
+                tooLarge = middle;
             }
         }
-        return concede(all);
+        return choice;
     }
-
-    void place(Page& page, double x, double y, const Choice& choice) const {
-        const Columns& columns = choice.columns;
-        const FieldColumn fields(m_entries, choice.points, columns.fields, m_typesetter);
-        fields.place(page, x, y, choice.isKept);
-        const double top = columns.sideBySide ? 0 : fieldsHeight(fields, choice.isKept);
-        if (columns.sideBySide || top + criteriaHeight(choice) <= m_height) {
-            CriteriaColumn(m_model, choice.points, columns.criteria, m_typesetter)
-                .place(page, columns.sideBySide ? x + columns.fields + gap : x, y + top,
-                       choice.criteria);
-        }
-    }
-
-    const std::vector<Entry>& entries() const { return m_entries; }
 
   private:
-    double criteriaHeight(const Choice& choice) const {
-        return CriteriaColumn(m_model, choice.points, choice.columns.criteria, m_typesetter)
-            .height(choice.criteria);
+    std::shared_ptr<const Arrangement> arrange(double points, const Columns& columns) const {
+        return std::make_shared<Arrangement>(m_model, m_entries, points, columns, m_typesetter);
     }
 
-    static double fieldsHeight(const FieldColumn& fields, const std::vector<bool>& isKept) {
-        const double height = fields.height(isKept);
-        return height > 0 ? height + gap / 2 : 0;
-    }
-
-    /// The largest number of criteria that fit; nothing if not even the line that counts them does.
-    std::optional<std::size_t> most(double points, const Columns& columns,
-                                    const std::vector<bool>& isKept) const {
-        const double fields =
-            fieldsHeight(FieldColumn(m_entries, points, columns.fields, m_typesetter), isKept);
-        if (fields > m_height) {
-            return std::nullopt;
-        }
-        const CriteriaColumn criteria(m_model, points, columns.criteria, m_typesetter);
-        const double room = columns.sideBySide ? m_height : m_height - fields;
-        for (std::size_t count = m_judged.size();; --count) {
-            if (criteria.height(count) <= room) {
-                return count;
-            }
-            if (count == 0) {
-                return std::nullopt;
+    Choice withEverything(double points) const {
+        const std::vector<bool> all(m_entries.size(), true);
+        for (const Columns& columns : m_columns) {
+            auto arrangement = arrange(points, columns);
+            if (arrangement->most(all, m_height) == m_model.judged.size()) {
+                return {std::move(arrangement), all, m_model.judged.size()};
             }
         }
+        return {};
     }
 
-    Choice concede(std::vector<bool> isKept) const {
-        Choice choice;
+    Choice concede() const {
+        std::vector<std::shared_ptr<const Arrangement>> arrangements;
+        for (const Columns& columns : m_columns) {
+            arrangements.push_back(arrange(smallestPoints, columns));
+        }
+        std::vector<bool> isKept(m_entries.size(), true);
         for (const Concession& concession : concessions) {
             if (concession.field) {
                 drop(isKept, *concession.field);
             }
-            std::optional<std::size_t> best;
-            for (const Columns& columns : m_columns) {
-                const auto count = most(smallestPoints, columns, isKept);
-                if (count && (!best || *count > *best)) {
-                    best = count;
-                    choice = {smallestPoints, columns, isKept, *count};
+            Choice best;
+            for (const auto& arrangement : arrangements) {
+                const auto count = arrangement->most(isKept, m_height);
+                if (count && (best.arrangement == nullptr || *count > best.criteria)) {
+                    best = {arrangement, isKept, *count};
                 }
             }
-            if (best && *best >= std::min(concession.criteria, m_judged.size())) {
-                return choice;
+            if (best.arrangement != nullptr &&
+                best.criteria >= std::min(concession.criteria, m_model.judged.size())) {
+                return best;
             }
         }
-        return {smallestPoints, m_columns.back(), isKept, 0};
+        return {nullptr, isKept, 0};
     }
 
     void drop(std::vector<bool>& isKept, Field field) const {
@@ -327,10 +351,9 @@ class Body {
     }
 
     const report::Model& m_model;
-    const std::vector<report::Figure>& m_judged;
-    const std::vector<Entry> m_entries;
-    const double m_height;
+    const std::vector<Entry>& m_entries;
     const std::vector<Columns> m_columns;
+    const double m_height;
     const Typesetter& m_typesetter;
 };
 
@@ -380,13 +403,15 @@ class Label {
         y += gap;
         std::vector<Entry> entries = m_content.entries;
         std::erase_if(entries, [](const Entry& entry) { return !entry.isKnown; });
-        const Body body(m_content, std::move(entries), m_contentWidth, m_contentBottom - y,
-                        m_typesetter);
-        const Choice choice = body.choose();
-        body.place(m_layout.page, m_margin, y, choice);
-        for (std::size_t i = 0; i < body.entries().size(); ++i) {
+        const Choice choice =
+            Chooser(m_content.model, entries, m_contentWidth, m_contentBottom - y, m_typesetter)
+                .choose();
+        if (choice.arrangement != nullptr) {
+            choice.arrangement->place(m_layout.page, m_margin, y, choice.isKept, choice.criteria);
+        }
+        for (std::size_t i = 0; i < entries.size(); ++i) {
             if (!choice.isKept[i]) {
-                m_layout.leftOut.push_back(body.entries()[i].label);
+                m_layout.leftOut.push_back(entries[i].label);
             }
         }
         m_layout.criteriaCounted = m_content.model.judged.size() - choice.criteria;

@@ -11,6 +11,7 @@ constexpr Texts english = {
     .passed = "PASSED",
     .failed = "FAILED",
     .incomplete = "INCOMPLETE",
+    .untitled = "–",
     .fields = {"Condition", "Preset", "Date", "Printer", "Paper", "Instrument", "Operator",
                "Software", "Colourants", "Profile", "Intent", "Calibrated", "Job", "Workflow",
                "Not stated"},
@@ -44,6 +45,7 @@ constexpr Texts english = {
     .targetColour = "Target L* a* b*",
     .measuredColour = "Measured L* a* b*",
     .swatches = "Target, measured",
+    .colours = "Colours: lines lead from the target to what was measured",
     .warnings = "Warnings",
     .moreWarnings = "and {count} more",
     .viewing =

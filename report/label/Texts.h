@@ -20,6 +20,7 @@ struct Texts {
     const char* failed;
     const char* incomplete;
 
+    const char* untitled;
     const char* fields[fieldCount]; ///< In the order of Field.
     const char* dates[3];           ///< In the order of DateKind: in place of the field's own.
     const char* target;             ///< In place of Field::Profile if the target is no profile.
@@ -54,6 +55,7 @@ struct Texts {
     const char* targetColour;
     const char* measuredColour;
     const char* swatches;
+    const char* colours;
     const char* warnings;
     const char* moreWarnings;
     const char* viewing;
