@@ -69,6 +69,14 @@ class Histogram {
         addText(m_page, m_typesetter, {x, y}, width, words, style);
     }
 
+    /// On white, since the lines of the marks above go through its row.
+    void addMarkLabel(double x, double y, double width, const std::string& words, Align align) {
+        const double wide = std::min(width, m_typesetter.widthOf(words, axisStyle) + 0.6);
+        m_page.shapes.push_back(
+            {Mark::Fill, {align == Align::Right ? x + width - wide : x, y, wide, m_line}, white});
+        addLabel(x, y, width, words, align);
+    }
+
     void placeAxes() {
         addLine(m_page, m_plot.x, m_plot.bottom(), m_plot.width);
         m_page.shapes.push_back(
@@ -109,7 +117,7 @@ class Histogram {
     /// A line down to the axis, with its label beside its top.
     void placeMark(const report::Mark& mark, double y) {
         if (mark.value > m_end || mark.value < 0) {
-            addLabel(m_plot.x, y, m_plot.width, mark.label, Align::Right);
+            addMarkLabel(m_plot.x, y, m_plot.width, mark.label + " →", Align::Right);
             return;
         }
         const double x = xOf(mark.value);
@@ -117,9 +125,9 @@ class Histogram {
             {Mark::Line, {x, y, 0, m_plot.bottom() - y}, black, mark.limit ? 0.5 : 0.2});
         const bool isLeft = x > m_plot.x + m_plot.width / 2;
         if (isLeft) {
-            addLabel(m_plot.x, y, x - m_plot.x - 1, mark.label, Align::Right);
+            addMarkLabel(m_plot.x, y, x - m_plot.x - 1, mark.label, Align::Right);
         } else {
-            addLabel(x + 1, y, m_plot.right() - x - 1, mark.label, Align::Left);
+            addMarkLabel(x + 1, y, m_plot.right() - x - 1, mark.label, Align::Left);
         }
     }
 

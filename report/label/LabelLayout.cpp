@@ -60,11 +60,15 @@ class CriteriaColumn {
         : m_judged(model.judged), m_unit(model.unit), m_points(points), m_width(width),
           m_typesetter(typesetter) {
         m_line = typesetter.measure("0", titleStyle(), width).height;
+        m_headWidth = std::min(width, typesetter.widthOf(texts().criteria, headStyle()) + slack);
+        m_statesUnit =
+            typesetter.widthOf(headOfValues(), headOfValuesStyle()) <= width - m_headWidth - gap;
         m_titleWidth = m_width - indent();
         m_headHeight = typesetter.measure(texts().criteria, headStyle(), width).height + rowGap();
         double height = m_headHeight;
         m_heights.push_back(height);
         for (const report::Figure& figure : m_judged) {
+            m_wrapsValues = m_wrapsValues || valueWidth(figure) == m_titleWidth;
             height += rowHeight(figure) + rowGap();
             m_heights.push_back(height);
         }
@@ -74,6 +78,9 @@ class CriteriaColumn {
     double height(std::size_t count) const {
         return (count == 0 ? 0 : m_heights[count]) + restHeight(count);
     }
+
+    /// Whether a value takes more than a line: the column is too narrow if there is a wider one.
+    bool wrapsValues() const { return m_wrapsValues; }
 
     void place(Page& page, double x, double y, std::size_t count) const {
         if (count == 0) {
@@ -91,16 +98,10 @@ class CriteriaColumn {
 
   private:
     void placeHead(Page& page, double x, double y) const {
-        const double headWidth =
-            std::min(m_width, m_typesetter.widthOf(texts().criteria, headStyle()) + slack);
-        addText(page, m_typesetter, {x, y}, headWidth, texts().criteria, headStyle());
-        const double left = m_width - headWidth - gap;
-        Style head = headStyle();
-        head.bold = false;
-        head.align = Align::Right;
-        const std::string values = filled(texts().headOfValues, {{"unit", m_unit}});
-        if (m_typesetter.widthOf(values, head) <= left) {
-            addText(page, m_typesetter, {x + headWidth + gap, y}, left, values, head);
+        addText(page, m_typesetter, {x, y}, m_headWidth, texts().criteria, headStyle());
+        if (m_statesUnit) {
+            addText(page, m_typesetter, {x + m_headWidth + gap, y}, m_width - m_headWidth - gap,
+                    headOfValues(), headOfValuesStyle());
         }
     }
 
@@ -108,18 +109,23 @@ class CriteriaColumn {
 
     double indent() const { return m_line * 0.9; } ///< Room of the sign.
     double rowGap() const { return m_line * 0.1; }
-    Style titleStyle() const { return {.points = m_points, .lines = 2}; }
+    Style titleStyle() const { return {.points = m_points, .lines = 3}; }
     Style valueStyle() const {
-        return {.points = m_points, .bold = true, .align = Align::Right, .lines = 1};
+        return {.points = m_points, .bold = true, .align = Align::Right, .lines = 3};
     }
     Style headStyle() const { return {.points = m_points, .bold = true}; }
+    Style headOfValuesStyle() const {
+        return {.points = m_points, .align = Align::Right, .lines = 1};
+    }
     Style restStyle() const { return {.points = m_points, .lines = 2}; }
 
-    /// Without the unit if it is that of the head.
+    std::string headOfValues() const { return filled(texts().headOfValues, {{"unit", m_unit}}); }
+
+    /// Without the unit if the head states it.
     std::string valueText(const report::Figure& figure) const {
         return filled(texts().valueOfTolerance,
                       {{"value", figure.value}, {"tolerance", figure.tolerance}}) +
-               (figure.unit == m_unit ? "" : "\u00a0" + figure.unit);
+               (m_statesUnit && figure.unit == m_unit ? "" : "\u00a0" + figure.unit);
     }
 
     double valueWidth(const report::Figure& figure) const {
@@ -170,6 +176,9 @@ class CriteriaColumn {
     const double m_width;
     const Typesetter& m_typesetter;
     double m_line = 0;
+    double m_headWidth = 0;
+    bool m_wrapsValues = false;
+    bool m_statesUnit = false; ///< The head has room for the unit of most values.
     double m_titleWidth = 0;
     double m_headHeight = 0;
     std::vector<double> m_heights; ///< Of the head and the first so many rows.
@@ -235,6 +244,9 @@ class Arrangement {
 
     /// The largest number of criteria that fit; nothing if not even the line that counts them does.
     std::optional<std::size_t> most(const std::vector<bool>& isKept, double height) const {
+        if (m_columns.sideBySide && m_criteria.wrapsValues()) {
+            return std::nullopt;
+        }
         const double fields = fieldsHeight(isKept);
         const double room = m_columns.sideBySide ? height : height - fields;
         for (std::size_t count = m_judged + 1; fields <= height && count-- > 0;) {

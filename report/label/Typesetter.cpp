@@ -21,14 +21,6 @@ int pangoUnits(double millimetres) {
     return static_cast<int>(millimetres * pointsPerMillimetre * PANGO_SCALE);
 }
 
-bool hasFont(PangoFontMap* fonts) {
-    PangoFontFamily** families = nullptr;
-    int count = 0;
-    pango_font_map_list_families(fonts, &families, &count);
-    g_free(families);
-    return count > 0;
-}
-
 PangoAlignment alignmentOf(Align align) {
     return align == Align::Left     ? PANGO_ALIGN_LEFT
            : align == Align::Centre ? PANGO_ALIGN_CENTER
@@ -55,11 +47,7 @@ void Unreference::operator()(void* object) const {
 }
 
 Typesetter::Typesetter() {
-    PangoFontMap* const fonts = pango_cairo_font_map_get_default(); // of this thread
-    if (!hasFont(fonts)) {
-        throw CannotDraw("no font is installed");
-    }
-    m_context.reset(pango_font_map_create_context(fonts));
+    m_context.reset(pango_font_map_create_context(pango_cairo_font_map_get_default()));
     constexpr double unitsPerInch = 72;
     pango_cairo_context_set_resolution(m_context.get(), unitsPerInch);
     pango_context_set_round_glyph_positions(m_context.get(), FALSE);
@@ -69,6 +57,10 @@ Typesetter::Typesetter() {
     cairo_font_options_set_antialias(options, CAIRO_ANTIALIAS_GRAY);
     pango_cairo_context_set_font_options(m_context.get(), options);
     cairo_font_options_destroy(options);
+    // Without any font pango draws boxes.
+    if (measure("A", {}, wide).unknown > 0) {
+        throw CannotDraw("no font with Latin letters is installed");
+    }
 }
 
 Referenced<PangoLayout> Typesetter::layoutOf(const std::string& words, const Style& style,

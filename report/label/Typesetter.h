@@ -35,7 +35,7 @@ struct Extent {
 /// layout is the same in every format.
 class Typesetter {
   public:
-    /// Throws CannotDraw if no font is installed.
+    /// Throws CannotDraw if no font with Latin letters is installed.
     Typesetter();
 
     /// In lines of this width at most.

@@ -21,7 +21,8 @@ namespace {
 using testing::HasSubstr;
 
 constexpr label::Size sizes[] = {{100, 50}, {62, 100}, {89, 36}, {102, 152}, {50, 25}, {70, 70}};
-constexpr double slack = 0.35; ///< Millimetres: overhang of single glyphs.
+constexpr double pangoUnits = PANGO_SCALE * 72 / 25.4; ///< In a millimetre.
+constexpr double slack = 0.35;                         ///< Millimetres: overhang of single glyphs.
 
 bool contains(const label::Rect& outer, const label::Rect& inner) {
     return inner.x >= outer.x - slack && inner.y >= outer.y - slack &&
@@ -34,9 +35,17 @@ bool overlap(const label::Rect& a, const label::Rect& b) {
            b.y + touch < a.bottom();
 }
 
-/// What pango draws of a text, laid out by nothing but its style.
-label::Rect inkOf(const label::Text& text) {
-    const auto release = [](void* object) { g_object_unref(object); };
+const auto release = [](void* object) { g_object_unref(object); };
+using Layout = std::unique_ptr<PangoLayout, decltype(release)>;
+
+std::string markup(const char* text, long length) {
+    const std::unique_ptr<char, decltype(&g_free)> escaped(g_markup_escape_text(text, length),
+                                                           g_free);
+    return escaped.get();
+}
+
+/// The text as pango lays it out by nothing but its style.
+Layout layoutOf(const label::Text& text) {
     const std::unique_ptr<PangoContext, decltype(release)> context(
         pango_font_map_create_context(pango_cairo_font_map_get_default()), release);
     pango_cairo_context_set_resolution(context.get(), 72);
@@ -46,22 +55,13 @@ label::Rect inkOf(const label::Text& text) {
     cairo_font_options_set_hint_metrics(options, CAIRO_HINT_METRICS_OFF);
     pango_cairo_context_set_font_options(context.get(), options);
     cairo_font_options_destroy(options);
-    const std::unique_ptr<PangoLayout, decltype(release)> layout(pango_layout_new(context.get()),
-                                                                 release);
-    const std::string words =
-        "<span font='Sans " + std::string(text.style.bold ? "bold " : "") +
-        std::to_string(text.style.points) + "'><b>" +
-        std::unique_ptr<char, decltype(&g_free)>(
-            g_markup_escape_text(text.words.data(), static_cast<gssize>(text.lead)), g_free)
-            .get() +
-        "</b>" +
-        std::unique_ptr<char, decltype(&g_free)>(
-            g_markup_escape_text(text.words.c_str() + text.lead, -1), g_free)
-            .get() +
-        "</span>";
-    constexpr double units = PANGO_SCALE * 72 / 25.4;
+    Layout layout(pango_layout_new(context.get()), release);
+    const std::string words = "<span font='Sans " + std::string(text.style.bold ? "bold " : "") +
+                              std::to_string(text.style.points) + "'><b>" +
+                              markup(text.words.data(), static_cast<long>(text.lead)) + "</b>" +
+                              markup(text.words.c_str() + text.lead, -1) + "</span>";
     pango_layout_set_markup(layout.get(), words.c_str(), -1);
-    pango_layout_set_width(layout.get(), static_cast<int>(text.place.width * units));
+    pango_layout_set_width(layout.get(), static_cast<int>(text.place.width * pangoUnits));
     pango_layout_set_wrap(layout.get(), PANGO_WRAP_WORD_CHAR);
     pango_layout_set_height(layout.get(), -text.style.lines);
     pango_layout_set_ellipsize(layout.get(), PANGO_ELLIPSIZE_END);
@@ -69,12 +69,20 @@ label::Rect inkOf(const label::Text& text) {
                                text.style.align == label::Align::Left    ? PANGO_ALIGN_LEFT
                                : text.style.align == label::Align::Right ? PANGO_ALIGN_RIGHT
                                                                          : PANGO_ALIGN_CENTER);
+    return layout;
+}
+
+bool isShortened(const label::Text& text) {
+    return pango_layout_is_ellipsized(layoutOf(text).get()) != FALSE;
+}
+
+/// Where the text's glyphs are.
+label::Rect inkOf(const label::Text& text) {
     PangoRectangle ink;
-    PangoRectangle logical;
-    pango_layout_get_extents(layout.get(), &ink, &logical);
-    const double raised = std::min(0, ink.y) / units; // Such a text is moved down by it.
-    return {text.place.x + ink.x / units, text.place.y + ink.y / units - raised, ink.width / units,
-            ink.height / units};
+    pango_layout_get_extents(layoutOf(text).get(), &ink, nullptr);
+    const double raised = std::min(0, ink.y) / pangoUnits; // Such a text is moved down by it.
+    return {text.place.x + ink.x / pangoUnits, text.place.y + ink.y / pangoUnits - raised,
+            ink.width / pangoUnits, ink.height / pangoUnits};
 }
 
 /// Everything is inside the page and its own place, and no two things are in one place.
@@ -85,10 +93,7 @@ void expectSound(const label::Page& page) {
     std::vector<label::Rect> places;
     for (const label::Text& text : page.texts) {
         ASSERT_TRUE(contains(inside, text.place)) << text.words;
-        ASSERT_TRUE(contains(text.place, inkOf(text)))
-            << text.words << " at " << text.place.x << " " << text.place.y << " "
-            << text.place.width << " x " << text.place.height << ", ink " << inkOf(text).x << " "
-            << inkOf(text).y << " " << inkOf(text).width << " x " << inkOf(text).height;
+        ASSERT_TRUE(contains(text.place, inkOf(text))) << text.words;
         EXPECT_GE(text.style.points, 5);
         places.push_back(text.place);
     }
@@ -151,6 +156,17 @@ TEST(LabelLayout, OverlapsAndCutsOffNothingWhateverTheContent) {
             ASSERT_FALSE(layout.page.symbol.empty());
             const std::vector<label::Page> pages = {layout.page};
             EXPECT_TRUE(hasText(pages, label::verdictText(sample.result.verdict)));
+            for (const label::Text& text : layout.page.texts) {
+                const bool isFigure = text.style.align == label::Align::Right;
+                EXPECT_FALSE(isFigure && isShortened(text)) << text.words;
+            }
+            // A unit is at every value, or in the head.
+            const bool hasHead = hasText(pages, "value / tolerance");
+            for (const label::Text& text : layout.page.texts) {
+                const bool isValue = text.style.align == label::Align::Right &&
+                                     text.words.find(" / ") != std::string::npos;
+                EXPECT_TRUE(!isValue || hasHead || text.words.find("Δ") != std::string::npos);
+            }
             // Every criterion is listed with its sign or counted, every field is there or reported.
             const std::size_t judged = content.model.judged.size();
             EXPECT_EQ(signsOf(pages) - 1, judged - layout.criteriaCounted);
@@ -273,9 +289,7 @@ TEST(CertificateLayout, TakesOneOrTwoSheetsWhateverTheContent) {
             }
         }
         EXPECT_EQ(signsOf(layout.pages) - 1, content.model.judged.size() - layout.criteriaCounted);
-        EXPECT_EQ(hasText(layout.pages, "and "), layout.criteriaCounted > 0 ||
-                                                     hasText(layout.pages, "and 1 more") ||
-                                                     hasText(layout.pages, "and 2 more"));
+        EXPECT_TRUE(layout.criteriaCounted == 0 || hasText(layout.pages, "and "));
         EXPECT_TRUE(hasText(layout.pages, "Largest differences"));
         EXPECT_TRUE(hasText(layout.pages, "Signature"));
         pages.insert(layout.pages.size());
