@@ -23,8 +23,9 @@ base::Descriptor inMemory(std::string_view bytes) {
     constexpr int aboveChilds = 10;
     const base::Descriptor low(memfd_create("tintgate", MFD_CLOEXEC));
     base::Descriptor file(low.isOpen() ? fcntl(low.get(), F_DUPFD_CLOEXEC, aboveChilds) : -1);
-    return file.isOpen() && base::writeAll(file, bytes) == bytes.size() ? std::move(file)
-                                                                        : base::Descriptor();
+    const bool isWritten = file.isOpen() && base::writeAll(file, bytes) == bytes.size() &&
+                           lseek(file.get(), 0, SEEK_SET) == 0;
+    return isWritten ? std::move(file) : base::Descriptor();
 }
 
 std::vector<std::string> commandOf(const LabelSettings& settings, const std::string& stem) {

@@ -19,6 +19,9 @@ namespace {
 
 constexpr std::size_t largestFile = 1 << 16;
 
+/// Some editors put it before UTF-8.
+constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
+
 std::string_view trimmed(std::string_view text) {
     constexpr const char* blanks = " \t\r";
     const std::size_t first = text.find_first_not_of(blanks);
@@ -125,6 +128,9 @@ std::optional<LabelSettings> readLabelSettings(const std::string& path, std::str
     LabelSettings settings;
     std::set<std::string> seen;
     std::string_view rest = bytes;
+    if (rest.starts_with(byteOrderMark)) {
+        rest.remove_prefix(byteOrderMark.size());
+    }
     for (int number = 1; !rest.empty(); ++number) {
         const std::size_t end = rest.find('\n');
         if (const std::string wrong = readLine(rest.substr(0, end), settings, seen);

@@ -22,8 +22,17 @@ const std::string pageName = "report-strip2-2024-05-01-123456.html";
 
 support::RunOptions withoutDisplay() {
     support::RunOptions options;
-    options.environment = {{"DISPLAY", std::nullopt}, {"WAYLAND_DISPLAY", std::nullopt}};
+    options.environment = {{"DISPLAY", std::nullopt},
+                           {"WAYLAND_DISPLAY", std::nullopt},
+                           {"TINTGATE_ROOT", "/nonexistent"}};
     return options;
+}
+
+bool awaitFile(const std::string& path) {
+    for (int waited = 0; waited < 1000 && !support::exists(path); ++waited) {
+        usleep(10'000);
+    }
+    return support::exists(path);
 }
 
 /// A job's folder with both files of a run. Its name has blanks and a non-ASCII character.
@@ -216,9 +225,7 @@ TEST_F(Viewer, OpensThePageWhereThereIsADisplay) {
     options.environment["PATH"] = m_scratch.path() + ":/usr/bin:/bin";
     options.environment["OPENED"] = opened;
     EXPECT_EQ(show(options).exitCode, 0);
-    for (int waited = 0; waited < 1000 && !support::exists(opened); ++waited) {
-        usleep(10'000);
-    }
+    ASSERT_TRUE(awaitFile(opened));
     EXPECT_EQ(support::contentsOf(opened), m_page);
     options.environment["PATH"] = m_folder;
     std::swap(options.environment["DISPLAY"], options.environment["WAYLAND_DISPLAY"]);
@@ -226,6 +233,86 @@ TEST_F(Viewer, OpensThePageWhereThereIsADisplay) {
     EXPECT_EQ(outcome.exitCode, 7);
     EXPECT_THAT(outcome.error, HasSubstr("xdg-open"));
     EXPECT_TRUE(support::exists(m_page));
+}
+
+/// A job's folder, and a system root with settings of the viewer.
+class ViewerWithLabels : public Viewer {
+  protected:
+    support::Outcome showWith(const std::string& settings) const {
+        m_scratch.write("root/etc/tintgate/viewer.conf", settings);
+        support::RunOptions options = withoutDisplay();
+        options.environment["TINTGATE_ROOT"] = m_scratch.path("root");
+        return show(options);
+    }
+
+    const std::string m_stem = m_page.substr(0, m_page.size() - 5);
+};
+
+TEST_F(ViewerWithLabels, HasThemMadeInASessionOfTheirOwnFromWhatThePageShows) {
+    const std::string program = m_scratch.write(
+        "label program",
+        "#!/bin/sh\ncd '" + m_scratch.path() +
+            "'\nwhile [ ! -e replaced ]; do sleep 0.02; done\ncat >result; cat /dev/fd/3 >meta\n"
+            "cut -d')' -f2 /proc/$$/stat | cut -d' ' -f5 >session; echo $$ >process\n"
+            "echo trouble >&2\n"
+            "printf '%s\\n' \"$@\" >words.part; mv words.part words\n");
+    std::filesystem::permissions(program, std::filesystem::perms::owner_all);
+    const support::Outcome shown =
+        showWith("\xEF\xBB\xBF# a comment\nlabel = png\n  label-size = 62x100 \r\nlabel-dpi=203\n"
+                 "certificate = yes\nsheet = A4\nwhen = always\npaper = Matt = 235 g\n"
+                 "operator = -q\nprogram = " +
+                 program + "\n");
+    EXPECT_EQ(shown.exitCode, 0) << shown.error;
+    EXPECT_TRUE(support::exists(m_page)) << "before the program ends, which waits";
+    // The next run of the job replaces the files while the program has not read them.
+    std::filesystem::rename(m_folder + "/output.json", m_scratch.path("output.json"));
+    std::filesystem::rename(m_folder + "/meta.json", m_scratch.path("meta.json"));
+    m_scratch.write("replaced", "");
+    ASSERT_TRUE(awaitFile(m_scratch.path("words")));
+    EXPECT_EQ(support::contentsOf(m_scratch.path("words")),
+              "-\n--meta=/dev/fd/3\n--label=" + m_stem + ".label.png\n--pdf=" + m_stem +
+                  ".pdf\n--label-size=62x100\n--label-dpi=203\n--sheet=A4\n"
+                  "--label-field=paper=Matt = 235 g\n--label-field=operator=-q\n");
+    EXPECT_EQ(support::contentsOf(m_scratch.path("result")),
+              support::contentsOf(data + "output.json"));
+    EXPECT_EQ(support::contentsOf(m_scratch.path("meta")), support::contentsOf(data + "meta.json"));
+    EXPECT_EQ(support::contentsOf(m_scratch.path("session")),
+              support::contentsOf(m_scratch.path("process")));
+    EXPECT_EQ(support::contentsOf(m_stem + ".label.log"), "trouble\n");
+}
+
+TEST_F(ViewerWithLabels, MakesThemOfTheJobsThatAreToHaveThem) {
+    const std::string program = "program = " TINTGATE_REPORT "\n";
+    EXPECT_EQ(showWith("label = pdf\nwhen = passed\n" + program).exitCode, 0);
+    EXPECT_EQ(showWith("# nothing\n" + program).exitCode, 0);
+    EXPECT_FALSE(support::exists(m_stem + ".label.log")) << "the job failed";
+    EXPECT_EQ(showWith("label = svg\ncertificate = yes\npaper = Matt\n" + program).exitCode, 0);
+    ASSERT_TRUE(awaitFile(m_stem + ".pdf"));
+    EXPECT_THAT(support::contentsOf(m_stem + ".label.svg"), HasSubstr("<svg"));
+    EXPECT_THAT(support::contentsOf(m_stem + ".pdf"), HasSubstr("%PDF"));
+}
+
+TEST_F(ViewerWithLabels, ShowsThePageEvenIfItsSettingsAreWrong) {
+    struct {
+        std::string settings;
+        const char* words;
+    } const cases[] = {
+        {"label = pdf\nlabel = pdf\n", "line 2 has label a second time"},
+        {"label pdf\n", "line 1 has no ="},
+        {"\nlabel = gif\n", "line 2 expects pdf, svg, png or no for label"},
+        {"colour = red\n", "line 1 names \"colour\", which is not a setting"},
+        {"when = failed\n", "line 1 expects always or passed for when"},
+        {"sheet =\n", "line 1 expects A4 or Letter for sheet"},
+        {std::string("label\0= pdf", 11), "can't be read as text"},
+        {"label = pdf\nprogram = /nonexistent/program\n", "/nonexistent/program: No such file"},
+    };
+    for (const auto& [settings, words] : cases) {
+        std::filesystem::remove(m_page);
+        const support::Outcome shown = showWith(settings);
+        EXPECT_EQ(shown.exitCode, 8) << settings;
+        EXPECT_THAT(shown.error, HasSubstr(words));
+        EXPECT_TRUE(support::exists(m_page));
+    }
 }
 
 TEST_F(Viewer, SaysWhatIsWrongAndLeavesNoPage) {
