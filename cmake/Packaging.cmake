@@ -111,7 +111,10 @@ install_suite_for(tintgate-companions lib usr Library/Preferences/Qen)
 install(CODE "
   set(_settings \"${TINTGATE_PACKAGE_ROOT}/Library/Preferences/NerovaMeasure.conf\")
   file(CREATE_LINK /etc/tintgate/measure.conf
-    \"\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/\${_settings}\" SYMBOLIC)"
+    \"\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/\${_settings}\" SYMBOLIC)
+  set(_viewers \"\$ENV{DESTDIR}\${CMAKE_INSTALL_PREFIX}/${TINTGATE_PACKAGE_ROOT}/etc/tintgate\")
+  file(MAKE_DIRECTORY \"\${_viewers}\")
+  file(CREATE_LINK /etc/tintgate/viewer.conf \"\${_viewers}/viewer.conf\" SYMBOLIC)"
   COMPONENT tintgate-companions EXCLUDE_FROM_ALL)
 
 install(TARGETS libTintgate
@@ -202,6 +205,8 @@ set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_SECTION graphics)
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_DEPENDS
   "tintgate-comgui (= ${PROJECT_VERSION}), libtintgate1 (>= ${PROJECT_VERSION})")
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_RECOMMENDS "icc-profiles-free, xdg-utils")
+# Fonts of labels beyond Latin, and the printing of labels.
+set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_SUGGESTS "fonts-noto-cjk, cups-client")
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_DESCRIPTION "programs beside Tintgate
 The measuring tool, the viewer of verified jobs, the administration of ticket
 stores (tintgate-store), and reports and trends of results (tintgate-report).")

@@ -55,6 +55,8 @@ for _ in $(seq 100); do
   sleep 0.1
 done
 tintgate-report --text "$folder/output.json" | head -n 12
+tintgate-report "$folder/output.json" --label label.pdf --pdf certificate.pdf
+ls -l label.pdf certificate.pdf
 man -w Tintgate tintgate-store tintgate-report NerovaMeasure NerovaVerify 2>/dev/null || true
 echo "exit code of the job: $code"
 exit "$code"
