@@ -126,12 +126,13 @@ void settle(LabelOptions& options) {
         label::formatOf(options.certificate) != label::Format::Pdf) {
         throw CLI::ValidationError("--pdf", "takes a name that ends in .pdf");
     }
+    if (options.areDrawn() && options.label == options.certificate) {
+        throw CLI::ValidationError("--label and --pdf", "take names of two files");
+    }
     if (!options.sizeText.empty()) {
         const auto size = label::sizeOf(options.sizeText);
         if (!size) {
-            throw CLI::ValidationError(
-                "--label-size", "takes a size such as 100x50mm or 4x2in: the shorter side at least "
-                                "25 mm, the longer one 50 to 300 mm");
+            throw CLI::ValidationError("--label-size", label::sizeRule);
         }
         options.size = *size;
     }

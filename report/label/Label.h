@@ -40,6 +40,9 @@ inline constexpr Size standardSize = {100, 50};
 /// "100x50mm", "100x50" or "3.5x1.4in": width, then height as the label is read. Nothing for any
 /// other text or for a size out of range.
 std::optional<Size> sizeOf(std::string_view text);
+inline constexpr const char* sizeRule =
+    "takes a size such as 100x50mm or 4x2in: the shorter side at least 25 mm, the longer one 50 to "
+    "300 mm";
 
 /// Of certificates.
 inline constexpr Size a4 = {210, 297};

@@ -148,6 +148,7 @@ TEST_F(LabelProgram, RefusesCommandLinesThatMakeNoSense) {
         {m_result, "--label", label, "--label-field", "colour=red"},
         {m_result, "--label", label, "--label-field", "paper"},
         {m_result, "--label", label, "--sheet", "A3"},
+        {m_result, "--label", label, "--pdf", label},
         {m_result, "--label", label, "--text"},
         {m_result, "--label", label, "-o", label},
         {m_result, "--label", label, "--match", "x"},
