@@ -307,6 +307,13 @@ std::string reasonsText(const Problem& problem, const Painter& paint, std::size_
     return text;
 }
 
+/// `sign` takes one column.
+std::string problemAfter(const std::string& sign, const Problem& problem, const Painter& paint,
+                         std::size_t width) {
+    return wrapped(sign + " ", 2, problem.what + ".", paint, width) +
+           reasonsText(problem, paint, width, 2);
+}
+
 } // namespace
 
 std::size_t screenWidth() {
@@ -319,23 +326,17 @@ std::size_t screenWidth() {
 }
 
 std::string problemText(const Problem& problem, const Painter& paint, std::size_t width) {
-    return wrapped(paint(Tone::Failed, "!") + " ", 2, problem.what + ".", paint, width) +
-           reasonsText(problem, paint, width, 2);
+    return problemAfter(paint(Tone::Failed, "!"), problem, paint, width);
 }
 
 std::string screenText(const Outcome& outcome, const Aim& aim, bool isReferenceData,
                        const Painter& paint, std::size_t width) {
-    std::string text;
-    if (outcome.result) {
-        text = resultText(outcome, aim, isReferenceData, paint, width);
-    } else if (outcome.fate == Fate::NotDone) {
-        text = headText(outcome.fate, outcome.measurement.path, paint);
+    if (!outcome.result) {
+        return headText(outcome.fate, outcome.measurement.path, paint) +
+               problemAfter(" ", *outcome.problem, paint, width);
     }
-    if (outcome.problem) {
-        text += outcome.result ? "\n" : "";
-        text += problemText(*outcome.problem, paint, width);
-    }
-    return text;
+    const std::string text = resultText(outcome, aim, isReferenceData, paint, width);
+    return outcome.problem ? text + "\n" + problemText(*outcome.problem, paint, width) : text;
 }
 
 std::string lineText(const Outcome& outcome, const Painter& paint, std::size_t width) {

@@ -78,10 +78,11 @@ class Watch {
         findResults();
     }
 
-    void run(const std::function<bool(const Outcome&)>& emit) {
+    void run(const std::function<void()>& start, const std::function<bool(const Outcome&)>& emit) {
         const StopSignal stop;
         const auto arrivals = m_wanted.poll ? polledArrivals(m_root, m_wanted.interval)
                                             : notifiedArrivals(m_root, m_wanted.interval);
+        start();
         bool goesOn = true;
         while (goesOn && !stop.isPending()) {
             std::vector<std::string> paths = arrivals->wait(stop);
@@ -256,9 +257,9 @@ class Watch {
 
 } // namespace
 
-void watch(const Aim& aim, const WatchWanted& wanted,
+void watch(const Aim& aim, const WatchWanted& wanted, const std::function<void()>& start,
            const std::function<bool(const Outcome&)>& emit) {
-    Watch(aim, wanted).run(emit);
+    Watch(aim, wanted).run(start, emit);
 }
 
 } // namespace check

@@ -170,14 +170,15 @@ Status watchFolder(const Options& options, const Conditions& conditions, const A
     const WatchWanted wanted{
         options.watch,    options.out,     options.page, options.poll,
         options.interval, options.threads, options.json, inputsOf(conditions, aim)};
-    if (!options.quiet && !options.json) {
-        printer.print(say(Say::WatchStarts,
-                          {options.watch, options.out.empty() ? options.watch : options.out}) +
-                      '\n');
-        printer.finish();
-    }
+    const auto start = [&] {
+        if (!options.quiet && !options.json) {
+            const std::string& results = options.out.empty() ? options.watch : options.out;
+            printer.print(say(Say::WatchStarts, {options.watch, results}) + '\n');
+            printer.finish();
+        }
+    };
     const std::size_t width = isatty(STDOUT_FILENO) != 0 ? screenWidth() : 0;
-    watch(aim, wanted, [&](const Outcome& outcome) {
+    watch(aim, wanted, start, [&](const Outcome& outcome) {
         if (options.quiet) {
             return true;
         }
