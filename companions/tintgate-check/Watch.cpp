@@ -35,7 +35,7 @@ using Clock = std::chrono::steady_clock;
 
 constexpr std::size_t mostBytes = std::size_t{1} << 30;
 constexpr std::size_t digits = 64; ///< Of a SHA-256 in hexadecimal.
-constexpr std::chrono::seconds beforeRetry{10};
+constexpr int roundsBeforeRetry = 5;
 constexpr std::chrono::minutes draftsAreStale{10};
 
 std::string sha256(std::string_view bytes) {
@@ -73,7 +73,8 @@ class Watch {
     Watch(const Aim& aim, const WatchWanted& wanted)
         : m_aim(aim), m_wanted(wanted), m_root(rootOf(wanted.folder)),
           m_results(wanted.out.empty() ? m_root : wanted.out),
-          m_outputs(wanted.out, wanted.page, true, wanted.inputs) {
+          m_outputs(wanted.out, wanted.page, true, wanted.inputs),
+          m_beforeRetry(static_cast<int>(1000 * wanted.interval * roundsBeforeRetry)) {
         lockResults();
         findResults();
     }
@@ -180,7 +181,7 @@ class Watch {
     void tryAgain(const std::string& path, const std::string& mark) {
         const std::lock_guard lock(m_mutex);
         m_known.erase(mark);
-        m_again[path] = Clock::now() + beforeRetry;
+        m_again[path] = Clock::now() + m_beforeRetry;
     }
 
     /// Whether a problem of a file is news. `state` tells versions of the file apart.
@@ -223,7 +224,7 @@ class Watch {
             after.st_mtim.tv_nsec != before.st_mtim.tv_nsec ||
             bytes.size() != static_cast<std::size_t>(after.st_size)) {
             const std::lock_guard lock(m_mutex); // it is being written: its end will be reported
-            m_again[path] = Clock::now() + beforeRetry;
+            m_again[path] = Clock::now() + m_beforeRetry;
             return skip(measurement);
         }
         const std::string mark = sha256(bytes);
@@ -248,6 +249,7 @@ class Watch {
     const std::string m_root;
     const std::string m_results;
     Outputs m_outputs;
+    const std::chrono::milliseconds m_beforeRetry;
     base::Descriptor m_lock;
     std::mutex m_mutex;
     std::unordered_set<std::string> m_known;          ///< SHA-256 of contents with a result.

@@ -144,7 +144,13 @@ Status showMany(const Options& options, const Conditions& conditions, const Aim&
     const std::size_t width = isatty(STDOUT_FILENO) != 0 ? screenWidth() : 0;
     const Wanted wanted{.json = options.json, .result = false};
     verifyAll(
-        [&] { return walk.next(); },
+        [&] {
+            auto measurement = walk.next();
+            if (measurement) {
+                outputs.claim(*measurement);
+            }
+            return measurement;
+        },
         [&](const Measurement& measurement) { return verify(aim, measurement, outputs, wanted); },
         [&](Outcome&& outcome) {
             totals.add(outcome);
