@@ -121,6 +121,7 @@ void loadPreset(Aim& aim) {
         problem.what = say(Say::PresetTrouble, {problem.what}) + " (" + aim.presetPath + ")";
         if (fault.line != 0) {
             problem.cause = say(Say::PresetFault, {std::to_string(fault.line), fault.description});
+            problem.remedy = say(Say::PresetFaultRemedy);
         }
         throw Failure(Status::NotDone, std::move(problem));
     }

@@ -99,7 +99,12 @@ std::string heading(Say what, const Painter& paint) {
 }
 
 std::string criteriaText(const report::Model& model, const Painter& paint, std::size_t width) {
-    constexpr std::size_t mostTitle = 34;
+    // Numbers and signs take 30 characters; labels of patches want 16 if there are any.
+    const bool hasLabels =
+        std::any_of(model.judged.begin(), model.judged.end(), [](const report::Figure& figure) {
+            return figure.outcome != report::Outcome::Pass;
+        });
+    const std::size_t mostTitle = width - (hasLabels ? 46 : 30);
     std::vector<std::vector<Cell>> lines;
     std::size_t left = 0;
     for (const report::Figure& figure : model.judged) {

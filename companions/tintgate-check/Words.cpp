@@ -35,6 +35,7 @@ constexpr Sentence english[] = {
     {Say::NoSuchPatches, "no such patches"},
     {Say::MoreCriteria, "and {1} more criteria that passed"},
     {Say::Progress, "{1} of {2} verified"},
+    {Say::ProgressOfUnknown, "{1} verified"},
     {Say::Total, "{1}: {2}"},
     {Say::TotalPassed, "{1} passed"},
     {Say::TotalFailed, "{1} failed"},
@@ -124,6 +125,8 @@ constexpr Sentence english[] = {
     {Say::PatchSetTrouble, "The patch set can't be used: {1}"},
     {Say::PresetTrouble, "The tolerance preset can't be used: {1}"},
     {Say::PresetFault, "Line {1}: {2}"},
+    {Say::PresetFaultRemedy,
+     "Correct this line. The presets that 'tintgate-check --list' shows are examples"},
 
     {Say::OutputIsInput, "{1} is an input of this run, and was not written"},
     {Say::OutputIsInputRemedy, "Give another folder for outputs with --out"},

@@ -33,6 +33,7 @@ enum class Say {
     NoSuchPatches,
     MoreCriteria,
     Progress,
+    ProgressOfUnknown,
     Total,
     TotalPassed,
     TotalFailed,
@@ -94,6 +95,7 @@ enum class Say {
     PatchSetTrouble,
     PresetTrouble,
     PresetFault,
+    PresetFaultRemedy,
 
     // Outputs
     OutputIsInput,

@@ -82,8 +82,9 @@ class Progress {
             return;
         }
         m_last = now;
-        const std::string total = m_total ? std::to_string(*m_total) : "?";
-        const std::string words = say(Say::Progress, {std::to_string(done), total});
+        const std::string words =
+            m_total ? say(Say::Progress, {std::to_string(done), std::to_string(*m_total)})
+                    : say(Say::ProgressOfUnknown, {std::to_string(done)});
         std::fprintf(stderr, "\r\x1b[K%s", words.c_str());
         m_isThere = true;
     }

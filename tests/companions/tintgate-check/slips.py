@@ -128,7 +128,7 @@ SLIPS = [
     ("A condition was given as the preset", "--conditions conditions.toml -t FOGRA39L -p newspaper "
      "proof.txt", 64, "follows -c"),
     ("A preset has a decimal comma", "-t FOGRA39L -p house.xml proof.txt", 3,
-     "Line 20,2\\,5,point"),
+     "Line 20,2\\,5,--list"),
     ("The condition is misspelt", "--conditions conditions.toml -c coatedproof proof.txt", 64,
      "coated-proof,--list"),
     ("A preset was given as the condition", "-c contract-proof proof.txt", 64, "follows -p"),
@@ -252,7 +252,7 @@ def main(mode, program, page):
     else:
         for made in filter(None, blocks):
             if made not in old:
-                faults.append(f"{page} does not have this:\n{made}")
+                faults.append(f"{page} does not have this ('slips.py write' makes it anew):\n{made}")
         if old.count("(status ") != len(SLIPS):
             faults.append(f"{page} has {old.count('(status ')} slips, and there are {len(SLIPS)}")
     print("\n".join(faults) or f"{len(SLIPS)} slips, {blocks.count(None)} of them left out")
