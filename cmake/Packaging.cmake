@@ -54,7 +54,7 @@ foreach(_pair IN LISTS _explained)
     DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions"
     COMPONENT tintgate-companions)
 endforeach()
-foreach(_name NerovaMeasure NerovaVerify)
+foreach(_name NerovaMeasure NerovaVerify tintgate-check)
   add_custom_command(OUTPUT "${_made}/${_name}.1.gz"
     COMMAND ${GZIP} -9nc "${PROJECT_SOURCE_DIR}/docs/${_name}.1" > "${_made}/${_name}.1.gz"
     DEPENDS "${PROJECT_SOURCE_DIR}/docs/${_name}.1" VERBATIM)
@@ -63,6 +63,21 @@ foreach(_name NerovaMeasure NerovaVerify)
     COMPONENT tintgate-companions)
 endforeach()
 add_custom_target(pages ALL DEPENDS ${_pages})
+install(FILES docs/tintgate-check.completion RENAME tintgate-check
+  DESTINATION "${CMAKE_INSTALL_DATADIR}/bash-completion/completions"
+  COMPONENT tintgate-companions)
+
+# The service that watches folders, its user, and the system's conditions. They name places of the
+# packages, so other installations leave them out.
+install(FILES debian/tintgate-check@.service DESTINATION lib/systemd/system
+  COMPONENT tintgate-companions EXCLUDE_FROM_ALL)
+install(FILES debian/tintgate.sysusers RENAME tintgate.conf DESTINATION lib/sysusers.d
+  COMPONENT tintgate-companions EXCLUDE_FROM_ALL)
+install(FILES debian/conditions.toml DESTINATION /etc/tintgate
+  COMPONENT tintgate-companions EXCLUDE_FROM_ALL)
+foreach(_script conffiles postinst)
+  configure_file(debian/tintgate-companions.${_script} "${_made}/companions/${_script}" COPYONLY)
+endforeach()
 
 install(TARGETS Tintgate RUNTIME COMPONENT tintgate)
 install(TARGETS TintgateJob LIBRARY DESTINATION "${CMAKE_INSTALL_LIBDIR}/tintgate"
@@ -203,7 +218,9 @@ folder, or on a PostgreSQL server.")
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_NAME tintgate-companions)
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_SECTION graphics)
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_DEPENDS
-  "tintgate-comgui (= ${PROJECT_VERSION}), libtintgate1 (>= ${PROJECT_VERSION})")
+  "tintgate (= ${PROJECT_VERSION}), tintgate-comgui (= ${PROJECT_VERSION}), libtintgate1 (>= ${PROJECT_VERSION})")
+set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_CONTROL_EXTRA
+  "${_made}/companions/conffiles;${_made}/companions/postinst")
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_RECOMMENDS "icc-profiles-free, xdg-utils")
 # Fonts of labels beyond Latin, and the printing of labels.
 set(CPACK_DEBIAN_TINTGATE-COMPANIONS_PACKAGE_SUGGESTS "fonts-noto-cjk, cups-client")

@@ -492,7 +492,7 @@ std::vector<Bin> histogramOf(const std::vector<double>& values) {
     return bins;
 }
 
-Model makeModel(const Result& result, const Meta* meta) {
+Model makeModel(const Result& result, const Meta* meta, const Facts& print) {
     Model model;
     addHead(model, result, meta);
     model.unit = differenceUnit(result.formula);
@@ -517,6 +517,12 @@ Model makeModel(const Result& result, const Meta* meta) {
     }
     chooseDrawn(model);
     addSections(model, result, meta);
+    if (!print.empty()) {
+        for (const auto& [label, text] : print) {
+            model.subtitle += (model.subtitle.empty() ? "" : " · ") + text;
+        }
+        model.sections.emplace(model.sections.begin(), "Print", print);
+    }
     return model;
 }
 

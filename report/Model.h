@@ -83,8 +83,9 @@ struct Model {
 /// from the rest, which keeps a chart of any size quick and its outline true.
 inline constexpr std::size_t mostDrawn = 2000;
 
-/// `meta` may be null: a result of files has no job.
-Model makeModel(const Result& result, const Meta* meta);
+/// `meta` may be null: a result of files has no job. `print` is what else is known of the print,
+/// such as its paper; it may be empty.
+Model makeModel(const Result& result, const Meta* meta, const Facts& print = {});
 
 /// Bins of equal, round width (1, 2 or 5 times a power of ten) from 0 to behind the largest value:
 /// about 12 to 30 of them. Values that are not finite are left out, negative ones count as 0.

@@ -157,8 +157,8 @@ Json summaryJson(const Summary& summary) {
 
 } // namespace
 
-std::string pageOf(const Result& result, const Meta* meta) {
-    const Model model = makeModel(result, meta);
+std::string pageOf(const Result& result, const Meta* meta, const Facts& print) {
+    const Model model = makeModel(result, meta, print);
     const Summary summary{model.verdict, model.word,     model.sentence,
                           model.title,   model.subtitle, meta != nullptr ? meta->created : ""};
     std::string page(pageTemplate[0]);

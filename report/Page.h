@@ -16,7 +16,7 @@ namespace report {
 /// Texts of tickets and files stand in it as JSON alone, in a script element that is not run, with
 /// "<", ">" and "&" escaped; the page shows them as text. A Content-Security-Policy lets nothing
 /// run but the page's own scripts, by their hashes, and nothing be fetched.
-std::string pageOf(const Result& result, const Meta* meta);
+std::string pageOf(const Result& result, const Meta* meta, const Facts& print = {});
 
 /// What an index shows of a report. Texts are for people.
 struct Summary {

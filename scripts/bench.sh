@@ -20,6 +20,8 @@ echo "== store_postgres_bench"
 scripts/with-postgres.sh build/release/bin/store_postgres_bench
 echo "== the whole program"
 cmake --build --preset release --target bench_tool
+echo "== many files"
+cmake --build --preset release --target bench_check
 echo "== a whole run of the job form"
 cmake --build --preset release --target bench_job
 echo "== runs in stores of growing size"

@@ -8,7 +8,8 @@ cd "$(dirname "$0")/.."
 
 scripts/setup.sh
 cmake --preset release >/dev/null
-cmake --build --preset release --target Tintgate tintgate-store tintgate-report ComGUI \
+cmake --build --preset release --target tintgate-check Tintgate tintgate-store tintgate-report ComGUI \
   NerovaMeasure viewer plist-reader
+python3 scripts/demo_check.py build/release/bin/tintgate-check build/demo/check
 python3 scripts/demo.py build/release/bin/Tintgate build/demo/files
 exec python3 scripts/demo_jobs.py build/release build/demo/jobs

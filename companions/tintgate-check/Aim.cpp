@@ -59,11 +59,12 @@ const Condition* conditionOf(const Conditions& conditions, const AimWanted& want
     failName(what, hint(name, conditionNames(conditions)));
 }
 
-std::vector<std::string> dataSetNames(const Conditions& conditions) {
+std::vector<std::string> dataSetNames(const Conditions& conditions, bool withEndings) {
     std::vector<std::string> names;
     for (const std::string& folder : dataSetFolders(conditions)) {
         for (const DataSetEntry& entry : dataSetsIn(folder)) {
-            names.push_back(entry.name.substr(entry.name.rfind('/') + 1));
+            const std::string file = entry.name.substr(entry.name.rfind('/') + 1);
+            names.push_back(withEndings ? file : file.substr(0, file.rfind('.')));
         }
     }
     return names;
@@ -86,7 +87,8 @@ std::string fileOf(const Conditions& conditions, const std::string& name, bool o
     for (const std::string& folder : dataSetFolders(conditions)) {
         folders += (folders.empty() ? "" : ", ") + folder;
     }
-    const std::string similar = similarName(name, dataSetNames(conditions));
+    const std::string similar =
+        similarName(name, dataSetNames(conditions, name.find('.') != name.npos));
     const std::string remedy = (similar.empty() ? "" : say(Say::DidYouMean, {similar}) + " ") +
                                say(Say::NoSuchDataSetRemedy, {folders});
     throw Failure(Status::NotDone, {exitInputMissing, say(Say::NoSuchDataSet, {name}), {}, remedy});
@@ -119,6 +121,7 @@ void loadPreset(Aim& aim) {
         problem.what = say(Say::PresetTrouble, {problem.what}) + " (" + aim.presetPath + ")";
         if (fault.line != 0) {
             problem.cause = say(Say::PresetFault, {std::to_string(fault.line), fault.description});
+            problem.remedy = say(Say::PresetFaultRemedy);
         }
         throw Failure(Status::NotDone, std::move(problem));
     }

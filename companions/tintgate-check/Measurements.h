@@ -14,6 +14,7 @@ struct Measurement {
     std::string path;     ///< As given, or found below a folder that was given.
     std::string relative; ///< Where it is below that folder; outputs below --out repeat it.
     bool inFolder = false;
+    bool isSecond = false; ///< An earlier one of this run has the same outputs.
 };
 
 /// Whether a file that is met in a folder counts as a measurement: by the ending of its name, and

@@ -97,7 +97,7 @@ void addWatch(CLI::App& program, Options& options) {
 /// What does not go together.
 void settle(const CLI::App& program, const Options& options) {
     if (options.measurements.empty() && options.watch.empty() && !options.list) {
-        throw CLI::RequiredError(say(Say::NothingToVerify));
+        throw CLI::ValidationError(say(Say::NothingToVerify));
     }
     if (!options.watch.empty() && !options.measurements.empty()) {
         throw CLI::ValidationError(say(Say::WatchAndFiles));

@@ -95,20 +95,21 @@ std::optional<Problem> Outputs::check(const Measurement& measurement, Output out
     return std::nullopt;
 }
 
-bool Outputs::claim(const std::string& path) {
-    const std::lock_guard lock(m_mutex);
-    return m_written.insert(path).second;
+void Outputs::claim(Measurement& measurement) {
+    if (m_page || m_result) {
+        measurement.isSecond = !m_claimed.insert(pathOf(measurement, Output::Result)).second;
+    }
 }
 
 std::optional<Problem> Outputs::write(const Measurement& measurement, Output output,
                                       std::string_view text, const std::string& mark) {
     const std::string path = pathOf(measurement, output, mark);
-    if (auto problem = check(measurement, output, path)) {
-        return problem;
-    }
-    if (mark.empty() && !claim(path)) {
+    if (measurement.isSecond) {
         return Problem{
             exitOutputNotOurs, say(Say::OutputTwice, {path}), {}, say(Say::OutputTwiceRemedy)};
+    }
+    if (auto problem = check(measurement, output, path)) {
+        return problem;
     }
     std::error_code failure;
     const fs::path folder = fs::path(path).parent_path();

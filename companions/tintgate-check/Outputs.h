@@ -2,7 +2,6 @@
 // Files that are written for a measurement: where, and what they may replace.
 #pragma once
 
-#include <mutex>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -31,6 +30,10 @@ class Outputs {
     std::string pathOf(const Measurement& measurement, Output output,
                        const std::string& mark = {}) const;
 
+    /// To be called for the measurements of a run in their order, before any of them is written:
+    /// of those with the same outputs, all but the first are marked as such.
+    void claim(Measurement& measurement);
+
     /// Writes it whole, in place of an earlier output of ours; makes the folder if it is missing.
     /// Everything else in that place is left alone, and so is an output of another measurement of
     /// this run. Returns what went wrong, or nothing. Threads may call it at once.
@@ -40,14 +43,12 @@ class Outputs {
   private:
     std::optional<Problem> check(const Measurement& measurement, Output output,
                                  const std::string& path) const;
-    bool claim(const std::string& path);
 
     const std::string m_folder;
     const bool m_page;
     const bool m_result;
     const std::vector<std::string> m_inputs;
-    std::mutex m_mutex;
-    std::unordered_set<std::string> m_written; ///< Of this run; unused with marks.
+    std::unordered_set<std::string> m_claimed; ///< Where results would be.
 };
 
 } // namespace check

@@ -99,7 +99,12 @@ std::string heading(Say what, const Painter& paint) {
 }
 
 std::string criteriaText(const report::Model& model, const Painter& paint, std::size_t width) {
-    constexpr std::size_t mostTitle = 34;
+    // Numbers and signs take 30 characters; labels of patches want 16 if there are any.
+    const bool hasLabels =
+        std::any_of(model.judged.begin(), model.judged.end(), [](const report::Figure& figure) {
+            return figure.outcome != report::Outcome::Pass;
+        });
+    const std::size_t mostTitle = width - (hasLabels ? 46 : 30);
     std::vector<std::vector<Cell>> lines;
     std::size_t left = 0;
     for (const report::Figure& figure : model.judged) {
@@ -307,6 +312,13 @@ std::string reasonsText(const Problem& problem, const Painter& paint, std::size_
     return text;
 }
 
+/// `sign` takes one column.
+std::string problemAfter(const std::string& sign, const Problem& problem, const Painter& paint,
+                         std::size_t width) {
+    return wrapped(sign + " ", 2, problem.what + ".", paint, width) +
+           reasonsText(problem, paint, width, 2);
+}
+
 } // namespace
 
 std::size_t screenWidth() {
@@ -319,23 +331,17 @@ std::size_t screenWidth() {
 }
 
 std::string problemText(const Problem& problem, const Painter& paint, std::size_t width) {
-    return wrapped(paint(Tone::Failed, "!") + " ", 2, problem.what + ".", paint, width) +
-           reasonsText(problem, paint, width, 2);
+    return problemAfter(paint(Tone::Failed, "!"), problem, paint, width);
 }
 
 std::string screenText(const Outcome& outcome, const Aim& aim, bool isReferenceData,
                        const Painter& paint, std::size_t width) {
-    std::string text;
-    if (outcome.result) {
-        text = resultText(outcome, aim, isReferenceData, paint, width);
-    } else if (outcome.fate == Fate::NotDone) {
-        text = headText(outcome.fate, outcome.measurement.path, paint);
+    if (!outcome.result) {
+        return headText(outcome.fate, outcome.measurement.path, paint) +
+               problemAfter(" ", *outcome.problem, paint, width);
     }
-    if (outcome.problem) {
-        text += outcome.result ? "\n" : "";
-        text += problemText(*outcome.problem, paint, width);
-    }
-    return text;
+    const std::string text = resultText(outcome, aim, isReferenceData, paint, width);
+    return outcome.problem ? text + "\n" + problemText(*outcome.problem, paint, width) : text;
 }
 
 std::string lineText(const Outcome& outcome, const Painter& paint, std::size_t width) {

@@ -17,7 +17,7 @@ namespace check {
 std::size_t screenWidth();
 
 /// One measurement: the verdict first, then criteria, the worst patches, warnings, what to do.
-/// REQUIRES: an outcome with a result, or without a verdict.
+/// REQUIRES: an outcome with a result or a problem.
 std::string screenText(const Outcome& outcome, const Aim& aim, bool isReferenceData,
                        const report::Painter& paint, std::size_t width);
 

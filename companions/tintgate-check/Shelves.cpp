@@ -5,7 +5,6 @@
 #include <cstdlib>
 #include <filesystem>
 #include <map>
-#include <numeric>
 #include <system_error>
 
 #include <toml++/toml.h>
@@ -62,6 +61,27 @@ std::map<std::string, std::string> shortNamesOf(const std::string& folder) {
     } catch (const toml::parse_error&) {
     }
     return names;
+}
+
+/// How many letters are more, fewer, other, or swapped with their neighbours.
+std::size_t editsBetween(std::string_view a, std::string_view b) {
+    const std::size_t width = b.size() + 1;
+    std::vector<std::size_t> edits((a.size() + 1) * width);
+    for (std::size_t i = 0; i <= a.size(); ++i) {
+        for (std::size_t j = 0; j <= b.size(); ++j) {
+            std::size_t& least = edits[i * width + j];
+            if (i == 0 || j == 0) {
+                least = i + j;
+                continue;
+            }
+            least = std::min({edits[(i - 1) * width + j] + 1, edits[i * width + j - 1] + 1,
+                              edits[(i - 1) * width + j - 1] + (a[i - 1] == b[j - 1] ? 0 : 1)});
+            if (i > 1 && j > 1 && a[i - 1] == b[j - 2] && a[i - 2] == b[j - 1]) {
+                least = std::min(least, edits[(i - 2) * width + j - 2] + 1);
+            }
+        }
+    }
+    return edits.back();
 }
 
 } // namespace
@@ -178,27 +198,13 @@ std::string findPreset(const Conditions& conditions, const std::string& name) {
 }
 
 std::string similarName(std::string_view name, const std::vector<std::string>& names) {
-    // Edits: a letter more, less or other.
-    const auto distance = [](std::string_view a, std::string_view b) {
-        std::vector<std::size_t> row(b.size() + 1);
-        std::iota(row.begin(), row.end(), std::size_t{0});
-        for (std::size_t i = 0; i < a.size(); ++i) {
-            std::size_t diagonal = row[0]++;
-            for (std::size_t j = 0; j < b.size(); ++j) {
-                const std::size_t other = diagonal + (a[i] == b[j] ? 0 : 1);
-                diagonal = row[j + 1];
-                row[j + 1] = std::min({other, row[j] + 1, diagonal + 1});
-            }
-        }
-        return row.back();
-    };
     const std::string wanted = lowerCase(std::string(name));
     std::string best;
     std::size_t least = wanted.size() / 3 + 2; // a third of the letters, and one
     for (const std::string& candidate : names) {
         const std::string lower = lowerCase(candidate);
         const std::size_t edits =
-            wanted.size() > 2 && lower.starts_with(wanted) ? 1 : distance(wanted, lower);
+            wanted.size() > 2 && lower.starts_with(wanted) ? 1 : editsBetween(wanted, lower);
         if (edits < least && edits < lower.size()) {
             least = edits;
             best = candidate;

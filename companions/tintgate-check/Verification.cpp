@@ -57,8 +57,10 @@ void describe(const analysis::Comparison& comparison, const analysis::Judgement&
     }
     outcome.criterion = finding->criterion->title;
     if (!finding->answered) {
-        outcome.figures = std::to_string(finding->found) + " " + say(Say::Of) + " " +
-                          say(Say::PatchesMeasured, {std::to_string(finding->needed)});
+        outcome.figures = finding->found == 0
+                              ? say(Say::NoSuchPatches)
+                              : std::to_string(finding->found) + " " + say(Say::Of) + " " +
+                                    say(Say::PatchesMeasured, {std::to_string(finding->needed)});
         return;
     }
     report::Criterion criterion;
@@ -132,8 +134,26 @@ Problem problemOfComparison(int code, const Aim& aim, const analysis::SharedFile
                            target->deviceSpace == colour::DeviceSpace::Cmyk;
         problem.what = say(isRgb ? Say::RgbMeasurement : Say::OtherChart);
         problem.remedy = say(isRgb ? Say::RgbMeasurementRemedy : Say::OtherChartRemedy);
+    } else if (code == exitNoDeviceValues) {
+        const bool areProfiles = !target && measurement.profile != nullptr;
+        problem.what = say(areProfiles ? Say::BothProfiles : Say::NoCmyk);
+        problem.cause.clear();
+        problem.remedy = say(areProfiles ? Say::BothProfilesRemedy : Say::NoCmykRemedy);
     }
     return problem;
+}
+
+/// What the condition says of the print, for its page.
+report::Facts factsOf(const Aim& aim) {
+    report::Facts facts;
+    for (const auto& [label, text] :
+         {std::pair(Say::FactCondition, aim.condition), std::pair(Say::FactPrinter, aim.printer),
+          std::pair(Say::FactPaper, aim.paper)}) {
+        if (!text.empty()) {
+            facts.emplace_back(say(label), text);
+        }
+    }
+    return facts;
 }
 
 /// A folder that the walk hands out: nothing in it could be taken.
@@ -233,11 +253,13 @@ class Verifier {
             if (!result) {
                 throw std::runtime_error(problem);
             }
-            if (m_outputs.wantsPage() && !write(Output::Page, report::pageOf(*result, nullptr))) {
-                return;
-            }
+            const std::string page =
+                m_outputs.wantsPage() ? report::pageOf(*result, nullptr, factsOf(m_aim)) : "";
             if (m_wanted.result) {
                 m_outcome.result = std::make_shared<report::Result>(std::move(*result));
+            }
+            if (m_outputs.wantsPage() && !write(Output::Page, page)) {
+                return;
             }
         }
         if (m_outputs.wantsResult()) {

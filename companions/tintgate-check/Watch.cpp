@@ -35,7 +35,7 @@ using Clock = std::chrono::steady_clock;
 
 constexpr std::size_t mostBytes = std::size_t{1} << 30;
 constexpr std::size_t digits = 64; ///< Of a SHA-256 in hexadecimal.
-constexpr std::chrono::seconds beforeRetry{10};
+constexpr int roundsBeforeRetry = 5;
 constexpr std::chrono::minutes draftsAreStale{10};
 
 std::string sha256(std::string_view bytes) {
@@ -73,15 +73,17 @@ class Watch {
     Watch(const Aim& aim, const WatchWanted& wanted)
         : m_aim(aim), m_wanted(wanted), m_root(rootOf(wanted.folder)),
           m_results(wanted.out.empty() ? m_root : wanted.out),
-          m_outputs(wanted.out, wanted.page, true, wanted.inputs) {
+          m_outputs(wanted.out, wanted.page, true, wanted.inputs),
+          m_beforeRetry(static_cast<int>(1000 * wanted.interval * roundsBeforeRetry)) {
         lockResults();
         findResults();
     }
 
-    void run(const std::function<bool(const Outcome&)>& emit) {
+    void run(const std::function<void()>& start, const std::function<bool(const Outcome&)>& emit) {
         const StopSignal stop;
         const auto arrivals = m_wanted.poll ? polledArrivals(m_root, m_wanted.interval)
                                             : notifiedArrivals(m_root, m_wanted.interval);
+        start();
         bool goesOn = true;
         while (goesOn && !stop.isPending()) {
             std::vector<std::string> paths = arrivals->wait(stop);
@@ -179,7 +181,7 @@ class Watch {
     void tryAgain(const std::string& path, const std::string& mark) {
         const std::lock_guard lock(m_mutex);
         m_known.erase(mark);
-        m_again[path] = Clock::now() + beforeRetry;
+        m_again[path] = Clock::now() + m_beforeRetry;
     }
 
     /// Whether a problem of a file is news. `state` tells versions of the file apart.
@@ -222,7 +224,7 @@ class Watch {
             after.st_mtim.tv_nsec != before.st_mtim.tv_nsec ||
             bytes.size() != static_cast<std::size_t>(after.st_size)) {
             const std::lock_guard lock(m_mutex); // it is being written: its end will be reported
-            m_again[path] = Clock::now() + beforeRetry;
+            m_again[path] = Clock::now() + m_beforeRetry;
             return skip(measurement);
         }
         const std::string mark = sha256(bytes);
@@ -247,6 +249,7 @@ class Watch {
     const std::string m_root;
     const std::string m_results;
     Outputs m_outputs;
+    const std::chrono::milliseconds m_beforeRetry;
     base::Descriptor m_lock;
     std::mutex m_mutex;
     std::unordered_set<std::string> m_known;          ///< SHA-256 of contents with a result.
@@ -256,9 +259,9 @@ class Watch {
 
 } // namespace
 
-void watch(const Aim& aim, const WatchWanted& wanted,
+void watch(const Aim& aim, const WatchWanted& wanted, const std::function<void()>& start,
            const std::function<bool(const Outcome&)>& emit) {
-    Watch(aim, wanted).run(emit);
+    Watch(aim, wanted).run(start, emit);
 }
 
 } // namespace check

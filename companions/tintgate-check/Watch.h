@@ -28,9 +28,10 @@ struct WatchWanted {
 /// the last run ended, however that was. A measurement that can't be used leaves
 /// NAME.SHA256.error.json and is reported once. A result that can't be written is tried again.
 ///
-/// `emit` gets each outcome, and returns false to end the watch. Throws Failure (NotDone) if the
-/// folder is not there, is gone, or can't be watched, or if another watch has the same results.
-void watch(const Aim& aim, const WatchWanted& wanted,
+/// `start` is called once nothing is in the way. `emit` gets each outcome, and returns false to end
+/// the watch. Throws Failure (NotDone) if the folder is not there, is gone, or can't be watched, or
+/// if another watch has the same results.
+void watch(const Aim& aim, const WatchWanted& wanted, const std::function<void()>& start,
            const std::function<bool(const Outcome&)>& emit);
 
 } // namespace check

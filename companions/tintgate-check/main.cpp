@@ -82,8 +82,9 @@ class Progress {
             return;
         }
         m_last = now;
-        const std::string total = m_total ? std::to_string(*m_total) : "?";
-        const std::string words = say(Say::Progress, {std::to_string(done), total});
+        const std::string words =
+            m_total ? say(Say::Progress, {std::to_string(done), std::to_string(*m_total)})
+                    : say(Say::ProgressOfUnknown, {std::to_string(done)});
         std::fprintf(stderr, "\r\x1b[K%s", words.c_str());
         m_isThere = true;
     }
@@ -144,7 +145,13 @@ Status showMany(const Options& options, const Conditions& conditions, const Aim&
     const std::size_t width = isatty(STDOUT_FILENO) != 0 ? screenWidth() : 0;
     const Wanted wanted{.json = options.json, .result = false};
     verifyAll(
-        [&] { return walk.next(); },
+        [&] {
+            auto measurement = walk.next();
+            if (measurement) {
+                outputs.claim(*measurement);
+            }
+            return measurement;
+        },
         [&](const Measurement& measurement) { return verify(aim, measurement, outputs, wanted); },
         [&](Outcome&& outcome) {
             totals.add(outcome);
@@ -170,14 +177,15 @@ Status watchFolder(const Options& options, const Conditions& conditions, const A
     const WatchWanted wanted{
         options.watch,    options.out,     options.page, options.poll,
         options.interval, options.threads, options.json, inputsOf(conditions, aim)};
-    if (!options.quiet && !options.json) {
-        printer.print(say(Say::WatchStarts,
-                          {options.watch, options.out.empty() ? options.watch : options.out}) +
-                      '\n');
-        printer.finish();
-    }
+    const auto start = [&] {
+        if (!options.quiet && !options.json) {
+            const std::string& results = options.out.empty() ? options.watch : options.out;
+            printer.print(say(Say::WatchStarts, {options.watch, results}) + '\n');
+            printer.finish();
+        }
+    };
     const std::size_t width = isatty(STDOUT_FILENO) != 0 ? screenWidth() : 0;
-    watch(aim, wanted, [&](const Outcome& outcome) {
+    watch(aim, wanted, start, [&](const Outcome& outcome) {
         if (options.quiet) {
             return true;
         }
