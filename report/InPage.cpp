@@ -26,6 +26,10 @@ std::string inScript(const PageJson& json) {
     return safe;
 }
 
+std::string scriptTexts(const languages::Texts& say, const char* page) {
+    return inScript(PageJson::parse(say.forScript(page)));
+}
+
 void appendNumber(std::string& text, double value) {
     char digits[32];
     if (!std::isfinite(value)) {

@@ -9,6 +9,7 @@
 
 #include "report/Result.h"
 #include "report/Swatch.h"
+#include "report/languages/Texts.h"
 
 namespace report {
 
@@ -16,6 +17,9 @@ using PageJson = nlohmann::ordered_json;
 
 /// JSON that can stand in a script element: nothing in it can end the element or open a comment.
 std::string inScript(const PageJson& json);
+
+/// The texts of a page's script, as inScript writes JSON.
+std::string scriptTexts(const languages::Texts& say, const char* page);
 
 /// The shortest text of the number; null where it is none.
 void appendNumber(std::string& text, double value);

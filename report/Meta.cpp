@@ -65,6 +65,7 @@ std::optional<Meta> readMeta(std::string_view bytes, std::string& problem) {
             meta.server = text(server.at("host"));
         }
         meta.user = text(server.at("user"));
+        meta.language = text(json.value("language", Json()));
         return meta;
     } catch (const std::exception& failure) {
         problem = failure.what();

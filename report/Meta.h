@@ -21,6 +21,7 @@ struct Meta {
     std::string workflow;
     std::string server;
     std::string user;
+    std::string language; ///< As the job's client named it, such as "de_DE".
 };
 
 /// Nothing where the text is no meta file of a format that this version knows; `problem` then says

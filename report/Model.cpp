@@ -10,6 +10,8 @@
 namespace report {
 namespace {
 
+using languages::Texts;
+
 constexpr const char* dash = "\u2013";
 
 /// Decimals that a number needs to be shown as it stands, up to six.
@@ -23,11 +25,6 @@ int decimalsOf(double value, int atLeast) {
         ++decimals;
     }
     return decimals;
-}
-
-/// "1 patch", "2 patches"
-std::string counted(std::size_t count, const std::string& one, const std::string& many) {
-    return std::to_string(count) + ' ' + (count == 1 ? one : many);
 }
 
 std::string differenceUnit(const std::string& formula) {
@@ -46,7 +43,7 @@ std::string differenceUnit(const std::string& formula) {
     return formula == "CIECMC_2_1" ? "ΔE CMC 2:1" : "ΔE " + formula;
 }
 
-std::string formulaTitle(const std::string& formula) {
+std::string formulaTitle(const std::string& formula, const Texts& say) {
     if (formula == "CIE2000") {
         return "CIEDE2000";
     }
@@ -54,7 +51,7 @@ std::string formulaTitle(const std::string& formula) {
         return "CIE 1976 (ΔE*ab)";
     }
     if (formula == "CIE94") {
-        return "CIE94, graphic arts";
+        return say("page.cie94");
     }
     if (formula == "CIECMC") {
         return "CMC 1:1";
@@ -62,61 +59,61 @@ std::string formulaTitle(const std::string& formula) {
     return formula == "CIECMC_2_1" ? "CMC 2:1" : formula;
 }
 
-const char* wordOf(Outcome outcome) {
+std::string wordOf(Outcome outcome, const Texts& say) {
     switch (outcome) {
     case Outcome::Pass:
-        return "Passed";
+        return say("outcome.passed");
     case Outcome::Fail:
-        return "Failed";
+        return say("outcome.failed");
     case Outcome::Unanswered:
-        return "No data";
+        return say("outcome.noData");
     case Outcome::Unjudged:
         break;
     }
-    return "Not judged";
+    return say("outcome.notJudged");
 }
 
 /// " (100 0 0 0)": the device values of a patch, not to be broken; empty without any.
-std::string deviceText(const Result& result, std::size_t patch) {
+std::string deviceText(const Result& result, std::size_t patch, const Texts& say) {
     const std::size_t channels = result.channels.size();
     std::string text;
     for (std::size_t i = 0; i < channels; ++i) {
         const double value = result.device[patch * channels + i];
-        text += (i == 0 ? " (" : "\u00a0") + fixedText(value, decimalsOf(value, 0));
+        text += (i == 0 ? " (" : "\u00a0") + say.number(value, decimalsOf(value, 0));
     }
     return text.empty() ? text : text + ")";
 }
 
 /// Why a criterion has no answer.
-std::string missingText(const Criterion& criterion) {
+std::string missingText(const Criterion& criterion, const Texts& say) {
     if (criterion.found > 0) {
-        return "only " + std::to_string(criterion.found) + " of the " +
-               std::to_string(criterion.needed) + " different patches that it needs";
+        return say("page.tooFewPatches",
+                   {{"found", criterion.found}, {"needed", criterion.needed}});
     }
-    return criterion.name == "repeatSpread" ? "no patch was measured more than once"
-                                            : "the data hold no such patches";
+    return criterion.name == "repeatSpread" ? say("page.noRepeats") : say("page.noSuchPatches");
 }
 
-Figure figureOf(const Criterion& criterion, const Result& result) {
+Figure figureOf(const Criterion& criterion, const Result& result, const Texts& say) {
     Figure figure;
-    figure.title = criterion.title;
+    figure.title = titleOf(criterion, say);
     figure.unit = unitOf(criterion, result.formula);
     figure.outcome = criterion.outcome;
-    figure.word = wordOf(criterion.outcome);
+    figure.word = wordOf(criterion.outcome, say);
     figure.patches = criterion.patches;
     const double value = criterion.rounded.value_or(
         criterion.value.value_or(std::numeric_limits<double>::quiet_NaN()));
-    figure.value = fixedText(value, criterion.decimals);
+    figure.value = say.number(value, criterion.decimals);
     figure.tolerance = dash;
     if (criterion.worstPatch) {
-        figure.worstLabel = labelOf(result, *criterion.worstPatch);
+        figure.worstLabel = labelOf(result, *criterion.worstPatch, say);
     }
     if (criterion.outcome == Outcome::Unanswered) {
-        figure.missing = missingText(criterion);
+        figure.missing = missingText(criterion, say);
     }
     if (criterion.listed > criterion.found && criterion.found > 0) {
-        figure.title += " (" + std::to_string(criterion.found) + " of " +
-                        std::to_string(criterion.listed) + " patches)";
+        figure.title = say("page.partOfPatches", {{"criterion", figure.title},
+                                                  {"found", criterion.found},
+                                                  {"listed", criterion.listed}});
     }
     if (!criterion.tolerance) {
         return figure;
@@ -124,16 +121,17 @@ Figure figureOf(const Criterion& criterion, const Result& result) {
 
     const double limit = *criterion.tolerance;
     const int decimals = decimalsOf(limit, criterion.decimals);
-    figure.tolerance = fixedText(limit, decimals);
+    figure.tolerance = say.number(limit, decimals);
     if (!std::isfinite(value)) {
         return figure;
     }
     figure.excess = limit > 0 ? value / limit : std::numeric_limits<double>::infinity();
     figure.fill = std::clamp(figure.excess / 2, 0.0, 1.0);
     if (criterion.outcome == Outcome::Pass || criterion.outcome == Outcome::Fail) {
-        figure.distance = value == limit ? "at the tolerance"
-                                         : fixedText(std::abs(value - limit), decimals) +
-                                               (value > limit ? " above" : " below");
+        const std::string off = say.number(std::abs(value - limit), decimals);
+        figure.distance = value == limit  ? say("page.atTolerance")
+                          : value > limit ? say("page.above", {{"difference", off}})
+                                          : say("page.below", {{"difference", off}});
     }
     return figure;
 }
@@ -149,76 +147,85 @@ void putInOrder(std::vector<Figure>& judged) {
     });
 }
 
-void sayVerdict(Model& model, const Result& result) {
+std::string reasonText(const Figure& figure, const Texts& say) {
+    if (figure.outcome != Outcome::Fail) {
+        return say("page.openReason", {{"criterion", figure.title}, {"why", figure.missing}});
+    }
+    return say("page.failedReason", {{"criterion", figure.title},
+                                     {"value", figure.value},
+                                     {"unit", figure.unit},
+                                     {"distance", figure.distance},
+                                     {"tolerance", figure.tolerance}});
+}
+
+std::string passedText(const std::vector<Figure>& judged, const Texts& say) {
+    std::string text = say("page.passed", {{"count", judged.size()}});
+    if (!judged.empty()) {
+        const Figure& nearest = judged.front();
+        text += say("sentence.gap") + say("page.nearest", {{"criterion", nearest.title},
+                                                           {"value", nearest.value},
+                                                           {"tolerance", nearest.tolerance},
+                                                           {"unit", nearest.unit}});
+    }
+    return text;
+}
+
+void sayVerdict(Model& model, const Result& result, const Texts& say) {
     const Verdict verdict = result.verdict;
     model.verdict = verdict;
     std::size_t failed = 0;
     std::size_t open = 0;
     for (const Figure& figure : model.judged) {
-        if (figure.outcome == Outcome::Fail) {
-            ++failed;
-            model.reasons.push_back(figure.title + ": " + figure.value + " " + figure.unit + ", " +
-                                    figure.distance + " the tolerance of " + figure.tolerance);
-        } else if (figure.outcome != Outcome::Pass) {
-            ++open;
-            model.reasons.push_back(figure.title + ": " + figure.missing);
+        if (figure.outcome != Outcome::Pass) {
+            ++(figure.outcome == Outcome::Fail ? failed : open);
+            model.reasons.push_back(reasonText(figure, say));
         }
     }
     for (const Warning& warning : result.warnings) {
         (warning.keepsOpen && verdict == Verdict::Incomplete ? model.doubts : model.warnings)
-            .push_back(warning.text);
+            .push_back(warningText(warning, say));
     }
     const std::size_t all = model.judged.size();
-    model.word = report::wordOf(verdict);
+    model.word = report::wordOf(verdict, say);
     switch (verdict) {
     case Verdict::Passed:
-        model.sentence =
-            all == 1 ? "The one criterion is within its tolerance."
-                     : "All " + std::to_string(all) + " criteria are within their tolerances.";
-        if (!model.judged.empty()) {
-            const Figure& nearest = model.judged.front();
-            model.sentence += " Nearest to its limit: " + nearest.title + ", " + nearest.value +
-                              " of " + nearest.tolerance + " " + nearest.unit + ".";
-        }
+        model.sentence = passedText(model.judged, say);
         return;
     case Verdict::Failed:
-        model.sentence = std::to_string(failed) + " of " +
-                         counted(all, "criterion is", "criteria are") + " above tolerance.";
+        model.sentence = say("page.failed", {{"failed", failed}, {"count", all}});
         return;
     case Verdict::Incomplete:
         if (all == 0) {
-            model.sentence = "The preset judges no criterion, so nothing can pass.";
+            model.sentence = say("page.nothingJudged");
         } else if (open == 0 && failed == 0 && !model.doubts.empty()) {
-            model.sentence =
-                "Every figure is within its tolerance, but the comparison itself is in "
-                "doubt, so it can't pass.";
+            model.sentence = say("page.inDoubt");
+        } else if (failed == 0) {
+            model.sentence = say("page.open", {{"open", open}, {"count", all}});
         } else {
             model.sentence =
-                std::to_string(open) + " of " + counted(all, "criterion", "criteria") +
-                " can't be answered from these data" +
-                (failed == 0 ? std::string(".") : ", " + std::to_string(failed) + " failed.");
+                say("page.openAndFailed", {{"open", open}, {"count", all}, {"failed", failed}});
         }
         return;
     }
 }
 
-/// "Measured M1, target M0, preset asks for M1 and requires it"
-std::string conditionText(const Result& result) {
+/// "measurement M1, target M0, preset requires M1"
+std::string conditionText(const Result& result, const Texts& say) {
     const std::string& measured = result.measurement.measurementCondition;
     const std::string& target = result.target.measurementCondition;
     const bool isAsked = result.presetCondition >= 0 && result.presetCondition <= 3;
     if (measured.empty() && target.empty() && !isAsked) {
         return {};
     }
-    const auto stated = [](const std::string& condition) {
-        return condition.empty() ? std::string("not stated") : condition;
+    const auto stated = [&](const std::string& condition) {
+        return condition.empty() ? say("page.notStated") : condition;
     };
+    const std::string preset = "M" + std::to_string(result.presetCondition);
     std::string text =
-        "Measuring condition: measurement " + stated(measured) + ", target " + stated(target);
+        say("page.condition", {{"measurement", stated(measured)}, {"target", stated(target)}});
     if (isAsked) {
-        text += std::string(", preset ") +
-                (result.conditionRequired ? "requires M" : "asks for M") +
-                std::to_string(result.presetCondition);
+        text += result.conditionRequired ? say("page.conditionRequired", {{"preset", preset}})
+                                         : say("page.conditionAsked", {{"preset", preset}});
     }
     return text;
 }
@@ -236,8 +243,21 @@ std::vector<std::size_t> worstFirst(const std::vector<Patch>& patches) {
     return order;
 }
 
-void chooseDrawn(Model& model) {
-    const std::size_t all = model.rows.size();
+/// The rows of the table, then those that only the charts need.
+void chooseRows(Model& model, const Result& result, const Texts& say) {
+    const std::vector<std::size_t> order = worstFirst(result.patches);
+    const std::size_t all = order.size();
+    model.shown = all > mostRows ? worstRows : all;
+    const auto add = [&](std::size_t place) {
+        const Patch& patch = result.patches[order[place]];
+        model.rows.push_back({order[place], swatch(patch.target), swatch(patch.measured)});
+    };
+    for (std::size_t i = 0; i < model.shown; ++i) {
+        add(i);
+    }
+    if (model.shown < all) {
+        model.shownText = say("page.worstRows", {{"shown", model.shown}, {"all", all}});
+    }
     const std::size_t worst = all <= mostDrawn ? all : mostDrawn / 2;
     model.drawn.resize(worst);
     std::iota(model.drawn.begin(), model.drawn.end(), std::size_t{0});
@@ -246,66 +266,60 @@ void chooseDrawn(Model& model) {
     }
     const std::size_t rest = mostDrawn - worst;
     for (std::size_t i = 0; i < rest; ++i) {
-        model.drawn.push_back(worst + i * (all - worst) / rest);
+        const std::size_t place = worst + i * (all - worst) / rest;
+        model.drawn.push_back(place < model.shown ? place : model.rows.size());
+        if (place >= model.shown) {
+            add(place);
+        }
     }
-    model.drawnText = "Drawn are " + std::to_string(mostDrawn) + " of " + std::to_string(all) +
-                      " patches: the " + std::to_string(worst) +
-                      " with the largest differences, and others spread evenly over the rest.";
+    model.drawnText = say("page.drawn", {{"drawn", mostDrawn}, {"all", all}, {"worst", worst}});
 }
 
-void drawHistogram(Model& model, const Result& result) {
+void drawHistogram(Model& model, const Result& result, const Texts& say) {
     std::vector<double> differences;
     for (const Patch& patch : result.patches) {
         differences.push_back(patch.difference);
     }
     model.histogram = histogramOf(differences);
-    model.marks = {
-        {"average " + fixedText(result.statistics.mean, 2), result.statistics.mean, false},
-        {"95 % " + fixedText(result.statistics.percentile95, 2), result.statistics.percentile95,
-         false}};
+    const auto average = say.number(result.statistics.mean, 2);
+    const auto percentile = say.number(result.statistics.percentile95, 2);
+    model.marks = {{say("page.averageMark", {{"value", average}}), result.statistics.mean, false},
+                   {say("page.percentileMark", {{"value", percentile}}),
+                    result.statistics.percentile95, false}};
     for (const Criterion& criterion : result.criteria) {
         if (!criterion.used || !criterion.tolerance) {
             continue;
         }
         const double limit = *criterion.tolerance;
-        const std::string text = fixedText(limit, decimalsOf(limit, 0));
+        const std::string text = say.number(limit, decimalsOf(limit, 0));
         if (criterion.name == "average") {
-            model.marks[0].label += " (at most " + text + ")";
+            model.marks[0].label +=
+                say("sentence.space") + say("page.limitOfMark", {{"limit", text}});
         } else if (criterion.name == "percentile95") {
-            model.marks[1].label += " (at most " + text + ")";
+            model.marks[1].label +=
+                say("sentence.space") + say("page.limitOfMark", {{"limit", text}});
         } else if (criterion.name == "maximum") {
-            model.marks.push_back({"limit of each patch " + text, limit, true});
+            model.marks.push_back({say("page.patchLimit", {{"limit", text}}), limit, true});
         }
     }
     std::erase_if(model.marks, [](const Mark& mark) { return !std::isfinite(mark.value); });
     for (const Bin& bin : model.histogram) {
-        model.histogramText += (model.histogramText.empty() ? "" : "; ") +
-                               fixedText(bin.from, decimalsOf(bin.from, 0)) + " to " +
-                               fixedText(bin.to, decimalsOf(bin.to, 0)) + ": " +
-                               std::to_string(bin.count);
+        model.histogramText +=
+            (model.histogramText.empty() ? "" : "; ") +
+            say("page.bin", {{"from", say.number(bin.from, decimalsOf(bin.from, 0))},
+                             {"to", say.number(bin.to, decimalsOf(bin.to, 0))},
+                             {"patches", bin.count}});
     }
 }
 
-void addFact(Facts& facts, const char* label, const std::string& text) {
+void addFact(Facts& facts, const std::string& label, const std::string& text) {
     if (!text.empty()) {
         facts.emplace_back(label, text);
     }
 }
 
-std::string foundBy(const std::string& how) {
-    if (how == "own") {
-        return "its own patches";
-    }
-    if (how == "profile") {
-        return "the profile, evaluated at their device values";
-    }
-    if (how == "deviceValues") {
-        return "patches with equal device values";
-    }
-    if (how == "labels") {
-        return "patches with equal ids or names";
-    }
-    return how == "order" ? "patches in the same order" : how;
+std::string foundBy(const std::string& how, const Texts& say) {
+    return say.find("foundBy." + how).value_or(how);
 }
 
 std::string listed(const Unpaired& unpaired) {
@@ -320,84 +334,100 @@ std::string listed(const Unpaired& unpaired) {
                                                                                : text;
 }
 
-Facts factsOf(const Input& input) {
+Facts factsOf(const Input& input, const Texts& say) {
     Facts facts;
-    addFact(facts, "File", input.path);
-    addFact(facts, "Kind", input.kind == "profile" ? "ICC profile" : "CGATS text");
-    facts.insert(facts.end(), input.statements.begin(), input.statements.end());
+    addFact(facts, say("fact.file"), input.path);
+    addFact(facts, say("fact.kind"),
+            input.kind == "profile" ? say("fact.profile") : say("fact.text"));
+    for (const auto& [name, text] : input.statements) {
+        addFact(facts, say.find("statement." + name).value_or(name),
+                text.empty() ? say.find("statement." + name + "Text").value_or("") : text);
+    }
     return facts;
 }
 
-void addSections(Model& model, const Result& result, const Meta* meta) {
+Facts jobFacts(const Model& model, const Meta& meta, const Texts& say) {
     Facts job;
-    if (meta != nullptr) {
-        addFact(job, "Title", meta->title);
-        addFact(job, "Job", std::to_string(meta->jobId));
-        if (meta->parentId) {
-            addFact(job, "Part of job", std::to_string(*meta->parentId));
-        }
-        addFact(job, "Strip", meta->strip == 2 ? "Second" : "First");
-        addFact(job, "Verified", model.created);
-        addFact(job, "Paper", meta->paper);
-        addFact(job, "Instrument", meta->instrument);
-        addFact(job, "Workflow", meta->workflow);
-        addFact(job, "Server", meta->server);
-        addFact(job, "User", meta->user);
+    addFact(job, say("fact.title"), meta.title);
+    addFact(job, say("fact.job"), std::to_string(meta.jobId));
+    if (meta.parentId) {
+        addFact(job, say("fact.parent"), std::to_string(*meta.parentId));
     }
-    addFact(job, "Preset", result.presetName);
-    addFact(job, "Preset number", result.presetId > 0 ? std::to_string(result.presetId) : "");
-    addFact(job, "Colour difference", formulaTitle(result.formula));
-    model.sections = {{meta != nullptr ? "Job" : "Preset", job},
-                      {"Target", factsOf(result.target)},
-                      {"Measurement", factsOf(result.measurement)}};
-    if (result.patchSet) {
-        model.sections.emplace_back("Patch set", factsOf(*result.patchSet));
-    }
-    Facts pairing;
-    addFact(pairing, "Patches of",
-            result.selection == "patchSet" ? "the patch set" : "the " + result.selection);
-    addFact(pairing, "Target values from", foundBy(result.targetBy));
-    addFact(pairing, "Measured values from", foundBy(result.measurementBy));
-    addFact(pairing, "Patches of the target that were not measured", listed(result.unpairedTarget));
-    addFact(pairing, "Measured patches without a target", listed(result.unpairedMeasurement));
-    addFact(pairing, "Patches of the patch set that the files lack",
-            listed(result.unpairedPatchSet));
-    if (result.repeats.patches > 0) {
-        addFact(pairing, "Measured more than once",
-                counted(result.repeats.patches, "patch", "patches") + ", " +
-                    counted(result.repeats.readings, "reading", "readings") +
-                    (result.repeats.averaged ? "; their means are compared"
-                                             : "; each is compared by itself"));
-        if (result.repeats.worstPatch && result.repeats.largestDistance) {
-            addFact(pairing, "Furthest from the mean of its readings",
-                    fixedText(*result.repeats.largestDistance, 2) + " " + model.unit + ", " +
-                        labelOf(result, *result.repeats.worstPatch));
-        }
-    }
-    model.sections.emplace_back("Pairing", pairing);
-    model.sections.emplace_back(
-        "Made by", Facts{{"Tintgate", result.toolVersion}, {"libTintgate", result.libraryVersion}});
+    addFact(job, say("fact.strip"),
+            meta.strip == 2 ? say("fact.secondStrip") : say("fact.firstStrip"));
+    addFact(job, say("fact.verified"), model.created);
+    addFact(job, say("fact.paper"), meta.paper);
+    addFact(job, say("fact.instrument"), meta.instrument);
+    addFact(job, say("fact.workflow"), meta.workflow);
+    addFact(job, say("fact.server"), meta.server);
+    addFact(job, say("fact.user"), meta.user);
+    return job;
 }
 
-void addRepeats(Model& model, const Result& result) {
+Facts pairingFacts(const Model& model, const Result& result, const Texts& say) {
+    Facts pairing;
+    addFact(pairing, say("pairing.selection"),
+            say.find("selection." + result.selection).value_or(result.selection));
+    addFact(pairing, say("pairing.target"), foundBy(result.targetBy, say));
+    addFact(pairing, say("pairing.measurement"), foundBy(result.measurementBy, say));
+    addFact(pairing, say("pairing.notMeasured"), listed(result.unpairedTarget));
+    addFact(pairing, say("pairing.noTarget"), listed(result.unpairedMeasurement));
+    addFact(pairing, say("pairing.notInFiles"), listed(result.unpairedPatchSet));
+    const Repeats& repeats = result.repeats;
+    if (repeats.patches > 0) {
+        const std::string patches = say("count.patches", {{"count", repeats.patches}});
+        const std::string readings = say("count.readings", {{"count", repeats.readings}});
+        addFact(pairing, say("pairing.repeated"),
+                repeats.averaged
+                    ? say("pairing.averaged", {{"patches", patches}, {"readings", readings}})
+                    : say("pairing.each", {{"patches", patches}, {"readings", readings}}));
+        if (repeats.worstPatch && repeats.largestDistance) {
+            addFact(pairing, say("pairing.furthest"),
+                    say.number(*repeats.largestDistance, 2) + " " + model.unit + ", " +
+                        labelOf(result, *repeats.worstPatch, say));
+        }
+    }
+    return pairing;
+}
+
+void addSections(Model& model, const Result& result, const Meta* meta, const Texts& say) {
+    Facts job;
+    if (meta != nullptr) {
+        job = jobFacts(model, *meta, say);
+    }
+    addFact(job, say("fact.preset"), result.presetName);
+    addFact(job, say("fact.presetNumber"),
+            result.presetId > 0 ? std::to_string(result.presetId) : "");
+    addFact(job, say("fact.formula"), formulaTitle(result.formula, say));
+    model.sections = {{meta != nullptr ? say("section.job") : say("section.preset"), job},
+                      {say("section.target"), factsOf(result.target, say)},
+                      {say("section.measurement"), factsOf(result.measurement, say)}};
+    if (result.patchSet) {
+        model.sections.emplace_back(say("section.patchSet"), factsOf(*result.patchSet, say));
+    }
+    model.sections.emplace_back(say("section.pairing"), pairingFacts(model, result, say));
+    model.sections.emplace_back(
+        say("section.programs"),
+        Facts{{"Tintgate", result.toolVersion}, {"libTintgate", result.libraryVersion}});
+}
+
+void addRepeats(Model& model, const Result& result, const Texts& say) {
     const Repeats& repeats = result.repeats;
     if (repeats.patches == 0 || !repeats.largestDistance) {
         return;
     }
-    model.statistics.emplace_back("Read repeatedly", std::to_string(repeats.patches));
-    model.statistics.emplace_back("Spread of repeats", fixedText(*repeats.largestDistance, 2));
+    model.statistics.emplace_back(say("statistic.repeated"), say.count(repeats.patches));
+    model.statistics.emplace_back(say("statistic.spread"), say.number(*repeats.largestDistance, 2));
 }
 
-void addHead(Model& model, const Result& result, const Meta* meta) {
+void addHead(Model& model, const Result& result, const Meta* meta, const Texts& say) {
     const std::string& path = result.measurement.path;
-    model.title = meta != nullptr && !meta->title.empty() ? meta->title
-                  : meta != nullptr                       ? "Job " + std::to_string(meta->jobId)
-                                                          : path.substr(path.rfind('/') + 1);
+    model.title = meta != nullptr ? jobTitle(*meta, say) : path.substr(path.rfind('/') + 1);
     std::vector<std::string> parts;
     if (meta != nullptr) {
-        model.created = dateText(meta->created);
-        parts = {meta->strip == 2 ? "Second strip" : "First strip", meta->paper, meta->instrument,
-                 result.presetName, model.created};
+        model.created = dateText(meta->created, say);
+        parts = {meta->strip == 2 ? say("page.secondStrip") : say("page.firstStrip"), meta->paper,
+                 meta->instrument, result.presetName, model.created};
     } else {
         parts = {result.presetName};
     }
@@ -408,15 +438,91 @@ void addHead(Model& model, const Result& result, const Meta* meta) {
     }
 }
 
-} // namespace
-
-const char* wordOf(Verdict verdict) {
-    return verdict == Verdict::Passed   ? "Passed"
-           : verdict == Verdict::Failed ? "Failed"
-                                        : "Incomplete";
+std::string statementOf(const Input& input, const char* wanted) {
+    for (const auto& [name, text] : input.statements) {
+        if (name == wanted) {
+            return text;
+        }
+    }
+    return {};
 }
 
-std::string labelOf(const Result& result, std::size_t index) {
+/// What a verdict is worth nothing without, for the first page of a print.
+void addBasis(Model& model, const Result& result, const Meta* meta, const Texts& say) {
+    const std::string& path = result.target.path;
+    const std::string file = path.substr(path.rfind('/') + 1);
+    const std::string description = statementOf(result.target, "description");
+    addFact(model.basis, say("section.target"),
+            description.empty() ? file : description + " (" + file + ")");
+    addFact(model.basis, say("section.preset"), result.presetName);
+    addFact(model.basis, say("fact.date"),
+            meta != nullptr ? model.created : statementOf(result.measurement, "created"));
+    addFact(model.basis, say("fact.instrument"),
+            meta != nullptr && !meta->instrument.empty()
+                ? meta->instrument
+                : statementOf(result.measurement, "instrumentation"));
+    addFact(model.basis, say("fact.condition"), model.condition);
+    if (meta != nullptr) {
+        addFact(model.basis, say("fact.strip"),
+                meta->strip == 2 ? say("fact.secondStrip") : say("fact.firstStrip"));
+        addFact(model.basis, say("fact.paper"), meta->paper);
+    }
+}
+
+/// The file that is meant, as the sentences need it: "the target", "of the target", "in the
+/// target".
+void addRole(languages::Recognised& sentence, const std::string& name, const std::string& english,
+             const Texts& say) {
+    for (const char* form : {"", "Of", "In"}) {
+        if (const auto text = say.find("role." + english + form)) {
+            sentence.values.emplace_back(name + form, *text);
+        }
+    }
+}
+
+} // namespace
+
+std::string wordOf(Verdict verdict, const Texts& say) {
+    return verdict == Verdict::Passed   ? say("verdict.passed")
+           : verdict == Verdict::Failed ? say("verdict.failed")
+                                        : say("verdict.incomplete");
+}
+
+std::string titleOf(const Criterion& criterion, const Texts& say) {
+    return say.find("criterion." + criterion.name).value_or(criterion.title);
+}
+
+std::string warningText(const Warning& warning, const Texts& say) {
+    if (say.language() == languages::Language::English) {
+        return warning.text;
+    }
+    auto sentence = languages::recognise(warning.text, "warning." + warning.code + ".");
+    if (!sentence) {
+        return warning.text;
+    }
+    const auto values = sentence->values;
+    for (auto& [name, text] : sentence->values) {
+        if (name == "note") {
+            const auto note = languages::recognise(text, "note.");
+            text = note ? say(*note) : text;
+        } else if (name == "stated") {
+            const auto stated = languages::recognise(text, "stated.");
+            text = stated ? say(*stated) : text;
+        }
+    }
+    for (const auto& [name, text] : values) {
+        if (name == "role" || name == "other") {
+            addRole(*sentence, name, text, say);
+        }
+    }
+    return say(*sentence);
+}
+
+std::string jobTitle(const Meta& meta, const Texts& say) {
+    return meta.title.empty() ? say("page.job", {{"job", std::to_string(meta.jobId)}}) : meta.title;
+}
+
+std::string labelOf(const Result& result, std::size_t index, const Texts& say) {
     const Patch& patch = result.patches[index];
     const auto joined = [](const std::string& id, const std::string& name) {
         return id.empty() || name.empty() || name == id ? id + (name == id ? "" : name)
@@ -424,11 +530,13 @@ std::string labelOf(const Result& result, std::size_t index) {
     };
     const std::string inTarget = joined(patch.id, patch.name);
     const std::string onSheet = joined(patch.measuredId, patch.measuredName);
-    const std::string device = deviceText(result, index);
+    const std::string device = deviceText(result, index, say);
     if (onSheet.empty() || onSheet == inTarget) {
-        return (inTarget.empty() ? "row " + std::to_string(index + 1) : inTarget) + device;
+        return (inTarget.empty() ? say("page.row", {{"row", index + 1}}) : inTarget) + device;
     }
-    return onSheet + device + (inTarget.empty() ? "" : ", in the target " + inTarget);
+    return inTarget.empty()
+               ? onSheet + device
+               : say("page.labelInTarget", {{"sheet", onSheet + device}, {"target", inTarget}});
 }
 
 std::string fixedText(double value, int decimals) {
@@ -447,19 +555,11 @@ std::string unitOf(const Criterion& criterion, const std::string& formula) {
                                      : differenceUnit(formula);
 }
 
-std::string dayText(int day, int month, int year) {
-    static constexpr const char* months[] = {"January",   "February", "March",    "April",
-                                             "May",       "June",     "July",     "August",
-                                             "September", "October",  "November", "December"};
-    return std::to_string(day) + ' ' +
-           (month >= 1 && month <= 12 ? months[month - 1] : std::to_string(month)) + ' ' +
-           std::to_string(year);
-}
-
-std::string dateText(const std::string& created) {
-    return dayText(std::stoi(created.substr(8, 2)), std::stoi(created.substr(5, 2)),
-                   std::stoi(created.substr(0, 4))) +
-           ", " + created.substr(11, 5) + " (UTC" + created.substr(19) + ")";
+std::string dateText(const std::string& created, const Texts& say) {
+    const std::string day =
+        say.day(std::stoi(created.substr(8, 2)), std::stoi(created.substr(5, 2)),
+                std::stoi(created.substr(0, 4)));
+    return say.time(day, created.substr(11, 5)) + " (UTC" + created.substr(19) + ")";
 }
 
 std::vector<Bin> histogramOf(const std::vector<double>& values) {
@@ -492,36 +592,33 @@ std::vector<Bin> histogramOf(const std::vector<double>& values) {
     return bins;
 }
 
-Model makeModel(const Result& result, const Meta* meta, const Facts& print) {
+Model makeModel(const Result& result, const Meta* meta, const Texts& say, const Facts& print) {
     Model model;
-    addHead(model, result, meta);
+    addHead(model, result, meta, say);
     model.unit = differenceUnit(result.formula);
     for (const Criterion& criterion : result.criteria) {
-        (criterion.used ? model.judged : model.others).push_back(figureOf(criterion, result));
+        (criterion.used ? model.judged : model.others).push_back(figureOf(criterion, result, say));
     }
     putInOrder(model.judged);
-    sayVerdict(model, result);
-    model.condition = conditionText(result);
+    sayVerdict(model, result, say);
+    model.condition = conditionText(result, say);
+    addBasis(model, result, meta, say);
     const Statistics& s = result.statistics;
-    model.statistics = {{"Patches", std::to_string(result.patches.size())},
-                        {"Average", fixedText(s.mean, 2)},
-                        {"Median", fixedText(s.median, 2)},
-                        {"95th percentile", fixedText(s.percentile95, 2)},
-                        {"Largest", fixedText(s.maximum, 2)},
-                        {"Standard deviation", fixedText(s.standardDeviation, 2)}};
-    addRepeats(model, result);
-    drawHistogram(model, result);
-    for (const std::size_t patch : worstFirst(result.patches)) {
-        model.rows.push_back(
-            {patch, swatch(result.patches[patch].target), swatch(result.patches[patch].measured)});
-    }
-    chooseDrawn(model);
-    addSections(model, result, meta);
+    model.statistics = {{say("statistic.patches"), say.count(result.patches.size())},
+                        {say("statistic.average"), say.number(s.mean, 2)},
+                        {say("statistic.median"), say.number(s.median, 2)},
+                        {say("statistic.percentile95"), say.number(s.percentile95, 2)},
+                        {say("statistic.largest"), say.number(s.maximum, 2)},
+                        {say("statistic.deviation"), say.number(s.standardDeviation, 2)}};
+    addRepeats(model, result, say);
+    drawHistogram(model, result, say);
+    chooseRows(model, result, say);
+    addSections(model, result, meta, say);
     if (!print.empty()) {
         for (const auto& [label, text] : print) {
             model.subtitle += (model.subtitle.empty() ? "" : " · ") + text;
         }
-        model.sections.emplace(model.sections.begin(), "Print", print);
+        model.sections.emplace(model.sections.begin(), say("section.print"), print);
     }
     return model;
 }

@@ -12,10 +12,11 @@
 #include "report/Meta.h"
 #include "report/Result.h"
 #include "report/Swatch.h"
+#include "report/languages/Texts.h"
 
 namespace report {
 
-/// One criterion. Numbers are texts, with the decimals of the preset.
+/// One criterion. Numbers are texts of the page's language, with the decimals of the preset.
 struct Figure {
     std::string title;
     std::string unit;
@@ -63,16 +64,21 @@ struct Model {
     std::vector<std::string> doubts;  ///< Of an incomplete verdict: warnings that keep it open.
     std::vector<std::string> reasons; ///< Failed criteria, the furthest above first; then those
                                       ///< without data.
-    std::string condition; ///< Measuring condition of measurement, target and preset; may be empty.
-    std::string unit;      ///< Of the differences, such as "ΔE00".
+    std::string condition;      ///< Of the measurement, the target and the preset; may be empty.
+    Facts basis;                ///< Reference, preset, date, instrument, condition: what is known.
+    std::string unit;           ///< Of the differences, such as "ΔE00".
     std::vector<Figure> judged; ///< Used criteria: failed, without data, passed.
     std::vector<Figure> others; ///< The rest, in the result's order.
     Facts statistics;
     std::vector<std::string> warnings; ///< Without the doubts.
     std::vector<Bin> histogram;
     std::vector<Mark> marks;
-    std::string histogramText;      ///< The same in words, for those who can't see it.
-    std::vector<Row> rows;          ///< All patches, the largest difference first, no number last.
+    std::string histogramText; ///< The same in words, for those who can't see it.
+    /// The first `shown` are for the table: all patches, or the worst ones, in either case the
+    /// largest difference first, no number last. Rows that only the charts need follow.
+    std::vector<Row> rows;
+    std::size_t shown = 0;
+    std::string shownText;          ///< States that the table has not all patches; else empty.
     std::vector<std::size_t> drawn; ///< Indices of `rows` for the charts.
     std::string drawnText;          ///< Says so where the charts don't draw all.
     std::vector<std::pair<std::string, Facts>> sections; ///< Job, inputs, pairing, programs.
@@ -83,31 +89,45 @@ struct Model {
 /// from the rest, which keeps a chart of any size quick and its outline true.
 inline constexpr std::size_t mostDrawn = 2000;
 
+/// A page has all patches up to this number; beyond it, the worst of them (a page of a million rows
+/// would be 130 MB, and no one would look at its end).
+inline constexpr std::size_t mostRows = 20000;
+inline constexpr std::size_t worstRows = 5000;
+
 /// `meta` may be null: a result of files has no job. `print` is what else is known of the print,
 /// such as its paper; it may be empty.
-Model makeModel(const Result& result, const Meta* meta, const Facts& print = {});
+Model makeModel(const Result& result, const Meta* meta,
+                const languages::Texts& say = languages::english(), const Facts& print = {});
 
 /// Bins of equal, round width (1, 2 or 5 times a power of ten) from 0 to behind the largest value:
 /// about 12 to 30 of them. Values that are not finite are left out, negative ones count as 0.
 std::vector<Bin> histogramOf(const std::vector<double>& values);
 
 /// "Passed", "Failed", "Incomplete".
-const char* wordOf(Verdict verdict);
+std::string wordOf(Verdict verdict, const languages::Texts& say = languages::english());
+
+/// A criterion's name for people; the result's own title if it is not in the tables.
+std::string titleOf(const Criterion& criterion, const languages::Texts& say);
+
+/// The warning's sentence; the English one of the result if it is not in the tables.
+std::string warningText(const Warning& warning, const languages::Texts& say);
+
+/// The title of the job, otherwise "Job 4711".
+std::string jobTitle(const Meta& meta, const languages::Texts& say);
 
 /// A patch for a person who looks for it on the sheet: its id and name there or, without either, in
 /// the target, or its row; its device values; and its label in the target if that is another.
-std::string labelOf(const Result& result, std::size_t patch);
+std::string labelOf(const Result& result, std::size_t patch,
+                    const languages::Texts& say = languages::english());
 
 /// Fixed decimals with a point in every locale; "–" where not finite.
 std::string fixedText(double value, int decimals);
-
-/// "1 May 2024"
-std::string dayText(int day, int month, int year);
 
 /// What a criterion is measured in, such as "ΔE00" under the formula "CIE2000".
 std::string unitOf(const Criterion& criterion, const std::string& formula);
 
 /// 2024-05-01T12:34:56+02:00 as "1 May 2024, 12:34 (UTC+02:00)".
-std::string dateText(const std::string& created);
+std::string dateText(const std::string& created,
+                     const languages::Texts& say = languages::english());
 
 } // namespace report

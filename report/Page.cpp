@@ -3,12 +3,14 @@
 
 #include <cmath>
 
+#include "report/Body.h"
 #include "report/InPage.h"
 #include "report/Template.h"
 
 namespace report {
 namespace {
 
+using languages::Texts;
 using Json = PageJson;
 
 constexpr std::string_view summaryStart = R"(<script type="application/json" id="summary">)";
@@ -57,31 +59,6 @@ void appendRow(std::string& text, const Result& result, const Row& row) {
     text += ']';
 }
 
-Json figures(const std::vector<Figure>& figures) {
-    Json list = Json::array();
-    for (const Figure& figure : figures) {
-        list.push_back({{"title", figure.title},
-                        {"unit", figure.unit},
-                        {"outcome", keyOf(figure.outcome)},
-                        {"word", figure.word},
-                        {"value", figure.value},
-                        {"tolerance", figure.tolerance},
-                        {"distance", figure.distance},
-                        {"fill", figure.fill},
-                        {"patches", figure.patches},
-                        {"worst", figure.worstLabel}});
-    }
-    return list;
-}
-
-Json facts(const Facts& facts) {
-    Json list = Json::array();
-    for (const auto& [label, text] : facts) {
-        list.push_back({label, text});
-    }
-    return list;
-}
-
 Json bins(const std::vector<Bin>& histogram) {
     Json list = Json::array();
     for (const Bin& bin : histogram) {
@@ -98,38 +75,20 @@ Json marks(const std::vector<Mark>& marks) {
     return list;
 }
 
-Json sections(const Model& model) {
-    Json list = Json::array();
-    for (const auto& [title, content] : model.sections) {
-        list.push_back({title, facts(content)});
-    }
-    return list;
-}
-
-std::string dataOf(const Model& model, const Result& result) {
-    const Json head = {{"title", model.title},
-                       {"subtitle", model.subtitle},
-                       {"verdict", keyOf(model.verdict)},
-                       {"word", model.word},
-                       {"sentence", model.sentence},
-                       {"doubts", model.doubts},
-                       {"reasons", model.reasons},
-                       {"condition", model.condition},
-                       {"unit", model.unit},
-                       {"judged", figures(model.judged)},
-                       {"others", figures(model.others)},
-                       {"statistics", facts(model.statistics)},
-                       {"warnings", model.warnings},
+std::string dataOf(const Model& model, const Result& result, const Texts& say) {
+    const Json head = {{"unit", model.unit},
+                       {"all", result.patches.size()},
+                       {"shown", model.shown},
+                       {"shownText", model.shownText},
                        {"histogram", bins(model.histogram)},
                        {"marks", marks(model.marks)},
                        {"histogramText", model.histogramText},
                        {"drawn", model.drawn},
                        {"drawnText", model.drawnText},
-                       {"sections", sections(model)},
                        {"channels", result.channels}};
     std::string text = inScript(head);
     text.back() = ',';
-    text += "\"rows\":[";
+    text += "\"texts\":" + scriptTexts(say, "page") + ",\"rows\":[";
     for (std::size_t i = 0; i < model.rows.size(); ++i) {
         text += i == 0 ? "\n" : ",\n";
         appendRow(text, result, model.rows[i]);
@@ -150,22 +109,40 @@ std::string shortened(std::string text) {
 }
 
 Json summaryJson(const Summary& summary) {
-    return {{"verdict", keyOf(summary.verdict)},       {"word", summary.word},
-            {"sentence", shortened(summary.sentence)}, {"title", shortened(summary.title)},
-            {"subtitle", shortened(summary.subtitle)}, {"created", summary.created}};
+    return {{"verdict", keyOf(summary.verdict)},
+            {"word", summary.word},
+            {"sentence", shortened(summary.sentence)},
+            {"title", shortened(summary.title)},
+            {"subtitle", shortened(summary.subtitle)},
+            {"created", summary.created},
+            {"language", summary.language}};
 }
 
 } // namespace
 
-std::string pageOf(const Result& result, const Meta* meta, const Facts& print) {
-    const Model model = makeModel(result, meta, print);
-    const Summary summary{model.verdict, model.word,     model.sentence,
-                          model.title,   model.subtitle, meta != nullptr ? meta->created : ""};
-    std::string page(pageTemplate[0]);
-    page += inScript(summaryJson(summary));
-    page += pageTemplate[1];
-    page += dataOf(model, result);
-    return page += pageTemplate[2];
+languages::Language languageOf(const Meta* meta) {
+    const auto ofJob = meta != nullptr ? languages::languageNamed(meta->language) : std::nullopt;
+    return ofJob ? *ofJob : languages::languageOfUser();
+}
+
+std::string pageOf(const Result& result, const Meta* meta, const Texts& say, const Facts& print) {
+    const Model model = makeModel(result, meta, say, print);
+    const Summary summary{model.verdict,
+                          model.word,
+                          model.sentence,
+                          model.title,
+                          model.subtitle,
+                          meta != nullptr ? meta->created : "",
+                          std::string(languages::tagOf(say.language()))};
+    return assembled(pageTemplate, say, [&](std::string_view hole, std::string& page) {
+        if (hole == "summary") {
+            page += inScript(summaryJson(summary));
+        } else if (hole == "data") {
+            page += dataOf(model, result, say);
+        } else {
+            page += bodyPart(hole, model, say).markup();
+        }
+    });
 }
 
 std::optional<Summary> summaryIn(std::string_view page) {
@@ -186,21 +163,26 @@ std::optional<Summary> summaryIn(std::string_view page) {
         summary.title = json.at("title");
         summary.subtitle = json.at("subtitle");
         summary.created = json.at("created");
+        summary.language = json.value("language", "en"); // Pages of older versions are English.
         return summary;
     } catch (const Json::exception&) {
         return std::nullopt;
     }
 }
 
-std::string indexOf(const std::vector<Listed>& reports, const std::string& folder) {
+std::string indexOf(const std::vector<Listed>& reports, const std::string& folder,
+                    const Texts& say) {
     Json list = Json::array();
     for (const Listed& report : reports) {
         list.push_back(summaryJson(report.summary));
+        list.back()["word"] = wordOf(report.summary.verdict, say);
         list.back()["link"] = linkTo(report.path);
     }
-    std::string page(indexTemplate[0]);
-    page += inScript({{"folder", folder}, {"reports", list}});
-    return page += indexTemplate[1];
+    return assembled(indexTemplate, say, [&](std::string_view, std::string& page) {
+        page += inScript({{"folder", folder}, {"reports", list}});
+        page.back() = ',';
+        page += "\"texts\":" + scriptTexts(say, "index") + "}";
+    });
 }
 
 } // namespace report

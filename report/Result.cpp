@@ -92,18 +92,14 @@ Input input(const Json& json) {
     if (const auto found = json.find("identity"); found != json.end() && found->is_string()) {
         input.identity = found->get<std::string>();
     }
-    for (const auto& [key, title] :
-         {std::pair{"description", "Description"}, std::pair{"originator", "Originator"},
-          std::pair{"created", "Created"}, std::pair{"instrumentation", "Instrumentation"},
-          std::pair{"printing", "Printing"}, std::pair{"illuminant", "Illuminant"},
-          std::pair{"observer", "Observer"},
-          std::pair{"measurementCondition", "Measurement condition"}}) {
+    for (const char* key : {"description", "originator", "created", "instrumentation", "printing",
+                            "illuminant", "observer", "measurementCondition"}) {
         if (const auto found = json.find(key); found != json.end() && found->is_string()) {
-            input.statements.emplace_back(title, found->get<std::string>());
+            input.statements.emplace_back(key, found->get<std::string>());
         }
     }
     if (json.value("calculatedFromSpectra", false)) {
-        input.statements.emplace_back("Colours", "calculated from the spectra for D50, 2 degrees");
+        input.statements.emplace_back("calculatedFromSpectra", "");
     }
     if (const auto found = json.find("measurementCondition");
         found != json.end() && found->is_string()) {
@@ -230,7 +226,8 @@ void fill(Result& result, const Json& json) {
         result.criteria.push_back(criterion(item));
     }
     for (const Json& item : json.at("warnings")) {
-        result.warnings.push_back({item.at("text"), item.value("keepsOpen", false)});
+        result.warnings.push_back(
+            {item.at("text"), item.value("keepsOpen", false), item.value("code", "")});
     }
     for (const Json& item : json.at("deviceChannels")) {
         result.channels.push_back(item);

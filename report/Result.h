@@ -50,13 +50,16 @@ struct Input {
     std::string path;
     std::string kind;     ///< "text" or "profile".
     std::string identity; ///< Of a target's colours; empty in results of versions before it.
+    /// The result's key and the file's words, such as "originator". "calculatedFromSpectra" has an
+    /// empty text.
     std::vector<std::pair<std::string, std::string>> statements;
     std::string measurementCondition; ///< "M0" to "M3", or empty.
 };
 
 struct Warning {
-    std::string text;
+    std::string text;       ///< In English.
     bool keepsOpen = false; ///< Because of this the verdict is at best "incomplete".
+    std::string code = {};  ///< docs/result.md lists them; empty for one that a program adds.
 };
 
 /// Patches that were measured more than once. Distances are of a reading from the mean of its

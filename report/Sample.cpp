@@ -6,14 +6,8 @@
 namespace report {
 namespace {
 
-constexpr struct {
-    const char* name;
-    const char* criterion;
-} inkTable[inkCount] = {{"Paper white", "paperWhite"},
-                        {"Cyan", "solidCyan"},
-                        {"Magenta", "solidMagenta"},
-                        {"Yellow", "solidYellow"},
-                        {"Black", "solidBlack"}};
+constexpr const char* inkCriteria[inkCount] = {"paperWhite", "solidCyan", "solidMagenta",
+                                               "solidYellow", "solidBlack"};
 
 constexpr double deviceTolerance = 0.5;
 
@@ -36,8 +30,8 @@ void addInks(Sample& sample, const Result& result) {
 }
 
 std::string statementOf(const Input& input, const char* wanted) {
-    for (const auto& [label, text] : input.statements) {
-        if (label == wanted) {
+    for (const auto& [key, text] : input.statements) {
+        if (key == wanted) {
             return text;
         }
     }
@@ -50,12 +44,8 @@ std::string fileName(const std::string& path) {
 
 } // namespace
 
-const char* inkName(Ink ink) {
-    return inkTable[static_cast<std::size_t>(ink)].name;
-}
-
 const char* inkCriterion(Ink ink) {
-    return inkTable[static_cast<std::size_t>(ink)].criterion;
+    return inkCriteria[static_cast<std::size_t>(ink)];
 }
 
 std::optional<Ink> inkOf(const double* device, std::size_t channels) {
@@ -99,15 +89,15 @@ InkColours InkMeans::means() const {
 Sample sampleOf(const Result& result, const Meta* meta) {
     Sample sample;
     sample.title = fileName(result.measurement.path);
-    sample.instrument = statementOf(result.measurement, "Instrumentation");
-    sample.printer = statementOf(result.measurement, "Printing");
+    sample.instrument = statementOf(result.measurement, "instrumentation");
+    sample.printer = statementOf(result.measurement, "printing");
     sample.target = fileName(result.target.path);
     sample.targetKey = result.target.identity;
     if (sample.targetKey.empty()) {
-        sample.targetKey = sample.target + '\n' + statementOf(result.target, "Description");
+        sample.targetKey = sample.target + '\n' + statementOf(result.target, "description");
     }
     if (meta != nullptr) {
-        sample.title = meta->title.empty() ? "Job " + std::to_string(meta->jobId) : meta->title;
+        sample.title = meta->title;
         sample.jobId = meta->jobId;
         sample.strip = meta->strip;
         sample.paper = meta->paper;

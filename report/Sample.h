@@ -21,9 +21,6 @@ inline constexpr std::size_t inkCount = 5;
 inline constexpr Ink allInks[inkCount] = {Ink::Paper, Ink::Cyan, Ink::Magenta, Ink::Yellow,
                                           Ink::Black};
 
-/// "Paper white", "Cyan" and so on.
-const char* inkName(Ink ink);
-
 /// The criterion that holds the ink against its target, such as "solidCyan".
 const char* inkCriterion(Ink ink);
 
@@ -51,7 +48,7 @@ class InkMeans {
 /// One strip of one job, or one file's comparison. Texts are empty where nothing is known.
 struct Sample {
     std::int64_t time = 0; ///< Seconds since 1970 on the room's own clock, whatever its zone.
-    std::string title;
+    std::string title;     ///< Empty for a job without one.
     std::optional<std::int64_t> jobId;
     int strip = 1;
     std::string paper;

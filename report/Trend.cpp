@@ -18,6 +18,8 @@
 namespace report {
 namespace {
 
+using languages::Texts;
+
 constexpr double none = std::numeric_limits<double>::quiet_NaN();
 constexpr std::size_t recentJobs = 20;
 
@@ -28,25 +30,14 @@ std::tm partsOf(std::int64_t time) {
     return parts;
 }
 
-std::string dayText(std::int64_t time) {
+std::string dayText(std::int64_t time, const Texts& say) {
     const std::tm parts = partsOf(time);
-    return report::dayText(parts.tm_mday, parts.tm_mon + 1, parts.tm_year + 1900);
+    return say.day(parts.tm_mday, parts.tm_mon + 1, parts.tm_year + 1900);
 }
 
-/// "cyan", "cyan and black", "cyan, magenta and black"
-std::string listText(const std::vector<std::string>& words) {
-    std::string text;
-    for (std::size_t i = 0; i < words.size(); ++i) {
-        text += (i == 0 ? "" : i + 1 == words.size() ? " and " : ", ") + words[i];
-    }
-    return text;
-}
-
-std::string lower(std::string text) {
-    if (!text.empty() && text[0] >= 'A' && text[0] <= 'Z') {
-        text[0] = static_cast<char>(text[0] - 'A' + 'a');
-    }
-    return text;
+/// "cyan": as a word within a sentence.
+std::string inText(Ink ink, const Texts& say) {
+    return say.find(std::string("inkInText.") + inkCriterion(ink)).value_or("");
 }
 
 const Criterion* criterionOf(const Sample& sample, const std::string& name) {
@@ -71,52 +62,61 @@ double excessOf(const Criterion& criterion) {
 
 // ---- Inks
 
-constexpr struct {
-    const char* symbol;
-    const char* more;
-    const char* less;
-} axes[3] = {{"L*", "lighter", "darker"}, {"a*", "redder", "greener"}, {"b*", "yellower", "bluer"}};
+constexpr const char* axes[3] = {"L*", "a*", "b*"};
+
+/// "lighter", "greener": where a colour has moved along an axis.
+std::string directionOf(std::size_t axis, bool more, const Texts& say) {
+    switch (axis) {
+    case 0:
+        return more ? say("trend.lighter") : say("trend.darker");
+    case 1:
+        return more ? say("trend.redder") : say("trend.greener");
+    default:
+        return more ? say("trend.yellower") : say("trend.bluer");
+    }
+}
 
 double axisOf(const colour::Lab& lab, std::size_t axis) {
     return axis == 0 ? lab.L : axis == 1 ? lab.a : lab.b;
 }
 
-std::string shiftText(const Drift (&drifts)[3]) {
+std::string signedText(double value, const Texts& say) {
+    const double rounded = std::round(value * 100) / 100 + 0.0; // No "-0.00".
+    return (std::signbit(rounded) ? "" : "+") + say.number(rounded, 2);
+}
+
+std::string shiftText(const Drift (&drifts)[3], const Texts& say) {
     std::vector<std::string> parts;
     for (std::size_t i = 0; i < 3; ++i) {
         if (drifts[i].significant) {
-            parts.push_back((drifts[i].shift > 0 ? axes[i].more : axes[i].less) +
-                            std::string(" (") + axes[i].symbol +
-                            (drifts[i].shift > 0 ? "\u00a0+" : "\u00a0") +
-                            fixedText(drifts[i].shift, 2) + ")");
+            parts.push_back(directionOf(i, drifts[i].shift > 0, say) + " (" + axes[i] + "\u00a0" +
+                            signedText(drifts[i].shift, say) + ")");
         }
     }
-    return listText(parts);
+    return say.list(parts);
 }
 
-void sayMovement(InkTrend& trend, bool significant, std::size_t known) {
+void sayMovement(InkTrend& trend, bool significant, std::size_t known, const Texts& say) {
     if (known == 0) {
-        trend.word = "No data";
+        trend.word = say("movement.noData");
         return;
     }
     trend.movement = known < fewestForDrift                       ? Movement::TooFew
                      : significant && trend.shift > smallestDrift ? Movement::Drifting
                                                                   : Movement::Steady;
-    trend.word = trend.movement == Movement::TooFew     ? "Too few jobs"
-                 : trend.movement == Movement::Drifting ? "Drifting"
-                                                        : "Steady";
+    trend.word = wordOf(trend.movement, say);
 }
 
 /// What the latest job that was judged says of the ink.
-void addLatest(InkTrend& trend, const std::vector<const Sample*>& samples) {
+void addLatest(InkTrend& trend, const std::vector<const Sample*>& samples, const Texts& say) {
     for (auto at = samples.rbegin(); at != samples.rend(); ++at) {
         const Criterion* const criterion = criterionOf(**at, inkCriterion(trend.ink));
         if (criterion == nullptr || !std::isfinite(judgedValue(*criterion))) {
             continue;
         }
-        trend.value = fixedText(judgedValue(*criterion), criterion->decimals);
+        trend.value = say.number(judgedValue(*criterion), criterion->decimals);
         if (criterion->tolerance && *criterion->tolerance > 0) {
-            trend.tolerance = fixedText(*criterion->tolerance, criterion->decimals);
+            trend.tolerance = say.number(*criterion->tolerance, criterion->decimals);
             trend.fill = std::clamp(judgedValue(*criterion) / *criterion->tolerance / 2, 0.0, 1.0);
         }
         trend.above = criterion->used && criterion->outcome == Outcome::Fail;
@@ -125,7 +125,7 @@ void addLatest(InkTrend& trend, const std::vector<const Sample*>& samples) {
 }
 
 /// Without colours the difference from the target has to do, which tells less: where to is unknown.
-void sayByDifference(InkTrend& trend, const std::vector<const Sample*>& samples) {
+void sayByDifference(InkTrend& trend, const std::vector<const Sample*>& samples, const Texts& say) {
     std::vector<double> values;
     std::string unit;
     std::size_t known = 0;
@@ -139,14 +139,14 @@ void sayByDifference(InkTrend& trend, const std::vector<const Sample*>& samples)
     }
     const Drift drift = driftOf(values);
     trend.shift = std::abs(drift.shift);
-    sayMovement(trend, drift.significant, known);
+    sayMovement(trend, drift.significant, known, say);
     if (known == 0) {
         return;
     }
-    trend.averageOff = fixedText(drift.averages.back(), 2) + " " + unit;
-    trend.sentence = "moving average of its difference " + fixedText(std::abs(drift.shift), 2) +
-                     (drift.shift < 0 ? " smaller" : " larger") +
-                     " than the mean of the first jobs";
+    trend.averageOff = say.number(drift.averages.back(), 2) + " " + unit;
+    const std::string shift = say.number(std::abs(drift.shift), 2);
+    trend.sentence = drift.shift < 0 ? say("trend.differenceSmaller", {{"shift", shift}})
+                                     : say("trend.differenceLarger", {{"shift", shift}});
 }
 
 std::optional<colour::Formula> formulaNamed(const std::string& name) {
@@ -160,7 +160,7 @@ std::optional<colour::Formula> formulaNamed(const std::string& name) {
 }
 
 /// What a person would correct by: where the average stands against the aim.
-void addCorrection(InkTrend& trend, const std::vector<const Sample*>& samples) {
+void addCorrection(InkTrend& trend, const std::vector<const Sample*>& samples, const Texts& say) {
     const auto latest = std::find_if(samples.rbegin(), samples.rend(), [&](const Sample* sample) {
         return sample->aims[static_cast<std::size_t>(trend.ink)].has_value();
     });
@@ -172,17 +172,15 @@ void addCorrection(InkTrend& trend, const std::vector<const Sample*>& samples) {
     trend.aimSwatch = swatch(trend.aim);
     Criterion difference;
     difference.unit = "dE";
-    trend.averageOff = fixedText(colour::difference(*formula, trend.aim, trend.now), 2) + " " +
+    trend.averageOff = say.number(colour::difference(*formula, trend.aim, trend.now), 2) + " " +
                        unitOf(difference, samples.back()->formula);
     for (std::size_t i = 0; i < 3; ++i) {
-        const double exact = axisOf(trend.now, i) - axisOf(trend.aim, i);
-        const double off = std::round(exact * 100) / 100 + 0.0; // No "-0.00".
-        trend.correction += std::string(i == 0 ? "" : ", ") + axes[i].symbol +
-                            (std::signbit(off) ? "\u00a0" : "\u00a0+") + fixedText(off, 2);
+        trend.correction += std::string(i == 0 ? "" : say("list.comma")) + axes[i] + "\u00a0" +
+                            signedText(axisOf(trend.now, i) - axisOf(trend.aim, i), say);
     }
 }
 
-InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
+InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples, const Texts& say) {
     InkTrend trend;
     trend.ink = ink;
     trend.aim = {none, none, none};
@@ -195,13 +193,13 @@ InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
             values[i].push_back(lab ? axisOf(*lab, i) : none);
         }
     }
-    addLatest(trend, samples);
+    addLatest(trend, samples, say);
     const Drift drifts[3] = {driftOf(values[0]), driftOf(values[1]), driftOf(values[2])};
     trend.began = {drifts[0].began, drifts[1].began, drifts[2].began};
     trend.now = {trend.began.L + drifts[0].shift, trend.began.a + drifts[1].shift,
                  trend.began.b + drifts[2].shift};
     if (known == 0) {
-        sayByDifference(trend, samples);
+        sayByDifference(trend, samples, say);
         return trend;
     }
     trend.beganSwatch = swatch(trend.began);
@@ -215,19 +213,19 @@ InkTrend inkTrend(Ink ink, const std::vector<const Sample*>& samples) {
     }
     sayMovement(trend,
                 std::any_of(drifts, drifts + 3, [](const Drift& d) { return d.significant; }),
-                known);
-    addCorrection(trend, samples);
+                known, say);
+    addCorrection(trend, samples, say);
+    const std::string shift = say.number(trend.shift, 2);
     trend.sentence =
-        "moving average " + fixedText(trend.shift, 2) + " ΔE*ab from the mean of the first jobs";
-    if (trend.movement == Movement::Drifting) {
-        trend.sentence += ": " + shiftText(drifts);
-    }
+        trend.movement == Movement::Drifting
+            ? say("trend.shiftTo", {{"shift", shift}, {"axes", shiftText(drifts, say)}})
+            : say("trend.shift", {{"shift", shift}});
     return trend;
 }
 
 // ---- Criteria
 
-void add(CriterionTrend& trend, std::size_t job, const Criterion* criterion) {
+void add(CriterionTrend& trend, std::size_t job, const Criterion* criterion, const Texts& say) {
     const double value = criterion != nullptr ? judgedValue(*criterion) : none;
     const double tolerance =
         criterion != nullptr && criterion->tolerance ? *criterion->tolerance : none;
@@ -247,26 +245,27 @@ void add(CriterionTrend& trend, std::size_t job, const Criterion* criterion) {
     trend.failed += criterion->outcome == Outcome::Fail;
     if (std::isfinite(value)) {
         ++trend.answered;
-        trend.latest = fixedText(value, criterion->decimals);
+        trend.latest = say.number(value, criterion->decimals);
     }
-    trend.tolerance = std::isfinite(tolerance) ? fixedText(tolerance, criterion->decimals) : "";
+    trend.tolerance = std::isfinite(tolerance) ? say.number(tolerance, criterion->decimals) : "";
 }
 
-std::vector<CriterionTrend> criterionTrends(const std::vector<const Sample*>& samples) {
+std::vector<CriterionTrend> criterionTrends(const std::vector<const Sample*>& samples,
+                                            const Texts& say) {
     std::vector<std::string> names;
     std::vector<CriterionTrend> trends;
     for (const Sample* sample : samples) {
         for (const Criterion& criterion : sample->criteria) {
             if (std::find(names.begin(), names.end(), criterion.name) == names.end()) {
                 names.push_back(criterion.name);
-                trends.emplace_back().title = criterion.title;
+                trends.emplace_back().title = titleOf(criterion, say);
                 trends.back().unit = unitOf(criterion, sample->formula);
             }
         }
     }
     for (std::size_t job = 0; job < samples.size(); ++job) {
         for (std::size_t i = 0; i < names.size(); ++i) {
-            add(trends[i], job, criterionOf(*samples[job], names[i]));
+            add(trends[i], job, criterionOf(*samples[job], names[i]), say);
         }
     }
     std::erase_if(trends,
@@ -284,20 +283,20 @@ auto keyOf(const Sample& s) {
                     s.targetKey, s.printer, s.folder);
 }
 
-std::string nameOf(const Sample& sample) {
+std::string nameOf(const Sample& sample, const Texts& say) {
     std::string name;
     for (const std::string& part : {sample.folder, sample.printer, sample.paper, sample.target,
                                     sample.preset, sample.instrument, sample.workflow,
-                                    std::string(sample.strip == 2 ? "second strip" : "")}) {
+                                    sample.strip == 2 ? say("trend.secondStrip") : std::string()}) {
         if (!part.empty()) {
             name += (name.empty() ? "" : " · ") + part;
         }
     }
-    return name.empty() ? "Without paper, preset and instrument" : name;
+    return name.empty() ? say("trend.unnamed") : name;
 }
 
 /// Targets of one name are told apart by the beginning of their identity, formulas by theirs.
-void tellApart(std::vector<Series>& all, const std::vector<Sample>& samples) {
+void tellApart(std::vector<Series>& all, const std::vector<Sample>& samples, const Texts& say) {
     std::map<std::string, std::vector<Series*>> byName;
     for (Series& series : all) {
         byName[series.name].push_back(&series);
@@ -317,9 +316,11 @@ void tellApart(std::vector<Series>& all, const std::vector<Sample>& samples) {
                     return samples[other->samples[0]].formula != first.formula;
                 });
             if (targetsDiffer) {
-                series->name += sample.targetKey.size() == identityDigits
-                                    ? " · target " + sample.targetKey.substr(0, enoughDigits)
-                                    : " · target known by its name only";
+                series->name +=
+                    " · " + (sample.targetKey.size() == identityDigits
+                                 ? say("trend.targetDigits",
+                                       {{"digits", sample.targetKey.substr(0, enoughDigits)}})
+                                 : say("trend.targetByName"));
             }
             if (formulasDiffer) {
                 series->name += " · " + sample.formula;
@@ -328,12 +329,12 @@ void tellApart(std::vector<Series>& all, const std::vector<Sample>& samples) {
     }
 }
 
-std::string recentText(const Series& series, const std::vector<const Sample*>& samples) {
+std::string recentText(const Series& series, const std::vector<const Sample*>& samples,
+                       const Texts& say) {
     const std::size_t recent = std::min(recentJobs, samples.size());
     const auto begin = samples.end() - static_cast<std::ptrdiff_t>(recent);
-    const auto failed = std::count_if(begin, samples.end(), [](const Sample* sample) {
-        return sample->verdict == Verdict::Failed;
-    });
+    const auto failed = static_cast<std::size_t>(std::count_if(
+        begin, samples.end(), [](const Sample* s) { return s->verdict == Verdict::Failed; }));
     if (failed == 0) {
         return {};
     }
@@ -348,57 +349,68 @@ std::string recentText(const Series& series, const std::vector<const Sample*>& s
             worst = &criterion;
         }
     }
-    return (recent == 1
-                ? "The one job failed"
-                : std::to_string(failed) + " of the last " + std::to_string(recent) + " failed") +
-           (worst != nullptr ? (recent == 1 ? ", by " : ", most often by ") + worst->title : "");
-}
-
-/// "; to correct: 3.10 ΔE00 from the aim (L* +1.20, a* -0.40, b* +0.00)"
-std::string correctionText(const InkTrend& ink) {
-    if (ink.averageOff.empty()) {
-        return {};
+    const std::string criterion = worst != nullptr ? worst->title : "";
+    if (recent == 1) {
+        return worst != nullptr ? say("trend.oneFailedBy", {{"criterion", criterion}})
+                                : say("trend.oneFailed");
     }
-    return "; it is " + ink.averageOff + " from the aim" +
-           (ink.correction.empty() ? "" : " (" + ink.correction + ")");
+    return worst != nullptr
+               ? say("trend.failedBy",
+                     {{"failed", failed}, {"recent", recent}, {"criterion", criterion}})
+               : say("trend.failed", {{"failed", failed}, {"recent", recent}});
 }
 
-void sayDrifting(Series& series) {
+/// "Cyan: moving average 2.10 ΔE*ab from the mean of the first jobs: lighter (L* +1.20); it is 3.10
+/// ΔE00 from the aim (L* +1.20, a* -0.40, b* +0.00)"
+std::string driftReason(const InkTrend& ink, const Texts& say) {
+    const std::string name = inkName(ink.ink, say);
+    if (ink.averageOff.empty()) {
+        return say("trend.reason", {{"ink", name}, {"movement", ink.sentence}});
+    }
+    return ink.correction.empty()
+               ? say("trend.reasonToAim",
+                     {{"ink", name}, {"movement", ink.sentence}, {"off", ink.averageOff}})
+               : say("trend.reasonToCorrect", {{"ink", name},
+                                               {"movement", ink.sentence},
+                                               {"off", ink.averageOff},
+                                               {"axes", ink.correction}});
+}
+
+void sayDrifting(Series& series, const Texts& say) {
     std::vector<std::string> names;
     for (const InkTrend& ink : series.inks) {
-        if (ink.movement != Movement::Drifting) {
-            continue;
+        if (ink.movement == Movement::Drifting) {
+            names.push_back(inText(ink.ink, say));
+            series.reasons.push_back(driftReason(ink, say));
         }
-        names.push_back(lower(inkName(ink.ink)));
-        series.reasons.push_back(inkName(ink.ink) + std::string(": ") + ink.sentence +
-                                 correctionText(ink));
     }
-    series.word = "Drifting: " + listText(names);
-    series.sentence = "The moving average of the latest jobs has left the mean of the first " +
-                      std::to_string(series.beginning) + " jobs.";
+    series.word = say("trend.drifting", {{"inks", say.list(names)}});
+    series.sentence = say("trend.driftingSentence", {{"beginning", series.beginning}});
 }
 
-void saySteady(Series& series) {
+void saySteady(Series& series, const Texts& say) {
     const InkTrend* nearest = nullptr;
     for (const InkTrend& ink : series.inks) {
         if (!ink.tolerance.empty() && (nearest == nullptr || ink.fill > nearest->fill)) {
             nearest = &ink;
         }
     }
-    series.word = series.failing ? "Steady, but the latest job failed" : "Steady";
-    series.sentence = "The moving averages of paper and solids stay at the means of the first " +
-                      std::to_string(series.beginning) + " jobs.";
+    series.word = series.failing ? say("trend.steadyButFailed") : say("movement.steady");
+    series.sentence = say("trend.steadySentence", {{"beginning", series.beginning}});
     if (nearest != nullptr) {
-        series.sentence +=
-            " Nearest to its limit in the latest job: " + lower(inkName(nearest->ink)) + ", " +
-            nearest->value + " of " + nearest->tolerance +
-            (nearest->averageOff.empty()
-                 ? "."
-                 : "; its moving average is " + nearest->averageOff + " from the aim.");
+        series.sentence += say("sentence.gap") +
+                           (nearest->averageOff.empty()
+                                ? say("trend.nearest", {{"ink", inText(nearest->ink, say)},
+                                                        {"value", nearest->value},
+                                                        {"tolerance", nearest->tolerance}})
+                                : say("trend.nearestToAim", {{"ink", inText(nearest->ink, say)},
+                                                             {"value", nearest->value},
+                                                             {"tolerance", nearest->tolerance},
+                                                             {"off", nearest->averageOff}}));
     }
 }
 
-void sayState(Series& series, const std::vector<const Sample*>& samples) {
+void sayState(Series& series, const std::vector<const Sample*>& samples, const Texts& say) {
     const auto any = [&](Movement movement) {
         return std::any_of(series.inks.begin(), series.inks.end(),
                            [&](const InkTrend& ink) { return ink.movement == movement; });
@@ -410,39 +422,38 @@ void sayState(Series& series, const std::vector<const Sample*>& samples) {
                                               : Movement::Unknown;
     switch (series.movement) {
     case Movement::Drifting:
-        sayDrifting(series);
+        sayDrifting(series, say);
         break;
     case Movement::Steady:
-        saySteady(series);
+        saySteady(series, say);
         break;
     case Movement::TooFew:
-        series.word = "Too few jobs";
+        series.word = say("movement.tooFew");
         series.sentence =
-            "A drift can be told from " + std::to_string(fewestForDrift) + " jobs on; here " +
-            (samples.size() == 1 ? "is 1." : "are " + std::to_string(samples.size()) + ".");
+            say("trend.tooFew", {{"fewest", fewestForDrift}, {"count", samples.size()}});
         break;
     case Movement::Unknown:
-        series.word = "No paper or solids";
-        series.sentence =
-            "These results hold nothing of paper or solids, so a drift can't be told.";
+        series.word = say("trend.noInks");
+        series.sentence = say("trend.noInksSentence");
         break;
     }
-    if (const std::string recent = recentText(series, samples); !recent.empty()) {
+    if (const std::string recent = recentText(series, samples, say); !recent.empty()) {
         series.reasons.push_back(recent);
     }
 }
 
-Series seriesOf(const std::vector<Sample>& all, std::vector<std::size_t> indices) {
+Series seriesOf(const std::vector<Sample>& all, std::vector<std::size_t> indices,
+                const Texts& say) {
     Series series;
     series.samples = std::move(indices);
     std::vector<const Sample*> samples;
     for (const std::size_t index : series.samples) {
         samples.push_back(&all[index]);
     }
-    series.name = nameOf(*samples[0]);
-    series.span = dayText(samples.front()->time);
-    if (const std::string last = dayText(samples.back()->time); last != series.span) {
-        series.span += " to " + last;
+    series.name = nameOf(*samples[0], say);
+    series.span = dayText(samples.front()->time, say);
+    if (const std::string last = dayText(samples.back()->time, say); last != series.span) {
+        series.span = say("trend.span", {{"from", series.span}, {"to", last}});
     }
     for (const Sample* sample : samples) {
         ++(sample->verdict == Verdict::Passed   ? series.passed
@@ -451,36 +462,63 @@ Series seriesOf(const std::vector<Sample>& all, std::vector<std::size_t> indices
     }
     series.beginning = beginningOf(samples.size());
     for (const Ink ink : allInks) {
-        series.inks.push_back(inkTrend(ink, samples));
+        series.inks.push_back(inkTrend(ink, samples, say));
     }
-    series.criteria = criterionTrends(samples);
-    sayState(series, samples);
+    series.criteria = criterionTrends(samples, say);
+    sayState(series, samples, say);
     return series;
 }
 
 } // namespace
 
-std::string timeText(std::int64_t time) {
-    const std::tm parts = partsOf(time);
-    char clock[16];
-    std::snprintf(clock, sizeof clock, ", %02u:%02u", unsigned(parts.tm_hour) % 24,
-                  unsigned(parts.tm_min) % 60);
-    return dayText(time) + clock;
+std::string wordOf(Movement movement, const Texts& say) {
+    switch (movement) {
+    case Movement::Drifting:
+        return say("movement.drifting");
+    case Movement::Steady:
+        return say("movement.steady");
+    case Movement::TooFew:
+        return say("movement.tooFew");
+    case Movement::Unknown:
+        break;
+    }
+    return say("movement.noData");
 }
 
-std::string nearestText(const Sample& sample) {
+std::string inkName(Ink ink, const Texts& say) {
+    return say.find(std::string("ink.") + inkCriterion(ink)).value_or("");
+}
+
+std::string timeText(std::int64_t time, const Texts& say) {
+    const std::tm parts = partsOf(time);
+    char clock[8];
+    std::snprintf(clock, sizeof clock, "%02u:%02u", unsigned(parts.tm_hour) % 24,
+                  unsigned(parts.tm_min) % 60);
+    return say.time(dayText(time, say), clock);
+}
+
+std::string titleOf(const Sample& sample, const Texts& say) {
+    const std::string title = sample.title.empty() && sample.jobId
+                                  ? say("page.job", {{"job", std::to_string(*sample.jobId)}})
+                                  : sample.title;
+    return sample.strip == 2 ? say("trend.secondStripOf", {{"job", title}}) : title;
+}
+
+std::string nearestText(const Sample& sample, const Texts& say) {
     const auto furthest =
         std::max_element(sample.criteria.begin(), sample.criteria.end(),
                          [](const auto& a, const auto& b) { return excessOf(a) < excessOf(b); });
     if (furthest == sample.criteria.end() || excessOf(*furthest) < 0) {
         return {};
     }
-    return furthest->title + " " + fixedText(judgedValue(*furthest), furthest->decimals) + " of " +
-           fixedText(*furthest->tolerance, furthest->decimals);
+    return say("trend.nearestOfJob",
+               {{"criterion", titleOf(*furthest, say)},
+                {"value", say.number(judgedValue(*furthest), furthest->decimals)},
+                {"tolerance", say.number(*furthest->tolerance, furthest->decimals)}});
 }
 
 TrendModel makeTrend(std::vector<Sample> samples, const std::string& source,
-                     std::vector<std::string> notes) {
+                     std::vector<std::string> notes, const Texts& say) {
     TrendModel model;
     model.notes = std::move(notes);
     model.samples = std::move(samples);
@@ -493,17 +531,17 @@ TrendModel makeTrend(std::vector<Sample> samples, const std::string& source,
         groups[keyOf(model.samples[i])].push_back(i);
     }
     for (auto& [key, indices] : groups) {
-        model.series.push_back(seriesOf(model.samples, std::move(indices)));
+        model.series.push_back(seriesOf(model.samples, std::move(indices), say));
     }
-    tellApart(model.series, model.samples);
+    tellApart(model.series, model.samples, say);
     std::stable_sort(model.series.begin(), model.series.end(), [](const auto& a, const auto& b) {
         const bool first = a.movement == Movement::Drifting;
         const bool second = b.movement == Movement::Drifting;
         return first != second ? first : a.samples.size() > b.samples.size();
     });
-    const std::size_t count = model.samples.size();
-    model.subtitle =
-        std::to_string(count) + (count == 1 ? " result" : " results") + " from " + source;
+    model.subtitle = source.empty() ? say("trend.fromFiles", {{"count", model.samples.size()}})
+                                    : say("trend.fromStore",
+                                          {{"count", model.samples.size()}, {"store", source}});
     return model;
 }
 

@@ -12,6 +12,7 @@
 
 #include "report/Sample.h"
 #include "report/Swatch.h"
+#include "report/languages/Texts.h"
 
 namespace report {
 
@@ -92,14 +93,24 @@ struct TrendModel {
     std::vector<Series> series;     ///< Drifting ones first, then those of the most jobs.
 };
 
-/// `source` says in words where the samples come from. REQUIRES: samples.
-TrendModel makeTrend(std::vector<Sample> samples, const std::string& source,
-                     std::vector<std::string> notes);
+/// `store` is the address of the store that the samples come from; empty if they are from files.
+/// REQUIRES: samples.
+TrendModel makeTrend(std::vector<Sample> samples, const std::string& store,
+                     std::vector<std::string> notes, const languages::Texts& say);
+
+/// "Drifting", "Steady", "Too few jobs", "No data".
+std::string wordOf(Movement movement, const languages::Texts& say);
+
+/// "Paper white", "Cyan" and so on.
+std::string inkName(Ink ink, const languages::Texts& say);
+
+/// "Order 1234, second strip"
+std::string titleOf(const Sample& sample, const languages::Texts& say);
 
 /// The furthest of a job's used criteria, as "Solid cyan 4.75 of 3.00"; empty without any.
-std::string nearestText(const Sample& sample);
+std::string nearestText(const Sample& sample, const languages::Texts& say);
 
 /// "24 November 2026, 21:53", of a time as samples have it.
-std::string timeText(std::int64_t time);
+std::string timeText(std::int64_t time, const languages::Texts& say);
 
 } // namespace report

@@ -10,6 +10,8 @@
 namespace report {
 namespace {
 
+using languages::Texts;
+
 constexpr double secondsOfDay = 86400;
 
 const char* keyOf(Movement movement) {
@@ -25,12 +27,12 @@ const char* keyOf(Movement movement) {
     return "unknown";
 }
 
-std::string labText(const colour::Lab& lab) {
+std::string labText(const colour::Lab& lab, const Texts& say) {
     if (!std::isfinite(lab.L)) {
         return {};
     }
-    const auto tenths = [](double value) {
-        return fixedText(std::round(value * 10) / 10 + 0.0, 1); // No "-0.0".
+    const auto tenths = [&](double value) {
+        return say.number(std::round(value * 10) / 10 + 0.0, 1); // No "-0.0".
     };
     return tenths(lab.L) + " " + tenths(lab.a) + " " + tenths(lab.b);
 }
@@ -43,6 +45,9 @@ class Part {
     void numbers(const char* name, const std::vector<double>& values, int decimals) {
         m_text += std::string(",\"") + name + "\":";
         appendRounded(m_text, values, decimals);
+    }
+    void raw(const char* name, const std::string& json) {
+        m_text += std::string(",\"") + name + "\":" + json;
     }
     void list(const char* name, const std::vector<std::string>& parts) {
         m_text += std::string(",\"") + name + "\":[";
@@ -57,14 +62,14 @@ class Part {
     std::string m_text;
 };
 
-std::string inkData(const InkTrend& ink) {
-    Part part({{"name", inkName(ink.ink)},
+std::string inkData(const InkTrend& ink, const Texts& say) {
+    Part part({{"name", inkName(ink.ink, say)},
                {"movement", keyOf(ink.movement)},
                {"word", ink.word},
                {"sentence", ink.sentence},
-               {"began", labText(ink.began)},
-               {"now", labText(ink.now)},
-               {"aim", labText(ink.aim)},
+               {"began", labText(ink.began, say)},
+               {"now", labText(ink.now, say)},
+               {"aim", labText(ink.aim, say)},
                {"beganSwatch", swatchText(ink.beganSwatch)},
                {"nowSwatch", swatchText(ink.nowSwatch)},
                {"aimSwatch", swatchText(ink.aimSwatch)},
@@ -107,13 +112,13 @@ std::string criterionData(const CriterionTrend& criterion) {
 }
 
 /// [time in days, verdict, title, nearest criterion, link]
-std::string jobData(const Sample& sample) {
+std::string jobData(const Sample& sample, const Texts& say) {
     return inScript({static_cast<double>(sample.time) / secondsOfDay, keyOf(sample.verdict),
-                     sample.title + (sample.strip == 2 ? ", second strip" : ""),
-                     nearestText(sample), sample.page.empty() ? "" : linkTo(sample.page)});
+                     titleOf(sample, say), nearestText(sample, say),
+                     sample.page.empty() ? "" : linkTo(sample.page)});
 }
 
-std::string seriesData(const TrendModel& model, const Series& series) {
+std::string seriesData(const TrendModel& model, const Series& series, const Texts& say) {
     Part part({{"name", series.name},
                {"movement", keyOf(series.movement)},
                {"failing", series.failing},
@@ -127,7 +132,7 @@ std::string seriesData(const TrendModel& model, const Series& series) {
                {"beginning", series.beginning}});
     std::vector<std::string> parts;
     for (const InkTrend& ink : series.inks) {
-        parts.push_back(inkData(ink));
+        parts.push_back(inkData(ink, say));
     }
     part.list("inks", parts);
     parts.clear();
@@ -137,7 +142,7 @@ std::string seriesData(const TrendModel& model, const Series& series) {
     part.list("criteria", parts);
     parts.clear();
     for (const std::size_t index : series.samples) {
-        parts.push_back(jobData(model.samples[index]));
+        parts.push_back(jobData(model.samples[index], say));
     }
     part.list("jobs", parts);
     return std::move(part).text();
@@ -145,16 +150,17 @@ std::string seriesData(const TrendModel& model, const Series& series) {
 
 } // namespace
 
-std::string trendPageOf(const TrendModel& model) {
+std::string trendPageOf(const TrendModel& model, const Texts& say) {
     Part data({{"subtitle", model.subtitle}, {"notes", model.notes}});
+    data.raw("texts", scriptTexts(say, "trend"));
     std::vector<std::string> parts;
     for (const Series& series : model.series) {
-        parts.push_back(seriesData(model, series));
+        parts.push_back(seriesData(model, series, say));
     }
     data.list("series", parts);
-    std::string page(trendTemplate[0]);
-    page += std::move(data).text();
-    return page += trendTemplate[1];
+    const std::string text = std::move(data).text();
+    return assembled(trendTemplate, say,
+                     [&](std::string_view, std::string& page) { page += text; });
 }
 
 } // namespace report

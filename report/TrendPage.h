@@ -8,8 +8,8 @@
 
 namespace report {
 
-/// The whole page as UTF-8; the same samples give the same bytes. What is said of pageOf holds here
-/// too: texts are data, and nothing runs but the page's own scripts.
-std::string trendPageOf(const TrendModel& model);
+/// The whole page as UTF-8; the same samples and language give the same bytes. As with pageOf,
+/// texts are data, and nothing runs but the page's own scripts.
+std::string trendPageOf(const TrendModel& model, const languages::Texts& say);
 
 } // namespace report

@@ -3,8 +3,30 @@
 // What the pages share. Texts of tickets and files are set as text, never as markup.
 const common = (() => {
   const byId = (id) => document.getElementById(id);
+  const data = JSON.parse(byId("data").textContent);
   const signs = { passed: "✓", failed: "✕", incomplete: "?", unjudged: "",
     drifting: "↗", steady: "=", unknown: "?" };
+
+  // ---- Texts in the page's language: data.texts has them, from report/languages.
+
+  // A text of digits with a decimal point, as the language writes it.
+  function localised(digits) {
+    const [, sign, whole, fraction] = /^(-?)(\d+)(?:\.(\d+))?$/.exec(digits) || [];
+    if (whole === undefined) return digits; // 1e+21 and the like.
+    const grouped = whole.length < 5 ? whole
+      : whole.replace(/\B(?=(\d{3})+$)/g, data.texts["common.thousands"]);
+    return sign + grouped + (fraction ? data.texts["common.decimal"] + fraction : "");
+  }
+  const fixed = (value, decimals) => (value === null || Number.isNaN(value) ? "–"
+    : localised(value.toFixed(decimals).replace(/^-(0\.?0*)$/, "$1")));
+  const signed = (value) => (value > 0 ? "+" : "") + fixed(value, 2);
+  // Numbers are written as the language writes them. The one named "count" selects the form.
+  function say(key, values = {}) {
+    const text = data.texts[key];
+    const one = values.count === 1 || (values.count === 0 && document.documentElement.lang === "fr");
+    return (Array.isArray(text) ? text[one ? 0 : 1] : text).replace(/\{(\w+)\}/g, (whole, name) =>
+      (typeof values[name] === "number" ? localised(String(values[name])) : values[name] ?? whole));
+  }
 
   function make(tag, className, text) {
     const element = document.createElement(tag);
@@ -23,7 +45,7 @@ const common = (() => {
     for (const [side, swatch] of sides) {
       const half = pair.appendChild(make("span", swatch.endsWith("!") ? "clipped" : ""));
       half.style.backgroundColor = swatch.slice(0, 7);
-      half.title = half.className ? `${side}: beyond what an sRGB screen shows` : side;
+      half.title = half.className ? say("common.clipped", { side }) : side;
     }
     return pair;
   }
@@ -73,5 +95,9 @@ const common = (() => {
     return drawNow;
   }
 
-  return { byId, signs, make, badge, swatchPair, colourOf, hatch, drawAlways };
+  // Ticks of a chart's axis of numbers.
+  const ticks = { callback: (value) => localised(String(+value.toFixed(10))) };
+
+  return { data, byId, signs, say, localised, fixed, signed, make, badge, swatchPair, colourOf, hatch,
+    ticks, drawAlways };
 })();

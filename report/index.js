@@ -2,8 +2,7 @@
 "use strict";
 // Lists the reports whose summaries stand in this page. Texts are set as text, never as markup.
 (() => {
-  const data = JSON.parse(document.getElementById("data").textContent);
-  const { byId, make, badge } = common;
+  const { data, byId, say, make, badge } = common;
 
   function line(report) {
     const row = make("tr", report.verdict);
@@ -12,6 +11,7 @@
     const link = make("a", "", report.title);
     link.href = report.link;
     const text = make("td");
+    text.lang = report.language;
     text.append(link, make("div", "name", report.subtitle), make("div", "", report.sentence));
     row.append(verdict, text);
     return row;
@@ -19,8 +19,8 @@
 
   const count = data.reports.length;
   byId("subtitle").textContent = count === 0
-    ? `No reports were found in ${data.folder}. A report is made for each job that is verified.`
-    : `${count} ${count === 1 ? "report" : "reports"} in ${data.folder}, the latest first`;
+    ? say("index.none", { folder: data.folder })
+    : say("index.found", { count, folder: data.folder });
   byId("reports").tBodies[0].append(...data.reports.map(line));
   document.querySelector("main").hidden = count === 0;
 })();

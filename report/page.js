@@ -1,97 +1,27 @@
 
 "use strict";
-// Shows the data that stands in this page. Texts of tickets and files are set as text, never as
-// markup.
+// Draws what the page can't have without a script: charts, and the table of patches that can be
+// searched and sorted. Texts of tickets and files are set as text, never as markup.
 (() => {
-  const data = JSON.parse(document.getElementById("data").textContent);
-  const { byId, signs, make, badge, swatchPair, colourOf, hatch, drawAlways } = common;
+  const { data, byId, say, localised, fixed, signed, make, swatchPair, colourOf, hatch, ticks,
+    drawAlways } = common;
 
   // Fields of a row.
   const [INDEX, ID, NAME, DEVICE, TARGET, MEASURED, DELTA, DIFFERENCE, TARGET_SWATCH,
     MEASURED_SWATCH, SHEET_ID, SHEET_NAME] = Array(12).keys();
 
-  const fixed = (value, decimals) =>
-    value === null ? "–" : value.toFixed(decimals).replace(/^-(0\.?0*)$/, "$1");
-  const signed = (value) => (value > 0 ? "+" : "") + fixed(value, 2);
-
-  // ---- The top of the page
-
-  function showHead() {
-    document.title = `${data.word} – ${data.title}`;
-    byId("title").textContent = data.title;
-    byId("subtitle").textContent = data.subtitle;
-    byId("verdict").className = data.verdict;
-    document.querySelector("#verdict .sign").textContent = signs[data.verdict];
-    byId("word").textContent = data.word;
-    byId("sentence").textContent = data.sentence;
-    for (const doubt of data.doubts) byId("reasons").append(make("li", "", doubt));
-    const shown = data.reasons.length > 4 ? 3 : data.reasons.length;
-    for (const reason of data.reasons.slice(0, shown)) {
-      byId("reasons").append(make("li", "", reason));
-    }
-    if (data.reasons.length > shown) {
-      byId("reasons").append(make("li", "", `${data.reasons.length - shown} more below`));
-    }
-    if (data.condition) {
-      byId("reasons").after(make("p", "condition", data.condition));
-    }
-    for (const warning of data.warnings) byId("warnings").append(make("p", "", warning));
-    byId("warnings").hidden = data.warnings.length === 0;
-    appendFacts(byId("statistics"), data.statistics, true);
-  }
-
-  function appendFacts(list, facts, grouped) {
-    for (const [label, text] of facts) {
-      const parent = grouped ? list.appendChild(make("div")) : list;
-      parent.append(make("dt", "", label), make("dd", "", text));
-    }
-  }
-
-  function criterionRow(figure) {
-    const row = make("tr", figure.outcome);
-    const outcome = make("td");
-    outcome.append(badge(figure.outcome, figure.word));
-    const value = make("td", "number", `${figure.value} `);
-    value.append(make("span", "unit", figure.unit));
-    const bar = make("td");
-    if (figure.distance) {
-      const track = bar.appendChild(make("div", "bar"));
-      track.appendChild(make("i")).style.width = `${100 * figure.fill}%`;
-      bar.append(make("span", "distance", figure.distance));
-    }
-    row.append(outcome, make("td", "", figure.title), value,
-      make("td", "number", figure.tolerance), bar, make("td", "", figure.worst));
-    return row;
-  }
-
-  function showCriteria() {
-    const [judged, others] = ["criteria", "others"].map((id) => byId(id).tBodies[0]);
-    judged.append(...data.judged.map(criterionRow));
-    others.append(...data.others.map(criterionRow));
-    others.className = "muted";
-    byId("more").hidden = data.others.length === 0;
-    byId("more").firstElementChild.textContent = data.others.length === 1
-      ? "1 more figure, which takes no part in the verdict"
-      : `${data.others.length} more figures, which take no part in the verdict`;
-  }
-
-  function showSections() {
-    for (const [title, facts] of data.sections) {
-      const section = byId("sections").appendChild(make("div"));
-      const list = make("dl");
-      appendFacts(list, facts, false);
-      section.append(make("h3", "", title), list);
-    }
-  }
-
   // ---- Patches
 
   const pageSize = 100;
+  const allRows = data.rows.slice(0, data.shown); // Further ones are for charts alone.
   const patchText = (row) =>
-    row[ID] === "" && row[NAME] === "" ? `row ${row[INDEX] + 1}` : row[ID] || row[NAME];
-  const device = (row) => row[DEVICE].map((value) => (value === null ? "–" : +value.toFixed(2)));
+    row[ID] === "" && row[NAME] === "" ? say("page.row", { row: row[INDEX] + 1 })
+      : row[ID] || row[NAME];
+  const plainDevice = (row) =>
+    row[DEVICE].map((value) => (value === null ? "–" : String(+value.toFixed(2))));
+  const device = (row) => plainDevice(row).map(localised);
   const lab = (values) => values.map((value) => fixed(value, 2)).join(" ");
-  const natural = new Intl.Collator("en", { numeric: true });
+  const natural = new Intl.Collator(document.documentElement.lang, { numeric: true });
   const byNumber = (get) => (a, b) => (get(a) ?? -Infinity) - (get(b) ?? -Infinity);
   const inks = data.channels.map((name) => name.replace(/^[A-Z0-9]+_(?=.)/, ""));
   const channels = inks.join(inks.some((name) => name.includes(" ")) ? ", " : " ");
@@ -99,7 +29,7 @@
   // A row has labels of the sheet only if they differ from those of the target.
   const sheetId = (row) => (row.length > SHEET_ID ? row[SHEET_ID] : row[ID]);
   const sheetName = (row) => (row.length > SHEET_ID ? row[SHEET_NAME] : row[NAME]);
-  const isRelabelled = data.rows.some((row) => row.length > SHEET_ID);
+  const isRelabelled = allRows.some((row) => row.length > SHEET_ID);
   const labelled = (title, id, name, text, hidden) => ({
     title, kind: "patch", hidden,
     order: (a, b) => natural.compare(text(a), text(b)) || a[INDEX] - b[INDEX],
@@ -112,21 +42,21 @@
 
   // Title, class of the cells, order of rows (falling first where `falls`), cell.
   const columns = [
-    labelled("On the sheet", sheetId, sheetName, (row) => sheetId(row) || sheetName(row) || "–",
+    labelled(say("page.onSheet"), sheetId, sheetName, (row) => sheetId(row) || sheetName(row) || "–",
       !isRelabelled),
-    labelled(isRelabelled ? "In the target" : "Patch", (row) => row[ID], (row) => row[NAME],
+    labelled(say(isRelabelled ? "page.inTarget" : "page.patch"), (row) => row[ID], (row) => row[NAME],
       patchText, false),
-    { title: "Target, measured", kind: "swatches", order: byNumber((row) => row[TARGET][0]),
+    { title: say("page.pair"), kind: "swatches", order: byNumber((row) => row[TARGET][0]),
       fill(cell, row) {
-        cell.append(swatchPair([["Target", row[TARGET_SWATCH]],
-          ["Measured", row[MEASURED_SWATCH]]]));
+        cell.append(swatchPair([[say("page.target"), row[TARGET_SWATCH]],
+          [say("page.measured"), row[MEASURED_SWATCH]]]));
       } },
     { title: channels, kind: "device", hidden: data.channels.length === 0,
       order: (a, b) => a[DEVICE].reduce((found, value, i) => found || value - b[DEVICE][i], 0),
       fill(cell, row) { cell.textContent = device(row).join(" "); } },
-    { title: "Target L*a*b*", kind: "lab", order: byNumber((row) => row[TARGET][0]),
+    { title: say("page.targetLab"), kind: "lab", order: byNumber((row) => row[TARGET][0]),
       fill(cell, row) { cell.textContent = lab(row[TARGET]); } },
-    { title: "Measured L*a*b*", kind: "lab", order: byNumber((row) => row[MEASURED][0]),
+    { title: say("page.measuredLab"), kind: "lab", order: byNumber((row) => row[MEASURED][0]),
       fill(cell, row) { cell.textContent = lab(row[MEASURED]); } },
     ...["ΔL*", "Δa*", "Δb*"].map((title, i) => ({
       title, kind: "number delta", falls: true, order: byNumber((row) => row[DELTA][i]),
@@ -138,7 +68,7 @@
 
   let sorted = columns[columns.length - 1]; // As the rows come: the worst first.
   let falling = true;
-  let rows = data.rows;
+  let rows = allRows;
   let start = 0;
 
   function showHeadings() {
@@ -162,10 +92,11 @@
 
   function choose() {
     const wanted = byId("find").value.trim().toLowerCase();
-    rows = data.rows.filter((row) => wanted === "" || row[ID].toLowerCase().includes(wanted) ||
+    rows = allRows.filter((row) => wanted === "" || row[ID].toLowerCase().includes(wanted) ||
       row[NAME].toLowerCase().includes(wanted) ||
       sheetId(row).toLowerCase().includes(wanted) ||
       sheetName(row).toLowerCase().includes(wanted) || device(row).join(" ") === wanted ||
+      plainDevice(row).join(" ") === wanted ||
       patchText(row) === wanted);
     rows.sort((a, b) => (falling ? sorted.order(b, a) : sorted.order(a, b)));
     start = 0;
@@ -182,13 +113,14 @@
       }
       return line;
     }));
-    const range = rows.length === 0 ? "None found" : `${start + 1}–${end} of ${rows.length}`;
+    const range = rows.length === 0 ? say("page.noneFound")
+      : say("page.range", { from: start + 1, to: end, all: rows.length });
     byId("range").textContent = range;
     byId("back").disabled = start === 0;
     byId("next").disabled = end === rows.length;
-    byId("printed").textContent = end - start < data.rows.length
-      ? `Shown: ${range}${rows.length < data.rows.length ? " found" : ""}, ${
-        data.rows.length} in all. "Save all as CSV" gives every patch.` : "";
+    byId("printed").textContent = end - start === data.all ? ""
+      : say(rows.length < allRows.length ? "page.foundPart" : "page.part",
+        { range, all: data.all });
   }
 
   function csvText() {
@@ -201,7 +133,7 @@
     };
     const head = ["id", "name", ...data.channels, "target_L", "target_a", "target_b",
       "measured_L", "measured_a", "measured_b", "difference", "measured_id", "measured_name"];
-    const lines = [...data.rows].sort((a, b) => a[INDEX] - b[INDEX]).map((row) =>
+    const lines = [...allRows].sort((a, b) => a[INDEX] - b[INDEX]).map((row) =>
       [row[ID], row[NAME], ...row[DEVICE], ...row[TARGET], ...row[MEASURED], row[DIFFERENCE],
         sheetId(row), sheetName(row)]);
     return [head, ...lines].map((line) => line.map(cell).join(",")).join("\r\n") + "\r\n";
@@ -219,6 +151,8 @@
     byId("patches").classList.toggle("relabelled", isRelabelled);
     showHeadings();
     showRows();
+    byId("worst").textContent = data.shownText;
+    byId("worst").hidden = data.shownText === "";
     byId("find").addEventListener("input", choose);
     byId("back").addEventListener("click", () => { start -= pageSize; showRows(); });
     byId("next").addEventListener("click", () => { start += pageSize; showRows(); });
@@ -227,7 +161,7 @@
 
   // ---- Charts
 
-  const number = { type: "linear", ticks: { maxTicksLimit: 9 } };
+  const number = { type: "linear", ticks: { ...ticks, maxTicksLimit: 9 } };
   let charts = [];
 
   const markLines = {
@@ -267,7 +201,8 @@
     const over = hatch(colourOf("--failed"));
     const last = data.histogram[data.histogram.length - 1];
     const width = last[1] - last[0];
-    byId("histogram").setAttribute("aria-label", `Patches by difference. ${data.histogramText}`);
+    byId("histogram").setAttribute("aria-label",
+      say("page.histogramText", { bins: data.histogramText }));
     const decimals = Math.max(0, Math.ceil(-Math.log10(width) - 1e-9));
     charts.push(new Chart(byId("histogram"), {
       type: "bar",
@@ -280,14 +215,15 @@
         plugins: { tooltip: { callbacks: {
           title: ([item]) => {
             const [from, to] = data.histogram[item.dataIndex];
-            return `${from.toFixed(decimals)} to ${to.toFixed(decimals)} ${data.unit}`;
+            return say("page.bin", { from: fixed(from, decimals), to: fixed(to, decimals),
+              unit: data.unit });
           },
-          label: (item) => `${item.parsed.y} patches` } } },
+          label: (item) => say("page.patches", { count: item.parsed.y }) } } },
         scales: {
           x: { ...number, offset: false, min: 0, max: last[1], grid: { display: false },
             title: { display: true, text: data.unit } },
-          y: { ...number, beginAtZero: true, ticks: { precision: 0, maxTicksLimit: 6 },
-            title: { display: true, text: "patches" } },
+          y: { ...number, beginAtZero: true, ticks: { ...ticks, precision: 0, maxTicksLimit: 6 },
+            title: { display: true, text: say("page.patchesAxis") } },
         },
       },
       plugins: [markLines],
@@ -301,7 +237,7 @@
     callbacks: { label: ({ dataIndex }) => {
       const row = rows[dataIndex];
       return [`${patchText(row)}${row[ID] && row[NAME] ? ` ${row[NAME]}` : ""}`,
-        `target ${lab(row[TARGET])}`, `measured ${lab(row[MEASURED])}`,
+        `${say("page.target")} ${lab(row[TARGET])}`, `${say("page.measured")} ${lab(row[MEASURED])}`,
         `${data.unit} ${fixed(row[DIFFERENCE], 2)}`];
     } },
   });
@@ -336,17 +272,17 @@
     charts.push(new Chart(byId("plane"), {
       type: "scatter",
       data: { datasets: [
-        { label: "measured (filled)", data: drawnRows.map((row) => point(row[MEASURED])),
+        { label: say("page.measuredMark"), data: drawnRows.map((row) => point(row[MEASURED])),
           pointBackgroundColor: drawnRows.map((row) => row[MEASURED_SWATCH].slice(0, 7)),
           pointBorderColor: colourOf("--soft"), borderWidth: many ? 0.5 : 1,
           pointRadius: many ? 3 : 5 },
-        { label: "target (ring)", data: drawnRows.map((row) => point(row[TARGET])),
+        { label: say("page.targetMark"), data: drawnRows.map((row) => point(row[TARGET])),
           pointBackgroundColor: "transparent", pointBorderColor: colourOf("--ink"),
           borderWidth: 1, pointRadius: many ? 2 : 6 },
       ] },
       options: { aspectRatio: 1,
         plugins: { legend: legend(), tooltip: tooltip(drawnRows) },
-        scales: { x: axis("a*  green – red"), y: axis("b*  blue – yellow") } },
+        scales: { x: axis(say("page.aAxis")), y: axis(say("page.bAxis")) } },
       plugins: [shifts],
     }));
   }
@@ -370,9 +306,9 @@
         plugins: { tooltip: tooltip(drawnRows) },
         scales: {
           x: { ...number, min: 0, suggestedMax: 100,
-            title: { display: true, text: "L* of the target  dark – light" } },
+            title: { display: true, text: say("page.lightnessAxis") } },
           y: { ...number, suggestedMin: -2, suggestedMax: 2,
-            title: { display: true, text: "ΔL*  darker – lighter" },
+            title: { display: true, text: say("page.lightnessDifferenceAxis") },
             grid: { color: ({ tick }) => colourOf(tick && tick.value === 0 ? "--ink" : "--faint") } },
         },
       },
@@ -388,10 +324,9 @@
     byId("drawn").textContent = data.drawnText;
   }
 
-  showHead();
-  showCriteria();
   showPatches();
-  showSections();
-  document.querySelector("main").hidden = false;
+  for (const section of document.querySelectorAll(".drawn")) section.hidden = false;
+  byId("plane").setAttribute("aria-label", say("page.planeText"));
+  byId("lightness").setAttribute("aria-label", say("page.lightnessText"));
   drawAlways(drawCharts);
 })();

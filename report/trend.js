@@ -2,10 +2,11 @@
 "use strict";
 // Shows the trend whose data stand in this page: one series at a time.
 (() => {
-  const data = JSON.parse(document.getElementById("data").textContent);
-  const { byId, signs, make, badge, swatchPair, colourOf, hatch, drawAlways } = common;
+  const { data, byId, signs, say, localised, fixed, signed, make, badge, swatchPair, colourOf, hatch,
+    ticks, drawAlways } = common;
   const [DAY, VERDICT, TITLE, NEAREST, LINK] = Array(5).keys(); // Fields of a job.
-  const words = { passed: "Passed", failed: "Failed", incomplete: "Incomplete" };
+  const words = { passed: say("trend.passed"), failed: say("trend.failed"),
+    incomplete: say("trend.incomplete") };
   const pageSize = 100;
   let series = data.series[0];
   let charts = [];
@@ -13,16 +14,20 @@
 
   // ---- Times: days since 1970 on the room's own clock
 
-  const months = ["Jan", "Feb", "Mar", "Apr", "May", "Jun", "Jul", "Aug", "Sep", "Oct", "Nov", "Dec"];
+  const months = Array.from({ length: 12 }, (_, i) => say(`trend.month.${i + 1}`));
   const two = (number) => String(number).padStart(2, "0");
-  function partsOf(day) {
-    const date = new Date(Math.round(day * 86400) * 1000);
-    return { day: `${date.getUTCDate()} ${months[date.getUTCMonth()]}`, year: date.getUTCFullYear(),
+  function partsOf(time) {
+    const date = new Date(Math.round(time * 86400) * 1000);
+    const month = months[date.getUTCMonth()];
+    const day = String(date.getUTCDate());
+    const year = String(date.getUTCFullYear());
+    return { day: say("trend.dayMonth", { day, month }), month: say("trend.monthYear", { month, year }),
+      date: say("trend.date", { day, month, year }),
       clock: `${two(date.getUTCHours())}:${two(date.getUTCMinutes())}` };
   }
   function timeText(day) {
     const parts = partsOf(day);
-    return `${parts.day} ${parts.year}, ${parts.clock}`;
+    return `${parts.date}, ${parts.clock}`;
   }
   // Ticks where a calendar has them: at hours, days, Mondays or firsts of months, six at the most.
   function ticksOf(from, to) {
@@ -50,7 +55,7 @@
   function tickText(day, span) {
     const parts = partsOf(day);
     if (span < 3) return `${parts.day} ${parts.clock}`;
-    return span > 360 ? `${parts.day.split(" ")[1]} ${parts.year}` : parts.day;
+    return span > 360 ? parts.month : parts.day;
   }
 
   // ---- The top of the page
@@ -58,12 +63,12 @@
   function showHead() {
     const told = series.movement !== "unknown";
     const state = told && series.failing ? "failing" : series.movement;
-    document.title = `${series.word} – colour trend`;
+    document.title = `${series.word} – ${say("trend.documentTitle")}`;
     byId("title").textContent = series.name;
-    byId("subtitle").textContent = `${series.jobs.length} ${
-      series.jobs.length === 1 ? "job" : "jobs"}, ${series.span}: ${series.passed} passed, ${
-      series.failed} failed${series.incomplete ? `, ${series.incomplete} incomplete` : ""} · ${
-      data.subtitle}`;
+    byId("subtitle").textContent = `${say(
+      series.incomplete ? "trend.subtitleIncomplete" : "trend.subtitle",
+      { count: series.jobs.length, span: series.span, passed: series.passed, failed: series.failed,
+        incomplete: series.incomplete })} · ${data.subtitle}`;
     byId("verdict").className = state;
     document.querySelector("#verdict .sign").textContent =
       series.movement === "steady" && series.failing ? signs.failed : signs[series.movement];
@@ -76,25 +81,25 @@
     const card = make("div", `ink ${ink.movement}${ink.above ? " above" : ""}`);
     card.append(make("h3", "", ink.name));
     if (ink.began) {
-      card.append(swatchPair([[`Aim: ${ink.aim}`, ink.aimSwatch],
-        [`Mean of the first ${series.beginning} jobs: ${ink.began}`, ink.beganSwatch],
-        [`Moving average: ${ink.now}`, ink.nowSwatch]].filter(([, swatch]) => swatch)));
+      card.append(swatchPair([[say("trend.aim", { lab: ink.aim }), ink.aimSwatch],
+        [say("trend.firstMean", { count: series.beginning, lab: ink.began }), ink.beganSwatch],
+        [say("trend.average", { lab: ink.now }), ink.nowSwatch]].filter(([, swatch]) => swatch)));
     }
     card.append(badge(ink.movement, ink.word));
     if (ink.value) {
       const value = card.appendChild(make("div", "value"));
-      value.append(make("span", "label", "Latest job"), ink.value);
+      value.append(make("span", "label", say("trend.latest")), ink.value);
       if (ink.tolerance) {
-        value.append(make("span", "unit", ` of ${ink.tolerance}`));
+        value.append(make("span", "unit", say("trend.ofTolerance", { tolerance: ink.tolerance })));
         const bar = card.appendChild(make("div", ink.above ? "failed" : ""))
           .appendChild(make("div", "bar"));
         bar.appendChild(make("i")).style.width = `${100 * ink.fill}%`;
       }
-      if (ink.above) value.append(make("span", "unit", ", above"));
+      if (ink.above) value.append(make("span", "unit", say("trend.aboveTolerance")));
     }
     if (ink.averageOff) {
       const off = card.appendChild(make("div", "off"));
-      off.append(make("span", "label", "Moving average to aim"), make("b", "", ink.averageOff));
+      off.append(make("span", "label", say("trend.averageToAim")), make("b", "", ink.averageOff));
       if (ink.correction) off.append(make("span", "correction", ink.correction));
     }
     const sentence = ink.sentence;
@@ -107,12 +112,15 @@
     if (one === series) row.setAttribute("aria-current", "true");
     const state = make("td");
     state.append(badge(one.movement,
-      { drifting: "Drifting", steady: "Steady" }[one.movement] || one.word));
+      { drifting: say("trend.drifting"), steady: say("trend.steady") }[one.movement] || one.word));
     const name = make("td");
     name.append(make("button", "", one.name));
     name.firstChild.type = "button";
-    row.append(state, name, make("td", "number", one.jobs.length),
-      make("td", "number", one.failed));
+    const jobs = make("td", "number", localised(String(one.jobs.length)));
+    const failed = make("td", "number", localised(String(one.failed)));
+    jobs.dataset.after = say("trend.jobsAfter");
+    failed.dataset.after = say("trend.failedAfter");
+    row.append(state, name, jobs, failed);
     row.addEventListener("click", () => { choose(one); scrollTo(0, 0); });
     return row;
   }
@@ -174,7 +182,7 @@
         if (next) return;
         pen.lineWidth = 4;
         pen.strokeStyle = colourOf("--card");
-        const text = `tolerance ${criterion.tolerance}`;
+        const text = say("trend.toleranceMark", { tolerance: criterion.tolerance });
         pen.strokeText(text, left + 6, at - 5);
         pen.fillText(text, left + 6, at - 5);
       });
@@ -211,11 +219,10 @@
   });
 
   function criterionText(criterion) {
-    if (criterion.answered === 0) return "no data";
-    const limit = criterion.tolerance ? ` of ${criterion.tolerance}` : "";
-    const above = criterion.tolerance
-      ? ` · ${criterion.failed} of ${criterion.answered} above` : "";
-    return `latest job ${criterion.latest}${limit} ${criterion.unit}${above}`;
+    if (criterion.answered === 0) return say("trend.noData");
+    const { latest, unit, tolerance, failed, answered } = criterion;
+    return tolerance ? say("trend.criterionText", { latest, unit, tolerance, failed, answered })
+      : say("trend.criterionWithoutLimit", { latest, unit });
   }
 
   function drawCriterion(parent, criterion) {
@@ -239,10 +246,10 @@
       ] },
       options: {
         parsing: false, normalized: true, spanGaps: true,
-        plugins: { tooltip: tooltip((i) => `${criterion.values[i].toFixed(criterion.decimals)} ${
-          criterion.unit}, ${words[series.jobs[i][VERDICT]].toLowerCase()}`) },
+        plugins: { tooltip: tooltip((i) => `${fixed(criterion.values[i], criterion.decimals)} ${
+          criterion.unit}, ${words[series.jobs[i][VERDICT]]}`) },
         scales: { x: timeScale(), y: { type: "linear", min: 0,
-          suggestedMax: 1.25 * Math.max(...limits, 0.1), ticks: { maxTicksLimit: 6 } } },
+          suggestedMax: 1.25 * Math.max(...limits, 0.1), ticks: { ...ticks, maxTicksLimit: 6 } } },
       },
       plugins: [toleranceLine(criterion), ...(many ? [dots([marks])] : [])],
     }));
@@ -300,9 +307,9 @@
 
   function drawInk(ink, range) {
     const canvas = addFigure(byId("drift"), ink.name,
-      `${ink.word}${ink.now ? ` · L*a*b* first jobs ${ink.began} → moving average ${ink.now}${
-        ink.aim ? `, aim ${ink.aim}` : ""}` : ""}`);
-    const signed = (value) => (value > 0 ? "+" : "") + (value ?? NaN).toFixed(2);
+      !ink.now ? ink.word
+        : say(ink.aim ? "trend.inkTextWithAim" : "trend.inkText",
+          { word: ink.word, began: ink.began, now: ink.now, aim: ink.aim }));
     const many = ink.changeL.length > crowd;
     const measured = axes.map((axis, i) => ({
       data: points(ink[axis.change]), showLine: false, pointRadius: 1.8, pointBorderWidth: 0,
@@ -321,7 +328,7 @@
         plugins: { tooltip: tooltip((i) => axes.map((axis) =>
           `${axis.name} ${signed(ink[axis.change][i])}`).join("  ")) },
         scales: { x: timeScale(), y: { type: "linear", min: -range, max: range,
-          ticks: { maxTicksLimit: 7 },
+          ticks: { ...ticks, maxTicksLimit: 7 },
           grid: { color: ({ tick }) => colourOf(tick && tick.value === 0 ? "--ink" : "--faint") } } },
       },
       plugins: [beginAndNames, ...(many ? [dots(marks)] : [])],
@@ -336,19 +343,14 @@
     const others = series.criteria.filter((criterion) => !criterion.used);
     for (const criterion of used) drawCriterion(byId("criteria"), criterion);
     byId("more").hidden = others.length === 0;
-    byId("more").firstElementChild.textContent =
-      `${others.length} more, which take no part in verdicts`;
+    byId("more").firstElementChild.textContent = say("trend.more", { count: others.length });
     // Those that nobody has unfolded cost nothing.
     if (byId("more").open) for (const criterion of others) drawCriterion(byId("others"), criterion);
     const range = driftRange();
     const known = series.inks.filter((ink) => ink.began);
     for (const ink of known) drawInk(ink, range);
-    byId("driftNote").textContent = known.length === 0
-      ? "These results hold no colours of paper or solids, so that a drift is told by their differences "
-        + "from the targets."
-      : `Dots: each job's colour less the mean of the first ${series.beginning} (shaded). Lines: their `
-        + "moving average (EWMA, weight 0.2). Drifting: the average has moved by more than three "
-        + "standard errors, and by more than 0.5 in L*a*b*.";
+    byId("driftNote").textContent = known.length === 0 ? say("trend.noColours")
+      : say("trend.driftNote", { count: series.beginning });
   }
 
   // ---- Jobs
@@ -375,14 +377,15 @@
     const end = Math.min(start + pageSize, jobs.length);
     byId("jobs").tBodies[0].replaceChildren(...jobs.slice(start, end).map(jobRow));
     byId("range").textContent =
-      jobs.length === 0 ? "None found" : `${start + 1}–${end} of ${jobs.length}`;
+      jobs.length === 0 ? say("trend.noneFound")
+        : say("trend.range", { from: start + 1, to: end, all: jobs.length });
     byId("back").disabled = start === 0;
     byId("next").disabled = end === jobs.length;
   }
 
   function find() {
     const wanted = byId("find").value.trim().toLowerCase();
-    jobs = series.jobs.filter((job) => wanted === "" || job[VERDICT].includes(wanted)
+    jobs = series.jobs.filter((job) => wanted === "" || words[job[VERDICT]].toLowerCase().includes(wanted)
       || job[TITLE].toLowerCase().includes(wanted) || job[NEAREST].toLowerCase().includes(wanted))
       .reverse(); // The latest first.
     start = 0;

@@ -254,7 +254,9 @@ class Verifier {
                 throw std::runtime_error(problem);
             }
             const std::string page =
-                m_outputs.wantsPage() ? report::pageOf(*result, nullptr, factsOf(m_aim)) : "";
+                m_outputs.wantsPage()
+                    ? report::pageOf(*result, nullptr, languages::english(), factsOf(m_aim))
+                    : "";
             if (m_wanted.result) {
                 m_outcome.result = std::make_shared<report::Result>(std::move(*result));
             }

@@ -14,7 +14,8 @@ namespace {
 namespace fs = std::filesystem;
 
 /// The path of the job's page from the trend's page.
-std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {
+std::string pageFor(const LoadedResult& loaded, const PagePlace& place,
+                    std::optional<languages::Language> language) {
     if (place.folder.empty()) {
         return {};
     }
@@ -35,9 +36,7 @@ std::string pageFor(const LoadedResult& loaded, const PagePlace& place) {
         loaded.meta ? "job-" + std::to_string(loaded.meta->jobId) + "-" + stem.substr(7) : stem;
     std::string problem = failure.message();
     const std::string page =
-        failure ? ""
-                : report::keepPage(folder, name, report::pageOf(loaded.result, loaded.metaOrNull()),
-                                   problem);
+        failure ? "" : report::keepPage(folder, name, pageOf(loaded, language), problem);
     if (page.empty()) {
         throw Failure(Status::NotWritten, "can't write a page in " + folder + ": " + problem);
     }
@@ -58,15 +57,12 @@ std::string printersFolder(const LoadedResult& loaded) {
     return fs::proximate(folder).string();
 }
 
-std::string counted(std::size_t count, const std::string& one, const std::string& many) {
-    return std::to_string(count) + (count == 1 ? one : many);
-}
-
 } // namespace
 
 Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& filter,
                      SeriesBy seriesBy, const PagePlace& place,
-                     const std::function<void(const std::string&)>& say) {
+                     std::optional<languages::Language> language, const languages::Texts& say,
+                     const std::function<void(const std::string&)>& complain) {
     Gathered gathered;
     std::size_t byFile = 0;
     for (const std::string& path : filesOf(arguments)) {
@@ -74,7 +70,7 @@ Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& fi
             std::string note;
             const LoadedResult loaded = loadResult(path, "", note);
             if (!note.empty()) {
-                say(note);
+                complain(note);
             }
             report::Sample sample = report::sampleOf(loaded.result, loaded.metaOrNull());
             if (seriesBy == SeriesBy::Folders) {
@@ -86,25 +82,21 @@ Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& fi
                 continue;
             }
             byFile += guessed;
-            sample.page = pageFor(loaded, place);
+            sample.page = pageFor(loaded, place, language);
             gathered.samples.push_back(std::move(sample));
         } catch (const Failure& failure) {
             if (failure.status == Status::NotWritten) {
                 throw;
             }
-            say(failure.what());
+            complain(failure.what());
             ++gathered.leftOut;
         }
     }
     if (byFile != 0) {
-        gathered.notes.push_back(
-            counted(byFile, " result does not tell its time; it stands at that of its file.",
-                    " results do not tell their time; they stand at those of their files."));
+        gathered.notes.push_back(say("trendNote.byFile", {{"count", byFile}}));
     }
     if (gathered.leftOut != 0) {
-        gathered.notes.push_back(counted(gathered.leftOut,
-                                         " file could not be read and is left out.",
-                                         " files could not be read and are left out."));
+        gathered.notes.push_back(say("trendNote.leftOut", {{"count", gathered.leftOut}}));
     }
     return gathered;
 }

@@ -14,6 +14,7 @@
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Filter.h"
 #include "report/OwnFile.h"
+#include "report/Page.h"
 #include "report/PageFile.h"
 #include "report/label/CodeText.h"
 
@@ -113,7 +114,7 @@ std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile) {
         }
     }
     for (const auto& [label, text] : loaded.result.measurement.statements) {
-        if (label == "Created") {
+        if (label == "created") {
             if (const auto time = timeOf(text)) {
                 return *time;
             }
@@ -127,6 +128,11 @@ std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile) {
 
 std::string standardInput(std::size_t mostBytes) {
     return bytesOf("-", mostBytes);
+}
+
+std::string pageOf(const LoadedResult& loaded, std::optional<languages::Language> language) {
+    const Meta* const meta = loaded.metaOrNull();
+    return pageOf(loaded.result, meta, languages::Texts(language ? *language : languageOf(meta)));
 }
 
 std::vector<std::string> filesOf(const std::vector<std::string>& arguments) {

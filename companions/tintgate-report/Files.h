@@ -10,6 +10,7 @@
 
 #include "report/Meta.h"
 #include "report/Result.h"
+#include "report/languages/Language.h"
 
 namespace report {
 
@@ -38,6 +39,9 @@ std::int64_t timeOfResult(const LoadedResult& loaded, bool& byFile);
 
 /// Throws Failure (Unreadable).
 std::string standardInput(std::size_t mostBytes);
+
+/// The page in the given language; without one, in that of the job or of the user.
+std::string pageOf(const LoadedResult& loaded, std::optional<languages::Language> language);
 
 /// The files that the arguments mean, in their order: of a folder all results (named "*.json", with
 /// the format's name in their beginning) in it and in the folders below, by name. Links to folders

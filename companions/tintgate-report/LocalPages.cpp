@@ -24,7 +24,8 @@ std::string LocalPages::of(const report::Sample& sample) const {
     std::string earliest;
     for (const report::Listed& page : found->second) { // The latest first.
         const auto made = timeOf(page.summary.created);
-        if (page.path.starts_with(start) && page.summary.title == sample.title && made &&
+        if (page.path.starts_with(start) &&
+            (sample.title.empty() || page.summary.title == sample.title) && made &&
             *made >= sample.time) {
             earliest = m_folder + "/" + page.path;
         }

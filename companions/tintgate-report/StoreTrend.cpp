@@ -250,9 +250,6 @@ report::Sample sampleOf(const store::TicketContent& job, const Verified& verifie
     sample.jobId = verified.job;
     sample.strip = numberOf(verified.strip);
     sample.title = textOf(job.find("Input/Title"));
-    if (sample.title.empty()) {
-        sample.title = "Job " + std::to_string(verified.job);
-    }
     sample.paper = textOf(job.find("CMM/PaperName"));
     sample.workflow = textOf(job.find("Workflow/Name"));
     sample.instrument = server.instrument(job, verified.strip);
@@ -303,16 +300,13 @@ class Gatherer {
         m_gathered.samples.push_back(std::move(sample));
     }
 
-    Gathered gathered() && {
+    Gathered gathered(const languages::Texts& say) && {
         for (const int id : m_server.presetsWithoutFile()) {
-            m_gathered.notes.push_back("The file of preset " + std::to_string(id) +
-                                       " can't be read, so its tolerances are not known.");
+            m_gathered.notes.push_back(
+                say("trendNote.presetUnreadable", {{"preset", std::to_string(id)}}));
         }
         if (m_changes != 0) {
-            m_gathered.notes.push_back(
-                std::to_string(m_changes) + (m_changes == 1 ? " job was" : " jobs were") +
-                " judged by other tolerances than the preset has today. Passed and failed are as "
-                "they were judged; the lines show the tolerances of today.");
+            m_gathered.notes.push_back(say("trendNote.otherTolerances", {{"count", m_changes}}));
         }
         return std::move(m_gathered);
     }
@@ -351,14 +345,15 @@ class Gatherer {
 
 } // namespace
 
-Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place) {
+Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place,
+                     const languages::Texts& say) {
     try {
         const auto store = store::openStore(address, store::Access::Read);
         Gatherer gatherer(*store, filter, place);
         for (const Verified& verified : verifiedStrips(*store, filter)) {
             gatherer.add(verified);
         }
-        return std::move(gatherer).gathered();
+        return std::move(gatherer).gathered(say);
     } catch (const store::StoreFailure& failure) {
         throw Failure(Status::Store, failure.what());
     }

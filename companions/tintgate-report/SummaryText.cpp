@@ -8,7 +8,7 @@
 namespace report {
 namespace {
 
-using report::fixedText;
+using languages::Texts;
 
 constexpr std::size_t mostPatches = 5;
 
@@ -29,14 +29,14 @@ Badge badgeOf(report::Outcome outcome) {
                                               : Badge{"? ", Tone::Open};
 }
 
-std::string criteriaText(const report::Model& model, const Painter& paint) {
+std::string criteriaText(const report::Model& model, const Painter& paint, const Texts& say) {
     std::vector<std::vector<Cell>> lines;
     for (const report::Figure& figure : model.judged) {
         const Badge badge = badgeOf(figure.outcome);
         lines.push_back({{badge.sign + figure.word, badge.tone},
                          {figure.title},
                          {figure.value, Tone::Bold, true},
-                         {"of " + figure.tolerance, Tone::Plain, true},
+                         {say("text.of", {{"tolerance", figure.tolerance}}), Tone::Plain, true},
                          {figure.unit, Tone::Soft},
                          {figure.distance},
                          {figure.worstLabel + figure.missing, Tone::Soft}});
@@ -44,23 +44,24 @@ std::string criteriaText(const report::Model& model, const Painter& paint) {
     return lines.empty() ? "" : '\n' + tableText(lines, paint);
 }
 
-std::string signedText(double value) {
-    return (value > 0 ? "+" : "") + fixedText(value, 2);
+std::string signedText(double value, const Texts& say) {
+    return (value > 0 ? "+" : "") + say.number(value, 2);
 }
 
 std::string patchesText(const report::Model& model, const report::Result& result,
-                        const Painter& paint) {
+                        const Painter& paint, const Texts& say) {
     std::vector<std::vector<Cell>> lines;
     for (std::size_t i = 0; i < std::min(mostPatches, model.rows.size()); ++i) {
         const std::size_t index = model.rows[i].patch;
         const report::Patch& patch = result.patches[index];
-        lines.push_back({{fixedText(patch.difference, 2), Tone::Bold, true},
-                         {report::labelOf(result, index)},
-                         {"ΔL* " + signedText(patch.measured.L - patch.target.L), Tone::Soft},
-                         {"Δa* " + signedText(patch.measured.a - patch.target.a), Tone::Soft},
-                         {"Δb* " + signedText(patch.measured.b - patch.target.b), Tone::Soft}});
+        lines.push_back(
+            {{say.number(patch.difference, 2), Tone::Bold, true},
+             {report::labelOf(result, index, say)},
+             {"ΔL* " + signedText(patch.measured.L - patch.target.L, say), Tone::Soft},
+             {"Δa* " + signedText(patch.measured.a - patch.target.a, say), Tone::Soft},
+             {"Δb* " + signedText(patch.measured.b - patch.target.b, say), Tone::Soft}});
     }
-    return '\n' + paint(Tone::Bold, "Largest differences, " + model.unit) + '\n' +
+    return '\n' + paint(Tone::Bold, say("text.largest", {{"unit", model.unit}})) + '\n' +
            tableText(lines, paint);
 }
 
@@ -74,63 +75,66 @@ Badge badgeOf(report::Movement movement) {
                                                   : Badge{"? ", Tone::Open};
 }
 
-std::string inksText(const report::Series& series, const Painter& paint) {
+std::string inksText(const report::Series& series, const Painter& paint, const Texts& say) {
     std::vector<std::vector<Cell>> lines;
     for (const report::InkTrend& ink : series.inks) {
         const Badge badge = badgeOf(ink.movement);
-        lines.push_back({{badge.sign + ink.word, badge.tone},
-                         {report::inkName(ink.ink)},
-                         {ink.value, Tone::Bold, true},
-                         {ink.tolerance.empty() ? "" : "of " + ink.tolerance, Tone::Plain, true},
-                         {ink.above ? "above" : "", Tone::Failed},
-                         {ink.averageOff, Tone::Bold, true},
-                         {ink.correction},
-                         {ink.sentence, Tone::Soft}});
+        lines.push_back(
+            {{badge.sign + ink.word, badge.tone},
+             {report::inkName(ink.ink, say)},
+             {ink.value, Tone::Bold, true},
+             {ink.tolerance.empty() ? "" : say("text.of", {{"tolerance", ink.tolerance}}),
+              Tone::Plain, true},
+             {ink.above ? say("text.above") : "", Tone::Failed},
+             {ink.averageOff, Tone::Bold, true},
+             {ink.correction},
+             {ink.sentence, Tone::Soft}});
     }
     lines.insert(lines.begin(), {{""},
                                  {""},
-                                 {"latest job", Tone::Soft, true},
+                                 {say("text.latest"), Tone::Soft, true},
                                  {""},
                                  {""},
-                                 {"average to aim", Tone::Soft, true},
+                                 {say("text.averageToAim"), Tone::Soft, true},
                                  {""},
                                  {""}});
     return tableText(lines, paint);
 }
 
-std::string criteriaText(const report::Series& series, const Painter& paint) {
+std::string criteriaText(const report::Series& series, const Painter& paint, const Texts& say) {
     std::vector<std::vector<Cell>> lines;
     for (const report::CriterionTrend& criterion : series.criteria) {
         if (criterion.used) {
-            lines.push_back({{criterion.title},
-                             {criterion.latest, Tone::Bold, true},
-                             {"of " + criterion.tolerance, Tone::Plain, true},
-                             {criterion.unit, Tone::Soft},
-                             {std::to_string(criterion.failed) + " of " +
-                                  std::to_string(criterion.answered) + " above",
-                              criterion.failed != 0 ? Tone::Failed : Tone::Soft}});
+            lines.push_back(
+                {{criterion.title},
+                 {criterion.latest, Tone::Bold, true},
+                 {say("text.of", {{"tolerance", criterion.tolerance}}), Tone::Plain, true},
+                 {criterion.unit, Tone::Soft},
+                 {say("text.failures",
+                      {{"failed", criterion.failed}, {"answered", criterion.answered}}),
+                  criterion.failed != 0 ? Tone::Failed : Tone::Soft}});
         }
     }
     return lines.empty() ? "" : '\n' + tableText(lines, paint);
 }
 
 std::string jobsText(const report::TrendModel& trend, const report::Series& series,
-                     const Painter& paint) {
+                     const Painter& paint, const Texts& say) {
     std::vector<std::vector<Cell>> lines;
     for (std::size_t i = 0; i < std::min(mostJobs, series.samples.size()); ++i) {
         const auto& sample = trend.samples[series.samples[series.samples.size() - 1 - i]];
         const Badge badge = badgeOf(sample.verdict);
-        lines.push_back({{badge.sign + report::wordOf(sample.verdict), badge.tone},
-                         {report::timeText(sample.time), Tone::Soft},
-                         {sample.title},
-                         {report::nearestText(sample), Tone::Soft}});
+        lines.push_back({{badge.sign + report::wordOf(sample.verdict, say), badge.tone},
+                         {report::timeText(sample.time, say), Tone::Soft},
+                         {report::titleOf(sample, say)},
+                         {report::nearestText(sample, say), Tone::Soft}});
     }
-    return "\n" + paint(Tone::Bold, "Latest jobs") + "\n" + tableText(lines, paint);
+    return "\n" + paint(Tone::Bold, say("text.latestJobs")) + "\n" + tableText(lines, paint);
 }
 
 } // namespace
 
-std::string trendText(const report::TrendModel& trend, const Painter& paint) {
+std::string trendText(const report::TrendModel& trend, const Painter& paint, const Texts& say) {
     std::string text;
     for (const std::string& note : trend.notes) {
         text += paint(Tone::Open, "! ") + paint(Tone::Plain, note) + '\n';
@@ -140,24 +144,24 @@ std::string trendText(const report::TrendModel& trend, const Painter& paint) {
         const Badge badge = bad ? badgeOf(report::Verdict::Failed) : badgeOf(series.movement);
         text += (text.empty() ? "" : "\n") + paint(badge.tone, badge.sign + series.word) + "  " +
                 paint(Tone::Bold, series.name) + '\n' +
-                paint(Tone::Soft, std::to_string(series.samples.size()) +
-                                      (series.samples.size() == 1 ? " result, " : " results, ") +
-                                      series.span + ": " + std::to_string(series.passed) +
-                                      " passed, " + std::to_string(series.failed) + " failed, " +
-                                      std::to_string(series.incomplete) + " incomplete") +
+                paint(Tone::Soft, say("text.series", {{"count", series.samples.size()},
+                                                      {"span", series.span},
+                                                      {"passed", series.passed},
+                                                      {"failed", series.failed},
+                                                      {"incomplete", series.incomplete}})) +
                 '\n' + paint(Tone::Plain, series.sentence) + '\n';
         for (const std::string& reason : series.reasons) {
             text += "  " + paint(Tone::Plain, reason) + '\n';
         }
-        text += '\n' + inksText(series, paint) + criteriaText(series, paint) +
-                jobsText(trend, series, paint);
+        text += '\n' + inksText(series, paint, say) + criteriaText(series, paint, say) +
+                jobsText(trend, series, paint, say);
     }
     return text;
 }
 
 std::string summaryText(const report::Result& result, const report::Meta* meta,
-                        const Painter& paint) {
-    const report::Model model = report::makeModel(result, meta);
+                        const Painter& paint, const Texts& say) {
+    const report::Model model = report::makeModel(result, meta, say);
     const Badge badge = badgeOf(model.verdict);
     std::string text = paint(badge.tone, badge.sign + model.word) + "  " +
                        paint(Tone::Bold, model.title) + '\n' + paint(Tone::Soft, model.subtitle) +
@@ -166,16 +170,16 @@ std::string summaryText(const report::Result& result, const report::Meta* meta,
         text += "  " + paint(Tone::Open, "? ") + paint(Tone::Plain, doubt) + '\n';
     }
     if (!model.condition.empty()) {
-        text += paint(Tone::Soft, model.condition) + '\n';
+        text += paint(Tone::Soft, say("text.condition", {{"condition", model.condition}})) + '\n';
     }
-    text += criteriaText(model, paint) + '\n';
+    text += criteriaText(model, paint, say) + '\n';
     std::string statistics;
     for (const auto& [label, value] : model.statistics) {
         statistics += (statistics.empty() ? "" : ", ") + label + ' ' + value;
     }
-    text += statistics + '\n' + patchesText(model, result, paint);
+    text += statistics + '\n' + patchesText(model, result, paint, say);
     if (!model.warnings.empty()) {
-        text += '\n' + paint(Tone::Bold, "Warnings") + '\n';
+        text += '\n' + paint(Tone::Bold, say("html.page.warnings")) + '\n';
     }
     for (const std::string& warning : model.warnings) {
         text += "  " + paint(Tone::Open, "! ") + paint(Tone::Plain, warning) + '\n';

@@ -13,10 +13,11 @@ namespace report {
 
 /// The verdict with its reasons, the criteria that it rests on, the statistics, the patches that
 /// differ most, and the warnings: the page's own words and numbers. `meta` may be null.
-std::string summaryText(const Result& result, const Meta* meta, const Painter& paint);
+std::string summaryText(const Result& result, const Meta* meta, const Painter& paint,
+                        const languages::Texts& say);
 
 /// Of each series: whether it drifts and which ink, where the inks stand, the criteria, and the
 /// latest jobs.
-std::string trendText(const TrendModel& trend, const Painter& paint);
+std::string trendText(const TrendModel& trend, const Painter& paint, const languages::Texts& say);
 
 } // namespace report

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <functional>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -29,14 +30,16 @@ struct PagePlace {
 enum class SeriesBy { Statements, Folders };
 
 /// Reads result files, or all below folders, and makes the page of each job where the viewer has
-/// not made it already. What can't be read is told through `say` and left out. Throws Failure
-/// (Unreadable for a folder, NotWritten).
+/// not made it already, in `language` or, without one, in that of the job. What can't be read is
+/// told through `complain` and left out. Throws Failure (Unreadable for a folder, NotWritten).
 Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& filter,
                      SeriesBy seriesBy, const PagePlace& place,
-                     const std::function<void(const std::string&)>& say);
+                     std::optional<languages::Language> language, const languages::Texts& say,
+                     const std::function<void(const std::string&)>& complain);
 
 /// Reads the results that the jobs of a store hold. Links lead to the pages that lie in the tool's
 /// folder on this machine. Throws Failure (Store).
-Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place);
+Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place,
+                     const languages::Texts& say);
 
 } // namespace report

@@ -74,6 +74,8 @@ struct Options {
     std::string since;
     std::string until;
     std::string series;
+    std::string languageName;
+    std::optional<languages::Language> language; ///< As asked for.
     report::Filter filter;
     std::optional<int> code;
     std::optional<int> tidyDays;
@@ -82,14 +84,18 @@ struct Options {
     bool dryRun = false;
 
     bool fromStore() const { return !store.empty(); }
+    /// For all that is not about one job alone.
+    languages::Texts texts() const {
+        return languages::Texts(language ? *language : languages::languageOfUser());
+    }
 };
 
-void say(const std::string& words) {
+void complain(const std::string& words) {
     std::fprintf(stderr, "tintgate-report: %s\n", admin::printable(words).c_str());
 }
 
 int fail(Status status, const std::string& words) {
-    say(words);
+    complain(words);
     return static_cast<int>(status);
 }
 
@@ -127,7 +133,7 @@ void reportOne(const Options& options) {
     std::string note;
     const auto loaded = report::loadResult(options.results[0], options.meta, note);
     if (!note.empty()) {
-        say(note);
+        complain(note);
     }
     const std::string output = options.output.empty() ? "-" : options.output;
     if (options.csv) {
@@ -135,10 +141,10 @@ void reportOne(const Options& options) {
     }
     if (options.text) {
         const report::Painter paint(output == "-" && report::terminalTakesColours());
-        return report::writeOutput(output,
-                                   report::summaryText(loaded.result, loaded.metaOrNull(), paint));
+        return report::writeOutput(output, report::summaryText(loaded.result, loaded.metaOrNull(),
+                                                               paint, options.texts()));
     }
-    const std::string page = report::pageOf(loaded.result, loaded.metaOrNull());
+    const std::string page = report::pageOf(loaded, options.language);
     if (options.output.empty()) {
         return keepPage(loaded, page);
     }
@@ -163,9 +169,9 @@ void writeTrend(const Options& options, const report::TrendModel& trend) {
     const std::string output = options.output.empty() ? "-" : options.output;
     if (options.text) {
         const report::Painter paint(output == "-" && report::terminalTakesColours());
-        return report::writeOutput(output, report::trendText(trend, paint));
+        return report::writeOutput(output, report::trendText(trend, paint, options.texts()));
     }
-    const std::string page = report::trendPageOf(trend);
+    const std::string page = report::trendPageOf(trend, options.texts());
     if (!options.output.empty()) {
         return report::writeOutput(output, page);
     }
@@ -179,20 +185,20 @@ void writeTrend(const Options& options, const report::TrendModel& trend) {
 
 Status reportTrend(const Options& options) {
     const report::PagePlace place = placeOf(options);
+    const languages::Texts say = options.texts();
     report::Gathered gathered =
         options.fromStore()
-            ? report::gatherStore(options.store, options.filter, place)
+            ? report::gatherStore(options.store, options.filter, place, say)
             : report::gatherFiles(options.results, options.filter,
                                   options.series == "folder" ? report::SeriesBy::Folders
                                                              : report::SeriesBy::Statements,
-                                  place, say);
+                                  place, options.language, say, complain);
     if (gathered.samples.empty()) {
         throw Failure(gathered.leftOut != 0 ? Status::Unreadable : Status::NothingFound,
                       "there is no result that fits what was asked for");
     }
-    const std::string source = options.fromStore() ? "the store " + options.store : "files";
-    writeTrend(options,
-               report::makeTrend(std::move(gathered.samples), source, std::move(gathered.notes)));
+    writeTrend(options, report::makeTrend(std::move(gathered.samples), options.store,
+                                          std::move(gathered.notes), say));
     return gathered.leftOut != 0 ? Status::SomeLeftOut : Status::Done;
 }
 
@@ -273,6 +279,13 @@ void addOptions(CLI::App& program, Options& options) {
                     "beside an \"output.json\" is found without this")
         ->type_name("FILE");
 
+    program
+        .add_option("--language", options.languageName,
+                    "Of pages and summaries: en, de, fr, es, it, ja or\n"
+                    "zh. Without it, a job's page is in the job's\n"
+                    "language, all else in that of your locale")
+        ->type_name("LANGUAGE");
+
     const char* const trend = "Trend of several results, of folders or of a store";
     program.add_flag("--trend", options.trend, "A trend also of one result")->group(trend);
     program
@@ -350,6 +363,13 @@ void settle(Options& options) {
     }
     if (!options.until.empty()) {
         options.filter.until = day(options.until, "--until") + secondsOfDay;
+    }
+    if (!options.languageName.empty()) {
+        options.language = languages::languageNamed(options.languageName);
+        if (!options.language) {
+            throw CLI::ValidationError("--language", "\"" + options.languageName +
+                                                         "\" is not en, de, fr, es, it, ja or zh");
+        }
     }
     const char* const store = std::getenv("TINTGATE_STORE");
     if (!options.code && !options.tidyDays && options.preset.empty() && options.results.empty() &&

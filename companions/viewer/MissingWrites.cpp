@@ -28,7 +28,8 @@ std::int64_t secondsOf(const std::string& stamp) {
 } // namespace
 
 std::string missingWrites(const std::vector<store::WriteFailure>& failures,
-                          const std::string& folder, const report::Meta& meta) {
+                          const std::string& folder, const report::Meta& meta,
+                          const languages::Texts& say) {
     struct stat sample;
     if (stat((folder + "/Measured sample.txt").c_str(), &sample) != 0) {
         return {};
@@ -43,14 +44,11 @@ std::string missingWrites(const std::vector<store::WriteFailure>& failures,
         return {};
     }
     const auto count = std::count_if(first, failures.end(), isOfRun);
-    const std::string job = std::to_string(meta.jobId);
-    return "The server " + first->server +
-           " does not have all of this result: " + std::to_string(count) +
-           (count == 1 ? " write" : " writes") + " failed, first " + first->target + " " +
-           first->key + " (" + first->reason +
-           "). \"tintgate-store jobs\" shows how "
-           "far it got; after \"tintgate-store reset " +
-           job + "\" the job can be measured again.";
+    return say("viewer.missingWrites", {{"server", first->server},
+                                        {"count", static_cast<std::size_t>(count)},
+                                        {"what", first->target + " " + first->key},
+                                        {"reason", first->reason},
+                                        {"job", std::to_string(meta.jobId)}});
 }
 
 } // namespace viewer

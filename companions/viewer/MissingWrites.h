@@ -6,6 +6,7 @@
 #include <vector>
 
 #include "report/Meta.h"
+#include "report/languages/Texts.h"
 #include "store/WriteFailures.h"
 
 namespace viewer {
@@ -13,6 +14,7 @@ namespace viewer {
 /// Returns a paragraph for the job's page. Empty if the server accepted all writes of the run.
 /// These are newer than its sample file, in the job's folder, and older than its meta file.
 std::string missingWrites(const std::vector<store::WriteFailure>& failures,
-                          const std::string& folder, const report::Meta& meta);
+                          const std::string& folder, const report::Meta& meta,
+                          const languages::Texts& say);
 
 } // namespace viewer

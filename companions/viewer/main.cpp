@@ -106,12 +106,13 @@ int showReport(const std::string& metaPath) {
         return fail(Status::ResultBroken, resultPath + " is broken: " + problem);
     }
     const store::WriteFailures failures(platform::temporaryFolder());
-    const std::string missing = viewer::missingWrites(failures.all(), folder, *meta);
+    const languages::Texts say(report::languageOf(&*meta));
+    const std::string missing = viewer::missingWrites(failures.all(), folder, *meta, say);
     if (!missing.empty()) {
         result->warnings.insert(result->warnings.begin(), report::Warning{.text = missing});
     }
-    const std::string page =
-        report::keepPage(folder, report::pageStem(*meta), report::pageOf(*result, &*meta), problem);
+    const std::string page = report::keepPage(folder, report::pageStem(*meta),
+                                              report::pageOf(*result, &*meta, say), problem);
     if (page.empty()) {
         return fail(Status::PageNotWritten, "can't write a page in " + folder + ": " + problem);
     }
@@ -130,7 +131,8 @@ int showIndex() {
     const std::string folder = access(working.c_str(), W_OK | X_OK) == 0 ? working : temporary;
     const std::string path = folder + "/reports.html";
     std::string problem;
-    if (!report::replacePage(path, report::indexOf(report::reportsBelow(folder), folder),
+    const languages::Texts say(languages::languageOfUser());
+    if (!report::replacePage(path, report::indexOf(report::reportsBelow(folder), folder, say),
                              problem)) {
         return fail(Status::PageNotWritten, "can't write " + path + ": " + problem);
     }

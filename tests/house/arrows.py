@@ -27,8 +27,8 @@ def read_table(source_dir):
             {name: passes.split() for name, _, passes in rows})
 
 
-# Generated for every target that returns or explains an exit code or a status.
-FOR_ALL = {"ExitCodes.h", "CompanionStatuses.h"}
+# Generated for every target that returns or explains an exit code or a status, or shows a text.
+FOR_ALL = {"ExitCodes.h", "CompanionStatuses.h", "TextKeys.h"}
 
 
 def seen_by(target, arrows, exposes):
