@@ -70,7 +70,7 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
     }
     Comparison comparison;
     ComparisonWants wants = wantsOf(preset, options);
-    wants.spectra = job != nullptr;
+    wants.spectra = wants.spectra || job != nullptr;
     if (const int status = compare(paths, wants, comparison)) {
         return status;
     }

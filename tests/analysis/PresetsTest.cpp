@@ -158,6 +158,12 @@ TEST(Presets, OneCodeForOneCause) {
         {"<psd>", "<inks>" + std::string(101, 'a') + "</inks><psd>", exitPresetOutOfRange},
         {"<psd>", "<inks>Gr\xFCn</inks><psd>", exitPresetNotXml},
         {"<psd>", "<inks><ink>Orange</ink></inks><psd>", exitPresetUnknownEntry},
+        {"<psd>", "<paper>white</paper><psd>", exitPresetOutOfRange},
+        {"<psd>", "<toneAims>D</toneAims><psd>", exitPresetOutOfRange},
+        {"<psd>", "<toneAimsBlack/><psd>", exitPresetValueMissing},
+        {"<psd>", "<greyWeights>equal</greyWeights><greyWeights>equal</greyWeights><psd>",
+         exitPresetValueRepeated},
+        {"<psd>", "<spotToneAims>A</spotToneAims><psd>", exitPresetOutOfRange},
         {"<psd>", "<psd required=\"yes\">", exitPresetUnknownEntry},
         {"Condition>-1", "Condition required=\"1\">-1", exitPresetOutOfRange},
         {"Condition>-1", "Condition required=\"yes\">4", exitPresetOutOfRange},
@@ -217,7 +223,9 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
     };
     change("Condition>-1", "Condition required=\"yes\">3");
     change("<psd>", "<minimumGreys> 3 </minimumGreys><repeats>mean</repeats>"
-                    "<inks>\n Deep Sea,485,k\t, Grün\n</inks><psd>");
+                    "<inks>\n Deep Sea,485,k\t, Grün\n</inks><paper>relative</paper>"
+                    "<toneAims>A</toneAims><toneAimsBlack> target </toneAimsBlack>"
+                    "<spotToneAims>target</spotToneAims><greyWeights>falling</greyWeights><psd>");
     change("<average", "<repeatSpread tolerance=\"1.5\" used=\"yes\" decimals=\"1\" "
                        "psdTolerance=\"2.5\" psdUsed=\"no\"/><average");
     const auto spread = [](const Record& record, const PresetOptions& options) {
@@ -234,6 +242,11 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
         EXPECT_EQ(options.repeats, RepeatMode::Mean);
         EXPECT_EQ(options.minimumGreys, 3);
         EXPECT_THAT(options.inks, testing::ElementsAre("Deep Sea", "485", "k", "Grün"));
+        EXPECT_EQ(options.paperAims, PaperAims::Relative);
+        EXPECT_EQ(options.toneAims, ToneAims::CurveA);
+        EXPECT_EQ(options.toneAimsBlack, ToneAims::Target);
+        EXPECT_TRUE(options.spotToneFromTarget);
+        EXPECT_EQ(options.greyWeights, GreyWeights::Falling);
         EXPECT_EQ(spread(record, options).tolerance, 1.5);
         EXPECT_TRUE(spread(record, options).used);
         EXPECT_EQ(spread(record, options).decimals, 1);
