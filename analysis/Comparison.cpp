@@ -290,11 +290,13 @@ const char* repeatModeName(RepeatMode mode) {
 }
 
 colour::CgatsWants targetWants(const ComparisonWants& wants, const std::string& condition) {
-    return {.spectra = wants.targetSpectra, .condition = condition};
+    return {.spectra = wants.targetSpectra,
+            .singleInks = wants.singleInks,
+            .condition = condition};
 }
 
 colour::CgatsWants measurementWants(const ComparisonWants& wants, const std::string& condition) {
-    return {.spectra = wants.spectra, .condition = condition};
+    return {.spectra = wants.spectra, .singleInks = wants.singleInks, .condition = condition};
 }
 
 int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparison& c) {

@@ -161,6 +161,7 @@ struct ComparisonWants {
     RepeatMode repeats = RepeatMode::Each;
     bool spectra = false;       ///< Keep the measurement's spectra.
     bool targetSpectra = false; ///< Keep the target's.
+    bool singleInks = false;    ///< Spectra of overprints may be 0.
     bool readings = false;      ///< Fill Comparison::readings and papers.
     PaperAims paperAims = PaperAims::Absolute;
 };

@@ -21,6 +21,7 @@ using colour::Xyz;
 
 using Indices = std::vector<std::uint32_t>; ///< Into Readings.
 
+constexpr std::ptrdiff_t processInks = 4;
 constexpr double perPercent = 100; ///< Tints are told apart at 0.01 percent, as pairing does.
 
 // ---- Which readings are which tint
@@ -86,9 +87,23 @@ struct Side {
     const std::vector<Lab>& lab;
     const Indices& rows; ///< Empty for a profile.
 
-    bool hasSpectra() const {
-        return input.file.set && colour::spectraUsable(input.file.set->axis) &&
-               !input.file.set->spectra.empty();
+    /// True if every reading of paper and of the process inks alone has a usable spectrum.
+    bool hasSpectra(const Ramps& ramps) const {
+        if (!input.file.set || !colour::spectraUsable(input.file.set->axis)) {
+            return false;
+        }
+        const auto have = [&](const Indices& readings) {
+            return std::all_of(readings.begin(), readings.end(), [&](std::uint32_t reading) {
+                return input.file.set->spectrumOf(rows[reading]) != nullptr;
+            });
+        };
+        return have(ramps.papers) &&
+               std::all_of(ramps.inks.begin(), ramps.inks.begin() + processInks,
+                           [&](const Ramp& ramp) {
+                               return have(ramp.solids) &&
+                                      std::all_of(ramp.tints.begin(), ramp.tints.end(),
+                                                  [&](const Tint& t) { return have(t.readings); });
+                           });
     }
 
     /// The readings that are of different rows. A profile gives equal values, so one is enough.
@@ -137,9 +152,7 @@ Reflectance reflectanceOf(const Side& side, ProcessInk ink, bool byDensity) {
         double sum = 0;
         const Indices some = side.different(readings);
         for (const std::uint32_t reading : some) {
-            const std::size_t row = side.rows[reading];
-            sum +=
-                weights.reflectance(&set.spectra[row * static_cast<std::size_t>(set.axis.length)]);
+            sum += weights.reflectance(set.spectrumOf(side.rows[reading]));
         }
         return sum / static_cast<double>(some.size());
     };
@@ -234,7 +247,7 @@ void addTones(const Comparison& c, const Ramps& ramps, const PresetOptions& opti
               const Side& target, const Side& measurement, Measures& measures) {
     const ToneAims ofBlack = options.toneAimsBlack.value_or(options.toneAims);
     const bool targetCounts = options.toneAims == ToneAims::Target || ofBlack == ToneAims::Target;
-    measures.byDensity = measurement.hasSpectra() && (!targetCounts || target.hasSpectra());
+    measures.byDensity = measurement.hasSpectra(ramps) && (!targetCounts || target.hasSpectra(ramps));
     for (const ProcessInk ink :
          {ProcessInk::Cyan, ProcessInk::Magenta, ProcessInk::Yellow, ProcessInk::Black}) {
         measures.tones.push_back(processTones(c, ramps, ink,

@@ -739,6 +739,7 @@ ComparisonWants wantsOf(const tolerancePresetParameterRecord& preset,
             .repeats = options.repeats,
             .spectra = options.asks(Quantity::Tone),
             .targetSpectra = options.asksTargetSpectra(),
+            .singleInks = true,
             .readings = options.asksMeasures(),
             .paperAims = options.paperAims};
 }
