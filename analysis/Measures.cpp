@@ -247,7 +247,8 @@ void addTones(const Comparison& c, const Ramps& ramps, const PresetOptions& opti
               const Side& target, const Side& measurement, Measures& measures) {
     const ToneAims ofBlack = options.toneAimsBlack.value_or(options.toneAims);
     const bool targetCounts = options.toneAims == ToneAims::Target || ofBlack == ToneAims::Target;
-    measures.byDensity = measurement.hasSpectra(ramps) && (!targetCounts || target.hasSpectra(ramps));
+    measures.byDensity =
+        measurement.hasSpectra(ramps) && (!targetCounts || target.hasSpectra(ramps));
     for (const ProcessInk ink :
          {ProcessInk::Cyan, ProcessInk::Magenta, ProcessInk::Yellow, ProcessInk::Black}) {
         measures.tones.push_back(processTones(c, ramps, ink,

@@ -63,8 +63,7 @@ std::vector<std::string_view> rowsOf(std::string_view bytes, std::size_t begin) 
     std::vector<std::string_view> rows;
     for (std::size_t at = begin; at < bytes.size();) {
         if (bytes[at] == 'E' && takeLine(bytes, "END_DATA", at)) {
-            return rowsBehind(bytes, at - 1) == bytes.npos ? rows
-                                                           : std::vector<std::string_view>();
+            return rowsBehind(bytes, at - 1) == bytes.npos ? rows : std::vector<std::string_view>();
         }
         const std::size_t to = std::min(bytes.find('\n', at), bytes.size());
         const std::string_view line = bytes.substr(at, to - at);
