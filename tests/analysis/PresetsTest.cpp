@@ -204,13 +204,21 @@ TEST(Presets, Files) {
         ASSERT_EQ(readPreset(folder.write(name, goodText), false, record), exitDone);
         EXPECT_EQ(narrowed(record.filePath.ToStdWstring()), folder.path("p\xFF.xml"));
     }
-    // What is shipped; the last one is a PSD preset.
-    for (int id = 1; id <= 7; ++id) {
-        const std::string file = "/presets/CVP_000" + std::to_string(id) + ".xml";
+    // What is shipped: 7 is a PSD preset, and each uses some criterion.
+    for (int id = 1; id <= 11; ++id) {
+        const std::string number = std::to_string(id);
+        const std::string file =
+            "/presets/CVP_" + std::string(4 - number.size(), '0') + number + ".xml";
+        record.filePath.clear();
         ASSERT_EQ(readPreset(TINTGATE_SOURCE_DIR + file, false, record), exitDone) << file;
         EXPECT_EQ(record.presetID, id);
-        EXPECT_EQ(record.usedForResult[0], 1);
         EXPECT_EQ(record.fograPSDPreset, id == 7 ? 1 : 0);
+        PresetOptions options;
+        ASSERT_EQ(readPresetOptions(record, options), exitDone);
+        EXPECT_TRUE(std::any_of(std::begin(criteria), std::end(criteria), [&](const Criterion& c) {
+            return settingOf(c, record, options).used;
+        })) << file;
+        EXPECT_EQ(options.asksMeasures(), id > 7 || id == 4 || id == 5) << file;
     }
 }
 
