@@ -290,9 +290,7 @@ const char* repeatModeName(RepeatMode mode) {
 }
 
 colour::CgatsWants targetWants(const ComparisonWants& wants, const std::string& condition) {
-    return {.spectra = wants.targetSpectra,
-            .singleInks = wants.singleInks,
-            .condition = condition};
+    return {.spectra = wants.targetSpectra, .singleInks = wants.singleInks, .condition = condition};
 }
 
 colour::CgatsWants measurementWants(const ComparisonWants& wants, const std::string& condition) {

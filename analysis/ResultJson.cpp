@@ -321,16 +321,11 @@ void writeFindings(JsonWriter& json, const Comparison& c, const Judgement& judge
     json.endObject();
     writePairing(json, c);
     writeStatistics(json, judgement.statistics);
-<<<<<<< HEAD
-    writeRepeats(json, c.spread);
-    writeCriteria(json, judgement.findings);
-=======
     writeRepeats(json, c.spread, options.asks(Quantity::Spread));
     if (options.asksMeasures()) {
         writeMeasures(json, c, judgement.measures, options);
     }
-    writeFindings(json, judgement.findings);
->>>>>>> 5400ea5 (analysis: judge tone values, greys, ramps, repeatability, and aims for the paper)
+    writeCriteria(json, judgement.findings);
     writeWarnings(json, c.warnings, judgement.warnings);
 }
 
