@@ -3,10 +3,12 @@
 
 #include <algorithm>
 #include <map>
+#include <numeric>
 #include <utility>
 
 #include "ExitCodes.h"
 #include "analysis/BoundaryText.h"
+#include "analysis/PaperAims.h"
 #include "analysis/PatchKinds.h"
 #include "analysis/Repeats.h"
 #include "analysis/Status.h"
@@ -209,6 +211,21 @@ int labOf(const Comparison& c, const Input& side, std::vector<Lab>& lab) {
     return statusOf(side.file.profile->evaluate(cmyk.data(), count, 4, lab.data()));
 }
 
+/// REQUIRES: groupOf is filled, and nothing is averaged yet.
+Readings readingsOf(const Comparison& c, RepeatMode mode) {
+    Readings readings;
+    readings.targetRow = c.target.rows;
+    readings.measuredRow = c.measurement.rows;
+    readings.deviceRow = c.devices ? c.devices->rows : std::vector<std::uint32_t>();
+    readings.target = c.targetLab;
+    readings.measured = c.measuredLab;
+    readings.patch = c.groupOf; // what averaging numbers its patches by
+    if (mode == RepeatMode::Each) {
+        std::iota(readings.patch.begin(), readings.patch.end(), 0U);
+    }
+    return readings;
+}
+
 std::string patches(std::size_t count) {
     return std::to_string(count) + (count == 1 ? " patch" : " patches");
 }
@@ -272,16 +289,24 @@ const char* repeatModeName(RepeatMode mode) {
     return mode == RepeatMode::Mean ? "mean" : "each";
 }
 
+colour::CgatsWants targetWants(const ComparisonWants& wants, const std::string& condition) {
+    return {.spectra = wants.targetSpectra, .singleInks = wants.singleInks, .condition = condition};
+}
+
+colour::CgatsWants measurementWants(const ComparisonWants& wants, const std::string& condition) {
+    return {.spectra = wants.spectra, .singleInks = wants.singleInks, .condition = condition};
+}
+
 int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparison& c) {
     // A fault of the measurement precedes one of the patch set.
     References references;
-    if (const int status = loadReferences(paths.target, {}, paths.condition, references)) {
+    if (const int status =
+            loadReferences(paths.target, {}, targetWants(wants, paths.condition), references)) {
         return status;
     }
     SharedFile measurement;
     if (const int status =
-            loadSide(paths.measurement, {.spectra = wants.spectra, .condition = paths.condition},
-                     measurement)) {
+            loadSide(paths.measurement, measurementWants(wants, paths.condition), measurement)) {
         return status;
     }
     references.patchSetPath = paths.patchSet;
@@ -314,8 +339,16 @@ int compare(const References& references, const std::wstring& path, SharedFile m
         return status;
     }
     findRepeats(c);
+    if (wants.readings) {
+        c.readings = readingsOf(c, wants.repeats);
+    }
     if (wants.repeats == RepeatMode::Mean) {
         averageRepeats(c);
+    }
+    if (wants.readings || wants.paperAims != PaperAims::Absolute) {
+        if (const int status = adjustAims(wants.paperAims, c)) {
+            return status;
+        }
     }
 
     c.difference.resize(c.selectedRow.size());

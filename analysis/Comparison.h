@@ -2,8 +2,11 @@
 // Target against measurement: which files, which patches, which differences.
 #pragma once
 
+#include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
+#include <utility>
 #include <vector>
 
 #include "analysis/Inputs.h"
@@ -43,6 +46,14 @@ enum class RepeatMode {
 /// "each", "mean".
 const char* repeatModeName(RepeatMode mode);
 
+/// One patch that was measured more than once.
+struct RepeatedPatch {
+    std::size_t patch = 0; ///< The first of its patches.
+    std::size_t readings = 0;
+    double mean = 0; ///< Of the distances of its readings.
+    double largest = 0;
+};
+
 /// How far the readings of patches that were measured more than once lie apart. Distances are
 /// colour differences of a reading from the mean of its patch's readings.
 struct RepeatSpread {
@@ -51,6 +62,41 @@ struct RepeatSpread {
     double mean = 0;          ///< Of all distances.
     double largest = 0;
     std::size_t worst = 0; ///< The patch with the largest distance. Only if there are patches.
+    std::vector<RepeatedPatch> each; ///< In the order of their first patches.
+};
+
+/// What the measured colours are held against.
+enum class PaperAims {
+    Absolute,  ///< The target as it is.
+    Corrected, ///< The target corrected for the measured paper (SCCA).
+    Relative,  ///< Both sides relative to their own paper.
+};
+
+/// "absolute", "corrected", "relative".
+const char* paperAimsName(PaperAims aims);
+
+/// The papers of both sides, and what was made of the aims because of them (analysis/PaperAims.h).
+struct Papers {
+    PaperAims aims = PaperAims::Absolute; ///< As asked for.
+    bool adjusted = false;                ///< False also if the papers are not known.
+    std::optional<colour::Lab> target;    ///< Means of the paper patches as they are.
+    std::optional<colour::Lab> measured;
+    std::optional<colour::Lab> darkest; ///< What a correction leaves in place.
+
+    /// Measured colours of all patches before they were made relative; empty otherwise.
+    std::vector<colour::Lab> measuredBefore;
+    /// Differences of the paper patches before the aims were adjusted, with their patches.
+    std::vector<std::pair<std::size_t, double>> differences;
+};
+
+/// All that was paired, before means were taken and aims adjusted. One entry a pair of rows.
+struct Readings {
+    std::vector<std::uint32_t> targetRow; ///< Empty for a profile, as is measuredRow.
+    std::vector<std::uint32_t> measuredRow;
+    std::vector<std::uint32_t> deviceRow; ///< Row of the set that the device values are from.
+    std::vector<colour::Lab> target;
+    std::vector<colour::Lab> measured;
+    std::vector<std::uint32_t> patch; ///< The patch of the comparison that it is part of.
 };
 
 /// Immovable, since it points into itself.
@@ -88,6 +134,13 @@ struct Comparison {
     RepeatMode repeatMode = RepeatMode::Each;
     RepeatSpread spread;
     std::vector<FurtherReading> furtherReadings; ///< Empty unless means are compared.
+    Papers papers;     ///< Filled if readings are, or if aims are to be adjusted.
+    Readings readings; ///< Empty unless wanted.
+
+    /// The measured colour of a patch as it is, whatever it was made relative to.
+    const colour::Lab& measuredAsIs(std::size_t patch) const {
+        return papers.measuredBefore.empty() ? measuredLab[patch] : papers.measuredBefore[patch];
+    }
 
     /// Device values of a patch. REQUIRES: devices is not null.
     const double* deviceOf(std::size_t patch) const {
@@ -106,8 +159,16 @@ struct ComparisonPaths {
 struct ComparisonWants {
     colour::Formula formula = colour::Formula::Cie76;
     RepeatMode repeats = RepeatMode::Each;
-    bool spectra = false; ///< Keep the measurement's spectra.
+    bool spectra = false;       ///< Keep the measurement's spectra.
+    bool targetSpectra = false; ///< Keep the target's.
+    bool singleInks = false;    ///< Spectra of overprints may be 0.
+    bool readings = false;      ///< Fill Comparison::readings and papers.
+    PaperAims paperAims = PaperAims::Absolute;
 };
+
+/// What a comparison needs of its files. `condition` as in colour::CgatsWants.
+colour::CgatsWants targetWants(const ComparisonWants& wants, const std::string& condition);
+colour::CgatsWants measurementWants(const ComparisonWants& wants, const std::string& condition);
 
 /// Loads, pairs and compares.
 ///

@@ -29,14 +29,45 @@ enum class Patches {
     SurfaceGamut, ///< No black, at most two of cyan, magenta and yellow, and not paper.
     Spots,        ///< One spot colour at 100, the rest 0.
     Repeated,     ///< Measured more than once.
+    // Those of here on are gathered by analysis/Measures.h, and only if a preset asks for them.
+    Tints,         ///< One ink of more than 0 and less than 100, the rest 0; Criterion::tints.
+    BalancedGreys, ///< The triplets of greyTriplets that follow the near-neutral formula.
+};
+
+/// Which tints, by their nominal percentage.
+enum class Tones {
+    All,
+    MidTones,      ///< 40 and 50.
+    ThreeQuarters, ///< 70 to 80.
+    Ramp,          ///< 30 to 70.
+};
+
+/// Of which inks.
+enum class Inks {
+    Cyan,
+    Magenta,
+    Yellow,
+    Black,
+    Chromatic, ///< Cyan, magenta and yellow together.
+    Spots,
+    All,
+};
+
+struct Tints {
+    Inks inks = Inks::All;
+    Tones tones = Tones::All;
 };
 
 /// What is taken of each patch.
 enum class Quantity {
-    DeltaE,  ///< By the formula of the preset.
-    DeltaH,  ///< CIELAB hue difference, whatever the formula.
-    DeltaCh, ///< CIELAB chromaticness difference, whatever the formula.
-    Spread,  ///< Of a reading from the mean of its patch's readings, by the formula of the preset.
+    DeltaE,   ///< By the formula of the preset.
+    DeltaH,   ///< CIELAB hue difference, whatever the formula.
+    DeltaCh,  ///< CIELAB chromaticness difference, whatever the formula.
+    Spread,   ///< Of a reading from the mean of its patch's readings, by the formula of the preset.
+    DeltaL,   ///< CIELAB lightness difference as a magnitude.
+    GreyCh,   ///< Chromaticness difference from the grey that the measured paper asks for.
+    Tone,     ///< Tone value less its aim, as a magnitude; of several inks their spread.
+    SpotTone, ///< Spot colour tone value (ISO 20654) less its aim, as a magnitude.
 };
 
 /// How the patches of a criterion become one figure.
@@ -59,6 +90,9 @@ struct Criterion {
     Patches patches;
     Quantity quantity;
     Statistic statistic;
+    /// Answered only if the preset's file names it: it takes work that other presets need not pay.
+    bool onRequest = false;
+    Tints tints = {};
 };
 
 /// All criteria, by rising index. After them come those without an entry; PresetOptions::named has
@@ -114,6 +148,216 @@ inline constexpr Criterion criteria[] = {
      Patches::SurfaceGamut, Quantity::DeltaE, Statistic::Mean},
     {noEntry, "repeatSpread", "Repeated readings, largest distance from their mean", noEntry,
      noEntry, Patches::Repeated, Quantity::Spread, Statistic::Maximum},
+    {noEntry, "repeatAverage", "Repeated readings, average distance from their mean", noEntry,
+     noEntry, Patches::Repeated, Quantity::Spread, Statistic::Mean, true},
+    {noEntry,
+     "toneCyan",
+     "Tone values of cyan, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Cyan, Tones::All}},
+    {noEntry,
+     "toneCyanMiddle",
+     "Tone value of cyan at 40 and 50 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Cyan, Tones::MidTones}},
+    {noEntry,
+     "toneCyanThreeQuarters",
+     "Tone value of cyan at 70 to 80 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Cyan, Tones::ThreeQuarters}},
+    {noEntry,
+     "toneMagenta",
+     "Tone values of magenta, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Magenta, Tones::All}},
+    {noEntry,
+     "toneMagentaMiddle",
+     "Tone value of magenta at 40 and 50 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Magenta, Tones::MidTones}},
+    {noEntry,
+     "toneMagentaThreeQuarters",
+     "Tone value of magenta at 70 to 80 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Magenta, Tones::ThreeQuarters}},
+    {noEntry,
+     "toneYellow",
+     "Tone values of yellow, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Yellow, Tones::All}},
+    {noEntry,
+     "toneYellowMiddle",
+     "Tone value of yellow at 40 and 50 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Yellow, Tones::MidTones}},
+    {noEntry,
+     "toneYellowThreeQuarters",
+     "Tone value of yellow at 70 to 80 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Yellow, Tones::ThreeQuarters}},
+    {noEntry,
+     "toneBlack",
+     "Tone values of black, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Black, Tones::All}},
+    {noEntry,
+     "toneBlackMiddle",
+     "Tone value of black at 40 and 50 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Black, Tones::MidTones}},
+    {noEntry,
+     "toneBlackThreeQuarters",
+     "Tone value of black at 70 to 80 %, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Black, Tones::ThreeQuarters}},
+    {noEntry,
+     "midToneSpread",
+     "Mid-tone spread of C, M, Y",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::Tone,
+     Statistic::Maximum,
+     true,
+     {Inks::Chromatic, Tones::MidTones}},
+    {noEntry,
+     "sctvSpotAverage",
+     "Spot colour tone values of spot inks, average deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::SpotTone,
+     Statistic::Mean,
+     true,
+     {Inks::Spots, Tones::All}},
+    {noEntry,
+     "sctvSpotMaximum",
+     "Spot colour tone values of spot inks, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::SpotTone,
+     Statistic::Maximum,
+     true,
+     {Inks::Spots, Tones::All}},
+    {noEntry,
+     "sctvAverage",
+     "Spot colour tone values of all inks, average deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::SpotTone,
+     Statistic::Mean,
+     true,
+     {Inks::All, Tones::All}},
+    {noEntry,
+     "sctvMaximum",
+     "Spot colour tone values of all inks, largest deviation",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::SpotTone,
+     Statistic::Maximum,
+     true,
+     {Inks::All, Tones::All}},
+    {noEntry,
+     "rampLightness",
+     "Single inks, 30 to 70 %, largest lightness difference",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::DeltaL,
+     Statistic::Maximum,
+     true,
+     {Inks::All, Tones::Ramp}},
+    {noEntry, "greyBalanceAverage", "Balanced greys, average distance from the grey of the paper",
+     noEntry, noEntry, Patches::BalancedGreys, Quantity::GreyCh, Statistic::Mean, true},
+    {noEntry, "greyBalanceMaximum", "Balanced greys, largest distance from the grey of the paper",
+     noEntry, noEntry, Patches::BalancedGreys, Quantity::GreyCh, Statistic::Maximum, true},
+    {noEntry, "greyLightnessAverage", "Balanced greys, average lightness difference", noEntry,
+     noEntry, Patches::BalancedGreys, Quantity::DeltaL, Statistic::Mean, true},
+    {noEntry, "greyLightnessMaximum", "Balanced greys, largest lightness difference", noEntry,
+     noEntry, Patches::BalancedGreys, Quantity::DeltaL, Statistic::Maximum, true},
+    {noEntry,
+     "blackLightnessAverage",
+     "Tints of black, average lightness difference",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::DeltaL,
+     Statistic::Mean,
+     true,
+     {Inks::Black, Tones::All}},
+    {noEntry,
+     "blackLightnessMaximum",
+     "Tints of black, largest lightness difference",
+     noEntry,
+     noEntry,
+     Patches::Tints,
+     Quantity::DeltaL,
+     Statistic::Maximum,
+     true,
+     {Inks::Black, Tones::All}},
 };
 
 inline constexpr std::size_t criterionCount = std::size(criteria);
@@ -123,13 +367,19 @@ inline std::size_t placeOf(const Criterion& criterion) {
     return static_cast<std::size_t>(&criterion - criteria);
 }
 
-/// "dE", "dH" or "dCh".
+/// "dE", "dH", "dCh", "dL" or "dTV".
 constexpr const char* unit(Quantity quantity) {
     switch (quantity) {
     case Quantity::DeltaH:
         return "dH";
     case Quantity::DeltaCh:
+    case Quantity::GreyCh:
         return "dCh";
+    case Quantity::DeltaL:
+        return "dL";
+    case Quantity::Tone:
+    case Quantity::SpotTone:
+        return "dTV";
     case Quantity::DeltaE:
     case Quantity::Spread:
         break;

@@ -64,10 +64,9 @@ int loadPatchSet(const std::wstring& path, SharedFile& file) {
 }
 
 int loadReferences(const std::wstring& targetPath, const std::wstring& patchSetPath,
-                   const std::string& condition, References& references) {
+                   const colour::CgatsWants& wants, References& references) {
     References loaded{targetPath, patchSetPath, {}, {}};
-    if (const int status =
-            loadSide(targetPath, {.spectra = false, .condition = condition}, loaded.target)) {
+    if (const int status = loadSide(targetPath, wants, loaded.target)) {
         return status;
     }
     if (!patchSetPath.empty()) {

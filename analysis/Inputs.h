@@ -39,10 +39,10 @@ struct References {
     SharedFile patchSet;
 };
 
-/// Loads the target and, if its path is not empty, the patch set. `condition` as in
-/// colour::CgatsWants.
+/// Loads the target and, if its path is not empty, the patch set. `wants` is of the target
+/// (targetWants in analysis/Comparison.h).
 int loadReferences(const std::wstring& targetPath, const std::wstring& patchSetPath,
-                   const std::string& condition, References& references);
+                   const colour::CgatsWants& wants, References& references);
 
 /// True if both paths lead to one file, whatever its names.
 bool isSameFile(const std::wstring& left, const std::wstring& right);

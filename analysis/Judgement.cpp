@@ -3,9 +3,11 @@
 
 #include <algorithm>
 #include <cmath>
+#include <string_view>
 #include <utility>
 
 #include "analysis/ConditionWarnings.h"
+#include "analysis/PaperAims.h"
 #include "analysis/PatchKinds.h"
 
 namespace analysis {
@@ -17,8 +19,13 @@ double quantityOf(const Comparison& c, Quantity quantity, std::size_t patch) {
         return colour::deltaH(c.targetLab[patch], c.measuredLab[patch]);
     case Quantity::DeltaCh:
         return colour::deltaCh(c.targetLab[patch], c.measuredLab[patch]);
+    case Quantity::DeltaL:
+        return std::abs(c.measuredLab[patch].L - c.targetLab[patch].L);
     case Quantity::DeltaE:
     case Quantity::Spread: // of all readings of a patch: answerFromRepeats
+    case Quantity::GreyCh: // has aims of its own: answerFromGreys
+    case Quantity::Tone:   // of all readings of a tint: answerFromTones
+    case Quantity::SpotTone:
         break;
     }
     return c.difference[patch];
@@ -74,23 +81,28 @@ std::size_t differentPatches(const Comparison& c, const std::vector<std::size_t>
     return static_cast<std::size_t>(std::unique(groups.begin(), groups.end()) - groups.begin());
 }
 
-/// Value of a criterion over its patches.
-void answerFromPatches(const Comparison& c, const std::vector<std::size_t>& patches,
-                       Finding& finding) {
+/// Value of a criterion over its patches, which have a figure each.
+void answerFromFigures(const Comparison& c, const std::vector<std::size_t>& patches,
+                       const std::vector<double>& figures, Finding& finding) {
     finding.patches = patches.size();
     finding.found = differentPatches(c, patches);
     if (finding.found < finding.needed) {
         return;
     }
+    const auto largest = std::max_element(figures.begin(), figures.end());
+    finding.answered = true;
+    finding.worst = patches[static_cast<std::size_t>(largest - figures.begin())];
+    finding.value = finding.criterion->statistic == Statistic::Mean ? meanOf(figures) : *largest;
+}
+
+void answerFromPatches(const Comparison& c, const std::vector<std::size_t>& patches,
+                       Finding& finding) {
     std::vector<double> figures;
     figures.reserve(patches.size());
     for (const std::size_t patch : patches) {
         figures.push_back(quantityOf(c, finding.criterion->quantity, patch));
     }
-    const auto largest = std::max_element(figures.begin(), figures.end());
-    finding.answered = true;
-    finding.worst = patches[static_cast<std::size_t>(largest - figures.begin())];
-    finding.value = finding.criterion->statistic == Statistic::Mean ? meanOf(figures) : *largest;
+    answerFromFigures(c, patches, figures, finding);
 }
 
 void answerFromAll(const Statistics& statistics, std::size_t worst, Finding& finding) {
@@ -118,7 +130,114 @@ void answerFromRepeats(const RepeatSpread& spread, Finding& finding) {
     }
     finding.answered = true;
     finding.worst = spread.worst;
-    finding.value = spread.largest;
+    finding.value = finding.criterion->statistic == Statistic::Mean ? spread.mean : spread.largest;
+}
+
+/// The papers themselves, though the aims of all other patches were adjusted for them.
+void answerFromPapers(const Papers& papers, Finding& finding) {
+    for (const auto& [patch, difference] : papers.differences) {
+        if (difference >= finding.value) {
+            finding.value = difference;
+            finding.worst = patch;
+        }
+    }
+}
+
+/// Greys or tints of black, which count by their weight.
+void answerFromGreys(const Comparison& c, const std::vector<Grey>& greys,
+                     const std::vector<colour::Lab>& aims, Finding& finding) {
+    std::vector<std::size_t> patches;
+    std::vector<double> figures;
+    const bool isBalance = finding.criterion->quantity == Quantity::GreyCh;
+    for (std::size_t i = 0; i < greys.size(); ++i) {
+        if (isBalance && aims.empty()) {
+            return; // the paper is not known
+        }
+        const std::size_t patch = greys[i].patch;
+        patches.push_back(patch);
+        figures.push_back(greys[i].weight * (isBalance
+                                                 ? colour::deltaCh(aims[i], c.measuredAsIs(patch))
+                                                 : quantityOf(c, Quantity::DeltaL, patch)));
+    }
+    answerFromFigures(c, patches, figures, finding);
+}
+
+bool isOf(Inks inks, std::size_t channel) {
+    constexpr std::size_t black = 3;
+    switch (inks) {
+    case Inks::Chromatic:
+        return channel < black;
+    case Inks::Spots:
+        return channel > black;
+    case Inks::All:
+        return true;
+    case Inks::Cyan:
+    case Inks::Magenta:
+    case Inks::Yellow:
+    case Inks::Black:
+        break;
+    }
+    return channel == static_cast<std::size_t>(inks);
+}
+
+void answerFromTones(const std::vector<InkTones>& inks, Finding& finding) {
+    const auto [wantedInks, wantedTones] = finding.criterion->tints;
+    double sum = 0;
+    for (const InkTones& ink : inks) {
+        for (const ToneStep& step : ink.steps) {
+            if (!isOf(wantedInks, ink.channel) || !analysis::isOf(wantedTones, step.nominal)) {
+                continue;
+            }
+            const double deviation = std::abs(step.deviation());
+            finding.patches += step.readings;
+            ++finding.found;
+            sum += deviation;
+            if (deviation > finding.value) {
+                finding.value = deviation;
+                finding.worst = step.patch;
+            }
+        }
+    }
+    finding.answered = finding.found > 0;
+    if (finding.answered && finding.criterion->statistic == Statistic::Mean) {
+        finding.value = sum / static_cast<double>(finding.found);
+    }
+}
+
+void answerFromSpreads(const std::vector<MidToneSpread>& spreads, Finding& finding) {
+    constexpr std::size_t inks = 3;
+    finding.needed = inks;
+    finding.answered = !spreads.empty();
+    for (const MidToneSpread& spread : spreads) {
+        finding.patches += spread.readings;
+        finding.found += inks;
+        if (spread.spread > finding.value) {
+            finding.value = spread.spread;
+            finding.worst = spread.patch;
+        }
+    }
+}
+
+/// A criterion that is answered on request.
+void answerFromMeasures(const Comparison& c, const Measures& measures, Finding& finding) {
+    const bool isGrey = finding.criterion->patches == Patches::BalancedGreys;
+    const bool isBlack = finding.criterion->tints.inks == Inks::Black;
+    switch (finding.criterion->quantity) {
+    case Quantity::Tone:
+        return finding.criterion->tints.inks == Inks::Chromatic
+                   ? answerFromSpreads(measures.spreads, finding)
+                   : answerFromTones(measures.tones, finding);
+    case Quantity::SpotTone:
+        return answerFromTones(measures.spotTones, finding);
+    case Quantity::GreyCh:
+        return answerFromGreys(c, measures.greys, measures.greyAims, finding);
+    case Quantity::DeltaL:
+        return isGrey || isBlack
+                   ? answerFromGreys(c, isGrey ? measures.greys : measures.blacks, {}, finding)
+                   : answerFromPatches(c, measures.ramp, finding);
+    default:
+        return answerFromRepeats(c.spread, finding);
+    }
 }
 
 /// What all criteria are answered from.
@@ -127,20 +246,27 @@ struct Evidence {
     const Selections selections;
     const Statistics& statistics;
     std::size_t worst; ///< Of all patches.
+    const Measures& measures;
 };
 
 /// Answers a criterion as its patches and its quantity ask.
 void answer(const Evidence& evidence, const PresetOptions& options, Finding& finding) {
     const Patches patches = finding.criterion->patches;
-    if (patches == Patches::Greys) {
+    if (patches == Patches::Greys || patches == Patches::BalancedGreys) {
         finding.needed = static_cast<std::size_t>(options.minimumGreys);
     }
-    if (patches == Patches::All) {
+    if (finding.criterion->onRequest) {
+        answerFromMeasures(evidence.comparison, evidence.measures, finding);
+    } else if (patches == Patches::All) {
         answerFromAll(evidence.statistics, evidence.worst, finding);
     } else if (finding.criterion->quantity == Quantity::Spread) {
         answerFromRepeats(evidence.comparison.spread, finding);
     } else {
         answerFromPatches(evidence.comparison, evidence.selections.of(patches), finding);
+    }
+    if (patches == Patches::Paper && evidence.comparison.papers.adjusted) {
+        finding.value = -1;
+        answerFromPapers(evidence.comparison.papers, finding);
     }
     if (patches == Patches::OuterGamut) {
         finding.listed = outerGamutCount;
@@ -188,14 +314,34 @@ void warnOfFindings(const Comparison& c, Judgement& judgement) {
                      std::to_string(finding.listed) +
                      " patches of the outer gamut, and it was judged by these."});
         }
-        if (finding.criterion->quantity == Quantity::Spread && finding.answered && !finding.used &&
-            c.repeatMode == RepeatMode::Mean) {
+        if (finding.criterion->index == noEntry &&
+            finding.criterion->name == std::string_view("repeatSpread") && finding.answered &&
+            !finding.used && c.repeatMode == RepeatMode::Mean) {
             judgement.warnings.push_back(
                 {"spreadUnjudged",
                  "The means of repeated readings were compared, and the preset sets no limit to "
                  "how far the readings may lie apart.",
                  true});
         }
+    }
+}
+
+/// Aims that could not be adjusted as the preset asks, or are adjusted beyond the method's limit.
+void warnOfPapers(const Papers& papers, Judgement& judgement) {
+    if (papers.aims != PaperAims::Absolute && !papers.adjusted) {
+        judgement.warnings.push_back(
+            {"paperUnknown",
+             "The preset asks for aims adjusted for the paper, and the data have no paper patch: "
+             "the aims are those of the target as it is.",
+             true});
+    }
+    if (papers.aims == PaperAims::Corrected && papers.adjusted &&
+        colour::deltaE2000(*papers.target, *papers.measured) > largestCorrected) {
+        judgement.warnings.push_back(
+            {"papersTooDifferent",
+             "The papers differ by more than 5 in CIEDE2000, beyond which aims can't be corrected "
+             "for the paper.",
+             true});
     }
 }
 
@@ -245,8 +391,12 @@ Judgement judge(const Comparison& c, const tolerancePresetParameterRecord& prese
     Judgement judgement;
     std::size_t worst = 0;
     judgement.statistics = statisticsOf(c, worst);
-    const Evidence evidence{c, selectionsOf(c), judgement.statistics, worst};
+    judgement.measures = measuresOf(c, options);
+    const Evidence evidence{c, selectionsOf(c), judgement.statistics, worst, judgement.measures};
     for (const Criterion& criterion : criteria) {
+        if (criterion.onRequest && !options.stated[placeOf(criterion)]) {
+            continue;
+        }
         Finding finding;
         finding.criterion = &criterion;
         answer(evidence, options, finding);
@@ -254,6 +404,7 @@ Judgement judge(const Comparison& c, const tolerancePresetParameterRecord& prese
         judgement.findings.push_back(finding);
     }
     judgement.warnings = conditionWarnings(c, preset, options);
+    warnOfPapers(c.papers, judgement);
     warnOfFindings(c, judgement);
     warnOfPreset(preset, judgement);
     const auto keepsOpen = [](const Warning& warning) { return warning.keepsOpen; };

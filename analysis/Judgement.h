@@ -7,6 +7,7 @@
 
 #include "analysis/Comparison.h"
 #include "analysis/Criteria.h"
+#include "analysis/Measures.h"
 #include "analysis/Presets.h"
 
 namespace analysis {
@@ -48,7 +49,9 @@ struct Statistics {
 };
 
 struct Judgement {
-    std::vector<Finding> findings; ///< One a criterion, in the order of `criteria`.
+    /// One a criterion, in the order of `criteria`, without those that nobody requested.
+    std::vector<Finding> findings;
+    Measures measures; ///< What the requested ones are answered from.
     Statistics statistics;
     Verdict verdict = Verdict::Incomplete;
     std::vector<Warning> warnings; ///< Of conditions, and of what the preset asks.

@@ -70,7 +70,8 @@ int analyse(const ComparisonPaths& paths, const tolerancePresetParameterRecord& 
     }
     Comparison comparison;
     ComparisonWants wants = wantsOf(preset, options);
-    wants.spectra = job != nullptr;
+    wants.spectra = wants.spectra || job != nullptr;
+    wants.singleInks = job == nullptr; // its record takes all spectra
     if (const int status = compare(paths, wants, comparison)) {
         return status;
     }

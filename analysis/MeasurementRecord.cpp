@@ -84,7 +84,7 @@ void fillColours(const Comparison& c, const std::vector<Origin>& origins, double
     for (const Origin& origin : origins) {
         const bool isSet = origin.row != noRow;
         const colour::Lab from =
-            isSet ? c.measurement.file.set->lab[origin.row] : c.measuredLab[origin.patch];
+            isSet ? c.measurement.file.set->lab[origin.row] : c.measuredAsIs(origin.patch);
         const colour::Xyz tristimulus =
             isSet ? c.measurement.file.set->xyz[origin.row] : colour::xyzFromLab(from);
         *xyz++ = tristimulus.X;

@@ -16,6 +16,7 @@ constexpr double greyTriplets[][3] = {
     {25, 19, 19},     {50, 40, 40},       {75, 66, 66},       {3, 2.24, 2.24},
     {10, 7.46, 7.46}, {25, 18.88, 18.88}, {75, 66.12, 66.12}, {90, 85.34, 85.34},
 };
+constexpr std::size_t firstBalanced = 6; ///< From here on they are by the near-neutral formula.
 
 using KindSet = std::uint32_t;
 
@@ -27,11 +28,12 @@ bool near(double value, double wanted) {
     return std::abs(value - wanted) <= deviceTolerance;
 }
 
-bool isGrey(const double* cmyk) {
+/// True for one of the triplets from `first` on.
+bool isGrey(const double* cmyk, std::size_t first) {
     if (std::abs(cmyk[1] - cmyk[2]) > 2 * deviceTolerance) { // magenta and yellow are alike in all
         return false;
     }
-    return std::any_of(std::begin(greyTriplets), std::end(greyTriplets), [&](const double* grey) {
+    return std::any_of(greyTriplets + first, std::end(greyTriplets), [&](const double* grey) {
         return near(cmyk[0], grey[0]) && near(cmyk[1], grey[1]) && near(cmyk[2], grey[2]);
     });
 }
@@ -75,7 +77,7 @@ KindSet kindsOfProcess(const double* cmyk, std::bitset<outerGamutCount>& outerGa
             outerGamut.set(*entry);
             kinds |= kind(Patches::OuterGamut);
         }
-    } else if ((none & k) != 0 && isGrey(cmyk)) {
+    } else if ((none & k) != 0 && isGrey(cmyk, 0)) {
         kinds |= kind(Patches::Greys);
     }
     return kinds;
@@ -105,6 +107,28 @@ bool isProcessOnly(const colour::DataSet& set, std::size_t row) {
     const std::size_t channels = set.channels.size();
     const double* const device = &set.device[row * channels];
     return std::all_of(device + 4, device + channels, [](double value) { return near(value, 0); });
+}
+
+bool isPaper(const double* device, std::size_t channels) {
+    return std::all_of(device, device + channels, [](double value) { return near(value, 0); });
+}
+
+std::optional<std::size_t> onlyInk(const double* device, std::size_t channels) {
+    std::optional<std::size_t> ink;
+    for (std::size_t i = 0; i < channels; ++i) {
+        if (near(device[i], 0)) {
+            continue;
+        }
+        if (ink) {
+            return std::nullopt;
+        }
+        ink = i;
+    }
+    return ink;
+}
+
+bool isBalancedGrey(const double* device, std::size_t channels) {
+    return isGrey(device, firstBalanced) && isPaper(device + 3, channels - 3);
 }
 
 Selections selectionsOf(const Comparison& c) {

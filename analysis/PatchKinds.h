@@ -5,6 +5,7 @@
 #include <array>
 #include <bitset>
 #include <cstddef>
+#include <optional>
 #include <vector>
 
 #include "analysis/Comparison.h"
@@ -20,6 +21,16 @@ inline constexpr double deviceTolerance = 0.5;
 /// True if a patch has no ink beside C, M, Y and K. A CMYK profile has colours for no other patch.
 /// REQUIRES: set.hasCmyk().
 bool isProcessOnly(const colour::DataSet& set, std::size_t row);
+
+/// True if no ink is printed at all.
+bool isPaper(const double* device, std::size_t channels);
+
+/// The only ink of a patch, as the place of its channel; nothing for paper and for overprints.
+std::optional<std::size_t> onlyInk(const double* device, std::size_t channels);
+
+/// True for CMY greys that are balanced by the near-neutral formula of G7: magenta and yellow
+/// follow cyan by it. The greys of ISO 12647-7 and of older strips (40/27/27) are not.
+bool isBalancedGrey(const double* device, std::size_t channels);
 
 inline constexpr std::size_t patchKinds = static_cast<std::size_t>(Patches::Repeated) + 1;
 

@@ -12,6 +12,11 @@
 //   <repeats>mean</repeats>               may be absent: each
 //   <minimumGreys>5</minimumGreys>        may be absent: 5
 //   <inks>Orange, Green, Violet</inks>    may be absent; the inks after C, M, Y, K
+//   <paper>absolute</paper>               may be absent: absolute; or corrected, relative
+//   <toneAims>target</toneAims>           may be absent: target; or A, B, C
+//   <toneAimsBlack>B</toneAimsBlack>      may be absent: as toneAims
+//   <spotToneAims>nominal</spotToneAims>  may be absent: nominal; or target
+//   <greyWeights>equal</greyWeights>      may be absent: equal; or falling
 //   <criteria>
 //     <average tolerance="2.5" used="yes" decimals="1"/>
 //     <paperWhite tolerance="3" used="yes" decimals="1" psdTolerance="3" psdUsed="no"/>
@@ -168,18 +173,32 @@ Status readInks(std::string_view text, std::vector<std::string>& inks) {
     return exitDone;
 }
 
-Status readRepeats(std::string_view text, RepeatMode& mode) {
+/// One of a few words.
+template<class Choice, std::size_t count>
+Status readChoice(std::string_view text, const char* (*nameOf)(Choice),
+                  const Choice (&choices)[count], Choice& choice) {
     text = trimmed(text);
     if (text.empty()) {
         return exitPresetValueMissing;
     }
-    for (const RepeatMode each : {RepeatMode::Each, RepeatMode::Mean}) {
-        if (text == repeatModeName(each)) {
-            mode = each;
+    for (const Choice each : choices) {
+        if (text == nameOf(each)) {
+            choice = each;
             return exitDone;
         }
     }
     return exitPresetOutOfRange;
+}
+
+constexpr RepeatMode repeatModes[] = {RepeatMode::Each, RepeatMode::Mean};
+constexpr PaperAims paperAims[] = {PaperAims::Absolute, PaperAims::Corrected, PaperAims::Relative};
+constexpr ToneAims toneAims[] = {ToneAims::Target, ToneAims::CurveA, ToneAims::CurveB,
+                                 ToneAims::CurveC};
+constexpr GreyWeights greyWeights[] = {GreyWeights::Equal, GreyWeights::Falling};
+constexpr bool spotToneAims[] = {false, true};
+
+const char* spotToneAimsName(bool fromTarget) {
+    return fromTarget ? "target" : "nominal";
 }
 
 using Record = tolerancePresetParameterRecord;
@@ -209,7 +228,10 @@ constexpr struct Field {
          return readNumber(text, -1, largestCondition, preset.illuminationCondition);
      }},
     {"psd", [](auto text, Preset& preset) { return readSwitch(text, preset.fograPSDPreset); }},
-    {"repeats", [](auto text, Preset& preset) { return readRepeats(text, preset.options.repeats); },
+    {"repeats",
+     [](auto text, Preset& preset) {
+         return readChoice(text, repeatModeName, repeatModes, preset.options.repeats);
+     },
      true},
     {"minimumGreys",
      [](auto text, Preset& preset) {
@@ -217,6 +239,31 @@ constexpr struct Field {
      },
      true},
     {"inks", [](auto text, Preset& preset) { return readInks(text, preset.options.inks); }, true},
+    {"paper",
+     [](auto text, Preset& preset) {
+         return readChoice(text, paperAimsName, paperAims, preset.options.paperAims);
+     },
+     true},
+    {"toneAims",
+     [](auto text, Preset& preset) {
+         return readChoice(text, toneAimsName, toneAims, preset.options.toneAims);
+     },
+     true},
+    {"toneAimsBlack",
+     [](auto text, Preset& preset) {
+         return readChoice(text, toneAimsName, toneAims, preset.options.toneAimsBlack.emplace());
+     },
+     true},
+    {"spotToneAims",
+     [](auto text, Preset& preset) {
+         return readChoice(text, spotToneAimsName, spotToneAims, preset.options.spotToneFromTarget);
+     },
+     true},
+    {"greyWeights",
+     [](auto text, Preset& preset) {
+         return readChoice(text, greyWeightsName, greyWeights, preset.options.greyWeights);
+     },
+     true},
 };
 
 /// The fault that reading meets, with its place.
@@ -412,6 +459,7 @@ Status readCriteria(const pugi::xml_node& section, Preset& preset, Finding& find
         if (std::exchange(seen[placeOf(*criterion)], true)) {
             return finding.at(exitPresetValueRepeated, element);
         }
+        preset.options.stated.set(placeOf(*criterion));
         if (const Status status = readCriterion(element, *criterion, preset, finding);
             status != exitDone) {
             return status;
@@ -606,6 +654,42 @@ void take(const Preset& read, bool keepJobChoice, Record& preset) {
 
 } // namespace
 
+const char* toneAimsName(ToneAims aims) {
+    switch (aims) {
+    case ToneAims::CurveA:
+        return "A";
+    case ToneAims::CurveB:
+        return "B";
+    case ToneAims::CurveC:
+        return "C";
+    case ToneAims::Target:
+        break;
+    }
+    return "target";
+}
+
+const char* greyWeightsName(GreyWeights weights) {
+    return weights == GreyWeights::Falling ? "falling" : "equal";
+}
+
+bool PresetOptions::asks(Quantity quantity) const {
+    return std::any_of(std::begin(criteria), std::end(criteria), [&](const Criterion& criterion) {
+        return criterion.onRequest && criterion.quantity == quantity && stated[placeOf(criterion)];
+    });
+}
+
+bool PresetOptions::asksTargetSpectra() const {
+    return asks(Quantity::Tone) &&
+           (toneAims == ToneAims::Target || toneAimsBlack == ToneAims::Target);
+}
+
+bool PresetOptions::asksMeasures() const {
+    return paperAims != PaperAims::Absolute ||
+           std::any_of(std::begin(criteria), std::end(criteria), [&](const Criterion& criterion) {
+               return criterion.onRequest && stated[placeOf(criterion)];
+           });
+}
+
 int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParameterRecord& preset,
                 PresetFault* fault) {
     Preset read;
@@ -651,7 +735,13 @@ std::string conditionOf(const tolerancePresetParameterRecord& preset) {
 
 ComparisonWants wantsOf(const tolerancePresetParameterRecord& preset,
                         const PresetOptions& options) {
-    return {.formula = colour::formulaFromNumber(preset.deltaEMode), .repeats = options.repeats};
+    return {.formula = colour::formulaFromNumber(preset.deltaEMode),
+            .repeats = options.repeats,
+            .spectra = options.asks(Quantity::Tone),
+            .targetSpectra = options.asksTargetSpectra(),
+            .singleInks = true,
+            .readings = options.asksMeasures(),
+            .paperAims = options.paperAims};
 }
 
 Setting settingOf(const Criterion& criterion, const tolerancePresetParameterRecord& preset,

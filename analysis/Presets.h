@@ -3,7 +3,9 @@
 #pragma once
 
 #include <array>
+#include <bitset>
 #include <cstddef>
+#include <optional>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -25,6 +27,21 @@ struct Setting {
     int decimals = 0;
 };
 
+/// What tone values are held against.
+enum class ToneAims { Target, CurveA, CurveB, CurveC };
+
+/// "target", "A", "B", "C".
+const char* toneAimsName(ToneAims aims);
+
+/// How much each grey counts in grey balance.
+enum class GreyWeights {
+    Equal,
+    Falling, ///< 1 up to 50 percent, from there in a straight line to 0.25 at 100.
+};
+
+/// "equal", "falling".
+const char* greyWeightsName(GreyWeights weights);
+
 /// What a preset's file states beyond the record, which has no room for it.
 struct PresetOptions {
     RepeatMode repeats = RepeatMode::Each;
@@ -35,8 +52,25 @@ struct PresetOptions {
     /// empty. For data that do not name them; they may be more or fewer than the data have inks.
     std::vector<std::string> inks;
 
+    PaperAims paperAims = PaperAims::Absolute;
+    ToneAims toneAims = ToneAims::Target;                 ///< Of cyan, magenta and yellow.
+    std::optional<ToneAims> toneAimsBlack = std::nullopt; ///< That of the others if absent.
+    bool spotToneFromTarget = false; ///< Aims of spot tone values: the target's, not the nominal.
+    GreyWeights greyWeights = GreyWeights::Equal;
+
     /// Settings of the criteria without an entry, by their place in `criteria`.
     std::array<Setting, criterionCount> named{};
+    /// Which criteria the file names, used or not, by their place.
+    std::bitset<criterionCount> stated;
+
+    /// True if a criterion is named that is answered on request only.
+    bool asks(Quantity quantity) const;
+
+    /// True if tone values of the target count, which are from its spectra if it has any.
+    bool asksTargetSpectra() const;
+
+    /// True if anything is asked for that results of older versions do not have.
+    bool asksMeasures() const;
 };
 
 /// A longer file is no preset.
@@ -71,7 +105,7 @@ int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOption
 /// to the reader.
 std::string conditionOf(const tolerancePresetParameterRecord& preset);
 
-/// What a preset asks of a comparison; spectra are not wanted.
+/// What a preset asks of a comparison. Spectra are wanted only if tone values are.
 ComparisonWants wantsOf(const tolerancePresetParameterRecord& preset, const PresetOptions& options);
 
 /// How a criterion is judged. With fograPSDPreset above 0 the PSD values of the record decide.

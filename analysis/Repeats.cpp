@@ -143,6 +143,8 @@ void addSpread(const Comparison& c, const std::vector<std::uint32_t>& readings,
         spread.worst = readings.front();
     }
     spread.readings += readings.size();
+    RepeatedPatch& repeated = spread.each.emplace_back();
+    repeated = {readings.front(), readings.size(), 0, 0};
     const auto isFirst = [&](std::uint32_t patch) {
         return c.measuredLab[patch] == c.measuredLab[readings.front()];
     };
@@ -153,6 +155,8 @@ void addSpread(const Comparison& c, const std::vector<std::uint32_t>& readings,
     for (const std::uint32_t patch : readings) {
         const double distance = colour::difference(c.formula, mean, c.measuredLab[patch]);
         spread.mean += distance;
+        repeated.mean += distance / static_cast<double>(readings.size());
+        repeated.largest = std::max(repeated.largest, distance);
         if (distance > spread.largest) {
             spread.largest = distance;
             spread.worst = patch;
@@ -213,6 +217,9 @@ void averageRepeats(Comparison& c) {
         firstOf[c.groupOf[patch]] = std::min(firstOf[c.groupOf[patch]], patch);
     }
     c.spread.worst = c.groupOf[c.spread.worst];
+    for (RepeatedPatch& repeated : c.spread.each) {
+        repeated.patch = c.groupOf[repeated.patch];
+    }
     for (Input* input : {&c.target, &c.measurement, &c.patchSet}) {
         keepFirst(input->rows, firstOf);
     }

@@ -4,6 +4,7 @@
 #include "analysis/BoundaryText.h"
 #include "analysis/InkNames.h"
 #include "analysis/JsonWriter.h"
+#include "analysis/MeasuresJson.h"
 #include "analysis/Version.h"
 #include "colour/Identity.h"
 
@@ -59,6 +60,9 @@ void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset,
         json.text(ink);
     }
     json.endArray();
+    if (options.asksMeasures()) {
+        writeMeasureOptions(json, options);
+    }
     json.endObject();
 }
 
@@ -117,7 +121,7 @@ void writePairing(JsonWriter& json, const Comparison& c) {
     json.endObject();
 }
 
-void writeRepeats(JsonWriter& json, const RepeatSpread& spread) {
+void writeRepeats(JsonWriter& json, const RepeatSpread& spread, bool each) {
     json.key("repeats");
     json.beginObject();
     json.member("patches", static_cast<std::int64_t>(spread.patches));
@@ -126,6 +130,9 @@ void writeRepeats(JsonWriter& json, const RepeatSpread& spread) {
     memberIf(json, spread.patches > 0, "largestDistance", [&] { json.number(spread.largest); });
     memberIf(json, spread.patches > 0, "worstPatch",
              [&] { json.integer(static_cast<std::int64_t>(spread.worst)); });
+    if (each) {
+        writeRepeatedPatches(json, spread);
+    }
     json.endObject();
 }
 
@@ -314,7 +321,10 @@ void writeFindings(JsonWriter& json, const Comparison& c, const Judgement& judge
     json.endObject();
     writePairing(json, c);
     writeStatistics(json, judgement.statistics);
-    writeRepeats(json, c.spread);
+    writeRepeats(json, c.spread, options.asks(Quantity::Spread));
+    if (options.asksMeasures()) {
+        writeMeasures(json, c, judgement.measures, options);
+    }
     writeCriteria(json, judgement.findings);
     writeWarnings(json, c.warnings, judgement.warnings);
 }

@@ -29,6 +29,7 @@
 #include "colour/CgatsConditions.h"
 #include "colour/CgatsInks.h"
 #include "colour/CgatsTables.h"
+#include "colour/SingleInkSpectra.h"
 #include "colour/TextEncoding.h"
 
 namespace colour {
@@ -549,6 +550,9 @@ Failure readCgats(std::string_view bytes, const CgatsWants& wants, DataSet& set)
         return Failure::TooLarge;
     }
     try {
+        if (wants.spectra && wants.singleInks) {
+            return readWithSingleInkSpectra(bytes, wants, set);
+        }
         std::string decoded;
         bytes = withoutUtf16(bytes, decoded);
         if (!isCgats(bytes)) {

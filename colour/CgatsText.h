@@ -20,6 +20,7 @@ inline constexpr std::size_t maxCgatsPatches = 10'000'000;
 /// The data that a caller needs; the reader skips the rest.
 struct CgatsWants {
     bool spectra = true;        ///< False: keep spectra only if they are the only colour values.
+    bool singleInks = false;    ///< True: spectra of paper and single inks are enough.
     bool calculated = false;    ///< True: usable spectra replace stated colour values.
     std::string condition = {}; ///< "M1": read this condition if a file has several (readCxf).
 };

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <cstddef>
+#include <cstdint>
 #include <string>
 #include <vector>
 
@@ -69,6 +70,11 @@ struct DataSet {
     SpectralAxis axis;
     std::vector<double>
         spectra; ///< axis.length reflectances per patch, 0 to 1 (brighteners exceed 1).
+    /// The only rows that have spectra, rising, if not all have (CgatsWants::singleInks).
+    std::vector<std::uint32_t> spectrumRows;
+
+    /// Reflectances of a row; null if it has none.
+    const double* spectrumOf(std::size_t row) const;
 
     std::string originator; ///< Header texts in UTF-8; empty if absent.
     std::string descriptor;

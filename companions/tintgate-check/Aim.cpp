@@ -140,8 +140,8 @@ void loadPreset(Aim& aim) {
 
 void loadReferences(Aim& aim) {
     const std::wstring target = analysis::widened(aim.targetPath);
-    if (const int code =
-            analysis::loadReferences(target, {}, aim.measurementCondition, aim.references)) {
+    const auto wants = analysis::targetWants(aim.wants, aim.measurementCondition);
+    if (const int code = analysis::loadReferences(target, {}, wants, aim.references)) {
         failFile(Say::TargetTrouble, code, aim.targetPath);
     }
     // Each result states it.

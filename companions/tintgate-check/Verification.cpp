@@ -313,15 +313,16 @@ Outcome verify(const Aim& aim, const Measurement& measurement, Outputs& outputs,
     }
     return verifier.run([&](analysis::SharedFile& file) {
         return analysis::loadSide(analysis::widened(measurement.path),
-                                  {.spectra = false, .condition = aim.measurementCondition}, file);
+                                  analysis::measurementWants(aim.wants, aim.measurementCondition),
+                                  file);
     });
 }
 
 Outcome verifyBytes(const Aim& aim, const Measurement& measurement, std::string_view bytes,
                     Outputs& outputs, const Wanted& wanted, const std::string& mark) {
     return Verifier(aim, measurement, outputs, wanted, mark).run([&](analysis::SharedFile& file) {
-        return analysis::readSide(bytes, {.spectra = false, .condition = aim.measurementCondition},
-                                  file);
+        return analysis::readSide(
+            bytes, analysis::measurementWants(aim.wants, aim.measurementCondition), file);
     });
 }
 

@@ -25,9 +25,11 @@ std::string presetSummary(const std::string& path) {
                       path + (fault.line != 0 ? ":" + std::to_string(fault.line) : "") + ": " +
                           fault.description + " (exit code " + std::to_string(code) + ")");
     }
+    analysis::PresetOptions options;
+    analysis::readPresetOptions(preset, options); // of the file that was just read
     const auto used =
-        std::count_if(std::begin(preset.usedForResult), std::end(preset.usedForResult),
-                      [](int use) { return use != 0; });
+        std::count_if(std::begin(analysis::criteria), std::end(analysis::criteria),
+                      [&](const auto& c) { return analysis::settingOf(c, preset, options).used; });
     return path + ": sound; preset " + std::to_string(preset.presetID) + ", \"" +
            preset.name.utf8_string() + "\", judges by " + std::to_string(used) +
            (used == 1 ? " criterion\n" : " criteria\n");

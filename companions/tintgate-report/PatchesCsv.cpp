@@ -6,9 +6,7 @@
 #include <string_view>
 
 namespace report {
-namespace {
-
-void appendText(std::string& csv, std::string_view text) {
+void appendCsvText(std::string& csv, std::string_view text) {
     const bool formula = !text.empty() && std::string_view("=+-@\t\r").find(text[0]) != text.npos;
     const bool quoted = text.find_first_of("\",\r\n") != text.npos;
     if (quoted) {
@@ -25,7 +23,7 @@ void appendText(std::string& csv, std::string_view text) {
     }
 }
 
-void appendNumber(std::string& csv, double value) {
+void appendCsvNumber(std::string& csv, double value) {
     char digits[400];
     if (std::isfinite(value)) {
         csv.append(
@@ -34,12 +32,10 @@ void appendNumber(std::string& csv, double value) {
     }
 }
 
-} // namespace
-
 std::string patchesCsv(const report::Result& result) {
     std::string csv = "id,name,";
     for (const std::string& channel : result.channels) {
-        appendText(csv, channel);
+        appendCsvText(csv, channel);
         csv += ',';
     }
     csv += "target_L,target_a,target_b,measured_L,measured_a,measured_b,difference,"
@@ -47,12 +43,12 @@ std::string patchesCsv(const report::Result& result) {
     const std::size_t channels = result.channels.size();
     for (std::size_t i = 0; i < result.patches.size(); ++i) {
         const report::Patch& patch = result.patches[i];
-        appendText(csv, patch.id);
+        appendCsvText(csv, patch.id);
         csv += ',';
-        appendText(csv, patch.name);
+        appendCsvText(csv, patch.name);
         const auto number = [&](double value) {
             csv += ',';
-            appendNumber(csv, value);
+            appendCsvNumber(csv, value);
         };
         for (std::size_t channel = 0; channel < channels; ++channel) {
             number(result.device[i * channels + channel]);
@@ -65,7 +61,7 @@ std::string patchesCsv(const report::Result& result) {
         number(patch.difference);
         for (const std::string& label : {patch.measuredId, patch.measuredName}) {
             csv += ',';
-            appendText(csv, label);
+            appendCsvText(csv, label);
         }
         csv += '\n';
     }

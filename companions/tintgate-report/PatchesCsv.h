@@ -3,6 +3,7 @@
 #pragma once
 
 #include <string>
+#include <string_view>
 
 #include "report/Result.h"
 
@@ -17,5 +18,11 @@ namespace report {
 /// that a spreadsheet would run as a formula gets an apostrophe in front. No number is an empty
 /// cell.
 std::string patchesCsv(const Result& result);
+
+/// A cell of text, as above. Commas and line ends are the caller's.
+void appendCsvText(std::string& csv, std::string_view text);
+
+/// A cell with a number, shortest, without an exponent; empty if it is not finite.
+void appendCsvNumber(std::string& csv, double value);
 
 } // namespace report

@@ -14,6 +14,7 @@
 
 #include <CLI/CLI.hpp>
 
+#include "companions/tintgate-report/Averaging.h"
 #include "companions/tintgate-report/CheckPreset.h"
 #include "companions/tintgate-report/Explain.h"
 #include "companions/tintgate-report/Failure.h"
@@ -50,6 +51,7 @@ Examples:
   tintgate-report --explain $?                    behind a run of Tintgate
   tintgate-report --check-preset my-preset.xml    what is wrong with a preset, and where
   tintgate-report --tidy 30 --dry-run
+  tintgate-report average first.txt second.txt -o mean.txt
 
 A trend compares only results that were aimed at the same colours, and of one printer,
 paper, preset, instrument, workflow and strip, with each other, and says which ink
@@ -82,6 +84,8 @@ struct Options {
     std::string preset;
     LabelOptions labels;
     bool dryRun = false;
+    bool averages = false;
+    report::AverageOptions average;
 
     bool fromStore() const { return !store.empty(); }
     /// For all that is not about one job alone.
@@ -228,7 +232,9 @@ int run(const Options& options) {
         return verdictOf(options);
     }
     try {
-        if (options.code) {
+        if (options.averages) {
+            report::writeOutput("-", report::averageFiles(options.average));
+        } else if (options.code) {
             report::writeOutput("-", report::explanationOf(*options.code));
         } else if (!options.preset.empty()) {
             report::writeOutput("-", report::presetSummary(options.preset));
@@ -344,6 +350,23 @@ void addOptions(CLI::App& program, Options& options) {
         ->group(upkeep);
     program.add_flag("--dry-run", options.dryRun, "With --tidy: only say what would go")
         ->group(upkeep);
+    CLI::App* const average = program.add_subcommand(
+        "average", "Average several measurements of one chart, and report how far they lie apart");
+    average->get_formatter()->column_width(column);
+    average
+        ->add_option("MEASUREMENT", options.average.measurements,
+                     "Two or more measurements of one chart")
+        ->type_name("")
+        ->required()
+        ->expected(2, -1);
+    average->add_option("-o,--output", options.average.output, "Where the mean goes, as CGATS text")
+        ->type_name("FILE")
+        ->required();
+    average
+        ->add_option("--spread", options.average.spread,
+                     "Where the spread of each patch goes, as CSV")
+        ->type_name("FILE");
+    average->callback([&options] { options.averages = true; });
     program.footer(std::string(footer) + tintgateReportStatusHelp);
 }
 
@@ -416,7 +439,9 @@ int main(int argumentCount, char** arguments) {
     addOptions(program, options);
     try {
         program.parse(argumentCount, arguments);
-        settle(options);
+        if (!options.averages) {
+            settle(options);
+        }
     } catch (const CLI::ParseError& failure) {
         return program.exit(failure) == 0 ? 0 : static_cast<int>(Status::BadCommand);
     }

@@ -158,6 +158,12 @@ TEST(Presets, OneCodeForOneCause) {
         {"<psd>", "<inks>" + std::string(101, 'a') + "</inks><psd>", exitPresetOutOfRange},
         {"<psd>", "<inks>Gr\xFCn</inks><psd>", exitPresetNotXml},
         {"<psd>", "<inks><ink>Orange</ink></inks><psd>", exitPresetUnknownEntry},
+        {"<psd>", "<paper>white</paper><psd>", exitPresetOutOfRange},
+        {"<psd>", "<toneAims>D</toneAims><psd>", exitPresetOutOfRange},
+        {"<psd>", "<toneAimsBlack/><psd>", exitPresetValueMissing},
+        {"<psd>", "<greyWeights>equal</greyWeights><greyWeights>equal</greyWeights><psd>",
+         exitPresetValueRepeated},
+        {"<psd>", "<spotToneAims>A</spotToneAims><psd>", exitPresetOutOfRange},
         {"<psd>", "<psd required=\"yes\">", exitPresetUnknownEntry},
         {"Condition>-1", "Condition required=\"1\">-1", exitPresetOutOfRange},
         {"Condition>-1", "Condition required=\"yes\">4", exitPresetOutOfRange},
@@ -198,13 +204,21 @@ TEST(Presets, Files) {
         ASSERT_EQ(readPreset(folder.write(name, goodText), false, record), exitDone);
         EXPECT_EQ(narrowed(record.filePath.ToStdWstring()), folder.path("p\xFF.xml"));
     }
-    // What is shipped; the last one is a PSD preset.
-    for (int id = 1; id <= 7; ++id) {
-        const std::string file = "/presets/CVP_000" + std::to_string(id) + ".xml";
+    // What is shipped: 7 is a PSD preset, and each uses some criterion.
+    for (int id = 1; id <= 11; ++id) {
+        const std::string number = std::to_string(id);
+        const std::string file =
+            "/presets/CVP_" + std::string(4 - number.size(), '0') + number + ".xml";
+        record.filePath.clear();
         ASSERT_EQ(readPreset(TINTGATE_SOURCE_DIR + file, false, record), exitDone) << file;
         EXPECT_EQ(record.presetID, id);
-        EXPECT_EQ(record.usedForResult[0], 1);
         EXPECT_EQ(record.fograPSDPreset, id == 7 ? 1 : 0);
+        PresetOptions options;
+        ASSERT_EQ(readPresetOptions(record, options), exitDone);
+        EXPECT_TRUE(std::any_of(std::begin(criteria), std::end(criteria), [&](const Criterion& c) {
+            return settingOf(c, record, options).used;
+        })) << file;
+        EXPECT_EQ(options.asksMeasures(), id > 7 || id == 4 || id == 5) << file;
     }
 }
 
@@ -217,7 +231,9 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
     };
     change("Condition>-1", "Condition required=\"yes\">3");
     change("<psd>", "<minimumGreys> 3 </minimumGreys><repeats>mean</repeats>"
-                    "<inks>\n Deep Sea,485,k\t, Grün\n</inks><psd>");
+                    "<inks>\n Deep Sea,485,k\t, Grün\n</inks><paper>relative</paper>"
+                    "<toneAims>A</toneAims><toneAimsBlack> target </toneAimsBlack>"
+                    "<spotToneAims>target</spotToneAims><greyWeights>falling</greyWeights><psd>");
     change("<average", "<repeatSpread tolerance=\"1.5\" used=\"yes\" decimals=\"1\" "
                        "psdTolerance=\"2.5\" psdUsed=\"no\"/><average");
     const auto spread = [](const Record& record, const PresetOptions& options) {
@@ -234,6 +250,11 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
         EXPECT_EQ(options.repeats, RepeatMode::Mean);
         EXPECT_EQ(options.minimumGreys, 3);
         EXPECT_THAT(options.inks, testing::ElementsAre("Deep Sea", "485", "k", "Grün"));
+        EXPECT_EQ(options.paperAims, PaperAims::Relative);
+        EXPECT_EQ(options.toneAims, ToneAims::CurveA);
+        EXPECT_EQ(options.toneAimsBlack, ToneAims::Target);
+        EXPECT_TRUE(options.spotToneFromTarget);
+        EXPECT_EQ(options.greyWeights, GreyWeights::Falling);
         EXPECT_EQ(spread(record, options).tolerance, 1.5);
         EXPECT_TRUE(spread(record, options).used);
         EXPECT_EQ(spread(record, options).decimals, 1);

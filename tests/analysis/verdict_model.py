@@ -10,6 +10,9 @@ import csv
 import math
 import pathlib
 
+import measure_model
+from measure_model import REQUESTED
+
 HERE = pathlib.Path(__file__).parent
 WHITE = (96.42, 100.0, 82.49)  # of the ICC profile connection space, which Lab is relative to
 DIFFUSER = (96.422, 100.0, 82.521)  # D50, 2 degrees, after ASTM E308
@@ -336,16 +339,23 @@ class Model:
         for index, key in enumerate(keys):
             groups.setdefault(key, []).append(index)
         self.spread, self.readings, self.repeated = None, 0, 0
+        self.distances = []
         for members in groups.values():
             readings = sorted({self.patches[i][2] for i in members})
             if len(readings) > 1:
                 labs = [measurement.lab(row) for row in readings]
-                spread = max(formula(mean_of(labs), lab) for lab in labs)
-                self.spread = max(self.spread or 0, spread)
+                distances = [formula(mean_of(labs), lab) for lab in labs]
+                self.distances += distances
+                self.spread = max(self.spread or 0, *distances)
                 self.readings += len(readings)
                 self.repeated += 1
         self.pairs = [(target.lab(t), measurement.lab(m)) for _, t, m in self.patches]
         self.group = keys
+        if self.is_cmyk:
+            readings = [(device, *patch[1:])
+                        for device, patch in zip(self.device, self.patches)]
+            self.tone_values = measure_model.ToneValues(readings, target, measurement, preset,
+                                                        xyz_of_lab)
         if preset.get("repeats") == "mean":
             self.pairs = []
             for members in groups.values():
@@ -356,11 +366,46 @@ class Model:
             self.patches = [self.patches[i] for i in firsts]
             self.device = [self.device[i] for i in firsts] if self.device else None
             self.group = list(groups)
+        self.adjust(target, preset, formula)
         self.figures = {"dE": [formula(*pair) for pair in self.pairs],
                         "dH": [delta_h(*pair) for pair in self.pairs],
                         "dCh": [math.dist(a[1:], b[1:]) for a, b in self.pairs]}
 
+    def adjust(self, target, preset, formula):
+        """Aims for another paper than the target's."""
+        self.measured_as_is = [pair[1] for pair in self.pairs]
+        papers = [i for i in range(len(self.pairs))
+                  if self.is_cmyk and all(near(value, 0) for value in self.device[i])]
+        self.papers = self.paper_difference = None
+        if papers:
+            self.papers = [mean_of([self.pairs[i][side] for i in papers]) for side in (0, 1)]
+        aims = preset.get("paper", "absolute")
+        if aims == "absolute":
+            return
+        if not papers:
+            return self.warn("paperUnknown", True)
+        self.paper_difference = max(formula(*self.pairs[i]) for i in papers)
+        ours, theirs = map(xyz_of_lab, self.papers)
+        if aims == "relative":
+            self.pairs = [[lab_of_xyz(measure_model.relative(xyz_of_lab(lab), paper))
+                           for lab, paper in zip(pair, (ours, theirs))] for pair in self.pairs]
+            return
+        black = [row for row, patch in enumerate(target.chart) if "device" in patch
+                 and target.space == "CMYK" and all(v >= 99.5 for v in patch["device"][:4])
+                 and all(near(v, 0) for v in patch["device"][4:])]
+        rows = black[:1] or range(len(target.chart))
+        darkest = [min(parts) for parts in
+                   zip(*(xyz_of_lab(target.lab(row)) for row in rows))]
+        self.pairs = [(lab_of_xyz(measure_model.substrate_corrected(
+            xyz_of_lab(pair[0]), ours, theirs, darkest)), pair[1]) for pair in self.pairs]
+        if delta_e00(*self.papers) > 5:
+            self.warn("papersTooDifferent", True)
+
     def value_of(self, name, preset):
+        if name in REQUESTED:
+            return measure_model.value_of(name, self, preset)
+        if name == "paperWhite" and self.paper_difference is not None:
+            return self.paper_difference
         kind, quantity, statistic = CRITERIA[name]
         if name == "repeatSpread":
             return self.spread
@@ -374,8 +419,9 @@ class Model:
                 "95": figures[math.ceil(len(figures) * 95 / 100) - 1]}[statistic]
 
     def judge(self, preset):
-        self.values = {name: self.value_of(name, preset) for name in CRITERIA}
         used = preset["criteria"]
+        self.values = {name: self.value_of(name, preset)
+                       for name in [*CRITERIA, *(name for name in REQUESTED if name in used)]}
         if not used:
             self.warn("nothingJudged")
         present = {entry for entry in OUTER_GAMUT for device in (self.device or [])

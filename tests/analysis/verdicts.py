@@ -7,6 +7,7 @@ must come with it. All figures of each result are worked out again by verdict_mo
 random charts too.
 """
 
+import csv
 import json
 import math
 import pathlib
@@ -17,7 +18,8 @@ import sys
 
 import jsonschema
 
-from verdict_model import CRITERIA, Model, Side
+from measure_model import BALANCED, REQUESTED
+from verdict_model import CRITERIA, Model, Side, lab_of_xyz, xyz_of_lab
 
 ROOT = pathlib.Path(__file__).parents[2]
 SCHEMA = json.loads((ROOT / "docs/result.schema.json").read_text())
@@ -43,13 +45,15 @@ def text_of(side):
               "RGB": ["RGB_R", "RGB_G", "RGB_B"],
               "nCLR": [f"{count}CLR_{i + 1}" for i in range(count)]}[side.columns] if count else []
     names += ["LAB_L", "LAB_A", "LAB_B"] if side.has("lab") else []
-    names += [f"SPECTRAL_{nm}" for nm in range(380, 740, 10)] if side.has("grey") else []
+    spectral = side.has("grey") or side.has("spectrum")
+    names += [f"SPECTRAL_{nm}" for nm in range(380, 740, 10)] if spectral else []
     lines += ["BEGIN_DATA_FORMAT", " ".join(names), "END_DATA_FORMAT", f"NUMBER_OF_SETS {len(chart)}",
               "BEGIN_DATA"]
     for patch in chart:
         cells = [f'"{patch[key]}"' for key in ("id", "name") if side.has(key)]
         cells += [*patch.get("device", []), *patch.get("lab", [])] + [patch.get("grey")] * (
             36 if side.has("grey") else 0)
+        cells += patch["spectrum"] if side.has("spectrum") else []
         lines.append(" ".join(map(str, cells)))
     return "\n".join([*lines, "END_DATA", ""])
 
@@ -58,8 +62,9 @@ def preset_of(preset):
     required = ' required="yes"' if preset.get("required") else ""
     criteria = "".join(f'<{name} tolerance="{limit}" used="yes" decimals="2"/>'
                        for name, limit in preset["criteria"].items())
-    options = "".join(f"<{name}>{preset[name]}</{name}>" for name in ("repeats", "minimumGreys")
-                      if name in preset)
+    options = "".join(f"<{name}>{preset[name]}</{name}>" for name in (
+        "repeats", "minimumGreys", "paper", "toneAims", "toneAimsBlack", "spotToneAims",
+        "greyWeights") if name in preset)
     return (f'<tolerancePreset version="1"><id>1</id><name>Case</name>'
             f'<formula>{preset.get("formula", "CIE76")}</formula><editable>no</editable>'
             f"<showInClient>no</showInClient><usedForDynamicWedge>no</usedForDynamicWedge>"
@@ -132,6 +137,8 @@ def case(what, verdict, target, measurement, codes="", criteria=None, patch_set=
 
 
 GOOD = moved(WEDGE, 1, 0, 0)
+ON_YELLOW = [{**p, "lab": lab} for p, lab in zip(WEDGE, [(93, 0, 2), (54.2, -37.5, -46.4)]
+                                                    + [p["lab"] for p in WEDGE[2:]])]
 MEAN = {**AVERAGE, "maximum": 2, "repeatSpread": 2.5}
 CASES = [
     case("a good print", "passed", WEDGE, GOOD),
@@ -236,6 +243,28 @@ CASES = [
          moved(GOOD, 0, 0, 30, only=(55, 0, 0, 0)), criteria={"surfaceGamutAverage": 2}),
     case("surface of the gamut: with black it is not", "passed", WEDGE,
          moved(GOOD, 0, 0, 30, only=(100, 0, 0, 20)), criteria={"surfaceGamutAverage": 2}),
+    # Aims for the paper.
+    case("no paper to correct for", "incomplete", WEDGE[1:], GOOD[1:], "paperUnknown", AVERAGE,
+         paper="corrected"),
+    case("papers too different", "incomplete", WEDGE, moved(WEDGE, -12, 0, 0), "papersTooDifferent",
+         {"solidBlack": 20}, paper="corrected"),
+    case("the paper itself is not corrected", "failed", WEDGE, moved(WEDGE, 0, 0, 4),
+         criteria={"paperWhite": 3}, paper="corrected"),
+    case("the paper itself is not relative", "failed", WEDGE, moved(WEDGE, 0, 0, 4),
+         criteria={"paperWhite": 3}, paper="relative"),
+    case("a solid on another paper", "failed", WEDGE, ON_YELLOW, criteria={"solidCyan": 3}),
+    case("the same, corrected", "passed", WEDGE, ON_YELLOW, criteria={"solidCyan": 3},
+         paper="corrected"),
+    # Criteria on request.
+    case("tone values without a solid", "incomplete", WEDGE[:1] + WEDGE[2:], GOOD[:1] + GOOD[2:],
+         criteria={"toneCyan": 3}),
+    case("tone values", "failed", WEDGE, moved(GOOD, -9, 0, 0, only=(55, 0, 0, 0)),
+         criteria={"toneCyan": 3}),
+    case("ramps", "failed", WEDGE, moved(GOOD, -9, 0, 0, only=(55, 0, 0, 0)),
+         criteria={"rampLightness": 3}),
+    case("a mean of readings with a limit for their average", "incomplete", WEDGE,
+         moved(WEDGE, 1, 0, 0) + moved(WEDGE, -1, 0, 0), "spreadUnjudged",
+         {**AVERAGE, "repeatAverage": 2}, repeats="mean"),
     # More than four inks.
     case("seven inks against themselves", "passed", Side(with_inks(WEDGE, 7, *SPOTS), space="nCLR"),
          Side(with_inks(WEDGE, 7, *SPOTS), space="nCLR"), criteria={**LIMITS, "spotMaximum": 3}),
@@ -302,9 +331,35 @@ def check(result, model, sides):
             for a, b in zip(stated_lab, expected):
                 near(a, b, f"Lab of {row[:3]}")
     names = {criterion["name"]: criterion for criterion in result["criteria"]}
-    assert set(names) == set(CRITERIA)
+    assert set(names) == set(model.values)
     for name, criterion in names.items():
         near(criterion["value"], model.values[name], name)
+    check_measures(result, model, near)
+
+
+def check_measures(result, model, near):
+    """The parts of a result that criteria on request bring along."""
+    if "papers" in result:
+        for i, side in enumerate(("target", "measured")):
+            paper = result["papers"][side]
+            assert (paper is None) == (model.papers is None)
+            for a, b in zip(paper or [], model.papers[i] if model.papers else []):
+                near(a, b, f"paper of the {side}")
+    tones = result.get("tones", {"inks": []})
+    parts = [(tones, "tones"), (result.get("spotTones", {"inks": []}), "spots")]
+    for stated, attribute in parts:
+        for ink in stated["inks"]:
+            expected = getattr(model.tone_values, attribute)[ink["channel"]]
+            assert [step[0] for step in ink["steps"]] == list(expected), (ink, expected)
+            for nominal, measured, aim, _, _ in ink["steps"]:
+                near(measured, expected[nominal][0], f"tone value at {nominal}")
+                near(aim, expected[nominal][1], f"aim at {nominal}")
+    if any(ink["steps"] for ink in tones["inks"]):
+        assert (tones["method"] == "density") == model.tone_values.by_density
+    if "each" in result["repeats"]:
+        each = result["repeats"]["each"]
+        assert len(each) == model.repeated and sum(one[1] for one in each) == model.readings
+        near(max((one[3] for one in each), default=None), model.spread, "spread of each")
 
 
 def run_cases(program):
@@ -376,10 +431,111 @@ def run_random(program, count):
         compared += 1
 
 
+def run_worked(program):
+    """Figures that were worked out elsewhere, mostly from published sets."""
+    def values(sides, expect, **preset):
+        preset["criteria"] = {name: 50 for name in expect}
+        result = program.result([*map(Side, sides), None], preset)
+        found = {criterion["name"]: criterion["value"] for criterion in result["criteria"]}
+        for name, (value, within) in expect.items():
+            assert abs(found[name] - value) <= within, (name, found[name], value)
+        return result
+
+    def labs_are(result, expected, within):
+        for row, lab in zip(result["patches"], expected):
+            assert all(abs(a - b) <= within for a, b in zip(row[3], lab)), (row, lab)
+
+    # FOGRA39 at 40 percent against tone values of 53 (13 of increase) of its three inks.
+    fogra39 = {}
+    with open(ROOT / "tests/data/colour/tone-values-fogra39.csv", encoding="ascii") as file:
+        for row in csv.DictReader(line for line in file if not line.startswith("#")):
+            fogra39[row["ink"], int(row["nominal"])] = xyz_of_lab(
+                [float(row[axis]) for axis in "Lab"])
+    paper, ours, theirs = fogra39["C", 0], [], []
+    for i, ink in enumerate("CMY"):
+        solid = fogra39[ink, 100]
+        aim = [p + 0.53 * (s - p) for p, s in zip(paper, solid)]
+        for tone, target, measured in ((0, paper, paper), (100, solid, solid),
+                                       (40, aim, fogra39[ink, 40])):
+            device = [tone if i == at else 0 for at in range(4)]
+            ours.append(patch(device, lab_of_xyz(target)))
+            theirs.append(patch(device, lab_of_xyz(measured)))
+    values([ours, theirs], {"toneCyanMiddle": (0.97, 0.006), "toneMagentaMiddle": (0.69, 0.006),
+                            "toneYellowMiddle": (0.13, 0.006), "midToneSpread": (1.66, 0.006)})
+    values([ours, theirs], {"toneCyan": (1.33, 0.006)}, toneAims="A")  # 53.97 against 55.3
+
+    # CRPC6, its 50/40/40 against the grey of its own paper.
+    grey = [patch((0, 0, 0, 0), (95, 1, -4)), patch((50, 40, 40, 0), (57.46, 0.38, -2.03))]
+    values([grey, grey], {"greyBalanceMaximum": (math.hypot(0.12, 0.03), 1e-6)}, minimumGreys=1)
+
+    with open(ROOT / "tests/data/analysis/corrected-aims-crpc6.csv", encoding="ascii") as file:
+        rows = list(csv.DictReader(line for line in file if not line.startswith("#")))
+    aims = [patch([float(row[ink]) for ink in "CMYK"], [float(row[axis]) for axis in "Lab"])
+            for row in rows]
+    result = values([aims, [{**aims[0], "lab": [93, 0, -1]}, *aims[1:]]], {}, paper="corrected")
+    labs_are(result, [[float(row[f"{axis}_corrected"]) for axis in "Lab"] for row in rows], 6e-5)
+
+    fogra = [patch((0, 0, 0, 0), (95, 0, -2)), patch((100, 0, 0, 0), (55, -37, -50)),
+             patch((0, 0, 0, 100), (16, 0, 0)), patch((100, 100, 0, 0), (24, 22, -46))]
+    result = values([fogra, fogra], {"paperWhite": (0, 0)}, paper="relative")
+    labs_are(result, [(100, 0, 0), (58.198, -38.667, -50.389), (17.441, 0, 0.596),
+                      (25.802, 22.991, -46.829)], 6e-4)
+
+
+def random_tones(dice, devices, most):
+    """Most patches that tone values are made of, some of them twice, in random colours."""
+    chosen = dice.sample(devices, len(devices) * 6 // 7)
+    chosen += dice.sample(chosen, dice.randint(0, 3))
+    dice.shuffle(chosen)
+    chart = [patch(device, [round(dice.uniform(5 if any(device) else 80, most), 2), round(dice.uniform(-60, 60), 2),
+                            round(dice.uniform(-60, 60), 2)]) for device in chosen]
+    if dice.random() < 0.5:
+        for p in chart:
+            p["spectrum"] = [round(dice.uniform(0.01, 1), 4) for _ in range(36)]
+    return Side(chart)
+
+
+def run_random_tones(program, count):
+    """Criteria that are answered on request, under all options."""
+    dice = random.Random(23)
+    inks = 6
+    levels = (3, 10, 30, 40, 50, 70, 75, 80, 90, 100)
+    devices = [[0] * inks, [100] * 4 + [0, 0], [30, 30, 0, 0, 0, 0]]
+    devices += [[level if i == ink else 0 for i in range(inks)]
+                for ink in range(inks) for level in levels]
+    devices += [[*grey, 0, 0, 0] for grey in BALANCED]
+    answered = set()
+    for turn in range(count):
+        curves = turn % 2 == 0
+        pool = [d for d in devices if not curves or all(v % 10 == 0 for v in d[:3])
+                and all(v % 10 == 0 for v in d[3:])]  # the model's curves are known at tens
+        sides = [random_tones(dice, pool, 95), random_tones(dice, pool, 95), None]
+        preset = {"criteria": {name: 20 for name in dice.sample(REQUESTED, 20) + ["paperWhite"]},
+                  "formula": dice.choice(("CIE76", "CIE2000")),
+                  "repeats": dice.choice(("each", "mean")), "minimumGreys": dice.choice((1, 5)),
+                  "paper": dice.choice(("absolute", "corrected", "relative")),
+                  "spotToneAims": dice.choice(("nominal", "target")),
+                  "greyWeights": dice.choice(("equal", "falling"))}
+        if curves:
+            preset["toneAims"] = dice.choice("ABC")
+            preset["toneAimsBlack"] = dice.choice(("A", "B", "C", "target"))
+        model = Model(*sides, preset)
+        result = program.result(sides, preset)
+        try:
+            check(result, model, sides)
+        except AssertionError as fault:
+            raise AssertionError(f"random tones {turn}, files in {program.folder}: {fault}") \
+                from fault
+        answered |= {name for name, value in model.values.items() if value is not None}
+    assert answered >= set(REQUESTED), set(REQUESTED) - answered
+
+
 def main(tintgate, folder):
     program = Program(tintgate, folder)
     seen = run_cases(program)
     run_random(program, 150)
+    run_worked(program)
+    run_random_tones(program, 40)
     listed = set(re.findall(r"^\| `(\w+)`", (ROOT / "docs/result.md").read_text().split(
         "## Warning codes")[1].split("\n# ")[0], re.MULTILINE))
     assert seen - listed == set(), f"codes that docs/result.md does not list: {seen - listed}"
