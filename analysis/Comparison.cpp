@@ -7,11 +7,11 @@
 #include <utility>
 
 #include "ExitCodes.h"
-#include "analysis/BoundaryText.h"
 #include "analysis/PaperAims.h"
 #include "analysis/PatchKinds.h"
 #include "analysis/Repeats.h"
 #include "analysis/Status.h"
+#include "base/WideBytes.h"
 
 namespace analysis {
 namespace {

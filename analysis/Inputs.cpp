@@ -6,8 +6,8 @@
 #include <utility>
 
 #include "ExitCodes.h"
-#include "analysis/BoundaryText.h"
 #include "analysis/Status.h"
+#include "base/WideBytes.h"
 
 namespace analysis {
 namespace {
@@ -37,7 +37,8 @@ int takeSide(colour::Failure failure, colour::ColourFile&& loaded, SharedFile& f
 
 int loadSide(const std::wstring& path, const colour::CgatsWants& wants, SharedFile& file) {
     colour::ColourFile loaded;
-    const colour::Failure failure = colour::loadColourFile(narrowed(path), wants, loaded);
+    const colour::Failure failure =
+        colour::loadColourFile(base::bytesFromWide(path), wants, loaded);
     return takeSide(failure, std::move(loaded), file);
 }
 
@@ -49,8 +50,8 @@ int readSide(std::string_view bytes, const colour::CgatsWants& wants, SharedFile
 
 int loadPatchSet(const std::wstring& path, SharedFile& file) {
     colour::ColourFile loaded;
-    if (const int status =
-            statusOf(colour::loadColourFile(narrowed(path), {.spectra = false}, loaded))) {
+    if (const int status = statusOf(
+            colour::loadColourFile(base::bytesFromWide(path), {.spectra = false}, loaded))) {
         return status;
     }
     if (loaded.profile) {
@@ -80,7 +81,8 @@ int loadReferences(const std::wstring& targetPath, const std::wstring& patchSetP
 
 bool isSameFile(const std::wstring& left, const std::wstring& right) {
     std::error_code error; // Devices and pipes, and files that are not there, are not the same.
-    return std::filesystem::equivalent(narrowed(left), narrowed(right), error);
+    return std::filesystem::equivalent(base::bytesFromWide(left), base::bytesFromWide(right),
+                                       error);
 }
 
 } // namespace analysis

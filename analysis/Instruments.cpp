@@ -9,8 +9,8 @@
 #include <dlfcn.h>
 
 #include "ExitCodes.h"
-#include "analysis/BoundaryText.h"
 #include "analysis/Status.h"
+#include "base/Trim.h"
 #include "colour/CgatsText.h"
 #include "colour/ColourFile.h"
 
@@ -22,7 +22,7 @@ constexpr std::size_t largestDefinition = 64 << 20;
 
 /// A whole text that is a number.
 std::optional<unsigned int> numberOf(std::string_view text) {
-    text = trimmed(text);
+    text = base::trimmed(text);
     unsigned int number = 0;
     const auto [end, error] = std::from_chars(text.data(), text.data() + text.size(), number);
     if (error != std::errc() || end != text.data() + text.size()) {
@@ -56,11 +56,11 @@ std::string_view nameIn(std::string_view lines, unsigned int id) {
     }
     while (!lines.empty()) {
         const std::size_t end = lines.find('\n');
-        const std::string_view line = trimmed(lines.substr(0, end));
+        const std::string_view line = base::trimmed(lines.substr(0, end));
         lines.remove_prefix(end == std::string_view::npos ? lines.size() : end + 1);
         const std::size_t equals = line.find('=');
         if (equals != std::string_view::npos && numberOf(line.substr(0, equals)) == id) {
-            return trimmed(line.substr(equals + 1));
+            return base::trimmed(line.substr(equals + 1));
         }
     }
     return {};

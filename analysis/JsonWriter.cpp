@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "analysis/JsonWriter.h"
+#include "base/Utf8.h"
 
 #include <algorithm>
 #include <array>
@@ -7,8 +8,6 @@
 #include <cmath>
 #include <cstring>
 #include <utility>
-
-#include "analysis/BoundaryText.h"
 
 namespace analysis {
 namespace {
@@ -193,7 +192,7 @@ void JsonWriter::key(std::string_view name) {
     m_afterKey = true;
 }
 
-void JsonWriter::escaped(int character) {
+void JsonWriter::escaped(char32_t character) {
     constexpr char hex[] = "0123456789abcdef";
     const auto unit = [&](unsigned u) {
         const char text[] = {'\\',       'u', hex[u >> 12], hex[u >> 8 & 15], hex[u >> 4 & 15],
@@ -245,8 +244,10 @@ void JsonWriter::text(std::string_view utf8) {
             break;
         }
         if (!needsNoEscape(*from)) {
-            const int character = decodeUtf8(from, end);
-            escaped(character < 0 ? 0xFFFD : character);
+            std::string_view rest(from, static_cast<std::size_t>(end - from));
+            const auto character = base::takeUtf8(rest);
+            from = character ? rest.data() : from + 1;
+            escaped(character.value_or(0xFFFD));
         }
     }
     room(1);

@@ -64,7 +64,7 @@ class JsonWriter {
     void open(char bracket);
     void close(char bracket);
     void plain(const char*& from, const char* end);
-    void escaped(int character);
+    void escaped(char32_t character);
 
     std::wstring m_text;
     std::array<char, blockSize + mostRoom> m_block;

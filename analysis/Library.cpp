@@ -5,7 +5,6 @@
 #include <utility>
 
 #include "ExitCodes.h"
-#include "analysis/BoundaryText.h"
 #include "analysis/Comparison.h"
 #include "analysis/Instruments.h"
 #include "analysis/Judgement.h"
@@ -15,6 +14,7 @@
 #include "analysis/Presets.h"
 #include "analysis/ResultJson.h"
 #include "analysis/Status.h"
+#include "base/WideBytes.h"
 #include "colour/ColourFile.h"
 #include "job/AnalysisLibrary.h"
 #include "job/JobRecords.h"
@@ -48,7 +48,8 @@ Result orEmpty(Work work) noexcept {
 int validate(const std::wstring& path) {
     colour::ColourFile file;
     const colour::CgatsWants wants{.spectra = false};
-    if (const int status = statusOf(colour::loadColourFile(narrowed(path), wants, file))) {
+    if (const int status =
+            statusOf(colour::loadColourFile(base::bytesFromWide(path), wants, file))) {
         return status;
     }
     // A text serves as target or measurement by its colours, as reference or patch set by its inks.
@@ -122,7 +123,7 @@ int analyzeMeasurements(std::wstring target, std::wstring measurement, std::wstr
 int parsePresetParameterXMLFile(std::wstring path, tolerancePresetParameterRecord* tolerance,
                                 bool keepJobChoice) {
     return guarded([&]() -> int {
-        return tolerance ? readPreset(narrowed(path), keepJobChoice, *tolerance)
+        return tolerance ? readPreset(base::bytesFromWide(path), keepJobChoice, *tolerance)
                          : exitInternalFailure;
     });
 }
@@ -133,8 +134,10 @@ int validateInputFile(std::wstring path) {
 
 int writeLabFromReferencesAndICCProfile(std::wstring reference, std::wstring profile,
                                         std::wstring output) {
-    return guarded(
-        [&] { return writeLab(narrowed(reference), narrowed(profile), narrowed(output)); });
+    return guarded([&] {
+        return writeLab(base::bytesFromWide(reference), base::bytesFromWide(profile),
+                        base::bytesFromWide(output));
+    });
 }
 
 std::wstring getJsonMetaFileString(KZJobDataStruct* job) {
@@ -142,15 +145,16 @@ std::wstring getJsonMetaFileString(KZJobDataStruct* job) {
 }
 
 wxString GetInstrumentNameFromID(unsigned int deviceID) {
-    return orEmpty<wxString>([&] { return wxString(widened(instrumentName(deviceID))); });
+    return orEmpty<wxString>(
+        [&] { return wxString(base::wideFromBytes(instrumentName(deviceID))); });
 }
 
 int getDeviceNameFromIt8ControlStripFile(wxString path, wxString* name) {
     return guarded([&] {
         std::string found;
-        const int status = instrumentOfDefinition(narrowed(path.ToStdWstring()), found);
+        const int status = instrumentOfDefinition(base::bytesFromWide(path.ToStdWstring()), found);
         if (status == exitDone && name) {
-            *name = wxString(widened(found));
+            *name = wxString(base::wideFromBytes(found));
         }
         return status;
     });
@@ -163,9 +167,9 @@ void getLibVersion(unsigned int& major, unsigned int& minor, unsigned int& patch
 }
 
 std::wstring stringToWstring(const std::string& text) {
-    return orEmpty<std::wstring>([&] { return widened(text); });
+    return orEmpty<std::wstring>([&] { return base::wideFromBytes(text); });
 }
 
 std::string wstringToString(const std::wstring& text) {
-    return orEmpty<std::string>([&] { return narrowed(text); });
+    return orEmpty<std::string>([&] { return base::bytesFromWide(text); });
 }

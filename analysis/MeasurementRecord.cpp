@@ -2,6 +2,7 @@
 #include "analysis/MeasurementRecord.h"
 
 #include <algorithm>
+#include <cstdlib>
 #include <new>
 #include <utility>
 
@@ -13,12 +14,12 @@ using colour::SpectralAxis;
 
 /// Zeroed memory for an array that will be freed with free().
 template<class T>
-std::unique_ptr<T[], Free> allocate(std::size_t count) {
+base::Malloced<T[]> allocate(std::size_t count) {
     auto* const memory = static_cast<T*>(std::calloc(std::max<std::size_t>(count, 1), sizeof(T)));
     if (!memory) {
         throw std::bad_alloc();
     }
-    return std::unique_ptr<T[], Free>(memory);
+    return base::Malloced<T[]>(memory);
 }
 
 /// Which values of a long spectrum make a short one.

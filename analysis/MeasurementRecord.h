@@ -2,25 +2,19 @@
 // The measured patches as the job's record holds them.
 #pragma once
 
-#include <cstdlib>
-#include <memory>
-
 #include "analysis/Comparison.h"
+#include "base/Malloc.h"
 #include "job/JobRecords.h"
 
 namespace analysis {
 
-struct Free {
-    void operator()(void* memory) const { std::free(memory); }
-};
-
 /// The arrays of a record before it takes them over.
 struct MeasuredPatches {
     int count = 0;
-    std::unique_ptr<double[], Free> xyz;
-    std::unique_ptr<double[], Free> lab;
-    std::unique_ptr<double[], Free> cmyk;
-    std::unique_ptr<spectralRow[], Free> spectral; ///< Null without spectra that fit.
+    base::Malloced<double[]> xyz;
+    base::Malloced<double[]> lab;
+    base::Malloced<double[]> cmyk;
+    base::Malloced<spectralRow[]> spectral; ///< Null without spectra that fit.
 };
 
 /// Gathers the measurement of a comparison: all its patches in its own order, or with a patch set

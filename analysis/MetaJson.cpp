@@ -5,8 +5,8 @@
 
 #include <nlohmann/json.hpp>
 
-#include "analysis/BoundaryText.h"
 #include "analysis/Version.h"
+#include "base/WideBytes.h"
 #include "colour/Difference.h"
 
 namespace analysis {
@@ -16,7 +16,7 @@ using Json = nlohmann::ordered_json;
 
 /// Absent texts are null, so that a page needs one test.
 Json optional(const wxString& text) {
-    return text.empty() ? Json() : Json(documentText(text.ToStdWstring()));
+    return text.empty() ? Json() : Json(base::utf8FromWide(text.ToStdWstring()));
 }
 
 /// Local time with its distance from UTC: 2024-05-01T12:34:56+02:00.
@@ -32,7 +32,7 @@ std::string now() {
 
 /// A file in the job's folder, where the flow puts the texts of a run.
 Json inFolder(const wxString& folder, const char* name) {
-    return folder.empty() ? Json() : Json(documentText(folder.ToStdWstring()) + "/" + name);
+    return folder.empty() ? Json() : Json(base::utf8FromWide(folder.ToStdWstring()) + "/" + name);
 }
 
 Json jobOf(const KZJobDataStruct& job) {

@@ -12,9 +12,9 @@ namespace analysis {
 /// Makes `bytes` the contents of the file at `path` (bytes as the file system has them).
 ///
 /// A file is written under another name in the same folder and renamed, keeping the old one's mode.
-/// A link, device or pipe, or a file in a folder that takes no other name, is written in place;
-/// room for a regular file is reserved first, so that a full disk leaves it as it was. Gives 0, 50
-/// (can't be created or written to) or 51 (could not be written to its end).
+/// A link, device or pipe, or a file in a folder that takes no other name, is written in place; if
+/// that fails, a regular file gets its old contents back. Gives 0, 50 (can't be created or written
+/// to) or 51 (could not be written to its end).
 int writeOutputFile(const std::string& path, std::string_view bytes);
 
 /// Whether a CGATS text may be written to `path`: 0, 52 (a regular file that is one of `inputs`,

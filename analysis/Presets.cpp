@@ -38,8 +38,10 @@
 #include <pugixml.hpp>
 
 #include "ExitCodes.h"
-#include "analysis/BoundaryText.h"
 #include "analysis/Criteria.h"
+#include "base/Trim.h"
+#include "base/Utf8.h"
+#include "base/WideBytes.h"
 #include "colour/ColourFile.h"
 #include "colour/Difference.h"
 
@@ -60,7 +62,7 @@ using Status = int; // of ExitCodes.h; exitDone goes on
 /// A number with a decimal point, whatever the locale, within its range.
 template<class Number>
 Status readNumber(std::string_view text, Number smallest, Number largest, Number& number) {
-    text = trimmed(text);
+    text = base::trimmed(text);
     if (text.empty()) {
         return exitPresetValueMissing;
     }
@@ -81,7 +83,7 @@ Status readNumber(std::string_view text, Number smallest, Number largest, Number
 }
 
 Status readSwitch(std::string_view text, int& value) {
-    text = trimmed(text);
+    text = base::trimmed(text);
     if (text.empty()) {
         return exitPresetValueMissing;
     }
@@ -94,7 +96,7 @@ Status readSwitch(std::string_view text, int& value) {
 
 Status readFormula(std::string_view text, int& number) {
     using colour::Formula;
-    text = trimmed(text);
+    text = base::trimmed(text);
     if (text.empty()) {
         return exitPresetValueMissing;
     }
@@ -108,20 +110,15 @@ Status readFormula(std::string_view text, int& number) {
     return exitPresetOutOfRange;
 }
 
-bool isUtf8(const std::wstring& widenedText) {
-    const auto isStrayByte = [](wchar_t unit) { return unit >= 0xDC80 && unit <= 0xDCFF; };
-    return std::none_of(widenedText.begin(), widenedText.end(), isStrayByte);
-}
-
 Status readName(std::string_view text, wxString& name) {
-    const std::wstring wide = widened(trimmed(text));
-    if (wide.empty()) {
+    text = base::trimmed(text);
+    if (text.empty()) {
         return exitPresetValueMissing;
     }
-    if (!isUtf8(wide)) {
+    if (!base::isUtf8(text)) {
         return exitPresetNotXml;
     }
-    name = wxString(wide);
+    name = wxString(base::wideFromBytes(text));
     return exitDone;
 }
 
@@ -138,13 +135,13 @@ Status readInks(std::string_view text, std::vector<std::string>& inks) {
     std::vector<std::string> names;
     for (bool more = true; more;) {
         const std::size_t comma = text.find(',');
-        const std::string_view name = trimmed(text.substr(0, comma));
+        const std::string_view name = base::trimmed(text.substr(0, comma));
         more = comma != text.npos;
         text.remove_prefix(more ? comma + 1 : 0);
         if (name.empty()) {
             return exitPresetValueMissing;
         }
-        if (!isUtf8(widened(name))) {
+        if (!base::isUtf8(name)) {
             return exitPresetNotXml;
         }
         const auto isControl = [](char c) { return static_cast<unsigned char>(c) < ' '; };
@@ -177,7 +174,7 @@ Status readInks(std::string_view text, std::vector<std::string>& inks) {
 template<class Choice, std::size_t count>
 Status readChoice(std::string_view text, const char* (*nameOf)(Choice),
                   const Choice (&choices)[count], Choice& choice) {
-    text = trimmed(text);
+    text = base::trimmed(text);
     if (text.empty()) {
         return exitPresetValueMissing;
     }
@@ -513,7 +510,7 @@ Status readRoot(const pugi::xml_node& root, Preset& preset, Finding& finding) {
             status = textOf(found[i], text, finding);
         }
         if (status == exitDone) {
-            status = finding.at(fields[i].read(text, preset), found[i], trimmed(text));
+            status = finding.at(fields[i].read(text, preset), found[i], base::trimmed(text));
         }
         if (status != exitDone) {
             return status;
@@ -521,7 +518,7 @@ Status readRoot(const pugi::xml_node& root, Preset& preset, Finding& finding) {
         const bool isUnmeetable = preset.options.conditionRequired &&
                                   preset.illuminationCondition > largestMeasuringCondition;
         if (isUnmeetable) {
-            return finding.at(exitPresetOutOfRange, found[i], trimmed(text));
+            return finding.at(exitPresetOutOfRange, found[i], base::trimmed(text));
         }
     }
     return criteriaSection ? readCriteria(criteriaSection, preset, finding)
@@ -708,14 +705,14 @@ int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParam
     }
     take(read, keepJobChoice, preset);
     if (preset.filePath.empty()) {
-        preset.filePath = wxString(widened(path));
+        preset.filePath = wxString(base::wideFromBytes(path));
     }
-    lastRead() = {narrowed(preset.filePath.ToStdWstring()), read.options};
+    lastRead() = {base::bytesFromWide(preset.filePath.ToStdWstring()), read.options};
     return exitDone;
 }
 
 int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOptions& options) {
-    const std::string path = narrowed(preset.filePath.ToStdWstring());
+    const std::string path = base::bytesFromWide(preset.filePath.ToStdWstring());
     if (path.empty() || path == lastRead().path) {
         options = path.empty() ? PresetOptions() : lastRead().options;
         return exitDone;

@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "analysis/ResultJson.h"
 
-#include "analysis/BoundaryText.h"
 #include "analysis/InkNames.h"
 #include "analysis/JsonWriter.h"
 #include "analysis/MeasuresJson.h"
 #include "analysis/Version.h"
+#include "base/WideBytes.h"
 #include "colour/Identity.h"
 
 namespace analysis {
@@ -47,8 +47,8 @@ void writePreset(JsonWriter& json, const tolerancePresetParameterRecord& preset,
     json.key("preset");
     json.beginObject();
     json.member("id", std::int64_t{preset.presetID});
-    json.member("name", documentText(preset.name.ToStdWstring()));
-    json.member("file", documentText(preset.filePath.ToStdWstring()));
+    json.member("name", base::utf8FromWide(preset.name.ToStdWstring()));
+    json.member("file", base::utf8FromWide(preset.filePath.ToStdWstring()));
     json.member("psd", preset.fograPSDPreset > 0);
     json.member("illuminationCondition", std::int64_t{preset.illuminationCondition});
     json.member("conditionRequired", options.conditionRequired);
@@ -79,7 +79,7 @@ void writeInput(JsonWriter& json, const char* key, const Input& input) {
     }
     const bool isTarget = std::string_view(key) == "target";
     json.beginObject();
-    json.member("path", documentText(input.path));
+    json.member("path", base::utf8FromWide(input.path));
     json.member("kind", input.file.profile ? "profile" : "text");
     if (isTarget) {
         optionalMember(json, "identity", identityOf(input.file));

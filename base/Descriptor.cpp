@@ -37,4 +37,19 @@ std::size_t writeAll(const Descriptor& file, std::string_view bytes) {
     return done;
 }
 
+std::ptrdiff_t readAll(const Descriptor& file, char* to, std::size_t size) {
+    std::size_t done = 0;
+    while (done < size) {
+        const ssize_t count = ::read(file.get(), to + done, size - done);
+        if (count < 0 && errno != EINTR) {
+            return -1;
+        }
+        if (count == 0) {
+            break;
+        }
+        done += count > 0 ? static_cast<std::size_t>(count) : 0;
+    }
+    return static_cast<std::ptrdiff_t>(done);
+}
+
 } // namespace base

@@ -32,4 +32,8 @@ class Descriptor {
 /// written: all of them, or fewer with errno set.
 std::size_t writeAll(const Descriptor& file, std::string_view bytes);
 
+/// Reads up to `size` bytes, however many calls it takes. Returns their number, which is smaller
+/// only at the end; -1 with errno set for a failure.
+std::ptrdiff_t readAll(const Descriptor& file, char* to, std::size_t size);
+
 } // namespace base

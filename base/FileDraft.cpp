@@ -8,13 +8,12 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
-#include "base/Malloc.h"
-
 namespace base {
 namespace {
 
 std::string folderOf(const std::string& path) {
-    return path.substr(0, path.rfind('/') + 1);
+    const std::string folder = path.substr(0, path.rfind('/') + 1);
+    return folder.empty() ? "./" : folder;
 }
 
 mode_t usualMode() {
@@ -25,27 +24,34 @@ mode_t usualMode() {
 
 /// The new name must survive a loss of power as well as the content.
 bool flushFolder(const std::string& path) {
-    const std::string folder = folderOf(path);
-    const Descriptor descriptor(
-        open(folder.empty() ? "." : folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const Descriptor folder(open(folderOf(path).c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     // Not a failure: an unreadable folder, or a file system that does not flush folders.
-    return !descriptor.isOpen() || fsync(descriptor.get()) == 0 || errno == EINVAL;
+    return !folder.isOpen() || fsync(folder.get()) == 0 || errno == EINVAL;
+}
+
+bool isUnsupported() {
+    return errno == ENOSYS || errno == EPERM;
 }
 
 } // namespace
 
 FileDraft::FileDraft(const std::string& target)
-    : m_path(folderOf(target) + ".tintgate-new-XXXXXX") {
-    m_file = Descriptor(mkostemp(m_path.data(), O_CLOEXEC));
-    if (!m_file.isOpen()) {
-        m_path.clear();
-    } else if (fchmod(m_file.get(), usualMode()) != 0 && errno != ENOSYS && errno != EPERM) {
+    : m_prefix(folderOf(target) + ".tintgate-new-"),
+      m_file(open(folderOf(target).c_str(), O_TMPFILE | O_RDWR | O_CLOEXEC, 0666)),
+      m_path("/proc/self/fd/" + std::to_string(m_file.get())) {
+    // A name is given to the file by way of /proc.
+    if (!m_file.isOpen() || access(m_path.c_str(), F_OK) != 0) {
+        m_path = m_prefix + "XXXXXX";
+        m_file = Descriptor(mkostemp(m_path.data(), O_CLOEXEC));
+        m_hasName = m_file.isOpen();
+    }
+    if (m_file.isOpen() && fchmod(m_file.get(), usualMode()) != 0 && !isUnsupported()) {
         m_file.close();
     }
 }
 
 FileDraft::~FileDraft() {
-    if (!m_path.empty()) {
+    if (m_hasName) {
         const int reason = errno;
         unlink(m_path.c_str());
         errno = reason;
@@ -59,34 +65,47 @@ bool FileDraft::write(std::string_view bytes) const {
 bool FileDraft::keepAccessOf(const std::string& old) const {
     struct stat status = {};
     if (stat(old.c_str(), &status) != 0) {
-        return false;
+        return errno == ENOENT;
     }
     // In this order, because changing the owner clears the set-user-ID and set-group-ID bits.
     static_cast<void>(fchown(m_file.get(), status.st_uid, status.st_gid) == 0);
-    return fchmod(m_file.get(), status.st_mode & 07777) == 0 || errno == ENOSYS || errno == EPERM;
+    return fchmod(m_file.get(), status.st_mode & 07777) == 0 || isUnsupported();
 }
 
-bool FileDraft::finish() {
-    return m_file.isOpen() && fsync(m_file.get()) == 0 && m_file.close();
+/// Nothing replaces a file by one without a name.
+bool FileDraft::giveOwnName() {
+    for (int attempt = 0; !m_hasName; ++attempt) {
+        const std::string name =
+            m_prefix + std::to_string(getpid()) + "-" + std::to_string(attempt);
+        if (linkat(AT_FDCWD, m_path.c_str(), AT_FDCWD, name.c_str(), AT_SYMLINK_FOLLOW) == 0) {
+            m_path = name;
+            m_hasName = true;
+        } else if (errno != EEXIST) {
+            return false;
+        }
+    }
+    return true;
 }
 
-bool FileDraft::replace(const std::string& target) {
-    if (!finish() || std::rename(m_path.c_str(), target.c_str()) != 0) {
+bool FileDraft::replace(const std::string& target, Flush flush) {
+    if (!m_file.isOpen() || (flush == Flush::Yes && fsync(m_file.get()) != 0) || !giveOwnName() ||
+        !m_file.close() || std::rename(m_path.c_str(), target.c_str()) != 0) {
         return false;
     }
-    m_path.clear();
-    return flushFolder(target);
+    m_hasName = false;
+    return flush == Flush::No || flushFolder(target);
 }
 
 bool FileDraft::nameFresh(const std::string& target) {
-    if (m_file.isOpen() && !finish()) {
+    if (!m_file.isOpen() || fsync(m_file.get()) != 0) {
         return false;
     }
-    if (renameat2(AT_FDCWD, m_path.c_str(), AT_FDCWD, target.c_str(), RENAME_NOREPLACE) != 0) {
-        if (errno != EINVAL && errno != ENOSYS) {
+    const int flags = m_hasName ? 0 : AT_SYMLINK_FOLLOW;
+    if (linkat(AT_FDCWD, m_path.c_str(), AT_FDCWD, target.c_str(), flags) != 0) {
+        if (!m_hasName || !(isUnsupported() || errno == EOPNOTSUPP)) {
             return false;
         }
-        // This file system has no renameat2 flags, so the name is reserved first.
+        // This file system has no links, so the name is reserved first.
         const Descriptor place(open(target.c_str(), O_WRONLY | O_CREAT | O_EXCL | O_CLOEXEC, 0600));
         if (!place.isOpen()) {
             return false;
@@ -97,21 +116,11 @@ bool FileDraft::nameFresh(const std::string& target) {
             errno = reason;
             return false;
         }
+    } else if (m_hasName) {
+        unlink(m_path.c_str());
     }
-    m_path.clear();
-    return flushFolder(target);
-}
-
-bool writeWholeFile(const std::string& path, std::string_view bytes) {
-    const Malloced<char> real(realpath(path.c_str(), nullptr));
-    const bool exists = real != nullptr;
-    if (!exists && errno != ENOENT) {
-        return false;
-    }
-    const std::string target = exists ? real.get() : path;
-    FileDraft draft(target);
-    return draft.isOpen() && draft.write(bytes) && (!exists || draft.keepAccessOf(target)) &&
-           draft.replace(target);
+    m_hasName = false;
+    return m_file.close() && flushFolder(target);
 }
 
 } // namespace base

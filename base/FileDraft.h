@@ -5,15 +5,17 @@
 #include <string>
 #include <string_view>
 
-#include <sys/types.h>
-
 #include "base/Descriptor.h"
 
 namespace base {
 
-/// A file under a temporary name in its target's folder until it is complete. Its destructor
-/// removes a draft that was not renamed. A killed process leaves a draft called ".tintgate-new-"
-/// plus six characters.
+/// No is for working copies, which are fetched again after a loss of power. A flush takes
+/// milliseconds.
+enum class Flush { Yes, No };
+
+/// A file in its target's folder that has no name until it is complete, so that a killed process
+/// leaves nothing. On file systems without unnamed files it is called ".tintgate-new-" plus six
+/// characters; the destructor removes such a draft.
 ///
 /// Every member that fails sets errno.
 class FileDraft {
@@ -25,31 +27,27 @@ class FileDraft {
     FileDraft& operator=(const FileDraft&) = delete;
 
     bool isOpen() const { return m_file.isOpen(); }
-    /// For callers that write themselves. path() is valid until the draft is renamed.
-    const Descriptor& descriptor() const { return m_file; }
+    /// Opens the draft for callers that write themselves, until it is named.
     const std::string& path() const { return m_path; }
 
     bool write(std::string_view bytes) const;
 
     /// Copies the permissions of the file to be replaced and, if this process may change owners,
-    /// its owner. File systems without permissions are not a failure.
+    /// its owner. Not a failure: no such file, or a file system without permissions.
     bool keepAccessOf(const std::string& old) const;
 
-    /// Flushes the content to disk and renames the draft, replacing any file of that name.
-    bool replace(const std::string& target);
+    /// Flushes the content to disk and names the draft, replacing any file of that name.
+    bool replace(const std::string& target, Flush flush = Flush::Yes);
     /// Same if the name is free. Otherwise errno is EEXIST and the draft can try another name.
     bool nameFresh(const std::string& target);
 
   private:
-    bool finish();
+    bool giveOwnName();
 
-    std::string m_path; ///< Empty if there is no draft.
+    const std::string m_prefix; ///< Of temporary names.
     Descriptor m_file;
+    std::string m_path;
+    bool m_hasName = false; ///< Of its own, at m_path.
 };
-
-/// Writes a complete file. Regular and missing files are written as a draft that keeps the old
-/// file's access. Symbolic links are followed and remain links. Returns false with errno set on
-/// failure; the old file is then unchanged.
-bool writeWholeFile(const std::string& path, std::string_view bytes);
 
 } // namespace base

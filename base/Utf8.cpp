@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "base/Utf8.h"
 
+#include <algorithm>
 #include <iterator>
 
 namespace base {
@@ -13,6 +14,10 @@ constexpr struct {
     unsigned char lead;
     char32_t smallest;
 } sequences[] = {{0x80, 0x00, 0x0}, {0xE0, 0xC0, 0x80}, {0xF0, 0xE0, 0x800}, {0xF8, 0xF0, 0x10000}};
+
+constexpr bool continues(char byte) {
+    return (byte & 0xC0) == 0x80;
+}
 
 } // namespace
 
@@ -28,7 +33,7 @@ std::optional<char32_t> takeUtf8(std::string_view& text) {
         }
         char32_t c = lead & static_cast<unsigned char>(~form.mask);
         for (const char next : text.substr(1, following)) {
-            if ((next & 0xC0) != 0x80) {
+            if (!continues(next)) {
                 return std::nullopt;
             }
             c = c << 6 | (next & 0x3F);
@@ -49,6 +54,21 @@ bool isUtf8(std::string_view text) {
         }
     }
     return true;
+}
+
+std::size_t charactersIn(std::string_view text) {
+    return static_cast<std::size_t>(
+        std::count_if(text.begin(), text.end(), [](char byte) { return !continues(byte); }));
+}
+
+std::string_view cutUtf8(std::string_view text, std::size_t most) {
+    if (text.size() <= most) {
+        return text;
+    }
+    while (most > 0 && continues(text[most])) {
+        --most;
+    }
+    return text.substr(0, most);
 }
 
 void appendUtf8(std::string& text, char32_t c) {

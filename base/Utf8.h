@@ -2,6 +2,7 @@
 // UTF-8, character by character.
 #pragma once
 
+#include <cstddef>
 #include <optional>
 #include <string>
 #include <string_view>
@@ -20,6 +21,12 @@ std::optional<char32_t> takeUtf8(std::string_view& text);
 
 /// True if all of `text` is valid UTF-8. An empty text is.
 bool isUtf8(std::string_view text);
+
+/// The number of characters in valid UTF-8.
+std::size_t charactersIn(std::string_view text);
+
+/// The longest start of valid UTF-8 that has at most `most` bytes and no part of a character.
+std::string_view cutUtf8(std::string_view text, std::size_t most);
 
 /// Appends a character, for which isCharacter must be true.
 void appendUtf8(std::string& text, char32_t c);

@@ -4,6 +4,8 @@
 #include <algorithm>
 #include <cstring>
 
+#include "base/Utf8.h"
+
 namespace colour::cgats {
 
 namespace {
@@ -27,61 +29,9 @@ constexpr char16_t windowsSigns[32] = {
     0x2039, 0x0152, 0x008D, 0x017D, 0x008F, 0x0090, 0x2018, 0x2019, 0x201C, 0x201D, 0x2022,
     0x2013, 0x2014, 0x02DC, 0x2122, 0x0161, 0x203A, 0x0153, 0x009D, 0x017E, 0x0178};
 
-/// Length of the valid UTF-8 sequence at `at`, or 0. Surrogates and overflows are invalid.
-std::size_t sequenceLength(const char* at, const char* end) {
-    const auto byte = [&](std::size_t i) { return static_cast<unsigned char>(at[i]); };
-    const auto follows = [&](std::size_t i) { return (byte(i) & 0xC0) == 0x80; };
-    const auto left = static_cast<std::size_t>(end - at);
-    const unsigned char lead = byte(0);
-    if (lead < 0x80) {
-        return 1;
-    }
-    if (lead >= 0xC2 && lead <= 0xDF) {
-        return left >= 2 && follows(1) ? 2 : 0;
-    }
-    if (lead >= 0xE0 && lead <= 0xEF) {
-        if (left < 3 || !follows(1) || !follows(2)) {
-            return 0;
-        }
-        const bool overlong = lead == 0xE0 && byte(1) < 0xA0;
-        const bool surrogate = lead == 0xED && byte(1) > 0x9F;
-        return overlong || surrogate ? 0 : 3;
-    }
-    if (lead >= 0xF0 && lead <= 0xF4) {
-        if (left < 4 || !follows(1) || !follows(2) || !follows(3)) {
-            return 0;
-        }
-        const bool overlong = lead == 0xF0 && byte(1) < 0x90;
-        const bool tooHigh = lead == 0xF4 && byte(1) > 0x8F;
-        return overlong || tooHigh ? 0 : 4;
-    }
-    return 0;
-}
-
-bool isUtf8(std::string_view text) {
-    const char* at = text.data();
-    const char* const end = at + text.size();
-    while (at != end) {
-        const std::size_t length = sequenceLength(at, end);
-        if (length == 0) {
-            return false;
-        }
-        at += length;
-    }
-    return true;
-}
-
 /// Truncates a text that is too long, never inside a UTF-8 character.
 std::string_view bounded(std::string_view text) {
-    if (text.size() <= maxHeaderValue) {
-        return text;
-    }
-    std::size_t length = maxHeaderValue;
-    while (length > maxHeaderValue - 4 &&
-           (static_cast<unsigned char>(text[length]) & 0xC0) == 0x80) {
-        --length;
-    }
-    return text.substr(0, length);
+    return base::cutUtf8(text, maxHeaderValue);
 }
 
 std::string_view trimmed(std::string_view text, const CharTable& chars) {
@@ -286,7 +236,7 @@ bool isAscii(std::string_view text) {
 }
 
 std::string toUtf8(std::string_view text) {
-    if (isUtf8(text)) {
+    if (isAscii(text) || base::isUtf8(text)) {
         return std::string(text);
     }
     std::string result;
@@ -298,13 +248,7 @@ std::string toUtf8(std::string_view text) {
             continue;
         }
         const char16_t sign = byte < 0xA0 ? windowsSigns[byte - 0x80] : byte;
-        if (sign >= 0x800) {
-            result += static_cast<char>(0xE0 | (sign >> 12));
-            result += static_cast<char>(0x80 | ((sign >> 6) & 0x3F));
-        } else {
-            result += static_cast<char>(0xC0 | (sign >> 6));
-        }
-        result += static_cast<char>(0x80 | (sign & 0x3F));
+        base::appendUtf8(result, sign);
     }
     return result;
 }

@@ -29,9 +29,8 @@ Failure loadProfile(const std::string& path, Profile& profile);
 /// Same for the bytes of a file.
 Failure readColourFile(std::string_view bytes, const CgatsWants& wants, ColourFile& file);
 
-/// Whole contents of a file. Fails with Missing, Unreadable, TooLarge (above `limit`) or
-/// OutOfMemory. Devices and pipes are read to their end, up to 512 MB (TooLarge). A pipe is
-/// Unreadable if it is silent for 30 seconds, or if nobody opens it for writing within 2 seconds.
+/// base::readWholeFile with its outcome as a Failure: Missing, Unreadable, TooLarge (above `limit`)
+/// or OutOfMemory.
 Failure readWholeFile(const std::string& path, std::size_t limit, std::string& bytes);
 
 /// True unless `path` is a regular file with non-CGATS contents. False for an unreadable regular

@@ -8,6 +8,8 @@
 
 #include <lcms2.h>
 
+#include "base/Utf8.h"
+
 namespace colour {
 namespace {
 
@@ -64,24 +66,6 @@ bool isColour(const cmsCIELab& lab) {
     return std::abs(lab.L) < farOut && std::abs(lab.a) < farOut && std::abs(lab.b) < farOut;
 }
 
-void appendUtf8(std::string& text, std::uint32_t point) {
-    if (point < 0x80) {
-        text += static_cast<char>(point);
-    } else if (point < 0x800) {
-        text += static_cast<char>(0xC0 | point >> 6);
-        text += static_cast<char>(0x80 | (point & 0x3F));
-    } else if (point < 0x10000) {
-        text += static_cast<char>(0xE0 | point >> 12);
-        text += static_cast<char>(0x80 | (point >> 6 & 0x3F));
-        text += static_cast<char>(0x80 | (point & 0x3F));
-    } else {
-        text += static_cast<char>(0xF0 | point >> 18);
-        text += static_cast<char>(0x80 | (point >> 12 & 0x3F));
-        text += static_cast<char>(0x80 | (point >> 6 & 0x3F));
-        text += static_cast<char>(0x80 | (point & 0x3F));
-    }
-}
-
 /// The description in English, or else in the profile's first language. LittleCMS returns one
 /// UTF-16 unit per wide character; for older profiles it returns sign-extended bytes, which are
 /// read as Latin-1.
@@ -101,7 +85,7 @@ std::string descriptionOf(cmsHPROFILE profile) {
         } else if ((point >= 0xD800 && point < 0xE000) || point > 0x10FFFF) {
             point = 0xFFFD;
         }
-        appendUtf8(text, point);
+        base::appendUtf8(text, point);
     }
     return text;
 }

@@ -10,9 +10,8 @@
 #include <fstream>
 #include <utility>
 
-#include <sys/stat.h>
-#include <unistd.h>
-
+#include "base/FileDraft.h"
+#include "base/Utf8.h"
 #include "platform/TemporaryFolder.h"
 #include "store/WriteFailures.h"
 #include "store/tickets/TicketRecord.h"
@@ -22,62 +21,6 @@ namespace store {
 namespace {
 
 constexpr std::size_t longestAddress = 127;
-
-std::string utf8FromLatin1(const std::string& text) {
-    std::string utf8;
-    for (const unsigned char c : text) {
-        if (c < 0x80) {
-            utf8 += static_cast<char>(c);
-        } else {
-            utf8 += static_cast<char>(0xC0 | c >> 6);
-            utf8 += static_cast<char>(0x80 | (c & 0x3F));
-        }
-    }
-    return utf8;
-}
-
-/// Writes a local file under a temporary name in its folder until it is complete.
-class LocalCopy {
-  public:
-    explicit LocalCopy(const std::string& path)
-        : m_path(path), m_part(path.substr(0, path.rfind('/') + 1) + ".tintgate-part-XXXXXX") {
-        const int file = mkstemp(m_part.data());
-        if (file < 0) {
-            m_part.clear();
-            return;
-        }
-        // Gives it the usual permissions of a new file; mkstemp grants others none.
-        const mode_t mask = umask(0);
-        umask(mask);
-        fchmod(file, 0666 & ~mask);
-        close(file);
-        m_stream.open(m_part, std::ios::binary | std::ios::trunc);
-    }
-    ~LocalCopy() {
-        if (!m_part.empty()) {
-            std::remove(m_part.c_str());
-        }
-    }
-    LocalCopy(const LocalCopy&) = delete;
-    LocalCopy& operator=(const LocalCopy&) = delete;
-
-    bool isOpen() const { return m_stream.is_open(); }
-    std::ostream& stream() { return m_stream; }
-
-    bool putInPlace() {
-        m_stream.close();
-        if (!m_stream || std::rename(m_part.c_str(), m_path.c_str()) != 0) {
-            return false;
-        }
-        m_part.clear();
-        return true;
-    }
-
-  private:
-    const std::string m_path;
-    std::string m_part; ///< Empty if there is no temporary file.
-    std::ofstream m_stream;
-};
 
 template<class T>
 void put(void* to, const T& value) {
@@ -118,7 +61,7 @@ std::unique_ptr<StoreEngine> openStoreAt(const std::string& address) {
             throw;
         }
     }
-    return openStore(utf8FromLatin1(address));
+    return openStore(base::utf8FromLatin1(address));
 }
 
 Session::Session(std::string address, std::unique_ptr<StoreEngine> engine)
@@ -221,12 +164,14 @@ Code Session::getFile(const std::string& local, const std::string& server) {
     if (local.empty()) {
         return Code::Refused;
     }
-    LocalCopy copy(local);
-    if (!copy.isOpen()) {
+    base::FileDraft copy(local);
+    std::ofstream stream(copy.isOpen() ? copy.path() : "", std::ios::binary);
+    if (!stream) {
         return Code::NotWritten;
     }
-    m_engine->getFile(server, copy.stream());
-    return copy.putInPlace() ? Code::Done : Code::NotWritten;
+    m_engine->getFile(server, stream);
+    stream.close();
+    return stream && copy.replace(local, base::Flush::No) ? Code::Done : Code::NotWritten;
 }
 
 } // namespace store

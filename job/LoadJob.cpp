@@ -14,6 +14,7 @@
 
 #include "ExitCodes.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "base/Malloc.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "job/StripSources.h"
@@ -243,7 +244,7 @@ void KZVerifyJobProcessor::GetChildJobIDsFromParent(KZJobDataStruct* job) {
     int* listed = nullptr;
     int count = 0;
     const int code = m_connector->GetVerifierJobTicketIDs(&listed, &count, false);
-    const ticket::Block<int> ids(listed);
+    const base::Malloced<int[]> ids(listed);
     if (code != 0 || ids == nullptr || count < 1) {
         return;
     }

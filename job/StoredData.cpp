@@ -6,12 +6,12 @@
 #include <cstddef>
 #include <cstdint>
 #include <cstdlib>
-#include <memory>
 #include <span>
 #include <string>
 #include <string_view>
 #include <utility>
 
+#include "base/Malloc.h"
 #include "job/JobTicket.h"
 #include "job/KZVerifyJobProcessor.h"
 #include "jobkeys/PatchArrays.h"
@@ -23,20 +23,12 @@ namespace {
 
 using Columns = std::span<const char* const>;
 
-struct Freed {
-    void operator()(void* block) const { std::free(block); }
-};
-
-/// Memory that the record can take over.
-template<class T>
-using Block = std::unique_ptr<T[], Freed>;
-
 /// Rows of zeros; null where there is no memory for them.
 template<class T>
-Block<T> makeRows(int patches, std::size_t width) {
+base::Malloced<T[]> makeRows(int patches, std::size_t width) {
     const std::size_t count = static_cast<std::size_t>(patches) * std::max<std::size_t>(width, 1);
-    return Block<T>(patches > mostPatches ? nullptr
-                                          : static_cast<T*>(std::calloc(count, sizeof(T))));
+    return base::Malloced<T[]>(
+        patches > mostPatches ? nullptr : static_cast<T*>(std::calloc(count, sizeof(T))));
 }
 
 /// One data set of a job's strip.

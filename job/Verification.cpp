@@ -9,6 +9,7 @@
 
 #include "ExitCodes.h"
 #include "Shared-Components/Tintgate/NerovaKZComm/CKZConnector.h"
+#include "base/Malloc.h"
 #include "base/TextFile.h"
 #include "cli/CLogger.h"
 #include "job/KZVerifyJobProcessor.h"
@@ -139,7 +140,7 @@ int KZVerifyJobProcessor::VerifyKZJob(std::wstring host, std::wstring user, std:
     // Every log has this spelling (C17).
     CLogger::GetLogger()->Log("Veryfing Job ID = %s", wstringToString(jobID).c_str());
     int result = LoadKZJobData(id, &job);
-    const ticket::Block<int> children(job.childJobIDs);
+    const base::Malloced<int[]> children(job.childJobIDs);
     // wxMilliSleep would be interrupted by SIGCHLD.
     std::this_thread::sleep_for(pause);
     CLogger::GetLogger()->Log("LoadKZJobData returns = %d", result);
@@ -155,7 +156,7 @@ bool KZVerifyJobProcessor::IsListed(int jobID, bool remeasure) {
     int* listed = nullptr;
     int count = 0;
     const int code = m_connector->GetVerifierJobTicketIDs(&listed, &count, remeasure);
-    const ticket::Block<int> ids(listed);
+    const base::Malloced<int[]> ids(listed);
     return code == 0 && ids != nullptr &&
            std::find(listed, listed + count, jobID) != listed + count;
 }

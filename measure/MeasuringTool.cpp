@@ -3,7 +3,7 @@
 
 #include <filesystem>
 #include <fstream>
-#include <iterator>
+#include <limits>
 #include <string>
 #include <system_error>
 
@@ -11,6 +11,7 @@
 
 #include <wx/filename.h>
 
+#include "base/WholeFile.h"
 #include "job/JobRecords.h"
 #include "measure/DefinitionFile.h"
 #include "measure/Helper.h"
@@ -55,8 +56,7 @@ class ReplacedStrip {
         std::error_code ignored;
         m_isReplaced = fs::equivalent(m_path, measure::pathBytes(definition), ignored);
         if (m_isReplaced) {
-            std::ifstream file(m_path, std::ios::binary);
-            m_bytes.assign(std::istreambuf_iterator<char>(file), {});
+            base::readWholeFile(m_path, std::numeric_limits<std::size_t>::max(), m_bytes);
         }
     }
     ~ReplacedStrip() {

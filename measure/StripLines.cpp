@@ -4,27 +4,15 @@
 #include <algorithm>
 #include <limits>
 #include <string>
+#include <string_view>
 
+#include "base/Utf8.h"
 #include "measure/StripText.h"
 
 namespace {
 
 constexpr std::size_t longestLine = 511; ///< Bytes of a conditioned line.
 constexpr int noSuchFile = 10;           ///< A result code.
-
-/// The first bytes of a text as UTF-8, up to a NUL, and never half a character.
-std::string firstBytes(const wxString& text) {
-    std::string bytes = text.utf8_string();
-    std::size_t size = std::min({bytes.size(), bytes.find('\0'), longestLine});
-    const auto continuesAt = [&](std::size_t index) {
-        return index < bytes.size() && (static_cast<unsigned char>(bytes[index]) & 0xC0) == 0x80;
-    };
-    while (size > 0 && continuesAt(size)) {
-        --size;
-    }
-    bytes.resize(size);
-    return bytes;
-}
 
 } // namespace
 
@@ -40,7 +28,10 @@ bool findStringInFile(wxTextFile* file, wxString needle, wxString* line) {
 
 // The walk starts at an index that counts characters, and looks at bytes (C50).
 wxString StringConditioning(wxString line) {
-    std::string bytes = firstBytes(line);
+    const std::string utf8 = line.utf8_string();
+    // Up to a NUL, and never half a character.
+    std::string bytes(
+        base::cutUtf8(std::string_view(utf8).substr(0, utf8.find('\0')), longestLine));
     for (std::size_t end = std::min(line.length(), longestLine); end > 0; --end) {
         const bool isText = end <= bytes.size() && static_cast<signed char>(bytes[end - 1]) > 31;
         if (isText) {

@@ -2,51 +2,22 @@
 #include "measure/StripText.h"
 
 #include <algorithm>
-#include <cerrno>
+#include <limits>
 #include <string>
-
-#include <fcntl.h>
-#include <sys/stat.h>
-#include <unistd.h>
 
 #include <wx/convauto.h>
 
+#include "base/WholeFile.h"
 #include "measure/Paths.h"
 
 namespace measure {
-
-namespace {
-
-/// The bytes of a regular file; none if it can't be read to the length that it states.
-std::string bytesOf(const wxString& path) {
-    std::string bytes;
-    const int file = open(pathBytes(path).c_str(), O_RDONLY | O_CLOEXEC);
-    struct stat status {};
-    if (file >= 0 && fstat(file, &status) == 0) {
-        bytes.resize(static_cast<std::size_t>(status.st_size));
-    }
-    std::size_t used = 0;
-    while (used < bytes.size()) {
-        const ssize_t count = ::read(file, bytes.data() + used, bytes.size() - used);
-        if (count == 0 || (count < 0 && errno != EINTR)) {
-            break;
-        }
-        used += count > 0 ? static_cast<std::size_t>(count) : 0;
-    }
-    if (file >= 0) {
-        close(file);
-    }
-    bytes.resize(used);
-    return bytes;
-}
-
-} // namespace
 
 bool StripText::read(const wxString& path) {
     if (!fileExists(path)) {
         return false;
     }
-    const std::string bytes = bytesOf(path);
+    std::string bytes;
+    base::readWholeFile(pathBytes(path), std::numeric_limits<std::size_t>::max(), bytes);
     m_text = wxString(bytes.data(), wxConvAuto(), bytes.size());
     firstLine();
     return true;

@@ -5,13 +5,13 @@
 #include <cstdint>
 #include <ctime>
 #include <filesystem>
-#include <fstream>
 #include <limits>
 
 #include <plist/plist.h>
 
 #include "base/Malloc.h"
 #include "base/SharedObject.h"
+#include "base/WholeFile.h"
 
 namespace platform {
 
@@ -57,16 +57,13 @@ using OwnedText = base::Malloced<char>;
 
 std::optional<std::string> readFile(const std::string& path) {
     std::error_code failure;
-    if (!std::filesystem::is_regular_file(path, failure) ||
-        std::filesystem::file_size(path, failure) > largestFile) {
+    if (!std::filesystem::is_regular_file(path, failure)) {
         return std::nullopt;
     }
-    std::ifstream file(path, std::ios::binary);
-    std::string bytes{std::istreambuf_iterator<char>(file), {}};
-    if (!file) {
-        return std::nullopt;
-    }
-    return bytes;
+    std::string bytes;
+    return base::readWholeFile(path, largestFile, bytes) == base::Reading::Done
+               ? std::optional(std::move(bytes))
+               : std::nullopt;
 }
 
 std::optional<std::uint32_t> elementNumber(const std::string& name) {
@@ -183,7 +180,7 @@ std::optional<std::vector<std::string>> PropertyList::names(const Way& way) cons
     std::vector<std::string> names;
     plist_dict_iter iterator = nullptr;
     libPlist()->dict_new_iter(node, &iterator);
-    const std::unique_ptr<void, decltype(&std::free)> owner(iterator, std::free);
+    const base::Malloced<void> owner(iterator);
     for (;;) {
         char* name = nullptr;
         plist_t value = nullptr;

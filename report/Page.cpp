@@ -3,6 +3,7 @@
 
 #include <cmath>
 
+#include "base/Utf8.h"
 #include "report/Body.h"
 #include "report/InPage.h"
 #include "report/Template.h"
@@ -101,11 +102,7 @@ std::string shortened(std::string text) {
     if (text.size() <= longestText) {
         return text;
     }
-    std::size_t end = longestText;
-    while (end > 0 && (text[end] & 0xC0) == 0x80) {
-        --end;
-    }
-    return text.substr(0, end) + "…";
+    return std::string(base::cutUtf8(text, longestText)) + "…";
 }
 
 Json summaryJson(const Summary& summary) {

@@ -2,9 +2,6 @@
 // Creates and copies tables of parameter records and evaluates their results (C158).
 #pragma once
 
-#include <cstdlib>
-#include <memory>
-
 #include "ticket/ParameterRecords.h"
 
 /// True if every record of the table was carried out. True for an empty table, false for null.
@@ -41,13 +38,5 @@ inline constexpr unsigned long maxElements = 0x1000000;
 constexpr bool isValueType(PARAM_TYPE type) {
     return type >= PARAM_POINTER && type <= PARAM_UINT64 && type != PARAM_COUNT;
 }
-
-struct Free {
-    void operator()(void* block) const { std::free(block); }
-};
-
-/// Owns an array from malloc or calloc.
-template<class T>
-using Block = std::unique_ptr<T[], Free>;
 
 } // namespace ticket

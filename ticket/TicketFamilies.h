@@ -10,6 +10,7 @@
 #include <string>
 #include <vector>
 
+#include "base/Malloc.h"
 #include "ticket/ParameterTables.h"
 #include "ticket/TicketAccess.h"
 #include "ticket/TicketFilenames.h"
@@ -74,7 +75,7 @@ bool readVector(const Place& place, const char* key, std::vector<T>& out) {
     if (!place.get(key, PARAM_COUNT, &count, POSITION_WHOLE) || count == 0) {
         return false;
     }
-    const Block<GETMULTIPAR> table(NewGetMultipar(count, key, GetParamType<T>()));
+    const base::Malloced<GETMULTIPAR[]> table(NewGetMultipar(count, key, GetParamType<T>()));
     if (!table) {
         return false;
     }
@@ -140,7 +141,7 @@ bool readArray(const Place& place, const char* key, T* out, unsigned long count)
     if (count == 0) {
         return false;
     }
-    const Block<GETMULTIPAR> table(NewGetMultipar(count, key, GetParamType<T>()));
+    const base::Malloced<GETMULTIPAR[]> table(NewGetMultipar(count, key, GetParamType<T>()));
     if (!table) {
         return false;
     }
@@ -157,7 +158,7 @@ bool readArray(const Place& place, const char* key, bool* out, unsigned long cou
     if (count == 0) {
         return false;
     }
-    const Block<int> values(static_cast<int*>(std::calloc(count, sizeof(int))));
+    const base::Malloced<int[]> values(static_cast<int*>(std::calloc(count, sizeof(int))));
     if (!values || !readArray(place, key, values.get(), count)) {
         return false;
     }
@@ -175,7 +176,7 @@ bool writeElements(const Place& place, const char* key, const T* values, unsigne
         place.set(key, PARAM_DELETE, nullptr, POSITION_WHOLE);
         return true;
     }
-    const Block<SETMULTIPAR> table(NewSetMultipar(count, key, GetParamType<T>()));
+    const base::Malloced<SETMULTIPAR[]> table(NewSetMultipar(count, key, GetParamType<T>()));
     if (!table) {
         return false;
     }
@@ -228,7 +229,7 @@ bool writeArray(const Place& place, const char* key, const bool* values, unsigne
     if (count == 0) {
         return true;
     }
-    const Block<int> numbers(static_cast<int*>(std::calloc(count, sizeof(int))));
+    const base::Malloced<int[]> numbers(static_cast<int*>(std::calloc(count, sizeof(int))));
     if (!numbers) {
         return false;
     }

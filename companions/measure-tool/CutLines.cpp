@@ -15,6 +15,7 @@
 #include <string_view>
 #include <vector>
 
+#include "base/Trim.h"
 #include "colour/CgatsColumns.h"
 #include "companions/measure-tool/Failure.h"
 
@@ -49,16 +50,11 @@ bool isRow(const std::string& line) {
     return first != line.npos && line[first] != '#';
 }
 
-std::string_view trimmed(std::string_view text) {
-    const std::size_t first = std::min(text.find_first_not_of(blanks), text.size());
-    return text.substr(first, text.find_last_not_of(blanks) + 1 - first);
-}
-
 Cells cellsByTabs(std::string_view line) {
     Cells cells;
     for (std::size_t at = 0, end = 0; end != line.npos; at = end + 1) {
         end = line.find('\t', at);
-        cells.push_back(trimmed(line.substr(at, end == line.npos ? end : end - at)));
+        cells.push_back(base::trimmed(line.substr(at, end == line.npos ? end : end - at)));
     }
     return cells;
 }

@@ -16,6 +16,7 @@
 #include <string_view>
 #include <utility>
 
+#include "base/Trim.h"
 #include "colour/ColourFile.h"
 #include "companions/measure-tool/Failure.h"
 #include "platform/SystemRoot.h"
@@ -31,13 +32,6 @@ constexpr std::size_t lastPatch = 10'000'000;
 
 /// Some editors write it at the start of UTF-8 files.
 constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF";
-
-std::string_view trimmed(std::string_view text) {
-    constexpr const char* blanks = " \t\r";
-    const std::size_t first = text.find_first_not_of(blanks);
-    return first == text.npos ? std::string_view()
-                              : text.substr(first, text.find_last_not_of(blanks) - first + 1);
-}
 
 template<class Number>
 bool readNumber(std::string_view text, Number least, Number most, Number& number) {
@@ -64,14 +58,14 @@ bool readTime(std::string_view text, int most, Unit& time) {
 
 bool readLab(std::string_view text, colour::Lab& lab) {
     for (double* value : {&lab.L, &lab.a, &lab.b}) {
-        text = trimmed(text);
+        text = base::trimmed(text);
         const std::string_view number = text.substr(0, text.find_first_of(" \t"));
         if (!readNumber(number, -largestError, largestError, *value)) {
             return false;
         }
         text.remove_prefix(number.size());
     }
-    return trimmed(text).empty();
+    return base::trimmed(text).empty();
 }
 
 template<class Value, std::size_t N>
@@ -150,7 +144,7 @@ const Entry* entryOf(std::string_view name) {
 
 /// Describes an error in a line. Empty if there is none.
 std::string readLine(std::string_view line, Settings& settings, std::set<const Entry*>& seen) {
-    line = trimmed(line);
+    line = base::trimmed(line);
     if (line.empty() || line.front() == '#') {
         return {};
     }
@@ -158,7 +152,7 @@ std::string readLine(std::string_view line, Settings& settings, std::set<const E
     if (equals == line.npos) {
         return "has no =";
     }
-    const std::string name(trimmed(line.substr(0, equals)));
+    const std::string name(base::trimmed(line.substr(0, equals)));
     const Entry* const entry = entryOf(name);
     if (entry == nullptr) {
         return "names \"" + name + "\", which is not a setting";
@@ -166,7 +160,7 @@ std::string readLine(std::string_view line, Settings& settings, std::set<const E
     if (!seen.insert(entry).second) {
         return "repeats " + name;
     }
-    return entry->read(trimmed(line.substr(equals + 1)), settings)
+    return entry->read(base::trimmed(line.substr(equals + 1)), settings)
                ? std::string()
                : "requires " + std::string(entry->expected) + " for " + name;
 }

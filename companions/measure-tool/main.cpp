@@ -5,9 +5,11 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include <cerrno>
 #include <chrono>
 #include <cstdio>
 #include <cstdlib>
+#include <cstring>
 #include <filesystem>
 #include <memory>
 #include <new>
@@ -17,6 +19,7 @@
 #include <system_error>
 #include <vector>
 
+#include "base/WholeFile.h"
 #include "colour/CgatsText.h"
 #include "companions/measure-tool/Cancel.h"
 #include "companions/measure-tool/Definition.h"
@@ -30,7 +33,6 @@
 #include "companions/measure-tool/Settings.h"
 #include "companions/measure-tool/Text.h"
 #include "companions/measure-tool/VirtualInstrument.h"
-#include "report/PageFile.h"
 
 namespace {
 
@@ -140,9 +142,9 @@ void measure(const std::string& optionsFile, RunLog& log) {
         measurement.created = timeText(std::chrono::system_clock::now());
     }
     checkCancelled();
-    std::string problem;
-    if (!report::replacePage(options.output, colour::writeCgats(measurement), problem)) {
-        throw Failure(Status::NotWritten, "can't write " + options.output + ": " + problem);
+    if (!base::writeWholeFile(options.output, colour::writeCgats(measurement))) {
+        throw Failure(Status::NotWritten,
+                      "can't write " + options.output + ": " + std::strerror(errno));
     }
 }
 

@@ -5,7 +5,7 @@
 #include <vector>
 
 #include "ExitCodes.h"
-#include "analysis/BoundaryText.h"
+#include "base/WideBytes.h"
 #include "colour/Identity.h"
 #include "companions/tintgate-check/Problem.h"
 #include "companions/tintgate-check/Shelves.h"
@@ -139,7 +139,7 @@ void loadPreset(Aim& aim) {
 }
 
 void loadReferences(Aim& aim) {
-    const std::wstring target = analysis::widened(aim.targetPath);
+    const std::wstring target = base::wideFromBytes(aim.targetPath);
     const auto wants = analysis::targetWants(aim.wants, aim.measurementCondition);
     if (const int code = analysis::loadReferences(target, {}, wants, aim.references)) {
         failFile(Say::TargetTrouble, code, aim.targetPath);
@@ -151,7 +151,7 @@ void loadReferences(Aim& aim) {
     if (aim.patchSetPath.empty()) {
         return;
     }
-    aim.references.patchSetPath = analysis::widened(aim.patchSetPath);
+    aim.references.patchSetPath = base::wideFromBytes(aim.patchSetPath);
     if (const int code =
             analysis::loadPatchSet(aim.references.patchSetPath, aim.references.patchSet)) {
         failFile(Say::PatchSetTrouble, code, aim.patchSetPath);

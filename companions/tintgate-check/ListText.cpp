@@ -3,8 +3,8 @@
 
 #include <vector>
 
-#include "analysis/BoundaryText.h"
 #include "analysis/Presets.h"
+#include "base/WideBytes.h"
 #include "colour/ColourFile.h"
 #include "companions/tintgate-check/Shelves.h"
 #include "companions/tintgate-check/Words.h"
@@ -51,7 +51,7 @@ std::string presetsText(const Conditions& conditions, const Painter& paint) {
             lines.push_back(
                 {{entry.shortName, Tone::Bold},
                  {isSound ? std::to_string(preset.presetID) : "", Tone::Plain, true},
-                 {isSound ? analysis::documentText(preset.name.ToStdWstring()) : fault.description,
+                 {isSound ? base::utf8FromWide(preset.name.ToStdWstring()) : fault.description,
                   isSound ? Tone::Plain : Tone::Failed}});
         }
         text += section(say(Say::ListPresets, {folder}), lines, paint);

@@ -7,7 +7,8 @@
 #include <system_error>
 
 #include "ExitCodes.h"
-#include "base/FileDraft.h"
+#include "base/Utf8.h"
+#include "base/WholeFile.h"
 #include "companions/tintgate-check/Words.h"
 #include "report/OwnFile.h"
 
@@ -34,18 +35,6 @@ Kind kindOf(Output output) {
     return {".json", report::OwnKind::Result};
 }
 
-/// Names of files have at most 255 bytes; those of drafts are shorter. A name is cut between
-/// characters.
-std::string shortened(std::string name, std::size_t most) {
-    if (name.size() > most) {
-        while (most > 0 && (static_cast<unsigned char>(name[most]) & 0xC0) == 0x80) {
-            --most;
-        }
-        name.resize(most);
-    }
-    return name;
-}
-
 Problem notWritten(const std::string& path, int reason) {
     const Say remedy =
         reason == ENOSPC || reason == EDQUOT || reason == EFBIG  ? Say::OutputFullRemedy
@@ -70,7 +59,8 @@ std::string Outputs::pathOf(const Measurement& measurement, Output output,
     if (name.empty()) {
         name = "measurement";
     }
-    return place.parent_path() / (shortened(name, longestName - ending.size()) + ending);
+    return place.parent_path() /
+           std::string(base::cutUtf8(name, longestName - ending.size())).append(ending);
 }
 
 std::optional<Problem> Outputs::check(const Measurement& measurement, Output output,

@@ -9,7 +9,8 @@
 #include <sys/ioctl.h>
 #include <unistd.h>
 
-#include "analysis/BoundaryText.h"
+#include "base/Utf8.h"
+#include "base/WideBytes.h"
 #include "companions/tintgate-check/Words.h"
 #include "report/Model.h"
 
@@ -43,20 +44,14 @@ Mark markOf(Fate fate) {
     return {"!", Tone::Failed, Say::NotDone};
 }
 
-/// In characters.
-std::size_t widthOf(std::string_view text) {
-    return static_cast<std::size_t>(
-        std::count_if(text.begin(), text.end(), [](char byte) { return (byte & 0xC0) != 0x80; }));
-}
-
 std::string padded(std::string text, std::size_t width) {
-    const std::size_t has = widthOf(text);
+    const std::size_t has = base::charactersIn(text);
     return text.append(has < width ? width - has : 0, ' ');
 }
 
 /// Cut to so many characters, with "…" as the last one.
 std::string fitted(const std::string& text, std::size_t width) {
-    if (widthOf(text) <= width || width == 0) {
+    if (base::charactersIn(text) <= width || width == 0) {
         return text;
     }
     std::size_t at = 0;
@@ -84,7 +79,8 @@ std::string wrapped(const std::string& label, std::size_t indent, const std::str
     for (std::size_t start = 0; start < text.size();) {
         const std::size_t end = std::min(text.find(' ', start), text.size());
         const std::string word = text.substr(start, end - start);
-        if (!line.empty() && indent + widthOf(line) + 1 + widthOf(word) > width) {
+        if (!line.empty() &&
+            indent + base::charactersIn(line) + 1 + base::charactersIn(word) > width) {
             flush(false);
         }
         line += (line.empty() ? "" : " ") + word;
@@ -131,7 +127,7 @@ std::string criteriaText(const report::Model& model, const Painter& paint, std::
     for (std::size_t column = 0; column < 5; ++column) {
         std::size_t widest = 0;
         for (const auto& cells : lines) {
-            widest = std::max(widest, widthOf(cells[column].text));
+            widest = std::max(widest, base::charactersIn(cells[column].text));
         }
         used += widest + 2;
     }
@@ -198,7 +194,7 @@ std::vector<std::string> adviceOf(const Outcome& outcome, const Aim& aim, bool i
                             [&](const auto& c) { return c.name == name; });
     };
     if (analysis::isSameFile(aim.references.targetPath,
-                             analysis::widened(outcome.measurement.path))) {
+                             base::wideFromBytes(outcome.measurement.path))) {
         advice.push_back(say(Say::AdviceSameFile));
     } else if (isReferenceData) {
         advice.push_back(say(Say::AdviceSwapped, {outcome.measurement.path}));
@@ -298,7 +294,8 @@ std::string resultText(const Outcome& outcome, const Aim& aim, bool isReferenceD
 std::string reasonsText(const Problem& problem, const Painter& paint, std::size_t width,
                         std::size_t indent) {
     const std::size_t column =
-        indent + std::max(widthOf(say(Say::Cause)), widthOf(say(Say::Remedy))) + 2;
+        indent +
+        std::max(base::charactersIn(say(Say::Cause)), base::charactersIn(say(Say::Remedy))) + 2;
     std::string text;
     for (const auto& [label, words] :
          {std::pair(Say::Cause, problem.cause), std::pair(Say::Remedy, problem.remedy)}) {
@@ -353,7 +350,7 @@ std::string lineText(const Outcome& outcome, const Painter& paint, std::size_t w
                                                        : outcome.criterion + ", " + outcome.figures;
     const std::string name = padded(outcome.measurement.path, ofName);
     if (width != 0) {
-        const std::size_t used = 2 + ofWord + 2 + widthOf(name) + 2;
+        const std::size_t used = 2 + ofWord + 2 + base::charactersIn(name) + 2;
         reason = used + 12 < width ? fitted(reason, width - used) : reason;
     }
     return "  " + paint(mark.tone, padded(std::string(mark.sign) + ' ' + say(mark.word), ofWord)) +

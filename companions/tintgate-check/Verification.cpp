@@ -8,9 +8,9 @@
 #include <utility>
 
 #include "ExitCodes.h"
-#include "analysis/BoundaryText.h"
 #include "analysis/Judgement.h"
 #include "analysis/ResultJson.h"
+#include "base/WideBytes.h"
 #include "companions/tintgate-check/Words.h"
 #include "report/Model.h"
 #include "report/Page.h"
@@ -103,13 +103,13 @@ std::string jsonLine(const Aim& aim, const Outcome& outcome,
     constexpr std::size_t usualSize = 8192;
     analysis::JsonWriter json(usualSize);
     json.beginCompactObject();
-    json.member("file", analysis::documentText(analysis::widened(outcome.measurement.path)));
+    json.member("file", base::utf8FromWide(base::wideFromBytes(outcome.measurement.path)));
     nullable(json, "condition", aim.condition);
     writeError(json, outcome.problem);
     json.key("written");
     json.beginArray();
     for (const std::string& path : outcome.written) {
-        json.text(analysis::documentText(analysis::widened(path)));
+        json.text(base::utf8FromWide(base::wideFromBytes(path)));
     }
     json.endArray();
     if (findings) {
@@ -226,7 +226,7 @@ class Verifier {
     const std::string& path() const { return m_outcome.measurement.path; }
 
     bool compare(analysis::SharedFile file, analysis::Comparison& comparison) {
-        const std::wstring wide = analysis::widened(path());
+        const std::wstring wide = base::wideFromBytes(path());
         const analysis::SharedFile kept = file;
         if (const int code = analysis::compare(m_aim.references, wide, std::move(file), m_aim.wants,
                                                comparison)) {
@@ -312,7 +312,7 @@ Outcome verify(const Aim& aim, const Measurement& measurement, Outputs& outputs,
         return verifier.refuse(problemOfFolder(measurement.path));
     }
     return verifier.run([&](analysis::SharedFile& file) {
-        return analysis::loadSide(analysis::widened(measurement.path),
+        return analysis::loadSide(base::wideFromBytes(measurement.path),
                                   analysis::measurementWants(aim.wants, aim.measurementCondition),
                                   file);
     });
@@ -342,7 +342,7 @@ std::string brokenJson(const Aim& aim, const Outcome& outcome, const std::string
     json.beginObject();
     json.member("format", "tintgate-error");
     json.member("formatVersion", std::int64_t{1});
-    json.member("file", analysis::documentText(analysis::widened(outcome.measurement.path)));
+    json.member("file", base::utf8FromWide(base::wideFromBytes(outcome.measurement.path)));
     json.member("sha256", mark);
     nullable(json, "condition", aim.condition);
     writeError(json, outcome.problem);

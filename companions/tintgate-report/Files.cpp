@@ -10,7 +10,7 @@
 
 #include <sys/stat.h>
 
-#include "colour/ColourFile.h"
+#include "base/WholeFile.h"
 #include "companions/tintgate-report/Failure.h"
 #include "companions/tintgate-report/Filter.h"
 #include "report/OwnFile.h"
@@ -27,15 +27,13 @@ constexpr std::size_t mostBytes = std::size_t{1} << 30; ///< Of a result: millio
 
 std::string bytesOf(const std::string& path, std::size_t most = mostBytes) {
     std::string bytes;
-    switch (colour::readWholeFile(path == "-" ? "/dev/stdin" : path, most, bytes)) {
-    case colour::Failure::None:
+    switch (base::readWholeFile(path == "-" ? "/dev/stdin" : path, most, bytes)) {
+    case base::Reading::Done:
         return bytes;
-    case colour::Failure::Missing:
+    case base::Reading::Missing:
         throw Failure(Status::Unreadable, path + " is not there");
-    case colour::Failure::TooLarge:
+    case base::Reading::TooLarge:
         throw Failure(Status::Unreadable, path + " is too large");
-    case colour::Failure::OutOfMemory:
-        throw std::bad_alloc();
     default:
         throw Failure(Status::Unreadable, path + " can't be read");
     }
@@ -172,13 +170,8 @@ void writeOutput(const std::string& path, std::string_view text) {
     if (path == "-" || fs::is_other(fs::status(path, ignored))) {
         return writeInPlace(path, text);
     }
-    // A link stays one: what it leads to is replaced.
-    const fs::path target = fs::is_symlink(fs::symlink_status(path, ignored))
-                                ? fs::weakly_canonical(path, ignored)
-                                : fs::path(path);
-    std::string problem;
-    if (!report::replacePage(target.empty() ? path : target.string(), text, problem)) {
-        throw Failure(Status::NotWritten, path + " can't be written: " + problem);
+    if (!base::writeWholeFile(path, text)) {
+        throw Failure(Status::NotWritten, path + " can't be written: " + std::strerror(errno));
     }
 }
 

@@ -3,10 +3,10 @@
 
 #include <algorithm>
 #include <filesystem>
-#include <fstream>
-#include <sstream>
+#include <limits>
 #include <string_view>
 
+#include "base/WholeFile.h"
 #include "jobkeys/Tickets.h"
 
 namespace report {
@@ -24,9 +24,9 @@ bool isNumber(std::string_view text) {
 }
 
 std::string contentsOf(const std::string& path) {
-    std::ostringstream bytes;
-    bytes << std::ifstream(path, std::ios::binary).rdbuf();
-    return std::move(bytes).str();
+    std::string bytes;
+    base::readWholeFile(path, std::numeric_limits<std::size_t>::max(), bytes);
+    return bytes;
 }
 
 /// Empty where the link can't be read: another user's, or a process that has just ended.

@@ -6,16 +6,11 @@
 
 #include <unistd.h>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Bytes.h"
 
 namespace report {
 namespace {
-
-/// In characters, not bytes.
-std::size_t widthOf(std::string_view text) {
-    return static_cast<std::size_t>(
-        std::count_if(text.begin(), text.end(), [](char byte) { return (byte & 0xC0) != 0x80; }));
-}
 
 const char* sequenceOf(Tone tone) {
     switch (tone) {
@@ -57,7 +52,7 @@ std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter
     for (const auto& cells : lines) {
         widths.resize(std::max(widths.size(), cells.size()));
         for (std::size_t i = 0; i < cells.size(); ++i) {
-            widths[i] = std::max(widths[i], widthOf(admin::printable(cells[i].text)));
+            widths[i] = std::max(widths[i], base::charactersIn(admin::printable(cells[i].text)));
         }
     }
     std::string text;
@@ -65,7 +60,7 @@ std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter
         std::string line;
         for (std::size_t i = 0; i < cells.size(); ++i) {
             const Cell& cell = cells[i];
-            const std::size_t gap = widths[i] - widthOf(admin::printable(cell.text));
+            const std::size_t gap = widths[i] - base::charactersIn(admin::printable(cell.text));
             line +=
                 "  " + std::string(cell.toTheRight ? gap : 0, ' ') + paint(cell.tone, cell.text);
             if (!cell.toTheRight && i + 1 < cells.size()) {

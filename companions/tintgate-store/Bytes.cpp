@@ -4,6 +4,8 @@
 #include <cstdint>
 #include <cstdio>
 
+#include "base/Utf8.h"
+
 namespace admin {
 
 namespace {
@@ -11,48 +13,12 @@ namespace {
 constexpr std::string_view digits =
     "ABCDEFGHIJKLMNOPQRSTUVWXYZabcdefghijklmnopqrstuvwxyz0123456789+/";
 
-/// Bytes of the UTF-8 character in front, 0 if there is none.
-std::size_t leadingCharacter(std::string_view bytes) {
-    const auto at = [&](std::size_t i) {
-        return i < bytes.size() ? static_cast<unsigned char>(bytes[i]) : 0U;
-    };
-    const unsigned first = at(0);
-    if (bytes.empty() || first < 0x80) {
-        return bytes.empty() ? 0 : 1;
-    }
-    if (first < 0xC2 || first > 0xF4) {
-        return 0;
-    }
-    const std::size_t length = first < 0xE0 ? 2 : first < 0xF0 ? 3 : 4;
-    for (std::size_t i = 1; i < length; ++i) {
-        if ((at(i) & 0xC0) != 0x80) {
-            return 0;
-        }
-    }
-    const bool outside = (first == 0xE0 && at(1) < 0xA0) || (first == 0xED && at(1) > 0x9F) ||
-                         (first == 0xF0 && at(1) < 0x90) || (first == 0xF4 && at(1) > 0x8F);
-    return outside ? 0 : length;
-}
-
-/// Of one character: C0, C1 and DEL.
-bool isControl(std::string_view character) {
-    const auto first = static_cast<unsigned char>(character[0]);
-    return first < 0x20 || first == 0x7F ||
-           (first == 0xC2 && static_cast<unsigned char>(character[1]) < 0xA0);
+/// C0, C1 and DEL.
+bool isControl(char32_t character) {
+    return character < 0x20 || (character >= 0x7F && character < 0xA0);
 }
 
 } // namespace
-
-bool isUtf8(std::string_view bytes) {
-    while (!bytes.empty()) {
-        const std::size_t length = leadingCharacter(bytes);
-        if (length == 0) {
-            return false;
-        }
-        bytes.remove_prefix(length);
-    }
-    return true;
-}
 
 std::string toBase64(std::string_view bytes) {
     std::string text;
@@ -94,16 +60,17 @@ std::optional<std::string> fromBase64(std::string_view text) {
 }
 
 Json textOrBytes(const std::string& bytes) {
-    return isUtf8(bytes) ? Json(bytes) : Json{{"base64", toBase64(bytes)}};
+    return base::isUtf8(bytes) ? Json(bytes) : Json{{"base64", toBase64(bytes)}};
 }
 
 std::string printable(std::string_view bytes) {
     std::string text;
     while (!bytes.empty()) {
-        const std::size_t length = leadingCharacter(bytes);
-        if (length != 0 && !isControl(bytes)) {
-            text += bytes.substr(0, length);
-            bytes.remove_prefix(length);
+        std::string_view rest = bytes;
+        const auto character = base::takeUtf8(rest);
+        if (character && !isControl(*character)) {
+            base::appendUtf8(text, *character);
+            bytes = rest;
             continue;
         }
         char escaped[8];

@@ -12,10 +12,6 @@ namespace admin {
 
 using Json = nlohmann::json;
 
-/// Whether the bytes are UTF-8 as JSON has it: no surrogates, nothing above U+10FFFF, no overlong
-/// forms.
-bool isUtf8(std::string_view bytes);
-
 std::string toBase64(std::string_view bytes);
 /// Nothing for text that toBase64 would not have written.
 std::optional<std::string> fromBase64(std::string_view text);

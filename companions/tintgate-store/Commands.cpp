@@ -8,6 +8,7 @@
 
 #include <unistd.h>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Failure.h"
 
@@ -51,7 +52,7 @@ std::string completeAddress(const std::string& typed) {
     }
     // A login carries one byte for each character. Lead bytes from C4 on are those of others.
     const bool isLatin1 =
-        isUtf8(address) &&
+        base::isUtf8(address) &&
         std::all_of(address.begin(), address.end(), [](unsigned char byte) { return byte < 0xC4; });
     if (!isLatin1) {
         std::fprintf(stderr, "tintgate-store: warning: the store's address has characters that a "

@@ -9,6 +9,7 @@
 #include <termios.h>
 #include <unistd.h>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/LocalFile.h"
@@ -23,7 +24,7 @@ std::string narrowed(const std::string& typed, const std::string& what) {
     if (typed.empty()) {
         throw Failure(Status::BadInput, what + " is empty");
     }
-    if (!isUtf8(typed)) {
+    if (!base::isUtf8(typed)) {
         throw Failure(Status::BadInput, what + " is no UTF-8");
     }
     std::string bytes;
@@ -155,20 +156,6 @@ void refuseColon(const std::string& text, const std::string& what) {
 std::string newUserName(const std::string& typed) {
     refuseColon(typed, "the user's name");
     return userName(typed);
-}
-
-std::string shownName(const std::string& bytes) {
-    std::string text;
-    for (const char byte : bytes) {
-        const auto character = static_cast<unsigned char>(byte);
-        if (character < 0x80) {
-            text += byte;
-        } else {
-            text += static_cast<char>(0xC0 | character >> 6);
-            text += static_cast<char>(0x80 | (character & 0x3F));
-        }
-    }
-    return text;
 }
 
 std::string askPassword(const std::string& path, const std::string& user) {

@@ -17,9 +17,6 @@ std::string newUserName(const std::string& typed);
 /// Throws Failure (BadInput) if a name, a password or an address has a ":"; `what` names it.
 void refuseColon(const std::string& text, const std::string& what);
 
-/// As a person reads it.
-std::string shownName(const std::string& bytes);
-
 /// The password's bytes: the first line of a file ("-" is standard input), or with an empty path
 /// what is typed on the terminal, twice and without echo, or the first line of standard input where
 /// there is no terminal. Throws Failure for what newUserName refuses too, and where the two differ.

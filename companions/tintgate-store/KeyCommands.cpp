@@ -4,6 +4,7 @@
 
 #include <unistd.h>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/ElementsJson.h"
 #include "companions/tintgate-store/Failure.h"
@@ -64,11 +65,7 @@ std::string shortText(const store::Elements& elements) {
         return text.size() <= longest;
     });
     if (text.size() > longest) {
-        std::size_t end = longest;
-        while (end > 0 && (text[end] & 0xC0) == 0x80) { // Not inside a character.
-            --end;
-        }
-        text = text.substr(0, end) + "...";
+        text = std::string(base::cutUtf8(text, longest)) + "...";
     }
     return text;
 }

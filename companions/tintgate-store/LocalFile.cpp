@@ -6,8 +6,8 @@
 #include <filesystem>
 #include <iostream>
 
-#include <unistd.h>
-
+#include "base/FileDraft.h"
+#include "base/WholeFile.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Failure.h"
 
@@ -21,31 +21,6 @@ namespace fs = std::filesystem;
     const std::string reason = errno != 0 ? std::string(": ") + std::strerror(errno) : "";
     throw Failure(Status::LocalFile, printable(path) + " can't be " + what + reason);
 }
-
-/// Writes to a path where nothing but the content is to be; it goes if that fails.
-class Part {
-  public:
-    explicit Part(std::string path) : m_path(std::move(path)) {}
-    ~Part() {
-        if (!m_path.empty()) {
-            unlink(m_path.c_str());
-        }
-    }
-    Part(const Part&) = delete;
-    Part& operator=(const Part&) = delete;
-
-    const std::string& path() const { return m_path; }
-    bool moveTo(const std::string& target) {
-        if (std::rename(m_path.c_str(), target.c_str()) != 0) {
-            return false;
-        }
-        m_path.clear();
-        return true;
-    }
-
-  private:
-    std::string m_path;
-};
 
 void writeTo(const std::string& file, const std::string& shown,
              const std::function<void(std::ostream&)>& write) {
@@ -90,19 +65,18 @@ void writeLocalFile(const std::string& path, const std::function<void(std::ostre
         return;
     }
     std::error_code ignored;
-    const std::string target = fs::weakly_canonical(path, ignored).string();
-    const auto kind = fs::status(target, ignored).type();
-    if (ignored || target.empty() ||
-        (kind != fs::file_type::not_found && kind != fs::file_type::regular)) {
+    const auto kind = fs::status(path, ignored).type();
+    if (kind != fs::file_type::not_found && kind != fs::file_type::regular) {
         writeTo(path, path, write);
         return;
     }
-    Part part(target + ".part-" + std::to_string(getpid()));
-    writeTo(part.path(), path, write);
-    if (kind == fs::file_type::regular) {
-        fs::permissions(part.path(), fs::status(target, ignored).permissions(), ignored);
+    const std::string target = base::withoutLinks(path);
+    base::FileDraft draft(target);
+    if (!draft.isOpen()) {
+        fail(path, "written");
     }
-    if (!part.moveTo(target)) {
+    writeTo(draft.path(), path, write);
+    if (!draft.keepAccessOf(target) || !draft.replace(target)) {
         fail(path, "written");
     }
 }

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <iostream>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Bytes.h"
 
 namespace admin {
@@ -23,19 +24,13 @@ std::string cellText(const Row& value) {
     return value.is_string() ? printable(value.get_ref<const std::string&>()) : value.dump();
 }
 
-/// In characters, not bytes.
-std::size_t widthOf(const std::string& text) {
-    return static_cast<std::size_t>(
-        std::count_if(text.begin(), text.end(), [](char byte) { return (byte & 0xC0) != 0x80; }));
-}
-
 using Cells = std::vector<std::string>;
 
 void printTable(const std::vector<Cells>& lines) {
     std::vector<std::size_t> widths(lines[0].size());
     for (const auto& cells : lines) {
         for (std::size_t i = 0; i < cells.size(); ++i) {
-            widths[i] = std::max(widths[i], widthOf(cells[i]));
+            widths[i] = std::max(widths[i], base::charactersIn(cells[i]));
         }
     }
     for (const auto& cells : lines) {
@@ -43,7 +38,7 @@ void printTable(const std::vector<Cells>& lines) {
         for (std::size_t i = 0; i < cells.size(); ++i) {
             line += cells[i];
             if (i + 1 < cells.size()) {
-                line.append(widths[i] - widthOf(cells[i]) + 2, ' ');
+                line.append(widths[i] - base::charactersIn(cells[i]) + 2, ' ');
             }
         }
         std::cout << line << '\n';

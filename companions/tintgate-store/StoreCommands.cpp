@@ -7,6 +7,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Credentials.h"
@@ -54,7 +55,7 @@ void makeFolder(const std::string& folder, const std::string& group) {
 }
 
 void make(const Invocation& invocation, const MakeOptions& options) {
-    if (options.serverName.empty() || !isUtf8(options.serverName)) {
+    if (options.serverName.empty() || !base::isUtf8(options.serverName)) {
         throw Failure(Status::BadInput, "the server's name is empty or no UTF-8");
     }
     refuseColon(invocation.givenAddress(), "the store's address");

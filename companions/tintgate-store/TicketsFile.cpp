@@ -7,6 +7,7 @@
 #include <ostream>
 #include <set>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/ElementsJson.h"
 #include "companions/tintgate-store/Failure.h"
 #include "ticket/TicketRecords.h"
@@ -172,7 +173,7 @@ void TicketsWriter::add(const TicketName& name, const store::TicketContent& cont
     for (const bool utf8 : {true, false}) {
         std::string lines;
         for (const auto& [key, elements] : content.keys()) {
-            if (isUtf8(key) == utf8) {
+            if (base::isUtf8(key) == utf8) {
                 lines += (lines.empty() ? "\n        " : ",\n        ") +
                          inOneLine(utf8 ? key : toBase64(key)) + ": " +
                          inOneLine(elementsJson(*elements));

@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include <iostream>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"
@@ -69,8 +70,8 @@ void remove(const Invocation& invocation, const UserOptions& options) {
 void list(const Invocation& invocation) {
     std::vector<Row> rows;
     for (const auto& user : invocation.open()->users()) {
-        rows.push_back(
-            {{"name", shownName(user.name)}, {"state", user.disabled ? "disabled" : "enabled"}});
+        rows.push_back({{"name", base::utf8FromLatin1(user.name)},
+                        {"state", user.disabled ? "disabled" : "enabled"}});
     }
     showRows({{"name", "NAME"}, {"state", "STATE"}}, rows, invocation.json);
 }

@@ -11,7 +11,7 @@
 #include <vector>
 
 #include "CompanionStatuses.h"
-#include "colour/ColourFile.h"
+#include "base/WholeFile.h"
 #include "companions/viewer/Browser.h"
 #include "companions/viewer/LabelProgram.h"
 #include "companions/viewer/LabelSettings.h"
@@ -50,7 +50,7 @@ int fail(Status status, const std::string& words) {
 }
 
 bool read(const std::string& path, std::string& bytes) {
-    return colour::readWholeFile(path, mostBytes, bytes) == colour::Failure::None;
+    return base::readWholeFile(path, mostBytes, bytes) == base::Reading::Done;
 }
 
 std::string folderOf(const std::string& path) {

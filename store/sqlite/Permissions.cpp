@@ -8,8 +8,8 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "base/Descriptor.h"
 #include "store/StoreEngine.h"
-#include "store/sqlite/ServerFiles.h"
 
 namespace store {
 
@@ -38,8 +38,8 @@ bool Permissions::giveTo(int made) const {
 }
 
 bool Permissions::giveTo(const std::string& path) const {
-    const Descriptor made(open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC));
-    return made.valid() && giveTo(made.get());
+    const base::Descriptor made(open(path.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC));
+    return made.isOpen() && giveTo(made.get());
 }
 
 } // namespace store

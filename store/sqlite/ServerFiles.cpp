@@ -26,6 +26,8 @@ namespace store {
 
 namespace {
 
+using base::Descriptor;
+
 constexpr std::string_view deliveryPrefix = ".tintgate-new-";
 constexpr const char* versionsFolder = ".tintgate-versions";
 constexpr std::size_t blockSize = 1 << 16;
@@ -95,7 +97,7 @@ Descriptor walk(const Descriptor& from, const std::vector<std::string>& folders,
     Descriptor folder = openFolder(from.get(), ".");
     for (const auto& name : folders) {
         Descriptor next = openFolder(folder.get(), name.c_str());
-        if (!next.valid() && errno == ENOENT && make) {
+        if (!next.isOpen() && errno == ENOENT && make) {
             const bool isMade = mkdirat(folder.get(), name.c_str(), 0770) == 0;
             if (isMade) {
                 flush(folder, what);
@@ -103,11 +105,11 @@ Descriptor walk(const Descriptor& from, const std::vector<std::string>& folders,
                 fail(errno, what);
             }
             next = openFolder(folder.get(), name.c_str());
-            if (isMade && next.valid() && !Permissions::of(from.get()).giveTo(next.get())) {
+            if (isMade && next.isOpen() && !Permissions::of(from.get()).giveTo(next.get())) {
                 fail(errno, what);
             }
         }
-        if (!next.valid()) {
+        if (!next.isOpen()) {
             fail(errno, what);
         }
         folder = std::move(next);
@@ -122,7 +124,7 @@ bool isMissing(const StoreFailure& failure) {
 /// Names in a folder, in byte order.
 std::vector<std::string> namesIn(const Descriptor& folder) {
     Descriptor own = openFolder(folder.get(), ".");
-    const std::unique_ptr<DIR, int (*)(DIR*)> stream(own.valid() ? fdopendir(own.get()) : nullptr,
+    const std::unique_ptr<DIR, int (*)(DIR*)> stream(own.isOpen() ? fdopendir(own.get()) : nullptr,
                                                      closedir);
     if (stream == nullptr) {
         fail(errno, "a folder of the store");
@@ -156,7 +158,7 @@ struct stat statusOf(int file, const std::string& what) {
 Descriptor openFile(const Descriptor& folder, const std::string& name, const std::string& what) {
     Descriptor file(
         openat(folder.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
-    if (!file.valid()) {
+    if (!file.isOpen()) {
         fail(errno, what);
     }
     if (!S_ISREG(statusOf(file.get(), what).st_mode)) {
@@ -168,32 +170,16 @@ Descriptor openFile(const Descriptor& folder, const std::string& name, const std
 /// Reads up to size bytes; fewer at the end of the file only.
 std::size_t readBlock(const Descriptor& file, char* block, std::size_t size,
                       const std::string& what) {
-    std::size_t filled = 0;
-    while (filled < size) {
-        const ssize_t count = read(file.get(), block + filled, size - filled);
-        if (count < 0 && errno != EINTR) {
-            fail(errno, what);
-        }
-        if (count == 0) {
-            break;
-        }
-        filled += count > 0 ? static_cast<std::size_t>(count) : 0;
+    const std::ptrdiff_t count = base::readAll(file, block, size);
+    if (count < 0) {
+        fail(errno, what);
     }
-    return filled;
+    return static_cast<std::size_t>(count);
 }
 
-void writeAll(const Descriptor& file, const char* bytes, std::size_t size,
-              const std::string& what) {
-    while (size > 0) {
-        const ssize_t count = write(file.get(), bytes, size);
-        if (count < 0) {
-            if (errno == EINTR) {
-                continue;
-            }
-            fail(errno, what);
-        }
-        bytes += count;
-        size -= static_cast<std::size_t>(count);
+void writeBlock(const Descriptor& file, std::string_view bytes, const std::string& what) {
+    if (base::writeAll(file, bytes) != bytes.size()) {
+        fail(errno, what);
     }
 }
 
@@ -235,8 +221,8 @@ class Delivery {
                      std::to_string(counter++);
             m_file = Descriptor(openat(folder.get(), m_name.c_str(),
                                        O_WRONLY | O_CREAT | O_EXCL | O_NOFOLLOW | O_CLOEXEC, 0660));
-        } while (!m_file.valid() && errno == EEXIST);
-        if (!m_file.valid()) {
+        } while (!m_file.isOpen() && errno == EEXIST);
+        if (!m_file.isOpen()) {
             fail(errno, m_what);
         }
         flock(m_file.get(), LOCK_EX | LOCK_NB);
@@ -256,7 +242,7 @@ class Delivery {
     void fill(const Source& source) {
         std::vector<char> block(blockSize);
         while (const std::size_t count = source(block.data(), block.size())) {
-            writeAll(m_file, block.data(), count, m_what);
+            writeBlock(m_file, {block.data(), count}, m_what);
         }
         if (!m_later) {
             flush(m_file, m_what);
@@ -352,7 +338,7 @@ void useUp(const Descriptor& versions, int number, const std::string& what) {
     const auto nameOf = [](int used) { return std::string(usedUpPrefix) + std::to_string(used); };
     const Descriptor mark(openat(versions.get(), nameOf(number).c_str(),
                                  O_WRONLY | O_CREAT | O_NOFOLLOW | O_CLOEXEC, 0660));
-    if (!mark.valid()) {
+    if (!mark.isOpen()) {
         fail(errno, what);
     }
     flush(versions, what);
@@ -492,7 +478,7 @@ class Visit {
     Descriptor opened(const std::string& path) const {
         const std::string what = shownServerPath(path);
         const std::size_t slash = path.rfind('/');
-        if (slash != std::string::npos && m_folder.valid() && path.substr(0, slash) == m_path) {
+        if (slash != std::string::npos && m_folder.isOpen() && path.substr(0, slash) == m_path) {
             return walk(m_folder, {path.substr(slash + 1)}, false, what);
         }
         std::vector<std::string> folders;
@@ -546,7 +532,7 @@ int removeDeliveries(const Descriptor& files, const std::string& top, std::int64
                  }
                  const Descriptor file(
                      openat(folder.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_CLOEXEC));
-                 if (file.valid() && flock(file.get(), LOCK_EX | LOCK_NB) == 0 &&
+                 if (file.isOpen() && flock(file.get(), LOCK_EX | LOCK_NB) == 0 &&
                      unlinkat(folder.get(), name.c_str(), 0) == 0) {
                      ++removed;
                  }
@@ -562,27 +548,12 @@ void makeFilesFolder(const std::string& storeFolder, const std::string& path) {
         return;
     }
     const Descriptor folder = openFolder(AT_FDCWD, storeFolder.c_str());
-    if (!folder.valid() || !Permissions::of(folder.get()).giveTo(path)) {
+    if (!folder.isOpen() || !Permissions::of(folder.get()).giveTo(path)) {
         fail(errno, path);
     }
 }
 
 } // namespace
-
-Descriptor& Descriptor::operator=(Descriptor&& other) noexcept {
-    std::swap(m_number, other.m_number);
-    return *this;
-}
-
-Descriptor::~Descriptor() {
-    if (valid()) {
-        close(m_number);
-    }
-}
-
-int Descriptor::release() {
-    return std::exchange(m_number, -1);
-}
 
 ServerFiles::ServerFiles(const std::string& storeFolder, bool create) {
     const std::string path = storeFolder + "/files";
@@ -591,7 +562,7 @@ ServerFiles::ServerFiles(const std::string& storeFolder, bool create) {
     }
     // A link in this place is the administrator's: the files may lie on a disk of their own.
     m_files = Descriptor(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
-    if (!m_files.valid()) {
+    if (!m_files.isOpen()) {
         throw StoreFailure(Fault::Missing, path + ": " + std::strerror(errno));
     }
 }

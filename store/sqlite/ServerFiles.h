@@ -18,26 +18,10 @@
 #include <string>
 #include <string_view>
 
+#include "base/Descriptor.h"
 #include "store/StoreEngine.h"
 
 namespace store {
-
-/// An open folder or file.
-class Descriptor {
-  public:
-    Descriptor() = default;
-    explicit Descriptor(int number) : m_number(number) {}
-    Descriptor(Descriptor&& other) noexcept : m_number(other.release()) {}
-    Descriptor& operator=(Descriptor&& other) noexcept;
-    ~Descriptor();
-
-    int get() const { return m_number; }
-    int release();
-    bool valid() const { return m_number >= 0; }
-
-  private:
-    int m_number = -1;
-};
 
 /// See StoreEngine for each of these. The folder is held open, so that files stay where they were
 /// when the store was opened, whatever becomes of the names above it. Everything below it is
@@ -67,7 +51,7 @@ class ServerFiles {
     void finishCopy();
 
   private:
-    Descriptor m_files;
+    base::Descriptor m_files;
 };
 
 } // namespace store

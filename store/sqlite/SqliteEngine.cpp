@@ -22,6 +22,7 @@
 #include <sys/stat.h>
 #include <sys/statvfs.h>
 
+#include "base/Descriptor.h"
 #include "store/Engines.h"
 #include "store/JobOverview.h"
 #include "store/KeyBytes.h"
@@ -675,7 +676,7 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
     const ServerFiles files(folder, true);
     Database database(databasePath(folder), Opening::New);
     // Log and index take the database's permissions. Password hashes are nobody else's.
-    const Descriptor opened(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+    const base::Descriptor opened(open(folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     Permissions::of(opened.get()).giveTo(databasePath(folder));
     database.run("PRAGMA journal_mode = WAL; PRAGMA synchronous = FULL");
     Transaction transaction(database);
@@ -721,7 +722,7 @@ class SqliteCopy : public SqliteEngine {
     }
 
   private:
-    Descriptor m_folder;
+    base::Descriptor m_folder;
 };
 
 std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {

@@ -9,7 +9,7 @@
 
 #include "ExitCodes.h"
 #include "ScratchFolder.h"
-#include "analysis/BoundaryText.h"
+#include "base/WideBytes.h"
 
 using namespace analysis;
 using Record = tolerancePresetParameterRecord;
@@ -202,7 +202,7 @@ TEST(Presets, Files) {
     EXPECT_EQ(readPreset("/dev/zero", false, record), exitPresetWrongKind);
     for (const char* name : {"p\xFF.xml", "q.xml"}) { // the first path stays
         ASSERT_EQ(readPreset(folder.write(name, goodText), false, record), exitDone);
-        EXPECT_EQ(narrowed(record.filePath.ToStdWstring()), folder.path("p\xFF.xml"));
+        EXPECT_EQ(base::bytesFromWide(record.filePath.ToStdWstring()), folder.path("p\xFF.xml"));
     }
     // What is shipped: 7 is a PSD preset, and each uses some criterion.
     for (int id = 1; id <= 11; ++id) {
@@ -267,7 +267,7 @@ TEST(Presets, StateMoreThanTheRecordHolds) {
     change("<psd>no", "<psd>yes");
     change("decimals=\"2\"/>", "decimals=\"2\" psdTolerance=\"7\" psdUsed=\"no\"/>");
     Record other;
-    other.filePath = wxString(widened(folder.write("q.xml", text)));
+    other.filePath = wxString(base::wideFromBytes(folder.write("q.xml", text)));
     other.fograPSDPreset = 1;
     ASSERT_EQ(readPresetOptions(other, options), exitDone);
     EXPECT_EQ(spread(other, options).tolerance, 2.5);

@@ -1,5 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "ticket/ParameterTables.h"
+#include "base/Malloc.h"
 
 #include "RealTickets.h"
 
@@ -9,7 +10,7 @@ TEST(ParameterTables, ResultsAreCopiedUpToTheShorterEnd) {
     support::RecordTable table("k=1,2,3");
     SETMULTIPAR* longer = table.records();
     longer[2].result = longer[3].result = 0xFF;
-    const ticket::Block<SETMULTIPAR> shorter(MultiParameterDup(longer + 1));
+    const base::Malloced<SETMULTIPAR[]> shorter(MultiParameterDup(longer + 1));
     shorter[0].result = 0xFF;
     shorter[1].result = 0xFE;
     EXPECT_FALSE(AllMultiParameterOk(shorter.get()));

@@ -11,6 +11,7 @@
 #include <utility>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIManager.h"
+#include "base/Malloc.h"
 #include "base/WideBytes.h"
 #include "jobkeys/JobState.h"
 #include "jobkeys/Lookups.h"
@@ -67,10 +68,10 @@ bool isToBeVerified(const JobStatus& job, bool remeasure) {
 }
 
 // Null if the number exceeds what a type can have or if memory runs out.
-ticket::Block<int> roomForIds(int number) {
+base::Malloced<int[]> roomForIds(int number) {
     const std::size_t bytes = static_cast<std::size_t>(number) * sizeof(int);
     const bool possible = static_cast<unsigned long>(number) <= ticket::maxElements;
-    return ticket::Block<int>(possible ? static_cast<int*>(std::malloc(bytes)) : nullptr);
+    return base::Malloced<int[]>(possible ? static_cast<int*>(std::malloc(bytes)) : nullptr);
 }
 
 } // namespace
@@ -219,8 +220,8 @@ int CKZConnector::GetVerifierJobTicketIDs(int** ids, int* count, bool remeasure)
         number < 1) {
         return -1;
     }
-    const ticket::Block<int> all = roomForIds(number);
-    ticket::Block<int> selected = roomForIds(number);
+    const base::Malloced<int[]> all = roomForIds(number);
+    base::Malloced<int[]> selected = roomForIds(number);
     if (all == nullptr || selected == nullptr) {
         return -1;
     }

@@ -8,6 +8,7 @@
 #include <wx/debug.h>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/TicketSearch.h"
+#include "base/Malloc.h"
 #include "jobkeys/Tickets.h"
 #include "platform/CoreFoundationStrings.h"
 #include "text/CharSetsWx.h"
@@ -246,7 +247,7 @@ int ComGUIManager::GetTicketData(int type, int kind, int index, int* size, void*
 }
 
 int ComGUIManager::SetTicketData(int type, int kind, int index, int* size, void* buffer) {
-    ticket::Block<char> scratch;
+    base::Malloced<char[]> scratch;
     if (kind == 10 || kind == 11) {
         constexpr int scratchSize = 12040;
         const int given = size == nullptr ? 0 : *size;
