@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Measuring a job: the members that hand its record to the measuring tool and to the writers of its
-// text files.
+// Measuring a job: passes its record to the measuring tool and to the writers of its text files.
 #include "job/KZVerifyJobProcessor.h"
 #include "measure/DefinitionFile.h"
 #include "measure/MeasuringTool.h"

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The values that a job's ticket holds for one of its strips, measured or reference, as the record
-// wants them: one array of a key in the ticket is one column of the record.
+// Loads the values that a job's ticket has for one of its strips, measured or reference, into the
+// record: one array of a key in the ticket is one column of the record.
 #include <algorithm>
 #include <cmath>
 #include <cstddef>
@@ -23,7 +23,7 @@ namespace {
 
 using Columns = std::span<const char* const>;
 
-/// Rows of zeros; null where there is no memory for them.
+/// Rows of zeros. Null if memory runs out.
 template<class T>
 base::Malloced<T[]> makeRows(int patches, std::size_t width) {
     const std::size_t count = static_cast<std::size_t>(patches) * std::max<std::size_t>(width, 1);
@@ -55,7 +55,7 @@ void freeArray(T*& values) {
     std::free(std::exchange(values, nullptr));
 }
 
-/// Empties the record and reads the number of patches into it, 0 where there are none.
+/// Empties the record and reads the number of patches into it, or 0 if there is none.
 int startRecord(const StoredSet& stored, measurementDataRecord* record) {
     freeArray(record->spectral);
     freeArray(record->xyz);
@@ -71,7 +71,7 @@ int startRecord(const StoredSet& stored, measurementDataRecord* record) {
     return code;
 }
 
-/// Fills all rows, whose first one tells the range. False where the ticket holds less than that.
+/// Fills all rows; the first one contains the range. False if the ticket has fewer values.
 bool fillSpectra(const StoredSet& stored, int patches, spectralRow* rows) {
     const spectralRow& first = rows[0];
     const int count = patches * first.length;
@@ -90,8 +90,8 @@ bool fillSpectra(const StoredSet& stored, int patches, spectralRow* rows) {
     return true;
 }
 
-/// Returns the code of the first read that failed: what stands behind it is not read, and 0.
-/// Without all values of all spectra only the first row's range is set (C45).
+/// Returns the code of the first failed read; the values after it are not read and stay 0. Unless
+/// all values of all spectra are present, only the first row's range is set (C45).
 int loadSpectra(const StoredSet& stored, measurementDataRecord* record) {
     auto rows = makeRows<spectralRow>(record->numPatches, 1);
     if (rows == nullptr) {
@@ -109,7 +109,7 @@ int loadSpectra(const StoredSet& stored, measurementDataRecord* record) {
         }
     }
     if (rows[0].length < 0 || rows[0].length > spectralValueCount) {
-        return code; // No row has room for it: there are no spectra.
+        return code; // Does not fit a row, so there are no spectra.
     }
     if (code == 0 && fillSpectra(stored, record->numPatches, rows.get())) {
         record->hasSpectral = 1;
@@ -122,13 +122,13 @@ double rowValue(double stored) {
     return stored;
 }
 
-/// Device values of references are kept in 0 to 255, and used in whole percent (C46).
+/// Reference device values are stored as 0 to 255 but used in whole percent (C46).
 double rowValue(int stored) {
     const auto percent = static_cast<std::int64_t>(std::floor(stored / 2.55 + 0.5));
     return static_cast<std::uint16_t>(percent);
 }
 
-/// Rows of a column each. Values that the ticket lacks stay 0 (C44), without mayRead all of them.
+/// Rows with one value per column. Missing values stay 0 (C44); without mayRead, all of them.
 template<class Stored>
 double* loadRows(const StoredSet& stored, Columns columns, int patches, bool mayRead) {
     auto rows = makeRows<double>(patches, columns.size());

@@ -61,7 +61,7 @@ bool writeForViewer(const wxString& path, const std::wstring& text, const char* 
     return written;
 }
 
-/// Whether there is a regular file of this name. If not, the log gets a line about it.
+/// Whether there is a regular file of this name. If not, logs a line about it.
 bool isThere(const wxString& path, const char* complaint) {
     const bool found = measure::fileExists(path);
     if (!found) {
@@ -212,8 +212,8 @@ int KZVerifyJobProcessor::CompareStoredData(KZJobDataStruct* job, std::wstring* 
                                                    : exitSampleMissing;
 }
 
-// A missing reference file ends this road, though not that of stored measurements. If both files
-// are missing the measurement's code stands (C19).
+// A missing reference file ends the run here, unlike with stored measurements. If both files are
+// missing, the code of the measurement is returned (C19).
 int KZVerifyJobProcessor::MeasureJob(KZJobDataStruct* job, analyseResultsRecord* results,
                                      std::wstring* json) {
     CLogger::GetLogger()->Log("Veryfing existing measurement job");

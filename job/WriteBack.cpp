@@ -247,8 +247,8 @@ int KZVerifyJobProcessor::CopyResulDataToJobTicket(int jobID, KZJobDataStruct jo
     return result;
 }
 
-// A nested job is among its parent's jobs, as long as it is open, and the parent comes last
-// (C23). Which of the writes succeed does not matter to the run (C24).
+// An open nested job is one of its parent's jobs. The parent comes last (C23). The run ignores
+// which of the writes succeed (C24).
 void KZVerifyJobProcessor::WriteBackResults(int jobID, const KZJobDataStruct& job,
                                             const analyseResultsRecord& results, bool remeasure) {
     const auto writeTo = [&](int id) {

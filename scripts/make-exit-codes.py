@@ -1,8 +1,8 @@
 #!/usr/bin/env python3
 # SPDX-License-Identifier: Apache-2.0
 """Generates everything that lists exit codes, so that each is described in one place:
-docs/exit-codes.csv describes the codes; docs/job-outcomes.csv, next to it, describes what the codes
-of jobs require of whom.
+docs/exit-codes.csv describes the codes; docs/job-outcomes.csv, next to it, describes who must do what
+after a job that ended with a code.
 
 make-exit-codes.py header docs/exit-codes.csv ExitCodes.h
 make-exit-codes.py man    docs/exit-codes.csv page.1.in page.1
@@ -28,8 +28,8 @@ enum ExitCode : int {{
 {enumerators}
 }};
 
-/// Explains a code to people. All texts are ASCII without a final full stop, and not empty. Only the
-/// last three can be null: if no job ends with the code.
+/// Explains a code to people. All texts are ASCII without a final full stop, and not empty. The last
+/// three are null if no job ends with the code.
 struct ExitCodeText {{
     int code;
     const char* name;
@@ -38,7 +38,7 @@ struct ExitCodeText {{
     const char* remedy;
     const char* jobCause; ///< Cause of the code in a job: often `cause`.
     const char* jobActor; ///< Who can change the outcome: client, operator or administrator.
-    const char* jobRetry; ///< Whether the same call can help: begins with no, after a fix, or yes.
+    const char* jobRetry; ///< Whether repeating the call can help: begins with no, after a fix, or yes.
 }};
 
 /// Every code, in ascending order.
@@ -63,7 +63,7 @@ def by_code(path, columns):
 
 
 def outcomes_of(path, codes):
-    """The rows of the codes that a job can end with. If a row has no cause, gets the code's own."""
+    """Returns the rows of the codes that a job can end with. A row without a cause gets the code's."""
     outcomes = by_code(path, ("who", "retry"))
     for code, row in outcomes.items():
         if code not in codes:
@@ -139,7 +139,7 @@ def table(rows):
 
 
 def outcomes(rows):
-    """Codes that ask the same of a client are one row."""
+    """Makes one row of codes that a client handles alike."""
     groups = {}
     for row in rows:
         if row["job"]:

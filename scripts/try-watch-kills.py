@@ -8,7 +8,7 @@ try-watch-kills.py TINTGATE_CHECK [--kills 300] [--files 2000] [--seed N] [--pol
 
 Files arrive in all ways: written in pieces, renamed into place, in new folders, as copies under other
 names, again under the same name with other content, and cut off. Content that was replaced before a
-watch saw it has no result, of course; it must not have two.
+watch saw it may have no result, but never two.
 """
 
 import argparse
@@ -30,7 +30,7 @@ RESULT = re.compile(r"^(?P<name>.+)\.(?P<sha>[0-9a-f]{64})(?P<error>\.error)?\.j
 
 
 def read_target(path):
-    """Head and rows of a CGATS text."""
+    """Returns the head and the rows of a CGATS text."""
     head, rest = Path(path).read_text(encoding="latin-1").split("BEGIN_DATA\n")
     rows = [row for row in rest.split("END_DATA")[0].splitlines() if row.strip()]
     step = max(len(rows) // ROWS, 1)
@@ -39,7 +39,7 @@ def read_target(path):
 
 
 class Writer(threading.Thread):
-    """Lets files arrive, evenly over `seconds`."""
+    """Writes files at even intervals over `seconds`."""
 
     def __init__(self, folder, target, count, seconds, seed):
         super().__init__()
@@ -105,7 +105,7 @@ def sha_of(path):
 
 
 def results_below(folder):
-    """SHA-256 and paths of results, and of what is written for broken measurements."""
+    """Returns the SHA-256 and paths of results, and of what is written for broken measurements."""
     found = {}
     for path in Path(folder).rglob("*.json"):
         match = RESULT.match(path.name)

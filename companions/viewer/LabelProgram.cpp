@@ -15,10 +15,10 @@
 namespace viewer {
 namespace {
 
-constexpr int metaDescriptor = 3; ///< Of the child; its standard input is the result.
+constexpr int metaDescriptor = 3; ///< In the child. Its standard input is the result.
 
-/// A nameless file in memory with these bytes, at a number that no child's file has. Not open, with
-/// errno set, if there is no memory for it.
+/// Creates an anonymous file in memory with these bytes. Its number is one that the child does not
+/// use. The descriptor is not open, with errno set, if there is no memory for it.
 base::Descriptor inMemory(std::string_view bytes) {
     constexpr int aboveChilds = 10;
     const base::Descriptor low(memfd_create("tintgate", MFD_CLOEXEC));
@@ -62,7 +62,7 @@ bool startLabelProgram(const LabelSettings& settings, const std::string& page,
 
     posix_spawn_file_actions_t files;
     posix_spawn_file_actions_init(&files);
-    // The program may outlive everybody: it must not hold the pipes of whoever started us.
+    // The program may outlive our caller, so it must not keep the caller's pipes open.
     posix_spawn_file_actions_adddup2(&files, result.get(), STDIN_FILENO);
     posix_spawn_file_actions_addopen(&files, STDOUT_FILENO, "/dev/null", O_RDWR, 0);
     posix_spawn_file_actions_addopen(&files, STDERR_FILENO, log.c_str(),

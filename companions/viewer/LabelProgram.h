@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The program that makes labels, started and left alone.
+// Starts the program that makes labels.
 #pragma once
 
 #include <string>
@@ -9,16 +9,17 @@
 
 namespace viewer {
 
-/// What the program reads: the bytes that the page was made of. The files themselves may be those
-/// of the next run by the time that it reads them.
+/// What the program reads: the bytes that the page was made of. The files can't be passed instead:
+/// the next run may have replaced them by the time the program reads them.
 struct LabelInput {
     std::string_view result;
     std::string_view meta;
 };
 
-/// Starts the program in a session of its own, since the next job ends a running viewer, and does
-/// not wait for it. For the page NAME.html it makes NAME.label.pdf (or .svg, .png) and NAME.pdf;
-/// its messages go to NAME.label.log. False with the reason in `problem` if it can't be started.
+/// Starts the program in its own session, because the next job ends a running viewer. Does not wait
+/// for it. For the page NAME.html it makes NAME.label.pdf (or .svg, .png) and NAME.pdf; its
+/// messages go to NAME.label.log. Returns false, with the reason in `problem`, if it can't be
+/// started.
 bool startLabelProgram(const LabelSettings& settings, const std::string& page,
                        const LabelInput& input, std::string& problem);
 

@@ -35,7 +35,7 @@ struct Entry {
     bool (*read)(const std::string&, LabelSettings&);
 };
 
-/// Passes a value on as an option, whose own program checks it.
+/// Passes a value on as an option. The program that gets the option checks it.
 template<const char* const& option>
 bool passOn(const std::string& text, LabelSettings& settings) {
     settings.options.push_back(std::string(option) + "=" + text);
@@ -72,13 +72,13 @@ constexpr Entry entries[] = {
     {"sheet", "A4 or Letter", passOn<sheetOption>},
 };
 
-/// Names of fields, whose values stand on the label. The program that makes labels knows the same
-/// ones; they are repeated here because this program must not load its libraries.
+/// Names of fields whose values are printed on the label. The program that makes labels has the
+/// same list; it is repeated here because this program must not load that program's libraries.
 constexpr const char* fields[] = {"calibrated", "colourants", "condition", "instrument",
                                   "intent",     "operator",   "paper",     "printer",
                                   "profile",    "software",   "workflow"};
 
-/// What is wrong with a line; empty if nothing is.
+/// Returns what is wrong with a line, or an empty text.
 std::string readLine(std::string_view line, LabelSettings& settings, std::set<std::string>& seen) {
     line = trimmed(line);
     if (line.empty() || line.front() == '#') {

@@ -13,8 +13,8 @@ namespace viewer {
 struct LabelSettings {
     std::string label;                       ///< "pdf", "svg" or "png"; empty for no labels.
     bool certificate = false;                ///< Whether a certificate is made too.
-    bool onlyPassed = false;                 ///< Not for jobs that failed or are incomplete.
-    std::string program = "tintgate-report"; ///< A path, or a name that PATH leads to.
+    bool onlyPassed = false;                 ///< None for jobs that failed or are incomplete.
+    std::string program = "tintgate-report"; ///< A path, or a name to find in PATH.
     std::vector<std::string> options;        ///< Further options of that program, in order.
 
     bool areWanted() const { return !label.empty() || certificate; }
@@ -23,8 +23,8 @@ struct LabelSettings {
 /// /etc/tintgate/viewer.conf below the system root.
 std::string labelSettingsPath();
 
-/// Reads a settings file. A missing one means that nothing is wanted. Nothing, with the reason in
-/// `problem`, if the file can't be read or a line is not as described in docs/labels.md.
+/// Reads a settings file. A missing file means that nothing is wanted. Returns nothing, with the
+/// reason in `problem`, if the file can't be read or a line is not as described in docs/labels.md.
 std::optional<LabelSettings> readLabelSettings(const std::string& path, std::string& problem);
 
 } // namespace viewer

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// One measurement as CGATS text and as CxF3 gives one result.
+// The same measurement as CGATS text and as CxF3 gives the same result.
 #include "LibraryTest.h"
 
 #include <nlohmann/json.hpp>
@@ -26,7 +26,7 @@ class CxfResult : public LibraryTest {
         preset.illuminationCondition = -1;
     }
 
-    /// What the result contains beyond the files' own words.
+    /// The result without what it quotes from the files.
     Json resultOf(const std::string& target, const std::string& measurement) {
         EXPECT_EQ(analyse(target, measurement), 0) << target << measurement;
         Json result = Json::parse(json);
@@ -35,7 +35,7 @@ class CxfResult : public LibraryTest {
     }
 };
 
-// To the last printed digit, as target and as measurement.
+// Equal to the last printed digit, as the target and as the measurement.
 TEST_F(CxfResult, IsThatOfTheSameMeasurementInCgats) {
     for (const std::string form : {"cmyk", "spots", "lab", "labels", "spectra"}) {
         SCOPED_TRACE(form);
@@ -44,7 +44,7 @@ TEST_F(CxfResult, IsThatOfTheSameMeasurementInCgats) {
         const std::string other = form == "spots" ? scratch.path("lab.txt") : fogra;
         Json ofText = resultOf(text, other);
         Json ofCxf = resultOf(cxf, other);
-        if (form == "spectra") { // The reader reports that there is a second condition.
+        if (form == "spectra") { // The reader warns of a second condition.
             EXPECT_EQ(ofCxf["warnings"].size(), ofText["warnings"].size() + 1);
             ofCxf["warnings"] = ofText["warnings"];
         }

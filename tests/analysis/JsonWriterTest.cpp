@@ -17,7 +17,7 @@ std::string numberText(double value) {
     return {text.begin(), text.end()};
 }
 
-/// What printf makes of it, without the zeros at the end.
+/// The number as printf writes it, without trailing zeros.
 std::string printed(double value) {
     char text[400];
     std::string number(text,
@@ -35,7 +35,7 @@ TEST(JsonNumbers, AreWhatPrintfRounds) {
     for (int i = 0; i < 20'000; ++i) {
         const double magnitude = std::pow(10.0, static_cast<int>(random() % 16) - 7.0);
         values.push_back(std::uniform_real_distribution<>(-magnitude, magnitude)(random));
-        // At and beside the halves of the seventh decimal, where rounding is decided.
+        // At and next to the halves of the seventh decimal, the limits of rounding.
         const double half = (static_cast<double>(random() % 1'000'000'000) + 0.5) / 1e6;
         values.insert(values.end(), {half, std::nextafter(half, 0), std::nextafter(half, 1e9)});
     }

@@ -9,14 +9,14 @@
 
 namespace {
 
-// Offsets from a target of 50, 0, 40 such that every kind of patch has a figure of its own.
+// Differences from a target of 50, 0, 40. Each kind of patch has its own figure.
 const std::string strip = "0 0 0 0 0 51 0 40\n0 0.4 0 0 0 52 0 40\n"    // paper, twice
                           "100 0 0 0 0 53 0 40\n0 100 0 0 0 50 3 40\n"  // the second with hue
                           "0 0 99.6 0 0 55 0 40\n0 0 0 100 0 50 9 40\n" // black has no hue figure
                           "0 100 100 0 0 57 0 40\n100 0 100 0 0 58 0 40\n"   // red, green
                           "40 27 27 0 0 10 3 44\n10.2 7.4 7.4 0 0 50 0 41\n" // five greys
                           "20 12 12 0 0 50 0 41\n60 45 45 0 0 50 0 41\n80 65 65 0 0 50 0 41\n"
-                          "40 27 27 10 0 90 0 40\n"                      // black in it: no grey
+                          "40 27 27 10 0 90 0 40\n"                      // has black: not a grey
                           "0 0 0 0 100 60 0 40\n0 0 0 0 50 91 0 40\n"    // a spot solid and a tint
                           "50 0 0 0 100 92 0 40\n30 20 0 0 0 62 0 40\n"; // spot over process
 
@@ -75,7 +75,7 @@ TEST_F(JudgementTest, EachCriterionLooksAtItsPatches) {
         EXPECT_NEAR(results.values[documented.at(name).value], value, 1e-12) << name;
     }
     EXPECT_EQ(results.values[106], -1);
-    // Each by itself, as a plain preset and as a PSD preset, which has arrays of its own.
+    // Each criterion alone, as a plain preset and as a PSD preset, which uses other arrays.
     ASSERT_EQ(documented.size(), 21U);
     for (const auto& [name, entries] : documented) {
         SCOPED_TRACE(name);
@@ -100,9 +100,9 @@ TEST_F(JudgementTest, NeverPassesBySilence) {
     preset.usedForResult[2] = 1; // an entry without a meaning
     EXPECT_EQ(verdict(), "passed");
     EXPECT_THAT(json, testing::HasSubstr("criterionUnknown"));
-    use("secondaryBlue", 50); // without an answer
+    use("secondaryBlue", 50); // no answer
     EXPECT_EQ(verdict(), "incomplete");
-    use("paperWhite", 1.99); // fails, whatever has no answer
+    use("paperWhite", 1.99); // fails, although another has no answer
     EXPECT_EQ(verdict(), "failed");
     preset = {};
     use("solidCyan", std::nan(""));

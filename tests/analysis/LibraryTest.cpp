@@ -43,7 +43,7 @@ class Library : public LibraryTest {
     }
 };
 
-// ArgyllCMS pairs by sample id and we by device values: in one chart that is the same.
+// ArgyllCMS pairs by sample id, this library by device values. In a single chart both are the same.
 TEST_F(Library, AgreesWithColverifyToSixDecimals) {
     for (const auto& [target, measurement] :
          {std::pair{"FOGRA28L.ti3", "FOGRA30L.ti3"}, std::pair{"TR006.ti3", "FOGRA39L.ti3"}}) {
@@ -61,12 +61,11 @@ TEST_F(Library, AgreesWithColverifyToSixDecimals) {
 }
 
 TEST_F(Library, WritesSoundResults) {
-    const std::string strip =
-        scratch.path("strip \xff.txt"); // no name that the system's texts could hold
+    const std::string strip = scratch.path("strip \xff.txt"); // not valid in any system text
     std::filesystem::rename(chart("SAMPLE_NAME CMYK_C CMYK_M CMYK_Y CMYK_K",
                                   "Cyan 100 0 0 0\n\"Gr\xc3\xa4y\" 40 27 27 0\nOdd 13 0 0 77\n"),
                             strip);
-    std::string zeros, ones; // 20 rows, so that the 19th gives the 95th percentile
+    std::string zeros, ones; // 20 rows: the 19th is the 95th percentile
     for (int i = 0; i < 20; ++i) {
         zeros += "50 0 0\n";
         ones += std::to_string(50 + i * 0.1) + " 0 0\n";
@@ -84,7 +83,7 @@ TEST_F(Library, WritesSoundResults) {
         {fogra, sets + "TR002.ti3", "", 5, "\"unpairedTarget\": 755"},
         {sets + "TR002.ti3", fogra, "", 5, "\"patchesUnpaired\""},
         {profile, few, "", 2, "\"selection\": \"measurement\""},
-        {profile, // which knows nothing of a fifth ink
+        {profile, // has no fifth ink
          chart(inksAndLab + " SPOT_1", "1 100 0 0 0 55 -36 -50 0\n2 0 0 0 0 60 50 50 100\n"), "", 2,
          "\"unpairedMeasurement\": 1"},
         {few, profile, "", 3, "\"measurement\": \"profile\""},
@@ -105,7 +104,7 @@ TEST_F(Library, WritesSoundResults) {
     expectSound("result.schema.json", texts);
 }
 
-// A job whose ticket has no device values comes with zeros in their place.
+// If the ticket of a job has no device values, its strip has zeros instead.
 TEST_F(Library, TakesNoNoticeOfDeviceValuesThatWereNeverFilledIn) {
     const std::string full = chart(inksAndLab, "1 0 0 0 0 95 0 0\n2 100 0 0 0 55 -36 -50\n");
     const std::string zeros = chart(inksAndLab, "2 0 0 0 0 55 -36 -50\n1 0 0 0 0 94 0 0\n");
@@ -166,7 +165,7 @@ TEST_F(Library, GivesOneCodeForOneCause) {
 
 TEST_F(Library, StoresTheMeasurementIntoTheJob) {
     const std::string target = chart(inksAndLab, "1 100 0 0 0 55 -36 -50\n2 0 0 0 40 66 0 0\n");
-    // Rows in another order, one of them without a counterpart, and no inks.
+    // Rows in another order, one without a counterpart, and no inks.
     const std::string byId =
         chart("SAMPLE_ID XYZ_X XYZ_Y XYZ_Z LAB_L LAB_A LAB_B",
               "2 30 35 28 66 0 0\n9 80 84 70 94 0 -2\n1 16 23 52 55 -36 -50\n");
@@ -227,7 +226,7 @@ TEST_F(Library, MetaTellsOfTheJobButNotItsPassword) {
     const std::string empty = wstringToString(getJsonMetaFileString(&job));
     job.title = wxString(L"\u00dcber \"alles\"\n\U0001F3A8");
     job.password = "s3cret";
-    job.secondStrip = 2; // Whatever is not 0 is the second.
+    job.secondStrip = 2; // Any number except 0 means the second strip.
     job.tempDir = wxString(stringToWstring("/tmp/JobID_7\xff"));
     const std::string text = wstringToString(getJsonMetaFileString(&job));
     EXPECT_THAT(text, Not(HasSubstr("s3cret")));
@@ -290,7 +289,7 @@ TEST_F(Library, WritesTheLabThatAProfileGives) {
             EXPECT_EQ(support::contentsOf(output), before);
         }
     }
-    // Devices are never refused, even if one of them is an input too.
+    // Devices are always accepted as the output, even if they are also an input.
     std::filesystem::create_symlink("/dev/null", scratch.path("null"));
     EXPECT_EQ(write(scratch.path("null"), profile, scratch.path("null")), exitReferenceNotText);
     EXPECT_EQ(write(reference, profile, scratch.path("null")), 0);
@@ -299,7 +298,7 @@ TEST_F(Library, WritesTheLabThatAProfileGives) {
     EXPECT_THAT(json, HasSubstr("\"paired\": 1617"));
 }
 
-// Names of inks are read by people and decide nothing: all pairs have the same differences.
+// Names of inks are for people and must not affect the result: all pairs have the same differences.
 TEST_F(Library, NamesInksFromWhereTheNamesCanBeTrusted) {
     const auto inkChart = [&](const std::string& columns, const std::string& header) {
         return chart(columns + " " + labNames,
@@ -359,7 +358,7 @@ TEST_F(Library, NamesInstruments) {
                .c_str(),
            1);
     EXPECT_EQ(GetInstrumentNameFromID(7), "Instrument 7");
-    EXPECT_EQ(GetInstrumentNameFromID(12), "First"); // Its line follows a byte order mark.
+    EXPECT_EQ(GetInstrumentNameFromID(12), "First"); // This line follows a byte order mark.
     EXPECT_EQ(GetInstrumentNameFromID(4294967295u), "Instrument 4294967295");
     const auto nameIn = [&](const char* definition, wxString* name) {
         return getDeviceNameFromIt8ControlStripFile(scratch.write("d", definition), name);
@@ -368,7 +367,7 @@ TEST_F(Library, NamesInstruments) {
     EXPECT_EQ(nameIn("CGATS.17\r\nKEYWORD DEVICEMODE\r\nDEVICEMODE 0\r\n", &name),
               exitInputDamaged);
     EXPECT_EQ(name, "before");
-    // As the measuring road writes it: no KEYWORD line, behind the format, no line end.
+    // As the measuring code writes it: no KEYWORD line, after the format, no line end.
     EXPECT_EQ(nameIn("CGATS.17\r\nBEGIN_DATA_FORMAT\r\nSAMPLE_ID\r\nEND_DATA_FORMAT\r\n"
                      "DEVICE 33\r\nBEGIN_DATA\r\n1\r\nEND_DATA",
                      &name),

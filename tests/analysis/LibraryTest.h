@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The library through its functions, on texts that a test writes.
+// Calls the library's functions with texts that a test writes.
 #pragma once
 
 #include <cstdlib>
@@ -28,7 +28,7 @@ class LibraryTest : public testing::Test {
                                                            rows + "END_DATA\n");
     }
 
-    /// Compares under the preset; what comes of it is in the members.
+    /// Compares with the preset. The members hold the results.
     int analyse(const std::string& target, const std::string& measurement,
                 const std::string& patchSet = "") {
         return analyse(target, measurement, patchSet, &job);

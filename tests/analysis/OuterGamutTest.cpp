@@ -20,7 +20,7 @@ std::optional<std::size_t> entry(const Inks& inks) {
     return analysis::outerGamutEntry(inks.data());
 }
 
-/// The published list, whose first row names the columns.
+/// The published list. Its first row names the columns.
 std::set<Inks> published() {
     std::set<Inks> list;
     for (const auto& row : support::readCsv("analysis/outer-gamut-226.csv")) {
@@ -34,7 +34,7 @@ std::set<Inks> published() {
 
 } // namespace
 
-// The rules in the source give the list, no more and no less, each entry within 0.5 percent.
+// The rules in the source yield exactly the list. Each entry accepts 0.5 percent of deviation.
 TEST(OuterGamut, IsThePublishedList) {
     const std::set<Inks> list = published();
     ASSERT_EQ(list.size(), analysis::outerGamutCount);

@@ -17,8 +17,8 @@
 
 namespace {
 
-/// Status of writing "new" over `path` in a process of its own, by an ordinary user or with files
-/// limited to two bytes, as a full disk limits them.
+/// Status of writing "new" to `path` in a child process: as an ordinary user, or with a limit of
+/// two bytes per file, which acts like a full disk.
 int statusInChild(const std::string& path, unsigned user, bool diskFull) {
     const pid_t child = fork();
     if (child == 0) {
@@ -76,7 +76,7 @@ TEST(OutputFile, IsWrittenThroughLinks) {
     EXPECT_EQ(analysis::writeOutputFile(link, ""), exitDone);
     EXPECT_TRUE(std::filesystem::is_symlink(link));
     EXPECT_EQ(support::contentsOf(path), "");
-    // A device is never named itself here: tests may run as root, and a fault replace it.
+    // Written through a link only: in tests run by root, a fault could replace the device.
     std::filesystem::remove(link);
     std::filesystem::create_symlink("/dev/full", link);
     EXPECT_EQ(analysis::writeOutputFile(link, "x"), exitOutputIncomplete);

@@ -11,8 +11,8 @@ using colour::DeviceSpace;
 
 namespace {
 
-/// A set from one line: the device space, then "id:C,M,Y,K ..." with no id where nothing stands
-/// before the colon, and no device values where nothing stands behind it.
+/// Makes a set from one line: the device space, then "id:C,M,Y,K ...". Nothing before the colon
+/// means no id, and nothing after it means no device values.
 DataSet setOf(const std::string& line) {
     DataSet set;
     std::istringstream patches(line);
@@ -35,7 +35,7 @@ DataSet setOf(const std::string& line) {
     return set;
 }
 
-/// "deviceValues 0 - 2 +0:3": how, each left row's partner, and the right rows that pair again.
+/// "deviceValues 0 - 2 +0:3": the method, each left row's partner, and right rows paired again.
 std::string said(const analysis::Pairing& pairing) {
     std::string text = pairedByName(pairing.by);
     for (const std::uint32_t row : pairing.partner) {
@@ -83,7 +83,7 @@ TEST(Pairing, GoesFromTheSurestToTheWeakest) {
     EXPECT_EQ(said(pairSets(named, setOf("none Cyan: Gold: Paper:"))), "labels 2 0");
 }
 
-// With a walk over the duplicates this would take hours.
+// Visiting every duplicate would take hours here.
 TEST(Pairing, DuplicatesCostNoMoreThanOtherPatches) {
     constexpr std::size_t count = 300'000;
     DataSet left = setOf("cmyk 1:40,40,40,40");

@@ -2,8 +2,8 @@
 # SPDX-License-Identifier: Apache-2.0
 """Checks documents of the library: audit.py SCHEMA DOCUMENT...
 
-Each document must be ASCII JSON without NaN or infinity and fit the schema. Of a result, the figures
-that follow from its own rows are worked out again.
+Each document must be ASCII JSON without NaN or infinity and fit the schema. The figures of a result
+that follow from its own rows are calculated again.
 """
 
 import json

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The administration tool as its callers see it, and what it then left in the store.
+// The administration tool as its callers see it, and the store after each call.
 
 #include <bit>
 #include <filesystem>
@@ -36,7 +36,7 @@ store::TicketContent contentOf(const std::string& records) {
     return content;
 }
 
-/// Of every type the values that a conversion is likeliest to lose.
+/// For each type, the values that a conversion is most likely to lose.
 store::TicketContent awkwardContent() {
     store::TicketContent content =
         contentOf("special=0.0,-0.0,inf,-inf,nan holes[0]=1 holes[3]='x holes[4]='y "
@@ -46,7 +46,7 @@ store::TicketContent awkwardContent() {
                   "\x80key_that_is_no_UTF-8\xff=1 \xc3\xbc/\x01\"key\"='x");
     auto doubles = std::make_shared<store::Elements>();
     std::mt19937_64 random(4711);
-    for (int i = 0; i < 2000; ++i) { // Among them not-a-numbers with payloads.
+    for (int i = 0; i < 2000; ++i) { // Including NaNs with payloads.
         const auto bits = random() | (i % 50 == 0 ? 0x7FF0000000000000 : 0);
         doubles->put(i, std::bit_cast<double>(bits));
     }
@@ -137,7 +137,7 @@ TEST_F(TintgateStore, BrokenFilesChangeNothing) {
     const auto fine = m_folder.write("fine.json", key(R"({"int": 1})"));
     expectRefusal({"import", fine, m_folder.write("broken.json", "{}")}, 3, "broken.json: ");
     EXPECT_EQ(answer({"export"}), before);
-    answer({"import", fine}); // The frame of all these cases is not what was refused.
+    answer({"import", fine}); // The rest of these files is valid.
 }
 
 TEST_F(TintgateStore, UsersLogInAsTheySay) {
@@ -150,7 +150,7 @@ TEST_F(TintgateStore, UsersLogInAsTheySay) {
     };
     std::string longest;
     for (int i = 0; i < 127; ++i) {
-        longest += "\xc3\xbf"; // U+00FF, the last that is one byte of a login.
+        longest += "\xc3\xbf"; // U+00FF, the last character that is one byte in a login.
     }
     EXPECT_EQ(add("anna", longest), 0);
     EXPECT_EQ(add("anna", "other"), 2);
@@ -171,13 +171,13 @@ TEST_F(TintgateStore, UsersLogInAsTheySay) {
     answer({"user", "enable", zoe});
     EXPECT_EQ(login("Zo\xeb", "new"), store::LoginAnswer::Welcome);
     answer({"user", "remove", zoe});
-    open()->putUser({"an:na", "", false}); // Made by an earlier version: it can only be removed.
+    open()->putUser({"an:na", "", false}); // Made by an earlier version. It can only be removed.
     answer({"user", "remove", "an:na"});
     expectRefusal({"user", "enable", zoe}, 1, "there is no user");
 }
 
 TEST_F(TintgateStore, PasswordsAreNotShownOnATerminal) {
-    // Answers both questions of "user add" on a terminal of its own, and tells what that showed.
+    // Answers both prompts of "user add" on a pseudo-terminal. Returns what the terminal showed.
     const auto addByHand = [this](const std::string& password, const std::string& again) {
         return support::run({"python3", "-c",
                              "import os, pty, sys\n"
@@ -236,7 +236,7 @@ TEST_F(TintgateStore, FilesKeepTheirVersionsAndSayWhetherTheyAreXml) {
     const std::string path = "/jobs/7/a.jdf";
     const std::pair<const char*, bool> contents[] = {
         {"<?xml version=\"1.0\"?>\n<JDF xmlns:t=\"u\"><t:a/></JDF>\n   ", true},
-        {"<JDF><t:a/></JDF>", false}, // A prefix that stands for nothing.
+        {"<JDF><t:a/></JDF>", false}, // The prefix is not declared.
         {"<JDF><a></JDF", false},
         {"\xef\xbb\xbf<JDF/>", true},
     };
@@ -286,14 +286,14 @@ TEST_F(TintgateStore, JobsAreListedByTheirVerificationAndCanRunAgain) {
         for (const auto& job : jobs) {
             expected += std::to_string(&job - jobs + 1) + " " + job.second + "\n";
         }
-        // Without the blanks that align it.
+        // Ignores the blanks that align the columns.
         EXPECT_EQ(std::regex_replace(answer({"jobs"}), std::regex(" +"), " "), expected);
     };
     expectList();
     answer({"reset", "7", "--strip", "2"});
     jobs[6].second = "waiting 211 passed - 5";
     expectList();
-    answer({"reset", "job/7", "--family"}); // Its parent, and those of the same parent.
+    answer({"reset", "job/7", "--family"}); // Its parent, and the other jobs of that parent.
     jobs[4].second = "waiting 211 - - -";
     jobs[5].second = "waiting 208 - - 5";
     jobs[6].second = "waiting 211 - - 5";
@@ -306,7 +306,7 @@ TEST_F(TintgateStore, AResetWarnsOfRunsThatCannotSucceed) {
     const std::string strip = "Footer/ControlstripFile='abcd ";
     const std::string fine = waits + strip + "Workflow/Verify/MeasurementWorkflow=";
     const struct {
-        std::string keys, words; ///< No words: no warning.
+        std::string keys, words; ///< Empty if there is no warning.
     } cases[] = {
         {fine + "1 Remote/UsedICCProfile='p", ""},
         {fine + "3 Footer/ControlstripInputProfile='p", ""},
@@ -349,7 +349,7 @@ TEST_F(TintgateStore, AStoreOfAGroupIsForAllItsMembersAndNobodyElse) {
     std::filesystem::permissions(m_folder.path(), std::filesystem::perms(0755));
     const std::string file = m_folder.write("file", "text");
     std::filesystem::permissions(file, std::filesystem::perms(0644));
-    // As a person of this number and group whose umask keeps everything to themselves.
+    // Runs it with this user and group id, and with a umask that grants nobody else anything.
     const auto as = [&](int user, const char* group, const std::string& words) {
         const std::string number = std::to_string(user);
         return support::run({"setpriv", "--reuid=" + number, "--regid=" + number,
@@ -430,7 +430,7 @@ TEST_F(TintgateStore, IsReadWhereItCannotBeWritten) {
     expectReadOnly(mounted, 7);
 }
 
-/// The fixture's store is a folder, and there is a database for a copy of it.
+/// The fixture's store is a folder. Its copy is a database.
 class StoreCopy : public TintgateStore {
   protected:
     StoreCopy() {
@@ -441,7 +441,7 @@ class StoreCopy : public TintgateStore {
         engine->remove(3, 90);
         engine->putUser({"J\xF6rg", store::passwordHash("x"), true});
         for (int i = 0; i < 1'000; ++i) {
-            // Not by way of the store, where each would wait for the disk.
+            // Writes the files directly, because the store would wait for the disk at each.
             m_folder.write("store/files/" + std::to_string(i % 10) + "-\xFF/" + std::to_string(i),
                            std::string(i * 37U, 'x'));
         }
@@ -451,11 +451,11 @@ class StoreCopy : public TintgateStore {
             from.seekg(0);
             engine->putFile("jobs/8.jdf", from);
         }
-        engine->pruneVersions("jobs/7.jdf", {.keepNewest = 2}); // So that they do not start at 1.
+        engine->pruneVersions("jobs/7.jdf", {.keepNewest = 2}); // Numbers must not start at 1.
         engine->pruneVersions("jobs/8.jdf", {.keepNewest = 0});
     }
 
-    /// All that a store holds.
+    /// The whole content of a store.
     std::string allOf(const std::string& address) const {
         const auto engine = store::openStore(address);
         std::ostringstream text;
@@ -512,7 +512,7 @@ TEST_F(StoreCopy, OneThatWasBrokenOffIsNoStoreAndIsFinishedByTheNext) {
             }
             ++brokenOff;
             expectRefusal({"--store", to, "info"}, 4);
-            // Something that has gone by the time of the next.
+            // The next copy must remove this ticket.
             try {
                 store::openCopy(to)->create(3, 5);
             } catch (const store::StoreFailure& failure) {

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Definitions to the byte. "|" stands for the end of a line: "\n" in a strip, "\r\n" in what is
-// expected.
+// Definitions, byte for byte. "|" means the end of a line: "\n" in a strip, "\r\n" in the expected
+// text.
 #include <filesystem>
 #include <set>
 #include <string>
@@ -40,7 +40,7 @@ class DefinitionFile : public testing::Test {
         m_job.illuminationMode = 2;
     }
 
-    /// Writes the definition of a strip; true if the result says so.
+    /// Writes the definition of a strip. Returns whether it was written.
     bool define(const std::string& strip) {
         const std::string path = m_folder.write("strip.it8", lines(strip, "\n"));
         const wxString result =
@@ -63,9 +63,9 @@ class DefinitionFile : public testing::Test {
 TEST_F(DefinitionFile, TakesTheRowsOfAFixedStrip) {
     m_folder.write("NMPatchSetDefinition.it8", std::string(5000, 'x'));
     m_job.secondStrip = 1;
-    m_job.useDynstrip = 1; // Of the first strip alone.
+    m_job.useDynstrip = 1; // For the first strip only.
     m_job.deviceID = 21;
-    // The second row has one byte too many, so that it loses its end.
+    // The character of two bytes shortens the second row.
     const std::string body =
         "ORIGINATOR \"me\"\t|KEYWORD \"DEVICE\"|DEVICE 21 \t|NUMBER_OF_FIELDS 8|"
         "NUMBER_OF_STRIPS 3|BORDER_PATCHES 1|VERTICAL_MEAS 0|NUMBER_OF_SETS 100|"
@@ -123,7 +123,7 @@ TEST_F(DefinitionFile, FillsADynamicStrip) {
         {"CMYK_C", 83, "END_DATA|behind|", cmykWhite},
         {"RGB_R RGB_B", 99, "END_DATA|", cmykWhite},
         {"RGB_R\tRGB_G\tRGB_B", 101, "END_DATA|", rgbWhite},
-        {"RGB_R\tRGB_G\tRGB_B", 98, "", rgbWhite}, // The empty line behind it counts as a row.
+        {"RGB_R\tRGB_G\tRGB_B", 98, "", rgbWhite}, // The empty line after it counts as a row.
     };
     for (const auto& [fields, count, end, white] : cases) {
         std::string rows;
@@ -149,10 +149,10 @@ TEST_F(DefinitionFile, FillsADynamicStrip) {
 TEST_F(DefinitionFile, LeavesOutWhatIsMissing) {
     const std::pair<std::string, std::string> cases[] = {
         {"NUMBER_OF_COLS 1|BEGIN_DATA|1|END_DATA|", noDevice + oneColumn},
-        // What stands in front of the format is no data.
+        // BEGIN_DATA before the format is ignored.
         {"NUMBER_OF_COLS 1|BEGIN_DATA|0|END_DATA_FORMAT|BEGIN_DATA|1",
          noDevice + oneColumn + "BEGIN_DATA|1||"},
-        // It is read in any encoding, and written in UTF-8: so this line loses two bytes.
+        // Strips may have any encoding, definitions are UTF-8: this line loses two bytes.
         {"\xef\xbb\xbf€ BORDER_PATCHES 1\rNUMBER_OF_COLS 1\r",
          noDevice + "KEYWORD BORDER_PATCHES|€ BORDER_PATCHES|" + oneColumn},
     };
@@ -164,7 +164,7 @@ TEST_F(DefinitionFile, LeavesOutWhatIsMissing) {
 TEST_F(DefinitionFile, EndsWhereTheSizeIsUnknown) {
     const std::pair<int, std::string> failures[] = {
         {0, "NUMBER_OF_STRIPS 0|NUMBER_OF_SETS 100|"},
-        {0, "NUMBER_OF_STRIPS3|NUMBER_OF_SETS 100|"}, // It starts behind a separator.
+        {0, "NUMBER_OF_STRIPS3|NUMBER_OF_SETS 100|"}, // The number must follow a separator.
         {0, "NUMBER_OF_STRIPS 1|NUMBER_OF_SETS 1000001|"},
         {1, "NUMBER_OF_STRIPS 9223372036854775807|NUMBER_OF_COLS 9223372036854775807|"},
         {1, "NUMBER_OF_STRIPS -3|NUMBER_OF_SETS 9|"},
@@ -174,7 +174,7 @@ TEST_F(DefinitionFile, EndsWhereTheSizeIsUnknown) {
         EXPECT_FALSE(define(strip + "iSis_INFO|")) << strip;
         EXPECT_FALSE(support::exists(m_dcf));
     }
-    // As far as it got.
+    // The lines up to the failure remain.
     EXPECT_EQ(support::contentsOf(m_definition),
               lines(noDevice + dynamic + "KEYWORD NUMBER_OF_STRIPS|NUMBER_OF_STRIPS -3|"));
     const std::string missing = m_folder.path("missing");
@@ -196,7 +196,7 @@ TEST_F(DefinitionFile, GivesSomeInstrumentsAHeadOfItsOwn) {
     }
 }
 
-// What an old definition leads to is not written to.
+// An old definition may be a symbolic link; the file that it points to must not change.
 TEST_F(DefinitionFile, TakesThePlaceOfALink) {
     const std::string other = m_folder.write("other", "kept");
     std::filesystem::create_symlink(other, m_definition);

@@ -31,14 +31,14 @@ std::string bytes(const wxString& text) {
 
 class HelperTest : public testing::Test {
   protected:
-    // A name that an unquoted command would fall apart on.
+    // An unquoted command would split this name.
     HelperTest() : m_root("a root; (with) blanks & \xc3\xbc*") {
         setlocale(LC_CTYPE, "C.UTF-8");
         m_root.installPlistReader(PLIST_READER);
     }
     ~HelperTest() override { fs::current_path("/"); }
 
-    // A shell script at a path of the root.
+    // Writes a shell script at a path below the root.
     void writeScript(const std::string& name, const std::string& lines) const {
         const std::string path = m_root.copyProgram("/bin/sleep", name);
         std::ofstream(path) << "#!/bin/sh\n" << lines;
@@ -87,7 +87,7 @@ TEST_F(HelperTest, FindsTheSuite) {
         const std::string folder = makeFolder(name);
         m_root.writePreferences(suitePlist, {{key, folder}});
         expect(folder);
-        // Values are paths of their own: this one is not looked for below the root.
+        // Values are used as they are: this one is not looked up below the root.
         m_root.writePreferences(suitePlist, {{key, "/" + name}});
         expect(m_root.path("Applications/Nerova"));
     }
@@ -99,7 +99,7 @@ TEST_F(HelperTest, FindsTheMeasuringTool) {
         EXPECT_EQ(bytes(Helper::GetNerovaMeasurePath(true)),
                   folder.empty() ? "" : folder + "/NerovaMeasure.app/Contents/MacOS/NerovaMeasure");
     };
-    // Bundles are folders, and the fixed places ask for files.
+    // A bundle is a folder, but the fixed paths must be files.
     makeFolder("Applications/Nerova/NerovaMeasure.app");
     expect("");
     makeFile("Applications/Nerova/NerovaMeasure/NerovaMeasure.app");
@@ -125,14 +125,14 @@ TEST_F(HelperTest, LooksThreeTimesForARunningApplication) {
     const support::RunningProgram tool(
         m_root.copyProgram("/bin/sleep", "NerovaMeasure.app/MacOS/x"));
     EXPECT_LT(secondsOf("nerovameasure", false), 1.0);
-    // The empty name stands for the suite, and ends nothing.
+    // An empty name means the whole suite; it is searched for and not ended.
     EXPECT_GE(secondsOf("", true), 2.0);
     EXPECT_EQ(tool.endingSignal(), 0);
 }
 
 class Viewer : public HelperTest {
   protected:
-    // Writes its working folder and its arguments down.
+    // The script records its working folder and its arguments.
     void writeViewer(const std::string& name, const std::string& last = "") const {
         writeScript(name, "{ pwd; printf '%s\\n' \"${0##*/}\" \"$@\"; } > \"" + m_draft +
                               "\"\nmv \"" + m_draft + "\" \"" + m_report + "\"\n" + last);
@@ -181,7 +181,7 @@ TEST_F(Viewer, IsStartedInItsFolder) {
     EXPECT_EQ(fs::current_path(), m_folder) << "it is left where there is no viewer";
 }
 
-// Its terminal may close before it has come as far as to ignore that by itself.
+// The terminal may close before the viewer has started to ignore SIGHUP itself.
 TEST_F(Viewer, SurvivesTheEndOfItsTerminal) {
     writeViewer(m_viewer);
     const std::string lines = support::contentsOf(m_root.path(m_viewer));
@@ -197,7 +197,7 @@ TEST_F(Viewer, SurvivesTheEndOfItsTerminal) {
 TEST_F(Viewer, TakesThePlaceOfOneThatRuns) {
     const support::RunningProgram old(m_root.copyProgram("/bin/sleep", m_nwjs));
     const support::RunningProgram other(m_root.copyProgram("/bin/sleep", "Other.app/x"));
-    fs::remove(m_root.path(m_nwjs)); // Its process goes on.
+    fs::remove(m_root.path(m_nwjs)); // The process keeps running.
     writeViewer(m_viewer);
     int exitCode = 7;
     EXPECT_TRUE(Helper::LaunchNerovaVerify(exitCode, false, " -x", true));

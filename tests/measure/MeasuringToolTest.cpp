@@ -26,7 +26,7 @@ wxString wide(const std::string& path) {
 
 class MeasuringTool : public testing::Test {
   protected:
-    // Names that a command line would fall apart on.
+    // A command line would split these names if they were not quoted.
     MeasuringTool() {
         setlocale(LC_CTYPE, "C.UTF-8");
         fs::create_directories(m_temporary);
@@ -66,7 +66,7 @@ class MeasuringTool : public testing::Test {
 
 TEST_F(MeasuringTool, IsAwaited) {
     const std::string kept = m_root.path("options");
-    // A script runs as its shell: what that is called is what it is.
+    // A script runs as a process of its shell, so the path of the shell is what identifies it.
     writeFile(m_tool, "#!" + m_root.copyProgram("/bin/sh", "NerovaMeasure.app/sh") +
                           "\ncp \"$1\" '" + kept + "'; sleep 2.5; echo samples > '" + m_samples +
                           "'\n");
@@ -81,14 +81,14 @@ TEST_F(MeasuringTool, IsAwaited) {
                                              "False\n-forcemeasure\nTrue\n");
     EXPECT_FALSE(hasDefinition());
     EXPECT_TRUE(support::exists(m_root.path("job/NMPatchSetDefinition.dcf")));
-    // The options stay in the temporary folder.
+    // The options file is not deleted.
     EXPECT_TRUE(std::ranges::any_of(fs::directory_iterator(m_temporary), [](const auto& entry) {
         return entry.path().filename().string().starts_with("NerovaMeasure");
     }));
 }
 
 TEST_F(MeasuringTool, NeedsAStripAndAProgram) {
-    // There is a folder for it, then there is none.
+    // First the folder exists without the program, then there is no folder.
     for (const int code : {1000, 7}) {
         int exitCode = 7;
         EXPECT_FALSE(Helper::LaunchNerovaMeasure({}, exitCode, true));

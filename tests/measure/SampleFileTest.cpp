@@ -17,7 +17,7 @@ namespace {
 
 constexpr double infinity = std::numeric_limits<double>::infinity();
 
-/// Numbers on which texts could part: edges, any bits at all, and few digits as instruments give.
+/// Numbers whose texts might differ: edge cases, random bits, and few digits as instruments return.
 double anyNumber(std::mt19937_64& random) {
     static const double edges[] = {-0.0,      infinity,  -std::nan(""),       999999.5,
                                    9999999.5, 9.9999995, 0.00009999999999995, 1e5};
@@ -32,8 +32,8 @@ double anyNumber(std::mt19937_64& random) {
     }
 }
 
-/// By one stream of the library: the digits that XYZ and spectra ask for stay, so that the first
-/// row alone has six of them for what stands before.
+/// Writes the rows with a single stream. The precision set for XYZ and spectra stays set, so only
+/// the first row has six digits in the columns before them.
 std::string streamed(const KZJobDataStruct& job) {
     const measurementDataRecord& record = job.measurement;
     const bool hasSpectra = record.spectral != nullptr && record.numPatches > 0 &&
@@ -107,7 +107,7 @@ TEST_F(SampleFile, IsWhatAStreamWrites) {
         m_job.measurement.spectral = nullptr;
         if (random() % 3 != 0) {
             m_job.measurement.spectral = m_spectra;
-            m_spectra[0].base = static_cast<int>(random()); // The first row's range is that of all.
+            m_spectra[0].base = static_cast<int>(random()); // The first row's range applies to all.
             m_spectra[0].stepsize = static_cast<int>(random());
             m_spectra[0].length = lengths[random() % std::size(lengths)];
         }

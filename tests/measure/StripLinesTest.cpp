@@ -19,12 +19,12 @@ TEST(StringConditioning, EndsALineAnew) {
     const std::pair<std::string, std::string> cases[] = {
         {"a \t\r\n", "a "},
         {"\ta\tb\t", "\ta\tb"},
-        {"\t\x01", "\t\x01"}, // No text to end behind.
+        {"\t\x01", "\t\x01"}, // No text before the end.
         {std::string("ab\0cd", 5), "ab"},
-        // As many bytes go as there are more than characters, then what is no ASCII.
+        // The line is cut to as many bytes as it has characters, then after its last ASCII text.
         {"äbc", "äb"},
         {"€ 1 €!", "€ 1 "},
-        // 511 bytes stay, and no half character.
+        // At most 511 bytes remain, and no partial character.
         {a500 + "aaaaaaaaaaaa", a500 + "aaaaaaaaaaa"},
         {umlauts, umlauts.substr(0, 510)},
         {a500 + std::string(100, '\t') + "b", a500},
@@ -43,12 +43,12 @@ TEST(StripLines, NamesItsInstrument) {
     EXPECT_EQ(deviceID, 0);
     const std::pair<std::string, int> cases[] = {
         {"caf\xe9\r\nDEVICE\t\t-3\r\n", -3},    // Latin-1.
-        {"DEVICE 21 ", 0},                      // No whole number.
-        {"KEYWORD \"DEVICE\"\nDEVICE 21\n", 0}, // Its first line counts.
+        {"DEVICE 21 ", 0},                      // Not an integer.
+        {"KEYWORD \"DEVICE\"\nDEVICE 21\n", 0}, // The first line with the word counts.
         {"DEVICE 2147483648", 0},
     };
     for (const auto& [text, expected] : cases) {
-        // Names that are not valid UTF-8 are names all the same.
+        // Names need not be valid UTF-8.
         const std::wstring path = stringToWstring(folder.write("J\xf6rg", text));
         deviceID = 7;
         EXPECT_EQ(processor.GetDeviceIDFromIt8ControlStripFileEx(path, &deviceID), 0);

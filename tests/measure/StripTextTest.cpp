@@ -64,7 +64,7 @@ TEST(StripText, WalksLikeATextFile) {
 
 #if !defined(__SANITIZE_ADDRESS__)
 
-/// Runs `work` in a process that may take `bytes` more than it has. False if that is not enough.
+/// Runs `work` in a process that may use `bytes` more memory. False if that is not enough.
 template<class Work>
 bool worksWithin(std::size_t bytes, Work work) {
     const pid_t child = fork();

@@ -51,9 +51,9 @@ TEST(Drift, SeesASlowMoveAndRarelyAnythingElse) {
     }
     EXPECT_LT(false_alarms, rounds / 50);
     EXPECT_GT(seen, rounds * 95 / 100);
-    EXPECT_NEAR(scatter, 0.3, 0.02); // The drift does not count as scatter.
+    EXPECT_NEAR(scatter, 0.3, 0.02); // Drift does not count as scatter.
 
-    EXPECT_FALSE(driftOf({0, 0, 0, 0, 0, 5, 5, 5, 5}).significant); // Too few to say.
+    EXPECT_FALSE(driftOf({0, 0, 0, 0, 0, 5, 5, 5, 5}).significant); // Too few values.
     EXPECT_TRUE(driftOf({0, 0, 0, 0, 0, 5, 5, 5, 5, 5}).significant);
     EXPECT_TRUE(std::isnan(driftOf({none, none}).began));
 }

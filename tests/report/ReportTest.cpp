@@ -27,7 +27,7 @@ std::string with(std::string text, const std::string& part, const std::string& o
     return text.replace(at, part.size(), other);
 }
 
-// LittleCMS as the peer: Lab to sRGB, which is relative colorimetric with Bradford inside.
+// LittleCMS is the reference: Lab to sRGB, relative colorimetric with Bradford adaptation.
 TEST(Swatch, IsTheColourThatLittleCmsShows) {
     cmsHPROFILE const lab = cmsCreateLab4Profile(nullptr);
     cmsHPROFILE const srgb = cmsCreate_sRGBProfile();
@@ -44,7 +44,7 @@ TEST(Swatch, IsTheColourThatLittleCmsShows) {
         for (int channel = 0; channel < 3; ++channel) {
             EXPECT_NEAR(ours[channel], 255 * std::clamp(rgb[channel], 0.0, 1.0), 1.0);
         }
-        // Well inside or outside, so that rounding can't decide.
+        // Clearly inside or outside the gamut, so that rounding does not matter.
         const auto [least, most] = std::minmax({rgb[0], rgb[1], rgb[2]});
         if (least < -0.01 || most > 1.01) {
             EXPECT_TRUE(s.clipped);
@@ -67,7 +67,7 @@ TEST(Histogram, HasFewRoundBinsThatHoldEveryNumber) {
         std::vector<double> values;
         std::size_t bins;
         double width;
-        std::size_t first, sum; ///< How many numbers the first bin has, and all.
+        std::size_t first, sum; ///< The count of the first bin, and of all bins.
     } cases[] = {
         {{0, 0, 0}, 1, 0.01, 3, 3},
         {{0.1, 0.49, 0.5, 7.6}, 16, 0.5, 2, 4},
@@ -125,7 +125,7 @@ TEST(Model, SaysFirstWhatFailedAndByHowMuch) {
                             "little: 20.00 ΔE00, 10.00 above the tolerance of 10.00"));
     EXPECT_EQ(model.judged[3].title, "near");
     EXPECT_EQ(model.judged[3].distance, "0.10 below");
-    EXPECT_EQ(model.rows[0].patch, 2u); // No number comes last.
+    EXPECT_EQ(model.rows[0].patch, 2u); // A row without a number comes last.
     EXPECT_EQ(model.rows[2].patch, 1u);
 
     result.verdict = Verdict::Incomplete;
@@ -166,7 +166,7 @@ TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
         EXPECT_NE(problem, "");
     }
 
-    // The time becomes a part of a file's name.
+    // The time is used in a file name.
     const std::string meta = support::contentsOf(data + "meta.json");
     const std::string time = "2024-05-01T12:34:56+02:00";
     EXPECT_EQ(dateText(readMeta(meta, problem)->created), "1 May 2024, 12:34 (UTC+02:00)");

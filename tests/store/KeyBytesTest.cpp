@@ -23,12 +23,12 @@ TEST(KeyBytes, RefusesWhatItWouldNotHaveWritten) {
              "01 02 01000000 010000",                        // an int cut short
              "01 02 ffffffff 01000000",                      // more than there is
              "01 02 00000000",                               // an empty run
-             "01 00 05000000",                               // a hole at the end
+             "01 00 05000000",                               // a gap at the end
              "01 00 ffffff00 02 02000000 01000000 01000000", // beyond the last position
              "01 04 01000000 ffffffffffffffff 61",           // a text longer than the rest
-             "01 04 01000000 0200000000000000 61",           // ... by one byte
+             "01 04 01000000 0200000000000000 61",           // longer by one byte
              "01 04 01000000 0300000000000000 610062",       // a text with a zero byte
-             "01 02 01000000 01000000 ff",                   // something behind
+             "01 02 01000000 01000000 ff",                   // extra bytes at the end
          }) {
         EXPECT_EQ(store::elementsFromBytes(support::bytesOf(hexadecimal)), nullptr) << hexadecimal;
     }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// What only a store on a server can meet: services that lead nowhere, servers that fall silent or
-// are stopped, older schemas.
+// Situations that only a store on a server has: services without a server, servers that stop
+// answering or are stopped, older schemas.
 #include <chrono>
 #include <csignal>
 #include <cstdlib>
@@ -24,7 +24,7 @@ class Postgres : public StoreTest {
   protected:
     Postgres() : StoreTest(Engine::Postgres) {}
 
-    /// The fault of work, which must end within some seconds.
+    /// The fault of work that must end within a few seconds.
     static std::optional<Fault> faultInTime(const std::function<void()>& work) {
         const auto start = std::chrono::steady_clock::now();
         const auto fault = faultOf(work);
@@ -38,7 +38,7 @@ class Postgres : public StoreTest {
 } // namespace
 
 TEST_F(Postgres, AServiceThatLeadsToNoStoreIsNone) {
-    // Takes connections, at a port that the system chooses, and never says a word.
+    // A listener on a port that the system chooses. It never answers.
     const int silent = socket(AF_INET, SOCK_STREAM, 0);
     sockaddr_in listener = {};
     socklen_t size = sizeof listener;
@@ -111,7 +111,7 @@ TEST_F(Postgres, WhatWasSentIsRepeatedUnlessTwiceIsNotOnce) {
     } cases[] = {
         {"v=1,2 d=0.5", true},
         {"v[1]=5 w=-", true},
-        {"v=- v[-2]=1 v[-2]=2 v[0]=-", true}, // Nothing of what was there counts.
+        {"v=- v[-2]=1 v[-2]=2 v[0]=-", true}, // The previous value does not matter.
         {"v[-2]=3", false},
         {"v[0]=-", false},
     };
@@ -129,7 +129,7 @@ TEST_F(Postgres, WhatWasSentIsRepeatedUnlessTwiceIsNotOnce) {
         store::CachingStorage keep(open());
         bare.run(
             "BEGIN; UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = 3 AND id = 1");
-        std::thread killer([&] { // While the change waits at the server.
+        std::thread killer([&] { // Kills while the change waits at the server.
             std::string pid;
             const support::BarePostgres other("room");
             while ((pid = other.run(waiting)).empty()) {
@@ -141,7 +141,7 @@ TEST_F(Postgres, WhatWasSentIsRepeatedUnlessTwiceIsNotOnce) {
         EXPECT_EQ(keep.apply(3, 1, table.records()), isRepeated) << records;
         killer.join();
         EXPECT_EQ(ticket(*open(), 3, 1), isRepeated ? contentText(expected) : before) << records;
-        // A ticket with a gap takes no more from this session; others do.
+        // After a lost write, this session can't change that ticket. Other sessions can.
         EXPECT_EQ(keep.apply(3, 1, support::RecordTable("status=1").records()), isRepeated);
         EXPECT_EQ(keep.remove(3, 1), isRepeated);
         EXPECT_TRUE(keep.apply(3, 2, support::RecordTable("status=1").records()));
@@ -176,7 +176,7 @@ TEST(PostgresLoss, ASessionGoesOnWhenItsServerIsBack) {
     }
     EXPECT_EQ(fetched.str(), "text");
 
-    // Without its server for too long, all waits together, a session is lost for good.
+    // A session that has waited too long for its server, all waits added up, stays lost.
     using namespace store::postgres;
     static constexpr Statement one = {"SELECT 1"};
     Connection connection("tintgate", std::chrono::milliseconds(1'000));
@@ -192,8 +192,8 @@ TEST(PostgresLoss, ASessionGoesOnWhenItsServerIsBack) {
     EXPECT_FALSE(connection.isThere());
 }
 
-/// PgBouncer between a test and the tests' server, with one session for all. While it lives, the
-/// service "pooled" leads through it.
+/// PgBouncer between a test and the tests' server, with one session for all clients. While it
+/// exists, the service "pooled" connects through it.
 class Pooler {
   public:
     explicit Pooler(const support::PostgresRoom& room) {
@@ -205,7 +205,7 @@ class Pooler {
             << "[databases]\n* = host=" << server << " user=tintgate\n"
             << "[pgbouncer]\nlisten_port=6543\nunix_socket_dir=" << m_folder
             << "\nauth_type=any\npool_mode=transaction\ndefault_pool_size=1\n";
-        // It refuses to run as root.
+        // PgBouncer refuses to run as root.
         const passwd* const user = geteuid() == 0 ? getpwnam("postgres") : nullptr;
         if (user != nullptr) {
             EXPECT_EQ(chown(m_folder.c_str(), user->pw_uid, user->pw_gid), 0);
@@ -231,7 +231,7 @@ class Pooler {
     Pooler(const Pooler&) = delete;
 
   private:
-    std::string m_folder = "/tmp/tintgate-pooler-XXXXXX"; ///< In reach of that user.
+    std::string m_folder = "/tmp/tintgate-pooler-XXXXXX"; ///< Accessible to that user.
     pid_t m_process = 0;
 };
 
@@ -252,7 +252,7 @@ TEST_F(Postgres, APoolerMayHandOutSingleTransactions) {
     EXPECT_EQ(file(*other, "a/b").size(), 3u << 20);
     EXPECT_EQ(versions(*one, "a/b").size(), 2u);
     EXPECT_EQ(faultOf([] { store::openCopy("pooled"); }), Fault::Other);
-    // Limits are set for the transaction, and left to no other client of that session.
+    // Limits are set for the transaction, so no other client of that session gets them.
     using namespace store::postgres;
     static constexpr Statement limit = {"SELECT current_setting('lock_timeout')::text"};
     Connection connection("pooled");
@@ -260,14 +260,14 @@ TEST_F(Postgres, APoolerMayHandOutSingleTransactions) {
     EXPECT_EQ(connection.run(limit).text(0, 0), "10s");
     EXPECT_EQ(support::BarePostgres("pooled").run(limit.text), "0");
     EXPECT_FALSE(Connection("room").pooled());
-    // A measurement may take longer than a session may idle elsewhere.
+    // A measurement may take longer than the server lets a session idle.
     room->addService("idle", "options=-c idle_session_timeout=300");
     static constexpr Statement idle = {"SELECT current_setting('idle_session_timeout')::text"};
     EXPECT_EQ(Connection("idle").run(idle).text(0, 0), "0");
 }
 
 TEST_F(Postgres, ADislikedPasswordFileAndAnAddressCostNothing) {
-    // What the library prints would be printed by the tool, and it connects once.
+    // libpq must print nothing to stderr, and there must be only one connection attempt.
     folder.write("passwords", "*:*:*:*:x\n");
     const std::string fileOption = "passfile=" + folder.path("passwords");
     std::filesystem::permissions(folder.path("passwords"), std::filesystem::perms(0644));
@@ -304,7 +304,7 @@ TEST_F(Postgres, AServerThatTakesNoChangesIsReadOnly) {
 
 TEST_F(Postgres, AnOlderSchemaIsBroughtUpToDateOnce) {
     open()->createNext(3);
-    // As it was before there were files.
+    // The schema before files existed.
     bare.run("DROP TABLE tintgate.files, tintgate.versions, tintgate.contents, tintgate.pieces,"
              " tintgate.job_blocks;"
              "UPDATE tintgate.store SET format = 1");

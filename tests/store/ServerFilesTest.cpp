@@ -16,7 +16,7 @@ namespace {
 
 class ServerFiles : public StoreTest {
   protected:
-    /// Nothing is read there, nothing is written, and nothing is left.
+    /// Expects that the path can't be read or written, and that no file is left.
     void expectRefused(const std::string& path) {
         SCOPED_TRACE(path.substr(0, 60));
         const auto before = engine->files().size();
@@ -54,11 +54,11 @@ TEST_P(ServerFiles, PathsStayBelowTheFilesWhateverTheyContain) {
     }
     EXPECT_EQ(faultOf([&] { file(*engine, "missing/file"); }), Fault::NoFile);
 
-    // Absolute paths mean the same below the files, and names of any bytes are names.
+    // Absolute paths are read as paths below the folder of files. Names may contain any bytes.
     putFile(*engine, "//opt/server/./ControlCharts/a\\b \xFF\n.it8", "chart");
     EXPECT_EQ(file(*engine, "opt/server/ControlCharts/a\\b \xFF\n.it8"), "chart");
     EXPECT_EQ(engine->files().back().path, "opt/server/ControlCharts/a\\b \xFF\n.it8");
-    std::string large(1'000'003, 'x'); // Of several pieces, where there are pieces.
+    std::string large(1'000'003, 'x'); // Several pieces on a server.
     large.replace(262'100, 100, "where one ends");
     for (const std::string& text : {large, large.substr(0, 524'288)}) {
         putFile(*engine, "large", text);
@@ -97,7 +97,7 @@ TEST_P(ServerFiles, KeepsEachVersionUntilItIsPruned) {
     putFile(*engine, path, "last");
     EXPECT_EQ(versions(*engine, path), (Texts{"three", "", "two!"}));
     EXPECT_EQ(engine->versions(path).back().number, 6) << "numbers are not used twice";
-    // A path below a file's versions.
+    // A path that could be taken for one of the file's versions.
     putFile(*engine, path + ".d/1", "below");
     EXPECT_EQ(engine->pruneVersions(path, {.keepNewest = 0}), 3);
     EXPECT_EQ(file(*engine, path), "last");
@@ -120,7 +120,7 @@ TEST_F(FilesInFolder, LeftoversGoWhileDeliveriesStay) {
     EXPECT_FALSE(support::exists(left));
     EXPECT_FALSE(support::exists(copied));
 
-    // A process that was killed after it had kept a version, and before the exchange.
+    // As after a process that was killed between keeping a version and replacing the file.
     std::filesystem::create_directories(address + "/files/.tintgate-versions/a/file");
     std::filesystem::create_hard_link(address + "/files/a/file",
                                       address + "/files/.tintgate-versions/a/file/.tintgate-1");
@@ -134,11 +134,11 @@ TEST_P(ServerFiles, FoldersMayBeAsDeepAsPathsAreLong) {
     for (int i = 0; i < 1'023; ++i) {
         deep += "a/";
     }
-    const rlimit limit = {1'024, 1'024}; // As many accounts have it.
+    const rlimit limit = {1'024, 1'024}; // The limit of many accounts.
     rlimit before;
     getrlimit(RLIMIT_NOFILE, &before);
     setrlimit(RLIMIT_NOFILE, &limit);
-    if (!room) { // Without waiting for the disk at each.
+    if (!room) { // Faster than waiting for the disk at each folder.
         support::run({"python3", "-c",
                       "import os, sys\n"
                       "os.chdir(sys.argv[1])\n"
@@ -163,7 +163,7 @@ TEST_F(FilesInFolder, AFolderThatCannotBeReadIsNamed) {
     const std::string closed = address + "/files/a/closed";
     const pid_t child = startProcess([&] {
         chmod(closed.c_str(), 0);
-        if (geteuid() == 0) { // Who may read any folder.
+        if (geteuid() == 0) { // Root may read any folder.
             const auto mine = [](const std::string& path) { return chown(path.c_str(), 1, 1); };
             for (const char* each : {"", "/files", "/files/a", "/files/a/closed"}) {
                 EXPECT_EQ(mine(address + each), 0);

@@ -19,14 +19,14 @@ namespace {
 
 class StoreEngine : public StoreTest {
   protected:
-    /// Puts a file; the number under which what it replaced is kept.
+    /// Puts a file. Returns the version number of what it replaced.
     static int putAndKeep(store::StoreEngine& engine, const std::string& path, const char* text) {
         putFile(engine, path, text);
         return engine.versions(path).back().number;
     }
 };
 
-/// What only a store in a folder has.
+/// Tests for stores in a folder.
 class FolderStore : public StoreTest {
   protected:
     FolderStore() : StoreTest(Engine::Sqlite) {}
@@ -82,19 +82,19 @@ TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
     const struct {
         const char* sent;
         const char* results;
-        const char* ticket; // Keys go as bytes, not as letters.
+        const char* ticket; // Keys are ordered as bytes.
     } tables[] = {
         {"a=1 a[16777215]=2 a[-2]=3 a[16777216]=1 a[-3]=- a[-2]=- z[0]=- z=-", "taken 11000001",
          "a[0]=1 a[16777215]=2"},
         {"a*=- *[0]=1 =- a[-1]=9 a[-2]='x e=# p=p0", "taken 0001111",
          "a[0]=9 a[1]='x e[0]=# p[0]=p0"},
         {"a=- a[-2]=7 a[0]=- e=- p=-", "taken 11111", ""},
-        // Arrays as they are sent, one with something behind it.
+        // Whole arrays, one of them followed by another element.
         {"c[0]=1 c[1]=2 c[2]=3 c[4]=9 d=- d[0]=0.5 d[1]=2.5 d[2]='x", "taken 11111111",
          "c[0]=1 c[1]=2 c[2]=3 c[4]=9 d[0]=0.5 d[1]=2.5 d[2]='x"},
         {"c=- d=- b=1,2.5,'x é=7 b2=U9 A=#00 b[5]=l-1 zz*=1 =1 b[-3]=4", "taken 111111111000",
          "A[0]=#00 b[0]=1 b[1]=2.5 b[2]='x b[5]=l-1 b2[0]=U9 é[0]=7"},
-        // Changes of keys that the table replaces, changes, deletes, and deletes in vain.
+        // Changes and deletions of keys that exist, and deletions of others.
         {"b[5]=- b[-2]=9 A=- gone=- b2=1 b2[-2]=2 é[3]=-", "taken 1111110",
          "b[0]=1 b[1]=2.5 b[2]='x b[3]=9 b2[0]=1 b2[1]=2 é[0]=7"},
         {"b[-1]='new b[1]=-", "taken 10", "b[0]='new b2[0]=1 b2[1]=2 é[0]=7"},
@@ -119,7 +119,7 @@ TEST_P(StoreEngine, TablesFollowTheTicketRulesAndSurviveReopening) {
         EXPECT_EQ(engine->content(3, 2, filter), nullptr) << "there is no such ticket";
     }
 
-    // A change that fails on its way leaves nothing.
+    // A change that throws halfway leaves the ticket as it was.
     const auto failing = [](store::TicketContent& content) {
         content.apply(support::RecordTable("b=1,2,3").records());
         throw std::runtime_error("on the way");
@@ -158,14 +158,14 @@ TEST_P(StoreEngine, AChangeMakesItsTicketWithAllKeysOrNone) {
 }
 
 TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
-    // The first two are held of all jobs at once, from when a reader asks for the ids.
+    // The first two keys are cached for all jobs at once when a reader asks for the ids.
     const std::string keys[] = {"Job/Display/Status", "Input/FileType", "Other"};
     store::CachingStorage reader(open());
     store::CachingStorage other(open());
-    std::map<int, std::map<std::string, int>> jobs; // What is there.
+    std::map<int, std::map<std::string, int>> jobs; // The expected content.
     std::mt19937 random(1);
     const auto below = [&](int limit) { return static_cast<int>(random() % unsigned(limit)); };
-    other.create(27, 2); // Of another type.
+    other.create(27, 2); // A ticket of another type.
     for (int step = 0; step < 250 && !HasFailure(); ++step) {
         store::CachingStorage& writer = below(3) == 0 ? reader : other;
         const int id = 1 + below(3);
@@ -179,7 +179,7 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
             sql("PRAGMA wal_checkpoint(TRUNCATE)", "SELECT 1");
         } else {
             std::string records = key + "=" + std::to_string(step);
-            for (int more = what == 3 ? 100 : 0; more > 0; --more) { // Too many to be held.
+            for (int more = what == 3 ? 100 : 0; more > 0; --more) { // Too many to be cached.
                 records += " " + key + "[-2]=1";
             }
             support::RecordTable table(records);
@@ -193,7 +193,7 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
         if (below(4) == 0) {
             EXPECT_TRUE(std::ranges::equal(reader.ids(3), std::views::keys(jobs)));
         }
-        // In this order no read goes on with a listing, which may show what was there before.
+        // This order never continues a listing, which may return older values.
         for (int job = 3; job > 0; --job) {
             for (const int index : {1, 0, 2}) {
                 const std::string& name = keys[index == 2 && step / 8 % 3 + 1 != job ? 0 : index];
@@ -208,7 +208,7 @@ TEST_P(StoreEngine, ReadersSeeWhatIsThereNow) {
 }
 
 TEST_P(StoreEngine, KeepsTheOverviewOfJobsInStep) {
-    // What each job holds: no key, a number, or something else.
+    // For each job: "-" for a missing key, a number, or "?" for any other value.
     const auto shown = [](store::StoreEngine& engine) {
         store::JobOverview jobs;
         engine.overview(jobs);
@@ -259,7 +259,7 @@ TEST_P(StoreEngine, KeepsTheOverviewOfJobsInStep) {
     EXPECT_TRUE(engine->remove(3, 0) && engine->create(3, 0)) << "it starts without keys";
     EXPECT_EQ(shown(*engine), " 0:-,-,-,-,-," + expected.substr(expected.find(" 1:")));
 
-    // A store that was made before there was an overview gets the same.
+    // A store made before the overview existed must get the same one.
     const std::string before = shown(*engine);
     sql("DROP TABLE job_blocks",
         "DROP TABLE tintgate.job_blocks; ALTER TABLE tintgate.files DROP last_version");
@@ -290,7 +290,7 @@ TEST_F(FolderStore, OpensOnlyFoldersWithAStore) {
     for (const auto& [place, fault] : cases) {
         EXPECT_EQ(faultOf([&, at = place] { store::openStore(at); }), fault) << place;
     }
-    folder.makeFolder("begun/files"); // By a making that was killed as it turned the log on.
+    folder.makeFolder("begun/files"); // Left by a process that was killed while it made the store.
     folder.write("begun/tickets.db-journal", "");
     EXPECT_NO_THROW(store::makeStore(folder.path("begun"), "press"));
     EXPECT_EQ(support::modeOf(folder.path("begun/tickets.db")) & 0007u, 0u);
@@ -312,7 +312,7 @@ TEST_P(StoreEngine, NeitherOverwritesAStoreNorReadsADamagedKey) {
     EXPECT_EQ(send(*engine, 0, 0, "a=1"), "taken 1") << "replacing it mends it";
 }
 
-// Of whatever kind, one byte that has changed is a failure or goes unnoticed; it crashes nobody.
+// Any changed byte is a failure or goes unnoticed, and never crashes the program.
 TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
     {
         const auto engine = open();
@@ -373,8 +373,8 @@ TEST_P(StoreEngine, BearsAnyByteThatHasChanged) {
         const auto& [table, column] = places[below(std::size(places))];
         const std::string name = column;
         const support::BarePostgres bare("room");
-        // Short names might become each other. The row by its place; the same statement, at its new
-        // place, takes the change back.
+        // Only values longer than 4 bytes: a short key name could turn into another one. The row is
+        // found by its ctid. The same statement at the new ctid reverts the change.
         std::string place = bare.run("SELECT ctid FROM tintgate." + std::string(table) +
                                      " WHERE length(" + name + ") > 4 ORDER BY random() LIMIT 1");
         const std::string at = std::to_string(below(1'000));
@@ -421,7 +421,7 @@ TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
     open()->create(3, 1);
     send(*open(), 3, 1, "kept=1,2,3");
     putFile(*open(), "kept", "old");
-    // A limit on the size of files, which the kernel reports as it reports a full disk.
+    // A limit on the size of files. The kernel reports it much like a full disk.
     const pid_t child = startProcess([&] {
         signal(SIGXFSZ, SIG_IGN);
         const rlimit limit = {200'000, 200'000};
@@ -430,7 +430,7 @@ TEST_F(FolderStore, AFullDiskLosesNothingThatWasThere) {
         EXPECT_EQ(send(*engine, 3, 1, "kept='" + much + " other=1"), "refused 00");
         EXPECT_EQ(faultOf([&] { putFile(*engine, "kept", much); }), Fault::Full);
         EXPECT_EQ(send(*engine, 3, 1, "small=1"), "taken 1");
-        // A session that lost a write takes no more for that ticket.
+        // A session that lost a write refuses further changes of that ticket.
         engine->create(3, 2);
         store::CachingStorage keep(open());
         EXPECT_FALSE(keep.apply(3, 1, support::RecordTable("big='" + much).records()));

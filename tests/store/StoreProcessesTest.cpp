@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Several processes on one store; writers that are killed, and servers that are stopped under them.
+// Several processes on one store, killed writers, and servers stopped during a write.
 #include <atomic>
 #include <csignal>
 #include <new>
@@ -16,14 +16,14 @@ namespace {
 class StoreProcesses : public StoreTest {};
 ON_BOTH_ENGINES(StoreProcesses);
 
-/// Writes that can be cut off at any moment, and of which one can tell whether they are there
-/// whole: each is a table of ticket 3/1 and a file, both of one number.
+/// Writes that can be interrupted at any moment and checked for completeness: each is a table of
+/// ticket 3/1 and a file, both with the same number.
 class NumberedWrites {
   public:
-    /// What writers have been told to be done, which must then be there. All processes share it.
+    /// Numbers of completed writes, which the store must contain. All processes share them.
     struct Done {
         std::atomic<int> table, file;
-        std::atomic<bool> begun; ///< A first write is done, since somebody set it to false.
+        std::atomic<bool> begun; ///< Set after a writer's first table and file.
     };
 
     NumberedWrites()
@@ -32,21 +32,21 @@ class NumberedWrites {
     ~NumberedWrites() { munmap(&m_done, sizeof(Done)); }
     NumberedWrites(const NumberedWrites&) = delete;
 
-    /// Has writers of a store cut off, each at some moment of its work.
+    /// Starts writers one by one and interrupts each at a random moment.
     void expectWholeAfter(const std::string& store, int rounds,
                           const std::function<void(pid_t writer)>& cutOff) {
         store::openStore(store)->create(3, 1);
         int last = 0;
-        int workedOn = 0; // Rounds in which something was written.
+        int workedOn = 0; // Rounds in which a table was written.
         for (int round = 0; round < rounds && !testing::Test::HasFailure(); ++round) {
             m_done.begun = false;
             const pid_t writer = startProcess([&] {
-                alarm(35); // For a server that falls silent, instead of telling at once.
+                alarm(35); // For a server that stops answering instead of closing the connection.
                 const auto fault =
                     StoreTest::faultOf([&] { write(*store::openStore(store), last + 1); });
                 return fault == store::Fault::Lost || fault == store::Fault::Missing ? 0 : 2;
             });
-            // Of every ten rounds one may be in its first write.
+            // One round in ten may be interrupted during its first write.
             for (int wait = 0; round % 10 != 0 && !m_done.begun && wait < 200'000; ++wait) {
                 usleep(100);
             }
@@ -61,7 +61,7 @@ class NumberedWrites {
     }
 
   private:
-    /// Writes with this number and those behind it, until the store fails.
+    /// Writes with this number and the following ones, until the store fails.
     [[noreturn]] void write(store::StoreEngine& engine, int number) const {
         for (;; ++number) {
             const std::string text = std::to_string(number);
@@ -79,7 +79,7 @@ class NumberedWrites {
         }
     }
 
-    /// The number of the table that is there; the file's may be a further one.
+    /// Returns the number of the stored table. The file's number may be higher.
     int expectWhole(store::StoreEngine& engine) const {
         std::multiset<int> numbers;
         const auto content = engine.content(3, 1, store::KeyFilter());
@@ -125,7 +125,7 @@ class NumberedWrites {
     }
 
     Done& m_done;
-    std::mt19937 m_random{5}; // NOLINT: the same moments, as far as that goes
+    std::mt19937 m_random{5}; // NOLINT: the same sequence each time
 };
 
 } // namespace
@@ -151,7 +151,7 @@ TEST_P(StoreProcesses, TwoWritersLoseAndMixNothing) {
     };
     const pid_t writers[] = {write("a"), write("b")};
 
-    // Until one of them ends, each moment that is seen is one between two tables.
+    // Until one of them ends, every read shows a state between two tables.
     const auto engine = open();
     for (siginfo_t ended = {}; ended.si_pid == 0;) {
         const auto content = engine->content(3, 1, store::KeyFilter());
@@ -187,14 +187,14 @@ TEST_P(StoreProcesses, WritersKilledAtAnyMomentLeaveWholeTablesAndFiles) {
     });
 }
 
-// As a crash would stop it.
+// The server stops without a shutdown, as in a crash.
 TEST(PostgresStop, LosesNothing) {
     const support::PostgresServer server;
     store::makeStore("tintgate", "Press room");
     NumberedWrites().expectWholeAfter("tintgate", roundsOr(5), [&](pid_t writer) {
         server.stop("immediate");
         server.startAgain();
-        // It goes on, or its file was on the way. Either is cut off anyway.
+        // The writer continues, or fails if it was sending a file. It is killed in both cases.
         usleep(100'000);
         kill(writer, SIGKILL);
         const int end = endOf(writer);

@@ -20,7 +20,7 @@ namespace fs = std::filesystem;
 
 const std::string data = TINTGATE_SOURCE_DIR "/tests/data/report/";
 
-/// A folder with both files of a job's run.
+/// A folder with both result files of a job.
 class ReportProgram : public testing::Test {
   protected:
     ReportProgram() {
@@ -49,7 +49,7 @@ TEST_F(ReportProgram, MakesTheVeryPageOfTheViewer) {
     ASSERT_EQ(support::run({VIEWER, "-meta", m_meta}).exitCode, 0);
     EXPECT_EQ(support::contentsOf(page), text);
 
-    // Without a job: beside the result, under its name, and nothing is overwritten.
+    // Outside a job's folder, the page goes next to the result and overwrites nothing.
     const std::string alone = m_scratch.path("Auftrag ü.json");
     fs::copy_file(m_result, alone);
     const std::string mine = m_scratch.write("Auftrag ü.html", "mine");
@@ -58,7 +58,7 @@ TEST_F(ReportProgram, MakesTheVeryPageOfTheViewer) {
     EXPECT_EQ(report({alone, "-o", mine}).output, "");
     EXPECT_NE(support::contentsOf(mine), "mine");
 
-    // A job's own meta file that is broken costs the result nothing but the job's title.
+    // If the meta file is broken, only the title of the job is missing.
     m_scratch.write("meta.json", "{");
     const support::Outcome outcome = report({m_result, "-o", "-"});
     EXPECT_EQ(outcome.exitCode, 0);
@@ -87,7 +87,7 @@ TEST_F(ReportProgram, SummarisesForATerminal) {
     }
     EXPECT_THAT(plain.output, Not(HasSubstr("\x1b")));
 
-    // A title must not reach the terminal as a command to it.
+    // A title must not send commands to the terminal.
     std::string meta = support::contentsOf(m_meta);
     meta.replace(meta.find("Gr\\u00f6"), 2, "\\u001b]0;owned\\u0007");
     m_scratch.write("meta.json", meta);
@@ -134,7 +134,7 @@ TEST_F(ReportProgram, ExplainsExitCodes) {
             EXPECT_THAT(words,
                         AllOf(HasSubstr(code.jobCause), HasSubstr(code.jobActor),
                               HasSubstr(code.jobRetry), HasSubstr("tintgate-store diagnose")));
-            // A cause that is the same in a job is not repeated.
+            // If the cause is the same in a job, it is not repeated.
             EXPECT_EQ(words.find(code.jobCause), words.rfind(code.jobCause)) << words;
         }
     }
@@ -147,7 +147,7 @@ TEST_F(ReportProgram, ChecksPresets) {
     EXPECT_THAT(report({"--check-preset", sound}).output,
                 AllOf(HasSubstr("sound"), HasSubstr("preset 1, ")));
     std::string text = support::contentsOf(sound);
-    const std::size_t used = text.rfind("used=\"yes\""); // A comment has the first.
+    const std::size_t used = text.rfind("used=\"yes\""); // The first one is in a comment.
     const auto line = std::count(text.begin(), text.begin() + std::ptrdiff_t(used), '\n') + 1;
     const std::string broken = m_scratch.write("preset.xml", text.replace(used, 10, "used=\"y\""));
     const support::Outcome outcome = report({"--check-preset", broken});

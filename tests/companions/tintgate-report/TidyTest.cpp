@@ -25,14 +25,14 @@ class Tidy : public testing::Test {
 
     std::string path(const std::string& name) const { return m_scratch.path("Tintgate/" + name); }
 
-    /// A job's folder with a file and a folder in it, all of that age.
+    /// Makes a job's folder with a file and a folder in it, all of that age.
     void makeJob(const std::string& name, int days = 40) const {
         m_scratch.write("Tintgate/" + name + "/output.json", "{}");
         m_scratch.write("Tintgate/" + name + "/inner/file", "x");
         makeOld(path(name), days);
     }
 
-    /// Links too, not what they lead to.
+    /// Does not follow links.
     static void makeOld(const std::string& folder, int days) {
         timespec times[2] = {};
         times[0].tv_sec = times[1].tv_sec = time(nullptr) - 86400 * days;
@@ -76,7 +76,7 @@ TEST_F(Tidy, RemovesOldFoldersOfJobsAndNothingElse) {
     for (const char* name : {"JobID_6 copy", "JobID_", "JobID_x", "other"}) {
         makeJob(name);
     }
-    makeJob(".tidy-JobID_7"); // Of a call that was cut off.
+    makeJob(".tidy-JobID_7"); // Left by a call that was killed.
 
     const std::string dry = tidy({"30", "--dry-run"}).output;
     EXPECT_THAT(dry, HasSubstr("would remove JobID_1: 2 files, "));
@@ -107,7 +107,7 @@ TEST_F(Tidy, KeepsWhatAProcessUsesOrNames) {
         {"exec cat pipe 9< Tintgate/JobID_12/output.json", "kept JobID_12: in use by cat"},
         {"bin/Tintgate " + job, "kept JobID_12: in use by Tintgate"},
         {"/bin/sh pause '" + path("JobID_12/meta.json") + "'", "kept JobID_12: in use by "},
-        // Neither another program's number nor the tool elsewhere.
+        // Not in use: another program's job number, and the tool in another temporary folder.
         {"/bin/sh " + job, "removed JobID_12:"},
         {"TMPDIR='" + m_scratch.path("other") + "' bin/Tintgate " + job, "removed JobID_12:"},
     };
@@ -115,7 +115,7 @@ TEST_F(Tidy, KeepsWhatAProcessUsesOrNames) {
         SCOPED_TRACE(program);
         makeJob("JobID_1");
         makeJob("JobID_12");
-        // The program opens the pipe, and reads until the folders are tidied.
+        // The program opens the pipe and reads until the folders are tidied.
         const auto outcome =
             run({"/bin/sh", "-c",
                  "rm -f pipe; mkfifo pipe; (" + program +
@@ -131,7 +131,7 @@ TEST_F(Tidy, SaysWhatItCantDo) {
         EXPECT_EQ(tidy({days}).exitCode, 64) << days;
     }
 
-    // A number that no tool on this machine has, since those of root tell this user no folder.
+    // A number that no tool here has: users can't see the folders of root's tools.
     makeJob("JobID_987001");
     fs::permissions(path("JobID_987001/inner"), fs::perms(0555));
     fs::permissions(m_scratch.path(), fs::perms(0777));

@@ -34,8 +34,8 @@ support::Outcome report(std::vector<std::string> words) {
     return support::run(words);
 }
 
-/// Jobs on successive days whose cyan grows lighter by 0.5 a day; all of them carry the hostile
-/// texts of the data, but the paper of the first five.
+/// Jobs on successive days. Their cyan grows lighter by 0.5 a day. All have the hostile texts of
+/// the test data, except for the paper of the first five.
 class Trend : public testing::Test {
   protected:
     static constexpr int jobs = 24;
@@ -66,7 +66,7 @@ class Trend : public testing::Test {
 
 TEST_F(Trend, ShowsADriftAndLeadsToEachJob) {
     ASSERT_EQ(support::run({VIEWER, "-meta", m_rooms + "/JobID_7/meta.json"}).exitCode, 0);
-    for (int times = 0; times < 2; ++times) { // Making it all again adds nothing.
+    for (int times = 0; times < 2; ++times) { // The second run adds nothing.
         ASSERT_EQ(report({m_rooms, "-o", m_page}).exitCode, 0);
     }
     const fs::path pages = m_scratch.path("trend-jobs");
@@ -96,7 +96,7 @@ TEST_F(Trend, ShowsADriftAndLeadsToEachJob) {
           "<b>All patches, average</b><span>latest job 2.50 of 2.50 ΔE00 · 0 of 19 above</span>",
           "aria-label=\"Solid cyan: latest job 4.75 of 2.25 ΔE00 · 19 of 19 above\"",
           "<b>Cyan</b><span>Drifting · L*a*b* first jobs ", ", aim 55.0 -37.0 -50.0</span>",
-          // The latest job, and the average that one corrects by, each under its own name.
+          // The latest job, and the average that a correction is based on, each with its name.
           "<span class=\"label\">Latest job</span>4.75<span class=\"unit\"> of 2.25</span>",
           "<span class=\"label\">Moving average to aim</span><b>6.45 ΔE00</b>",
           "<span class=\"correction\">L*&nbsp;+7.05, a*&nbsp;+2.00, b*&nbsp;+4.00</span>",
@@ -137,7 +137,7 @@ TEST_F(Trend, TakesWhatTheFiltersLetThrough) {
     }
 }
 
-// The forms in which measuring programs state a date. What may mean two days counts as unstated.
+// Formats of dates from measuring programs. A date that can mean two days counts as missing.
 TEST(TrendTimes, AreThoseOfTheMeasurementsIfTheyCannotBeMistaken) {
     const support::ScratchFolder scratch;
     const std::string result = support::contentsOf(data + "output.json");
@@ -145,7 +145,7 @@ TEST(TrendTimes, AreThoseOfTheMeasurementsIfTheyCannotBeMistaken) {
                                 "\"description\":null,\"originator\":null,\"created\":";
     const struct {
         const char* created;
-        const char* shown; ///< Empty if the file's own time is to stand in.
+        const char* shown; ///< Empty if the time of the file is used instead.
     } cases[] = {{"2026-11-25T09:15:00+01:00", "25 November 2026, 09:15"},
                  {"Wed Nov 25 09:15:07 2026", "25 November 2026, 09:15"},
                  {"11/21/2026  # Time: 09:15", "21 November 2026, 09:15"},
@@ -171,7 +171,7 @@ TEST(TrendTimes, AreThoseOfTheMeasurementsIfTheyCannotBeMistaken) {
     }
 }
 
-// Results of two versions of a target, two printers and three folders: whatever differs parts them.
+// Two versions of a target, two printers, three folders: any difference starts a series.
 TEST(TrendSeries, JoinNothingThatWasAimedAtOtherColours) {
     const support::ScratchFolder scratch;
     const std::string result = support::contentsOf(data + "output.json");

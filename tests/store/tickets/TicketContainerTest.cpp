@@ -32,7 +32,7 @@ class TicketContainer : public testing::Test {
 TEST_F(TicketContainer, AnOpenedTicketIsOneRecordForGood) {
     const auto* ticket = session.engine.open(jobs, 2);
     other.send(2, "a='x,2.5 b=7");
-    // What a walk showed stays good until the ticket changes by it.
+    // Values from a walk stay valid until this session changes the ticket.
     auto shown = support::walked(*ticket);
     other.send(2, "a=1");
     EXPECT_TRUE(bit0(single::SetMultiParameter::call(*ticket, shown.data())));
@@ -80,7 +80,7 @@ TEST_F(TicketContainer, BadAddressesAreRefused) {
     EXPECT_EQ(keep->ids(3), (std::vector<int>{1, 2, 3, 4}));
 
     session.send(1, "a=7");
-    session.record.words[handleWord] = 1; // That is nobody's.
+    session.record.words[handleWord] = 1; // A handle that does not exist.
     EXPECT_EQ(read(1, "a", -1), -1);
     EXPECT_EQ(container::CreateWithKeys::call(session.record, 3, 7, nullptr), nullptr);
 }

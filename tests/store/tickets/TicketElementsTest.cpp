@@ -13,7 +13,7 @@ using namespace store;
 
 namespace {
 
-/// A key's elements and holes, without Elements' ways of saving room and time.
+/// The elements and gaps of a key, without the optimizations of Elements.
 using Plain = std::vector<std::optional<int>>;
 
 bool remove(Plain& values, int position) {
@@ -44,7 +44,7 @@ TEST(TicketElements, EqualsAPlainVectorOverRandomChanges) {
     for (int round = 1; round <= 100; ++round) {
         std::mt19937 random(round);
         const auto below = [&](int limit) { return static_cast<int>(random() % unsigned(limit)); };
-        const int reach = round % 3 == 0 ? 5000 : 12; // Far and near the elements that are there.
+        const int reach = round % 3 == 0 ? 5000 : 12; // Far from the elements or near them.
         std::shared_ptr<Elements> key;
         Plain model;
         std::string history = "round " + std::to_string(round);
@@ -75,7 +75,7 @@ TEST(TicketElements, EqualsAPlainVectorOverRandomChanges) {
 }
 
 TEST(TicketElements, LoneElementsFarOutCostNoRoom) {
-    // In full each of these keys would take 400 MB.
+    // Stored in full, each of these keys would take 400 MB.
     std::shared_ptr<Elements> keys[1000];
     for (auto& key : keys) {
         const int value = 7;

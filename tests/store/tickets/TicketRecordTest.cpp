@@ -85,7 +85,7 @@ TEST(TicketRecord, TextsStayGoodWhenTheirTicketIsGone) {
 TEST(TicketRecord, ATableMayPointIntoTheTicketThatItChanges) {
     const WorkTicket ticket("a='x,'y b='z,1,2.5");
     const std::vector<SETMULTIPAR> table = support::walked(*ticket.real());
-    // All is deleted, then set again from behind, out of what was deleted.
+    // Deletes everything, then sets it again in reverse order from the deleted values.
     std::vector<SETMULTIPAR> turned = {{.key = table[0].key, .position = -1},
                                        {.key = table[2].key, .position = -1}};
     turned.insert(turned.end(), table.rbegin() + 1, table.rend());
@@ -127,7 +127,7 @@ TEST(TicketRecord, NonsenseIsRefused) {
     EXPECT_FALSE(bit0(single::Walk::call(*ticket.real(), nullptr, nullptr, nullptr, 0)));
     EXPECT_EQ(ticket.content(), "a[0]=1 n[0]=p0");
 
-    const STICKET_ACCESS stale = *ticket.real(); // Its words, and a handle that will be nobody's.
+    const STICKET_ACCESS stale = *ticket.real(); // Its words, and a handle that will be invalid.
     ticket.destroy();
     EXPECT_EQ(ticket.send("a=1"), "0");
     EXPECT_EQ(support::ticketText(&stale), "");
