@@ -343,18 +343,23 @@ std::string screenText(const Outcome& outcome, const Aim& aim, bool isReferenceD
 
 std::string lineText(const Outcome& outcome, const Painter& paint, std::size_t width) {
     constexpr std::size_t ofWord = 14;
-    constexpr std::size_t ofName = 30;
+    constexpr std::size_t ofFigures = 19;
+    constexpr std::size_t ofName = 24;
+    constexpr std::size_t shortestReason = 8;
     const Mark mark = markOf(outcome.fate);
-    std::string reason = outcome.fate == Fate::NotDone ? outcome.problem->what
-                         : outcome.criterion.empty()   ? ""
-                                                       : outcome.criterion + ", " + outcome.figures;
     const std::string name = padded(outcome.measurement.path, ofName);
+    std::string reason = outcome.fate == Fate::NotDone ? outcome.problem->what : outcome.criterion;
     if (width != 0) {
-        const std::size_t used = 2 + ofWord + 2 + base::charactersIn(name) + 2;
-        reason = used + 12 < width ? fitted(reason, width - used) : reason;
+        const std::size_t used = 2 + ofWord + 2 + ofFigures + 2 + base::charactersIn(name) + 2;
+        reason = used + shortestReason <= width ? fitted(reason, width - used) : "";
     }
-    return "  " + paint(mark.tone, padded(std::string(mark.sign) + ' ' + say(mark.word), ofWord)) +
-           "  " + paint(Tone::Plain, name) + "  " + paint(Tone::Soft, reason) + '\n';
+    const std::size_t ofText = base::charactersIn(outcome.figures);
+    const std::string line =
+        "  " + paint(mark.tone, padded(std::string(mark.sign) + ' ' + say(mark.word), ofWord)) +
+        "  " + std::string(ofText < ofFigures ? ofFigures - ofText : 0, ' ') +
+        paint(Tone::Bold, outcome.figures) + "  " + paint(Tone::Plain, name) + "  " +
+        paint(Tone::Soft, reason);
+    return line.substr(0, line.find_last_not_of(' ') + 1) + '\n';
 }
 
 void Totals::add(const Outcome& outcome) {
