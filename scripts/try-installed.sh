@@ -21,6 +21,9 @@ printf 'instrument = virtual\nprofile = %s\nerror = 0.4\n' "$profile" >"$setting
 env -i HOME="$place" TMPDIR="$place/tmp" PATH="$prefix/bin:/usr/bin:/bin" \
   ASAN_OPTIONS="${ASAN_OPTIONS:-}" LSAN_OPTIONS="${LSAN_OPTIONS:-}" \
   TINTGATE_STORE="$place/store" JOB="$place/job" PROFILE="$profile" bash -euo pipefail <<'INSIDE'
+cp /usr/share/color/icc/TR006.ti3 "$HOME/proof.txt"
+tintgate-check -t FOGRA39L "$HOME/proof.txt" --page >/dev/null
+[ -s "$HOME/proof.html" ]
 tintgate-store make
 tintgate-store user add anna --password-file - <<<gate
 docs/example-job/make-job.py "$JOB" --unmeasured --references "$PROFILE"

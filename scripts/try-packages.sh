@@ -39,6 +39,9 @@ profile=$(find /usr/share/color/icc/ghostscript -name default_cmyk.icc)
 printf 'instrument = virtual\nprofile = %s\nerror = 0.4\n' "$profile" >/etc/tintgate/measure.conf
 su press -c "profile='$profile' bash -euo pipefail" <<'PRESS'
 cd
+cp /usr/share/color/icc/TR006.ti3 proof.txt
+tintgate-check -t FOGRA39L proof.txt --page
+grep -c . proof.html
 export TINTGATE_STORE=$HOME/store
 tintgate-store make
 tintgate-store user add anna --password-file - <<<gate
@@ -57,7 +60,7 @@ done
 tintgate-report --text "$folder/output.json" | head -n 12
 tintgate-report "$folder/output.json" --label label.pdf --pdf certificate.pdf
 ls -l label.pdf certificate.pdf
-man -w Tintgate tintgate-store tintgate-report NerovaMeasure NerovaVerify 2>/dev/null || true
+man -w Tintgate tintgate-check tintgate-store tintgate-report NerovaMeasure NerovaVerify 2>/dev/null || true
 echo "exit code of the job: $code"
 exit "$code"
 PRESS

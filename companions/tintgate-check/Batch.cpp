@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <condition_variable>
 #include <cstddef>
+#include <exception>
 #include <map>
 #include <mutex>
 #include <system_error>
@@ -24,6 +25,26 @@ class Batch {
         : m_next(next), m_work(work), m_emit(emit), m_window(outcomesOfThread * threads) {}
 
     void run() {
+        try {
+            takeAll();
+        } catch (...) {
+            const std::lock_guard lock(m_mutex);
+            m_failure = std::current_exception();
+            m_stopped = m_ended = true;
+            m_emitted.notify_all();
+        }
+    }
+
+    void rethrowFailure() const {
+        if (m_failure) {
+            std::rethrow_exception(m_failure);
+        }
+    }
+
+  private:
+    static constexpr std::size_t outcomesOfThread = 16;
+
+    void takeAll() {
         std::unique_lock lock(m_mutex);
         while (true) {
             m_emitted.wait(lock, [&] { return m_ended || m_taken < m_first + m_window; });
@@ -44,9 +65,6 @@ class Batch {
             emitInOrder();
         }
     }
-
-  private:
-    static constexpr std::size_t outcomesOfThread = 16;
 
     void emitInOrder() {
         bool any = false;
@@ -75,6 +93,7 @@ class Batch {
     std::size_t m_first = 0; ///< The number of the outcome that is emitted next.
     bool m_ended = false;    ///< No further measurement is taken.
     bool m_stopped = false;  ///< Nothing is emitted any more.
+    std::exception_ptr m_failure;
 };
 
 } // namespace
@@ -95,6 +114,7 @@ void verifyAll(const std::function<std::optional<Measurement>()>& next,
     for (std::thread& thread : others) {
         thread.join();
     }
+    batch.rethrowFailure();
 }
 
 unsigned availableProcessors() {

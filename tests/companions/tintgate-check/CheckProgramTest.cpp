@@ -23,13 +23,19 @@ TEST_F(CheckTest, SaysWhatTheToolSays) {
     int compared = 0;
     for (const std::string& target : files) {
         for (const std::string& measurement : files) {
-            for (const char* preset : {"CVP_0001.xml", "CVP_0005.xml"}) {
+            for (const auto& [preset, patchSet] :
+                 {std::pair("CVP_0001.xml", std::string()), std::pair("CVP_0005.xml", few)}) {
                 SCOPED_TRACE(target + " " + measurement + " " + preset);
-                const std::vector<std::string> words = {"-t", target, "-p", presets + preset,
-                                                        measurement};
+                std::vector<std::string> words = {"-t", target, "-p", presets + preset,
+                                                  measurement};
+                std::vector<std::string> ofTool = {TINTGATE, target, measurement, presets + preset,
+                                                   tool};
+                if (!patchSet.empty()) {
+                    words.insert(words.end(), {"--patch-set", patchSet});
+                    ofTool.push_back(patchSet);
+                }
                 fs::remove(tool);
-                const int code =
-                    support::run({TINTGATE, target, measurement, presets + preset, tool}).exitCode;
+                const int code = support::run(ofTool).exitCode;
                 std::vector<std::string> withResult = words;
                 withResult.insert(withResult.end(), {"--result", "--out", m_scratch.path("out")});
                 const support::Outcome outcome = check(withResult);
@@ -52,7 +58,7 @@ TEST_F(CheckTest, SaysWhatTheToolSays) {
             }
         }
     }
-    EXPECT_EQ(compared, 48); // of two profiles nothing says where to evaluate them
+    EXPECT_EQ(compared, 49); // two profiles need a patch set
 }
 
 TEST_F(CheckTest, FindsWhatAPrintIsComparedWith) {
