@@ -37,6 +37,8 @@ Examples:
   tintgate-store file versions /jobs/7/job.jdf
   tintgate-store reset 7 --strip 1
   tintgate-store jdf ready 7 --updates 6
+  tintgate-store backup /backup/monday
+  tintgate-store archive --closed 90d /srv/archive
   tintgate-store diagnose 7 --strip 2
 
 Each command has a --help of its own. docs/stores.md shows how to set up a whole job.
