@@ -815,29 +815,31 @@ void ServerFiles::verify(Verified& found, const StoreEngine::ShowFault& show) {
                  }
              });
     visitVersions(m_files, [&](const std::string& path, const Descriptor& folder) {
-        const auto list = versions(path);
-        for (const auto& version : list) {
-            ++found.versions;
-            found.bytes +=
-                verifyContent(folder, versionName(version.number),
-                              "/" + path + ", version " + std::to_string(version.number), show);
-        }
-        std::string gap =
-            gapIn(list, std::max(list.empty() ? 0 : list.back().number, lastUsedUp(folder)));
-        bool isThere = true;
         try {
-            isThere = at(path).has_value();
-        } catch (const StoreFailure& failure) {
-            gap = failure.what();
-        }
-        // A removal may be under way, which takes the versions first.
-        if (!isThere && !versions(path).empty()) {
-            gap = "has versions, but no file";
-        }
-        if (!gap.empty()) {
-            show("/" + path, gap);
+            verifyVersions(path, folder, found, show);
+        } catch (const StoreFailure& failure) { // No path that a delivery makes, say.
+            show("/" + path, failure.what());
         }
     });
+}
+
+void ServerFiles::verifyVersions(const std::string& path, const Descriptor& folder, Verified& found,
+                                 const StoreEngine::ShowFault& show) {
+    const auto list = versions(path);
+    for (const auto& version : list) {
+        ++found.versions;
+        found.bytes +=
+            verifyContent(folder, versionName(version.number),
+                          "/" + path + ", version " + std::to_string(version.number), show);
+    }
+    const int highest = std::max(list.empty() ? 0 : list.back().number, lastUsedUp(folder));
+    if (const std::string gap = gapIn(list, highest); !gap.empty()) {
+        show("/" + path, gap);
+    }
+    // A removal may be under way, which takes the versions first.
+    if (!at(path) && !versions(path).empty()) {
+        show("/" + path, "has versions, but no file");
+    }
 }
 
 FileSnapshot ServerFiles::snapshot(const std::function<void()>& within) {

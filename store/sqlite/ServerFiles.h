@@ -75,6 +75,9 @@ class ServerFiles {
     void finishCopy();
 
   private:
+    void verifyVersions(const std::string& path, const base::Descriptor& folder, Verified& found,
+                        const StoreEngine::ShowFault& show);
+
     base::Descriptor m_files;
     bool m_later = false;
 };
