@@ -4,10 +4,12 @@
 // Instances, sessions and tickets passed in by a client are looked up before use, and no exception
 // leaves a slot.
 #include <cstring>
+#include <ctime>
 #include <map>
 #include <memory>
 #include <set>
 #include <string>
+#include <thread>
 
 #include "Shared-Components/Tintgate/NerovaKZComm/ComGUIModuleInterface.h"
 #include "comgui/Session.h"
@@ -116,6 +118,20 @@ std::unique_ptr<StoreEngine> openForLogin(const std::string& address) {
     }
 }
 
+/// Notes a login that is refused, and keeps whoever tries again and again waiting. A name that is
+/// no user's is not noted: people type their passwords in the wrong place.
+void refuse(StoreEngine& engine, const std::string& user, const std::string& why) {
+    const std::int64_t now = std::time(nullptr);
+    std::string known;
+    try {
+        known = engine.user(user) ? user : "";
+    } catch (const StoreFailure&) { // The refusal stays the answer.
+    }
+    engine.log({now, Event::Refusal, known, thisOrigin(), why});
+    std::this_thread::sleep_for(
+        refusalDelay(engine.refusalsSince(now - std::int64_t{refusalsCount.count()})));
+}
+
 std::int32_t login(void* instance, ComSessionRecord* record) {
     return answer([&] {
         Instance* const known = find(instance);
@@ -124,18 +140,22 @@ std::int32_t login(void* instance, ComSessionRecord* record) {
         }
         const std::string address = textOf(record->server);
         auto engine = openForLogin(address);
-        switch (checkLogin(*engine, textOf(record->user), textOf(record->password))) {
+        const std::string user = textOf(record->user);
+        switch (checkLogin(*engine, user, textOf(record->password))) {
         case LoginAnswer::WrongUserOrPassword:
+            refuse(*engine, user, "wrong user or password");
             return Code::WrongUserOrPassword;
         case LoginAnswer::Disabled:
+            refuse(*engine, user, "the user is disabled");
             return Code::UserDisabled;
         case LoginAnswer::Welcome:
+            engine->log({std::time(nullptr), Event::Login, user, thisOrigin(), ""});
             break;
         }
         // Never reused, so that the handle of an ended session stays invalid.
         static std::uint64_t lastHandle = 0;
         known->sessions.emplace(lastHandle + 1,
-                                std::make_unique<Session>(address, std::move(engine)));
+                                std::make_unique<Session>(address, user, std::move(engine)));
         record->session = ++lastHandle;
         return Code::Done;
     });

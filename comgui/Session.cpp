@@ -64,8 +64,8 @@ std::unique_ptr<StoreEngine> openStoreAt(const std::string& address) {
     return openStore(base::utf8FromLatin1(address));
 }
 
-Session::Session(std::string address, std::unique_ptr<StoreEngine> engine)
-    : m_address(std::move(address)), m_engine(std::move(engine)),
+Session::Session(std::string address, std::string user, std::unique_ptr<StoreEngine> engine)
+    : m_address(std::move(address)), m_user(std::move(user)), m_engine(std::move(engine)),
       m_storage(std::make_shared<CachingStorage>(
           m_engine,
           [this](int type, int id, const std::string& key, const std::string& reason) {
@@ -77,6 +77,8 @@ void Session::noteFailure(const std::string& target, const std::string& key,
                           const std::string& reason) const {
     WriteFailures(platform::temporaryFolder())
         .add({std::time(nullptr), m_address, target, key, reason});
+    m_engine->log({std::time(nullptr), Event::LostWrite, m_user, thisOrigin(),
+                   target + (key.empty() ? "" : " " + key) + ": " + reason});
 }
 
 Code Session::getTicketData(int type, int kind, int index, int* size, void* buffer) {

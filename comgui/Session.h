@@ -35,7 +35,7 @@ std::unique_ptr<StoreEngine> openStoreAt(const std::string& address);
 
 class Session {
   public:
-    Session(std::string address, std::unique_ptr<StoreEngine> engine);
+    Session(std::string address, std::string user, std::unique_ptr<StoreEngine> engine);
 
     const std::string& address() const { return m_address; }
     bool alive() const { return m_engine->alive(); }
@@ -59,6 +59,7 @@ class Session {
                      const std::string& reason) const;
 
     const std::string m_address;
+    const std::string m_user;
     const std::shared_ptr<StoreEngine> m_engine;
     const std::shared_ptr<CachingStorage> m_storage;
     TicketContainer m_container;

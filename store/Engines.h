@@ -2,12 +2,14 @@
 // The kinds of places that stores are in, and what is the same in each.
 #pragma once
 
+#include <functional>
 #include <memory>
 #include <string>
 #include <string_view>
 #include <utility>
 #include <vector>
 
+#include "store/KeyBytes.h"
 #include "store/StoreEngine.h"
 
 namespace store {
@@ -18,6 +20,7 @@ struct EngineKind {
     void (*make)(const std::string& address, const std::string& serverName);
     std::unique_ptr<StoreEngine> (*openCopy)(const std::string& address);
     bool (*bringUpToDate)(const std::string& address);
+    void (*grant)(const std::string& address, const std::string& role, Rights rights);
 };
 
 extern const EngineKind sqliteKind;
@@ -31,8 +34,20 @@ std::shared_ptr<Elements> decoded(std::string_view bytes);
 /// Names and stored values of what every client asks the system ticket for.
 std::vector<std::pair<std::string, std::string>> systemKeys(const std::string& serverName);
 
-/// Whether two tickets hold the same, to the bit.
-bool haveSameKeys(const TicketContent& one, const TicketContent& other);
+/// The reverse of eventName.
+std::optional<Event> eventNamed(std::string_view name);
+/// Of an entry's text. A log is bounded in bytes by this and its number of entries.
+inline constexpr std::size_t longestLogged = 500;
+
+/// Shows that a key can't be decoded.
+void showDamagedKey(int type, int id, std::string_view key, const StoreEngine::ShowFault& show);
+
+/// Shows that a block of the overview is not what its jobs' tickets say.
+void showOverview(std::int64_t block, const StoreEngine::ShowFault& show);
+
+/// What is wrong with the numbers of a file's versions, by number; empty if nothing is.
+/// highestVersion is the highest one that was ever given.
+std::string gapIn(const std::vector<FileVersion>& versions, int highestVersion);
 
 /// The lowest number from 1 on that is not among ascending ids.
 int lowestFree(const std::vector<int>& ids);

@@ -228,6 +228,16 @@ std::string keyBytes(const Elements& elements) {
     return bytes;
 }
 
+bool haveSameKeys(const TicketContent& one, const TicketContent& other) {
+    const auto& left = one.keys();
+    const auto& right = other.keys();
+    return std::equal(
+        left.begin(), left.end(), right.begin(), right.end(), [](const auto& a, const auto& b) {
+            return a.first == b.first &&
+                   (a.second == b.second || keyBytes(*a.second) == keyBytes(*b.second));
+        });
+}
+
 std::shared_ptr<Elements> elementsFromBytes(std::string_view bytes) {
     if (auto numbers = packed(bytes)) {
         return std::make_shared<Elements>(std::move(*numbers));

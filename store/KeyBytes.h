@@ -15,11 +15,15 @@
 #include <string>
 #include <string_view>
 
+#include "store/tickets/TicketContent.h"
 #include "store/tickets/TicketElements.h"
 
 namespace store {
 
 std::string keyBytes(const Elements& elements);
+
+/// Whether two tickets hold the same, to the bit.
+bool haveSameKeys(const TicketContent& one, const TicketContent& other);
 
 /// Null for bytes that keyBytes would not have written.
 std::shared_ptr<Elements> elementsFromBytes(std::string_view bytes);

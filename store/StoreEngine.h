@@ -86,6 +86,31 @@ struct Pruning {
 /// How many of a file's versions, by number, are removed.
 std::size_t countPruned(const std::vector<FileVersion>& versions, const Pruning& which);
 
+/// What a store's log is kept for.
+enum class Event { Login, Refusal, LostWrite, Administration };
+
+/// As people and scripts read it, such as "lost write".
+std::string_view eventName(Event event);
+
+struct LogEntry {
+    std::int64_t time = 0; ///< Seconds since 1970.
+    Event event = Event::Login;
+    std::string who;    ///< The store's user; empty for none, and for a name that is no user's.
+    std::string origin; ///< Account and machine that it came from; see thisOrigin.
+    std::string what;   ///< What was done, or why not. Never a password.
+};
+
+/// The number of this process's account and the machine's name, such as 1000@press-2.
+std::string thisOrigin();
+
+/// What verify found in a sound store.
+struct Verified {
+    std::int64_t tickets = 0;
+    std::int64_t files = 0;
+    std::int64_t versions = 0;
+    std::uint64_t bytes = 0; ///< Of files and versions.
+};
+
 /// What a change of a ticket is about to touch.
 struct Scope {
     /// The ticket is emptied first; keys says nothing then.
@@ -112,6 +137,10 @@ class StoreEngine {
     /// anew, here and by each operation; one that only reads, or that can be repeated, then starts
     /// again. After 30 seconds without the server, all waits together, it is for good.
     virtual bool alive() = 0;
+
+    /// The same for all that are open on the same store, whatever address led to it, and different
+    /// for any other store.
+    virtual std::string place() = 0;
 
     /// A number that differs from the last one if anybody has committed anything since. It may
     /// differ without that. Meant to be asked before each read. Where only a server knows, it is
@@ -199,6 +228,32 @@ class StoreEngine {
     /// Removes what interrupted deliveries left behind. The number of files removed.
     virtual int removeLeftovers() = 0;
 
+    // The log. It is best effort: a store that can't be written has none, and nothing fails for it.
+    // It keeps about the last 10,000 entries.
+
+    /// Notes an event. A login is noted without waiting for a server: with the session's next
+    /// change, or at its end.
+    virtual void log(const LogEntry& entry) noexcept = 0;
+    virtual std::vector<LogEntry> logEntries() = 0; ///< The oldest first.
+    /// How many refusals the log has from this time on.
+    virtual int refusalsSince(std::int64_t time) noexcept = 0;
+
+    /// Shown a fault: the ticket, file or part of the store that has it, and what is wrong.
+    using ShowFault = std::function<void(const std::string& where, const std::string& what)>;
+    /// Reads everything and changes nothing: whether the database is sound, each key can be
+    /// decoded, the overview of jobs agrees with the keys, each file and version has its content
+    /// and each content its file, and no version is missing between others. Others may be at work.
+    virtual Verified verify(const ShowFault& show) = 0;
+
+    /// Told how much of the work is done.
+    using ShowProgress = std::function<void(std::size_t done, std::size_t total)>;
+    /// Copies the whole store as it is at one moment to a new folder, which is a store then. Others
+    /// may be at work: they wait while the names of the files are read, and no longer. Throws
+    /// StoreFailure: Exists if something is there, but a folder in which a backup was cut off is
+    /// used again; Busy if files were removed meanwhile; Other for a store on a server, which has
+    /// its own means.
+    virtual void backUp(const std::string& folder, const ShowProgress& progress) = 0;
+
     // What a copy needs on top of these.
 
     /// By type, the highest id that it ever had, if that is above 0.
@@ -238,6 +293,17 @@ void makeStore(const std::string& address, const std::string& serverName);
 /// Makes a store without anything in it, as makeStore, or opens one of which a copy was begun and
 /// not finished. Until finishCopy nobody can open it otherwise, and nobody else to copy to it.
 std::unique_ptr<StoreEngine> openCopy(const std::string& address);
+
+/// What a role of a database server is given.
+enum class Rights {
+    Client, ///< What the tool needs: tickets and files, but no users and no administration.
+    Reports ///< To read jobs and files.
+};
+
+/// Gives a role these rights and takes all others that it has on the store. Throws StoreFailure
+/// (Other) for a store in a folder, which has permissions instead, and for a role that is not there
+/// or owns the store.
+void grantRights(const std::string& address, const std::string& role, Rights rights);
 
 /// Brings a store of an earlier format up to date. False when it was.
 bool bringStoreUpToDate(const std::string& address);

@@ -2,8 +2,13 @@
 #include "store/Engines.h"
 
 #include <algorithm>
+#include <climits>
+#include <utility>
+
+#include <unistd.h>
 
 #include "store/KeyBytes.h"
+#include "store/WriteFailures.h"
 
 namespace store {
 
@@ -25,6 +30,16 @@ void makeStore(const std::string& address, const std::string& serverName) {
 
 std::unique_ptr<StoreEngine> openCopy(const std::string& address) {
     return kindOf(address).openCopy(address);
+}
+
+void grantRights(const std::string& address, const std::string& role, Rights rights) {
+    kindOf(address).grant(address, role, rights);
+}
+
+std::string thisOrigin() {
+    char machine[HOST_NAME_MAX + 1] = {};
+    gethostname(machine, sizeof machine - 1);
+    return std::to_string(geteuid()) + "@" + machine;
 }
 
 bool bringStoreUpToDate(const std::string& address) {
@@ -59,14 +74,53 @@ std::size_t countPruned(const std::vector<FileVersion>& versions, const Pruning&
     return count;
 }
 
-bool haveSameKeys(const TicketContent& one, const TicketContent& other) {
-    const auto& left = one.keys();
-    const auto& right = other.keys();
-    return std::equal(
-        left.begin(), left.end(), right.begin(), right.end(), [](const auto& a, const auto& b) {
-            return a.first == b.first &&
-                   (a.second == b.second || keyBytes(*a.second) == keyBytes(*b.second));
-        });
+namespace {
+
+constexpr std::pair<Event, std::string_view> eventNames[] = {
+    {Event::Login, "login"},
+    {Event::Refusal, "refusal"},
+    {Event::LostWrite, "lost write"},
+    {Event::Administration, "administration"},
+};
+
+} // namespace
+
+std::string_view eventName(Event event) {
+    for (const auto& [known, name] : eventNames) {
+        if (known == event) {
+            return name;
+        }
+    }
+    return {};
+}
+
+std::optional<Event> eventNamed(std::string_view name) {
+    for (const auto& [event, known] : eventNames) {
+        if (known == name) {
+            return event;
+        }
+    }
+    return std::nullopt;
+}
+
+void showDamagedKey(int type, int id, std::string_view key, const StoreEngine::ShowFault& show) {
+    show(ticketNameOf(type, id), "its key " + std::string(key) + " can't be decoded");
+}
+
+void showOverview(std::int64_t block, const StoreEngine::ShowFault& show) {
+    const std::int64_t first = block * jobsOfBlock;
+    show("jobs " + std::to_string(first) + " to " + std::to_string(first + jobsOfBlock - 1),
+         "the overview of jobs does not agree with their tickets");
+}
+
+std::string gapIn(const std::vector<FileVersion>& versions, int highestVersion) {
+    for (std::size_t i = 0; i < versions.size(); ++i) {
+        const int next = i + 1 < versions.size() ? versions[i + 1].number : highestVersion + 1;
+        if (next != versions[i].number + 1) {
+            return "version " + std::to_string(versions[i].number + 1) + " is missing";
+        }
+    }
+    return {};
 }
 
 int lowestFree(const std::vector<int>& ids) {

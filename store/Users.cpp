@@ -1,6 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "store/Users.h"
 
+#include <algorithm>
 #include <new>
 
 #include <sodium.h>
@@ -28,6 +29,16 @@ LoginAnswer checkLogin(StoreEngine& store, std::string_view name, std::string_vi
         return LoginAnswer::WrongUserOrPassword;
     }
     return user->disabled ? LoginAnswer::Disabled : LoginAnswer::Welcome;
+}
+
+std::chrono::milliseconds refusalDelay(int refusals) {
+    constexpr std::chrono::milliseconds first{125};
+    constexpr std::chrono::milliseconds longest{2'000};
+    auto delay = refusals > 1 ? first : std::chrono::milliseconds{};
+    for (int each = 2; each < refusals && delay < longest; ++each) {
+        delay *= 2;
+    }
+    return std::min(delay, longest);
 }
 
 } // namespace store

@@ -2,6 +2,7 @@
 // Who may log in to a store.
 #pragma once
 
+#include <chrono>
 #include <string>
 #include <string_view>
 
@@ -17,6 +18,11 @@ enum class LoginAnswer { Welcome, WrongUserOrPassword, Disabled };
 /// libsodium's limits for interactive use, two passes over 64 MiB, which costs a login somewhat
 /// under 0.1 s of one core and that memory for as long.
 LoginAnswer checkLogin(StoreEngine& store, std::string_view name, std::string_view password);
+
+/// How long a login that is refused is kept waiting, after so many refusals within refusalsCount,
+/// this one with them: the first not at all, the sixth and each further one two seconds.
+std::chrono::milliseconds refusalDelay(int refusals);
+inline constexpr std::chrono::seconds refusalsCount{60};
 
 /// The salted hash of a password, as a user's record holds it. Throws std::bad_alloc where there is
 /// no memory for it.

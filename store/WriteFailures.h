@@ -1,15 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 // Writes that a server did not take, kept for people: exit codes and a run's log do not mention
-// them. A text file in the temporary folder has a line for each, with tabs between its parts:
+// them. A file in the temporary folder has a line for each, as LineFile.h describes:
 //
 //   2024-05-01T12:34:56Z  /srv/tintgate  job/7  Remote/Measurement/Status  the store is locked
-//
-// Bytes that are no printable ASCII character, and backslashes, are written as \xNN.
 #pragma once
 
 #include <cstdint>
 #include <string>
 #include <vector>
+
+#include "store/LineFile.h"
 
 namespace store {
 
@@ -29,18 +29,16 @@ class WriteFailures {
     /// Of a user, in a folder for temporary files. With an empty folder nothing is kept.
     explicit WriteFailures(const std::string& folder);
 
-    const std::string& path() const { return m_path; }
+    const std::string& path() const { return m_file.path(); }
 
-    /// Appends a line, in one piece. The file is made with mode 0600. If it has a megabyte, it is
-    /// put aside first, under its name and ".old". What fails here is passed over, and a file of
-    /// another user or a link is left alone.
+    /// What fails here is passed over, and a file of another user or a link is left alone.
     void add(const WriteFailure& failure) const;
 
     /// All that the file contains, with \xNN as it is. Lines that make no sense are left out.
     std::vector<WriteFailure> all() const;
 
   private:
-    std::string m_path;
+    LineFile m_file;
 };
 
 } // namespace store

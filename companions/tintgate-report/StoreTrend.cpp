@@ -259,11 +259,17 @@ report::Sample sampleOf(const store::TicketContent& job, const Verified& verifie
     return sample;
 }
 
+/// Results by family, strip and measured values, and the sample that each has become.
+using KnownResults = std::map<std::tuple<int, Strip, std::string>, std::size_t>;
+
 /// The samples of a store, one by one.
 class Gatherer {
   public:
-    Gatherer(store::StoreEngine& store, const Filter& filter, const PagePlace& place)
-        : m_store(store), m_filter(filter), m_place(place), m_server(store), m_targets(store) {}
+    /// Samples go to those that other stores gave, and results that these know are left out.
+    Gatherer(store::StoreEngine& store, const Filter& filter, const PagePlace& place,
+             KnownResults& known, Gathered& gathered)
+        : m_store(store), m_filter(filter), m_place(place), m_server(store), m_targets(store),
+          m_known(known), m_gathered(gathered) {}
 
     void add(const Verified& verified) {
         const SharedContent job =
@@ -300,20 +306,23 @@ class Gatherer {
         m_gathered.samples.push_back(std::move(sample));
     }
 
-    Gathered gathered(const languages::Texts& say) && {
+    void addNotes(const languages::Texts& say) {
         for (const int id : m_server.presetsWithoutFile()) {
-            m_gathered.notes.push_back(
-                say("trendNote.presetUnreadable", {{"preset", std::to_string(id)}}));
+            std::string note = say("trendNote.presetUnreadable", {{"preset", std::to_string(id)}});
+            auto& notes = m_gathered.notes;
+            if (std::find(notes.begin(), notes.end(), note) == notes.end()) {
+                notes.push_back(std::move(note));
+            }
         }
         if (m_changes != 0) {
             m_gathered.notes.push_back(say("trendNote.otherTolerances", {{"count", m_changes}}));
         }
-        return std::move(m_gathered);
     }
 
   private:
     /// A run writes the result of a sheet to each of its jobs and to their parent. It counts once,
-    /// for the first job, and leads to the page wherever in the family it is.
+    /// for the first job, and leads to the page wherever in the family it is. So does a job that is
+    /// in two stores because its move to an archive was cut off.
     bool isKnown(const Verified& verified, const std::vector<double>& measured,
                  const std::string& page) {
         const int family = verified.parent > 0 ? verified.parent : verified.job;
@@ -338,25 +347,31 @@ class Gatherer {
     Targets m_targets;
     const LocalPages m_pages;
     const store::KeyFilter m_keys[2] = {keysOf(Strip::First), keysOf(Strip::Second)};
-    std::map<std::tuple<int, Strip, std::string>, std::size_t> m_known;
-    Gathered m_gathered;
+    KnownResults& m_known;
+    Gathered& m_gathered;
     std::size_t m_changes = 0;
 };
 
 } // namespace
 
-Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place,
-                     const languages::Texts& say) {
-    try {
-        const auto store = store::openStore(address, store::Access::Read);
-        Gatherer gatherer(*store, filter, place);
-        for (const Verified& verified : verifiedStrips(*store, filter)) {
-            gatherer.add(verified);
+Gathered gatherStores(const std::vector<std::string>& addresses, const Filter& filter,
+                      const PagePlace& place, const languages::Texts& say) {
+    Gathered gathered;
+    KnownResults known;
+    for (const auto& address : addresses) {
+        try {
+            const auto store = store::openStore(address, store::Access::Read);
+            Gatherer gatherer(*store, filter, place, known, gathered);
+            for (const Verified& verified : verifiedStrips(*store, filter)) {
+                gatherer.add(verified);
+            }
+            gatherer.addNotes(say);
+        } catch (const store::StoreFailure& failure) {
+            throw Failure(Status::Store,
+                          (addresses.size() > 1 ? address + ": " : "") + failure.what());
         }
-        return std::move(gatherer).gathered(say);
-    } catch (const store::StoreFailure& failure) {
-        throw Failure(Status::Store, failure.what());
     }
+    return gathered;
 }
 
 } // namespace report

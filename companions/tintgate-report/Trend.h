@@ -37,9 +37,9 @@ Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& fi
                      std::optional<languages::Language> language, const languages::Texts& say,
                      const std::function<void(const std::string&)>& complain);
 
-/// Reads the results that the jobs of a store hold. Links lead to the pages that lie in the tool's
-/// folder on this machine. Throws Failure (Store).
-Gathered gatherStore(const std::string& address, const Filter& filter, const PagePlace& place,
-                     const languages::Texts& say);
+/// Reads the results that the jobs of stores hold, such as of a room and its archive. Links lead to
+/// the pages that lie in the tool's folder on this machine. Throws Failure (Store).
+Gathered gatherStores(const std::vector<std::string>& addresses, const Filter& filter,
+                      const PagePlace& place, const languages::Texts& say);
 
 } // namespace report

@@ -72,7 +72,7 @@ struct Options {
     bool verdict = false;
     bool trend = false;
     bool noPages = false;
-    std::string store;
+    std::vector<std::string> stores;
     std::string since;
     std::string until;
     std::string series;
@@ -87,7 +87,7 @@ struct Options {
     bool averages = false;
     report::AverageOptions average;
 
-    bool fromStore() const { return !store.empty(); }
+    bool fromStore() const { return !stores.empty(); }
     /// For all that is not about one job alone.
     languages::Texts texts() const {
         return languages::Texts(language ? *language : languages::languageOfUser());
@@ -192,7 +192,7 @@ Status reportTrend(const Options& options) {
     const languages::Texts say = options.texts();
     report::Gathered gathered =
         options.fromStore()
-            ? report::gatherStore(options.store, options.filter, place, say)
+            ? report::gatherStores(options.stores, options.filter, place, say)
             : report::gatherFiles(options.results, options.filter,
                                   options.series == "folder" ? report::SeriesBy::Folders
                                                              : report::SeriesBy::Statements,
@@ -201,7 +201,11 @@ Status reportTrend(const Options& options) {
         throw Failure(gathered.leftOut != 0 ? Status::Unreadable : Status::NothingFound,
                       "there is no result that fits what was asked for");
     }
-    writeTrend(options, report::makeTrend(std::move(gathered.samples), options.store,
+    std::string stores;
+    for (const auto& store : options.stores) {
+        stores += (stores.empty() ? "" : ", ") + store;
+    }
+    writeTrend(options, report::makeTrend(std::move(gathered.samples), stores,
                                           std::move(gathered.notes), say));
     return gathered.leftOut != 0 ? Status::SomeLeftOut : Status::Done;
 }
@@ -295,9 +299,11 @@ void addOptions(CLI::App& program, Options& options) {
     const char* const trend = "Trend of several results, of folders or of a store";
     program.add_flag("--trend", options.trend, "A trend also of one result")->group(trend);
     program
-        .add_option("--store", options.store,
-                    "The results that a store's jobs hold; where no\n"
+        .add_option("--store", options.stores,
+                    "The results that a store's jobs hold; given\n"
+                    "several times, of these stores together. Where no\n"
                     "result is named, TINTGATE_STORE does the same")
+        ->allow_extra_args(false)
         ->type_name("ADDRESS")
         ->group(trend);
     program
@@ -396,8 +402,8 @@ void settle(Options& options) {
     }
     const char* const store = std::getenv("TINTGATE_STORE");
     if (!options.code && !options.tidyDays && options.preset.empty() && options.results.empty() &&
-        options.store.empty() && store != nullptr) {
-        options.store = store;
+        options.stores.empty() && store != nullptr) {
+        options.stores = {store};
     }
     if (options.code.has_value() + options.tidyDays.has_value() + !options.preset.empty() +
             options.fromStore() + !options.results.empty() !=

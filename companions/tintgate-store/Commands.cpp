@@ -70,11 +70,11 @@ Progress::~Progress() {
     }
 }
 
-void Progress::done(std::size_t count) {
+void Progress::done(std::size_t count, std::size_t total) {
     const std::int64_t now = milliseconds();
     if (m_shown && now - m_last >= 100) {
         m_last = now;
-        std::fprintf(stderr, "\r%zu of %zu %s\x1b[K", count, m_total, m_what.c_str());
+        std::fprintf(stderr, "\r%zu of %zu %s\x1b[K", count, total, m_what.c_str());
     }
 }
 

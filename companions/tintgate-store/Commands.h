@@ -35,8 +35,13 @@ void addTicketCommands(Command program, Invocation& invocation); ///< ticket ...
 void addKeyCommands(Command program, Invocation& invocation);    ///< key ...
 void addFileCommands(Command program, Invocation& invocation);   ///< file ...
 void addJobCommands(Command program, Invocation& invocation);    ///< jobs, reset
+void addArchiveCommand(Command program, Invocation& invocation); ///< archive
+void addBackupCommands(Command program, Invocation& invocation); ///< backup, restore
 void addJdfCommands(Command program, Invocation& invocation);    ///< jdf ...
 void addCopyCommand(Command program, Invocation& invocation);    ///< copy
+
+void addGrantCommand(Command program, Invocation& invocation); ///< grant
+void addLogCommand(Command program, Invocation& invocation);   ///< log
 
 /// diagnose
 void addDiagnoseCommand(Command program, Invocation& invocation);
@@ -55,11 +60,14 @@ Command addCommand(Command group, Invocation& invocation, const std::string& nam
 class Progress {
   public:
     Progress(std::size_t total, std::string what);
+    /// Where the total is not known yet.
+    explicit Progress(std::string what) : Progress(0, std::move(what)) {}
     ~Progress();
     Progress(const Progress&) = delete;
     Progress& operator=(const Progress&) = delete;
 
-    void done(std::size_t count);
+    void done(std::size_t count) { done(count, m_total); }
+    void done(std::size_t count, std::size_t total);
 
   private:
     const std::size_t m_total;

@@ -51,4 +51,13 @@ std::int64_t timeBefore(int days) {
     return std::time(nullptr) - days * secondsOfDay;
 }
 
+std::string shownTime(std::int64_t seconds) {
+    const std::time_t time = seconds;
+    std::tm parts = {};
+    localtime_r(&time, &parts);
+    char text[32];
+    std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &parts);
+    return text;
+}
+
 } // namespace admin

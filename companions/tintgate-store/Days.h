@@ -20,4 +20,7 @@ std::string dayBefore(int days);
 /// The moment that was so many days before now, in seconds since 1970.
 std::int64_t timeBefore(int days);
 
+/// A moment as people read it, here.
+std::string shownTime(std::int64_t seconds);
+
 } // namespace admin

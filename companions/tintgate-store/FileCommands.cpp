@@ -1,5 +1,4 @@
 // SPDX-License-Identifier: Apache-2.0
-#include <ctime>
 #include <filesystem>
 #include <iostream>
 
@@ -33,15 +32,6 @@ struct FileOptions {
 
 int versionNumber(const FileOptions& options) {
     return wholeNumber(options.version, 1, std::numeric_limits<int>::max(), "version");
-}
-
-std::string shownTime(std::int64_t seconds) {
-    const std::time_t time = seconds;
-    std::tm parts = {};
-    localtime_r(&time, &parts);
-    char text[32];
-    std::strftime(text, sizeof text, "%Y-%m-%d %H:%M:%S", &parts);
-    return text;
 }
 
 /// As XML's judge sees a content: "xml" is null for what is no XML, "fault" tells what is wrong.

@@ -13,6 +13,7 @@
 #include "companions/tintgate-store/Credentials.h"
 #include "companions/tintgate-store/Failure.h"
 #include "companions/tintgate-store/KeyValue.h"
+#include "companions/tintgate-store/LocalFile.h"
 #include "companions/tintgate-store/Rows.h"
 #include "companions/tintgate-store/TicketName.h"
 
@@ -92,6 +93,36 @@ void info(const Invocation& invocation) {
                invocation.json);
 }
 
+/// Throws Failure (Damaged) if there is a fault, after all are shown.
+void verify(const Invocation& invocation) {
+    const auto store = invocation.open();
+    std::vector<Row> faults;
+    const auto found = store->verify([&](const std::string& where, const std::string& what) {
+        faults.push_back({{"where", textOrBytes(where)}, {"what", textOrBytes(what)}});
+    });
+    if (invocation.json) {
+        showObject({{"tickets", found.tickets},
+                    {"files", found.files},
+                    {"versions", found.versions},
+                    {"bytes", found.bytes},
+                    {"faults", faults}},
+                   true);
+    } else {
+        if (!faults.empty()) {
+            showRows({{"where", "WHERE"}, {"what", "FAULT"}}, faults, false);
+        }
+        std::cout << "Read " << counted(found.tickets, "ticket") << ", "
+                  << counted(found.files, "file") << " and " << counted(found.versions, "version")
+                  << ": " << (faults.empty() ? "no fault" : counted(std::ssize(faults), "fault"))
+                  << '\n';
+    }
+    if (!faults.empty()) {
+        finishStandardOutput();
+        throw Failure(Status::Damaged,
+                      "the store is damaged: " + counted(std::ssize(faults), "fault") + " found");
+    }
+}
+
 } // namespace
 
 void addStoreCommands(Command program, Invocation& invocation) {
@@ -113,6 +144,13 @@ void addStoreCommands(Command program, Invocation& invocation) {
         program, invocation, "upgrade", "Bring a store of an older format up to date",
         std::make_shared<NoOptions>(), [&](const NoOptions&) { upgrade(invocation); })
         .footer("Back the store up first; there is no way back.");
+    addCommand<NoOptions>(
+        program, invocation, "verify", "Read all of the store and say whether it is whole",
+        std::make_shared<NoOptions>(), [&](const NoOptions&) { verify(invocation); })
+        .footer("Changes nothing, and others may be at work. Reads the database and all files, "
+                "looks whether each key\ncan be decoded, each file and version has its content "
+                "and each content its file, and no version is\nmissing. A backup that passes is "
+                "a whole one. Status 10 if there is a fault.");
     addCommand<NoOptions>(program, invocation, "info", "Show what is in the store",
                           std::make_shared<NoOptions>(),
                           [&](const NoOptions&) { info(invocation); });

@@ -12,6 +12,7 @@
 
 #include <CLI/CLI.hpp>
 
+#include "companions/tintgate-store/AdministrationLog.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Failure.h"
@@ -36,6 +37,8 @@ Examples:
   tintgate-store file versions /jobs/7/job.jdf
   tintgate-store reset 7 --strip 1
   tintgate-store jdf ready 7 --updates 6
+  tintgate-store backup /backup/monday
+  tintgate-store archive --closed 90d /srv/archive
   tintgate-store diagnose 7 --strip 2
 
 Each command has a --help of its own. docs/stores.md shows how to set up a whole job.
@@ -46,7 +49,8 @@ int end(Status status) {
     return static_cast<int>(status);
 }
 
-int fail(Status status, const char* text) {
+int fail(Status status, const char* text, std::string& error) {
+    error = text;
     std::fprintf(stderr, "tintgate-store: %s\n", admin::printable(text).c_str());
     return end(status);
 }
@@ -86,22 +90,22 @@ void unmarkOptions(CLI::App& command) {
     }
 }
 
-int run(admin::Invocation& invocation) {
+int run(admin::Invocation& invocation, std::string& error) {
     try {
         invocation.address = admin::completeAddress(invocation.address);
         invocation.action();
         admin::finishStandardOutput();
         return end(Status::Done);
     } catch (const admin::Failure& failure) {
-        return fail(failure.status, failure.what());
+        return fail(failure.status, failure.what(), error);
     } catch (const store::StoreFailure& failure) {
-        return fail(admin::statusOf(failure.fault), failure.what());
+        return fail(admin::statusOf(failure.fault), failure.what(), error);
     } catch (const std::bad_alloc&) {
-        return fail(Status::Full, "there is not enough memory");
+        return fail(Status::Full, "there is not enough memory", error);
     } catch (const std::filesystem::filesystem_error& failure) {
-        return fail(Status::LocalFile, failure.what());
+        return fail(Status::LocalFile, failure.what(), error);
     } catch (const std::exception& failure) {
-        return fail(Status::Other, failure.what());
+        return fail(Status::Other, failure.what(), error);
     }
 }
 
@@ -130,7 +134,11 @@ int main(int argumentCount, char** arguments) {
     admin::addJobCommands(commands, invocation);
     admin::addJdfCommands(commands, invocation);
     admin::addCopyCommand(commands, invocation);
+    admin::addBackupCommands(commands, invocation);
+    admin::addArchiveCommand(commands, invocation);
     admin::addDiagnoseCommand(commands, invocation);
+    admin::addGrantCommand(commands, invocation);
+    admin::addLogCommand(commands, invocation);
     program.footer(std::string(footer) + tintgateStoreStatusHelp);
     unmarkOptions(program);
     auto words = markedArguments(argumentCount, arguments);
@@ -140,5 +148,9 @@ int main(int argumentCount, char** arguments) {
     } catch (const CLI::ParseError& failure) {
         return program.exit(failure) == 0 ? end(Status::Done) : end(Status::BadCommand);
     }
-    return run(invocation);
+    const std::string command = admin::loggedCommand(program);
+    std::string error;
+    const int status = run(invocation, error);
+    admin::logCommand(invocation.address, command, error);
+    return status;
 }

@@ -15,7 +15,9 @@
 #include "store/postgres/Postgres.h"
 #include "store/postgres/PostgresFiles.h"
 #include "store/postgres/PostgresListing.h"
+#include "store/postgres/PostgresRights.h"
 #include "store/postgres/PostgresSchema.h"
+#include "store/postgres/PostgresVerify.h"
 
 namespace store {
 
@@ -87,6 +89,10 @@ constexpr Statement someKeys = {
 /// anything.
 constexpr Statement snapshot = {"SELECT pg_current_snapshot()::text"};
 
+constexpr Statement placeOf = {
+    "SELECT 'database ' || system_identifier || ' ' || oid FROM pg_control_system(), pg_database"
+    " WHERE datname = current_database()"};
+
 constexpr Statement lockTicket = {
     "UPDATE tintgate.tickets SET changes = changes + 1 WHERE type = $1 AND id = $2"
     " RETURNING number"};
@@ -126,6 +132,15 @@ constexpr Statement addOneUser = {
     "INSERT INTO tintgate.users (name, hash, disabled) VALUES ($1, $2, $3) ON CONFLICT DO NOTHING"};
 constexpr Statement removeOneUser = {"DELETE FROM tintgate.users WHERE name = $1"};
 
+constexpr Statement hasLog = {"SELECT to_regclass('tintgate.log') IS NOT NULL"};
+constexpr Statement addLogged = {
+    "INSERT INTO tintgate.log (time, event, who, origin, what) VALUES ($1, $2, $3, $4, $5)"};
+constexpr Statement allLogged = {
+    "SELECT time, event, who, origin, what FROM tintgate.log ORDER BY number"};
+constexpr Statement countRefusals = {
+    "SELECT count(*) FROM tintgate.log WHERE event = $1 AND time >= $2"};
+constexpr std::size_t longestName = 200; ///< As the log's table has it.
+
 /// Held by the one who copies to the store. "TGAT" as a number.
 constexpr Statement lockCopy = {"SELECT pg_try_advisory_lock(1413955924)"};
 /// Until it is a store, nothing in it needs to be on the disk.
@@ -159,8 +174,13 @@ struct CoarseClock {
 class PostgresEngine : public StoreEngine {
   public:
     explicit PostgresEngine(Connection connection) : m_connection(std::move(connection)) {}
+    ~PostgresEngine() override { writeLog(); }
 
     bool alive() override { return m_connection.isThere(); }
+
+    std::string place() override {
+        return m_connection.repeating([&] { return m_connection.run(placeOf).text(0, 0); });
+    }
 
     std::uint64_t commits(std::chrono::milliseconds age) override {
         const auto now = CoarseClock::now();
@@ -319,6 +339,7 @@ class PostgresEngine : public StoreEngine {
 
     bool change(int type, int id, const Scope& scope,
                 const std::function<void(TicketContent&)>& work) override {
+        writeLog();
         const auto once = [&] { return changeOnce(type, id, scope, work); };
         return scope.repeatable ? m_connection.repeating(once) : m_connection.once(once);
     }
@@ -364,6 +385,7 @@ class PostgresEngine : public StoreEngine {
     }
 
     void putFile(std::string_view path, std::istream& from) override {
+        writeLog();
         m_connection.once([&] {
             noteChange();
             m_files.put(path, from);
@@ -401,6 +423,50 @@ class PostgresEngine : public StoreEngine {
         });
     }
     int removeLeftovers() override { return 0; } // The server undoes what is cut off.
+
+    void log(const LogEntry& entry) noexcept override {
+        try {
+            m_toLog.push_back(entry);
+            if (entry.event != Event::Login) {
+                writeLog();
+            }
+        } catch (...) { // Best effort.
+        }
+    }
+    std::vector<LogEntry> logEntries() override {
+        return m_connection.repeating([&] {
+            std::vector<LogEntry> entries;
+            if (m_connection.run(hasLog).number(0, 0) == 0) {
+                return entries;
+            }
+            const Result rows = m_connection.run(allLogged);
+            for (int row = 0; row < rows.rows(); ++row) {
+                if (const auto event = eventNamed(rows.bytes(row, 1))) {
+                    entries.push_back({rows.number(row, 0), *event, rows.text(row, 2),
+                                       rows.text(row, 3), rows.text(row, 4)});
+                }
+            }
+            return entries;
+        });
+    }
+    int refusalsSince(std::int64_t time) noexcept override {
+        try {
+            return static_cast<int>(
+                m_connection.run(countRefusals, eventName(Event::Refusal), time).number(0, 0));
+        } catch (...) {
+            return 0;
+        }
+    }
+
+    Verified verify(const ShowFault& show) override {
+        // Not again after a loss: faults would be shown twice.
+        return m_connection.once([&] { return postgres::verifyStore(m_connection, show); });
+    }
+
+    void backUp(const std::string&, const ShowProgress&) override {
+        throw StoreFailure(Fault::Other, "a store on a server is backed up by the server's own "
+                                         "means, such as pg_dump");
+    }
 
     std::map<int, int> highestIds() override {
         return m_connection.repeating([&] {
@@ -449,6 +515,24 @@ class PostgresEngine : public StoreEngine {
         std::string snapshot; ///< Of when they were fetched, or before.
         std::vector<int> ids;
     };
+
+    /// Writes what is to be logged. A store without a log, or one that this role may not add to, is
+    /// asked once.
+    void writeLog() noexcept {
+        try {
+            const auto entries = std::exchange(m_toLog, {});
+            for (const auto& entry : entries) {
+                if (m_logs && !m_connection.lost()) {
+                    m_connection.run(addLogged, entry.time, eventName(entry.event),
+                                     entry.who.substr(0, longestName),
+                                     entry.origin.substr(0, longestName),
+                                     entry.what.substr(0, longestLogged));
+                }
+            }
+        } catch (...) {
+            m_logs = false;
+        }
+    }
 
     bool changeOnce(int type, int id, const Scope& scope,
                     const std::function<void(TicketContent&)>& work) {
@@ -621,6 +705,8 @@ class PostgresEngine : public StoreEngine {
     std::string m_snapshot; ///< Of the last overview; empty once somebody has committed since.
     CoarseClock::time_point m_asked; ///< When that was still the server's.
     Ids m_ids;
+    std::vector<LogEntry> m_toLog;
+    bool m_logs = true;
 };
 
 std::unique_ptr<StoreEngine> openPostgres(const std::string& service, Access) {
@@ -656,9 +742,15 @@ bool upgradePostgres(const std::string& service) {
     return postgres::upgradeSchema(connection);
 }
 
+void grantPostgres(const std::string& service, const std::string& role, Rights rights) {
+    Connection connection(service);
+    postgres::checkSchema(connection);
+    postgres::grantRights(connection, role, rights);
+}
+
 } // namespace
 
 constinit const EngineKind postgresKind = {openPostgres, makePostgres, openPostgresCopy,
-                                           upgradePostgres};
+                                           upgradePostgres, grantPostgres};
 
 } // namespace store

@@ -102,6 +102,28 @@ constexpr const char* migrations[] = {
 };
 constexpr int format = std::size(migrations);
 
+/// The log, which is no part of the format: a store works without it, and one that was made before
+/// there was a log gets it from an upgrade. Whoever may add to it can't read or shorten it, which
+/// the trigger does as the table's owner.
+constexpr const char* logTable = R"(
+    CREATE TABLE tintgate.log (
+        number bigint GENERATED ALWAYS AS IDENTITY PRIMARY KEY,
+        time   bigint NOT NULL,                                -- seconds since 1970
+        event  bytea NOT NULL CHECK (length(event) <= 20),     -- as eventName gives it
+        who    bytea NOT NULL CHECK (length(who) <= 200),
+        origin bytea NOT NULL CHECK (length(origin) <= 200),
+        what   bytea NOT NULL CHECK (length(what) <= 500)
+    );
+    CREATE OR REPLACE FUNCTION tintgate.shorten_log() RETURNS trigger LANGUAGE plpgsql
+        SECURITY DEFINER SET search_path = pg_catalog AS $$
+    BEGIN
+        DELETE FROM tintgate.log WHERE number <= NEW.number - 10000;
+        RETURN NULL;
+    END $$;
+    REVOKE ALL ON FUNCTION tintgate.shorten_log FROM PUBLIC;
+    CREATE TRIGGER shorten AFTER INSERT ON tintgate.log
+        FOR EACH ROW WHEN (NEW.number % 100 = 0) EXECUTE FUNCTION tintgate.shorten_log())";
+
 constexpr const char* firstTables = R"(
     CREATE SCHEMA tintgate;
     CREATE TABLE tintgate.store (
@@ -113,6 +135,7 @@ constexpr const char* firstTables = R"(
 
 constexpr Statement hasSchema = {
     "SELECT EXISTS (SELECT FROM pg_namespace WHERE nspname = 'tintgate')"};
+constexpr Statement hasLog = {"SELECT to_regclass('tintgate.log') IS NOT NULL"};
 constexpr Statement state = {"SELECT format, copying FROM tintgate.store"};
 constexpr Statement lockedState = {"SELECT format FROM tintgate.store FOR UPDATE"};
 constexpr Statement setFormat = {"UPDATE tintgate.store SET format = $1"};
@@ -142,6 +165,12 @@ State stateOf(Connection& connection) {
     throw StoreFailure(Fault::Missing, "the server's database holds no store");
 }
 
+void addLog(Connection& connection) {
+    if (connection.run(hasLog).number(0, 0) == 0) {
+        connection.script(logTable);
+    }
+}
+
 void migrate(Connection& connection, std::int64_t from) {
     // However large the store is: this is a person's wish.
     connection.script("SET LOCAL statement_timeout = 0");
@@ -149,6 +178,7 @@ void migrate(Connection& connection, std::int64_t from) {
         connection.script(migrations[next]);
     }
     connection.run(setFormat, format);
+    addLog(connection);
 }
 
 } // namespace
@@ -197,6 +227,8 @@ bool upgradeSchema(Connection& connection) {
     // Of two upgrades at once, the second finds nothing to do.
     const std::int64_t from = connection.run(lockedState).number(0, 0);
     if (from >= format) {
+        addLog(connection);
+        transaction.commit();
         return false;
     }
     migrate(connection, from);

@@ -10,6 +10,7 @@
 #include <istream>
 #include <memory>
 #include <ostream>
+#include <set>
 #include <thread>
 #include <utility>
 
@@ -19,6 +20,7 @@
 #include <sys/stat.h>
 #include <unistd.h>
 
+#include "store/Engines.h"
 #include "store/ServerPath.h"
 #include "store/sqlite/Permissions.h"
 
@@ -249,8 +251,8 @@ class Delivery {
         }
     }
 
-    void setTime(std::int64_t seconds) {
-        const timespec times[2] = {{0, UTIME_OMIT}, {static_cast<time_t>(seconds), 0}};
+    void setTime(const timespec& written) {
+        const timespec times[2] = {{0, UTIME_OMIT}, written};
         if (futimens(m_file.get(), times) != 0) {
             fail(errno, m_what);
         }
@@ -445,6 +447,17 @@ void deliver(const Descriptor& files, const Place& place, const Source& source) 
 using ShowEntry = std::function<void(const Descriptor& folder, const std::string& name,
                                      const std::string& path, const struct stat& status)>;
 
+/// The parts of a path below the files folder, names of the store's own with them.
+std::vector<std::string> partsOnDisk(const std::string& path) {
+    std::vector<std::string> parts;
+    for (std::size_t start = 0; start < path.size();) {
+        const std::size_t end = std::min(path.find('/', start), path.size());
+        parts.push_back(path.substr(start, end - start));
+        start = end + 1;
+    }
+    return parts;
+}
+
 /// Folders that are still to be visited. Few are open at a time, however deep they are.
 class Visit {
   public:
@@ -481,13 +494,7 @@ class Visit {
         if (slash != std::string::npos && m_folder.isOpen() && path.substr(0, slash) == m_path) {
             return walk(m_folder, {path.substr(slash + 1)}, false, what);
         }
-        std::vector<std::string> folders;
-        for (std::size_t start = 0; start < path.size();) {
-            const std::size_t end = std::min(path.find('/', start), path.size());
-            folders.push_back(path.substr(start, end - start));
-            start = end + 1;
-        }
-        return walk(m_files, folders, false, what);
+        return walk(m_files, partsOnDisk(path), false, what);
     }
 
     const Descriptor& m_files;
@@ -538,6 +545,91 @@ int removeDeliveries(const Descriptor& files, const std::string& top, std::int64
                  }
              });
     return removed;
+}
+
+/// Reads a file to its end; its size. A fault is shown; one that is gone meanwhile is none.
+std::uint64_t verifyContent(const Descriptor& folder, const std::string& name,
+                            const std::string& where, const StoreEngine::ShowFault& show) {
+    try {
+        const Descriptor file = openFile(folder, name, where);
+        std::vector<char> block(blockSize);
+        std::uint64_t size = 0;
+        std::size_t count = blockSize;
+        while (count == blockSize) {
+            count = readBlock(file, block.data(), block.size(), where);
+            size += count;
+        }
+        return size;
+    } catch (const StoreFailure& failure) {
+        if (!isMissing(failure)) {
+            show(where, failure.what());
+        }
+        return 0;
+    }
+}
+
+/// The path and the folder of each file that has versions or had some.
+using ShowVersions = std::function<void(const std::string& path, const Descriptor& folder)>;
+
+void visitVersions(const Descriptor& files, const ShowVersions& show) {
+    Visit visit(files, versionsFolder);
+    while (visit.next()) {
+        bool hasVersions = false;
+        for (const auto& name : namesIn(visit.folder())) {
+            struct stat status;
+            if (fstatat(visit.folder().get(), name.c_str(), &status, AT_SYMLINK_NOFOLLOW) == 0 &&
+                S_ISDIR(status.st_mode)) {
+                visit.add(visit.pathOf(name));
+            } else {
+                hasVersions = true;
+            }
+        }
+        if (hasVersions) {
+            // Without the name of the topmost folder.
+            const std::string path = visit.pathOf("");
+            show(path.substr(std::strlen(versionsFolder) + 1,
+                             path.size() - std::strlen(versionsFolder) - 2),
+                 visit.folder());
+        }
+    }
+}
+
+/// The file that a snapshot saw, wherever it is by now: what was replaced is among the versions.
+/// Throws StoreFailure (Busy) if it is gone.
+Descriptor openSame(const Descriptor& files, const FileSnapshot::Entry& entry) {
+    const std::string what = shownServerPath(entry.path);
+    const auto opened = [&](std::vector<std::string> parts, const std::string& name) {
+        const Descriptor folder = walk(files, parts, false, what);
+        Descriptor file = openFile(folder, name, what);
+        const struct stat status = statusOf(file.get(), what);
+        const bool isSame = status.st_ino == entry.inode &&
+                            status.st_mtim.tv_sec == entry.written.tv_sec &&
+                            status.st_mtim.tv_nsec == entry.written.tv_nsec &&
+                            static_cast<std::uint64_t>(status.st_size) == entry.size;
+        return isSame ? std::move(file) : Descriptor();
+    };
+    const auto parts = partsOnDisk(entry.path);
+    try {
+        Descriptor file = opened({parts.begin(), parts.end() - 1}, parts.back());
+        if (file.isOpen()) {
+            return file;
+        }
+        std::vector<std::string> kept = {versionsFolder};
+        kept.insert(kept.end(), parts.begin(), parts.end());
+        for (const auto& version : versionsIn(walk(files, kept, false, what))) {
+            if (version.inode == entry.inode) {
+                file = opened(kept, versionName(version.version.number));
+                if (file.isOpen()) {
+                    return file;
+                }
+            }
+        }
+    } catch (const StoreFailure& failure) {
+        if (!isMissing(failure)) {
+            throw;
+        }
+    }
+    throw StoreFailure(Fault::Busy, what + " was removed while it was backed up: run it again");
 }
 
 void makeFilesFolder(const std::string& storeFolder, const std::string& path) {
@@ -695,7 +787,7 @@ bool ServerFiles::remove(std::string_view path, std::optional<int> highestVersio
     }
     // The file goes last: while it is there, a removal that was cut off can be finished.
     const bool hadVersions = removeVersions(m_files, place);
-    if (folder.get() < 0) {
+    if (!folder.isOpen()) {
         return hadVersions;
     }
     if (unlinkat(folder.get(), place.name().c_str(), 0) != 0) {
@@ -711,16 +803,107 @@ int ServerFiles::removeLeftovers() {
            removeDeliveries(m_files, versionsFolder, youngestSeconds);
 }
 
+void ServerFiles::verify(Verified& found, const StoreEngine::ShowFault& show) {
+    visitAll(m_files, "",
+             [&](const Descriptor& folder, const std::string& name, const std::string& path,
+                 const struct stat& status) {
+                 if (!S_ISREG(status.st_mode)) {
+                     show("/" + path, "is neither a file nor a folder");
+                 } else if (!name.starts_with(ownPrefix)) {
+                     ++found.files;
+                     found.bytes += verifyContent(folder, name, "/" + path, show);
+                 }
+             });
+    visitVersions(m_files, [&](const std::string& path, const Descriptor& folder) {
+        try {
+            verifyVersions(path, folder, found, show);
+        } catch (const StoreFailure& failure) { // No path that a delivery makes, say.
+            show("/" + path, failure.what());
+        }
+    });
+}
+
+void ServerFiles::verifyVersions(const std::string& path, const Descriptor& folder, Verified& found,
+                                 const StoreEngine::ShowFault& show) {
+    const auto list = versions(path);
+    for (const auto& version : list) {
+        ++found.versions;
+        found.bytes +=
+            verifyContent(folder, versionName(version.number),
+                          "/" + path + ", version " + std::to_string(version.number), show);
+    }
+    const int highest = std::max(list.empty() ? 0 : list.back().number, lastUsedUp(folder));
+    if (const std::string gap = gapIn(list, highest); !gap.empty()) {
+        show("/" + path, gap);
+    }
+    // A removal may be under way, which takes the versions first.
+    if (!at(path) && !versions(path).empty()) {
+        show("/" + path, "has versions, but no file");
+    }
+}
+
+FileSnapshot ServerFiles::snapshot(const std::function<void()>& within) {
+    FileSnapshot snapshot;
+    std::set<ino_t> inPlace;
+    const auto take = [&](const Descriptor&, const std::string& name, const std::string& path,
+                          const struct stat& status) {
+        // A version that is still in place has not been replaced yet.
+        const bool counts = S_ISREG(status.st_mode) && !name.starts_with(deliveryPrefix) &&
+                            !(versionNumber(name) != 0 && inPlace.contains(status.st_ino));
+        if (counts) {
+            snapshot.entries.push_back(
+                {path, status.st_ino, status.st_mtim, static_cast<std::uint64_t>(status.st_size)});
+        }
+    };
+    list(); // So that the system knows the names already, and others wait less.
+    const ExchangeLock lock(m_files);
+    within();
+    visitAll(m_files, "", take);
+    for (const auto& entry : snapshot.entries) {
+        inPlace.insert(entry.inode);
+    }
+    visitAll(m_files, versionsFolder, take);
+    return snapshot;
+}
+
+void ServerFiles::copySnapshot(const FileSnapshot& snapshot, const std::string& storeFolder,
+                               const StoreEngine::ShowProgress& progress) {
+    const ServerFiles target(storeFolder, true);
+    const Permissions permissions = Permissions::of(target.m_files.get());
+    std::size_t done = 0;
+    for (const auto& entry : snapshot.entries) {
+        const std::string what = shownServerPath(entry.path);
+        const Descriptor from = openSame(m_files, entry);
+        auto parts = partsOnDisk(entry.path);
+        const std::string name = std::move(parts.back());
+        parts.pop_back();
+        const Descriptor folder = walk(target.m_files, parts, true, what);
+        Delivery delivery(folder, permissions, what, true);
+        delivery.fill(
+            [&](char* block, std::size_t size) { return readBlock(from, block, size, what); });
+        delivery.setTime(entry.written);
+        delivery.putInPlace(name);
+        progress(++done, snapshot.entries.size());
+    }
+    if (syncfs(target.m_files.get()) != 0) {
+        fail(errno, "the backup's files");
+    }
+}
+
 void ServerFiles::placeVersion(std::string_view path, const FileVersion& version,
                                std::istream& from) {
     const Place place(path);
     const std::string what = place.text();
     const bool current = version.number == 0;
+    std::optional<ExchangeLock> lock;
+    if (!m_later) {
+        lock.emplace(m_files); // Nobody removes the folder meanwhile.
+    }
     const Descriptor folder =
         walk(m_files, current ? place.folders() : place.versions(), true, what);
-    Delivery delivery(folder, Permissions::of(m_files.get()), what, true);
+    Delivery delivery(folder, Permissions::of(m_files.get()), what, m_later);
     delivery.fill(sourceOf(from, place));
-    delivery.setTime(version.time);
+    delivery.setTime({static_cast<time_t>(version.time), 0});
     delivery.putInPlace(current ? place.name() : versionName(version.number));
 }
 

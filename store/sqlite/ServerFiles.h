@@ -14,14 +14,29 @@
 // reached or be in the way.
 #pragma once
 
+#include <functional>
 #include <optional>
 #include <string>
 #include <string_view>
+#include <vector>
+
+#include <sys/types.h>
 
 #include "base/Descriptor.h"
 #include "store/StoreEngine.h"
 
 namespace store {
+
+/// What files a folder had at one moment, those of its own names with them.
+struct FileSnapshot {
+    struct Entry {
+        std::string path; ///< Below the files folder, as it is on the disk.
+        ino_t inode = 0;
+        timespec written = {};
+        std::uint64_t size = 0;
+    };
+    std::vector<Entry> entries;
+};
 
 /// See StoreEngine for each of these. The folder is held open, so that files stay where they were
 /// when the store was opened, whatever becomes of the names above it. Everything below it is
@@ -42,7 +57,16 @@ class ServerFiles {
     int pruneVersions(std::string_view path, const Pruning& which);
     bool remove(std::string_view path, std::optional<int> highestVersion);
     int removeLeftovers();
-    /// Not on the disk before finishCopy.
+    void verify(Verified& found, const StoreEngine::ShowFault& show);
+    /// Calls `within` and lists the files while nobody can exchange one.
+    FileSnapshot snapshot(const std::function<void()>& within);
+    /// Copies the contents of that moment to the files folder of another store's folder, which is
+    /// made and must not be there. Throws StoreFailure (Busy) if one was removed since.
+    void copySnapshot(const FileSnapshot& snapshot, const std::string& storeFolder,
+                      const StoreEngine::ShowProgress& progress);
+    /// From now on nothing that placeVersion places has to be on the disk before finishCopy, and
+    /// nobody else is at work.
+    void writeLater() { m_later = true; }
     void placeVersion(std::string_view path, const FileVersion& version, std::istream& from);
     int highestVersion(std::string_view path);
     void raiseHighestVersion(std::string_view path, int number);
@@ -51,7 +75,11 @@ class ServerFiles {
     void finishCopy();
 
   private:
+    void verifyVersions(const std::string& path, const base::Descriptor& folder, Verified& found,
+                        const StoreEngine::ShowFault& show);
+
     base::Descriptor m_files;
+    bool m_later = false;
 };
 
 } // namespace store

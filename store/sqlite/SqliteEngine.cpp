@@ -4,6 +4,7 @@
 //   tickets.db      tickets and users, a SQLite database in WAL mode (with tickets.db-wal and -shm
 //                   beside it while it is open)
 //   files/          see ServerFiles.h
+//   log.txt         see LineFile.h; log.txt.old is the one before it
 //
 // Key names and values are blobs, which SQLite compares as bytes. A key is one row, its value as
 // KeyBytes.h tells; what concerns all jobs is kept once more, as JobOverview.h describes. PRAGMA
@@ -26,9 +27,11 @@
 #include "store/Engines.h"
 #include "store/JobOverview.h"
 #include "store/KeyBytes.h"
+#include "store/LineFile.h"
 #include "store/sqlite/Permissions.h"
 #include "store/sqlite/ServerFiles.h"
 #include "store/sqlite/Sqlite.h"
+#include "store/sqlite/SqliteBackup.h"
 #include "store/sqlite/WalWatch.h"
 
 namespace store {
@@ -175,6 +178,98 @@ void setKind(Database& database, std::int64_t kind) {
     database.run(("PRAGMA application_id = " + std::to_string(kind)).c_str());
 }
 
+constexpr const char* databaseName = "the database";
+
+constexpr std::size_t logParts = 4; ///< Event, who, origin and what.
+
+/// Shows each block of the overview as the keys of its jobs say it must be, by number.
+void showBlocks(Database& database,
+                const std::function<void(int number, const std::string&)>& show) {
+    Statement jobs(database, "SELECT id, number FROM tickets WHERE type = ? ORDER BY id");
+    Statement key(database, "SELECT value FROM keys WHERE ticket = ? AND name = ?");
+    // As anything that is no single number: readers then look at the key itself.
+    const Elements empty;
+    const std::string unreadable = slotOf(&empty);
+    int number = -1;
+    std::string block;
+    auto run = jobs.run(jobType);
+    while (run.step()) {
+        const int id = static_cast<int>(run.number(0));
+        if (blockOf(id) != number) {
+            if (number >= 0) {
+                show(number, block);
+            }
+            number = blockOf(id);
+            block.assign(blockBytes, '\0');
+        }
+        block[entryOffset(id)] = 1;
+        for (std::size_t i = 0; i < overviewKeys.size(); ++i) {
+            auto value = key.run(run.number(1), overviewKeys[i]);
+            if (value.step()) {
+                // A damaged key is left to those who read it.
+                const auto elements = elementsFromBytes(value.bytes(0));
+                block.replace(slotOffset(id, i), slotBytes,
+                              elements == nullptr ? unreadable : slotOf(elements.get()));
+            }
+        }
+    }
+    if (number >= 0) {
+        show(number, block);
+    }
+}
+
+void verifyOverview(Database& database, const StoreEngine::ShowFault& show) {
+    Statement blocks(database, "SELECT number, content FROM job_blocks ORDER BY number");
+    std::map<std::int64_t, std::string> known;
+    auto run = blocks.run();
+    while (run.step()) {
+        known.emplace(run.number(0), run.text(1));
+    }
+    showBlocks(database, [&](int number, const std::string& block) {
+        const auto found = known.find(number);
+        if (found == known.end() || found->second != block) {
+            showOverview(number, show);
+        }
+        known.erase(number);
+    });
+    for (const auto& [number, block] : known) { // Those of deleted jobs alone are all zero.
+        if (block != std::string(blockBytes, '\0')) {
+            showOverview(number, show);
+        }
+    }
+}
+
+/// Within a transaction that reads. How many tickets there are.
+std::int64_t verifyTickets(Database& database, const StoreEngine::ShowFault& show) {
+    Statement integrity(database, "PRAGMA integrity_check");
+    auto whole = integrity.run();
+    while (whole.step()) {
+        if (const std::string words = whole.text(0); words != "ok") {
+            show(databaseName, words);
+        }
+    }
+    if (database.number("SELECT count(*) FROM keys WHERE ticket NOT IN"
+                        " (SELECT number FROM tickets)") != 0) {
+        show(databaseName, "it has keys of tickets that are not there");
+    }
+    if (database.number("SELECT count(*) FROM (SELECT type, max(id) AS highest FROM tickets"
+                        " GROUP BY type) AS used LEFT JOIN highest_ids USING (type)"
+                        " WHERE highest > coalesce(id, 0)") != 0) {
+        show(databaseName, "it gives the number of a ticket a second time");
+    }
+    Statement keys(database, "SELECT type, id, name, value FROM tickets JOIN keys"
+                             " ON ticket = number");
+    auto run = keys.run();
+    while (run.step()) {
+        if (elementsFromBytes(run.bytes(3)) == nullptr) {
+            showDamagedKey(static_cast<int>(run.number(0)), static_cast<int>(run.number(1)),
+                           run.bytes(2), show);
+        }
+    }
+    verifyOverview(database, show);
+    return database.number("SELECT count(*) FROM tickets");
+}
+
 /// The first bytes behind all that start with a prefix; empty where nothing is behind them.
 std::string endOfPrefix(std::string prefix) {
     while (!prefix.empty() && prefix.back() == '\xFF') {
@@ -193,6 +288,14 @@ class SqliteEngine : public StoreEngine {
         : SqliteEngine(openDatabase(folder, access, kind), folder) {}
 
     bool alive() override { return true; }
+
+    std::string place() override {
+        struct stat status;
+        if (stat(databasePath(m_folder).c_str(), &status) != 0) {
+            throw StoreFailure(Fault::Missing, m_folder + ": " + std::strerror(errno));
+        }
+        return "file " + std::to_string(status.st_dev) + " " + std::to_string(status.st_ino);
+    }
 
     std::uint64_t commits(std::chrono::milliseconds) override { return m_watch.commits(); }
 
@@ -437,6 +540,64 @@ class SqliteEngine : public StoreEngine {
     }
     int removeLeftovers() override { return m_files.removeLeftovers(); }
 
+    void log(const LogEntry& entry) noexcept override {
+        try {
+            m_log.append(lineText(entry.time, {eventName(entry.event), entry.who, entry.origin,
+                                               entry.what.substr(0, longestLogged)}),
+                         [&](int file) {
+                             const base::Descriptor folder(
+                                 open(m_folder.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
+                             Permissions::of(folder.get()).giveTo(file);
+                         });
+        } catch (...) { // Best effort.
+        }
+    }
+    std::vector<LogEntry> logEntries() override {
+        auto lines = m_log.formerLines(logParts);
+        for (auto& line : m_log.lines(logParts)) {
+            lines.push_back(std::move(line));
+        }
+        std::vector<LogEntry> entries;
+        for (auto& line : lines) {
+            if (const auto event = eventNamed(line.parts[0])) {
+                entries.push_back({line.time, *event, std::move(line.parts[1]),
+                                   std::move(line.parts[2]), std::move(line.parts[3])});
+            }
+        }
+        return entries;
+    }
+    int refusalsSince(std::int64_t time) noexcept override {
+        try {
+            constexpr std::size_t recent = 1 << 15; // Some hundred lines.
+            const auto lines = m_log.lines(logParts, recent);
+            return static_cast<int>(
+                std::count_if(lines.begin(), lines.end(), [&](const Line& line) {
+                    return line.time >= time && line.parts[0] == eventName(Event::Refusal);
+                }));
+        } catch (...) {
+            return 0;
+        }
+    }
+
+    Verified verify(const ShowFault& show) override {
+        Verified found;
+        try {
+            const ReadTransaction transaction(m_database);
+            found.tickets = verifyTickets(m_database, show);
+        } catch (const StoreFailure& failure) {
+            if (failure.fault != Fault::Damaged) {
+                throw;
+            }
+            show(databaseName, failure.what());
+        }
+        m_files.verify(found, show);
+        return found;
+    }
+
+    void backUp(const std::string& folder, const ShowProgress& progress) override {
+        sqlite::backUp(m_database, m_files, m_folder, folder, progress);
+    }
+
     std::map<int, int> highestIds() override {
         Statement statement(m_database, "SELECT type, id FROM highest_ids WHERE id > 0");
         auto run = statement.run();
@@ -468,7 +629,7 @@ class SqliteEngine : public StoreEngine {
   private:
     SqliteEngine(OpenedDatabase opened, const std::string& folder)
         : m_database(std::move(opened.database)), m_ready(m_database), m_files(folder, false),
-          m_watch(m_database, opened.shared) {}
+          m_watch(m_database, opened.shared), m_folder(folder), m_log(folder + "/log.txt", true) {}
 
     /// Settles the connection before a statement is prepared.
     struct Ready {
@@ -586,6 +747,8 @@ class SqliteEngine : public StoreEngine {
     Ready m_ready;
     ServerFiles m_files;
     WalWatch m_watch;
+    const std::string m_folder;
+    const LineFile m_log;
 
     Statement m_ids{m_database, "SELECT id FROM tickets WHERE type = ? ORDER BY id"};
     Statement m_number{m_database, "SELECT number FROM tickets WHERE type = ? AND id = ?"};
@@ -713,6 +876,7 @@ class SqliteCopy : public SqliteEngine {
             throw StoreFailure(Fault::Busy, "somebody else is copying to " + folder);
         }
         database().run("PRAGMA synchronous = NORMAL");
+        serverFiles().writeLater();
     }
 
     void finishCopy() override {
@@ -739,39 +903,9 @@ std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
 
 /// Makes the overview of the jobs that are there.
 void fillOverview(Database& database) {
-    Statement jobs(database, "SELECT id, number FROM tickets WHERE type = ? ORDER BY id");
-    Statement key(database, "SELECT value FROM keys WHERE ticket = ? AND name = ?");
     Statement put(database, "INSERT INTO job_blocks (number, content) VALUES (?, ?)");
-    // As anything that is no single number: readers then look at the key itself.
-    const Elements empty;
-    const std::string unreadable = slotOf(&empty);
-    int number = -1;
-    std::string block;
-    const auto finishBlock = [&] {
-        if (number >= 0) {
-            put.run(number, block).finish();
-        }
-    };
-    auto run = jobs.run(jobType);
-    while (run.step()) {
-        const int id = static_cast<int>(run.number(0));
-        if (blockOf(id) != number) {
-            finishBlock();
-            number = blockOf(id);
-            block.assign(blockBytes, '\0');
-        }
-        block[entryOffset(id)] = 1;
-        for (std::size_t i = 0; i < overviewKeys.size(); ++i) {
-            auto value = key.run(run.number(1), overviewKeys[i]);
-            if (value.step()) {
-                // A damaged key is left to those who read it.
-                const auto elements = elementsFromBytes(value.bytes(0));
-                block.replace(slotOffset(id, i), slotBytes,
-                              elements == nullptr ? unreadable : slotOf(elements.get()));
-            }
-        }
-    }
-    finishBlock();
+    showBlocks(database,
+               [&](int number, const std::string& block) { put.run(number, block).finish(); });
 }
 
 bool upgradeSqlite(const std::string& address) {
@@ -798,9 +932,14 @@ bool upgradeSqlite(const std::string& address) {
     return true;
 }
 
+[[noreturn]] void grantSqlite(const std::string&, const std::string&, Rights) {
+    throw StoreFailure(Fault::Other, "a folder has no roles: who may use it is said by its group "
+                                     "and permissions");
+}
+
 } // namespace
 
-constinit const EngineKind sqliteKind = {openSqlite, makeSqliteStore, openSqliteCopy,
-                                         upgradeSqlite};
+constinit const EngineKind sqliteKind = {openSqlite, makeSqliteStore, openSqliteCopy, upgradeSqlite,
+                                         grantSqlite};
 
 } // namespace store

@@ -1,5 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
 // The real bundle, loaded by the real loader and used through the connector.
+#include <algorithm>
+#include <chrono>
 #include <cstdlib>
 #include <cstring>
 #include <ctime>
@@ -95,6 +97,30 @@ TEST_P(ComGUIPlugIn, LetsInWhoKnowsThePassword) {
     for (const auto& [user, password, code] : logins) {
         EXPECT_EQ(connect(here, user, password)->getLastRetCode(), code) << wxString(user);
     }
+    // The log has what happened, and neither passwords nor what may be one.
+    std::string log;
+    for (const auto& entry : open()->logEntries()) {
+        EXPECT_LT(std::time(nullptr) - entry.time, 60);
+        EXPECT_EQ(entry.origin, store::thisOrigin());
+        log += std::string(eventName(entry.event)) + " " + entry.who + ": " + entry.what + "\n";
+    }
+    EXPECT_EQ(log, "login press: \n"
+                   "refusal press: wrong user or password\n"
+                   "refusal : wrong user or password\n"
+                   "refusal left: the user is disabled\n"
+                   "refusal left: wrong user or password\n");
+
+    // Who tries again and again waits, two seconds at most; who knows the password does not.
+    const auto timed = [&](const wchar_t* password) {
+        const auto start = std::chrono::steady_clock::now();
+        connect(here, L"press", password);
+        return std::chrono::duration<double>(std::chrono::steady_clock::now() - start).count();
+    };
+    timed(L"5");
+    const double refused = timed(L"6");
+    EXPECT_GT(refused, 2.0);
+    EXPECT_LT(refused, 2.0 + 1.5) << "a hash, and the wait";
+    EXPECT_LT(timed(L"room"), 2.0);
     EXPECT_TRUE(open()->removeUser("left"));
     EXPECT_FALSE(open()->removeUser("left"));
 }
@@ -132,6 +158,13 @@ TEST_P(ComGUIPlugIn, NotesEachWriteThatTheStoreDoesNotTake) {
                      "job/8 c: there is no such ticket\n"
                      "file /x/../y: server path \"/x/../y\" names no file of the store\n");
     EXPECT_EQ(support::modeOf(failures.path()), 0600U);
+    const auto logged = open()->logEntries();
+    EXPECT_EQ(std::count_if(logged.begin(), logged.end(),
+                            [](const auto& entry) {
+                                return entry.event == store::Event::LostWrite &&
+                                       entry.who == "press";
+                            }),
+              5);
 
     // A large file is renamed, and another user's file is left alone.
     std::filesystem::resize_file(failures.path(), 1 << 20);

@@ -12,6 +12,8 @@
 
 class AnyStoreProgram : public StoreTest {
   protected:
+    explicit AnyStoreProgram(Engine kind = GetParam()) : StoreTest(kind) {}
+
     support::Outcome run(std::vector<std::string> arguments,
                          support::RunOptions options = {}) const {
         options.environment.insert({"TINTGATE_STORE", address});

@@ -133,6 +133,22 @@ TEST_F(StoreTrend, ReadsTheResultsOfJobs) {
                       HasSubstr("[0.3,0.6,0.9,1.2,1.5"), Not(HasSubstr("Matt <b>"))));
 }
 
+TEST_F(StoreTrend, OfARoomAndItsArchiveIsThatOfAllJobs) {
+    const std::string whole = text();
+    const std::string archive = m_folder.path("archive");
+    answer({"copy", m_address, archive});
+    for (int job = 1; job <= jobs; ++job) { // A move that was cut off left job 6 in both.
+        if (job != 6) {
+            answer({"-s", job < 6 ? m_address : archive, "job", "delete", std::to_string(job)});
+        }
+    }
+    EXPECT_THAT(text(), HasSubstr("7 results"));
+    const std::string both = report({"--store", m_address, "--store", archive, "--text"}).output;
+    EXPECT_EQ(std::regex_replace(both, std::regex(", " + archive), ""), whole);
+    EXPECT_THAT(report({"--store", m_address, "--store", archive + "x"}).error,
+                HasSubstr("archivex"));
+}
+
 TEST_F(StoreTrend, LeavesOutWhatIsNoResultAndSaysWhatItCantKnow) {
     const std::string root = "Remote/Measurement/";
     const json failed = {{"int", 0}};
