@@ -448,7 +448,8 @@ std::string statementOf(const Input& input, const char* wanted) {
 }
 
 /// What a verdict is worth nothing without, for the first page of a print.
-void addBasis(Model& model, const Result& result, const Meta* meta, const Texts& say) {
+void addBasis(Model& model, const Result& result, const Meta* meta, const std::string& condition,
+              const Texts& say) {
     const std::string& path = result.target.path;
     const std::string file = path.substr(path.rfind('/') + 1);
     const std::string description = statementOf(result.target, "description");
@@ -461,7 +462,7 @@ void addBasis(Model& model, const Result& result, const Meta* meta, const Texts&
             meta != nullptr && !meta->instrument.empty()
                 ? meta->instrument
                 : statementOf(result.measurement, "instrumentation"));
-    addFact(model.basis, say("fact.condition"), model.condition);
+    addFact(model.basis, say("fact.condition"), condition);
     if (meta != nullptr) {
         addFact(model.basis, say("fact.strip"),
                 meta->strip == 2 ? say("fact.secondStrip") : say("fact.firstStrip"));
@@ -601,8 +602,11 @@ Model makeModel(const Result& result, const Meta* meta, const Texts& say, const 
     }
     putInOrder(model.judged);
     sayVerdict(model, result, say);
-    model.condition = conditionText(result, say);
-    addBasis(model, result, meta, say);
+    const std::string condition = conditionText(result, say);
+    if (!condition.empty()) {
+        model.condition = say("page.conditionSentence", {{"condition", condition}});
+    }
+    addBasis(model, result, meta, condition, say);
     const Statistics& s = result.statistics;
     model.statistics = {{say("statistic.patches"), say.count(result.patches.size())},
                         {say("statistic.average"), say.number(s.mean, 2)},

@@ -170,7 +170,7 @@ std::string summaryText(const report::Result& result, const report::Meta* meta,
         text += "  " + paint(Tone::Open, "? ") + paint(Tone::Plain, doubt) + '\n';
     }
     if (!model.condition.empty()) {
-        text += paint(Tone::Soft, say("text.condition", {{"condition", model.condition}})) + '\n';
+        text += paint(Tone::Soft, model.condition) + '\n';
     }
     text += criteriaText(model, paint, say) + '\n';
     std::string statistics;

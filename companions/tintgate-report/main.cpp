@@ -241,7 +241,7 @@ int run(const Options& options) {
         } else if (options.tidyDays) {
             return static_cast<int>(tidyFolders(options));
         } else if (options.labels.areDrawn()) {
-            report::writeLabels(options.labels, options.results[0], options.meta, say);
+            report::writeLabels(options.labels, options.results[0], options.meta, complain);
         } else if (!options.labels.match.empty()) {
             return static_cast<int>(
                 report::matchLabel(options.labels, options.results[0], options.meta));

@@ -372,7 +372,7 @@ class Certificate {
 
     std::string patchesHeading(std::size_t count) const {
         return filled(texts().worstPatches, {{"count", std::to_string(count)},
-                                             {"all", std::to_string(m_content.model.rows.size())}});
+                                             {"all", std::to_string(m_result.patches.size())}});
     }
 
     double patchRowHeight(std::size_t row) const {
@@ -384,14 +384,14 @@ class Certificate {
     double patchesHeight(std::size_t count) const {
         double height =
             headingHeight(patchesHeading(count)) + rowHeight(patchHead(), patchWidths());
-        for (std::size_t i = 0; i < std::min(count, m_content.model.rows.size()); ++i) {
+        for (std::size_t i = 0; i < std::min(count, m_content.model.shown); ++i) {
             height += patchRowHeight(i);
         }
         return height + blockGap;
     }
 
     void placeWorstPatches() {
-        const std::size_t all = std::min(mostPatches, m_content.model.rows.size());
+        const std::size_t all = std::min(mostPatches, m_content.model.shown);
         need(patchesHeight(std::min(all, fewestPatches)) + endHeight() + warningsReserve());
         const double left = room() - (isLastSheet() ? endHeight() + warningsReserve() : 0);
         std::size_t count = all;

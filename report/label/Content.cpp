@@ -37,7 +37,7 @@ std::string firstOf(std::initializer_list<std::string> texts) {
 
 std::string conditionOf(const Subject& subject) {
     const report::Input& target = subject.result.target;
-    return firstOf({statementOf(target, "Description"), statementOf(target, "Printing"),
+    return firstOf({statementOf(target, "description"), statementOf(target, "printing"),
                     fileName(target.path)});
 }
 
@@ -45,7 +45,7 @@ std::string instrumentOf(const Subject& subject, const std::string& given) {
     const report::Input& measurement = subject.result.measurement;
     std::string text =
         firstOf({given, subject.meta != nullptr ? subject.meta->instrument : std::string(),
-                 statementOf(measurement, "Instrumentation")});
+                 statementOf(measurement, "instrumentation")});
     if (!measurement.measurementCondition.empty()) {
         text += (text.empty() ? "" : ", ") + measurement.measurementCondition;
     }
@@ -77,7 +77,7 @@ std::string textOf(Field field, const Subject& subject) {
     case Field::Date:
         return dateText(subject.stamp());
     case Field::Printer:
-        return firstOf({given, statementOf(subject.result.measurement, "Printing")});
+        return firstOf({given, statementOf(subject.result.measurement, "printing")});
     case Field::Paper:
         return firstOf({given, meta != nullptr ? meta->paper : std::string()});
     case Field::Instrument:

@@ -109,8 +109,9 @@ std::string dateText(const std::string& stamp) {
     if (stamp.size() < day || stamp[4] != '-') {
         return stamp;
     }
-    std::string text = report::dayText(std::stoi(stamp.substr(8, 2)), std::stoi(stamp.substr(5, 2)),
-                                       std::stoi(stamp.substr(0, 4)));
+    std::string text =
+        languages::english().day(std::stoi(stamp.substr(8, 2)), std::stoi(stamp.substr(5, 2)),
+                                 std::stoi(stamp.substr(0, 4)));
     if (stamp.size() >= minute) {
         text += ", " + stamp.substr(11, 5);
     }
