@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The kinds of places that stores are in, and what is the same in each.
+// The kinds of stores, and their common parts.
 #pragma once
 
 #include <memory>
@@ -12,7 +12,7 @@
 
 namespace store {
 
-/// One kind. As the functions of StoreEngine.h.
+/// One kind of store. Its functions correspond to those of StoreEngine.h.
 struct EngineKind {
     std::unique_ptr<StoreEngine> (*open)(const std::string& address, Access access);
     void (*make)(const std::string& address, const std::string& serverName);
@@ -25,19 +25,19 @@ extern const EngineKind postgresKind;
 
 inline constexpr int highestTicketId = 0xFFFFFF;
 
-/// What is stored of a key. Throws StoreFailure (Damaged).
+/// Decodes the stored bytes of a key. Throws StoreFailure (Damaged).
 std::shared_ptr<Elements> decoded(std::string_view bytes);
 
-/// Names and stored values of what every client asks the system ticket for.
+/// Names and stored values of the keys of the system ticket that every client reads.
 std::vector<std::pair<std::string, std::string>> systemKeys(const std::string& serverName);
 
 /// Whether two tickets hold the same, to the bit.
 bool haveSameKeys(const TicketContent& one, const TicketContent& other);
 
-/// The lowest number from 1 on that is not among ascending ids.
+/// The lowest number from 1 on that is not among the ascending ids.
 int lowestFree(const std::vector<int>& ids);
 
-/// Throws the failure of a store of another format than the present one.
+/// Throws the matching failure if the store's format is not the present one.
 void checkFormat(std::int64_t found, std::int64_t present);
 
 } // namespace store
