@@ -9,12 +9,12 @@ using colour::Conditions;
 constexpr const char* usualIlluminant = "D50";
 constexpr const char* usualObserver = "2";
 
-/// What the colours of one side are for.
+/// The conditions that the colours of one side apply to.
 struct Side {
     const char* role;
-    Conditions stated;       ///< By the file.
-    Conditions counted;      ///< Illuminant and observer never empty.
-    bool calculated = false; ///< From spectra, since the file states other conditions.
+    Conditions stated;       ///< In the file.
+    Conditions counted;      ///< Illuminant and observer are never empty.
+    bool calculated = false; ///< From spectra, because the file states other conditions.
 };
 
 Side sideOf(const char* role, const Input& input) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Whether target, measurement and preset are about the same light, observer and instrument filter.
+// Checks that target, measurement and preset have the same light, observer and instrument filter.
 #pragma once
 
 #include <vector>
@@ -9,12 +9,12 @@
 
 namespace analysis {
 
-/// Compares what both sides state of illuminant and observer, and what both sides and the preset
-/// state of the measuring condition (M0 to M3).
+/// Compares the illuminants and observers that both sides state, and the measuring conditions (M0
+/// to M3) that both sides and the preset state.
 ///
-/// A side that states no illuminant or observer counts as D50, 2 degrees. So does a side with
-/// values calculated from spectra. The verdict is kept open by illuminants or observers that
-/// differ, and by a measuring condition that the preset requires and does not find.
+/// If a side states no illuminant or observer, it counts as D50, 2 degrees. So does a side with
+/// values calculated from spectra. The verdict stays open if illuminants or observers differ, or if
+/// the preset requires a measuring condition that is not found.
 std::vector<Warning> conditionWarnings(const Comparison& comparison,
                                        const tolerancePresetParameterRecord& preset,
                                        const PresetOptions& options);

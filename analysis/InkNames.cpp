@@ -12,7 +12,7 @@ bool isNamed(const std::string& channel) {
     return !colour::cgats::isNumberedInk(channel);
 }
 
-/// The name that one of the files gives a channel; null if none does.
+/// The name of a channel in one of the files. Null if none names it.
 const std::string* nameInFiles(const Comparison& c, std::size_t channel, std::size_t count) {
     for (const Input* input : {c.devices, &c.target, &c.measurement, &c.patchSet}) {
         const auto& set = input->file.set;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the inks of a comparison are called.
+// The names of a comparison's inks.
 #pragma once
 
 #include <string>
@@ -9,11 +9,11 @@
 
 namespace analysis {
 
-/// Names of the device channels of `comparison.devices`, in their order; empty if it is null.
+/// Names of the device channels of `comparison.devices`, in order. Empty if it is null.
 ///
-/// An ink after C, M, Y and K that its file only numbers has the name that another file of the
-/// comparison with as many channels gives it, as "SPOT_Gold". Otherwise it has that of `inks`
-/// (PresetOptions::inks), otherwise "Channel 5", counted from C. Names have no part in pairing.
+/// If the file only numbers an ink after C, M, Y and K, its name comes from another file of the
+/// comparison with as many channels, as "SPOT_Gold", otherwise from `inks` (PresetOptions::inks).
+/// Otherwise it is "Channel 5", counted from C. Names don't affect pairing.
 std::vector<std::string> channelNames(const Comparison& comparison,
                                       const std::vector<std::string>& inks);
 

@@ -20,7 +20,7 @@ namespace {
 constexpr std::size_t largestNamesFile = 1 << 20;
 constexpr std::size_t largestDefinition = 64 << 20;
 
-/// A whole text that is a number.
+/// Parses a text that is a number and nothing else.
 std::optional<unsigned int> numberOf(std::string_view text) {
     text = base::trimmed(text);
     unsigned int number = 0;
@@ -31,7 +31,7 @@ std::optional<unsigned int> numberOf(std::string_view text) {
     return number;
 }
 
-/// The folder that holds this library, with a slash at its end.
+/// The folder of this library, with a slash at the end.
 std::string ownFolder() {
     Dl_info self{};
     if (!::dladdr(reinterpret_cast<const void*>(&instrumentName), &self) || !self.dli_fname) {
@@ -48,7 +48,7 @@ std::string namesFile() {
     return ownFolder() + TINTGATE_PRESETS_FROM_LIBRARY "/instruments.txt";
 }
 
-/// The name of `id` in the lines of a names file; empty where they have none.
+/// The name of `id` in the lines of a names file. Empty if there is none.
 std::string_view nameIn(std::string_view lines, unsigned int id) {
     constexpr std::string_view byteOrderMark = "\xEF\xBB\xBF"; // some editors put it before UTF-8
     if (lines.starts_with(byteOrderMark)) {

@@ -6,16 +6,16 @@
 
 namespace analysis {
 
-/// "Instrument N", or what the names file has for N.
+/// "Instrument N", or the name of N in the names file.
 ///
-/// The names file is "instruments.txt" beside the installed presets, found from the place of the
-/// library itself; TINTGATE_INSTRUMENTS names another one. Lines of "N = name" in UTF-8; blank
-/// lines and lines that begin with # are passed over, and so is whatever has another form.
+/// The names file is "instruments.txt" next to the installed presets, found relative to the
+/// library, or the file that TINTGATE_INSTRUMENTS names. It has lines of "N = name" in UTF-8. Blank
+/// lines, lines that begin with # and all other lines are ignored.
 std::string instrumentName(unsigned int id);
 
-/// Display name for the DEVICE line of the definition file at `path` (bytes as the file system has
-/// them). Gives 0 or a code of docs/exit-codes.csv, `name` untouched: the file's own, 23 without
-/// such a line, 28 where its value is no instrument number.
+/// Display name for the DEVICE line of the definition file at `path` (bytes of the file system).
+/// Returns 0, or a code of docs/exit-codes.csv with `name` unchanged: the code of the file's
+/// failure, 23 if there is no such line, 28 if its value is not an instrument number.
 int instrumentOfDefinition(const std::string& path, std::string& name);
 
 } // namespace analysis

@@ -44,8 +44,8 @@ char* writeWhole(char* at, std::uint64_t value) {
     return std::to_chars(at, at + 20, value).ptr;
 }
 
-/// Six decimals without the zeros at their end; `millionths` is below a million. Most values of
-/// instruments have two.
+/// Six decimals without trailing zeros. `millionths` is less than a million. Most values from
+/// instruments have two decimals.
 char* writeFraction(char* at, std::uint32_t millionths) {
     if (millionths == 0) {
         return at;
@@ -62,9 +62,9 @@ char* writeFraction(char* at, std::uint32_t millionths) {
     return at;
 }
 
-/// The shortest form of a value rounded to six decimals, halves to even as printf has it. A product
-/// with a million carries a rounding of its own, so what lies near a half is left to the exact
-/// conversion, as is all that would not fit.
+/// The shortest form of a value rounded to six decimals, halves to even like printf. Multiplying by
+/// a million rounds too, so values near a half use the exact conversion, as do values that don't
+/// fit.
 char* writeNumber(char* at, double value) {
     const double size = std::abs(value);
     if (size >= 1e9) {
@@ -94,14 +94,14 @@ char* writeNumber(char* at, double value) {
 
 } // namespace
 
-/// Makes sure of room for so many bytes, at most mostRoom.
+/// Makes room for this many bytes, at most mostRoom.
 void JsonWriter::room(std::size_t bytes) {
     if (static_cast<std::size_t>(m_block.data() + m_block.size() - m_at) < bytes) {
         widen(blockSize);
     }
 }
 
-/// Takes the first bytes of the block to the text, and the others to the block's start.
+/// Moves the first bytes of the block to the text, and the rest to the start of the block.
 void JsonWriter::widen(std::size_t count) {
     const std::size_t before = m_text.size();
     m_text.resize(before + count);
@@ -127,7 +127,7 @@ void JsonWriter::lineBreak() {
     m_at = std::fill_n(m_at, indent, ' ');
 }
 
-/// Before every value and every key.
+/// Called before every value and every key.
 void JsonWriter::separate() {
     if (m_afterKey) {
         m_afterKey = false;
@@ -221,7 +221,7 @@ void JsonWriter::escaped(char32_t character) {
     unit(0xDC00 | (beyond & 0x3FF));
 }
 
-/// Writes the characters that need no escape, up to the first other one or the block's end.
+/// Writes characters that need no escape, up to one that does or to the end of the block.
 void JsonWriter::plain(const char*& from, const char* end) {
     const char* const last = m_block.data() + m_block.size();
     char* at = m_at;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// ASCII JSON, written as the wide text that callers of the library get.
+// Writes ASCII JSON as wide text, the form that the library returns.
 #pragma once
 
 #include <array>
@@ -10,30 +10,30 @@
 
 namespace analysis {
 
-/// Appends JSON in the order in which it is called, commas included; whether objects and arrays
-/// close in turn is the caller's affair. No tree is built: a result of 100,000 patches is written
-/// row by row. The text is ASCII whatever goes in.
+/// Appends JSON in the order of the calls, with the commas. The caller must close objects and
+/// arrays in the right order. No tree is built: a result of 100,000 patches is written row by row.
+/// The text is ASCII for any input.
 class JsonWriter {
   public:
-    /// `expected`: characters to have room for at once.
+    /// `expected`: number of characters to reserve.
     explicit JsonWriter(std::size_t expected) { m_text.reserve(expected); }
     JsonWriter(const JsonWriter&) = delete;
     JsonWriter& operator=(const JsonWriter&) = delete;
 
-    /// Members and items stand on lines of their own, indented by two blanks a level.
+    /// Each member and item is on its own line, indented by two blanks per level.
     void beginObject() { open('{'); }
     void endObject() { close('}'); }
     void beginArray() { open('['); }
     void endArray() { close(']'); }
 
-    /// From here to the matching end everything stands on one line.
+    /// Everything up to the matching end is on one line.
     void beginCompactObject();
     void beginCompactArray();
 
-    void key(std::string_view name); ///< ASCII without anything to escape.
+    void key(std::string_view name); ///< ASCII with nothing to escape.
 
     void text(std::string_view utf8); ///< Invalid bytes become U+FFFD.
-    void number(double value);        ///< At most six decimals; null where not finite.
+    void number(double value);        ///< At most six decimals. Null if not finite.
     void integer(std::int64_t value);
     void boolean(bool value);
     void null();
@@ -47,12 +47,12 @@ class JsonWriter {
     /// The line end of the whole text.
     void endLine() { raw("\n"); }
 
-    /// What was written, which ends the writing.
+    /// Returns the text. Nothing may be written after that.
     std::wstring finish();
 
   private:
-    /// Characters are gathered as bytes and widened a block at a time: a second buffer of the whole
-    /// text would cost its pages.
+    /// Characters are collected as bytes and widened one block at a time. A second buffer for the
+    /// whole text would take more memory.
     static constexpr std::size_t blockSize = 4096;
     static constexpr std::size_t mostRoom = 512;
 
@@ -70,8 +70,8 @@ class JsonWriter {
     std::array<char, blockSize + mostRoom> m_block;
     char* m_at = m_block.data();
     int m_depth = 0;
-    int m_compactFrom = 0; ///< Depth from which on all is compact; 0: nothing is.
-    bool m_first = true;   ///< Nothing stands in the innermost bracket yet.
+    int m_compactFrom = 0; ///< Depth from which everything is compact. 0: nothing is.
+    bool m_first = true;   ///< The innermost bracket is still empty.
     bool m_afterKey = false;
 };
 

@@ -14,7 +14,7 @@
 namespace analysis {
 namespace {
 
-/// Six decimals: more than a profile's floating road can mean, and short enough to read.
+/// Six decimals: more than the precision of a profile, and short enough to read.
 double sixDecimals(double value) {
     return std::round(value * 1e6) / 1e6;
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The measured patches as the job's record holds them.
+// The measured patches as stored in the job's record.
 #pragma once
 
 #include "analysis/Comparison.h"
@@ -17,17 +17,17 @@ struct MeasuredPatches {
     base::Malloced<spectralRow[]> spectral; ///< Null without spectra that fit.
 };
 
-/// Gathers the measurement of a comparison: all its patches in its own order, or with a patch set
-/// or a profile those that were compared.
+/// Collects the measurement of a comparison: all its patches in its order. With a patch set or a
+/// profile, only the compared patches.
 ///
 /// XYZ 0 to 100, Lab, reflectances 0 to 1, CMYK 0 to 255. Device values that the measurement lacks
-/// come from the patch that it was compared with, else they are 0. Spectra of more than 36 values
-/// are thinned to 10 nm from 380 to 730, or left out where their axis has no such wavelengths.
+/// come from the patch that it was compared with, otherwise they are 0. Spectra of more than 36
+/// values are reduced to 10 nm from 380 to 730, or left out if their axis lacks these wavelengths.
 /// Throws std::bad_alloc.
 MeasuredPatches measuredPatches(const Comparison& comparison);
 
-/// Frees what the record held and puts the patches in its place. deltaEType is the number that the
-/// comparison was asked for.
+/// Frees the arrays of the record and replaces them with the patches. deltaEType is the number that
+/// the comparison was requested with.
 void storeMeasurement(MeasuredPatches patches, int deltaEType, measurementDataRecord& record);
 
 } // namespace analysis

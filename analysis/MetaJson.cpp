@@ -14,12 +14,12 @@ namespace {
 
 using Json = nlohmann::ordered_json;
 
-/// Absent texts are null, so that a page needs one test.
+/// A missing text is null, so that a page needs only one test.
 Json optional(const wxString& text) {
     return text.empty() ? Json() : Json(base::utf8FromWide(text.ToStdWstring()));
 }
 
-/// Local time with its distance from UTC: 2024-05-01T12:34:56+02:00.
+/// Local time with its offset from UTC: 2024-05-01T12:34:56+02:00.
 std::string now() {
     const std::time_t seconds = std::time(nullptr);
     std::tm local{};
@@ -30,7 +30,7 @@ std::string now() {
     return stamp.insert(stamp.size() - 2, ":");
 }
 
-/// A file in the job's folder, where the flow puts the texts of a run.
+/// A file in the job's folder, which contains the texts of a run.
 Json inFolder(const wxString& folder, const char* name) {
     return folder.empty() ? Json() : Json(base::utf8FromWide(folder.ToStdWstring()) + "/" + name);
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What is known of a job beside its colours, for the viewer; docs/meta.schema.json describes it.
+// Data of a job other than its colours, for the viewer. docs/meta.schema.json describes it.
 #pragma once
 
 #include <string>
@@ -8,8 +8,8 @@
 
 namespace analysis {
 
-/// ASCII JSON with a line end: the job's texts, numbers and paths, never its password. Reads no
-/// value array of the job: they may be freed by the time this is asked for.
+/// ASCII JSON with a line end: the job's texts, numbers and paths, never its password. Reads none
+/// of the job's value arrays, because they may have been freed already.
 std::wstring metaJson(const KZJobDataStruct& job);
 
 } // namespace analysis

@@ -1,8 +1,8 @@
 // SPDX-License-Identifier: Apache-2.0
 // The list is CMYK_ISO_12647-7_outer_gamut.ti1 of DisplayCAL (github.com/RomanHargrave/displaycal,
 // DisplayCAL/ref, added 2017-08-29). The file states no edition of the standard. Its entries follow
-// the rules below: paper, ramps of one ink, pairs of inks, and with black the colours that have
-// one ink full and at most one other.
+// the rules below: paper, ramps of one ink, pairs of inks, and colours with black that have one
+// full ink and at most one other.
 #include "analysis/OuterGamut.h"
 
 #include <algorithm>
@@ -15,7 +15,7 @@ namespace {
 constexpr int ramp[] = {3, 7, 10, 15, 20, 25, 30, 40, 50, 60, 70, 80, 90, 100};
 constexpr int pairs[] = {10, 20, 40, 70, 100};
 
-/// With so much black, one ink at 100 and a second at one of these. -1 fills the row.
+/// With this much black, one ink is 100 and a second ink has one of these values. -1 is padding.
 constexpr struct {
     int black;
     int second[6];
@@ -28,7 +28,7 @@ constexpr std::uint32_t keyOf(int c, int m, int y, int k) {
     return static_cast<std::uint32_t>(c << 24 | m << 16 | y << 8 | k);
 }
 
-/// The key of a colour of which ink `a` has x, ink `b` has y and black has k.
+/// The key of a colour with x of ink `a`, y of ink `b` and k of black.
 constexpr std::uint32_t keyOfPair(int a, int x, int b, int y, int k) {
     int inks[3] = {};
     inks[b] = y;
@@ -87,12 +87,12 @@ constexpr std::array<bool, 101> isLevel = [] {
     return is;
 }();
 
-/// The level of an ink within 0.5 of a value, or -1. A value of a half is near two whole numbers.
+/// The ink level within 0.5 of a value, or -1. A value that ends with .5 is near two integers.
 int levelOf(double value) {
     if (!(value >= -0.5 && value <= 100.5)) {
         return -1;
     }
-    const int up = static_cast<int>(value + 0.5); // below 0 it is cut to 0 as well
+    const int up = static_cast<int>(value + 0.5); // below 0 this gives 0 too
     if (up <= 100 && isLevel[static_cast<std::size_t>(up)]) {
         return up;
     }

@@ -18,7 +18,7 @@
 namespace analysis {
 namespace {
 
-/// Beyond this an old file is not held in memory to put it back.
+/// A larger old file is not kept in memory to be restored.
 constexpr std::size_t largestKept = std::size_t{1} << 30;
 
 /// Puts back what the first `written` bytes have replaced. It needs no room on the disk.
@@ -34,7 +34,7 @@ int writeInPlace(const std::string& path, std::string_view bytes) {
     struct stat status {};
     if (::stat(path.c_str(), &status) == 0 && S_ISREG(status.st_mode) &&
         colour::readWholeFile(path, largestKept, old) != colour::Failure::None) {
-        return exitOutputNotWritable; // what can't be kept is not put at risk
+        return exitOutputNotWritable; // could not be restored after a failure
     }
     base::Descriptor file(::open(path.c_str(), O_WRONLY | O_CREAT | O_CLOEXEC, 0666));
     if (!file.isOpen() || ::fstat(file.get(), &status) != 0) {

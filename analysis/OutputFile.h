@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Writing a file so that what stood there before is lost only to something whole.
+// Writes a file such that only complete contents replace the previous ones.
 #pragma once
 
 #include <initializer_list>
@@ -9,7 +9,7 @@
 
 namespace analysis {
 
-/// Makes `bytes` the contents of the file at `path` (bytes as the file system has them).
+/// Makes `bytes` the contents of the file at `path` (bytes of the file system).
 ///
 /// A file is written under another name in the same folder and renamed, keeping the old one's mode.
 /// A link, device or pipe, or a file in a folder that takes no other name, is written in place; if
@@ -18,7 +18,7 @@ namespace analysis {
 int writeOutputFile(const std::string& path, std::string_view bytes);
 
 /// Whether a CGATS text may be written to `path`: 0, 52 (a regular file that is one of `inputs`,
-/// under whatever name) or 53 (a regular file that is neither empty nor CGATS text).
+/// under any name) or 53 (a regular file that is neither empty nor CGATS text).
 int checkOutput(const std::string& path, std::initializer_list<std::string> inputs);
 
 } // namespace analysis

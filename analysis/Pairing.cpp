@@ -14,17 +14,17 @@ namespace {
 using colour::DataSet;
 using colour::DeviceSpace;
 
-/// Rows of one set under hashes of their keys. Equal keys queue up in the order of their rows.
+/// Rows of one set, found by hashes of their keys. Rows with equal keys are queued in row order.
 ///
-/// Open addressing over a power of two at least twice the rows, so a probe stays short; whether
-/// keys are equal is the caller's to say, since a hash alone does not prove it.
+/// Open addressing with a power of two of slots, at least twice the rows, so that probes stay
+/// short. The caller must say whether keys are equal, because equal hashes don't prove it.
 class RowIndex {
   public:
     explicit RowIndex(std::size_t rows)
         : m_mask(std::bit_ceil(std::max<std::size_t>(rows, 8) * 2) - 1), m_slots(m_mask + 1),
           m_next(rows, noRow) {}
 
-    /// REQUIRES: rows are added in rising order. `same(b)`: the row added and row b have equal
+    /// REQUIRES: rows are added in ascending order. `same(b)`: the added row and row b have equal
     /// keys.
     template<class Same>
     void add(std::uint64_t hash, std::uint32_t row, Same same) {
@@ -37,7 +37,7 @@ class RowIndex {
         }
     }
 
-    /// Takes the first row that is still there for a key, or noRow. `same(b)`: row b has that key.
+    /// Takes the first remaining row of a key, or noRow. `same(b)`: row b has that key.
     template<class Same>
     std::uint32_t take(std::uint64_t hash, Same same) {
         Slot& slot = find(hash, same);
@@ -48,7 +48,7 @@ class RowIndex {
         return row;
     }
 
-    /// As take, but begins anew when all rows of a key were taken; noRow for an unknown key.
+    /// Like take, but starts again when all rows of a key were taken. noRow for an unknown key.
     template<class Same>
     std::uint32_t takeInTurn(std::uint64_t hash, Same same) {
         Slot& slot = find(hash, same);
@@ -62,7 +62,7 @@ class RowIndex {
   private:
     struct Slot {
         std::uint64_t hash = 0;
-        std::uint32_t key = noRow; ///< A row with the key; stays when the queue runs dry.
+        std::uint32_t key = noRow; ///< A row with the key. Stays when the queue is empty.
         std::uint32_t first = noRow;
         std::uint32_t last = noRow;
     };
@@ -90,8 +90,8 @@ std::uint64_t mixed(std::uint64_t h) {
     return h ^ h >> 32;
 }
 
-/// Device values of a set in whole quanta, `width` channels a row. Channels that the set lacks are
-/// 0: a process chart goes with one that has unused spot channels.
+/// Device values of a set in integer quanta, `width` channels per row. Channels that the set lacks
+/// are 0: a process chart pairs with one that has unused spot channels.
 class DeviceKeys {
   public:
     DeviceKeys(const DataSet& set, std::size_t width, double perPercent)
@@ -100,7 +100,7 @@ class DeviceKeys {
         for (std::size_t row = 0; row < set.patchCount; ++row) {
             for (std::size_t channel = 0; channel < own; ++channel) {
                 const double value = set.device[row * own + channel] * perPercent;
-                // In this order of arguments not-a-number is bounded too.
+                // This order of the arguments also bounds NaN.
                 const double bounded = std::min(std::max(-2e9, value), 2e9);
                 m_keys[row * width + channel] =
                     static_cast<std::int32_t>(std::floor(bounded + 0.5));
@@ -143,7 +143,7 @@ class LabelKeys {
     const std::vector<std::string>& m_labels;
 };
 
-/// Pairs the rows that are still alone on both sides.
+/// Pairs rows that have no partner yet on either side.
 template<class Keys>
 std::size_t pairRest(Pairing& pairing, std::vector<bool>& taken, const Keys& left,
                      const Keys& right) {
@@ -172,8 +172,8 @@ std::size_t pairRest(Pairing& pairing, std::vector<bool>& taken, const Keys& lef
     return found;
 }
 
-/// Gives each row without a partner that of a row with the same key, in turn if there are several.
-/// Calls found(row, partner) for each.
+/// Gives each row without a partner the partner of a row with the same key, in turn if there are
+/// several. Calls found(row, partner) for each.
 template<class Keys, class Found>
 void pairRepeats(const std::vector<std::uint32_t>& partner, const Keys& keys, Found found) {
     RowIndex index(partner.size());
@@ -196,8 +196,8 @@ void pairRepeats(const std::vector<std::uint32_t>& partner, const Keys& keys, Fo
     }
 }
 
-/// Adds the repeats of both sets by their keys. May be called again with other keys, for the rows
-/// that are left then.
+/// Adds the repeats of both sets by their keys. Can be called again with other keys for the
+/// remaining rows.
 template<class Keys>
 void addRepeats(Pairing& pairing, std::size_t rightCount, const Keys& left, const Keys& right) {
     std::vector<std::uint32_t> inverse(rightCount, noRow);
@@ -205,7 +205,7 @@ void addRepeats(Pairing& pairing, std::size_t rightCount, const Keys& left, cons
     for (std::uint32_t row = 0; row < pairing.partner.size(); ++row) {
         if (pairing.partner[row] != noRow) {
             std::uint32_t& first = inverse[pairing.partner[row]];
-            first = std::min(first, row); // noRow is the largest
+            first = std::min(first, row); // noRow is the largest number
             ++leftPaired;
         }
     }
@@ -242,7 +242,7 @@ Pairing pairByDevice(const DataSet& left, const DataSet& right) {
     Pairing pairing;
     pairing.by = PairedBy::DeviceValues;
     pairing.partner.assign(left.patchCount, noRow);
-    // Most pairs of files are one chart in one order, where nothing needs looking up.
+    // Most pairs of files are the same chart in the same order and need no lookups.
     if (left.channels.size() == right.channels.size() && left.device == right.device) {
         pairByOrder(pairing, right.patchCount);
         return pairing;
@@ -270,7 +270,7 @@ Pairing pairByDevice(const DataSet& left, const DataSet& right) {
     return pairing;
 }
 
-/// True if labels tell patches apart: at most one in ten repeats another, as paper does in a wedge.
+/// True if labels identify patches: at most one in ten repeats another, as paper does in a wedge.
 bool mostlyDiffer(const std::vector<std::string>& labels) {
     std::vector<std::string_view> sorted(labels.begin(), labels.end());
     std::sort(sorted.begin(), sorted.end());
@@ -288,7 +288,7 @@ Pairing pairByLabels(const std::vector<std::string>& left, const std::vector<std
     return pairing;
 }
 
-/// Rows that a pairing puts together although labels of the other kind name another row.
+/// Counts the pairs for which the labels of the other kind name another row.
 std::size_t contradictionsOf(const Pairing& pairing, const std::vector<std::string>& left,
                              const std::vector<std::string>& right) {
     if (left.empty() || right.empty()) {
@@ -323,7 +323,7 @@ Pairing pairByBestLabels(const DataSet& left, const DataSet& right) {
             continue;
         }
         Pairing pairing = pairByLabels(leftLabels, rightLabels);
-        // Ids are often no more than the numbers of the rows; names that differ are meant.
+        // Ids are often just row numbers. Names that differ were given on purpose.
         const bool better =
             pairing.paired > best.paired || (i == names && pairing.paired == best.paired &&
                                              mostlyDiffer(leftLabels) && mostlyDiffer(rightLabels));

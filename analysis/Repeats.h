@@ -8,9 +8,9 @@ namespace analysis {
 
 /// Fills groupOf and spread of a comparison that has its patches and their Lab values.
 ///
-/// Patches of equal device values are one group. If no file has device values, the patches of one
+/// Patches with equal device values are one group. If no file has device values, the patches of one
 /// row of the selection are. A row of the measurement that is compared with several rows of the
-/// target is one reading. Values of a profile are calculated, so they are no readings.
+/// target is one reading. Values of a profile are calculated, so they are not readings.
 void findRepeats(Comparison& comparison);
 
 /// Makes one patch of each group, in the order of their first patches: the means of its measured

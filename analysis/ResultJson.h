@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The result of a comparison as JSON text; docs/result.md and docs/result.schema.json describe it.
+// The result of a comparison as JSON text. docs/result.md and docs/result.schema.json describe it.
 #pragma once
 
 #include <string>
@@ -11,12 +11,12 @@
 
 namespace analysis {
 
-/// ASCII JSON with a line end. The same inputs give the same text.
+/// ASCII JSON with a line end. Equal inputs give equal text.
 std::wstring resultJson(const Comparison& comparison, const Judgement& judgement,
                         const tolerancePresetParameterRecord& preset, const PresetOptions& options);
 
-/// The same without patches and lists of them, as members of the object that `json` is writing:
-/// from "verdict" to "warnings".
+/// Writes the members from "verdict" to "warnings" into the object that `json` is writing: the
+/// result without patches and lists of patches.
 void writeFindings(JsonWriter& json, const Comparison& comparison, const Judgement& judgement,
                    const tolerancePresetParameterRecord& preset, const PresetOptions& options);
 

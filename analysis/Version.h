@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Versions as the results state them. The build gives them.
+// The versions in results. The build sets them.
 #pragma once
 
 namespace analysis {

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the measuring tool is told to measure: a text made from the job's control-strip file,
-// keyword by keyword. Every line ends in "\r\n":
+// The definition for the measuring tool, made from the job's control-strip file, keyword by
+// keyword. Every line ends with "\r\n":
 //
 //     CGATS.17
 //     ORIGINATOR "Nerova Verify"
@@ -10,7 +10,7 @@
 //     END_DATA_FORMAT
 //     KEYWORD DEVICE
 //     DEVICE 21
-//     KEYWORD ZEBRA_RULER_MODE        (by the instrument)
+//     KEYWORD ZEBRA_RULER_MODE        (depends on the instrument)
 //     ZEBRA_RULER_MODE 1
 //     KEYWORD LOWRES
 //     LOWRES 0
@@ -43,20 +43,20 @@
 
 namespace {
 
-constexpr long mostSets = 1'000'000; ///< A strip of more patches is taken for damage.
+constexpr long mostSets = 1'000'000; ///< A strip with more patches counts as damaged.
 
-// Where the number of a keyword's line starts. The last one leaves the separator to the number,
-// which may have blanks in front (C52).
+// Offsets of the number in a keyword's line. The last one includes the separator, because blanks
+// may precede the number (C52).
 constexpr std::size_t behindStrips = 17;
 constexpr std::size_t behindSets = 15;
 constexpr std::size_t behindColumns = 14;
 
-/// Patches of paper white, as filling rows behind their number.
+/// Patches of paper white: filling rows without their number.
 constexpr const char* rgbWhite = "\t255\t255\t255\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\r\n";
 constexpr const char* cmykWhite =
     "\t0.00\t0.00\t0.00\t0.00\t95.00\t0.00\t0.00\t84.00\t87.00\t74.00\r\n";
 
-/// What the instruments want to be told, in this order.
+/// Lines for certain instruments, in this order.
 struct InstrumentLines {
     std::initializer_list<int> deviceIDs;
     const char* text;
@@ -77,18 +77,18 @@ bool contains(std::wstring_view line, std::initializer_list<std::wstring_view> w
                        [&](std::wstring_view word) { return line.find(word) != line.npos; });
 }
 
-/// A line as it goes into a definition.
+/// A line in the form for a definition.
 std::string conditioned(std::wstring_view line) {
     return line.empty() ? "\r\n" : StringConditioning({line.data(), line.size()}).utf8_string();
 }
 
-/// The text of a definition, made from the lines of a strip.
+/// Builds the text of a definition from the lines of a strip.
 class Definition {
   public:
     Definition(measure::StripText& strip, const KZJobDataStruct& job)
         : m_strip(strip), m_job(job), m_isDynamic(job.useDynstrip == 1 && job.secondStrip == 0) {}
 
-    /// False where the size of the strip can't be told: the text ends there.
+    /// False if the size of the strip is unknown; the text ends there.
     bool build() {
         m_text = "CGATS.17\r\nORIGINATOR \"Nerova Verify\"\r\n";
         addFormat();
@@ -124,12 +124,12 @@ class Definition {
         }
         if (find("BEGIN_DATA_FORMAT")) {
             addFoundLine();
-            addLine(m_strip.nextLine()); // The field list stands on one line.
+            addLine(m_strip.nextLine()); // The field list is one line.
         }
         add("END_DATA_FORMAT\r\n");
     }
 
-    /// An instrument that the strip does not name gets no KEYWORD line (C51).
+    /// If the strip does not name the instrument, there is no KEYWORD line (C51).
     void addDevice() {
         for (std::wstring_view line = m_strip.firstLine(); !m_strip.atEnd();
              line = m_strip.nextLine()) {
@@ -156,7 +156,7 @@ class Definition {
         }
     }
 
-    /// The first line with the word, where there is one (C53). It becomes m_line.
+    /// Adds the first line with the word, if there is one (C53), and stores it in m_line.
     bool addLineOf(const char* word) {
         const bool found = find(word);
         if (found) {
@@ -166,7 +166,7 @@ class Definition {
         return found;
     }
 
-    /// The same; its number, or 0.
+    /// Same. Returns the line's number, or 0.
     long addNumberOf(const char* word, std::size_t offset) {
         return addLineOf(word) ? measure::numberBehind(m_line, offset) : 0;
     }
@@ -175,7 +175,7 @@ class Definition {
         add("KEYWORD " + word + "\r\n" + word + "\t" + std::to_string(number) + "\r\n");
     }
 
-    /// A dynamic strip has as many patches as its grid has places, whatever it says (C54).
+    /// A dynamic strip has as many patches as its grid has places, whatever its own count is (C54).
     bool addDynamicSize(long strips) {
         const long columns = addNumberOf("NUMBER_OF_COLS", behindColumns);
         if (columns < 1 || strips < 1 || columns > mostSets / strips) {
@@ -198,7 +198,7 @@ class Definition {
         return true;
     }
 
-    /// Leaves the strip at the line in front of its rows, or at its end.
+    /// Moves the strip to the line before its rows, or to its end.
     void addStartOfData() {
         if (!find("END_DATA_FORMAT")) {
             return;
@@ -212,14 +212,14 @@ class Definition {
         }
     }
 
-    /// All that follows, and an empty line: what comes behind the last line is one (C55).
+    /// Adds all following lines. An empty line after the last one counts as a line (C55).
     void addRows() {
         while (!m_strip.atEnd()) {
             addLine(m_strip.nextLine());
         }
     }
 
-    /// The strip's rows, and white ones up to the size of the grid.
+    /// Adds the strip's rows, and white rows up to the size of the grid.
     void addFilledRows() {
         long rows = 0;
         while (!m_strip.atEnd()) {
@@ -235,19 +235,19 @@ class Definition {
         for (long row = rows + 1; row <= m_sets; ++row) {
             add(std::to_string(row) + white);
         }
-        add("END_DATA"); // Without a line end (C56).
+        add("END_DATA"); // No line end (C56).
     }
 
     measure::StripText& m_strip;
     const KZJobDataStruct& m_job;
     const bool m_isDynamic;
-    long m_sets = 0; ///< Of a dynamic strip.
-    wxString m_line; ///< Found last.
+    long m_sets = 0; ///< For a dynamic strip.
+    wxString m_line; ///< The line found last.
     std::string m_text;
 };
 
-/// The head of a strip for those instruments that are set up by a file of their own beside the
-/// definition (C58): what stands in front of its table.
+/// The head of a strip, i.e. the text before its table, for instruments that are set up by their
+/// own file next to the definition (C58).
 std::string headOf(measure::StripText& strip) {
     std::string text;
     std::wstring_view line = strip.firstLine();
@@ -261,7 +261,7 @@ std::string headOf(measure::StripText& strip) {
     return text;
 }
 
-/// In place of what was there. That it can't be written shows when the tool looks for it (C57).
+/// Replaces an existing file. A failure is noticed when the tool looks for the file (C57).
 void write(const wxString& path, const std::string& text) {
     const std::string bytes = measure::pathBytes(path);
     unlink(bytes.c_str());
@@ -270,7 +270,7 @@ void write(const wxString& path, const std::string& text) {
 
 } // namespace
 
-// The strip is read whole before anything is removed: it may bear the definition's name itself.
+// The strip is read completely before any removal, because it may have the definition's name.
 wxString measure::writeDefinition(const wxString& path, const KZJobDataStruct& job) {
     StripText strip;
     if (!strip.read(path)) {

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The measuring tool's definition of what to measure.
+// The definition file for the measuring tool.
 #pragma once
 
 #include <wx/string.h>
@@ -10,9 +10,9 @@ namespace measure {
 
 inline constexpr const char* definitionName = "NMPatchSetDefinition.it8";
 
-/// Makes the definition from a control-strip file, in the same folder. Of the job it uses the
-/// instrument, the illumination mode, the strip and whether that is dynamic. Returns the
-/// definition's path, or an empty text, in which case a partial file can remain.
+/// Creates the definition from a control-strip file, in the same folder. Uses the job's instrument,
+/// illumination mode, strip number and whether the strip is dynamic. Returns the definition's path.
+/// On failure returns an empty text and can leave a partial file.
 wxString writeDefinition(const wxString& strip, const KZJobDataStruct& job);
 
 } // namespace measure

@@ -36,7 +36,7 @@ constexpr const char* measurePlists[] = {
 constexpr const char* familyFolder = "/Applications/Nerova";
 constexpr const char* measureBundle = "/NerovaMeasure.app";
 
-// The suite's applications on this installation are our companions; the rows behind them are free.
+// In this installation, the suite's applications are our companions. The other rows are free.
 constexpr std::array<const char*, 28> siblingApplications = {
     "NerovaMeasure",
     "Nerova Verify",
@@ -56,20 +56,20 @@ wxString underRoot(const char* literal) {
     return textFromBytes(platform::underRoot(literal));
 }
 
-// With a root the command word stands in quotes, since a root may hold blanks.
+// With a root, the command word is quoted, because a root may contain blanks.
 wxString plistCommandWord() {
     const wxString word = underRoot("/usr/libexec/Plistbuddy");
     return platform::systemRoot().empty() ? word : "\"" + word + "\"";
 }
 
-// The first line that a command prints, up to 255 bytes; empty if it prints none (C69).
+// The first line of a command's output, up to 255 bytes. Empty if there is none (C69).
 std::string firstLineOf(const std::string& command) {
     FILE* const pipe = popen(command.c_str(), "r");
     if (pipe == nullptr) {
         return {};
     }
     char line[256] = "";
-    // The end of another child may interrupt the read.
+    // SIGCHLD of another child may interrupt the read.
     while (std::fgets(line, sizeof line, pipe) == nullptr) {
         line[0] = '\0';
         if (std::ferror(pipe) == 0 || errno != EINTR) {
@@ -85,8 +85,8 @@ bool isFolder(const wxString& path) {
     return !path.empty() && wxFileName::DirExists(path);
 }
 
-// A folder, if something of this name lies in it. The test is the one for regular files, although
-// the names are those of bundles: it is the property lists that count (C68).
+// Whether the folder contains this name. Tests for a regular file although the names are bundles,
+// so only the property lists have an effect (C68).
 bool holds(const wxString& folder, const char* name) {
     return wxFileExists(folder + name);
 }
@@ -110,7 +110,7 @@ int siblingsOfName(const std::string& name) {
     return count;
 }
 
-// One look at the running applications: how many matches it found. A name ends the look at its
+// Checks the running applications once and returns the number of matches. With a name, stops at the
 // first match.
 int countApplications(const wxString& wanted, bool kill) {
     const wxCharBuffer narrow = wanted.mb_str(wxConvLibc);
@@ -140,8 +140,8 @@ bool canBeExecuted(const std::string& path) {
            access(path.c_str(), X_OK) == 0;
 }
 
-// wxExecute leaves a handler behind that is called when a child ends: it would interrupt waits, and
-// touch what is gone when the program itself is about to end.
+// wxExecute installs a SIGCHLD handler that would interrupt waits, and would use destroyed objects
+// while the program ends. This restores the previous handler.
 class ChildSignalKept {
   public:
     ChildSignalKept() { sigaction(SIGCHLD, nullptr, &m_before); }
@@ -153,8 +153,8 @@ class ChildSignalKept {
     struct sigaction m_before;
 };
 
-// A child that is started meanwhile ignores the end of its terminal. The viewer outlives the tool,
-// and so may be told of that end before it can ignore it by itself.
+// Children started during its lifetime ignore SIGHUP. The viewer outlives the tool, and may get the
+// signal before it can ignore it itself.
 class HangUpIgnored {
   public:
     HangUpIgnored() {
@@ -170,7 +170,7 @@ class HangUpIgnored {
     struct sigaction m_before;
 };
 
-// One word of a command line, which eats backslashes and quotes.
+// Quotes one word of a command line that interprets backslashes and quotes.
 wxString quoted(const wxString& word) {
     wxString escaped = word;
     escaped.Replace("\\", "\\\\");
@@ -178,8 +178,8 @@ wxString quoted(const wxString& word) {
     return "\"" + escaped + "\"";
 }
 
-// The ended program's code, or the started program's number; -1 and 0 if there is nothing that can
-// be executed, which a started child would only say on standard error.
+// Returns the exit code of the ended program or the id of the started one. Returns -1 or 0 if there
+// is no executable file, which a started child would report only on standard error.
 long execute(const wxString& program, const wxString& arguments, bool wait) {
     if (!canBeExecuted(bytesFromText(program))) {
         return wait ? -1 : 0;
@@ -277,7 +277,7 @@ bool Helper::LaunchNerovaMeasure(const NerovaMeasureParams& params, int& exitCod
     while (IsNMRunning()) {
         std::this_thread::sleep_for(std::chrono::seconds(1));
     }
-    exitCode = 0; // Its own code is never known (C62).
+    exitCode = 0; // The tool's own exit code is unknown (C62).
     return true;
 }
 

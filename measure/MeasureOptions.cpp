@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// An option's name and its value take a line each. The password is always there, and it alone is
-// quoted (C60):
+// An option's name and its value are on separate lines. The password is always present, and only it
+// is quoted (C60):
 //
 //     -apnm
 //     Nerova Verify

@@ -8,8 +8,8 @@
 
 namespace measure {
 
-/// Its text, as bytes: each option that is given, and its value as it stands, on a line of their
-/// own. A value with a line break breaks the format; a path that is not valid UTF-8 does not.
+/// The file's text as bytes: each given option and its unchanged value on separate lines. A value
+/// with a line break breaks the format; a path that is not valid UTF-8 does not.
 std::string optionsText(const NerovaMeasureParams& params);
 
 } // namespace measure

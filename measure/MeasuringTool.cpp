@@ -47,8 +47,8 @@ void removeFile(const wxString& path) {
     unlink(measure::pathBytes(path).c_str());
 }
 
-/// A control strip that bears the definition's name, or leads to it: the definition takes its place
-/// for a while, and its own bytes come back with the end of this object.
+/// Handles a control strip with the definition's name, or a link to it: the definition replaces it
+/// temporarily, and the destructor restores its bytes.
 class ReplacedStrip {
   public:
     explicit ReplacedStrip(const wxString& strip) : m_path(measure::pathBytes(strip)) {
@@ -80,7 +80,7 @@ wxString instrumentOf(const wxString& definition) {
     return getDeviceNameFromIt8ControlStripFile(definition, &name) == 0 ? name : "Unknown";
 }
 
-/// Runs the tool. Where that fails, no samples are left.
+/// Runs the tool. On failure, removes the samples.
 Outcome launch(const NerovaMeasureParams& params) {
     int exitCode = 0;
     if (Helper::LaunchNerovaMeasure(params, exitCode, true) && exitCode == 0) {
@@ -111,7 +111,7 @@ int measure::measureStrip(KZJobDataStruct& job) {
     if (definition.empty()) {
         return NoDefinition;
     }
-    removeFile(job.sampleFile); // An old one is not to be taken for a new one.
+    removeFile(job.sampleFile); // An old one must not be mistaken for a new one.
     NerovaMeasureParams params;
     params.apnm = "Nerova Verify";
     params.l = wxString::Format("%d", GetLanguageID(&job));

@@ -1,17 +1,17 @@
 // SPDX-License-Identifier: Apache-2.0
-// The measuring tool: what it is told, and its run.
+// Runs the measuring tool.
 #pragma once
 
 struct KZJobDataStruct;
 
-/// The measuring tool's number of the job's language, such as "de_DE"; any other is 57 (C59).
+/// The measuring tool's number of the job's language, such as "de_DE". 57 for any other (C59).
 int GetLanguageID(KZJobDataStruct* job);
 
 namespace measure {
 
-/// Has the measuring tool measure the job's control strip, and waits for it. 0, or -1 if it was
-/// running already, -2 if it could not be started, -3 without a control strip, -4 or -5
-/// (C65) if there is no definition.
+/// Runs the measuring tool on the job's control strip and waits for it. Returns 0, or -1 if the
+/// tool was already running, -2 if it could not be started, -3 if there is no control strip, -4 or
+/// -5 (C65) if there is no definition.
 int measureStrip(KZJobDataStruct& job);
 
 } // namespace measure

@@ -1,30 +1,30 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the measuring tool is told to do.
+// The options of the measuring tool.
 #pragma once
 
 #include <wx/string.h>
 
-/// The measuring tool's options, each as text, numbers and truth values too. An empty field means
-/// that the option is not given.
+/// All options are texts, including numbers and truth values. An empty field means that the option
+/// is not given.
 ///
-/// The order is that in which the options are written. Each field's option is its own name behind a
-/// hyphen, but for `unassigned`, which has none (C61).
+/// The order is that of the options file. Each option's name is a hyphen plus the field's name,
+/// except for `unassigned`, which has no option (C61).
 struct NerovaMeasureParams {
     wxString apnm; ///< Name of the calling application.
     wxString l;    ///< Language, as a decimal number.
     wxString s;
     wxString user;
-    wxString pwd; ///< Always written, in double quotes, even when empty.
+    wxString pwd; ///< Always written, in double quotes, even if empty.
     wxString i;   ///< Name of the instrument.
     wxString j;
-    wxString m; ///< What to do.
+    wxString m; ///< The action.
     wxString chart;
     wxString chartwidth;
     wxString chartheight;
     wxString paper;
     wxString width;
     wxString height;
-    wxString o;         ///< Where the measured samples go.
+    wxString o;         ///< File for the measured samples.
     wxString patch;     ///< Path of the definition file.
     wxString patchname; ///< Name shown for it.
     wxString testmode;
@@ -55,7 +55,7 @@ struct NerovaMeasureParams {
     wxString visualchart;
     wxString taglinefile;
     wxString showpdfwfpatch;
-    wxString unassigned; ///< No option reads it.
+    wxString unassigned; ///< No option uses it.
     wxString showOnly918patch;
     wxString warmupcopiescount;
     wxString add2it8;

@@ -8,10 +8,10 @@
 
 namespace measure {
 
-/// A path as the bytes that the system knows it by.
+/// A path as the system's bytes.
 std::string pathBytes(const wxString& path);
 
-/// A file of this name in the folder of another one.
+/// A name in the folder of another file.
 wxString pathBeside(const wxString& path, const char* name);
 
 /// True if the path leads to a regular file.

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The text file in which a job's stored values go to the analysis. Its lines end in "\n", its
-// columns are parted by tabs:
+// The text file that passes a job's stored values to the analysis. Lines end with "\n", and tabs
+// separate columns:
 //
 //     CGATS.17
 //     KEYWORD ILLUMINATION_CONDITION
@@ -29,7 +29,7 @@
 
 namespace {
 
-/// Used entries of a spectral row; 0 where there are no spectra, or none that fit their rows.
+/// Used entries of a spectral row. 0 if there are no spectra or they don't fit their rows.
 int spectralLength(const measurementDataRecord& measurement) {
     if (measurement.spectral == nullptr || measurement.numPatches < 1) {
         return 0;
@@ -40,7 +40,7 @@ int spectralLength(const measurementDataRecord& measurement) {
 
 struct Fields {
     int count;
-    std::string names; ///< Parted by tabs.
+    std::string names; ///< Separated by tabs.
 };
 
 Fields fieldsOf(const measurementDataRecord& measurement) {
@@ -68,7 +68,7 @@ class Row {
   public:
     void start(int number) { m_end = std::to_chars(m_text.begin(), m_text.end(), number).ptr; }
 
-    /// Significant digits from here on, in the rows to come as well.
+    /// Sets the number of significant digits for this row and all later rows.
     void setPrecision(int digits) { m_precision = digits; }
 
     void add(std::span<const double> values) {
@@ -92,8 +92,8 @@ class Row {
     int m_precision = 6;
 };
 
-/// The precision that one row ends with is the one that the next row's device and Lab values get:
-/// only the first row has them with 6 digits (C47).
+/// The precision at the end of a row applies to the device and Lab values of the next row, so only
+/// the first row has them with 6 digits (C47).
 void writeRows(const measurementDataRecord& measurement, std::ofstream& file) {
     const auto length = static_cast<std::size_t>(spectralLength(measurement));
     Row row;

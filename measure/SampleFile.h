@@ -8,8 +8,8 @@ struct measurementDataRecord;
 
 namespace measure {
 
-/// Writes the measurement as CGATS text. -1 without device values, with an empty file left; a file
-/// that can't be opened is not reported (C48).
+/// Writes the measurement as CGATS text. Returns -1 and leaves an empty file if there are no device
+/// values. Does not report a file that can't be opened (C48).
 int writeSampleFile(const wxString& path, int illuminationMode,
                     const measurementDataRecord& measurement);
 

@@ -11,8 +11,8 @@
 
 namespace {
 
-constexpr std::size_t longestLine = 511; ///< Bytes of a conditioned line.
-constexpr int noSuchFile = 10;           ///< A result code.
+constexpr std::size_t longestLine = 511; ///< Maximum bytes of a conditioned line.
+constexpr int noSuchFile = 10;           ///< Result code.
 
 } // namespace
 
@@ -26,7 +26,7 @@ bool findStringInFile(wxTextFile* file, wxString needle, wxString* line) {
     return false;
 }
 
-// The walk starts at an index that counts characters, and looks at bytes (C50).
+// The loop starts at a character index but inspects bytes (C50).
 wxString StringConditioning(wxString line) {
     const std::string utf8 = line.utf8_string();
     // Up to a NUL, and never half a character.
@@ -44,7 +44,7 @@ wxString StringConditioning(wxString line) {
 
 long measure::numberBehind(const wxString& line, std::size_t offset) {
     long number = 0;
-    // A number that is followed by something else is stored all the same.
+    // ToLong stores a number even if other text follows it.
     return line.Mid(offset).BeforeFirst('\n').ToLong(&number, 10) ? number : 0;
 }
 

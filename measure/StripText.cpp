@@ -23,7 +23,7 @@ bool StripText::read(const wxString& path) {
     return true;
 }
 
-// A line ends at CR, LF or both. Text without an end is a line too.
+// A line ends with CR, LF or both. Text without a line end is a line too.
 std::wstring_view StripText::lineAt(std::size_t start) {
     const std::wstring_view all = text();
     m_start = start;
@@ -42,8 +42,7 @@ std::wstring_view StripText::nextLine() {
 
 bool StripText::find(const char* needle, wxString* line) {
     const std::wstring wanted(needle, needle + std::char_traits<char>::length(needle));
-    // Hits are searched for in the whole text, which is faster than line by line: no needle has a
-    // line end in it.
+    // Searches the whole text, which is faster than line by line. No needle contains a line end.
     const std::wstring_view all = text();
     const std::size_t hit = all.find(wanted);
     if (hit == all.npos) {

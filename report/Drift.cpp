@@ -8,9 +8,9 @@
 namespace report {
 namespace {
 
-constexpr double limits = 3; ///< Standard errors.
+constexpr double limits = 3; ///< In standard errors.
 
-/// Identical figures have no scatter; then anything that a person could see is significant.
+/// Identical figures have no scatter. Then any visible change is significant.
 constexpr double leastScatter = 1e-3;
 
 std::vector<double> finite(const std::vector<double>& values) {

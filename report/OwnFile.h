@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The mark by which files of ours are known: only these are ever replaced by a later one.
+// The marks of our own files: only these are ever replaced by a later one.
 #pragma once
 
 #include <string>
@@ -10,14 +10,14 @@ namespace report {
 enum class OwnKind {
     Page,   ///< A page of a result, with its summary.
     Result, ///< The JSON of a comparison.
-    Broken, ///< JSON that describes a measurement that could not be used.
+    Broken, ///< JSON that describes an unusable measurement.
 };
 
-/// Whether the beginning of a file carries the mark; all marks are within summaryWithin bytes.
+/// Whether the start of a file contains the mark. All marks are in the first summaryWithin bytes.
 bool carriesMark(OwnKind kind, std::string_view start);
 
-/// Whether the regular file at `path` carries the mark. False for all other kinds of files and for
-/// those that can't be read.
+/// Whether the regular file at `path` has the mark. False for all other kinds of files and for
+/// unreadable ones.
 bool isOwnFile(OwnKind kind, const std::string& path);
 
 } // namespace report

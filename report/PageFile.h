@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Pages on disk.
+// Writes pages to disk.
 #pragma once
 
 #include <string>
@@ -9,14 +9,14 @@
 
 namespace report {
 
-/// report-strip1-2024-05-01-123456: the strip and the time of the run, not of the viewing.
+/// report-strip1-2024-05-01-123456: the strip and the time of the run (not of the display).
 std::string pageStem(const Meta& meta);
 
-/// Writes a page to FOLDER/STEM.html, or to STEM-2.html and on where other pages have the name:
-/// none is overwritten. Where one of them holds this very text already, that one is taken. The page
-/// is written whole, brought to the disk, and only then gets its name.
+/// Writes a page to FOLDER/STEM.html, or to STEM-2.html and so on if other pages have the name:
+/// none is overwritten. If one of them already has this exact text, it is used. The page is written
+/// completely, flushed to disk, and only then renamed.
 ///
-/// Returns the page's path, or nothing, with the reason in `problem` and no file left behind.
+/// Returns the page's path. On failure, returns nothing, sets `problem` and leaves no file.
 std::string keepPage(const std::string& folder, const std::string& stem, std::string_view page,
                      std::string& problem);
 

@@ -33,7 +33,7 @@ bool isJobFolder(const fs::directory_entry& entry) {
            entry.path().filename().string().starts_with(jobkeys::jobFolderPrefix);
 }
 
-/// Entries of a folder for which `wanted` holds; none where it can't be read.
+/// Entries of a folder that `wanted` accepts. Empty if the folder can't be read.
 template<class Wanted>
 std::vector<fs::path> entriesOf(const fs::path& folder, Wanted wanted) {
     std::vector<fs::path> paths;
@@ -59,7 +59,7 @@ std::vector<Listed> reportsBelow(const std::string& folder) {
             }
         }
     }
-    // Stamps carry the distance from UTC; within one room they sort as text.
+    // Stamps include the offset from UTC. Within one room they sort as text.
     std::sort(reports.begin(), reports.end(), [](const auto& a, const auto& b) {
         return a.summary.created != b.summary.created ? a.summary.created > b.summary.created
                                                       : a.path < b.path;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The reports that lie on this machine.
+// Finds the reports on this machine.
 #pragma once
 
 #include <string>
@@ -9,8 +9,8 @@
 
 namespace report {
 
-/// Reports in the folders of jobs (JobID_N/report-*.html) below `folder`, the latest first, with
-/// paths relative to it. Links and what is no report of ours are passed over.
+/// Reports in the folders of jobs (JobID_N/report-*.html) below `folder`, latest first, with paths
+/// relative to it. Skips links and files that are not our reports.
 std::vector<Listed> reportsBelow(const std::string& folder);
 
 } // namespace report

@@ -13,7 +13,7 @@ constexpr double toLinear[3][3] = {{3.1338561, -1.6168667, -0.4906146},
                                    {-0.9787684, 1.9161415, 0.0334540},
                                    {0.0719453, -0.2289914, 1.4052427}};
 
-// Inverse of the function that CIELAB applies to ratios.
+// Inverse of CIELAB's function of ratios.
 double ratio(double f) {
     constexpr double knee = 6.0 / 29;
     return f > knee ? f * f * f : 3 * knee * knee * (f - 4.0 / 29);
@@ -29,7 +29,7 @@ Swatch swatch(const colour::Lab& lab) {
     if (!std::isfinite(lab.L) || !std::isfinite(lab.a) || !std::isfinite(lab.b)) {
         return {0, 0, 0, true};
     }
-    // No colour of a print comes near this; beyond it the cubes could overflow.
+    // Far outside the colours of any print; beyond this the cubes could overflow.
     const auto bounded = [](double value) { return std::clamp(value, -1000.0, 1000.0); };
     const double y = (bounded(lab.L) + 16) / 116;
     const double xyz[3] = {white[0] * ratio(y + bounded(lab.a) / 500), white[1] * ratio(y),

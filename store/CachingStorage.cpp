@@ -9,7 +9,7 @@ namespace store {
 
 namespace {
 
-// Places in a listing: in front of all, and where none is under way.
+// Positions in a listing: before the first key, and outside any listing.
 constexpr std::pair listingStarts = {-1, std::size_t{0}};
 constexpr std::pair notListing = {std::numeric_limits<int>::max(), std::size_t{0}};
 
@@ -22,7 +22,7 @@ Result orElse(Result otherwise, Body body) {
     }
 }
 
-/// Whether a record, as the first one of its key, leaves nothing of what the key held.
+/// Whether a record, as the first one of its key, replaces everything that the key had.
 bool replacesKey(const SETMULTIPAR& record) {
     if (record.position != POSITION_WHOLE) {
         return false;
@@ -47,7 +47,7 @@ Scope scopeOf(const SETMULTIPAR* table) {
     Scope scope;
     scope.repeatable = true;
     const char* last = nullptr;
-    bool needed = false; // What the record's key held before.
+    bool needed = false; // Whether the old value of the record's key is needed.
     for (const auto* record = table; record->key != nullptr; ++record) {
         if (record->key != last) {
             last = record->key;
@@ -81,14 +81,14 @@ void clearResults(SETMULTIPAR* table) {
 CachingStorage::CachingStorage(std::shared_ptr<StoreEngine> engine, NoteFailure note)
     : m_engine(std::move(engine)), m_note(std::move(note)) {}
 
-/// Writes to a ticket, unless a former write to it was lost. False, with each key noted, if the
-/// store did not take it.
+/// Writes to a ticket, unless an earlier write to it was lost. If the store fails, notes each key
+/// and returns false.
 template<class Keys, class Write>
 bool CachingStorage::write(int type, int id, Keys keys, Write write) {
     const std::pair address = {type, id};
     std::string reason = "an earlier write to this ticket was lost";
     if (!m_cutOff.contains(address)) {
-        // In front of the write: it is not to fail for want of memory behind it.
+        // Before the write, so that no memory is needed after it.
         const auto cutOff = m_cutOff.insert(address).first;
         try {
             const bool written = write();
@@ -148,7 +148,7 @@ std::shared_ptr<const Elements> CachingStorage::key(int type, int id, std::strin
         const bool inOverview = index != overviewKeys.size();
         const bool again = id == m_fetched.id && type == m_fetched.type && key == m_fetched.key;
         const bool listing = inOverview && goesOn(id, index);
-        // Asked before the store is: what is committed in between makes the next read fetch again.
+        // Read before the store: commits in between only cause the next read to fetch again.
         const std::uint64_t commits =
             m_engine->commits(listing ? oldestListed : std::chrono::milliseconds(0));
         if (again && commits == m_fetched.commits) {
@@ -175,7 +175,7 @@ std::shared_ptr<const Elements> CachingStorage::key(int type, int id, std::strin
     });
 }
 
-/// Whether a read of the overview goes on in a listing, behind its first one.
+/// Whether a read of the overview continues a listing, i.e. is not its first.
 bool CachingStorage::goesOn(int id, std::size_t overviewKey) {
     const std::pair next = {id, overviewKey};
     const bool starts = m_listed == listingStarts;
@@ -184,9 +184,9 @@ bool CachingStorage::goesOn(int id, std::size_t overviewKey) {
     return goesOn;
 }
 
-/// Whether the overview of this moment is there; it is fetched where that is worth it. While others
-/// keep writing, it is fetched again only after so many reads that they cost more, or after so long
-/// a time that a listing does not notice.
+/// Whether the overview is current; fetches it if that is worthwhile. If others keep writing, it is
+/// fetched again only after so many reads that they cost more, or after a time that a listing does
+/// not notice.
 bool CachingStorage::wantsOverview(std::uint64_t commits, bool listing) {
     if (m_overviewHeld && m_overviewCommits == commits) {
         return true;

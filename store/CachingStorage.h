@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The tickets of a store, as a session's container asks for them.
+// The tickets of a store for a session's container.
 #pragma once
 
 #include <array>
@@ -19,31 +19,31 @@
 
 namespace store {
 
-/// A failure of the store is a ticket that isn't there, or a table that can't be written.
+/// A failure of the store appears as a missing ticket or as a refused table.
 ///
-/// When the store could not take a write (busy, lost, full, damaged, out of memory), all later
-/// writes to that ticket fail for as long as this lives. A client writes the keys that complete a
-/// job last, so a job with a gap never looks complete. What is refused by the rules of tickets does
-/// not count.
+/// If the store could not perform a write (busy, lost, full, damaged, out of memory), all later
+/// writes to that ticket fail during this object's lifetime. A client writes the keys that complete
+/// a job last, so a job with a gap never looks complete. Refusals by the rules of tickets are not
+/// failures of the store.
 ///
-/// What was read is given again only while nobody has committed anything since, so a reader sees
-/// what is there now. Two things are kept that way: the key that was read last, so that the
-/// count and the elements of an array are one fetch; and, once the ids of the jobs have been asked
-/// for, the overview of all jobs, since a client is about to ask each job for each of its keys.
+/// A cached value is used only if nobody has committed since, so readers always see the current
+/// state. Two things are cached: the key read last, so that the count and the elements of an array
+/// need one fetch; and, after the ids of the jobs were requested, the overview of all jobs, because
+/// a client then reads each of its keys for each job.
 ///
 /// While a client lists jobs (it has asked for the ids and now reads these keys job by job), values
 /// may be up to oldestListed old if asking costs a round trip. Every other read sees the latest
 /// commit.
 class CachingStorage : public TicketStorage {
   public:
-    /// Shown each key that a table or a transfer did not write, and why, for people.
+    /// Called with each key that a table or a transfer did not write, and the reason, for people.
     using NoteFailure =
         std::function<void(int type, int id, const std::string& key, const std::string& reason)>;
 
     explicit CachingStorage(std::shared_ptr<StoreEngine> engine, NoteFailure note = {});
 
     std::vector<int> ids(int type) override;
-    /// The same, but that a failure of the store is thrown: none is not the same as not known.
+    /// Same, but throws a failure of the store: no ids is not the same as unknown ids.
     std::vector<int> listIds(int type);
     bool exists(int type, int id) override;
     bool create(int type, int id) override;
@@ -77,18 +77,18 @@ class CachingStorage : public TicketStorage {
 
     const std::shared_ptr<StoreEngine> m_engine;
     const NoteFailure m_note;
-    std::set<std::pair<int, int>> m_cutOff; ///< Types and ids of tickets that lost a write.
+    std::set<std::pair<int, int>> m_cutOff; ///< Types and ids of tickets with a lost write.
     Fetched m_fetched;
     JobOverview m_overview;
-    std::unordered_map<int, SharedElements> m_numbers; ///< The different ones of the overview.
-    /// By key, the number that was read last: mostly the next job's, too.
+    std::unordered_map<int, SharedElements> m_numbers; ///< The distinct numbers in the overview.
+    /// For each key, the number read last, which is usually the next job's too.
     std::array<std::pair<int, SharedElements>, overviewKeys.size()> m_lastNumbers;
-    std::pair<int, std::size_t> m_listed{}; ///< Job and overview key that a listing read last.
+    std::pair<int, std::size_t> m_listed{}; ///< Job and overview key last read in a listing.
     std::chrono::steady_clock::time_point m_overviewFetched;
     std::uint64_t m_overviewCommits = 0;
     bool m_overviewHeld = false;
-    std::size_t m_readsSince = 0;      ///< Of keys that an overview would have held.
-    std::size_t m_readsUntilNext = 20; ///< An overview is due after so many.
+    std::size_t m_readsSince = 0;      ///< Reads of keys that an overview would contain.
+    std::size_t m_readsUntilNext = 20; ///< An overview is fetched after this many.
 };
 
 } // namespace store

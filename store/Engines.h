@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The kinds of places that stores are in, and what is the same in each.
+// The kinds of stores, and their common parts.
 #pragma once
 
 #include <functional>
@@ -14,7 +14,7 @@
 
 namespace store {
 
-/// One kind. As the functions of StoreEngine.h.
+/// One kind of store. Its functions correspond to those of StoreEngine.h.
 struct EngineKind {
     std::unique_ptr<StoreEngine> (*open)(const std::string& address, Access access);
     void (*make)(const std::string& address, const std::string& serverName);
@@ -28,10 +28,10 @@ extern const EngineKind postgresKind;
 
 inline constexpr int highestTicketId = 0xFFFFFF;
 
-/// What is stored of a key. Throws StoreFailure (Damaged).
+/// Decodes the stored bytes of a key. Throws StoreFailure (Damaged).
 std::shared_ptr<Elements> decoded(std::string_view bytes);
 
-/// Names and stored values of what every client asks the system ticket for.
+/// Names and stored values of the keys of the system ticket that every client reads.
 std::vector<std::pair<std::string, std::string>> systemKeys(const std::string& serverName);
 
 /// The reverse of eventName.
@@ -49,10 +49,10 @@ void showOverview(std::int64_t block, const StoreEngine::ShowFault& show);
 /// highestVersion is the highest one that was ever given.
 std::string gapIn(const std::vector<FileVersion>& versions, int highestVersion);
 
-/// The lowest number from 1 on that is not among ascending ids.
+/// The lowest number from 1 on that is not among the ascending ids.
 int lowestFree(const std::vector<int>& ids);
 
-/// Throws the failure of a store of another format than the present one.
+/// Throws the matching failure if the store's format is not the present one.
 void checkFormat(std::int64_t found, std::int64_t present);
 
 } // namespace store

@@ -13,7 +13,7 @@ constexpr char nothing = 0;
 constexpr char number = PARAM_INT;
 constexpr char somethingElse = '\xFF';
 
-/// Whether an entry is as slotOf and the store write it.
+/// Whether an entry has the form that slotOf and the store write.
 bool isSound(const char* entry) {
     if (entry[0] != 0 && entry[0] != 1) {
         return false;
@@ -59,7 +59,7 @@ void JobOverview::clear() {
 }
 
 void JobOverview::add(int block, std::string_view bytes) {
-    constexpr int blocks = 0x1000000 / jobsOfBlock; // Ids run up to 16,777,215.
+    constexpr int blocks = 0x1000000 / jobsOfBlock; // Ids go up to 16,777,215.
     if (block < static_cast<int>(m_start.size()) || block >= blocks || bytes.size() != blockBytes) {
         throw StoreFailure(Fault::Damaged, "the store's overview of jobs can't be read");
     }

@@ -1,10 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
-// The keys by which clients choose jobs, which a store keeps a second time: narrow, and of all jobs
-// together.
+// A compact second copy of the keys by which clients select jobs, for all jobs of a store.
 //
-// A client asks every job for each of these keys, so a run's time would grow with all jobs that
-// were ever stored if each key were looked up. A store therefore also keeps them in blocks, each
-// for 64 ids:
+// A client reads each of these keys for every job. If each key were looked up, a run's time would
+// grow with the number of all jobs ever stored. So a store also keeps them in blocks of 64 ids
+// each:
 //
 //   entry of id 0, entry of id 1, ... entry of id 63
 //
@@ -34,7 +33,7 @@ using jobkeys::jobType;
 
 using jobkeys::overviewKeys;
 
-/// The key's place among these; overviewKeys.size() for any other.
+/// Index of the key among these; overviewKeys.size() for any other.
 std::size_t overviewKey(std::string_view name);
 
 inline constexpr int jobsOfBlock = 64;
@@ -45,7 +44,7 @@ inline constexpr std::size_t blockBytes = jobsOfBlock * entryBytes;
 constexpr int blockOf(int id) {
     return id / jobsOfBlock;
 }
-/// Of the job's entry in its block.
+/// Offset of the job's entry in its block.
 constexpr std::size_t entryOffset(int id) {
     return static_cast<std::size_t>(id % jobsOfBlock) * entryBytes;
 }
@@ -53,28 +52,28 @@ constexpr std::size_t slotOffset(int id, std::size_t key) {
     return entryOffset(id) + 1 + key * slotBytes;
 }
 
-/// What stands in a key's slot; null is a key that isn't there.
+/// The content of a key's slot; null means a missing key.
 std::string slotOf(const Elements* elements);
 
-/// The blocks of a store, at one moment.
+/// The blocks of a store at one moment.
 class JobOverview {
   public:
     void clear();
-    /// Blocks come by ascending number. Throws StoreFailure (Damaged) for bytes that make no block.
+    /// Blocks must be added by ascending number. Throws StoreFailure (Damaged) for invalid bytes.
     void add(int block, std::string_view bytes);
 
-    /// Of all jobs, ascending.
+    /// All jobs, ascending.
     const std::vector<int>& ids() const { return m_ids; }
 
     enum class Holds { Nothing, Number, SomethingElse };
-    /// What a job's key holds, and if it is a number, that. Nothing for a job that isn't there.
+    /// The kind of a job's key and, if it is a number, its value. Nothing for a missing job.
     Holds find(int id, std::size_t key, int& number) const;
 
   private:
     static constexpr std::size_t none = static_cast<std::size_t>(-1);
 
-    std::string m_bytes;              ///< The blocks that are there, one behind the other.
-    std::vector<std::size_t> m_start; ///< By the number of a block: where it starts, or none.
+    std::string m_bytes;              ///< All existing blocks, one after the other.
+    std::vector<std::size_t> m_start; ///< Start of a block by its number, or none.
     std::vector<int> m_ids;
 };
 

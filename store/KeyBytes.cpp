@@ -54,7 +54,7 @@ void appendValue(std::string& bytes, const Value& value) {
         value);
 }
 
-/// Writes runs; the length of the last one is filled in when it ends.
+/// Writes runs. The length of a run is filled in at its end.
 class Writer {
   public:
     explicit Writer(std::string& bytes) : m_bytes(bytes) {}
@@ -94,10 +94,10 @@ class Writer {
     int m_next = 0;
     PARAM_TYPE m_type = PARAM_DELETE;
     std::uint32_t m_length = 0;
-    std::size_t m_lengthAt = 0; ///< 0: there is no run yet.
+    std::size_t m_lengthAt = 0; ///< 0 if there is no run yet.
 };
 
-/// What is left to read. After a failure nothing is.
+/// The unread bytes. Empty after a failure.
 class Reader {
   public:
     explicit Reader(std::string_view bytes) : m_bytes(bytes) {}
@@ -129,7 +129,7 @@ class Reader {
     std::string_view m_bytes;
 };
 
-/// Puts a run of numbers, as long as they are there, behind what there is.
+/// Appends a run of numbers, as far as they are present, to the elements.
 template<class Stored, class Kept = Stored>
 bool takeNumbers(Reader& reader, Elements& elements, int position, std::uint32_t length) {
     if (length > reader.left() / sizeof(Stored)) {
@@ -187,7 +187,7 @@ bool takeRun(PARAM_TYPE type, Reader& reader, Elements& elements, int position,
     }
 }
 
-/// Bytes of one run of numbers alone, which need no more than to be copied.
+/// The bytes of a single run of numbers, which only need to be copied.
 std::optional<Elements> packed(std::string_view bytes) {
     constexpr std::size_t header = 1 + 1 + sizeof(std::uint32_t);
     Reader reader(bytes);
@@ -219,7 +219,7 @@ std::string keyBytes(const Elements& elements) {
         return bytes;
     }
     {
-        Writer writer(bytes); // It fills in a length when it goes.
+        Writer writer(bytes); // Its destructor fills in a length.
         elements.visit([&](int position, const Value& value) {
             writer.add(position, value);
             return true;

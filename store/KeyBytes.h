@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The bytes in which a store keeps the elements of one key:
+// The stored form of the elements of one key:
 //
 //   01                                version
 //   02  03 00 00 00  <3 times 4>      three ints from position 0
@@ -7,8 +7,8 @@
 //   04  01 00 00 00  02 00 00 00 'hi' one text of two bytes, at position 5
 //
 // Runs of elements of one type follow each other: the type (a PARAM_TYPE; 0 is a hole), the number
-// of positions, and each element's value. All numbers are little-endian. Texts and binaries have
-// their length in front; a pointer is kept as a number of 64 bits. The last run is no hole.
+// of positions, and each element's value. All numbers are little-endian. Their length precedes
+// texts and binaries; a pointer is stored as a 64-bit number. The last run is not a hole.
 #pragma once
 
 #include <memory>

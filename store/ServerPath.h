@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Server paths: which of them name a file of a store.
+// Server paths that name a file of a store.
 #pragma once
 
 #include <string>
@@ -8,17 +8,17 @@
 
 namespace store {
 
-/// What names of a store's own start with. No part of a server path does.
+/// Prefix of a store's internal names. No part of a server path starts with it.
 inline constexpr std::string_view ownPrefix = ".tintgate-";
 
-/// The parts of a server path that StoreEngine allows; not none. Throws StoreFailure (BadPath) for
-/// any other.
+/// The parts of a valid server path (see StoreEngine), at least one. Throws StoreFailure (BadPath)
+/// for an invalid path.
 std::vector<std::string> partsOfServerPath(std::string_view path);
 
-/// Parts from the first on, joined by slashes.
+/// The first `count` parts, joined by slashes.
 std::string joinedParts(const std::vector<std::string>& parts, std::size_t count);
 
-/// A server path as a message shows it: short, and without what would upset a terminal.
+/// A server path for messages: short, and without characters that control a terminal.
 std::string shownServerPath(std::string_view path);
 
 } // namespace store

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Where a store's tickets, users and files are kept: the one interface behind which a database is
-// known. What a table does to a ticket is said above it, by TicketContent.
+// Storage of a store's tickets, users and files. This is the only interface to the databases. The
+// effect of a table on a ticket is defined above it, in TicketContent.
 #pragma once
 
 #include <chrono>
@@ -22,22 +22,22 @@
 
 namespace store {
 
-/// Why a store did not do what it was asked.
+/// Why a store refused an operation.
 enum class Fault {
-    Missing,  ///< No store at this address, or none that this user may read.
-    Newer,    ///< A store of a format that this program does not know yet.
-    Older,    ///< A store of an earlier format: bringStoreUpToDate.
-    ReadOnly, ///< The store, or a place in it, can't be written.
-    Full,     ///< No room: disk, quota or limit.
-    Busy,     ///< Others held the store longer than longestWait.
-    Damaged,  ///< What is stored makes no sense.
-    BadPath,  ///< A server path that leads nowhere inside the store, or to something else than a
+    Missing,  ///< No store at this address, or none that this user can read.
+    Newer,    ///< The store has a newer, unknown format.
+    Older,    ///< The store has an older format; see bringStoreUpToDate.
+    ReadOnly, ///< The store, or part of it, is not writable.
+    Full,     ///< A disk, quota or limit is exhausted.
+    Busy,     ///< Others locked the store longer than longestWait.
+    Damaged,  ///< The stored data is invalid.
+    BadPath,  ///< A server path that is outside the store or not a
               ///< file.
     NoFile,   ///< No such file or version.
     Exists,   ///< There is one already.
-    Lost,     ///< The server does not answer (any more): see alive. Whether it still took what was
-              ///< under way is not known; it took all of it or nothing.
-    Other,    ///< The text tells.
+    Lost,     ///< The server does not answer: see alive. It is unknown whether it
+              ///< performed the current operation; it did so completely or not at all.
+    Other,    ///< See the text.
 };
 
 /// A failure of a store. Whatever was under way is undone, but see Lost. The text is one for
@@ -49,30 +49,30 @@ class StoreFailure : public std::runtime_error {
     const Fault fault;
 };
 
-/// How long a change waits for changes of others before it fails with Fault::Busy.
+/// How long a change waits for the changes of others before it fails with Fault::Busy.
 inline constexpr int longestWaitMilliseconds = 10'000;
 
-/// Names of users and passwords have at most this many bytes.
+/// Maximum length of users' names and passwords in bytes.
 inline constexpr std::size_t longestCredential = 127;
 
 struct User {
-    std::string name; ///< Bytes, as the session record carries them.
+    std::string name; ///< Bytes, as in the session record.
     std::string passwordHash;
     bool disabled = false;
 };
 
-/// Times are in seconds since 1970. Paths are server paths without a slash in front.
+/// Times are in seconds since 1970. Paths are server paths without a leading slash.
 struct FileEntry {
     std::string path;
     std::uint64_t size = 0;
     std::int64_t time = 0;
 };
 
-/// A file's content before it was replaced.
+/// A previous content of a replaced file.
 struct FileVersion {
-    int number = 0; ///< From 1, in the order of replacement. None is used twice for a path.
+    int number = 0; ///< From 1, in order of replacement; never reused for a path.
     std::uint64_t size = 0;
-    std::int64_t time = 0; ///< When this content had been written.
+    std::int64_t time = 0; ///< Time when this content was written.
 };
 
 /// Which older versions of a file are removed: the oldest ones, as far as both members allow it. A
@@ -113,29 +113,29 @@ struct Verified {
 
 /// What a change of a ticket is about to touch.
 struct Scope {
-    /// The ticket is emptied first; keys says nothing then.
+    /// The ticket is emptied first, and `keys` is ignored.
     bool everything = false;
-    /// The change may be made twice, as if it were made once: no appended elements, and none that
-    /// are deleted by their position.
+    /// Making the change twice has the same effect as once: no appended elements, and none deleted
+    /// by position.
     bool repeatable = false;
-    /// A ticket that is missing is made, in the same transaction.
+    /// If the ticket is missing, it is created in the same transaction.
     bool make = false;
-    /// By name, whether what the key holds is needed. Keys that are not listed stay as they are.
+    /// By key name: whether the old value is needed. Other keys are not changed.
     std::map<std::string, bool, std::less<>> keys = {};
 };
 
-/// An open store. All of it may throw StoreFailure, and std::bad_alloc. One thread at a time.
+/// An open store. All functions may throw StoreFailure and std::bad_alloc. Use one thread at a
+/// time.
 ///
-/// Types and ids are valid ones (TICKET_Valid). Keys and names are bytes and compared as bytes.
-/// Each operation is a transaction of its own and sees what others, in this process or another,
-/// have committed.
+/// Types and ids must be valid (TICKET_Valid). Keys and names are bytes and compared as bytes. Each
+/// operation is one transaction and sees what others, in this process or another, have committed.
 class StoreEngine {
   public:
     virtual ~StoreEngine() = default;
 
-    /// False once the connection to a server is lost for good. A connection that was lost is made
-    /// anew, here and by each operation; one that only reads, or that can be repeated, then starts
-    /// again. After 30 seconds without the server, all waits together, it is for good.
+    /// False if the connection to a server is permanently lost. A lost connection is restored here
+    /// and by each operation; a read-only or repeatable operation then restarts. After a total of
+    /// 30 seconds of waiting for the server, the loss is permanent.
     virtual bool alive() = 0;
 
     /// The same for all that are open on the same store, whatever address led to it, and different
@@ -150,42 +150,42 @@ class StoreEngine {
 
     // Tickets.
 
-    /// Of all tickets of a type, ascending.
+    /// All tickets of a type, ascending.
     virtual std::vector<int> ids(int type) = 0;
     virtual bool exists(int type, int id) = 0;
-    /// An empty ticket under this id. False when there is one already.
+    /// Creates an empty ticket with this id. False if there is one already.
     virtual bool create(int type, int id) = 0;
-    /// An empty ticket under the id after the highest that the type ever had or, when these are
-    /// used up, under the lowest free one. Its id, or -1.
+    /// Creates an empty ticket with the next id after the highest that the type ever had or, if
+    /// these are used up, with the lowest free id. Returns the id, or -1.
     virtual int createNext(int type) = 0;
     virtual bool remove(int type, int id) = 0;
     /// The same, but only if the ticket's keys are still the known ones.
     virtual bool removeUnchanged(int type, int id, const TicketContent& known) = 0;
 
-    /// One key; null when there is no such key or ticket. The same key again costs no more than to
-    /// see that it has not changed.
+    /// One key; null if there is no such key or ticket. Reading the same key again only checks that
+    /// it has not changed.
     virtual std::shared_ptr<const Elements> key(int type, int id, std::string_view name) = 0;
-    /// The keys that the filter takes, all of one moment; null when there is no such ticket.
+    /// The keys that the filter accepts, at one moment; null if there is no such ticket.
     virtual std::shared_ptr<const TicketContent> content(int type, int id,
                                                          const KeyFilter& filter) = 0;
 
-    /// Shown one key of one ticket: name is an index into the list of names. Elements are null for
-    /// a key that takes more room than was asked for.
+    /// Called with one key of one ticket; `name` is an index in the list of names. Elements are
+    /// null if the key is larger than requested.
     using ShowKey =
         std::function<void(int id, std::size_t name, std::shared_ptr<const Elements> elements)>;
-    /// Some keys of all tickets of a type, all of one moment, as far as each takes at most
-    /// largestBytes in the store; by ascending id. Equal elements may be one object.
+    /// Reads some keys of all tickets of a type, at one moment, by ascending id. Keys that take
+    /// more than largestBytes in the store are not read. Equal elements may share one object.
     virtual void keysOfAll(int type, const std::vector<std::string>& names,
                            std::size_t largestBytes, const ShowKey& show) = 0;
 
-    /// The overview of all jobs, of one moment.
+    /// The overview of all jobs, at one moment.
     virtual void overview(JobOverview& jobs) = 0;
 
-    /// One transaction, which locks the ticket first: fetches the keys that the scope needs, has
-    /// them changed by work, and writes what differs then. Work touches no key outside the scope.
-    /// False when there is no such ticket, which is not looked for before work is called unless
-    /// something is needed. What work throws undoes it. Work may be called again on the same ticket
-    /// if the scope is repeatable.
+    /// One transaction. It locks the ticket, fetches the keys that the scope needs, lets `work`
+    /// change them, and writes the differences. `work` must not touch keys outside the scope.
+    /// Returns false if there is no such ticket; unless something is needed, this is checked only
+    /// after `work` was called. An exception of `work` undoes the change. If the scope is
+    /// repeatable, `work` may be called again on the same ticket.
     virtual bool change(int type, int id, const Scope& scope,
                         const std::function<void(TicketContent&)>& work) = 0;
 
@@ -193,21 +193,21 @@ class StoreEngine {
 
     virtual std::vector<User> users() = 0; ///< By name.
     virtual std::optional<User> user(std::string_view name) = 0;
-    /// Adds the user, or takes the place of the one with this name.
+    /// Adds the user, or replaces the one with this name.
     virtual void putUser(const User& user) = 0;
-    /// False, and nothing is changed, when there is a user of this name.
+    /// False, without a change, if there is a user of this name.
     virtual bool addUser(const User& user) = 0;
     virtual bool removeUser(std::string_view name) = 0;
 
-    // Files. A server path may start with slashes; it means the file below the store's files in
-    // any case. Refused with Fault::BadPath: parts that are "..", that start with ".tintgate-" or
-    // have more than 255 bytes, NUL, a slash at the end, more than 2,048 bytes, no part at all; and
-    // any symbolic link on the way, wherever it leads.
+    // Files. A server path may start with slashes; it is always relative to the store's files.
+    // Refused with Fault::BadPath: parts that are "..", start with ".tintgate-" or have more than
+    // 255 bytes; NUL; a slash at the end; more than 2,048 bytes; no part at all; and any symbolic
+    // link on the way, wherever it leads.
 
-    /// Puts a file in place whole, from the stream's bytes up to its end: whoever looks sees all of
-    /// it, or what was there before. What it replaces is kept as a version. Folders are made.
+    /// Writes a whole file from the stream: readers see the old content or all of the new one. The
+    /// replaced content is kept as a version. Creates missing folders.
     virtual void putFile(std::string_view path, std::istream& from) = 0;
-    /// Copies a file, of one version throughout, to the stream.
+    /// Copies one version of a file to the stream.
     virtual void getFile(std::string_view path, std::ostream& to) = 0;
     virtual std::vector<FileEntry> files() = 0; ///< By path.
     /// Nothing if there is no such file.
@@ -215,7 +215,7 @@ class StoreEngine {
 
     virtual std::vector<FileVersion> versions(std::string_view path) = 0; ///< By number.
     virtual void getVersion(std::string_view path, int number, std::ostream& to) = 0;
-    /// Puts a version in place again; what it replaces is kept as a version in turn.
+    /// Restores a version. The replaced content is kept as a version too.
     virtual void restoreVersion(std::string_view path, int number) = 0;
     /// Removes versions of a file. The number removed.
     virtual int pruneVersions(std::string_view path, const Pruning& which) = 0;
@@ -225,7 +225,7 @@ class StoreEngine {
     /// changed, if not or if there is neither a file nor a version. If it is cut off, the file is
     /// still there, maybe without versions, and can be removed again.
     virtual bool removeFile(std::string_view path, std::optional<int> highestVersion = {}) = 0;
-    /// Removes what interrupted deliveries left behind. The number of files removed.
+    /// Removes leftovers of interrupted deliveries. Returns the number of files removed.
     virtual int removeLeftovers() = 0;
 
     // The log. It is best effort: a store that can't be written has none, and nothing fails for it.
@@ -256,42 +256,42 @@ class StoreEngine {
 
     // What a copy needs on top of these.
 
-    /// By type, the highest id that it ever had, if that is above 0.
+    /// By type, the highest id that it ever had, if above 0.
     virtual std::map<int, int> highestIds() = 0;
-    /// Makes createNext go on behind this id at the least.
+    /// Makes createNext continue after this id or a higher one.
     virtual void raiseHighestId(int type, int id) = 0;
-    /// Puts a content in place with its number and time, and keeps nothing of what it replaces.
-    /// Number 0 is the file itself, which goes first. The size is not looked at.
+    /// Stores a content with its number and time, without keeping what it replaces. Number 0 is the
+    /// current file, which must come first. The size is ignored.
     virtual void placeVersion(std::string_view path, const FileVersion& version,
                               std::istream& from) = 0;
-    /// The highest number that a version of this file ever had, also if it has been pruned, or 0.
+    /// The highest number that a version of this file ever had, even if pruned, or 0.
     virtual int highestVersion(std::string_view path) = 0;
-    /// The next version of this file, which is there, gets a higher number than this one.
+    /// The next version of this existing file gets a higher number than this.
     virtual void raiseHighestVersion(std::string_view path, int number) = 0;
-    /// Makes a store of what openCopy opened. Before it, nothing of it has to be on the disk.
+    /// Turns the result of openCopy into a store. Before this, nothing need be on the disk.
     virtual void finishCopy() = 0;
 };
 
-// A store's address, as bytes, is the path of a folder on a local disk where it starts with a
-// slash. Any other names a connection service of a PostgreSQL server (pg_service.conf), with a
+// A store's address consists of bytes. If it starts with a slash, it is the path of a folder on a
+// local disk. Otherwise it is a connection service of a PostgreSQL server (pg_service.conf), with a
 // store in the schema "tintgate" of its database.
 
-/// What a store is opened for.
+/// The purpose of opening a store.
 enum class Access {
-    ReadAndWrite, ///< Refused (ReadOnly, Full) if the store can't be written as it is.
-    Read,         ///< Also a store on a full disk or one that is mounted for reading. Writing is
-                  ///< tried all the same, and may fail.
+    ReadAndWrite, ///< Refused (ReadOnly, Full) if the store is not writable.
+    Read,         ///< Accepts a store on a full or read-only disk. Writing
+                  ///< is still tried, and may fail.
 };
 
 std::unique_ptr<StoreEngine> openStore(const std::string& address,
                                        Access access = Access::ReadAndWrite);
 
-/// Makes a new store, with the system ticket in it, where nothing is or an empty folder. A folder
-/// and what is in it are for owner and group alone, as the umask allows.
+/// Creates a new store with the system ticket, in a new or empty folder or in a database. A folder
+/// and its contents are accessible only for owner and group, as the umask allows.
 void makeStore(const std::string& address, const std::string& serverName);
 
-/// Makes a store without anything in it, as makeStore, or opens one of which a copy was begun and
-/// not finished. Until finishCopy nobody can open it otherwise, and nobody else to copy to it.
+/// Creates an empty store like makeStore, or opens an unfinished copy. Until finishCopy, nobody can
+/// open it in any other way, and nobody else can copy to it.
 std::unique_ptr<StoreEngine> openCopy(const std::string& address);
 
 /// What a role of a database server is given.

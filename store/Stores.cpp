@@ -55,7 +55,7 @@ std::shared_ptr<Elements> decoded(std::string_view bytes) {
 }
 
 std::vector<std::pair<std::string, std::string>> systemKeys(const std::string& serverName) {
-    constexpr int majorVersion = 5; // Below it, clients log out again.
+    constexpr int majorVersion = 5; // Clients log out from lower versions.
     const auto stored = [](Value value) {
         Elements elements;
         elements.put(0, std::move(value));

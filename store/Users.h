@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Who may log in to a store.
+// Logins to a store.
 #pragma once
 
 #include <chrono>
@@ -12,11 +12,11 @@ namespace store {
 
 enum class LoginAnswer { Welcome, WrongUserOrPassword, Disabled };
 
-/// Names and passwords are compared as the bytes that they arrive in.
+/// Names and passwords are compared as the bytes received.
 ///
-/// Whether or not there is such a user, the answer takes the time of one hash: Argon2id at
-/// libsodium's limits for interactive use, two passes over 64 MiB, which costs a login somewhat
-/// under 0.1 s of one core and that memory for as long.
+/// The answer takes the time of one hash, even if there is no such user: Argon2id at libsodium's
+/// limits for interactive use, two passes over 64 MiB. A login costs somewhat less than 0.1 s of
+/// one core, and that much memory meanwhile.
 LoginAnswer checkLogin(StoreEngine& store, std::string_view name, std::string_view password);
 
 /// How long a login that is refused is kept waiting, after so many refusals within refusalsCount,

@@ -15,18 +15,18 @@ namespace store {
 
 struct WriteFailure {
     std::int64_t time = 0; ///< Seconds since 1970.
-    std::string server;    ///< The address that the client gave.
+    std::string server;    ///< The address given by the client.
     std::string target;    ///< A ticket, such as job/7 or 27/1; "file" for an upload.
-    std::string key;       ///< Of the ticket; the server path of an upload; may be empty.
+    std::string key;       ///< Key of the ticket, or server path of an upload; may be empty.
     std::string reason;
 };
 
-/// The name of a ticket in such a line.
+/// The name of a ticket in a line of this file.
 std::string ticketNameOf(int type, int id);
 
 class WriteFailures {
   public:
-    /// Of a user, in a folder for temporary files. With an empty folder nothing is kept.
+    /// A user's file in a folder for temporary files. With an empty folder, nothing is recorded.
     explicit WriteFailures(const std::string& folder);
 
     const std::string& path() const { return m_file.path(); }
@@ -34,7 +34,7 @@ class WriteFailures {
     /// What fails here is passed over, and a file of another user or a link is left alone.
     void add(const WriteFailure& failure) const;
 
-    /// All that the file contains, with \xNN as it is. Lines that make no sense are left out.
+    /// All lines of the file, with \xNN unchanged. Invalid lines are left out.
     std::vector<WriteFailure> all() const;
 
   private:

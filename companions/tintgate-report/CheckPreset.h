@@ -1,17 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tolerance presets, checked for whoever writes one.
+// Checks tolerance presets for their authors.
 #pragma once
 
 #include <string>
 
 namespace report {
 
-/// One line about a sound preset: its file, number, name and number of criteria. Throws Failure
-/// (Missing or Broken) with the line, the element and the exit code that Tintgate gives for the
-/// fault.
+/// Summarises a valid preset in one line: file, number, name and number of criteria. Throws Failure
+/// (Missing or Broken) with the line, the element and Tintgate's exit code for the fault.
 std::string presetSummary(const std::string& path);
 
-/// Where the presets are that were installed with this program; empty if it is not installed.
+/// The folder of the presets installed with this program. Empty if it is not installed.
 std::string installedPresets();
 
 } // namespace report

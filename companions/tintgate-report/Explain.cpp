@@ -12,7 +12,7 @@
 namespace report {
 namespace {
 
-/// The text after its label, broken at blanks to lines that fit a terminal.
+/// The text after its label, wrapped at blanks to fit a terminal.
 std::string paragraph(const std::string& label, const std::string& text) {
     constexpr std::size_t indent = 8;
     constexpr std::size_t width = 79;
@@ -36,10 +36,10 @@ std::string paragraph(const std::string& label, const std::string& text) {
     return lines + '\n';
 }
 
-/// Most codes of a job have several causes. This program can't know the job.
+/// Most job codes have several causes, and this program does not know the job.
 constexpr char finder[] = "'tintgate-store diagnose JOB' names what is wrong with a job.";
 
-/// What a code means if a job on the print server ended with it.
+/// The meaning of a code if a job on the print server ended with it.
 std::string jobParagraph(const ExitCodeText& code) {
     std::string text;
     if (std::string_view(code.jobCause) != code.cause) {
@@ -49,7 +49,7 @@ std::string jobParagraph(const ExitCodeText& code) {
     return paragraph("Job", text);
 }
 
-/// The folder that remedies of presets speak of. Nothing if it is not known.
+/// The folder named in remedies about presets. Nothing if it is unknown.
 std::string presetsParagraph(int code) {
     const bool isAboutPresets =
         (code >= exitPresetMissing && code <= exitPresetUnknownEntry) || code == exitPresetFailed;

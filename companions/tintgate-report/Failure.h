@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// How this program ends.
+// Failures of this program.
 #pragma once
 
 #include <stdexcept>

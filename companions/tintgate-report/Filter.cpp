@@ -21,9 +21,9 @@ bool holds(const std::string& text, const std::string& part) {
                        [](char a, char b) { return lower(a) == lower(b); }) != text.end();
 }
 
-/// Dates of numbers alone, in which day and month may have changed places: 11/21/2026, 20.11.2026.
-/// Counts only if one of the two is above 12 or both are equal. A time that an exporter of charts
-/// writes behind it, as in "11/05/2026 # Time: 09:15", proves that the month is in front.
+/// Numeric dates with an unknown order of day and month: 11/21/2026, 20.11.2026. Accepted only if
+/// one of the two is above 12 or both are equal. A time as written by chart exporters, as in
+/// "11/05/2026 # Time: 09:15", shows that the month is first.
 std::optional<std::int64_t> timeOfNumbers(const std::string& text) {
     int first = 0;
     int second = 0;
@@ -63,13 +63,13 @@ std::optional<std::int64_t> timeOfNumbers(const std::string& text) {
 } // namespace
 
 std::optional<std::int64_t> timeOf(const std::string& text) {
-    // What follows the last field, such as a zone, is ignored.
+    // Text after the last field, such as a zone, is ignored.
     for (const char* form :
          {"%Y-%m-%dT%H:%M:%S", "%Y-%m-%d %H:%M:%S", "%Y-%m-%dT%H:%M", "%Y-%m-%d %H:%M", "%Y-%m-%d",
           "%Y/%m/%d %H:%M:%S", "%Y/%m/%d %H:%M", "%Y/%m/%d", "%a %b %d %H:%M:%S %Y",
           "%B %d, %Y %H:%M:%S", "%B %d, %Y %H:%M", "%B %d, %Y", "%d %B %Y"}) {
         std::tm parts{};
-        constexpr int earliestYear = 70; // 11/05/2026 would be a day of the year 11.
+        constexpr int earliestYear = 70; // %Y would read 11/05/2026 as year 11.
         if (strptime(text.c_str(), form, &parts) != nullptr && parts.tm_year >= earliestYear) {
             return timegm(&parts);
         }

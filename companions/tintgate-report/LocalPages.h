@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Pages that the viewer has made on this machine.
+// Pages created by the viewer on this machine.
 #pragma once
 
 #include <map>
@@ -11,12 +11,12 @@
 
 namespace report {
 
-/// The pages of jobs that lie on this machine.
+/// The pages of jobs on this machine.
 class LocalPages {
   public:
     LocalPages();
 
-    /// The page of the run that wrote the sample: the first one since then. Empty for none.
+    /// The page of the run that wrote the sample: the first one since then. Empty if there is none.
     std::string of(const Sample& sample) const;
 
   private:

@@ -29,7 +29,7 @@ std::string contentsOf(const std::string& path) {
     return bytes;
 }
 
-/// Empty where the link can't be read: another user's, or a process that has just ended.
+/// Empty if the link can't be read: another user's process, or one that has just ended.
 std::string linkOf(const fs::path& path) {
     std::error_code failure;
     return fs::read_symlink(path, failure).string();
@@ -64,14 +64,14 @@ class Search {
   private:
     static std::string nameOf(const std::string& folder, const std::string& arguments) {
         std::string path = linkOf(folder + "/exe");
-        path.resize(std::min(path.find(" (deleted)"), path.size())); // Since an upgrade.
+        path.resize(std::min(path.find(" (deleted)"), path.size())); // After an upgrade.
         if (path.empty()) {
             path = arguments.substr(0, arguments.find('\0'));
         }
         return path.substr(path.rfind('/') + 1);
     }
 
-    /// Every job's folder that the text names.
+    /// Takes every job's folder in the text.
     void takePaths(const std::string& text) {
         for (std::size_t at = 0; (at = text.find(m_start, at)) != text.npos;) {
             at += m_start.size();
@@ -87,7 +87,7 @@ class Search {
         }
     }
 
-    /// The tool has the job's number as its third argument, behind the last colon.
+    /// The tool's third argument is the job's number, after the last colon.
     void takeJob(const std::string& arguments) {
         std::istringstream words(arguments);
         std::string word;
@@ -102,7 +102,7 @@ class Search {
         }
     }
 
-    /// False only where the tool's environment names another temporary folder.
+    /// False only if the tool's environment names another temporary folder.
     bool mayWorkHere(const std::string& environment) const {
         for (const std::string name : {"TMPDIR=", "TMP=", "TEMP="}) {
             const std::size_t at = ('\0' + environment).find('\0' + name);

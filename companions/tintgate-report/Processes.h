@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Who uses the folders of jobs right now.
+// Finds the processes that use folders of jobs.
 #pragma once
 
 #include <map>
@@ -7,11 +7,10 @@
 
 namespace report {
 
-/// For each job's folder that a living process uses, by its name below `folder` such as "JobID_7":
-/// which process, in words. `folder` has no links in it.
+/// For each job's folder in use by a live process, a description of the process. The key is the
+/// folder's name below `folder`, such as "JobID_7". `folder` must not contain links.
 ///
-/// A folder renamed to ".tidy-JobID_7" counts as JobID_7, since processes see it under its new
-/// name.
+/// A folder renamed to ".tidy-JobID_7" counts as JobID_7, because processes see its new name.
 std::map<std::string, std::string> usedFolders(const std::string& folder);
 
 } // namespace report

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Presets and instruments of a store's jobs, from the server's files.
+// Looks up presets and instruments of a store's jobs in the server's files.
 #pragma once
 
 #include <map>
@@ -16,7 +16,7 @@ namespace report {
 
 struct Preset {
     std::string name;
-    std::optional<tolerancePresetParameterRecord> values; ///< Of the file; none without it.
+    std::optional<tolerancePresetParameterRecord> values; ///< From the file; none without it.
 
     bool psd() const { return values && values->fograPSDPreset > 0; }
 };
@@ -26,10 +26,10 @@ class ServerLookups {
   public:
     explicit ServerLookups(store::StoreEngine& store) : m_store(store) {}
 
-    /// The tool judges by the preset's file, so its ticket gives no more than the name.
+    /// The tool uses the preset's file, so only the name is taken from its ticket.
     const Preset& preset(int id, const std::string& installFolder);
 
-    /// Of the control strip that the job names; empty where it tells none.
+    /// The instrument of the control strip that the job names. Empty if unknown.
     std::string instrument(const store::TicketContent& job, Strip strip);
 
     const std::set<int>& presetsWithoutFile() const { return m_missing; }

@@ -78,12 +78,12 @@ report::InkColours aimsOf(const colour::Profile& profile) {
 std::vector<double> percents(const store::TicketContent& job, const std::string& key) {
     std::vector<double> values;
     for (const int value : integersOf(job.find(key))) {
-        values.push_back(std::floor(value / 2.55 + 0.5)); // The ticket has 0 to 255.
+        values.push_back(std::floor(value / 2.55 + 0.5)); // The ticket's values are 0 to 255.
     }
     return values;
 }
 
-/// References in the ticket itself.
+/// References stored in the ticket.
 Target targetInTicket(const store::TicketContent& job, Strip strip, int patches) {
     const auto count = static_cast<std::size_t>(patches);
     const auto columns = [&](const char* const(&names)[3]) {
@@ -115,7 +115,7 @@ Target targetInTicket(const store::TicketContent& job, Strip strip, int patches)
     return {storedReferences, colour::identityOf(set), aimsOf(set)};
 }
 
-/// A time of the room's own clock as seconds since 1970 in UTC.
+/// Converts the room's local time to seconds since 1970 in UTC.
 std::int64_t utcOf(std::int64_t roomTime) {
     const std::time_t seconds = roomTime;
     std::tm parts{};
@@ -212,7 +212,7 @@ std::vector<Targets::Content>& Targets::contentsOf(const std::string& path) {
 }
 
 Target Targets::read(const std::string& path, int version) {
-    // What can't be read is no other target than before: its path and version stand for it.
+    // An unreadable target keeps its identity: its path and version represent it.
     Target target{nameOf(path), path + (version != 0 ? " " + std::to_string(version) : ""), {}};
     std::ostringstream bytes;
     try {

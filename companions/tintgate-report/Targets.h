@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the jobs of a store were aimed at.
+// The target colours of a store's jobs.
 #pragma once
 
 #include <cstdint>
@@ -16,27 +16,27 @@
 namespace report {
 
 struct Target {
-    std::string name; ///< Of its file; that of stored references for these.
-    std::string key;  ///< Equal for the same colours (Sample::targetKey).
-    InkColours aims;  ///< Of paper and solids.
+    std::string name; ///< Name of the file, or of stored references.
+    std::string key;  ///< Equal for equal colours (Sample::targetKey).
+    InkColours aims;  ///< Aims of paper and solids.
 };
 
-/// Finds each job's references by the rules of docs/jobs.md. A file counts as it was when the job
-/// was measured: the store keeps what was replaced since. If it is gone, its path is the key.
+/// Finds each job's references by the rules of docs/jobs.md. A file's version at the time of the
+/// measurement is used: the store keeps old versions. If it is gone, its path is the key.
 class Targets {
   public:
     explicit Targets(store::StoreEngine& store) : m_store(store) {}
 
-    /// Names of the job's keys that `of` needs.
+    /// Keys of a job that `of` needs.
     static std::vector<std::string> keys(Strip strip);
 
-    /// `time` is the measurement's on the room's own clock, taken for that of this machine.
+    /// `time` is the measurement's local time in the room, treated as this machine's local time.
     Target of(const store::TicketContent& job, Strip strip, std::int64_t time);
 
   private:
     struct Content {
-        std::int64_t time = 0; ///< When it was written.
-        int version = 0;       ///< 0 is the file itself.
+        std::int64_t time = 0; ///< Time of writing.
+        int version = 0;       ///< 0 is the current file.
         std::optional<Target> target;
     };
 
@@ -45,7 +45,7 @@ class Targets {
     Target read(const std::string& path, int version);
 
     store::StoreEngine& m_store;
-    std::optional<std::map<std::string, std::int64_t>> m_times; ///< Of all files.
+    std::optional<std::map<std::string, std::int64_t>> m_times; ///< Times of all files.
     std::map<std::string, std::vector<Content>> m_contents;     ///< By time.
 };
 

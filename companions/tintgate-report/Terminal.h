@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Text for a terminal.
+// Formats text for a terminal.
 #pragma once
 
 #include <string>
@@ -10,8 +10,8 @@ namespace report {
 
 enum class Tone { Plain, Bold, Soft, Passed, Failed, Open };
 
-/// Gives texts their tone by escape sequences, or leaves them alone. Whatever comes from a file or
-/// ticket is shown with its control characters escaped, so that it can't act on the terminal.
+/// Adds escape sequences for tones, or none. Control characters in texts from files and tickets are
+/// escaped, so that they can't control the terminal.
 class Painter {
   public:
     explicit Painter(bool colours) : m_colours(colours) {}
@@ -22,8 +22,8 @@ class Painter {
     bool m_colours;
 };
 
-/// Whether standard output is a terminal that takes colours: not with NO_COLOR set to anything, nor
-/// with TERM "dumb" or unset.
+/// Whether standard output is a terminal with colours. False if NO_COLOR is set, and if TERM is
+/// "dumb" or unset.
 bool terminalTakesColours();
 
 struct Cell {
@@ -32,7 +32,7 @@ struct Cell {
     bool toTheRight = false; ///< For numbers.
 };
 
-/// Columns as wide as their widest cell, two blanks apart, two in front.
+/// Columns as wide as their widest cell, separated by two blanks and indented by two.
 std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter& paint);
 
 } // namespace report

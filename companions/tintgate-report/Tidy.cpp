@@ -29,7 +29,7 @@ bool isOurs(const struct stat& status) {
     return geteuid() == 0 || status.st_uid == geteuid();
 }
 
-/// "JobID_7" of "JobID_7" and of ".tidy-JobID_7"; empty of any other name.
+/// "JobID_7" for "JobID_7" and ".tidy-JobID_7". Empty for any other name.
 std::string jobName(std::string name) {
     constexpr std::string_view prefix = jobkeys::jobFolderPrefix;
     if (name.starts_with(hidden)) {
@@ -45,11 +45,11 @@ void fail(JobFolder& folder, const std::string& reason) {
     folder.reason = reason;
 }
 
-/// Adds what one entry says. False where it lies on another file system.
+/// Adds one entry's data. False if it is on another file system.
 bool addEntry(JobFolder& folder, const fs::path& path, dev_t device) {
     struct stat status {};
     if (lstat(path.c_str(), &status) != 0) {
-        if (errno != ENOENT) { // Gone meanwhile; its folder has changed then.
+        if (errno != ENOENT) { // If it was deleted, its folder has changed.
             fail(folder, std::strerror(errno));
         }
         return true;
@@ -61,13 +61,13 @@ bool addEntry(JobFolder& folder, const fs::path& path, dev_t device) {
     return status.st_dev == device;
 }
 
-/// Looks through a folder, without following links, and says of it whether it may go.
+/// Examines a folder without following links, and decides whether to remove it.
 JobFolder survey(const fs::path& path, const std::string& name, std::int64_t before) {
     JobFolder folder;
     folder.name = name;
     struct stat status {};
     if (lstat(path.c_str(), &status) != 0 || !S_ISDIR(status.st_mode)) {
-        fail(folder, "is no folder");
+        fail(folder, "is not a folder");
         return folder;
     }
     folder.fate = Fate::Removed;
@@ -90,7 +90,7 @@ JobFolder survey(const fs::path& path, const std::string& name, std::int64_t bef
     return folder;
 }
 
-/// The working folder without links on its way. Throws unless it is a folder of ours.
+/// The working folder with links resolved. Throws unless it is a folder of this user.
 fs::path checkedFolder(const std::string& path) {
     struct stat status {};
     if (lstat(path.c_str(), &status) != 0) {
@@ -100,7 +100,7 @@ fs::path checkedFolder(const std::string& path) {
         throw Failure(Status::NotTidied, path + " can't be looked at: " + std::strerror(errno));
     }
     if (!S_ISDIR(status.st_mode)) {
-        throw Failure(Status::NotTidied, path + " is no folder, or a link to one");
+        throw Failure(Status::NotTidied, path + " is not a folder, or is a link");
     }
     if (!isOurs(status)) {
         throw Failure(Status::NotTidied, path + " belongs to another user");
@@ -108,7 +108,7 @@ fs::path checkedFolder(const std::string& path) {
     return fs::canonical(path);
 }
 
-/// Job folders that stand in the way of nobody, each under its present name.
+/// Job folders that nobody uses, by their current names.
 class Candidates {
   public:
     Candidates(fs::path folder, std::int64_t before)
@@ -132,8 +132,7 @@ class Candidates {
         keepUsed();
     }
 
-    /// Takes the folders out of sight; whatever begins to work with a job from here on makes a
-    /// folder of its own.
+    /// Renames the folders. Whatever starts to work on a job after this creates a new folder.
     void hide() {
         std::map<std::string, JobFolder> now;
         for (auto& [name, folder] : m_folders) {
@@ -147,7 +146,7 @@ class Candidates {
         m_folders = std::move(now);
     }
 
-    /// Gives back what has been taken into use between the first look and the hiding.
+    /// Restores folders that came into use between the first check and the renaming.
     void giveBack() {
         const auto used = usedFolders(m_folder);
         for (auto& [name, folder] : m_folders) {
@@ -155,7 +154,7 @@ class Candidates {
             if (folder.fate != Fate::Removed || user == used.end()) {
                 continue;
             }
-            // A name that is taken again is that of a newer folder, and nobody needs this one.
+            // If the name is in use again, it is a newer folder, and this one is not needed.
             if (rename(name, folder.name) || errno != EEXIST) {
                 folder.fate = Fate::InUse;
                 folder.reason = user->second;
@@ -199,7 +198,7 @@ class Candidates {
         }
     }
 
-    /// False with errno set, which is EEXIST where the new name is taken.
+    /// False with errno set; EEXIST if the new name is in use.
     bool rename(const std::string& from, const std::string& to) const {
         return renameat2(AT_FDCWD, (m_folder / from).c_str(), AT_FDCWD, (m_folder / to).c_str(),
                          RENAME_NOREPLACE) == 0;
@@ -207,7 +206,7 @@ class Candidates {
 
     const fs::path m_folder;
     const std::int64_t m_before;
-    std::map<std::string, JobFolder> m_folders; ///< By present name.
+    std::map<std::string, JobFolder> m_folders; ///< By current name.
 };
 
 std::string sizeText(std::uint64_t bytes) {

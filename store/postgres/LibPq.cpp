@@ -9,7 +9,7 @@ namespace store::postgres {
 namespace {
 
 LibPq load() {
-    // Never closed: it leaves handlers of its own in libraries below it.
+    // Never closed, because it leaves handlers in libraries that it uses.
     const base::SharedObject library("libpq.so.5");
     LibPq functions;
     const auto find = [&](auto& function, const char* name) {

@@ -1,7 +1,7 @@
 // SPDX-License-Identifier: Apache-2.0
-// PostgreSQL's client library, loaded when a store on a server is opened: with all that it brings,
-// it takes three times as long to load as the rest of the plug-in, and who works with a folder has
-// no use for it.
+// PostgreSQL's client library, loaded when a store on a server is opened: with its dependencies it
+// takes three times as long to load as the rest of the plug-in, and stores in folders don't need
+// it.
 #pragma once
 
 #include <libpq-fe.h>
@@ -18,14 +18,14 @@ namespace store::postgres {
     X(setnonblocking) X(socket) X(status) X(transactionStatus)
 // clang-format on
 
-/// The functions that are used of it, without their PQ in front.
+/// The libpq functions in use, without the PQ prefix.
 struct LibPq {
 #define TINTGATE_LIBPQ_MEMBER(name) decltype(&::PQ##name) name = nullptr;
     TINTGATE_LIBPQ_FUNCTIONS(TINTGATE_LIBPQ_MEMBER)
 #undef TINTGATE_LIBPQ_MEMBER
 };
 
-/// Throws StoreFailure (Missing) where the library is not installed.
+/// Throws StoreFailure (Missing) if the library is not installed.
 const LibPq& libPq();
 
 } // namespace store::postgres

@@ -19,13 +19,13 @@ namespace {
 
 using Clock = std::chrono::steady_clock;
 
-constexpr int oldestServer = 130'000; // The first with pg_current_snapshot.
+constexpr int oldestServer = 130'000; // The first version with pg_current_snapshot.
 
 constexpr Statement begin = {"BEGIN ISOLATION LEVEL READ COMMITTED"};
 constexpr Statement commit = {"COMMIT"};
 
-/// Faults by the start of the server's five-letter codes; the first that fits counts. Appendix A of
-/// PostgreSQL's manual lists them.
+/// Faults by the start of the server's five-character codes; the first match counts. Appendix A of
+/// PostgreSQL's manual lists the codes.
 struct FaultRow {
     std::string_view state;
     Fault fault;
@@ -34,15 +34,15 @@ constexpr FaultRow faults[] = {
     {"08", Fault::Lost},                                    // connection exceptions
     {"25006", Fault::ReadOnly}, {"25P03", Fault::Lost},     // idle in a transaction for too long
     {"40", Fault::Busy},                                    // deadlocks
-    {"23505", Fault::Exists},                               // made by two at once
+    {"23505", Fault::Exists},                               // created by two sessions at once
     {"42P06", Fault::Exists},   {"42501", Fault::ReadOnly}, // insufficient privilege
-    {"42", Fault::Damaged},                                 // a table or column that is not there
-    {"3F", Fault::Damaged},                                 // nor a schema
+    {"42", Fault::Damaged},                                 // a missing table or column
+    {"3F", Fault::Damaged},                                 // a missing schema
     {"53", Fault::Full},                                    // disk, memory, connections
-    {"54", Fault::Full},    // what the server can't hold in one piece
-    {"55P03", Fault::Busy}, // waited too long for a lock
-    {"57014", Fault::Busy}, // a statement that took too long
-    {"57", Fault::Lost},    // shut down, or not up yet
+    {"54", Fault::Full},                                    // too large for the server
+    {"55P03", Fault::Busy},                                 // waited too long for a lock
+    {"57014", Fault::Busy},                                 // a statement that took too long
+    {"57", Fault::Lost},                                    // shut down, or not up yet
     {"XX001", Fault::Damaged},  {"XX002", Fault::Damaged},
 };
 
@@ -55,7 +55,7 @@ Fault faultOf(std::string_view state) {
     return Fault::Other;
 }
 
-/// A message of the library as one line.
+/// A message of the library on one line.
 std::string oneLine(std::string text) {
     while (!text.empty() && text.back() == '\n') {
         text.pop_back();
@@ -70,15 +70,15 @@ void appendBigEndian(std::string& bytes, std::uint64_t number, int size) {
     }
 }
 
-/// A number that the service says; 0 where it says none that limits anything.
+/// A number from the service; 0 if there is none, or none that is a limit.
 template<class Settings>
 int said(const Settings& settings, const char* name) {
     const auto found = settings.find(name);
     return found == settings.end() ? 0 : std::max(std::atoi(found->second.c_str()), 0);
 }
 
-/// Where the library looks for passwords, or a name without a file: of a file that it dislikes it
-/// would complain on standard error, which is not ours to write to.
+/// The library's password file, or a name without a file: the library would complain about an
+/// unsuitable file on standard error, which is not ours to write to.
 template<class Settings>
 std::string passwordFile(const Settings& settings) {
     std::string path;
@@ -98,7 +98,7 @@ std::string passwordFile(const Settings& settings) {
 } // namespace
 
 std::int64_t numberOf(std::string_view bytes) {
-    // The first byte bears the sign, except in a boolean, which is 0 or 1 anyway.
+    // The first byte has the sign, except for a boolean, which is 0 or 1 anyway.
     std::int64_t number = bytes.empty() ? 0 : static_cast<signed char>(bytes[0]);
     for (std::size_t i = 1; i < bytes.size(); ++i) {
         number = number * 256 + static_cast<unsigned char>(bytes[i]);
@@ -114,8 +114,8 @@ int Result::changed() const {
     return std::atoi(m_pq->cmdTuples(m_result.get()));
 }
 
-// Number of dimensions, whether there are nulls, type; of the dimension its length and first index;
-// then each element's length and bytes.
+// Number of dimensions, whether there are nulls, type; length and first index of the dimension;
+// then the length and bytes of each element.
 ArrayReader::ArrayReader(std::string_view value) : m_value(value) {
     constexpr std::size_t header = 20;
     if (value.size() >= header) {
@@ -209,9 +209,9 @@ std::vector<int> Arguments::lengths() const {
     return lengths;
 }
 
-/// What the service and the user's environment say. The service is read by the library alone, when
-/// it connects. A host too many for its address ends that before anybody is asked for anything: no
-/// server, and no file with passwords.
+/// The settings of the service and of the user's environment. Only the library reads the service,
+/// during a connection. Two hosts for one address make that connection fail before the library
+/// contacts a server or reads a password file.
 Connection::Settings Connection::settingsOf(const LibPq& pq, const std::string& service) {
     const char* const names[] = {"service", "host", "hostaddr", nullptr};
     const char* const values[] = {service.c_str(), "/dev/null,/dev/null", "127.0.0.1", nullptr};
@@ -234,7 +234,7 @@ PGconn* Connection::connect(const LibPq& pq, const std::string& service, const S
     const std::string passwords = passwordFile(said);
     std::vector<const char*> names = {"service", "fallback_application_name", "passfile"};
     std::vector<const char*> values = {service.c_str(), "tintgate", passwords.c_str()};
-    // The value must live until the connection has been made.
+    // The value must live until the connection is established.
     const auto unlessSaid = [&](const char* name, const char* value) {
         if (postgres::said(said, name) == 0) {
             names.push_back(name);
@@ -243,7 +243,7 @@ PGconn* Connection::connect(const LibPq& pq, const std::string& service, const S
     };
     unlessSaid("connect_timeout", connectLimit.c_str());
     unlessSaid("tcp_user_timeout", wayLimit.c_str());
-    // So that no firewall forgets a connection that waits for a measurement.
+    // Prevents firewalls from dropping a connection that waits for a measurement.
     unlessSaid("keepalives_idle", "60");
     unlessSaid("keepalives_interval", "10");
     unlessSaid("keepalives_count", "3");
@@ -278,29 +278,29 @@ void Connection::settle(const Settings& said) {
     m_pq->enterPipelineMode(m_connection.get());
     static constexpr Statement limit = {"SELECT setting::bigint, pg_backend_pid() FROM pg_settings"
                                         " WHERE name = 'statement_timeout'"};
-    send(limit); // The settings go in front of it.
+    send(limit); // The settings are sent before it.
     const auto results = finish();
     const int way = postgres::said(said, "tcp_user_timeout");
     m_longestSilence = std::chrono::milliseconds(results[0].number(0, 0)) +
                        (way > 0 ? std::chrono::milliseconds(way) : longestWay);
-    // A pooler has a number of its own.
+    // A pooler has a different process id.
     m_pooled = results[0].number(0, 1) != m_pq->backendPID(m_connection.get());
 }
 
-/// Of the transaction alone if the session may be another one's next.
+/// Only for the transaction if the session may be used by others next.
 void Connection::sendSettings() {
     static const std::string settings =
         "SELECT set_config(name, value, pg_backend_pid() <> $1) FROM (VALUES ('lock_timeout', '" +
         std::to_string(longestWaitMilliseconds) +
         "', true),"
-        " ('jit', 'off', true)," // It takes longer than what it would make faster.
+        " ('jit', 'off', true)," // Compilation takes longer than it saves.
         " ('idle_session_timeout', '0', true),"
         " ('statement_timeout', '" +
         std::to_string(longestStatement.count()) +
         "s', false), ('idle_in_transaction_session_timeout', '" +
         std::to_string(longestPause.count()) +
         "s', false)) AS setting (name, value, always)"
-        // Some servers do not know all of them.
+        // Some servers lack some of them.
         " WHERE current_setting(name, true) = '0' OR"
         " (always AND current_setting(name, true) IS NOT NULL)";
     sendNow(settings.c_str(), "", Arguments(m_pq->backendPID(m_connection.get())));
@@ -316,7 +316,7 @@ bool Connection::isThere() {
     }
 }
 
-/// Notices a server that has closed the connection since the last call: nothing has been sent then.
+/// Detects that the server closed the connection since the last call. Nothing is sent at this time.
 void Connection::dropIfClosed() {
     if (lost()) {
         return;
@@ -450,7 +450,7 @@ void Connection::sendArguments(const Statement& statement, const Arguments& argu
     m_sent.push_back({nullptr, false});
 }
 
-/// Until there is something to read.
+/// Waits until there is something to read.
 void Connection::waitForServer() {
     const auto end = Clock::now() + m_longestSilence;
     for (;;) {
@@ -471,7 +471,7 @@ void Connection::waitForServer() {
             break;
         }
         if (ready > 0) {
-            return; // It took something: a sign of life.
+            return; // The server accepted data: a sign of life.
         }
         if (errno != EINTR) {
             lose("it can't be waited for");
@@ -514,9 +514,9 @@ std::vector<Result> Connection::finish() {
         if (m_pq->status(m_connection.get()) != CONNECTION_OK) {
             fail(failed ? failed->get() : nullptr);
         }
-        m_pq->clear(nextResult()); // The null behind each.
+        m_pq->clear(nextResult()); // The null after each result.
     }
-    m_pq->clear(nextResult()); // That of the synchronisation.
+    m_pq->clear(nextResult()); // The result of the synchronisation.
     if (failed) {
         fail(failed->get());
     }
@@ -556,14 +556,14 @@ void Connection::rollBack() noexcept {
         if (!m_sent.empty()) {
             try {
                 finish();
-            } catch (const StoreFailure&) { // It is undone all the same.
+            } catch (const StoreFailure&) { // The transaction is undone anyway.
             }
         }
         if (!lost() && m_pq->transactionStatus(m_connection.get()) != PQTRANS_IDLE) {
             run(rollback);
         }
     } catch (...) {
-        m_connection.reset(); // Which undoes it, too.
+        m_connection.reset(); // This undoes the transaction too.
     }
 }
 

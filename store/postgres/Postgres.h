@@ -1,11 +1,11 @@
 // SPDX-License-Identifier: Apache-2.0
 // A connection to a PostgreSQL server, its statements, and failures as StoreFailure.
 //
-// Statements are sent several at a time where one does not need what another gives, so that they
-// cost one round trip (libpq's pipeline mode). Arguments and results are in binary form.
+// Statements that don't need each other's results are sent together, so that they cost one round
+// trip (libpq's pipeline mode). Arguments and results are in binary form.
 //
-// Each call ends: see the limits below. A connection that was lost is made anew, for as long as a
-// session may be without its server; then it stays lost, and whatever is asked of it fails at once.
+// Each call has a time limit: see below. A lost connection is restored as long as a session may be
+// without its server. After that it stays lost, and every call fails at once.
 #pragma once
 
 #include <chrono>
@@ -25,31 +25,31 @@
 
 namespace store::postgres {
 
-// Limits, each where neither the connection service nor the server's settings say another one. The
-// name in brackets is the one that they have for it.
+// Limits. Each applies unless the connection service or the server's settings specify another one,
+// under the name in parentheses.
 
-/// To reach one host (connect_timeout).
+/// Time to reach one host (connect_timeout).
 inline constexpr std::chrono::seconds longestConnect{10};
-/// What a statement may take the server (statement_timeout).
+/// The server's time for one statement (statement_timeout).
 inline constexpr std::chrono::seconds longestStatement{20};
-/// For the way there and back (tcp_user_timeout). When a statement's time and this have gone by
-/// without a sign of life from the server, the connection is given up, whatever kind it is of.
+/// Network time (tcp_user_timeout). If a statement's time plus this passes without a sign of life
+/// from the server, the connection is given up, whatever its kind.
 inline constexpr std::chrono::seconds longestWay{10};
-/// For how long a client that has vanished in the middle of a change can keep others from changing
-/// the same ticket (idle_in_transaction_session_timeout).
+/// How long a client that vanishes during a change can prevent others from changing the same ticket
+/// (idle_in_transaction_session_timeout).
 inline constexpr std::chrono::seconds longestPause{60};
 
-/// For how long a session may be without its server, all waits of its calls together. Then it is
-/// lost for good.
+/// How long a session may be without its server, adding up all waits of its calls. After that it is
+/// permanently lost.
 inline constexpr std::chrono::milliseconds longestAbsence{30'000};
 
-/// A text with $1 and so on, which lives as long as the program. It is prepared when it is first
-/// sent, so that the server parses it once for a connection.
+/// A text with $1 and so on, which must live as long as the program. It is prepared when it is
+/// first sent, so the server parses it once per connection.
 struct Statement {
     const char* text;
 };
 
-/// What a statement gave. Good as long as it lives.
+/// The result of a statement. Its data is valid as long as it lives.
 class Result {
   public:
     Result(const LibPq& pq, PGresult* result) : m_pq(&pq), m_result(result, pq.clear) {}
@@ -63,9 +63,9 @@ class Result {
                 static_cast<std::size_t>(m_pq->getlength(m_result.get(), row, column))};
     }
     std::string text(int row, int column) const { return std::string(bytes(row, column)); }
-    /// Of an int, a bigint or a boolean; 0 for null.
+    /// The value of an int, a bigint or a boolean; 0 for null.
     std::int64_t number(int row, int column) const;
-    /// How many rows the statement changed.
+    /// The number of rows that the statement changed.
     int changed() const;
 
     PGresult* get() const { return m_result.get(); }
@@ -75,13 +75,13 @@ class Result {
     std::unique_ptr<PGresult, void (*)(PGresult*)> m_result;
 };
 
-/// Throws StoreFailure (Damaged): nothing of what comes from the server is trusted.
+/// Throws StoreFailure (Damaged): data from the server is not trusted.
 [[noreturn]] void failDamaged();
 
-/// Elements of an array without holes, one after the other. The array outlives it.
+/// Reads the elements of an array without holes in order. The array must outlive the reader.
 class ArrayReader {
   public:
-    /// A null value has no elements.
+    /// A null value counts as an array without elements.
     explicit ArrayReader(std::string_view value);
 
     std::size_t left() const { return m_left; }
@@ -93,11 +93,11 @@ class ArrayReader {
     std::size_t m_left = 0;
 };
 
-/// Big-endian, as the server has it.
+/// Big-endian, as in the server's format.
 std::int64_t numberOf(std::string_view bytes);
 
 /// The arguments of a statement: int for an int, std::int64_t for a bigint, bool for a boolean,
-/// bytes for a bytea, and lists of bytes for a bytea[]. Bytes stay the caller's; they must be good
+/// bytes for a bytea, and lists of bytes for a bytea[]. Bytes are not copied and must be valid
 /// until the statement is sent.
 class Arguments {
   public:
@@ -120,70 +120,70 @@ class Arguments {
   private:
     void addOwn(std::string bytes);
 
-    std::deque<std::string> m_own; ///< Keeps addresses.
+    std::deque<std::string> m_own; ///< A deque, because addresses must not change.
     std::vector<std::string_view> m_views;
 };
 
 class Connection {
   public:
-    /// Connects by a libpq connection service. Throws StoreFailure: Missing for one that is not
-    /// known, can't be reached or refuses this user. Absence is how long it may be without its
-    /// server; check is called with each later connection before it is used, and may throw.
+    /// Connects by a libpq connection service. Throws StoreFailure (Missing) if the service is
+    /// unknown, can't be reached or refuses this user. `absence` is how long it may be without its
+    /// server. `check` is called with each later connection before it is used, and may throw.
     explicit Connection(const std::string& service,
                         std::chrono::milliseconds absence = longestAbsence,
                         std::function<void(Connection&)> check = {});
     Connection(Connection&&) = default;
 
     bool lost() const { return m_connection == nullptr; }
-    /// Whether the server is there, as far as can be told without asking it; a connection that was
-    /// lost is made anew. False once the session is lost for good.
+    /// Whether the server is there, as far as known without asking it. Restores a lost connection.
+    /// False if the session is permanently lost.
     bool isThere();
-    /// Counts the times that it was made anew. What was fetched before may be another server's.
+    /// Counts reconnections. Data fetched before may come from another server.
     unsigned generation() const { return m_generation; }
-    /// Whether a pooler is between this and the server, which may hand each transaction to another
-    /// of its sessions. Then nothing is prepared, and settings go with each transaction.
+    /// Whether there is a pooler in between, which may assign each transaction to another session
+    /// of the server. Then nothing is prepared, and settings are sent with each transaction.
     bool pooled() const { return m_pooled; }
-    /// From now on a loss is for good.
+    /// From now on, a loss is permanent.
     void stayWithThisServer() { m_absenceLeft = {}; }
 
-    /// Runs work, which may be done again, on a connection that is there: when the connection is
-    /// lost on the way, it is made anew and work starts from its beginning.
+    /// Runs `work`, which must be repeatable. If the connection is lost meanwhile, it is restored
+    /// and `work` starts again.
     template<class Work>
     auto repeating(Work work) {
         return attending(true, work);
     }
-    /// The same for work that must not be done twice: once it has begun, a loss is a failure.
+    /// Same for work that must not be repeated: once it has started, a loss is a failure.
     template<class Work>
     auto once(Work work) {
         return attending(false, work);
     }
 
-    /// One statement, in the transaction that is open or in one of its own.
+    /// Runs one statement in the open transaction, or in its own.
     template<class... Each>
     Result run(const Statement& statement, const Each&... each) {
         send(statement, each...);
         return std::move(finish().back());
     }
 
-    /// Sends a statement whose result the next finish fetches. Statements without a transaction
-    /// around them, up to finish, are one.
+    /// Sends a statement whose result the next finish returns. Without a transaction, all
+    /// statements up to finish form one.
     template<class... Each>
     void send(const Statement& statement, const Each&... each) {
         sendArguments(statement, Arguments(each...));
     }
-    /// The results of all statements sent, in their order. Throws for the first that failed; those
-    /// behind it were not carried out.
+    /// The results of all statements sent, in order. Throws for the first failed one; those after
+    /// it were not executed.
     std::vector<Result> finish();
 
-    /// Several statements in one text, without arguments and results, on their own or in the
-    /// transaction that is open. They may take as long as the server lets them.
+    /// Runs several statements in one text, without arguments and results, in the open transaction
+    /// or on their own. They may take as long as the server permits.
     void script(const std::string& statements);
 
-    /// For a destructor: undoes what is open, and gives up the connection where that fails.
+    /// For destructors: undoes the open transaction. If that fails, gives up the connection.
     void rollBack() noexcept;
 
   private:
-    /// One call from outside, in which the time without the server is taken.
+    /// One call from outside, during which the time without the server is counted.
     class Call {
       public:
         explicit Call(Connection& connection) : m_connection(connection) {
@@ -194,7 +194,7 @@ class Connection {
         Call& operator=(const Call&) = delete;
 
         void noteLoss();
-        /// Makes sure that the connection is there. Throws StoreFailure (Lost).
+        /// Ensures that the connection is there. Throws StoreFailure (Lost).
         void attend();
 
       private:
@@ -205,7 +205,7 @@ class Connection {
     template<class Work>
     auto attending(bool repeats, Work work) {
         if (m_inCall) {
-            return work(); // Within a transaction, say, which ends with the connection.
+            return work(); // For example within a transaction, which ends with the connection.
         }
         Call call(*this);
         for (;;) {
@@ -249,12 +249,12 @@ class Connection {
     std::function<void(Connection&)> m_check;
     Handle m_connection;
     unsigned m_generation = 0;
-    bool m_pooled = true; ///< Until it is known.
+    bool m_pooled = true; ///< Until known otherwise.
     bool m_inCall = false;
     std::chrono::milliseconds m_longestSilence = longestStatement + longestWay;
     std::set<const char*> m_prepared;
-    /// Of what was sent since the last finish: whether it is something whose result nobody wants,
-    /// and the text that it prepares, if it does.
+    /// For what was sent since the last finish: whether its result is not wanted, and the text that
+    /// it prepares, if any.
     struct Sent {
         const char* prepares;
         bool isAside;
@@ -262,8 +262,8 @@ class Connection {
     std::vector<Sent> m_sent;
 };
 
-/// A transaction that sees what others have committed up to each of its statements. Rolled back
-/// unless committed. Its start goes with the first statements that are sent in it.
+/// A transaction in which each statement sees what others have committed before it. Rolled back
+/// unless committed. Its start is sent together with the first statements.
 class Transaction {
   public:
     explicit Transaction(Connection& connection);
@@ -271,14 +271,14 @@ class Transaction {
     Transaction(const Transaction&) = delete;
     Transaction& operator=(const Transaction&) = delete;
 
-    /// The results of what was sent, but for those of the transaction itself.
+    /// The results of what was sent, without those of the transaction itself.
     std::vector<Result> finish();
-    /// The same, and the transaction is committed behind it.
+    /// Same, and then commits the transaction.
     std::vector<Result> commit();
 
   private:
     Connection& m_connection;
-    bool m_begun = false; ///< Its start has been answered.
+    bool m_begun = false; ///< The server has confirmed the start.
     bool m_open = true;
 };
 

@@ -1,9 +1,9 @@
 // SPDX-License-Identifier: Apache-2.0
 // A store in the database of a PostgreSQL server; PostgresSchema.cpp has its tables.
 //
-// What is stored of a key is its bytes as KeyBytes.h tells. A change is one transaction: it locks
-// the ticket's row, fetches what it needs, writes, and commits. Where it needs nothing of what the
-// keys held, that is one round trip, else two.
+// A key is stored as the bytes described in KeyBytes.h. A change is one transaction: it locks the
+// ticket's row, fetches what it needs, writes, and commits. That is one round trip if no old value
+// is needed, otherwise two.
 #include <algorithm>
 #include <ctime>
 #include <map>
@@ -34,8 +34,8 @@ constexpr Statement idsOf = {
 constexpr Statement isThere = {
     "SELECT EXISTS (SELECT FROM tintgate.tickets WHERE type = $1 AND id = $2)"};
 
-// The row of the highest id is locked before a ticket is made. Whoever makes one takes them in this
-// order, so that nobody waits in a circle.
+// Locks the row of the highest id before creating a ticket. All creations use this order of locks,
+// so there are no deadlocks.
 constexpr Statement createTicket = {
     "WITH raised AS (INSERT INTO tintgate.highest_ids AS highest (type, id) VALUES ($1, $2)"
     " ON CONFLICT (type) DO UPDATE SET id = greatest(highest.id, excluded.id) RETURNING type)"
@@ -47,8 +47,8 @@ constexpr Statement raiseHighest = {
 constexpr Statement allHighest = {"SELECT type, id FROM tintgate.highest_ids WHERE id > 0"};
 constexpr Statement removeTicket = {"DELETE FROM tintgate.tickets WHERE type = $1 AND id = $2"};
 
-// The overview of jobs: see JobOverview.h. A ticket's row is locked before its block is, and a
-// transaction touches one ticket only, so that nobody waits in a circle.
+// The overview of jobs: see JobOverview.h. A ticket's row is locked before its block, and a
+// transaction touches only one ticket, so there are no deadlocks.
 constexpr Statement allBlocks = {"SELECT number, content FROM tintgate.job_blocks"};
 constexpr Statement addEntry = {
     "INSERT INTO tintgate.job_blocks AS block (number, content) SELECT $3, $4"
@@ -65,8 +65,7 @@ constexpr Statement removeJob = {
     " SET content = overlay(content PLACING $4 FROM $5) FROM gone WHERE job_blocks.number = $3)"
     " SELECT count(*) FROM gone"};
 
-// The value only if it is another one than the caller has: one that this change of that ticket
-// wrote.
+// Omits a value that the caller has: one with the same ticket number and change.
 constexpr Statement oneKey = {
     "SELECT number, change, CASE WHEN (number, change) <> ($4::bigint, $5::bigint) THEN value END"
     " FROM tintgate.tickets JOIN tintgate.keys ON ticket = number"
@@ -78,15 +77,14 @@ constexpr Statement exactKeys = {
     "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
     " hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact))"
     " WHERE type = $1 AND id = $2"};
-// Names have no index, as they may be of any length, so that a prefix costs a walk of the ticket.
+// Names have no index, because they may have any length. So a prefix requires a walk of the ticket.
 constexpr Statement someKeys = {
     "SELECT name, value FROM tintgate.tickets LEFT JOIN tintgate.keys ON ticket = number AND"
     " (hash = ANY (ARRAY (SELECT sha256(exact) FROM unnest($3::bytea[]) AS exact)) OR"
     " EXISTS (SELECT FROM unnest($4::bytea[]) AS prefix"
     " WHERE substring(name FOR length(prefix)) = prefix))"
     " WHERE type = $1 AND id = $2"};
-/// Which transactions have come to their end. While this is the same, nobody has committed
-/// anything.
+/// The transactions that have ended. As long as this is the same, nobody has committed anything.
 constexpr Statement snapshot = {"SELECT pg_current_snapshot()::text"};
 
 constexpr Statement placeOf = {
@@ -101,8 +99,8 @@ constexpr Statement neededKeys = {
     " WHERE type = $1 AND id = $2"
     " AND hash = ANY (ARRAY (SELECT sha256(name) FROM unnest($3::bytea[]) AS name))"};
 
-// What follows is sent before it is known whether there was a ticket to lock. It touches one only
-// if this very transaction has, so that it leaves alone one that somebody makes in between.
+// These are sent before it is known whether there was a ticket to lock. They affect a ticket only
+// if this transaction has touched it, so they ignore one that is created in between.
 constexpr Statement putOneKey = {
     "INSERT INTO tintgate.keys (ticket, name, value, change) SELECT number, $3, $4, changes"
     " FROM tintgate.tickets WHERE type = $1 AND id = $2"
@@ -143,7 +141,7 @@ constexpr std::size_t longestName = 200; ///< As the log's table has it.
 
 /// Held by the one who copies to the store. "TGAT" as a number.
 constexpr Statement lockCopy = {"SELECT pg_try_advisory_lock(1413955924)"};
-/// Until it is a store, nothing in it needs to be on the disk.
+/// Before it is a store, nothing in it needs to be on the disk.
 constexpr Statement writeLater = {"SELECT set_config('synchronous_commit', 'off', false)"};
 constexpr Statement writeThrough = {"SELECT set_config('synchronous_commit', 'on', false)"};
 
@@ -196,11 +194,11 @@ class PostgresEngine : public StoreEngine {
     std::vector<int> ids(int type) override {
         return m_connection.repeating([&] {
             forgetFormerServer();
-            // Clients ask for their number, and then for the ids.
+            // Clients ask for their number and then for the ids.
             if (type == m_ids.type && m_connection.run(snapshot).bytes(0, 0) == m_ids.snapshot) {
                 return m_ids.ids;
             }
-            // The snapshot first: what is committed between the two only has them fetched again.
+            // Reads the snapshot first: a commit between the two only causes another fetch.
             m_connection.send(snapshot);
             m_connection.send(idsOf, type);
             const auto results = m_connection.finish();
@@ -221,7 +219,7 @@ class PostgresEngine : public StoreEngine {
     bool create(int type, int id) override {
         return m_connection.once([&] {
             if (exists(type, id)) {
-                return false; // Without waiting for others.
+                return false; // Does not wait for others.
             }
             noteChange();
             sendCreate(type, id);
@@ -323,7 +321,7 @@ class PostgresEngine : public StoreEngine {
             m_connection.send(snapshot);
             m_connection.send(allBlocks);
             const auto results = m_connection.finish();
-            // Sorted here: with so many bytes the server would do it on its disk.
+            // Sorted here: for so many bytes, the server would sort on its disk.
             std::vector<std::pair<int, int>> blocks;
             for (int row = 0; row < results[1].rows(); ++row) {
                 blocks.emplace_back(static_cast<int>(results[1].number(row, 0)), row);
@@ -422,7 +420,7 @@ class PostgresEngine : public StoreEngine {
             return m_files.remove(path, highestVersion);
         });
     }
-    int removeLeftovers() override { return 0; } // The server undoes what is cut off.
+    int removeLeftovers() override { return 0; } // The server undoes interrupted ones.
 
     void log(const LogEntry& entry) noexcept override {
         try {
@@ -493,13 +491,13 @@ class PostgresEngine : public StoreEngine {
     }
     void finishCopy() override {
         m_connection.once([&] {
-            m_connection.run(writeThrough); // What it waits for has all before it in front.
+            m_connection.run(writeThrough); // Waits for everything before it.
             postgres::finishCopy(m_connection);
         });
     }
 
   private:
-    /// The key that was fetched last.
+    /// The key fetched last.
     struct Fetched {
         int type = -1;
         int id = -1;
@@ -509,10 +507,10 @@ class PostgresEngine : public StoreEngine {
         std::shared_ptr<const Elements> elements;
     };
 
-    /// The ids that were asked for last.
+    /// The ids fetched last.
     struct Ids {
         int type = -1;
-        std::string snapshot; ///< Of when they were fetched, or before.
+        std::string snapshot; ///< From the time of the fetch or before.
         std::vector<int> ids;
     };
 
@@ -558,7 +556,7 @@ class PostgresEngine : public StoreEngine {
             }
             content = contentOf(results[1]);
         }
-        const TicketContent before = content; // Shares the elements: a change makes others.
+        const TicketContent before = content; // Shares the elements: a change creates others.
         work(content);
         const bool writes = write(type, id, scope, before, content) || scope.make;
         if (!needed.empty()) {
@@ -571,7 +569,7 @@ class PostgresEngine : public StoreEngine {
         return locked[0].rows() != 0;
     }
 
-    /// Whether nobody has committed anything since the last overview.
+    /// Whether nobody has committed since the last overview.
     bool isStillCurrent() {
         return m_connection.repeating([&] {
             forgetFormerServer();
@@ -579,7 +577,7 @@ class PostgresEngine : public StoreEngine {
         });
     }
 
-    /// After a loss the server may be another one, in a state of its own.
+    /// After a loss, the server may be another one with another state.
     void forgetFormerServer() {
         if (m_connection.generation() != m_generation) {
             m_generation = m_connection.generation();
@@ -594,10 +592,10 @@ class PostgresEngine : public StoreEngine {
         ++m_commits;
     }
 
-    /// As the server counts bytes.
+    /// Converts to the server's byte positions.
     static int position(std::size_t offset) { return static_cast<int>(offset) + 1; }
 
-    /// Sends what makes a ticket. The first result tells whether there is a new one.
+    /// Sends the creation of a ticket. The first result shows whether there is a new one.
     void sendCreate(int type, int id) {
         m_connection.send(createTicket, type, id);
         if (type == jobType) {
@@ -621,7 +619,7 @@ class PostgresEngine : public StoreEngine {
         return (type == jobType ? result.number(0, 0) : result.changed()) != 0;
     }
 
-    /// Sends what a change means for the overview.
+    /// Sends the effect of a change on the overview.
     void writeOverview(int id, const Scope& scope, const TicketContent& before,
                        const TicketContent& after) {
         std::string entry(1, '\1');
@@ -644,7 +642,7 @@ class PostgresEngine : public StoreEngine {
         }
     }
 
-    /// Of rows of name and value. A ticket without keys may have one of nulls.
+    /// A content from rows of name and value. A ticket without keys may have one row of nulls.
     static TicketContent contentOf(const Result& rows) {
         TicketContent content;
         for (int row = 0; row < rows.rows(); ++row) {
@@ -655,7 +653,7 @@ class PostgresEngine : public StoreEngine {
         return content;
     }
 
-    /// Sends what makes the ticket's keys those of after. False when there is nothing to write.
+    /// Sends what turns the ticket's keys into those of after. False if there is nothing to write.
     bool write(int type, int id, const Scope& scope, const TicketContent& before,
                const TicketContent& after) {
         Names put;
@@ -686,7 +684,7 @@ class PostgresEngine : public StoreEngine {
         if (!deleted.empty()) {
             m_connection.send(deleteKeys, type, id, deleted);
         }
-        if (put.size() == 1) { // Mostly: a list of the server's costs more than what is in it.
+        if (put.size() == 1) { // The usual case: a server-side list costs more than its elements.
             m_connection.send(putOneKey, type, id, put[0], bytes[0]);
         } else if (!put.empty()) {
             m_connection.send(putKeys, type, id, put, Names(bytes.begin(), bytes.end()));

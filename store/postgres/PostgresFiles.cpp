@@ -12,9 +12,9 @@ namespace store::postgres {
 
 namespace {
 
-/// Of a content in one row: as little as fits a client's memory, as much as makes round trips rare.
+/// Bytes of a content per row: small in a client's memory, but large enough for few round trips.
 constexpr std::size_t pieceSize = 1 << 18;
-/// Pieces on their way at once.
+/// Number of pieces in flight.
 constexpr int piecesAhead = 8;
 
 constexpr Statement addContent = {"INSERT INTO tintgate.contents DEFAULT VALUES RETURNING number"};
@@ -29,8 +29,8 @@ constexpr Statement isFileAmong = {
 
 #define TINTGATE_NOW "extract(epoch FROM clock_timestamp())::bigint"
 
-/// Locks the file, and gives what content is there: the new one where there was nothing, null for a
-/// folder. That nothing changes in a row which is there is intended: it is how it is locked.
+/// Locks the file and returns its content: the new one if there was none, null for a folder. The
+/// update that changes nothing is intended, because it locks the row.
 constexpr Statement claimFile = {
     "INSERT INTO tintgate.files AS file (path, content, written)"
     " VALUES ($1, $2, " TINTGATE_NOW ")"
@@ -48,7 +48,7 @@ constexpr Statement exchangeAsOf = {
     "UPDATE tintgate.files SET content = $2, written = $3 WHERE path = $1"};
 constexpr Statement lockFile = {"SELECT content FROM tintgate.files WHERE path = $1 FOR UPDATE"};
 
-// Number, size and first piece: most files have no other.
+// Number, size and first piece. Most files have no more pieces.
 constexpr Statement current = {
     "SELECT files.content, size, bytes FROM tintgate.files"
     " LEFT JOIN tintgate.contents ON contents.number = files.content"
@@ -87,7 +87,7 @@ constexpr Statement dropContent = {
 constexpr Statement contentsOf = {
     "SELECT content FROM tintgate.versions WHERE path = $1 AND number = $2"};
 
-/// A path as the database has it, and the folders above it, the highest first.
+/// A path in the database's form, and its parent folders, topmost first.
 struct Place {
     explicit Place(std::string_view given) {
         const auto parts = partsOfServerPath(given);
@@ -104,7 +104,7 @@ struct Place {
     std::string what() const { return shownServerPath(path); }
 
     [[noreturn]] void refuse() const {
-        throw StoreFailure(Fault::BadPath, what() + " is no file, or leads through one");
+        throw StoreFailure(Fault::BadPath, what() + " is not a file, or leads through one");
     }
 
     std::string path;
@@ -122,11 +122,11 @@ std::size_t readPiece(std::istream& from, std::string& bytes, const Place& place
     return bytes.size();
 }
 
-/// Stores a stream as a content, and gives its number. Within a transaction.
+/// Stores a stream as a content and returns its number. Requires a transaction.
 std::int64_t storeContent(Connection& connection, Transaction& transaction, const Place& place,
                           std::istream& from) {
     std::string bytes;
-    readPiece(from, bytes, place); // Whoever writes the stream may take long to begin.
+    readPiece(from, bytes, place); // The writer of the stream may be slow to start.
     connection.send(addContent);
     const std::int64_t content = transaction.finish()[0].number(0, 0);
     std::int64_t size = 0;
@@ -142,8 +142,8 @@ std::int64_t storeContent(Connection& connection, Transaction& transaction, cons
     return content;
 }
 
-/// Makes the folders above a file and locks the file. What content is there; the given one where
-/// there was nothing.
+/// Creates the parent folders of a file and locks the file. Returns its content, or the given one
+/// if there was none.
 std::int64_t claim(Connection& connection, Transaction& transaction, const Place& place,
                    std::int64_t content) {
     connection.send(addFolders, place.folderViews);
@@ -157,7 +157,7 @@ std::int64_t claim(Connection& connection, Transaction& transaction, const Place
     return there.number(0, 0);
 }
 
-/// Puts a content in place, and what was there among the versions.
+/// Replaces a file's content and keeps the old one as a version.
 void exchangeFile(Connection& connection, Transaction& transaction, const Place& place,
                   std::int64_t content) {
     if (claim(connection, transaction, place, content) != content) {
@@ -183,7 +183,7 @@ void dropContents(Connection& connection, const Result& numbers) {
     }
 }
 
-/// Why there is nothing at a path.
+/// Throws the reason why there is nothing at a path.
 [[noreturn]] void failMissing(Connection& connection, const Place& place) {
     const Result among =
         connection.repeating([&] { return connection.run(isFileAmong, place.folderViews); });
@@ -193,8 +193,8 @@ void dropContents(Connection& connection, const Result& numbers) {
     throw StoreFailure(Fault::NoFile, place.what() + ": there is no such file");
 }
 
-/// Copies the content that one of the statements above finds; false where it finds none. A content
-/// never changes, so that all of it is of one moment.
+/// Copies the content that one of the statements above finds; false if there is none. A content
+/// never changes, so all of it is from one moment.
 template<class... Each>
 bool copyOut(Connection& connection, const Place& place, std::ostream& to, const Statement& find,
              const Each&... each) {
@@ -278,7 +278,7 @@ void Files::getVersion(std::string_view path, int number, std::ostream& to) {
 void Files::restoreVersion(std::string_view path, int number) {
     const Place place(path);
     Transaction transaction(m_connection);
-    // Locked first, so that the version is not pruned meanwhile.
+    // Locks first, so that the version is not pruned meanwhile.
     m_connection.send(lockFile, place.path);
     m_connection.send(contentsOf, place.path, number);
     const auto results = transaction.finish();

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The files of a store in a PostgreSQL database, which are there for every machine that reaches the
-// server. A delivery is one transaction, so that nothing is ever left of one that was cut off.
+// The files of a store in a PostgreSQL database. They are available to every machine that reaches
+// the server. A delivery is one transaction, so an interrupted one leaves nothing.
 #pragma once
 
 #include <optional>
@@ -10,7 +10,7 @@
 
 namespace store::postgres {
 
-/// See StoreEngine for each of these. The connection outlives it.
+/// See StoreEngine for each of these. The connection must outlive this object.
 class Files {
   public:
     explicit Files(Connection& connection) : m_connection(connection) {}

@@ -19,12 +19,11 @@ namespace store::postgres {
 
 namespace {
 
-// The keys of a listing hold few different values: a row for each name and value, with the numbers
-// of all tickets that have it, costs less than a row for each key. They are packed, since an array
-// costs more. Which tickets are of the type is a row of its own, with nulls in front: to bring the
-// two together here costs a tenth of a join there. It is one statement, so that it is all of one
-// moment. Where most keys are passed over, the name, at the start of a row, is found sooner than
-// the hash behind it.
+// The keys of a listing have few different values, so one row per name and value with all its
+// tickets' numbers costs less than one row per key. The numbers are packed, because an array costs
+// more. The tickets of the type are an additional row that starts with nulls: joining the two here
+// costs a tenth of a join on the server. A single statement sees one moment. If most keys are
+// skipped, comparing the name, at the start of a row, is faster than the hash after it.
 constexpr Statement keysOfType = {
     "SELECT name, value, string_agg(int8send(ticket), ''), NULL FROM (SELECT name, ticket,"
     " CASE WHEN length(value) <= $3 THEN value END AS value"
@@ -34,7 +33,7 @@ constexpr Statement keysOfType = {
     " FROM tintgate.tickets WHERE type = $1"};
 enum Column { NameColumn, ValueColumn, NumbersColumn, IdsColumn };
 
-/// The first of numbers that are packed one behind the other, which it takes off them.
+/// Removes and returns the first of the packed numbers.
 std::int64_t takeBigint(std::string_view& packed) {
     std::uint64_t bytes = 0;
     std::memcpy(&bytes, packed.data(), sizeof bytes);
@@ -51,7 +50,7 @@ int takeInt(std::string_view& packed) {
 /// Id and number.
 using Ticket = std::pair<int, std::int64_t>;
 
-/// By id.
+/// Sorted by id.
 std::vector<Ticket> ticketsIn(const Result& rows, int row) {
     std::string_view ids = rows.bytes(row, IdsColumn);
     std::string_view numbers = rows.bytes(row, NumbersColumn);
@@ -70,11 +69,11 @@ std::vector<Ticket> ticketsIn(const Result& rows, int row) {
 
 /// A key of some ticket.
 struct Key {
-    std::int64_t ticket; ///< Its number.
-    std::size_t row;     ///< That tells name and value.
+    std::int64_t ticket; ///< Its ticket's number.
+    std::size_t row;     ///< The row with its name and value.
 };
 
-/// Digit by digit: the numbers of a store's tickets are so close together that few digits do.
+/// A radix sort: the numbers of a store's tickets are so close together that few digits are enough.
 void sortByTicket(std::vector<Key>& keys) {
     constexpr int digitBits = 11;
     constexpr int digits = 1 << digitBits;
@@ -138,7 +137,7 @@ void showKeys(const Result& rows, const std::vector<std::string>& names,
     sortByTicket(keys);
     auto key = keys.begin();
     for (const auto& [id, number] : tickets) {
-        if (key == keys.end() || key->ticket != number) { // Ids mostly go the way of the numbers.
+        if (key == keys.end() || key->ticket != number) { // Ids and numbers mostly rise together.
             key = std::lower_bound(
                 keys.begin(), keys.end(), number,
                 [](const Key& key, std::int64_t number) { return key.ticket < number; });

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Some keys of all tickets of a type, from a PostgreSQL server in one go.
+// Reads some keys of all tickets of a type from a PostgreSQL server at once.
 #pragma once
 
 #include <cstddef>
@@ -10,12 +10,12 @@
 
 namespace store::postgres {
 
-/// Sends the statement that asks for the keys of these names, as far as each takes at most
-/// largestBytes. The names are needed until then.
+/// Sends the query for the keys of these names that each take at most largestBytes. The names are
+/// not used after the call.
 void askForKeys(Connection& connection, int type, const std::vector<std::string>& names,
                 std::size_t largestBytes);
 
-/// What it gave, as StoreEngine::keysOfAll tells.
+/// Evaluates its result as described for StoreEngine::keysOfAll.
 void showKeys(const Result& rows, const std::vector<std::string>& names,
               const StoreEngine::ShowKey& show);
 

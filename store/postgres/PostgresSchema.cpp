@@ -9,8 +9,8 @@ namespace store::postgres {
 
 namespace {
 
-/// Each makes of the format before it the one of its number, counted from 1. They are never
-/// changed, as there are stores that have been through them.
+/// Each converts the previous format to the format of its number, counted from 1. They must never
+/// change, because existing stores have used them.
 constexpr const char* migrations[] = {
     // 1: tickets and users
     R"(
@@ -172,7 +172,7 @@ void addLog(Connection& connection) {
 }
 
 void migrate(Connection& connection, std::int64_t from) {
-    // However large the store is: this is a person's wish.
+    // Without a limit, because a person waits for it, however large the store is.
     connection.script("SET LOCAL statement_timeout = 0");
     for (std::int64_t next = from; next < format; ++next) {
         connection.script(migrations[next]);
@@ -224,7 +224,7 @@ bool upgradeSchema(Connection& connection) {
     }
     Transaction transaction(connection);
     transaction.finish();
-    // Of two upgrades at once, the second finds nothing to do.
+    // If two upgrades run at once, the second finds nothing to do.
     const std::int64_t from = connection.run(lockedState).number(0, 0);
     if (from >= format) {
         addLog(connection);

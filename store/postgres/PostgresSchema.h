@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// The tables of a store in a PostgreSQL database. All stand in the schema "tintgate", which the
-// statements name, so that nobody's search path counts.
+// The tables of a store in a PostgreSQL database. All are in the schema "tintgate", which the
+// statements name explicitly, so that search paths don't matter.
 #pragma once
 
 #include <string>
@@ -9,19 +9,19 @@
 
 namespace store::postgres {
 
-/// Whether a connection's database holds a store that this program may work on. Throws
+/// Checks that a connection's database contains a store usable by this program. Throws
 /// StoreFailure: Missing, Newer, Older.
 void checkSchema(Connection& connection);
 
-/// Makes the tables, with one ticket, the system's, where a name is given. All of it is one
-/// transaction. Throws StoreFailure (Exists).
+/// Creates the tables and, if a name is given, the system ticket. All of it is one transaction.
+/// Throws StoreFailure (Exists).
 void makeSchema(Connection& connection, const std::string* serverName);
 
-/// Whether there is a copy that was begun and not finished.
+/// Whether there is an unfinished copy.
 bool isUnfinishedCopy(Connection& connection);
 void finishCopy(Connection& connection);
 
-/// False when it was up to date.
+/// False if it was up to date.
 bool upgradeSchema(Connection& connection);
 
 } // namespace store::postgres

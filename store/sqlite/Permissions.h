@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Who may use what is in a store's folder.
+// Permissions of the files in a store's folder.
 #pragma once
 
 #include <string>
@@ -8,18 +8,18 @@
 
 namespace store {
 
-/// Everything in a store is as open to the store's group as its folder is, and never to others. So
-/// all accounts of the group can use a folder of mode 2770, whatever their umasks, and nobody else
-/// a folder of mode 0700.
+/// Everything in a store is as accessible to the store's group as its folder is, and never to
+/// others. So all accounts of the group can use a folder of mode 2770, whatever their umasks, and
+/// nobody else can use a folder of mode 0700.
 class Permissions {
   public:
-    /// Those of an open folder. Throws StoreFailure.
+    /// The permissions of an open folder. Throws StoreFailure.
     static Permissions of(int folder);
 
-    /// Gives a new file or folder, which is open, these permissions and the folder's group. If this
-    /// process may not give it that group, only its owner can use it. False with errno set.
+    /// Gives a new, open file or folder these permissions and the folder's group. If this process
+    /// can't give it that group, only its owner can use it. False with errno set.
     bool giveTo(int made) const;
-    /// The same, by a path.
+    /// Same for a path.
     bool giveTo(const std::string& path) const;
 
   private:

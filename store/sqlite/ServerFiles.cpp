@@ -60,7 +60,7 @@ constexpr std::size_t blockSize = 1 << 16;
     }
 }
 
-/// The folders and the name that a server path consists of.
+/// The folders and the name in a server path.
 class Place {
   public:
     explicit Place(std::string_view path) : m_parts(partsOfServerPath(path)) {}
@@ -68,7 +68,7 @@ class Place {
     std::vector<std::string> folders() const { return {m_parts.begin(), m_parts.end() - 1}; }
     const std::string& name() const { return m_parts.back(); }
 
-    /// The folders of the place's versions, below the files folder.
+    /// The folders of the place's versions, relative to the files folder.
     std::vector<std::string> versions() const {
         std::vector<std::string> folders{versionsFolder};
         folders.insert(folders.end(), m_parts.begin(), m_parts.end());
@@ -92,8 +92,8 @@ void flush(const Descriptor& file, const std::string& what) {
     }
 }
 
-/// Walks down from the store's files. With make, folders that are missing are made, with the
-/// permissions of the files folder, and are on the disk when this returns.
+/// Walks down from the store's files. With `make`, missing folders are created with the permissions
+/// of the files folder and are on the disk when this returns.
 Descriptor walk(const Descriptor& from, const std::vector<std::string>& folders, bool make,
                 const std::string& what) {
     Descriptor folder = openFolder(from.get(), ".");
@@ -156,7 +156,7 @@ struct stat statusOf(int file, const std::string& what) {
     return status;
 }
 
-/// A regular file, open for reading. O_NONBLOCK, since opening a pipe would wait for its writer.
+/// Opens a regular file for reading. O_NONBLOCK, because opening a pipe would wait for its writer.
 Descriptor openFile(const Descriptor& folder, const std::string& name, const std::string& what) {
     Descriptor file(
         openat(folder.get(), name.c_str(), O_RDONLY | O_NOFOLLOW | O_NONBLOCK | O_CLOEXEC));
@@ -164,12 +164,12 @@ Descriptor openFile(const Descriptor& folder, const std::string& name, const std
         fail(errno, what);
     }
     if (!S_ISREG(statusOf(file.get(), what).st_mode)) {
-        throw StoreFailure(Fault::BadPath, what + " is no file");
+        throw StoreFailure(Fault::BadPath, what + " is not a file");
     }
     return file;
 }
 
-/// Reads up to size bytes; fewer at the end of the file only.
+/// Reads up to `size` bytes; fewer only at the end of the file.
 std::size_t readBlock(const Descriptor& file, char* block, std::size_t size,
                       const std::string& what) {
     const std::ptrdiff_t count = base::readAll(file, block, size);
@@ -196,7 +196,7 @@ void copyOut(const Descriptor& file, std::ostream& to, const std::string& what) 
     }
 }
 
-/// Takes the next bytes; 0 at the end.
+/// Reads the next bytes; returns 0 at the end.
 using Source = std::function<std::size_t(char* block, std::size_t size)>;
 
 Source sourceOf(std::istream& from, const Place& place) {
@@ -209,11 +209,11 @@ Source sourceOf(std::istream& from, const Place& place) {
     };
 }
 
-/// A file that is being written under a name of its own; gone again unless it is put in place. It
-/// holds a lock on itself, which tells it from what an interrupted delivery left.
+/// A file being written under an internal name; removed unless it is put in place. It is locked,
+/// which distinguishes it from leftovers of interrupted deliveries.
 class Delivery {
   public:
-    /// Unless later, all of it is on the disk when it is in place.
+    /// Unless `later`, everything is on the disk when it is in place.
     Delivery(const Descriptor& folder, const Permissions& permissions, std::string what,
              bool later = false)
         : m_folder(folder), m_what(std::move(what)), m_later(later) {
@@ -272,12 +272,12 @@ class Delivery {
     const Descriptor& m_folder;
     const std::string m_what;
     const bool m_later;
-    std::string m_name; ///< Empty once in place.
+    std::string m_name; ///< Empty after it was put in place.
     Descriptor m_file;
 };
 
-/// Held while a file is exchanged: of two deliveries to one place, each must keep as a version what
-/// it really replaces. The kernel lets go of it with the process.
+/// Locked while a file is replaced, so that each of two concurrent deliveries keeps the content
+/// that it really replaces. The kernel releases the lock with the process.
 class ExchangeLock {
   public:
     explicit ExchangeLock(const Descriptor& files) : m_own(openFolder(files.get(), ".")) {
@@ -314,11 +314,11 @@ int versionNumber(std::string_view name) {
     return whole && number > 0 ? number : 0;
 }
 
-/// An empty file of this name stays when versions up to the newest one are pruned: their numbers
-/// are not used again.
+/// Prefix of an empty file that remains if versions up to the newest one are pruned, so that their
+/// numbers are not reused.
 constexpr std::string_view usedUpPrefix = ".tintgate-used-";
 
-/// The highest number that was ever pruned in a folder of versions, or 0.
+/// The highest number ever pruned in a folder of versions, or 0.
 int lastUsedUp(const Descriptor& versions) {
     int last = 0;
     for (const auto& name : namesIn(versions)) {
@@ -331,7 +331,7 @@ int lastUsedUp(const Descriptor& versions) {
     return last;
 }
 
-/// Notes a number as used up, before its version is removed.
+/// Records a number as used, before its version is removed.
 void useUp(const Descriptor& versions, int number, const std::string& what) {
     const int former = lastUsedUp(versions);
     if (former >= number) {
@@ -372,7 +372,7 @@ std::vector<VersionFile> versionsIn(const Descriptor& folder) {
     return found;
 }
 
-/// Keeps what stands at the place as a version. The exchange lock is held.
+/// Keeps the current file at the place as a version. The exchange lock must be held.
 void keepVersion(const Descriptor& files, const Descriptor& folder, const Place& place) {
     const std::string what = place.text();
     struct stat current;
@@ -383,11 +383,11 @@ void keepVersion(const Descriptor& files, const Descriptor& folder, const Place&
         fail(errno, what);
     }
     if (!S_ISREG(current.st_mode)) {
-        throw StoreFailure(Fault::BadPath, what + " is no file");
+        throw StoreFailure(Fault::BadPath, what + " is not a file");
     }
     const Descriptor versions = walk(files, place.versions(), true, what);
     const auto kept = versionsIn(versions);
-    // A process that was killed between this and the exchange has kept it already.
+    // A process that was killed between this and the exchange has already kept it.
     if (!kept.empty() && kept.back().inode == current.st_ino) {
         return;
     }
@@ -443,7 +443,7 @@ void deliver(const Descriptor& files, const Place& place, const Source& source) 
     delivery.putInPlace(place.name());
 }
 
-/// An entry that is no folder: its folder, its name, and its path below the files.
+/// An entry other than a folder: its folder, its name, and its path relative to the files.
 using ShowEntry = std::function<void(const Descriptor& folder, const std::string& name,
                                      const std::string& path, const struct stat& status)>;
 
@@ -463,7 +463,7 @@ class Visit {
   public:
     Visit(const Descriptor& files, std::string top) : m_files(files), m_pending{std::move(top)} {}
 
-    /// Goes to the next folder; false after the last one. Folders that are gone are passed over.
+    /// Moves to the next folder; false after the last one. Skips folders that no longer exist.
     bool next() {
         while (!m_pending.empty()) {
             std::string path = std::move(m_pending.back());
@@ -503,8 +503,8 @@ class Visit {
     std::string m_path;
 };
 
-/// Shows each entry in the folder and below it, except for the versions below the files. A folder
-/// that can't be read is a failure.
+/// Calls back for each entry in the folder and below it, except the versions. An unreadable folder
+/// is a failure.
 void visitAll(const Descriptor& files, const std::string& top, const ShowEntry& show) {
     Visit visit(files, top);
     while (visit.next()) {
@@ -527,7 +527,7 @@ void visitAll(const Descriptor& files, const std::string& top, const ShowEntry& 
     }
 }
 
-/// Removes deliveries that nobody is working on any more, if they are so old.
+/// Removes abandoned deliveries of at least this age.
 int removeDeliveries(const Descriptor& files, const std::string& top, std::int64_t seconds) {
     int removed = 0;
     visitAll(files, top,
@@ -652,7 +652,7 @@ ServerFiles::ServerFiles(const std::string& storeFolder, bool create) {
     if (create) {
         makeFilesFolder(storeFolder, path);
     }
-    // A link in this place is the administrator's: the files may lie on a disk of their own.
+    // A link here was set by the administrator, to put the files on another disk.
     m_files = Descriptor(open(path.c_str(), O_RDONLY | O_DIRECTORY | O_CLOEXEC));
     if (!m_files.isOpen()) {
         throw StoreFailure(Fault::Missing, path + ": " + std::strerror(errno));
@@ -718,7 +718,7 @@ std::vector<FileVersion> ServerFiles::versions(std::string_view path) {
             }
         }
         for (const auto& file : versionsIn(folder)) {
-            // What is still in place has not been replaced yet.
+            // A version that is still in place has not been replaced yet.
             if (file.inode != current.st_ino) {
                 list.push_back(file.version);
             }
@@ -798,7 +798,7 @@ bool ServerFiles::remove(std::string_view path, std::optional<int> highestVersio
 }
 
 int ServerFiles::removeLeftovers() {
-    constexpr std::int64_t youngestSeconds = 60; // Between making a file and locking it, say.
+    constexpr std::int64_t youngestSeconds = 60; // Time between creating and locking a file.
     return removeDeliveries(m_files, "", youngestSeconds) +
            removeDeliveries(m_files, versionsFolder, youngestSeconds);
 }

@@ -44,7 +44,7 @@ void fail(sqlite3* database, int code) {
 
 namespace {
 
-/// The name of a file with all that means something in a URI escaped.
+/// A file name as a URI, with all special characters escaped.
 std::string uriOf(const std::string& path) {
     constexpr const char* digits = "0123456789ABCDEF";
     std::string uri = "file:";
@@ -127,7 +127,7 @@ void Statement::Run::bind(int index, std::int64_t number) {
 }
 
 void Statement::Run::bind(int index, std::string_view bytes) {
-    // An empty view may have no data, which would bind NULL.
+    // The data of an empty view may be null, which would bind NULL.
     const char* const data = bytes.data() == nullptr ? "" : bytes.data();
     if (const int code =
             sqlite3_bind_blob64(m_statement, index, data, bytes.size(), SQLITE_STATIC)) {
@@ -150,7 +150,7 @@ ReadTransaction::~ReadTransaction() {
 }
 
 void Transaction::commit() {
-    m_database.run("COMMIT"); // Where that fails, the destructor undoes it.
+    m_database.run("COMMIT"); // If this fails, the destructor undoes the transaction.
     m_open = false;
 }
 

@@ -14,13 +14,13 @@
 
 namespace store::sqlite {
 
-/// Throws the failure that a result code stands for. Database may be null.
+/// Throws the failure for a result code. `database` may be null.
 [[noreturn]] void fail(sqlite3* database, int code);
 
 enum class Opening {
     Existing,
     New,
-    /// A file that nobody can change: its log is not looked at, and nothing is made beside it.
+    /// A file that nobody can change: its log is ignored, and no files are created next to it.
     Unchanging,
 };
 
@@ -30,7 +30,7 @@ class Database {
 
     sqlite3* get() const { return m_database.get(); }
     void run(const char* statements);
-    /// The first column of the first row; 0 without a row.
+    /// The first column of the first row, or 0 without a row.
     std::int64_t number(const char* query);
 
   private:
@@ -45,8 +45,8 @@ class Statement {
   public:
     Statement(Database& database, const char* text);
 
-    /// The statement at work, with its arguments from the first on: numbers, or bytes, which stay
-    /// the caller's and must stay good. When this goes, the statement can run again.
+    /// A running statement with its arguments, in order: numbers, or bytes, which are not copied
+    /// and must stay valid. After this object is destroyed, the statement can run again.
     class Run {
       public:
         ~Run();
@@ -55,14 +55,14 @@ class Statement {
 
         /// True for a row, false at the end.
         bool step();
-        /// For a statement without rows.
+        /// Runs a statement without rows.
         void finish() {
             while (step()) {
             }
         }
 
         std::int64_t number(int column) const { return sqlite3_column_int64(m_statement, column); }
-        /// Good until the next step.
+        /// Valid until the next step.
         std::string_view bytes(int column) const;
         std::string text(int column) const { return std::string(bytes(column)); }
         bool isNull(int column) const {
@@ -95,7 +95,7 @@ class Statement {
     Run run(const Arguments&... arguments) {
         return Run(m_statement.get(), arguments...);
     }
-    /// With a list of names behind two numbers.
+    /// Runs with two numbers and a list of names.
     Run runList(std::int64_t first, std::int64_t second, const std::vector<std::string>& names) {
         return Run(m_statement.get(), first, second, names);
     }
@@ -108,7 +108,7 @@ class Statement {
     std::unique_ptr<sqlite3_stmt, Finalize> m_statement;
 };
 
-/// A transaction that writes; it waits for the writers before it. Rolled back unless committed.
+/// A writing transaction; it waits for earlier writers. Rolled back unless committed.
 class Transaction {
   public:
     explicit Transaction(Database& database);
@@ -123,7 +123,7 @@ class Transaction {
     bool m_open = true;
 };
 
-/// Statements that read, all of one moment.
+/// Makes several reading statements see one moment.
 class ReadTransaction {
   public:
     explicit ReadTransaction(Database& database) : m_database(database) { m_database.run("BEGIN"); }

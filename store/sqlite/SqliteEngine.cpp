@@ -2,13 +2,13 @@
 // A store in one folder on a local disk:
 //
 //   tickets.db      tickets and users, a SQLite database in WAL mode (with tickets.db-wal and -shm
-//                   beside it while it is open)
+//                   next to it while it is open)
 //   files/          see ServerFiles.h
 //   log.txt         see LineFile.h; log.txt.old is the one before it
 //
-// Key names and values are blobs, which SQLite compares as bytes. A key is one row, its value as
-// KeyBytes.h tells; what concerns all jobs is kept once more, as JobOverview.h describes. PRAGMA
-// user_version is the format.
+// Key names and values are blobs, which SQLite compares as bytes. A key is one row with a value in
+// the form of KeyBytes.h. There is also the overview of JobOverview.h. PRAGMA user_version is the
+// format.
 #include <algorithm>
 #include <cerrno>
 #include <climits>
@@ -44,7 +44,7 @@ using sqlite::ReadTransaction;
 using sqlite::Statement;
 using sqlite::Transaction;
 
-constexpr std::int64_t applicationId = 0x54474154;    // "TGAT", as file(1) can show it.
+constexpr std::int64_t applicationId = 0x54474154;    // "TGAT", displayable by file(1).
 constexpr std::int64_t unfinishedCopyId = 0x54474143; // "TGAC"
 /// 1: tickets, keys, users. 2: the overview of jobs.
 constexpr std::int64_t format = 2;
@@ -82,8 +82,8 @@ std::string databasePath(const std::string& folder) {
     return folder + "/tickets.db";
 }
 
-/// The folder's own path, which starts with a slash: SQLite would take "file:" in front of a name
-/// for a URI.
+/// The folder's resolved path. It starts with a slash, because SQLite would treat a name that
+/// starts with "file:" as a URI.
 std::string realPath(const std::string& address) {
     if (address.empty() || address.find('\0') != std::string::npos) {
         throw StoreFailure(Fault::Missing, "no store has an empty name");
@@ -95,20 +95,20 @@ std::string realPath(const std::string& address) {
     return path.get();
 }
 
-/// Whether a database is one of this kind. The first look into it, which opens its log.
+/// Checks that a database is of this kind. This is its first access, which opens its log.
 void checkKind(Database& database, const std::string& folder, std::int64_t kind) {
     const std::int64_t found = database.number("PRAGMA application_id");
     if (found != kind) {
         throw StoreFailure(Fault::Missing,
                            found == unfinishedCopyId
                                ? folder + " is a copy of a store that was not finished"
-                               : databasePath(folder) + " is no database of a store");
+                               : databasePath(folder) + " is not the database of a store");
     }
-    // What is in the file is data, and never to be run.
+    // The file's content is data and must never be executed.
     database.run("PRAGMA trusted_schema = OFF");
 }
 
-/// The database in a store's folder, whatever its format, if it is of this kind.
+/// The database in a store's folder, in any format, if it is of this kind.
 Database openDatabase(const std::string& folder, std::int64_t kind = applicationId) {
     const std::string path = databasePath(folder);
     struct stat status;
@@ -128,14 +128,14 @@ bool isMountedForReading(const std::string& folder) {
     return statvfs(folder.c_str(), &mount) == 0 && (mount.f_flag & ST_RDONLY) != 0;
 }
 
-/// A store's database as it can be opened, and whether others may be in it meanwhile.
+/// A store's opened database, and whether others may use it at the same time.
 struct OpenedDatabase {
     Database database;
     bool shared;
 };
 
-/// For reading, a database opens also without the shared index of its log, for which a full disk
-/// has no room, and which nobody can make where a folder is mounted for reading.
+/// For reading, also opens a database without the shared index of its log, because a full disk has
+/// no room for the index and a read-only folder does not allow it.
 OpenedDatabase openDatabase(const std::string& folder, Access access, std::int64_t kind) {
     const std::string path = databasePath(folder);
     try {
@@ -312,7 +312,7 @@ class SqliteEngine : public StoreEngine {
 
     bool create(int type, int id) override {
         if (exists(type, id)) {
-            return false; // Without waiting for those who write.
+            return false; // Does not wait for writers.
         }
         Transaction transaction(m_database);
         if (!insert(type, id)) {
@@ -369,8 +369,8 @@ class SqliteEngine : public StoreEngine {
 
     std::shared_ptr<const TicketContent> content(int type, int id,
                                                  const KeyFilter& filter) override {
-        // What is asked for must not cost the reading of all other keys. All of it is of one
-        // moment: a statement by itself, several within a transaction.
+        // Reading some keys must not cost reading all others. The result is from one moment: a
+        // single statement, or several in a transaction.
         auto content = std::make_shared<TicketContent>();
         if (filter.all()) {
             return take(m_content.run(type, id), *content) ? content : nullptr;
@@ -413,7 +413,7 @@ class SqliteEngine : public StoreEngine {
                              list + ") ORDER BY t.id")
                                 .c_str());
         auto run = statement.runList(type, static_cast<std::int64_t>(largestBytes), names);
-        // Such keys hold few different values.
+        // These keys have few different values.
         std::map<std::string, std::shared_ptr<const Elements>, std::less<>> known;
         while (run.step()) {
             const auto name = std::find(names.begin(), names.end(), run.bytes(1));
@@ -468,7 +468,7 @@ class SqliteEngine : public StoreEngine {
                 }
             }
         }
-        const TicketContent before = content; // Shares the elements: a change makes others.
+        const TicketContent before = content; // Shares the elements: a change creates others.
         work(content);
         const bool written = write(ticket, scope, before, content);
         if (written && type == jobType) {
@@ -631,7 +631,7 @@ class SqliteEngine : public StoreEngine {
         : m_database(std::move(opened.database)), m_ready(m_database), m_files(folder, false),
           m_watch(m_database, opened.shared), m_folder(folder), m_log(folder + "/log.txt", true) {}
 
-    /// Settles the connection before a statement is prepared.
+    /// Checks the connection before a statement is prepared.
     struct Ready {
         explicit Ready(Database& database) {
             checkFormat(database);
@@ -639,8 +639,8 @@ class SqliteEngine : public StoreEngine {
         }
     };
 
-    /// Puts rows of name and value in a content. A ticket without keys may give one of nulls. False
-    /// for no rows.
+    /// Adds rows of name and value to a content. A ticket without keys may have one row of nulls.
+    /// False if there are no rows.
     static bool take(Statement::Run run, TicketContent& content) {
         bool found = false;
         while (run.step()) {
@@ -673,7 +673,7 @@ class SqliteEngine : public StoreEngine {
         return removed;
     }
 
-    /// Bytes by where in a block they go.
+    /// Bytes by their position in a block.
     using Places = std::vector<std::pair<std::size_t, std::string>>;
 
     /// Writes parts of a job's entry in the overview.
@@ -698,7 +698,7 @@ class SqliteEngine : public StoreEngine {
         }
     }
 
-    /// After a change, what concerns the overview.
+    /// Updates the overview after a change.
     void writeOverview(int id, const Scope& scope, const TicketContent& after) {
         Places places;
         for (std::size_t key = 0; key < overviewKeys.size(); ++key) {
@@ -712,7 +712,7 @@ class SqliteEngine : public StoreEngine {
         }
     }
 
-    /// False when there was nothing to write.
+    /// False if there was nothing to write.
     bool write(std::int64_t ticket, const Scope& scope, const TicketContent& before,
                const TicketContent& after) {
         if (scope.everything) {
@@ -800,11 +800,11 @@ void makeSystemTicket(Database& database, const std::string& serverName) {
     }
 }
 
-/// Whether a folder has nothing in it, or at most what a store that was not made to its end has.
-/// For what that database holds, see makeSqlite.
+/// Whether a folder is empty or contains at most the files of an unfinished store. For the content
+/// of such a database, see makeSqlite.
 bool isFree(const std::string& folder) {
     namespace fs = std::filesystem;
-    // The journal is there while the log is being turned on.
+    // The journal exists while the log is being enabled.
     const std::set<std::string> begun = {"files", "tickets.db", "tickets.db-journal",
                                          "tickets.db-wal", "tickets.db-shm"};
     std::error_code failure;
@@ -832,7 +832,7 @@ void makeFolder(const std::string& address) {
                        address + ": " + std::strerror(error));
 }
 
-/// Without a server's name there is nothing in it.
+/// Without a server's name, the store is empty.
 void makeSqlite(const std::string& address, const std::string* serverName, std::int64_t kind) {
     makeFolder(address);
     const std::string folder = realPath(address);
@@ -852,7 +852,7 @@ void makeSqlite(const std::string& address, const std::string* serverName, std::
         makeSystemTicket(database, *serverName);
     }
     database.run(("PRAGMA user_version = " + std::to_string(format)).c_str());
-    // Without it a database is no store, so one that was not made to its end is none.
+    // A database without it is not a store, so an unfinished one is not.
     setKind(database, kind);
     transaction.commit();
 }
@@ -865,8 +865,8 @@ void makeSqliteStore(const std::string& address, const std::string& serverName) 
     makeSqlite(address, &serverName, applicationId);
 }
 
-/// The engine of a copy holds the lock on its folder. Until it is a store, nothing in it needs to
-/// be on the disk.
+/// The engine of a copy locks its folder. Before it is a store, nothing in it needs to be on the
+/// disk.
 class SqliteCopy : public SqliteEngine {
   public:
     explicit SqliteCopy(const std::string& folder)
@@ -881,7 +881,7 @@ class SqliteCopy : public SqliteEngine {
 
     void finishCopy() override {
         serverFiles().finishCopy();
-        database().run("PRAGMA synchronous = FULL"); // Of what is in the log so far as well.
+        database().run("PRAGMA synchronous = FULL"); // Includes the existing content of the log.
         SqliteEngine::finishCopy();
     }
 
@@ -901,7 +901,7 @@ std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
     return std::make_unique<SqliteCopy>(realPath(address));
 }
 
-/// Makes the overview of the jobs that are there.
+/// Creates the overview of existing jobs.
 void fillOverview(Database& database) {
     Statement put(database, "INSERT INTO job_blocks (number, content) VALUES (?, ?)");
     showBlocks(database,
@@ -916,8 +916,8 @@ bool upgradeSqlite(const std::string& address) {
     }
     database.run("PRAGMA synchronous = FULL");
     Transaction transaction(database);
-    // Of two upgrades at once, the second finds nothing to do. Format 1 is the first that was ever
-    // given out: a step for each later one goes here.
+    // If two upgrades run at once, the second finds nothing to do. Format 1 is the first that was
+    // ever published: add a step here for each later one.
     const std::int64_t found = database.number("PRAGMA user_version");
     if (found >= format) {
         return false;

@@ -7,7 +7,7 @@ namespace store {
 
 namespace {
 
-constexpr std::uint32_t indexVersion = 3'007'000; // First word of the header, since SQLite 3.7.0.
+constexpr std::uint32_t indexVersion = 3'007'000; // First word of the header since SQLite 3.7.0.
 constexpr int regionSize = 32'768;
 
 const volatile std::uint32_t* sharedHeader(sqlite3* database) {

@@ -38,7 +38,7 @@ bool MemoryStorage::create(int type, int id) {
 int MemoryStorage::createNext(int type) {
     int id = m_highestId[type] + 1;
     if (!TICKET_ID_Valid(id)) {
-        // The numbers are used up: the lowest that is free.
+        // All numbers are used; take the lowest free one.
         id = 1;
         while (exists(type, id)) {
             ++id;
@@ -63,7 +63,7 @@ std::shared_ptr<const TicketContent> MemoryStorage::content(int type, int id,
         return nullptr;
     }
     if (filter.all()) {
-        return *content; // A change of the ticket then leaves this one as it is: see own().
+        return *content; // Later changes of the ticket don't affect this copy: see own().
     }
     return std::make_shared<TicketContent>((*content)->select(filter));
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tickets that live as long as the process.
+// Tickets that exist as long as the process.
 #pragma once
 
 #include <map>
@@ -26,7 +26,7 @@ class MemoryStorage : public TicketStorage {
     std::shared_ptr<TicketContent>* find(int type, int id);
 
     std::map<std::pair<int, int>, std::shared_ptr<TicketContent>> m_tickets;
-    std::map<int, int> m_highestId; ///< By type: the highest id that was ever there.
+    std::map<int, int> m_highestId; ///< By type: the highest id that ever existed.
 };
 
 } // namespace store

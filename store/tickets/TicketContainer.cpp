@@ -10,13 +10,13 @@ namespace {
 
 using Containers = std::unordered_map<const void*, TicketContainer*>;
 
-/// By the address of their records. Never destroyed, since a container may end after it would be.
+/// By the address of their records. Never destroyed, because a container may outlive statics.
 Containers& containers() {
     static auto& all = *new Containers;
     return all;
 }
 
-/// The container that was found last; most calls in a row are for one.
+/// The container found last; consecutive calls usually have the same one.
 struct {
     const void* handle = nullptr;
     TicketContainer* container = nullptr;
@@ -33,7 +33,7 @@ TicketContainer* find(const void* handle) {
     return lastFound.container;
 }
 
-/// Runs one word on the container; false for an unknown handle.
+/// Runs a function of the record on the container; false for an unknown handle.
 template<class Body>
 int on(void* handle, Body body) {
     return guarded([&] {
@@ -232,7 +232,8 @@ int TicketContainer::createNext(int type) {
     return TICKET_TYPE_Valid(type) ? m_storage->createNext(type) : -1;
 }
 
-/// Without a change, what walks showed stays. It goes last, since a table may point into it.
+/// Keeps contents shown by walks unless there is a change. Released last: a table may point into
+/// them.
 template<class Change>
 bool TicketContainer::change(int type, int id, Change change) {
     if (!TICKET_Valid(type, id)) {
@@ -262,7 +263,7 @@ bool TicketContainer::walkTickets(TicketWalk callback, void* context, int type) 
         return false;
     }
     for (const int id : m_storage->ids(type)) {
-        // The callback may delete tickets that are still to come.
+        // The callback may delete tickets that follow.
         if (const auto* ticket = open(type, id)) {
             if (!callback(context, type, id, ticket)) {
                 break;
@@ -274,7 +275,7 @@ bool TicketContainer::walkTickets(TicketWalk callback, void* context, int type) 
 
 bool TicketContainer::get(int type, int id, const char* key, PARAM_TYPE ptype, void* out,
                           int position) {
-    // Short, and apart from what fetches: an array comes through here one element at a time.
+    // A short path without fetching: arrays are read here one element at a time.
     if (position > 0 && m_snapshot.held && m_snapshot.address == Address(type, id) &&
         std::strcmp(m_snapshot.key.c_str(), key) == 0) {
         return readElement(m_snapshot.elements.get(), ptype, out, position, m_handedOut);

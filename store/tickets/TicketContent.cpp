@@ -29,9 +29,9 @@ bool beginsArray(const SETMULTIPAR* record) {
            record[1].key == record->key && record[1].type == record->type;
 }
 
-/// What setElement would make of records, one after the other, that fill positions 0, 1, 2, ... of
-/// a key that isn't there with numbers of one type, as a measured array comes; without a Value for
-/// each. Sets their results, and leaves the record at the last of them.
+/// Has the effect of setElement on consecutive records that fill positions 0, 1, 2, ... of a
+/// missing key with numbers of one type, as for a measured array, but without creating a Value for
+/// each. Sets their results and moves the record to the last of them.
 template<std::size_t Size>
 std::shared_ptr<Elements> takeArray(SETMULTIPAR*& record) {
     const SETMULTIPAR first = *record;
@@ -70,10 +70,10 @@ bool KeyFilter::takes(std::string_view key) const {
                        [&](const auto& prefix) { return startsWith(key, prefix); });
 }
 
-/// A table on its way into a ticket.
+/// A table being applied to a ticket.
 ///
-/// Keys that it deletes stay in the map, without elements, until it is through, and former elements
-/// stay alive: further records may point to either. That is also what undoes it.
+/// Deleted keys stay in the map, without elements, until the end, and old elements stay alive,
+/// because later records may point to them. They also allow undoing the table.
 class TicketContent::Application {
   public:
     Application(Keys& keys, bool single) : m_keys(keys), m_single(single) {}
@@ -112,8 +112,8 @@ class TicketContent::Application {
 
     void remember(Keys::iterator key) {
         if (m_seen.insert(&key->first).second) {
-            // To hold a single record's former elements would only make it copy them: it has
-            // nothing to undo, and takes its value before it changes anything.
+            // A single record has nothing to undo and copies its value before any change. Keeping
+            // its old elements would only force a copy of them.
             m_touched.push_back({key, m_single ? nullptr : key->second});
         }
     }

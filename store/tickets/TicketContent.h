@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a ticket holds, with the rules by which it is read and changed.
+// The content of a ticket, and the rules for reading and changing it.
 #pragma once
 
 #include <map>
@@ -16,8 +16,8 @@ namespace store {
 /// Which keys a transfer takes.
 class KeyFilter {
   public:
-    /// From a table ended by null, where a trailing * makes a prefix. A null or empty table stands
-    /// for all keys.
+    /// From a null-terminated table, in which a trailing * marks a prefix. A null or empty table
+    /// means all keys.
     explicit KeyFilter(const char* const* table = nullptr);
 
     bool all() const { return m_all; }
@@ -31,40 +31,40 @@ class KeyFilter {
     std::set<std::string> m_prefixes;
 };
 
-/// Keys in the order of strcmp, each with its elements. A copy is cheap: it shares the elements,
-/// and a change gives a key elements of its own.
+/// Keys in strcmp order with their elements. Copies are cheap: they share the elements, and a
+/// change gives a key its own elements.
 class TicketContent {
   public:
-    /// No key is there with a null pointer, except while a table is applied.
+    /// No pointer is null, except while a table is applied.
     using Keys = std::map<std::string, std::shared_ptr<Elements>, std::less<>>;
 
     const Keys& keys() const { return m_keys; }
     bool empty() const { return m_keys.empty(); }
 
-    /// Null for a key that isn't there.
+    /// Null for a missing key.
     std::shared_ptr<const Elements> find(std::string_view key) const;
 
-    /// The same keys with the same elements, bit by bit.
+    /// Whether the keys and their elements are equal, bit by bit.
     bool equals(const TicketContent& other) const;
 
-    /// Puts a key as it is in another place of keeping.
+    /// Adds a key from a storage, unchanged.
     void put(std::string key, std::shared_ptr<Elements> elements);
 
-    /// Carries out a table's records in their order and sets each one's result. A record that is
-    /// refused (see setElement; further a key that is empty or ends in *) leaves the others alone.
+    /// Applies a table's records in order and sets their results. A refused record (see setElement;
+    /// also keys that are empty or end in *) does not affect the others.
     ///
-    /// The table may point to keys and values of this very ticket. When memory runs out all is as
-    /// it was, no result is set, and the exception passes. A null table does nothing.
+    /// The table may point to keys and values of this ticket. If memory runs out, nothing changes,
+    /// no result is set, and the exception passes through. A null table does nothing.
     void apply(SETMULTIPAR* table);
 
-    /// The keys that the filter takes.
+    /// The keys that the filter accepts.
     TicketContent select(const KeyFilter& filter) const;
 
-    /// Each key of the source takes the place of the whole key here; with replace, all others go.
+    /// Each key of the source replaces the whole key here; `replace` removes all others.
     void transfer(const TicketContent& source, bool replace);
 
-    /// Shows each element, positions counted from 0, as long as the callback gives true. The
-    /// content must not change meanwhile.
+    /// Calls back for each element, with positions counted from 0, until the callback returns
+    /// false. The content must not change meanwhile.
     void walk(SCollect callback, void* context) const;
 
   private:

@@ -14,7 +14,7 @@ bool isHole(const Value& value) {
     return typeOf(value) == PARAM_DELETE;
 }
 
-/// Reads one of the elements that are numbers of the type that is asked for.
+/// Reads a number of the requested type.
 bool readNumber(const Elements& elements, void* out, int position) {
     const std::string& bytes = elements.numbers();
     const auto index = static_cast<std::size_t>(std::max(position, 0));
@@ -31,7 +31,7 @@ bool readNumber(const Elements& elements, void* out, int position) {
     return copy(std::integral_constant<std::size_t, 4>());
 }
 
-/// Reads what readNumber does not.
+/// Reads everything else.
 bool readValue(const Elements& key, PARAM_TYPE type, void* out, int position,
                HandedOut& handedOut) {
     if (type == PARAM_COUNT) {
@@ -43,7 +43,7 @@ bool readValue(const Elements& key, PARAM_TYPE type, void* out, int position,
         return true;
     }
     if (key.numberType() != PARAM_DELETE && type != PARAM_DELETE) {
-        return false; // Another type than the one that was asked for.
+        return false; // Not the requested type.
     }
     const Value* value = position == POSITION_WHOLE ? key.first() : key.at(position);
     if (value == nullptr) {
@@ -63,7 +63,7 @@ bool readValue(const Elements& key, PARAM_TYPE type, void* out, int position,
     return true;
 }
 
-/// Numbers are compared as they lie in memory: a NaN equals itself, and 0.0 does not equal -0.0.
+/// Compares the bytes of numbers: a NaN equals itself, and 0.0 does not equal -0.0.
 bool sameBits(const Value& a, const Value& b) {
     return a.index() == b.index() &&
            std::visit(
@@ -212,7 +212,7 @@ std::size_t Elements::nearLimit() const {
     return 64 + 4 * m_filled;
 }
 
-/// Moves over what m_near has grown towards.
+/// Moves elements to m_near that now fit there.
 void Elements::settle() {
     while (!m_far.empty() && static_cast<std::size_t>(m_far.begin()->first) < nearLimit()) {
         const auto next = m_far.begin();
@@ -229,7 +229,7 @@ bool setElement(std::shared_ptr<Elements>& key, PARAM_TYPE type, const void* val
     if (position < POSITION_APPEND || position > highestPosition) {
         return false;
     }
-    // Taken before anything changes: the value may stand in this very key.
+    // Copied before any change, because the value may be in this key.
     auto taken = takeValue(type, value);
     if (!taken) {
         return false;

@@ -13,41 +13,40 @@
 
 namespace store {
 
-inline constexpr int highestPosition = 0xFFFFFF; ///< 16,777,215; positions beyond are refused.
+inline constexpr int highestPosition = 0xFFFFFF; ///< 16,777,215; higher positions are refused.
 
-/// Values by position, with holes. Each element has a type of its own.
+/// Values by position, with holes. Each element has its own type.
 ///
 /// The count is the highest filled position plus one: the last position is never a hole.
 class Elements {
   public:
-    /// Numbers of one type, from PARAM_INT on, in positions from 0 on; bytes holds them as they lie
-    /// in memory, and not none of them.
+    /// Numbers of one type, starting with PARAM_INT, at positions from 0 on. `bytes` is their
+    /// memory image and must not be empty.
     static Elements ofNumbers(PARAM_TYPE type, std::string bytes);
 
     bool empty() const { return m_filled == 0; }
     /// At most highestPosition + 1.
     int count() const;
-    /// How many positions are filled.
+    /// The number of filled positions.
     int filled() const { return static_cast<int>(m_filled); }
 
-    /// Where all of it is what ofNumbers made, its type, else PARAM_DELETE. Such elements are read
-    /// from numbers() alone, which spares making a Value of each.
+    /// The type, if all elements are in the form of ofNumbers, otherwise PARAM_DELETE. Such
+    /// elements are read directly from numbers(), without creating a Value for each.
     PARAM_TYPE numberType() const { return m_numberType; }
     const std::string& numbers() const { return m_numbers; }
 
-    /// The same elements in the same places, bit by bit.
+    /// The same elements at the same positions, bit by bit.
     bool equals(const Elements& other) const;
 
-    /// Null for a hole and beyond the end.
+    /// Null for a hole and after the end.
     const Value* at(int position) const;
-    /// The element of the lowest position; null when there is none.
+    /// The element at the lowest filled position, or null.
     const Value* first() const;
 
-    /// Sets the element at a position from 0 to highestPosition. Positions that are passed over
-    /// become holes.
+    /// Sets the element at a position from 0 to highestPosition. Skipped positions become holes.
     void put(int position, Value value);
 
-    /// Makes room for that many more elements, where there are no holes so far.
+    /// Reserves room for `more` additional elements, if there are no holes.
     void reserve(int more) {
         const auto wanted = m_near.size() + static_cast<std::size_t>(more);
         if (m_near.size() == m_filled && wanted > m_near.capacity()) {
@@ -55,11 +54,11 @@ class Elements {
         }
     }
 
-    /// Takes out what stands at the position, be it a hole; what stands behind it moves up, and
-    /// holes that then end the key go. False beyond the end.
+    /// Removes the element or hole at the position. The following ones move up, and holes at the
+    /// new end are removed. False after the end.
     bool remove(int position);
 
-    /// Calls visit(position, value) for each element in ascending order as long as it gives true.
+    /// Calls visit(position, value) for each element in ascending order until it returns false.
     template<class Visit>
     void visit(Visit visit) const {
         unpack();
@@ -78,22 +77,22 @@ class Elements {
   private:
     std::size_t nearLimit() const;
     void settle();
-    /// Makes values of the numbers, for those who want values.
+    /// Converts the numbers to values when values are needed.
     void unpack() const;
 
-    // A lone element far out must not cost the memory of all the holes in front of it, whereas an
-    // array that is filled in any order is to end up as an array. So elements stand in m_near up to
-    // a size that follows from their number, and what lies beyond in m_far.
+    // A single distant element must not cost memory for all holes before it, but an array filled in
+    // any order must become an array. So elements are in m_near up to a size that depends on their
+    // number, and in m_far beyond that.
     mutable std::vector<Value> m_near;
     std::map<int, Value> m_far;
-    std::size_t m_filled = 0; ///< Elements in both, or numbers; holes not counted.
+    std::size_t m_filled = 0; ///< Elements in both, or numbers, without holes.
 
-    // Empty as soon as there are values.
+    // Empty if there are values.
     mutable std::string m_numbers;
     mutable PARAM_TYPE m_numberType = PARAM_DELETE;
 };
 
-/// Bytes that a number takes; 0 for a type that is none.
+/// Size of a number in bytes; 0 for a type that is not a number.
 constexpr std::size_t numberSize(PARAM_TYPE type) {
     switch (type) {
     case PARAM_INT:
@@ -108,7 +107,7 @@ constexpr std::size_t numberSize(PARAM_TYPE type) {
     }
 }
 
-/// The object itself where nobody else holds it, else a copy that takes its place.
+/// The object itself if nobody else uses it, otherwise a copy that replaces it.
 template<class T>
 T& own(std::shared_ptr<T>& shared) {
     if (!shared) {
@@ -119,18 +118,18 @@ T& own(std::shared_ptr<T>& shared) {
     return *shared;
 }
 
-/// Changes a key as one record of a table asks; a null pointer is a key that isn't there.
+/// Changes a key as one record of a table requires; a null pointer is a missing key.
 ///
-/// Position -1 set replaces the key by one element, -2 appends. Deleting with -1 succeeds in any
-/// case, an element only if it does not lie beyond the end, and with the last element the key goes.
-/// False, and the key is untouched, for a value that can't be kept and for any other position.
+/// A set at position -1 replaces the key by one element; -2 appends. Deleting at -1 always
+/// succeeds, deleting an element only up to the end; deleting the last one removes the key. For
+/// invalid values and other positions, returns false and changes nothing.
 bool setElement(std::shared_ptr<Elements>& key, PARAM_TYPE type, const void* value, int position);
 
-/// Reads from a key; null is a key that isn't there.
+/// Reads from a key; null is a missing key.
 ///
-/// A value is found only under its own type; position -1 means the first element. PARAM_DELETE asks
-/// for the type, to a place that may be null, and PARAM_COUNT, at position -1 only, for the count.
-/// False, and the place is untouched, when there is nothing or no place for a value.
+/// A value is found only with its own type. Position -1 means the first element. PARAM_DELETE reads
+/// the type, to a place that may be null; PARAM_COUNT, only at position -1, reads the count. If
+/// there is nothing, or no place for a value, returns false and leaves the place unchanged.
 bool readElement(const Elements* key, PARAM_TYPE type, void* out, int position,
                  HandedOut& handedOut);
 

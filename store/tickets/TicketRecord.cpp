@@ -9,14 +9,14 @@ namespace {
 
 using Tickets = std::unordered_map<const void*, std::shared_ptr<Ticket>>;
 
-/// By the address of their records. Never destroyed: tickets may be given back while the process
-/// ends.
+/// Tickets by the address of their records. Never destroyed, because tickets may be returned while
+/// the process ends.
 Tickets& tickets() {
     static auto& all = *new Tickets;
     return all;
 }
 
-/// Runs one word on the ticket; false for an unknown handle.
+/// Runs a function of the record on the ticket; false for an unknown handle.
 template<class Body>
 int on(void* handle, Body body) {
     return guarded([&] {
@@ -66,7 +66,7 @@ int setMultiParameter(void* handle, SETMULTIPAR* table) {
     });
 }
 
-/// A replacing transfer from nowhere empties the ticket all the same, and fails.
+/// A replacing transfer without a source still empties the ticket, and fails.
 int transfer(void* handle, const STICKET_ACCESS* source, const char* const* keys, int replace) {
     return on(handle, [&](Ticket& ticket) {
         const auto from = findTicket(source);

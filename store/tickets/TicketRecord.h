@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// One ticket behind the record of functions through which callers reach it.
+// One ticket and the record of functions through which callers access it.
 #pragma once
 
 #include <memory>
@@ -9,32 +9,32 @@
 
 namespace store {
 
-/// What the words of a ticket's record do. Running out of memory is an exception; the words turn it
-/// into a failure.
+/// The operations of a ticket's record. Running out of memory is an exception; the record's
+/// functions convert it to a failure.
 class Ticket {
   public:
     virtual ~Ticket() = default;
 
-    /// One element, as readElement tells.
+    /// Reads one element, as described for readElement.
     virtual bool get(const char* key, PARAM_TYPE type, void* out, int position) = 0;
 
-    /// The keys that the filter takes, for a transfer; null when the ticket is not there.
+    /// The keys that the filter accepts, for a transfer. Null if the ticket does not exist.
     virtual std::shared_ptr<const TicketContent> content(const KeyFilter& filter) = 0;
 
-    /// The whole ticket, for a walk; null when it is not there. Its keys and values stay at their
-    /// addresses until the ticket changes through this object, however often it is walked.
+    /// The whole ticket, for a walk. Null if it does not exist. Its keys and values keep their
+    /// addresses until the ticket is changed through this object, however often it is walked.
     virtual std::shared_ptr<const TicketContent> shown() = 0;
 
-    /// As TicketContent::apply tells. False, and no result is set, when the ticket is not there.
+    /// Like TicketContent::apply. If the ticket does not exist, returns false and sets no result.
     virtual bool apply(SETMULTIPAR* table) = 0;
     virtual bool transfer(const TicketContent& source, bool replace) = 0;
 
-    /// False, and the record is untouched, for a ticket that belongs to no container.
+    /// For a ticket that belongs to no container, returns false and leaves the record unchanged.
     virtual bool whoAmI(STICKET_OPTION_WHOAMI& record) = 0;
 };
 
-/// The record of a ticket. Its words find the ticket by the address of the record, so that a handle
-/// or a source that is no ticket (any more) is recognised without being looked into.
+/// The record of a ticket. Its functions find the ticket by the record's address, so handles and
+/// sources that are not (or no longer) tickets are recognised without reading them.
 class TicketRecord {
   public:
     explicit TicketRecord(std::shared_ptr<Ticket> ticket);
@@ -48,11 +48,11 @@ class TicketRecord {
     STICKET_ACCESS m_access{};
 };
 
-/// The ticket whose record stands at an address; null for anything else. Holding it keeps the
-/// ticket alive, be it destroyed from a callback of its own walk.
+/// The ticket with a record at this address, or null. The pointer keeps the ticket alive, even if
+/// it is destroyed in a callback of its own walk.
 std::shared_ptr<Ticket> findTicket(const void* record);
 
-/// Runs one word: false when memory runs out.
+/// Runs the body; false if memory runs out.
 template<class Body>
 bool guarded(Body body) {
     try {
@@ -63,8 +63,8 @@ bool guarded(Body body) {
     return false;
 }
 
-/// Reads a table's records one by one with get(key, type, out, position), and sets each one's
-/// result. A null table does nothing.
+/// Reads a table's records one by one with get(key, type, out, position) and sets their results. A
+/// null table does nothing.
 template<class Get>
 void getMultiple(GETMULTIPAR* table, Get get) {
     for (auto* record = table; record != nullptr && record->key != nullptr; ++record) {
@@ -86,7 +86,7 @@ bool setSingle(const char* key, PARAM_TYPE type, const void* value, int position
     return key != nullptr && apply(table) && table[0].ok();
 }
 
-/// Applies a table through apply(table). No result is set unless that was done.
+/// Applies a table through apply(table). If that fails, no result is set.
 template<class Apply>
 bool setMultiple(SETMULTIPAR* table, Apply apply) {
     if (table == nullptr) {

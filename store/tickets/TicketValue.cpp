@@ -20,7 +20,7 @@ static_assert(std::is_same_v<Kept<PARAM_POINTER>, void*> && std::is_same_v<Kept<
               std::is_same_v<Kept<PARAM_UINT>, unsigned int> &&
               std::is_same_v<Kept<PARAM_UINT64>, unsigned long long>);
 
-/// Callers' places are not always aligned.
+/// Callers' pointers may be unaligned.
 template<class T>
 T load(const void* from) {
     T value;

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// One value of a ticket, as the plug-in keeps it.
+// One value of a ticket, as stored by the plug-in.
 #pragma once
 
 #include <memory>
@@ -12,18 +12,18 @@
 
 namespace store {
 
-/// Bytes that never change, so that tickets share them and readers keep pointers into them.
+/// Immutable bytes, shared by tickets; readers keep pointers to them.
 struct Bytes {
     explicit Bytes(std::string bytes) : text(std::move(bytes)), view(text) {}
     Bytes(const Bytes&) = delete;
     Bytes& operator=(const Bytes&) = delete;
 
     const std::string text;
-    const BIN_STRING view; ///< On text; data is not null, even of no bytes.
+    const BIN_STRING view; ///< Of `text`; data is not null, even if empty.
 };
 using SharedBytes = std::shared_ptr<const Bytes>;
 
-/// A position of a key at which nothing stands.
+/// A position of a key without a value.
 struct Hole {};
 /// Bytes without a zero byte.
 struct Text {
@@ -34,7 +34,7 @@ struct Binary {
 };
 struct NeverKept {};
 
-/// The alternatives stand in the order of PARAM_TYPE, so that index() is the type.
+/// The alternatives are in the order of PARAM_TYPE, so index() is the type.
 using Value = std::variant<Hole, void*, int, double, Text, Binary, NeverKept, long long,
                            unsigned int, unsigned long long>;
 
@@ -42,8 +42,8 @@ inline PARAM_TYPE typeOf(const Value& value) {
     return static_cast<PARAM_TYPE>(value.index());
 }
 
-/// The texts and binaries that readers hold. Each lives until the object ends, and equal ones are
-/// kept once, so that the room grows with the number of different values only.
+/// The texts and binaries that readers use. Each lives as long as the object, and equal ones are
+/// kept once, so memory grows only with the number of different values.
 class HandedOut {
   public:
     const Bytes& keep(const SharedBytes& bytes);
@@ -57,14 +57,14 @@ class HandedOut {
     std::unordered_set<SharedBytes, Content, Content> m_bytes;
 };
 
-/// A copy of what a record of this type points to. Nothing when it can't be kept: a type that has
-/// no value, an unknown type, a null value except of a PARAM_POINTER, bytes that are nowhere.
+/// Copies the value that a record of this type points to. Nothing if it can't be stored: a type
+/// without values, an unknown type, a null value except for PARAM_POINTER, bytes without data.
 std::optional<Value> takeValue(PARAM_TYPE type, const void* value);
 
-/// The pointer that shows the value in a walk; it stays good as long as the value stands.
+/// The pointer that a walk shows for the value; valid as long as the value exists.
 const void* valuePointer(const Value& value);
 
-/// Writes the value to the place that a record of its type points to.
+/// Writes the value to the place for a record of its type.
 void giveValue(const Value& value, void* out, HandedOut& handedOut);
 
 } // namespace store

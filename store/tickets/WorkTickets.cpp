@@ -9,7 +9,7 @@ namespace store {
 
 namespace {
 
-/// Never destroyed: tickets may be given back, and texts read, while the process ends.
+/// Never destroyed: tickets may be returned, and texts read, while the process ends.
 HandedOut& handedOut() {
     static auto& all = *new HandedOut;
     return all;
@@ -28,7 +28,7 @@ class WorkTicket : public Ticket {
         return std::make_shared<TicketContent>(m_content->select(filter));
     }
 
-    /// A change of the ticket leaves it as it is while somebody holds it: see own().
+    /// A change does not affect the returned content: see own().
     std::shared_ptr<const TicketContent> shown() override { return m_content; }
 
     bool apply(SETMULTIPAR* table) override {
@@ -49,7 +49,7 @@ class WorkTicket : public Ticket {
 
 using WorkTickets = std::unordered_map<const STICKET_ACCESS*, std::unique_ptr<TicketRecord>>;
 
-/// As long-lived as the texts.
+/// Lives as long as the texts.
 WorkTickets& workTickets() {
     static auto& all = *new WorkTickets;
     return all;
