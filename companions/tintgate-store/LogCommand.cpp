@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <ctime>
 
+#include "base/Utf8.h"
 #include "companions/tintgate-store/Bytes.h"
 #include "companions/tintgate-store/Commands.h"
 #include "companions/tintgate-store/Credentials.h"
@@ -22,12 +23,13 @@ void show(const Invocation& invocation, const LogOptions& options) {
     std::vector<Row> rows;
     for (const auto& entry : invocation.open()->logEntries()) {
         if (entry.time >= since) {
-            rows.push_back({{"time", entry.time},
-                            {"at", shownTime(entry.time)},
-                            {"event", std::string(store::eventName(entry.event))},
-                            {"user", entry.who.empty() ? Row() : Row(shownName(entry.who))},
-                            {"origin", textOrBytes(entry.origin)},
-                            {"what", textOrBytes(entry.what)}});
+            rows.push_back(
+                {{"time", entry.time},
+                 {"at", shownTime(entry.time)},
+                 {"event", std::string(store::eventName(entry.event))},
+                 {"user", entry.who.empty() ? Row() : Row(base::utf8FromLatin1(entry.who))},
+                 {"origin", textOrBytes(entry.origin)},
+                 {"what", textOrBytes(entry.what)}});
         }
     }
     showRows({{"at", "TIME"},

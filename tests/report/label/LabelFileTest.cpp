@@ -161,7 +161,8 @@ TEST(LabelFile, StatesVerdictTitleConditionsAndSize) {
                    "プルーフ用紙",
                    "Workflow",
                    "",
-                   "anna"};
+                   "anna",
+                   ""};
     sample.result.verdict = report::Verdict::Incomplete;
     sample.result.presetName = "Contract proof";
     sample.result.target.statements = {{"Description", "FOGRA51"}};

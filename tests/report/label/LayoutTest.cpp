@@ -205,7 +205,8 @@ TEST(LabelLayout, ShrinksBeforeItDropsAndDropsInTheDocumentedOrder) {
                    "Paper",
                    "Workflow",
                    "",
-                   "anna"};
+                   "anna",
+                   ""};
     sample.result.presetName = "Preset";
     sample.result.target.statements = {{"Description", "Condition"}};
     sample.result.measurement.statements = {{"Printing", "Printer"}};

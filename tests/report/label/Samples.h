@@ -81,7 +81,8 @@ class LabelSamples {
                        text(),
                        text(),
                        "server",
-                       text()};
+                       text(),
+                       ""};
         for (std::size_t i = 0; i < label::fieldCount; ++i) {
             if (upTo(2) == 0) {
                 sample.details[static_cast<label::Field>(i)] = text();
