@@ -20,7 +20,7 @@ std::string stampOfNow() {
 /// The condition's name, and what the target says it is.
 std::string conditionText(const Aim& aim, const report::Result& result) {
     for (const auto& [label, text] : result.target.statements) {
-        if (label == "Description" && !text.empty()) {
+        if (label == "description" && !text.empty()) {
             return aim.condition + " (" + text + ")";
         }
     }

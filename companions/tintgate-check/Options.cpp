@@ -18,6 +18,7 @@ Examples:
   tintgate-check -t FOGRA39L proof.txt                against a known data set
   tintgate-check -c coated-proof *.txt                many
   tintgate-check -t FOGRA39L.ti3 -p contract-proof proof.txt --page
+  tintgate-check -c coated-proof proof.txt --label --operator Anna
   tintgate-check --watch /srv/exports -c coated-proof --out /srv/results
   tintgate-check --list                               conditions, presets, data sets
 
@@ -126,11 +127,14 @@ std::optional<int> readOptions(int argumentCount, char** arguments, Options& opt
     program.get_formatter()->column_width(column);
     addFiles(program, options);
     addOutputs(program, options);
+    LabelWords labels;
+    addLabelOptions(program, labels);
     addWatch(program, options);
     program.footer(std::string(footer) + tintgateCheckStatusHelp);
     try {
         program.parse(argumentCount, arguments);
         settle(program, options);
+        options.labels = readLabelWords(labels);
     } catch (const CLI::ParseError& failure) {
         return program.exit(failure) == 0 ? 0 : static_cast<int>(Status::BadCommand);
     }

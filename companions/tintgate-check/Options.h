@@ -7,6 +7,7 @@
 #include <vector>
 
 #include "companions/tintgate-check/Aim.h"
+#include "companions/tintgate-check/Labels.h"
 
 namespace check {
 
@@ -24,6 +25,7 @@ struct Options {
     std::string watch; ///< The folder; empty if nothing is watched.
     bool poll = false;
     double interval = 2; ///< Seconds between two rounds.
+    LabelWanted labels;
 };
 
 /// Reads the command line. Gives the exit status if the program ends here, after help was printed

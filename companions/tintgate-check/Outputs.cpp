@@ -9,6 +9,7 @@
 #include "ExitCodes.h"
 #include "base/Utf8.h"
 #include "base/WholeFile.h"
+#include "colour/ColourFile.h"
 #include "companions/tintgate-check/Words.h"
 #include "report/OwnFile.h"
 
@@ -17,22 +18,25 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// A further kind of output is a further row.
-struct Kind {
-    const char* ending;
-    report::OwnKind mark;
-};
-
-Kind kindOf(Output output) {
+/// Whether the file is an earlier output of this kind.
+bool isOwn(Output output, const std::string& path) {
+    constexpr std::size_t largestLabel = std::size_t{1} << 28;
     switch (output) {
     case Output::Page:
-        return {".html", report::OwnKind::Page};
-    case Output::Broken:
-        return {".error.json", report::OwnKind::Broken};
+        return report::isOwnFile(report::OwnKind::Page, path);
     case Output::Result:
+        return report::isOwnFile(report::OwnKind::Result, path);
+    case Output::Broken:
+        return report::isOwnFile(report::OwnKind::Broken, path);
+    case Output::Label:
+    case Output::Certificate:
         break;
     }
-    return {".json", report::OwnKind::Result};
+    std::error_code ignored;
+    std::string bytes;
+    return fs::is_regular_file(path, ignored) &&
+           colour::readWholeFile(path, largestLabel, bytes) == colour::Failure::None &&
+           label::isOurs(bytes);
 }
 
 Problem notWritten(const std::string& path, int reason) {
@@ -49,12 +53,30 @@ Problem notWritten(const std::string& path, int reason) {
 
 } // namespace
 
+std::string Outputs::endingOf(Output output) const {
+    switch (output) {
+    case Output::Page:
+        return ".html";
+    case Output::Result:
+        return ".json";
+    case Output::Broken:
+        return ".error.json";
+    case Output::Label:
+        return m_labels.format == label::Format::Png   ? ".label.png"
+               : m_labels.format == label::Format::Svg ? ".label.svg"
+                                                       : ".label.pdf";
+    case Output::Certificate:
+        break;
+    }
+    return ".pdf";
+}
+
 std::string Outputs::pathOf(const Measurement& measurement, Output output,
                             const std::string& mark) const {
     constexpr std::size_t longestName = 255;
     const fs::path place =
         m_folder.empty() ? fs::path(measurement.path) : fs::path(m_folder) / measurement.relative;
-    const std::string ending = (mark.empty() ? "" : "." + mark) + kindOf(output).ending;
+    const std::string ending = (mark.empty() ? "" : "." + mark) + endingOf(output);
     std::string name = place.stem();
     if (name.empty()) {
         name = "measurement";
@@ -78,7 +100,7 @@ std::optional<Problem> Outputs::check(const Measurement& measurement, Output out
         return Problem{
             exitOutputIsInput, say(Say::OutputIsInput, {path}), {}, say(Say::OutputIsInputRemedy)};
     }
-    if (!report::isOwnFile(kindOf(output).mark, path)) {
+    if (!isOwn(output, path)) {
         return Problem{
             exitOutputNotOurs, say(Say::OutputNotOurs, {path}), {}, say(Say::OutputNotOursRemedy)};
     }
@@ -86,7 +108,7 @@ std::optional<Problem> Outputs::check(const Measurement& measurement, Output out
 }
 
 void Outputs::claim(Measurement& measurement) {
-    if (m_page || m_result) {
+    if (m_page || m_result || m_labels.isAny()) {
         measurement.isSecond = !m_claimed.insert(pathOf(measurement, Output::Result)).second;
     }
 }

@@ -283,9 +283,12 @@ std::string resultText(const Outcome& outcome, const Aim& aim, bool isReferenceD
         text += wrapped("  - ", 4, advice, paint, width);
     }
     for (const std::string& path : outcome.written) {
-        const bool isPage = path.ends_with(".html");
+        const Say words = path.ends_with(".html")                     ? Say::PageIn
+                          : path.ends_with(".json")                   ? Say::ResultIn
+                          : path.find(".label.") != std::string::npos ? Say::LabelIn
+                                                                      : Say::CertificateIn;
         text += (path == outcome.written.front() ? "\n" : "") +
-                paint(Tone::Plain, say(isPage ? Say::PageIn : Say::ResultIn, {path})) + '\n';
+                paint(Tone::Plain, say(words, {path})) + '\n';
     }
     return text;
 }

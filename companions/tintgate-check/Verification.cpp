@@ -242,31 +242,62 @@ class Verifier {
     /// The result comes last: if it is there, all outputs are.
     void writeOutputs(const analysis::Comparison& comparison,
                       const analysis::Judgement& judgement) {
-        if (!m_outputs.wantsPage() && !m_outputs.wantsResult() && !m_wanted.result) {
+        const LabelWanted& labels = m_outputs.labels();
+        if (!m_outputs.wantsPage() && !m_outputs.wantsResult() && !m_wanted.result &&
+            !labels.isAny()) {
             return;
         }
         const std::string json =
             narrow(analysis::resultJson(comparison, judgement, m_aim.preset, m_aim.options));
-        if (m_outputs.wantsPage() || m_wanted.result) {
+        if (m_outputs.wantsPage() || m_wanted.result || labels.isAny()) {
             std::string problem;
             auto result = report::readResult(json, problem);
             if (!result) {
                 throw std::runtime_error(problem);
             }
-            const std::string page =
-                m_outputs.wantsPage()
-                    ? report::pageOf(*result, nullptr, languages::english(), factsOf(m_aim))
-                    : "";
+            const auto made = shown(*result, json);
             if (m_wanted.result) {
                 m_outcome.result = std::make_shared<report::Result>(std::move(*result));
             }
-            if (m_outputs.wantsPage() && !write(Output::Page, page)) {
+            for (const auto& [output, bytes] : made) {
+                if (!write(output, bytes)) {
+                    return;
+                }
+            }
+            if (m_outcome.problem) {
                 return;
             }
         }
         if (m_outputs.wantsResult()) {
             write(Output::Result, json);
         }
+    }
+
+    /// The outputs that show a result: page, label and certificate. What can't be drawn is missing,
+    /// and the outcome has a problem then.
+    std::vector<std::pair<Output, std::string>> shown(const report::Result& result,
+                                                      const std::string& json) {
+        std::vector<std::pair<Output, std::string>> made;
+        if (m_outputs.wantsPage()) {
+            made.emplace_back(Output::Page, report::pageOf(result, nullptr, languages::english(),
+                                                           factsOf(m_aim)));
+        }
+        try {
+            const LabelWanted& labels = m_outputs.labels();
+            if (labels.format) {
+                made.emplace_back(Output::Label, drawnLabel(labels, m_aim, result, json));
+            }
+            if (labels.certificate) {
+                made.emplace_back(Output::Certificate,
+                                  drawnCertificate(labels, m_aim, result, json));
+            }
+        } catch (const label::CannotDraw& failure) {
+            m_outcome.problem = Problem{exitResultNotWritten,
+                                        say(Say::LabelNotDrawn, {failure.what()}),
+                                        {},
+                                        say(Say::LabelNotDrawnRemedy)};
+        }
+        return made;
     }
 
     bool write(Output output, std::string_view text) {

@@ -73,7 +73,7 @@ class Watch {
     Watch(const Aim& aim, const WatchWanted& wanted)
         : m_aim(aim), m_wanted(wanted), m_root(rootOf(wanted.folder)),
           m_results(wanted.out.empty() ? m_root : wanted.out),
-          m_outputs(wanted.out, wanted.page, true, wanted.inputs),
+          m_outputs(wanted.out, wanted.page, true, wanted.labels, wanted.inputs),
           m_beforeRetry(static_cast<int>(1000 * wanted.interval * roundsBeforeRetry)) {
         lockResults();
         findResults();

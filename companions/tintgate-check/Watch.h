@@ -19,6 +19,7 @@ struct WatchWanted {
     unsigned threads = 1;
     bool json = false;
     std::vector<std::string> inputs; ///< Never written to.
+    LabelWanted labels = {};
 };
 
 /// Verifies what is in the folder and what arrives there, until SIGTERM or SIGINT.

@@ -27,6 +27,8 @@ constexpr Sentence english[] = {
     {Say::Note, "Note"},
     {Say::PageIn, "Page: {1}"},
     {Say::ResultIn, "Result: {1}"},
+    {Say::LabelIn, "Label: {1}"},
+    {Say::CertificateIn, "Certificate: {1}"},
     {Say::FactCondition, "Condition"},
     {Say::FactPrinter, "Printer"},
     {Say::FactPaper, "Paper"},
@@ -137,6 +139,8 @@ constexpr Sentence english[] = {
     {Say::OutputTwiceRemedy,
      "Measurements whose names differ only in their endings or folders need different names, or "
      "one run each with its own --out"},
+    {Say::LabelNotDrawn, "The label or certificate could not be drawn: {1}"},
+    {Say::LabelNotDrawnRemedy, "Install a font, such as the package fonts-dejavu-core."},
     {Say::OutputNotWritten, "{1} could not be written: {2}"},
     {Say::OutputFullRemedy, "Make room on the disk, or give a folder on another one with --out"},
     {Say::OutputForbiddenRemedy,

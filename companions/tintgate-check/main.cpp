@@ -121,7 +121,8 @@ bool isReferenceData(const Conditions& conditions, const std::string& path) {
 /// One file that was named: a whole screen.
 Status showOne(const Options& options, const Conditions& conditions, const Aim& aim,
                const report::Painter& paint, Printer& printer) {
-    Outputs outputs(options.out, options.page, options.result, inputsOf(conditions, aim));
+    Outputs outputs(options.out, options.page, options.result, options.labels,
+                    inputsOf(conditions, aim));
     const std::string& path = options.measurements.front();
     const Outcome outcome =
         verify(aim, {path, relativeOf(path)}, outputs, {.json = false, .result = true});
@@ -137,7 +138,8 @@ Status showOne(const Options& options, const Conditions& conditions, const Aim& 
 
 Status showMany(const Options& options, const Conditions& conditions, const Aim& aim,
                 const report::Painter& paint, Printer& printer) {
-    Outputs outputs(options.out, options.page, options.result, inputsOf(conditions, aim));
+    Outputs outputs(options.out, options.page, options.result, options.labels,
+                    inputsOf(conditions, aim));
     MeasurementWalk walk(options.measurements);
     Totals totals;
     const bool isTable = !options.json && !options.quiet;
@@ -176,7 +178,8 @@ Status watchFolder(const Options& options, const Conditions& conditions, const A
                    const report::Painter& paint, Printer& printer) {
     const WatchWanted wanted{
         options.watch,    options.out,     options.page, options.poll,
-        options.interval, options.threads, options.json, inputsOf(conditions, aim)};
+        options.interval, options.threads, options.json, inputsOf(conditions, aim),
+        options.labels};
     const auto start = [&] {
         if (!options.quiet && !options.json) {
             const std::string& results = options.out.empty() ? options.watch : options.out;

@@ -165,7 +165,7 @@ TEST(LabelFile, StatesVerdictTitleConditionsAndSize) {
                    ""};
     sample.result.verdict = report::Verdict::Incomplete;
     sample.result.presetName = "Contract proof";
-    sample.result.target.statements = {{"Description", "FOGRA51"}};
+    sample.result.target.statements = {{"description", "FOGRA51"}};
     sample.result.measurement.measurementCondition = "M1";
     sample.details = {{label::Field::Operator, "Anna Müller"}, {label::Field::Paper, "用紙235"}};
     const label::Drawn drawn = label::drawLabel(sample.subject(), {100, 50}, Format::Pdf);

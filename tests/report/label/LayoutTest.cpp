@@ -208,8 +208,8 @@ TEST(LabelLayout, ShrinksBeforeItDropsAndDropsInTheDocumentedOrder) {
                    "anna",
                    ""};
     sample.result.presetName = "Preset";
-    sample.result.target.statements = {{"Description", "Condition"}};
-    sample.result.measurement.statements = {{"Printing", "Printer"}};
+    sample.result.target.statements = {{"description", "Condition"}};
+    sample.result.measurement.statements = {{"printing", "Printer"}};
     sample.result.criteria.clear();
     for (int i = 0; i < 6; ++i) {
         report::Criterion criterion;

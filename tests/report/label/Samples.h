@@ -61,10 +61,10 @@ class LabelSamples {
         result.presetName = text();
         result.target.path = "/t/" + text();
         result.target.kind = one<std::string>({"text", "profile"});
-        result.target.statements = {{"Description", text()}};
+        result.target.statements = {{"description", text()}};
         result.measurement.path = "/m/" + text();
         result.measurement.measurementCondition = one<std::string>({"", "M0", "M1"});
-        result.measurement.statements = {{"Instrumentation", text()}, {"Printing", text()}};
+        result.measurement.statements = {{"instrumentation", text()}, {"printing", text()}};
         result.channels = {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
         addPatches(result, 1 + upTo(mostPatches - 1));
         addCriteria(result, upTo(mostCriteria));
