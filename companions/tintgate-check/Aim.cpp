@@ -74,11 +74,14 @@ std::vector<std::string> dataSetNames(const Conditions& conditions, bool withEnd
 std::string fileOf(const Conditions& conditions, const std::string& name, bool ofCommandLine) {
     const std::string path = ofCommandLine ? name : pathFrom(conditions, name);
     const bool isBare = path.find('/') == path.npos;
-    if (!isBare || (ofCommandLine && isThere(path))) {
+    if ((!isBare || ofCommandLine) && isThere(path)) {
         return path;
     }
-    if (const std::string found = findDataSet(conditions, path); !found.empty()) {
+    if (const std::string found = findDataSet(conditions, name); !found.empty()) {
         return found;
+    }
+    if (!isBare) {
+        return path; // which is reported as missing
     }
     if (conditions.find(name) != nullptr) {
         failName(say(Say::NoSuchDataSet, {name}), say(Say::PresetIsCondition, {name}));

@@ -87,6 +87,7 @@ printer = "Proofer 2"
         {{"-c", "a", "-p", "g7-colorspace"}, {"House.txt", "CVP_0006.xml", "", "a"}},
         {{"-c", "b", "-t", "tr003"}, {"icc/TR003.ti3", "CVP_0002.xml", "FOGRA39L.ti3", "b"}},
         {{"-t", "TR003.ti3"}, {"icc/TR003.ti3", "CVP_0001.xml", "", ""}},
+        {{"-t", "ghostscript/ps_cmyk.icc"}, {"ghostscript/ps_cmyk.icc", "CVP_0001.xml", "", ""}},
         {{"-t", "proof.txt", "-p", "3"}, {"proof.txt", "CVP_0003.xml", "", ""}},
         {{"-t", "proof.txt", "--patch-set", good}, {"proof.txt", "CVP_0001.xml", good, ""}},
     };
