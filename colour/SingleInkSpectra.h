@@ -11,7 +11,7 @@ namespace colour {
 /// Reads a text as readCgats does with wants.spectra, but spectra only of paper and of single inks;
 /// DataSet::spectrumRows names these. Most patches of a chart are overprints, and spectra are most
 /// of a text. Texts that are not a plain table (one row a line, one table) are read in full, and so
-/// are those without process inks and those whose colours are calculated from spectra.
+/// are those without process inks.
 Failure readWithSingleInkSpectra(std::string_view bytes, const CgatsWants& wants, DataSet& set);
 
 } // namespace colour

@@ -4,6 +4,7 @@
 #include <algorithm>
 #include <charconv>
 #include <cmath>
+#include <iterator>
 #include <limits>
 #include <numeric>
 
@@ -90,7 +91,10 @@ std::string missingText(const Criterion& criterion, const Texts& say) {
         return say("page.tooFewPatches",
                    {{"found", criterion.found}, {"needed", criterion.needed}});
     }
-    return criterion.name == "repeatSpread" ? say("page.noRepeats") : say("page.noSuchPatches");
+    if (criterion.name == "repeatSpread" || criterion.name == "repeatAverage") {
+        return say("page.noRepeats");
+    }
+    return criterion.unit == "dTV" ? say("page.noTints") : say("page.noSuchPatches");
 }
 
 Figure figureOf(const Criterion& criterion, const Result& result, const Texts& say) {
@@ -420,6 +424,149 @@ void addRepeats(Model& model, const Result& result, const Texts& say) {
     model.statistics.emplace_back(say("statistic.spread"), say.number(*repeats.largestDistance, 2));
 }
 
+// ---- Tone values, greys, repeated readings and paper
+
+constexpr const char* processInks[] = {"Cyan", "Magenta", "Yellow", "Black"};
+
+/// "Cyan", or the name that a channel after the process inks has.
+std::string inkTitle(const Result& result, std::size_t channel, const Texts& say) {
+    if (channel < std::size(processInks)) {
+        return say.find(std::string("measure.ink") + processInks[channel]).value_or("");
+    }
+    const std::string& name = result.channels[channel];
+    return name.starts_with("SPOT_") ? name.substr(5) : name;
+}
+
+bool isWithin(double nominal, double from, double to) {
+    constexpr double deviceTolerance = 0.5;
+    return nominal >= from - deviceTolerance && nominal <= to + deviceTolerance;
+}
+
+/// The narrowest tolerance of a tint; NaN without any. Criteria by name as docs/criteria.md has
+/// them.
+double toneTolerance(const Result& result, std::size_t channel, double nominal, bool isSpotTone) {
+    double narrowest = std::numeric_limits<double>::infinity();
+    for (const Criterion& criterion : result.criteria) {
+        bool applies = false;
+        if (isSpotTone) {
+            applies = criterion.name == "sctvMaximum" ||
+                      (criterion.name == "sctvSpotMaximum" && channel >= std::size(processInks));
+        } else if (const std::string stem = std::string("tone") + processInks[channel];
+                   criterion.name.starts_with(stem)) {
+            const std::string part = criterion.name.substr(stem.size());
+            applies =
+                part.empty() ||
+                (part == "Middle" && (isWithin(nominal, 40, 40) || isWithin(nominal, 50, 50))) ||
+                (part == "ThreeQuarters" && isWithin(nominal, 70, 80));
+        }
+        if (applies && criterion.used && criterion.tolerance) {
+            narrowest = std::min(narrowest, *criterion.tolerance);
+        }
+    }
+    return std::isfinite(narrowest) ? narrowest : std::numeric_limits<double>::quiet_NaN();
+}
+
+std::string aimText(const std::string& aims, const Texts& say) {
+    return aims == "target"    ? say("measure.aimTarget")
+           : aims == "nominal" ? say("measure.aimNominal")
+                               : say("measure.aimCurve", {{"curve", aims}});
+}
+
+void addTones(Model& model, const Result& result, const Tones& tones, bool isSpotTone,
+              const Texts& say) {
+    for (const InkTones& ink : tones.inks) {
+        if (ink.steps.empty() || (!isSpotTone && ink.channel >= std::size(processInks))) {
+            continue;
+        }
+        ToneChart& chart = model.tones.emplace_back();
+        chart.title = inkTitle(result, ink.channel, say);
+        if (isSpotTone) {
+            chart.title = say("measure.spotTone", {{"ink", chart.title}});
+        }
+        double largest = -1;
+        double where = 0;
+        for (const ToneStep& step : ink.steps) {
+            const double off = std::abs(step.measured - step.aim);
+            const double tolerance = toneTolerance(result, ink.channel, step.nominal, isSpotTone);
+            chart.points.push_back({step.nominal, step.measured - step.nominal,
+                                    step.aim - step.nominal, tolerance, off > tolerance});
+            if (off > largest) {
+                largest = off;
+                where = step.nominal;
+            }
+        }
+        chart.text =
+            say("measure.toneText", {{"aim", aimText(isSpotTone ? tones.aims : ink.aims, say)},
+                                     {"deviation", say.number(largest, 2)},
+                                     {"tint", say.number(where, decimalsOf(where, 0))}});
+    }
+}
+
+void addGreys(Model& model, const Result& result) {
+    model.greys = result.greys;
+    std::stable_sort(model.greys.begin(), model.greys.end(),
+                     [](const Grey& a, const Grey& b) { return a.tone < b.tone; });
+}
+
+void addSpreads(Model& model, const Result& result, const Texts& say) {
+    std::vector<RepeatedPatch> each = result.repeats.each;
+    std::stable_sort(each.begin(), each.end(), [](const RepeatedPatch& a, const RepeatedPatch& b) {
+        return a.largest > b.largest;
+    });
+    for (std::size_t i = 0; i < std::min(each.size(), mostSpreads); ++i) {
+        model.spreads.push_back(
+            {labelOf(result, each[i].patch, say), each[i].mean, each[i].largest});
+    }
+    if (each.size() > mostSpreads) {
+        model.spreadsText = say("measure.spreads", {{"drawn", mostSpreads}, {"all", each.size()}});
+    }
+}
+
+std::string labText(const std::optional<colour::Lab>& lab, const Texts& say) {
+    return lab ? say.number(lab->L, 2) + " " + say.number(lab->a, 2) + " " + say.number(lab->b, 2)
+               : dash;
+}
+
+void addPapers(Model& model, const Papers& papers, const Texts& say) {
+    PaperPair pair;
+    pair.sentence = papers.aims == "absolute"    ? say("measure.aimsAbsolute")
+                    : !papers.adjusted           ? say("measure.aimsUnadjusted")
+                    : papers.aims == "corrected" ? say("measure.aimsCorrected")
+                                                 : say("measure.aimsRelative");
+    pair.target = labText(papers.target, say);
+    pair.measured = labText(papers.measured, say);
+    pair.difference = say.number(papers.difference, 2);
+    pair.targetSwatch = swatch(papers.target.value_or(colour::Lab{}));
+    pair.measuredSwatch = swatch(papers.measured.value_or(colour::Lab{}));
+    model.papers = pair;
+}
+
+void addMeasures(Model& model, const Result& result, const Texts& say) {
+    Facts facts;
+    if (result.papers) {
+        addPapers(model, *result.papers, say);
+        addFact(facts, say("measure.aims"), model.papers->sentence);
+        addFact(facts, say("measure.targetPaper"), model.papers->target);
+        addFact(facts, say("measure.measuredPaper"), model.papers->measured);
+        addFact(facts, say("measure.paperDifference"), model.papers->difference);
+    }
+    if (result.tones) {
+        addTones(model, result, *result.tones, false, say);
+        addFact(facts, say("measure.toneValues"),
+                result.tones->method == "density"        ? say("measure.byDensity")
+                : result.tones->method == "colorimetric" ? say("measure.byColour")
+                                                         : "");
+    }
+    if (result.spotTones) {
+        addTones(model, result, *result.spotTones, true, say);
+    }
+    addGreys(model, result);
+    addSpreads(model, result, say);
+    if (!facts.empty()) {
+        model.sections.emplace(model.sections.end() - 1, say("measure.section"), facts);
+    }
+}
+
 void addHead(Model& model, const Result& result, const Meta* meta, const Texts& say) {
     const std::string& path = result.measurement.path;
     model.title = meta != nullptr ? jobTitle(*meta, say) : path.substr(path.rfind('/') + 1);
@@ -553,6 +700,9 @@ std::string fixedText(double value, int decimals) {
 std::string unitOf(const Criterion& criterion, const std::string& formula) {
     return criterion.unit == "dH"    ? "ΔH*ab"
            : criterion.unit == "dCh" ? "ΔCh"
+           : criterion.unit == "dL"  ? "ΔL*"
+           : criterion.unit == "dTV" ? "ΔTV"
+           : criterion.unit == "TV"  ? "%"
                                      : differenceUnit(formula);
 }
 
@@ -618,6 +768,7 @@ Model makeModel(const Result& result, const Meta* meta, const Texts& say, const 
     drawHistogram(model, result, say);
     chooseRows(model, result, say);
     addSections(model, result, meta, say);
+    addMeasures(model, result, say);
     if (!print.empty()) {
         for (const auto& [label, text] : print) {
             model.subtitle += (model.subtitle.empty() ? "" : " · ") + text;

@@ -5,6 +5,7 @@
 
 #include <cstddef>
 #include <cstdint>
+#include <optional>
 #include <string>
 #include <utility>
 #include <vector>
@@ -53,6 +54,39 @@ struct Row {
     Swatch measured;
 };
 
+/// One tint in a chart of tone values.
+struct TonePoint {
+    double nominal = 0;
+    double measured = 0; ///< Tone value less nominal, as is `aim`.
+    double aim = 0;
+    double tolerance = 0; ///< The narrowest that applies; NaN without one.
+    bool above = false;   ///< Further from the aim than that.
+};
+
+/// Tone values of one ink.
+struct ToneChart {
+    std::string title;
+    std::string text; ///< What the lines are, with the largest deviation.
+    std::vector<TonePoint> points;
+};
+
+/// A bar of the chart of repeated readings.
+struct SpreadBar {
+    std::string label;
+    double mean = 0;
+    double largest = 0;
+};
+
+/// The papers of both sides.
+struct PaperPair {
+    std::string sentence; ///< Which aims were judged.
+    std::string target;   ///< Lab, as is `measured`; "–" if it is not known.
+    std::string measured;
+    std::string difference;
+    Swatch targetSwatch;
+    Swatch measuredSwatch;
+};
+
 using Facts = std::vector<std::pair<std::string, std::string>>; ///< Label and text.
 
 struct Model {
@@ -82,12 +116,18 @@ struct Model {
     std::vector<std::size_t> drawn; ///< Indices of `rows` for the charts.
     std::string drawnText;          ///< Says so where the charts don't draw all.
     std::vector<std::pair<std::string, Facts>> sections; ///< Job, inputs, pairing, programs.
+    std::optional<PaperPair> papers; ///< These four only if the preset asks for them.
+    std::vector<ToneChart> tones;
+    std::vector<Grey> greys;        ///< By rising tone.
+    std::vector<SpreadBar> spreads; ///< The widest first, at most mostSpreads.
+    std::string spreadsText;
     std::string created; ///< Of the meta file, as a person reads it.
 };
 
 /// Charts draw all patches up to this number; beyond it, half of it from the worst and half evenly
 /// from the rest, which keeps a chart of any size quick and its outline true.
 inline constexpr std::size_t mostDrawn = 2000;
+inline constexpr std::size_t mostSpreads = 60;
 
 /// A page has all patches up to this number; beyond it, the worst of them (a page of a million rows
 /// would be 130 MB, and no one would look at its end).

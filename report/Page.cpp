@@ -76,6 +76,50 @@ Json marks(const std::vector<Mark>& marks) {
     return list;
 }
 
+Json finite(double value) {
+    return std::isfinite(value) ? Json(value) : Json();
+}
+
+/// [[title, text, [[nominal, measured, aim, tolerance, above], ...]], ...]
+Json tones(const std::vector<ToneChart>& charts) {
+    Json list = Json::array();
+    for (const ToneChart& chart : charts) {
+        Json points = Json::array();
+        for (const TonePoint& p : chart.points) {
+            points.push_back({finite(p.nominal), finite(p.measured), finite(p.aim),
+                              finite(p.tolerance), p.above});
+        }
+        list.push_back({chart.title, chart.text, points});
+    }
+    return list;
+}
+
+/// Null for a result that says nothing of these.
+Json measures(const Model& model, const Texts& say) {
+    if (!model.papers) {
+        return nullptr;
+    }
+    const PaperPair& papers = *model.papers;
+    Json greys = Json::array();
+    for (const Grey& grey : model.greys) {
+        greys.push_back({finite(grey.tone), finite(grey.measured.a), finite(grey.measured.b),
+                         finite(grey.aimA), finite(grey.aimB)});
+    }
+    Json spreads = Json::array();
+    for (const SpreadBar& bar : model.spreads) {
+        spreads.push_back({bar.label, finite(bar.mean), finite(bar.largest)});
+    }
+    return {{"aims", papers.sentence},
+            {"papers",
+             {{say("measure.targetPaper"), papers.target, swatchText(papers.targetSwatch)},
+              {say("measure.measuredPaper"), papers.measured, swatchText(papers.measuredSwatch)}}},
+            {"paperDifference", papers.difference},
+            {"tones", tones(model.tones)},
+            {"greys", greys},
+            {"spreads", spreads},
+            {"spreadsText", model.spreadsText}};
+}
+
 std::string dataOf(const Model& model, const Result& result, const Texts& say) {
     const Json head = {{"unit", model.unit},
                        {"all", result.patches.size()},
@@ -86,6 +130,7 @@ std::string dataOf(const Model& model, const Result& result, const Texts& say) {
                        {"histogramText", model.histogramText},
                        {"drawn", model.drawn},
                        {"drawnText", model.drawnText},
+                       {"measures", measures(model, say)},
                        {"channels", result.channels}};
     std::string text = inScript(head);
     text.back() = ',';

@@ -180,6 +180,52 @@ class Rows {
     bool m_uneven = false;
 };
 
+Tones tones(const Json& json) {
+    Tones tones;
+    if (const auto method = json.find("method"); method != json.end() && method->is_string()) {
+        tones.method = *method;
+    }
+    tones.aims = json.value("aims", "");
+    for (const Json& item : json.at("inks")) {
+        InkTones& ink = tones.inks.emplace_back();
+        ink.channel = count(item.at("channel"));
+        ink.aims = item.value("aims", "");
+        for (const Json& step : item.at("steps")) {
+            ink.steps.push_back(
+                {number(step.at(0)), number(step.at(1)), number(step.at(2)), count(step.at(4))});
+        }
+    }
+    return tones;
+}
+
+std::optional<colour::Lab> optionalLab(const Json& json) {
+    return json.is_null() ? std::nullopt : std::optional(lab(json));
+}
+
+/// What is there only if the preset asks for it.
+void fillMeasures(Result& result, const Json& json) {
+    if (const auto papers = json.find("papers"); papers != json.end()) {
+        result.papers = {papers->at("aims"), papers->at("adjusted"),
+                         optionalLab(papers->at("target")), optionalLab(papers->at("measured")),
+                         number(papers->at("difference"))};
+    }
+    if (const auto found = json.find("tones"); found != json.end()) {
+        result.tones = tones(*found);
+    }
+    if (const auto found = json.find("spotTones"); found != json.end()) {
+        result.spotTones = tones(*found);
+    }
+    if (const auto greys = json.find("greys"); greys != json.end()) {
+        constexpr double none = std::numeric_limits<double>::quiet_NaN();
+        for (const Json& row : greys->at("rows")) {
+            const Json& aim = row.at(4);
+            result.greys.push_back({count(row.at(0)), number(row.at(1)), lab(row.at(3)),
+                                    aim.is_null() ? none : number(aim.at(0)),
+                                    aim.is_null() ? none : number(aim.at(1))});
+        }
+    }
+}
+
 void checkFormat(const Json& json) {
     if (!json.is_object() || json.value("format", Json()) != "tintgate-result") {
         throw std::runtime_error("not a result");
@@ -221,7 +267,14 @@ void fill(Result& result, const Json& json) {
         result.repeats.readings = count(repeats->at("readings"));
         result.repeats.largestDistance = optionalNumber(repeats->at("largestDistance"));
         result.repeats.worstPatch = optionalCount(*repeats, "worstPatch");
+        if (const auto each = repeats->find("each"); each != repeats->end()) {
+            for (const Json& row : *each) {
+                result.repeats.each.push_back(
+                    {count(row.at(0)), count(row.at(1)), number(row.at(2)), number(row.at(3))});
+            }
+        }
     }
+    fillMeasures(result, json);
     for (const Json& item : json.at("criteria")) {
         result.criteria.push_back(criterion(item));
     }
@@ -242,6 +295,27 @@ void checkWorstPatches(const Result& result) {
     }
     if (result.repeats.worstPatch && *result.repeats.worstPatch >= result.patches.size()) {
         throw std::runtime_error("the repeats name a patch that is not there");
+    }
+    const auto check = [&](std::size_t patch) {
+        if (patch >= result.patches.size()) {
+            throw std::runtime_error("a measure names a patch that is not there");
+        }
+    };
+    for (const RepeatedPatch& repeated : result.repeats.each) {
+        check(repeated.patch);
+    }
+    for (const Grey& grey : result.greys) {
+        check(grey.patch);
+    }
+    for (const auto* tones : {&result.tones, &result.spotTones}) {
+        for (const InkTones& ink : tones->has_value() ? (*tones)->inks : std::vector<InkTones>()) {
+            if (ink.channel >= result.channels.size()) {
+                throw std::runtime_error("tone values of an ink that is not there");
+            }
+            for (const ToneStep& step : ink.steps) {
+                check(step.patch);
+            }
+        }
     }
 }
 

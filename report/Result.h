@@ -20,7 +20,7 @@ enum class Outcome { Pass, Fail, Unanswered, Unjudged };
 struct Criterion {
     std::string name; ///< Such as "average"; docs/criteria.md lists them.
     std::string title;
-    std::string unit; ///< "dE", "dH" or "dCh".
+    std::string unit; ///< "dE", "dH", "dCh", "dL" or "dTV".
     bool used = false;
     Outcome outcome = Outcome::Unjudged;
     std::optional<double> tolerance;
@@ -62,6 +62,53 @@ struct Warning {
     std::string code = {};  ///< docs/result.md lists them; empty for one that a program adds.
 };
 
+/// One tint of an ink. NaN where the result has null.
+struct ToneStep {
+    double nominal = 0;
+    double measured = 0;
+    double aim = 0;
+    std::size_t patch = 0; ///< Index into `patches`.
+};
+
+struct InkTones {
+    std::size_t channel = 0;
+    std::string aims; ///< "target", "A", "B" or "C"; empty for spot colour tone values.
+    std::vector<ToneStep> steps;
+};
+
+/// Tone values, of results under presets that ask for them.
+struct Tones {
+    std::string method; ///< "density", "colorimetric", or empty without tone values.
+    std::string aims;   ///< Of spot colour tone values: "nominal" or "target".
+    std::vector<InkTones> inks;
+};
+
+/// A balanced grey.
+struct Grey {
+    std::size_t patch = 0;
+    double tone = 0; ///< Nominal cyan.
+    colour::Lab measured;
+    double aimA = 0; ///< NaN if the paper is not known, as is `aimB`.
+    double aimB = 0;
+};
+
+/// The papers of both sides, and which aims were judged because of them.
+struct Papers {
+    std::string aims; ///< "absolute", "corrected" or "relative".
+    bool adjusted = false;
+    std::optional<colour::Lab> target;
+    std::optional<colour::Lab> measured;
+    double difference = 0; ///< CIEDE2000; NaN if one of them is not known.
+};
+
+/// One patch that was measured more than once.
+struct RepeatedPatch {
+    std::size_t patch = 0;
+    std::size_t readings = 0;
+    double mean = 0; ///< Distance of its readings from their mean.
+    double largest = 0;
+};
+
 /// Patches that were measured more than once. Distances are of a reading from the mean of its
 /// patch's readings.
 struct Repeats {
@@ -70,6 +117,7 @@ struct Repeats {
     std::size_t readings = 0; ///< Of these patches.
     std::optional<double> largestDistance;
     std::optional<std::size_t> worstPatch; ///< Index into `patches` of the result.
+    std::vector<RepeatedPatch> each;       ///< Empty unless the preset asks for it.
 };
 
 struct Statistics {
@@ -106,6 +154,10 @@ struct Result {
     std::vector<Criterion> criteria;
     std::vector<Warning> warnings;
     Repeats repeats;
+    std::optional<Papers> papers; ///< These four only if the preset asks for them.
+    std::optional<Tones> tones;
+    std::optional<Tones> spotTones;
+    std::vector<Grey> greys;
     Unpaired unpairedTarget;
     Unpaired unpairedMeasurement;
     Unpaired unpairedPatchSet;

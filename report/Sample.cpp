@@ -27,6 +27,32 @@ void addInks(Sample& sample, const Result& result) {
     }
     sample.inks = measured.means();
     sample.aims = aimed.means();
+    // Adjusted aims make both papers one, and relative colours lose theirs.
+    if (result.papers && result.papers->adjusted) {
+        sample.inks[static_cast<std::size_t>(Ink::Paper)] = result.papers->measured;
+        sample.aims[static_cast<std::size_t>(Ink::Paper)] = result.papers->target;
+    }
+}
+
+/// The tone value at 50 percent of each process ink that has this tint.
+void addToneValues(Sample& sample, const Tones& tones) {
+    constexpr double half = 50;
+    for (const InkTones& ink : tones.inks) {
+        for (const ToneStep& step : ink.steps) {
+            if (ink.channel + 1 >= inkCount || !near(step.nominal, half)) {
+                continue;
+            }
+            const std::string name = inkName(allInks[ink.channel + 1]);
+            Criterion figure;
+            figure.name = toneAtHalf + name;
+            figure.title = "Tone value at 50 %, " + name;
+            figure.unit = "TV";
+            figure.value = step.measured;
+            figure.patches = 1;
+            sample.criteria.push_back(figure);
+            break;
+        }
+    }
 }
 
 std::string statementOf(const Input& input, const char* wanted) {
@@ -111,6 +137,9 @@ Sample sampleOf(const Result& result, const Meta* meta) {
     sample.formula = result.formula;
     sample.verdict = result.verdict;
     sample.criteria = result.criteria;
+    if (result.tones) {
+        addToneValues(sample, *result.tones);
+    }
     // RGB and the like have channels that are no process inks.
     if (result.channels.size() >= 4 && result.channels[0].ends_with("C") &&
         result.channels[3].ends_with("K")) {

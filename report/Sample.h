@@ -69,6 +69,10 @@ struct Sample {
     std::string page;                ///< Bytes: where the job's page is, relative to the trend's.
 };
 
+/// What the names of the tone values at 50 percent begin with, which sampleOf adds to the criteria:
+/// figures of each process ink, in percent, never judged.
+inline constexpr const char* toneAtHalf = "toneAtHalf";
+
 /// Without time and page. `meta` may be null; then instrument and title come from the measurement.
 Sample sampleOf(const Result& result, const Meta* meta);
 

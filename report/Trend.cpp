@@ -259,6 +259,8 @@ std::vector<CriterionTrend> criterionTrends(const std::vector<const Sample*>& sa
             if (std::find(names.begin(), names.end(), criterion.name) == names.end()) {
                 names.push_back(criterion.name);
                 trends.emplace_back().title = titleOf(criterion, say);
+                trends.back().followed =
+                    criterion.name == "midToneSpread" || criterion.name.starts_with(toneAtHalf);
                 trends.back().unit = unitOf(criterion, sample->formula);
             }
         }

@@ -53,7 +53,8 @@ struct InkTrend {
 struct CriterionTrend {
     std::string title;
     std::string unit;
-    bool used = false; ///< By at least one job.
+    bool used = false;     ///< By at least one job.
+    bool followed = false; ///< Shown with the used ones: tone values at 50 %, mid-tone spread.
     int decimals = 2;
     std::vector<double> values;    ///< One a job, as judged; NaN for none.
     std::vector<Outcome> outcomes; ///< One a job.

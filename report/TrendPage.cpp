@@ -100,6 +100,7 @@ std::string criterionData(const CriterionTrend& criterion) {
     Part part({{"title", criterion.title},
                {"unit", criterion.unit},
                {"used", criterion.used},
+               {"followed", criterion.followed},
                {"decimals", criterion.decimals},
                {"latest", criterion.latest},
                {"tolerance", criterion.tolerance},

@@ -321,11 +321,13 @@
     drawHistogram();
     drawPlane();
     drawLightness();
+    charts.push(...measures.draw());
     byId("drawn").textContent = data.drawnText;
   }
 
   showPatches();
   for (const section of document.querySelectorAll(".drawn")) section.hidden = false;
+  measures.show(data.measures);
   byId("plane").setAttribute("aria-label", say("page.planeText"));
   byId("lightness").setAttribute("aria-label", say("page.lightnessText"));
   drawAlways(drawCharts);

@@ -248,8 +248,11 @@
         parsing: false, normalized: true, spanGaps: true,
         plugins: { tooltip: tooltip((i) => `${fixed(criterion.values[i], criterion.decimals)} ${
           criterion.unit}, ${words[series.jobs[i][VERDICT]]}`) },
-        scales: { x: timeScale(), y: { type: "linear", min: 0,
-          suggestedMax: 1.25 * Math.max(...limits, 0.1), ticks: { ...ticks, maxTicksLimit: 6 } } },
+        // A tone value has no limit, and a scale from 0 would show nothing of its changes.
+        scales: { x: timeScale(), y: criterion.unit === "%"
+          ? { type: "linear", grace: "20%", ticks: { ...ticks, maxTicksLimit: 6 } }
+          : { type: "linear", min: 0, suggestedMax: 1.25 * Math.max(...limits, 0.1),
+            ticks: { ...ticks, maxTicksLimit: 6 } } },
       },
       plugins: [toleranceLine(criterion), ...(many ? [dots([marks])] : [])],
     }));
@@ -339,8 +342,8 @@
     for (const chart of charts) chart.destroy();
     charts = [];
     for (const id of ["criteria", "others", "drift"]) byId(id).replaceChildren();
-    const used = series.criteria.filter((criterion) => criterion.used);
-    const others = series.criteria.filter((criterion) => !criterion.used);
+    const used = series.criteria.filter((criterion) => criterion.used || criterion.followed);
+    const others = series.criteria.filter((criterion) => !criterion.used && !criterion.followed);
     for (const criterion of used) drawCriterion(byId("criteria"), criterion);
     byId("more").hidden = others.length === 0;
     byId("more").firstElementChild.textContent = say("trend.more", { count: others.length });

@@ -104,15 +104,17 @@ std::string inksText(const report::Series& series, const Painter& paint, const T
 std::string criteriaText(const report::Series& series, const Painter& paint, const Texts& say) {
     std::vector<std::vector<Cell>> lines;
     for (const report::CriterionTrend& criterion : series.criteria) {
-        if (criterion.used) {
-            lines.push_back(
-                {{criterion.title},
-                 {criterion.latest, Tone::Bold, true},
-                 {say("text.of", {{"tolerance", criterion.tolerance}}), Tone::Plain, true},
-                 {criterion.unit, Tone::Soft},
-                 {say("text.failures",
-                      {{"failed", criterion.failed}, {"answered", criterion.answered}}),
-                  criterion.failed != 0 ? Tone::Failed : Tone::Soft}});
+        if (criterion.used || criterion.followed) {
+            const bool isLimited = !criterion.tolerance.empty();
+            lines.push_back({{criterion.title},
+                             {criterion.latest, Tone::Bold, true},
+                             {isLimited ? say("text.of", {{"tolerance", criterion.tolerance}}) : "",
+                              Tone::Plain, true},
+                             {criterion.unit, Tone::Soft},
+                             {isLimited ? say("text.failures", {{"failed", criterion.failed},
+                                                                {"answered", criterion.answered}})
+                                        : "",
+                              criterion.failed != 0 ? Tone::Failed : Tone::Soft}});
         }
     }
     return lines.empty() ? "" : '\n' + tableText(lines, paint);

@@ -610,3 +610,61 @@ TEST(CgatsText, FindsKeywordsInUnfinishedTexts) {
         EXPECT_EQ(cgatsKeyword(text, "DEVICE"), expected) << text;
     }
 }
+
+// Whatever way they are found, spectra of paper and single inks are those of a full reading.
+TEST(CgatsText, SpectraOfSingleInksAreThoseOfAFullReading) {
+    std::string names = "SAMPLE_ID CMYK_C CMYK_M CMYK_Y CMYK_K LAB_L LAB_A LAB_B";
+    for (int nm = 400; nm <= 700; nm += 20) {
+        names += " SPECTRAL_NM" + std::to_string(nm);
+    }
+    const auto rowsOf = [](double full) {
+        std::string rows;
+        int number = 0;
+        for (const char* inks : {"0 0 0 0", "40 30 0 0", "100 0 0 0", "0 0 0 0.4", "0 50 50 50",
+                                 "0 0 0 70", "0 0.4 0.4 100"}) {
+            rows += "A" + std::to_string(++number) + ' ' + inks + " 60 0 0";
+            for (int i = 0; i < 16; ++i) {
+                rows += ' ' + std::to_string(full * (0.2 + 0.01 * i + 0.05 * number));
+            }
+            rows += '\n';
+        }
+        return rows;
+    };
+    const std::string text = table(names, rowsOf(1));
+    const std::string noInks = replaced(replaced(names, "CMYK_C", "A"), "CMYK_M", "B");
+    const struct {
+        const char* what;
+        std::string text;
+        bool some; ///< Not all spectra are read.
+    } cases[] = {
+        {"plain", text, true},
+        {"percent", table(names, rowsOf(100)), true},
+        {"comments and blank lines", replaced(text, "A3", "# one\n\n\t\nA3"), true},
+        {"CRLF",
+         replaced(replaced(text, "\nBEGIN_DATA\n", "\r\nBEGIN_DATA  \r\n"), "END_DATA\n",
+                  "END_DATA \r\n"),
+         true},
+        {"rows over several lines", replaced(text, "A2 40", "A2\n40"), false},
+        {"no process inks", table(noInks, rowsOf(1)), false},
+        {"another light", table(names, rowsOf(1), "CGATS.17\nILLUMINANT D65\n"), true},
+    };
+    for (const auto& [what, given, some] : cases) {
+        SCOPED_TRACE(what);
+        DataSet full, part;
+        const Failure expected = readCgats(given, {}, full);
+        ASSERT_EQ(readCgats(given, {.singleInks = true}, part), expected);
+        if (expected != Failure::None) {
+            continue;
+        }
+        EXPECT_EQ(part.axis.length, full.axis.length);
+        EXPECT_EQ(part.spectrumRows.empty(), !some);
+        EXPECT_EQ(part.notes, full.notes);
+        EXPECT_EQ(part.device, full.device);
+        for (const std::size_t row : {0, 2, 3, 5, 6}) {
+            ASSERT_NE(part.spectrumOf(row), nullptr) << row;
+            EXPECT_TRUE(
+                std::equal(part.spectrumOf(row), part.spectrumOf(row) + 16, full.spectrumOf(row)));
+        }
+        EXPECT_EQ(part.spectrumOf(1) == nullptr, some);
+    }
+}

@@ -11,6 +11,7 @@
 
 #include "ScratchFolder.h"
 #include "report/Model.h"
+#include "report/Sample.h"
 
 namespace {
 
@@ -144,6 +145,62 @@ TEST(Model, SaysFirstWhatFailedAndByHowMuch) {
     EXPECT_THAT(makeModel(result, nullptr).sentence, HasSubstr("comparison itself is in doubt"));
     result.criteria.clear();
     EXPECT_THAT(makeModel(result, nullptr).sentence, HasSubstr("judges no criterion"));
+}
+
+// Members of a result that are there only if its preset asks for them.
+const std::string measures =
+    R"("papers": {"aims": "corrected", "adjusted": true, "target": [95, 1, -4],
+                  "measured": [93, 0, -1], "difference": 2.9, "darkest": null},
+       "tones": {"method": "density", "inks": [
+           {"channel": 0, "aims": "target", "steps": [[40, 54, 53, 1, 0], [50, 69.5, 64, 1, 1]]},
+           {"channel": 1, "aims": "A", "steps": []}], "midToneSpreads": []},
+       "spotTones": {"aims": "nominal", "inks": [
+           {"channel": 0, "steps": [[75, 76, 75, 1, 2]]}]},
+       "greys": {"weights": "equal", "rows": [[2, 50, 1, [58, 0.4, -2], [0.5, -2]],
+                                              [1, 25, 1, [70, 0.4, -2], null]]},
+       "repeats": {"patches": 2, "readings": 5, "largestDistance": 2, "worstPatch": 1,
+                   "each": [[0, 2, 0.5, 0.5], [1, 3, 1, 2]]},
+       "statistics")";
+
+TEST(Measures, BecomeChartsAndATrend) {
+    std::string problem;
+    const std::string text =
+        with(support::contentsOf(data + "output.json"), "\"statistics\"", measures);
+    auto result = readResult(text, problem);
+    ASSERT_TRUE(result) << problem;
+    for (const auto& [name, tolerance] : {std::pair{"toneCyan", 9.0},
+                                          {"toneCyanMiddle", 4.0},
+                                          {"toneCyanThreeQuarters", 1.0},
+                                          {"toneBlack", 0.5}}) {
+        result->criteria.push_back(criterion(name, tolerance, 1, Outcome::Pass));
+    }
+    const Model model = makeModel(*result, nullptr);
+    ASSERT_EQ(model.tones.size(), 2U); // none of an ink without tints
+    EXPECT_THAT(model.tones[0].text, HasSubstr("the target’s · largest deviation 5.50 at 50 %"));
+    EXPECT_EQ(model.tones[0].points[0].measured, 14);
+    EXPECT_EQ(model.tones[0].points[0].aim, 13);
+    EXPECT_EQ(model.tones[0].points[0].tolerance, 4); // the narrowest of those for this tint
+    EXPECT_FALSE(model.tones[0].points[0].above);
+    EXPECT_TRUE(model.tones[0].points[1].above);
+    EXPECT_TRUE(std::isnan(model.tones[1].points[0].tolerance)); // SCTV has a limit of its own
+    EXPECT_EQ(model.greys[0].tone, 25);
+    EXPECT_TRUE(std::isnan(model.greys[0].aimA));
+    EXPECT_THAT(model.spreads[0].label, HasSubstr(result->patches[1].id));
+    EXPECT_THAT(model.papers->sentence, HasSubstr("corrected for the measured paper"));
+    EXPECT_EQ(model.papers->measured, "93.00 0.00 -1.00");
+
+    const Sample sample = sampleOf(*result, nullptr);
+    EXPECT_EQ(sample.criteria.back().name, "toneAtHalfCyan");
+    EXPECT_EQ(sample.criteria.back().value, 69.5);
+    EXPECT_EQ(sample.inks[0]->L, 93); // of the papers, not of the patches
+    EXPECT_EQ(sample.aims[0]->b, -4);
+
+    for (const auto& [from, to] : {std::pair{"[50, 69.5, 64, 1, 1]", "[50, 69.5, 64, 1, 9]"},
+                                   {"[[2, 50,", "[[9, 50,"},
+                                   {"[1, 3, 1, 2]", "[9, 3, 1, 2]"},
+                                   {"\"channel\": 1", "\"channel\": 7"}}) {
+        EXPECT_FALSE(readResult(with(text, from, to), problem)) << to;
+    }
 }
 
 TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
