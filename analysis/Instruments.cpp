@@ -34,18 +34,17 @@ std::optional<unsigned int> numberOf(std::string_view text) {
 /// The folder of this library, with a slash at the end.
 std::string ownFolder() {
     Dl_info self{};
-    if (!::dladdr(reinterpret_cast<const void*>(&instrumentName), &self) || !self.dli_fname) {
+    if (!::dladdr(reinterpret_cast<const void*>(&instrumentOfDefinition), &self) ||
+        !self.dli_fname) {
         return {};
     }
     const std::string path = self.dli_fname;
     return path.substr(0, path.rfind('/') + 1);
 }
 
-std::string namesFile() {
-    if (const char* const named = std::getenv("TINTGATE_INSTRUMENTS")) {
-        return named;
-    }
-    return ownFolder() + TINTGATE_PRESETS_FROM_LIBRARY "/instruments.txt";
+std::string namesFile(const std::string& presets) {
+    const char* const named = std::getenv("TINTGATE_INSTRUMENTS");
+    return named != nullptr ? named : presets + "/instruments.txt";
 }
 
 /// The name of `id` in the lines of a names file. Empty if there is none.
@@ -69,8 +68,13 @@ std::string_view nameIn(std::string_view lines, unsigned int id) {
 } // namespace
 
 std::string instrumentName(unsigned int id) {
+    return instrumentName(id, ownFolder() + TINTGATE_PRESETS_FROM_LIBRARY);
+}
+
+std::string instrumentName(unsigned int id, const std::string& presets) {
     std::string lines;
-    if (colour::readWholeFile(namesFile(), largestNamesFile, lines) == colour::Failure::None) {
+    if (colour::readWholeFile(namesFile(presets), largestNamesFile, lines) ==
+        colour::Failure::None) {
         if (const std::string_view name = nameIn(lines, id); !name.empty()) {
             return std::string(name);
         }

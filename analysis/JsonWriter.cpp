@@ -1,6 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
 #include "analysis/JsonWriter.h"
-#include "base/Utf8.h"
 
 #include <algorithm>
 #include <array>
@@ -8,6 +7,8 @@
 #include <cmath>
 #include <cstring>
 #include <utility>
+
+#include "base/Utf8.h"
 
 namespace analysis {
 namespace {
@@ -29,7 +30,7 @@ bool needsNoEscape(char c) {
 }
 
 char* writePair(char* at, std::uint32_t below100) {
-    std::memcpy(at, &digitPairs[below100 * 2], 2);
+    std::memcpy(at, &digitPairs[std::size_t{below100} * 2], 2);
     return at + 2;
 }
 

@@ -638,7 +638,7 @@ LastRead& lastRead() {
 
 /// Takes over what a file states, but for what a job chooses itself.
 void take(const Preset& read, bool keepJobChoice, Record& preset) {
-    Record taken = read;
+    Record taken = static_cast<const Record&>(read);
     taken.filePath = preset.filePath;
     taken.reserved1 = preset.reserved1;
     taken.reserved2 = preset.reserved2;

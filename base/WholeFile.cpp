@@ -134,4 +134,9 @@ bool writeWholeFile(const std::string& path, std::string_view bytes) {
            draft.replace(target);
 }
 
+bool replaceWholeFile(const std::string& path, std::string_view bytes) {
+    FileDraft draft(path);
+    return draft.isOpen() && draft.write(bytes) && draft.replace(path);
+}
+
 } // namespace base

@@ -35,4 +35,8 @@ std::string withoutLinks(const std::string& path);
 /// old file is unchanged.
 bool writeWholeFile(const std::string& path, std::string_view bytes);
 
+/// Same, but a link is replaced and not followed, and so are the permissions: for folders in which
+/// others can put files.
+bool replaceWholeFile(const std::string& path, std::string_view bytes);
+
 } // namespace base

@@ -23,10 +23,7 @@ add_library(wx INTERFACE)
 target_link_libraries(wx INTERFACE wxheaders ${_wx_libs})
 
 pkg_check_modules(lcms2 REQUIRED IMPORTED_TARGET lcms2)
-# Opened when a property list is read, so only the headers are needed to build.
-pkg_check_modules(libplist REQUIRED libplist-2.0)
-add_library(libplistheaders INTERFACE)
-target_include_directories(libplistheaders SYSTEM INTERFACE ${libplist_INCLUDE_DIRS})
+pkg_check_modules(libplist REQUIRED IMPORTED_TARGET libplist-2.0)
 pkg_check_modules(sqlite3 REQUIRED IMPORTED_TARGET sqlite3)
 pkg_check_modules(libsodium REQUIRED IMPORTED_TARGET libsodium)
 pkg_check_modules(expat REQUIRED IMPORTED_TARGET expat)

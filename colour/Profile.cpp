@@ -75,8 +75,8 @@ std::string descriptionOf(cmsHPROFILE profile) {
                       sizeof units - sizeof units[0]);
     std::string text;
     for (std::size_t i = 0; units[i]; ++i) {
-        auto point = static_cast<std::uint32_t>(units[i]);
-        const auto next = static_cast<std::uint32_t>(units[i + 1]);
+        auto point = static_cast<char32_t>(units[i]);
+        const auto next = static_cast<char32_t>(units[i + 1]);
         if (point >= 0xD800 && point < 0xDC00 && next >= 0xDC00 && next < 0xE000) {
             point = 0x10000 + ((point - 0xD800) << 10) + (next - 0xDC00);
             ++i;

@@ -111,7 +111,7 @@ std::unique_ptr<StoreEngine> openForLogin(const std::string& address) {
     try {
         return openStoreAt(address);
     } catch (const StoreFailure& failure) {
-        if (failure.fault == Fault::Newer || failure.fault == Fault::Older) {
+        if (failure.status == Fault::Newer || failure.status == Fault::Older) {
             throw;
         }
         throw StoreFailure(Fault::Missing, failure.what());

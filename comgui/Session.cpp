@@ -30,7 +30,7 @@ void put(void* to, const T& value) {
 } // namespace
 
 Code codeOf(const StoreFailure& failure) {
-    switch (failure.fault) {
+    switch (failure.status) {
     case Fault::Newer:
         return Code::StoreIsNewer;
     case Fault::Older:
@@ -57,7 +57,7 @@ std::unique_ptr<StoreEngine> openStoreAt(const std::string& address) {
     } catch (const StoreFailure& failure) {
         const bool ascii =
             std::all_of(address.begin(), address.end(), [](unsigned char c) { return c < 0x80; });
-        if (failure.fault != Fault::Missing || ascii) {
+        if (failure.status != Fault::Missing || ascii) {
             throw;
         }
     }

@@ -77,9 +77,9 @@ void readMeasurementKeys(JobLoad& load, int code) {
     load.ticket.read("Workflow/Name", &job.workflowName);
     load.ticket.read(measurementKey(load.strip, "Status"), 0, &job.measurementStatus);
     load.ticket.read(subTypeKey, 0, &load.subType);
-    if (job.measurementWorkflow == 3 && job.measurementStatus > 0) {
+    if (mayUseStored(job.measurementWorkflow, job.measurementStatus)) {
         int patches = 0;
-        load.ticket.read(measurementKey(load.strip, "Reference/Numpatches"), 0, &patches);
+        load.ticket.read(referenceKey(load.strip, "Numpatches"), 0, &patches);
         load.hasStoredReferences = patches >= 1;
     }
 }

@@ -49,8 +49,13 @@ enum class ReferenceWay {
     None,
 };
 
+/// True if references in the ticket are looked for: those of a strip that was measured.
+constexpr bool mayUseStored(int workflow, int measurementStatus) {
+    return workflow == 3 && measurementStatus > 0;
+}
+
 /// The first source whose condition is true. `workflow` is the value of workflowKey. References are
-/// stored if the strip was measured and the ticket has at least one.
+/// stored if mayUseStored, and the ticket has at least one.
 constexpr ReferenceWay referenceWay(bool fromPackaging, int workflow, bool isDynamic,
                                     bool hasStored) {
     return fromPackaging && workflow == 4                   ? ReferenceWay::Packaging

@@ -24,7 +24,6 @@
 #include <string_view>
 
 #include "job/JobRecords.h"
-#include "measure/NumberText.h"
 #include "measure/Paths.h"
 
 namespace {
@@ -63,6 +62,9 @@ Fields fieldsOf(const measurementDataRecord& measurement) {
     return fields;
 }
 
+/// Room for "-1.2345678e-308", which has everything that a number can have.
+constexpr int longestNumber = 16;
+
 /// Rows of data, one after the other.
 class Row {
   public:
@@ -74,7 +76,9 @@ class Row {
     void add(std::span<const double> values) {
         for (const double value : values) {
             *m_end++ = '\t';
-            m_end = writeNumberText(m_end, value, m_precision);
+            m_end = std::to_chars(m_end, m_end + longestNumber, value, std::chars_format::general,
+                                  m_precision)
+                        .ptr;
         }
     }
 
@@ -87,7 +91,7 @@ class Row {
     static constexpr int mostValues = 4 + 3 + 3 + spectralValueCount;
 
     // The number of a patch takes no more than a value does.
-    std::array<char, (1 + mostValues) * (1 + longestNumberText)> m_text;
+    std::array<char, (1 + mostValues) * (1 + longestNumber)> m_text;
     char* m_end = m_text.data();
     int m_precision = 6;
 };

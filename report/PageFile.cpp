@@ -49,12 +49,4 @@ std::string keepPage(const std::string& folder, const std::string& stem, std::st
     return {};
 }
 
-bool replacePage(const std::string& path, std::string_view page, std::string& problem) {
-    if (base::writeWholeFile(path, page)) {
-        return true;
-    }
-    problem = std::strerror(errno);
-    return false;
-}
-
 } // namespace report

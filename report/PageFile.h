@@ -20,8 +20,4 @@ std::string pageStem(const Meta& meta);
 std::string keepPage(const std::string& folder, const std::string& stem, std::string_view page,
                      std::string& problem);
 
-/// Writes a page to `path`, in place of the one that is there, whole as above. False with the
-/// reason in `problem` where that fails; then an old page still stands.
-bool replacePage(const std::string& path, std::string_view page, std::string& problem);
-
 } // namespace report

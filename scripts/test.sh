@@ -1,7 +1,8 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
 # Builds everything and runs all tests, first as delivered, then under the address and
-# undefined-behaviour sanitizers. Arguments select other presets by name.
+# undefined-behaviour sanitizers, and lints what differs from main. Arguments select other presets
+# by name.
 set -euo pipefail
 cd "$(dirname "$0")/.."
 
@@ -16,3 +17,4 @@ for preset in "${presets[@]}"; do
   cmake --build --preset "$preset"
   ctest --preset "$preset" --parallel "$(nproc)"
 done
+scripts/lint.sh

@@ -70,12 +70,6 @@ std::vector<std::string> keysIn(const SETMULTIPAR* table) {
     return keys;
 }
 
-void clearResults(SETMULTIPAR* table) {
-    for (; table->key != nullptr; ++table) {
-        table->result = 0;
-    }
-}
-
 } // namespace
 
 CachingStorage::CachingStorage(std::shared_ptr<StoreEngine> engine, NoteFailure note)

@@ -12,11 +12,11 @@
 #include <map>
 #include <memory>
 #include <optional>
-#include <stdexcept>
 #include <string>
 #include <string_view>
 #include <vector>
 
+#include "base/Failure.h"
 #include "store/JobOverview.h"
 #include "store/tickets/TicketContent.h"
 
@@ -42,12 +42,7 @@ enum class Fault {
 
 /// A failure of a store. Whatever was under way is undone, but see Lost. The text is one for
 /// people.
-class StoreFailure : public std::runtime_error {
-  public:
-    StoreFailure(Fault fault, const std::string& text) : std::runtime_error(text), fault(fault) {}
-
-    const Fault fault;
-};
+using StoreFailure = base::Failure<Fault>;
 
 /// How long a change waits for the changes of others before it fails with Fault::Busy.
 inline constexpr int longestWaitMilliseconds = 10'000;

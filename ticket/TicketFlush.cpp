@@ -109,7 +109,7 @@ void TICKET_UPDATE_LIST::OneFlushToContainer(const MTICKET_ADMIN& admin, unsigne
                                              const TICKET_UPDATE_CALLBACK& callback,
                                              const STICKET_MODIFY& scratch, int& type, int& id,
                                              const ENTRY& entry, bool& anyOk) {
-    clTICKET_UPDATE_LOG log("TicketUpdate.txt");
+    clTICKET_UPDATE_LOG log(ticket::updateLogName);
     log.printf("FlushToContainer() (%d, %d)", type, id);
     if (!TICKET_TYPE_Valid(type)) {
         const int from = type;

@@ -11,8 +11,6 @@
 
 namespace {
 
-constexpr const char* logName = "TicketUpdate.txt";
-
 constexpr int firstVirtualID = -9999;
 constexpr int lastVirtualID = -2000;
 
@@ -55,12 +53,6 @@ void logValue(clTICKET_UPDATE_LOG& log, PARAM_TYPE type, const void* value) {
             return;
         }
     }
-}
-
-/// True for the types that carry values, which a walk shows and a list stores.
-bool carriesValue(PARAM_TYPE type) {
-    return (type >= PARAM_POINTER && type <= PARAM_BINARY) ||
-           (type >= PARAM_INT64 && type <= PARAM_UINT64);
 }
 
 /// Inserts an entry with a work ticket, or returns the existing one.
@@ -133,12 +125,12 @@ int TICKET_UPDATE_LIST::NextTicketID() {
     if (nextID > lastVirtualID) {
         nextID = firstVirtualID;
     }
-    clTICKET_UPDATE_LOG(logName).printf("NextTicketID() %d\n", id);
+    clTICKET_UPDATE_LOG(ticket::updateLogName).printf("NextTicketID() %d\n", id);
     return id;
 }
 
 bool TICKET_UPDATE_LIST::GetActualTicketID(int& real, int virtualId) const {
-    clTICKET_UPDATE_LOG log(logName);
+    clTICKET_UPDATE_LOG log(ticket::updateLogName);
     const auto found = m_idMap.find(virtualId);
     if (found == m_idMap.end()) {
         real = -1;
@@ -169,7 +161,7 @@ bool TICKET_UPDATE_LIST::TicketValid(int& type, int id) {
 
 bool TICKET_UPDATE_LIST::xSetParameter(int type, int id, const char* key, PARAM_TYPE ptype,
                                        const void* value, int position, bool broadcast) {
-    clTICKET_UPDATE_LOG log(logName);
+    clTICKET_UPDATE_LOG log(ticket::updateLogName);
     log.printf("(%d, %d) %s[%d] <", type, id, key != nullptr ? key : "(NULL)", position);
     logValue(log, ptype, value);
 
@@ -391,7 +383,7 @@ void TICKET_UPDATE_LIST::MergeAll(int type, int id, const STICKET_ACCESS* source
 
 bool TICKET_UPDATE_LIST::CollectAction(void* context, const char* key, PARAM_TYPE type,
                                        const void* value, int position) {
-    if (carriesValue(type)) {
+    if (ticket::isValueType(type)) {
         const auto& action = *static_cast<FULL_COLLECT_ACTION*>(context);
         action.list->xSetParameter(action.type, action.id, key, type, value, position, true);
     }
@@ -406,7 +398,7 @@ bool UPDATE_PARTIAL_COLLECT_ACTION::SetParameter(const char* key, PARAM_TYPE pty
 
 bool UPDATE_PARTIAL_COLLECT_ACTION::CollectAction(void* context, const char* key, PARAM_TYPE type,
                                                   const void* value, int position) {
-    if (carriesValue(type)) {
+    if (ticket::isValueType(type)) {
         static_cast<UPDATE_PARTIAL_COLLECT_ACTION*>(context)->SetParameter(key, type, value,
                                                                            position);
     }
@@ -446,7 +438,7 @@ void TICKET_UPDATE_LIST::GetChangedTickets(std::vector<TICKET_TYPE_ID>& tickets)
 }
 
 void TICKET_UPDATE_LIST::Clear() {
-    clTICKET_UPDATE_LOG(logName).printf("Clear()\n");
+    clTICKET_UPDATE_LOG(ticket::updateLogName).printf("Clear()\n");
     m_changed.clear();
     m_toDelete.clear();
     m_empty = true;

@@ -12,3 +12,9 @@ class clTICKET_UPDATE_LOG {
     void printf(const char* format, ...) __attribute__((format(printf, 2, 3)));
     void close();
 };
+
+namespace ticket {
+
+inline constexpr const char* updateLogName = "TicketUpdate.txt";
+
+} // namespace ticket

@@ -188,9 +188,9 @@ bool Examination::openStore() {
     try {
         m_engine = store::openStore(m_address);
     } catch (const store::StoreFailure& failure) {
-        const int code = failure.fault == store::Fault::Newer   ? exitLoginServerNewer
-                         : failure.fault == store::Fault::Older ? exitLoginServerOlder
-                                                                : exitLoginNoServer;
+        const int code = failure.status == store::Fault::Newer   ? exitLoginServerNewer
+                         : failure.status == store::Fault::Older ? exitLoginServerOlder
+                                                                 : exitLoginNoServer;
         add("store " + m_address, std::string(failure.what()) + ".", {code});
         return end(code);
     }

@@ -218,8 +218,8 @@ std::int32_t ReadOnlyServer::getFile(const char* local, const char* server) {
             }
         } catch (const store::StoreFailure& failure) {
             using store::Fault;
-            if (failure.fault == Fault::Lost || failure.fault == Fault::Busy ||
-                failure.fault == Fault::Damaged) {
+            if (failure.status == Fault::Lost || failure.status == Fault::Busy ||
+                failure.status == Fault::Damaged) {
                 throw; // The failure affects more than this file.
             }
             file.problem = failure.what();

@@ -142,7 +142,7 @@ void measure(const std::string& optionsFile, RunLog& log) {
         measurement.created = timeText(std::chrono::system_clock::now());
     }
     checkCancelled();
-    if (!base::writeWholeFile(options.output, colour::writeCgats(measurement))) {
+    if (!base::replaceWholeFile(options.output, colour::writeCgats(measurement))) {
         throw Failure(Status::NotWritten,
                       "can't write " + options.output + ": " + std::strerror(errno));
     }

@@ -2,10 +2,10 @@
 // What keeps something from being done, for people: never a bare number.
 #pragma once
 
-#include <stdexcept>
 #include <string>
 
 #include "CompanionStatuses.h"
+#include "base/Failure.h"
 
 namespace check {
 
@@ -28,12 +28,11 @@ Problem problemOf(int code);
 Problem problemOfFile(int code, const std::string& path);
 
 /// Ends the run.
-class Failure : public std::runtime_error {
+class Failure : public base::Failure<Status> {
   public:
     Failure(Status status, Problem problem)
-        : std::runtime_error(problem.what), status(status), problem(std::move(problem)) {}
+        : base::Failure<Status>(status, problem.what), problem(std::move(problem)) {}
 
-    const Status status;
     const Problem problem;
 };
 

@@ -5,8 +5,10 @@
 #include <cstdlib>
 #include <sstream>
 
+#include "analysis/Instruments.h"
 #include "analysis/Presets.h"
 #include "colour/CgatsText.h"
+#include "companions/tintgate-report/CheckPreset.h"
 #include "jobkeys/Lookups.h"
 #include "jobkeys/ServerPaths.h"
 #include "jobkeys/Tickets.h"
@@ -22,7 +24,7 @@ std::string fileOf(store::StoreEngine& store, const std::string& path) {
     try {
         store.getFile(path, bytes);
     } catch (const store::StoreFailure& failure) {
-        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath) {
+        if (failure.status != store::Fault::NoFile && failure.status != store::Fault::BadPath) {
             throw;
         }
         return {};
@@ -34,7 +36,7 @@ std::string nameOf(int device) {
     if (device <= 0) {
         return {};
     }
-    return GetInstrumentNameFromID(static_cast<unsigned>(device)).utf8_string();
+    return analysis::instrumentName(static_cast<unsigned>(device), installedPresets());
 }
 
 } // namespace

@@ -155,9 +155,9 @@ Target Targets::of(const store::TicketContent& job, Strip strip, std::int64_t ti
         return integerOf(job.find(key)).value_or(0);
     };
     const int patches = number(referenceKey(strip, "Numpatches"));
-    const bool hasStored = number(stripKey(strip, workflowKey)) == 3 &&
-                           number(measurementKey(strip, "Status")) > 0 && patches > 0 &&
-                           patches <= mostPatches;
+    const bool hasStored = mayUseStored(number(stripKey(strip, workflowKey)),
+                                        number(measurementKey(strip, "Status"))) &&
+                           patches > 0 && patches <= mostPatches;
     const std::string path = pathOf(job, strip, hasStored);
     if (!path.empty()) {
         return ofFile(path, time);
@@ -198,7 +198,7 @@ std::vector<Targets::Content>& Targets::contentsOf(const std::string& path) {
             contents.push_back({version.time, version.number, std::nullopt});
         }
     } catch (const store::StoreFailure& failure) {
-        if (failure.fault != store::Fault::NoFile && failure.fault != store::Fault::BadPath) {
+        if (failure.status != store::Fault::NoFile && failure.status != store::Fault::BadPath) {
             throw;
         }
     }
@@ -222,7 +222,7 @@ Target Targets::read(const std::string& path, int version) {
             m_store.getFile(path, bytes);
         }
     } catch (const store::StoreFailure& failure) {
-        if (failure.fault != store::Fault::NoFile) {
+        if (failure.status != store::Fault::NoFile) {
             throw;
         }
         return target;

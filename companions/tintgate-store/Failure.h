@@ -2,10 +2,8 @@
 // How a command of tintgate-store ends.
 #pragma once
 
-#include <stdexcept>
-#include <string>
-
 #include "CompanionStatuses.h"
+#include "base/Failure.h"
 #include "store/StoreEngine.h"
 
 namespace admin {
@@ -13,12 +11,7 @@ namespace admin {
 using Status = TintgateStoreStatus; ///< Listed in docs/companion-statuses.csv.
 
 /// Ends a command. The text is a sentence for people, without a full stop.
-class Failure : public std::runtime_error {
-  public:
-    Failure(Status status, const std::string& text) : std::runtime_error(text), status(status) {}
-
-    const Status status;
-};
+using Failure = base::Failure<Status>;
 
 constexpr Status statusOf(store::Fault fault) {
     switch (fault) {

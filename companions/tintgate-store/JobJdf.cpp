@@ -63,7 +63,7 @@ bool isThere(store::StoreEngine& store, const std::string& path) {
     try {
         contentOf(store, path);
     } catch (const store::StoreFailure& failure) {
-        if (failure.fault != store::Fault::NoFile) {
+        if (failure.status != store::Fault::NoFile) {
             throw;
         }
         return false;

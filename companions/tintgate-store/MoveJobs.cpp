@@ -184,8 +184,8 @@ void MoveJobs::copyShared(const std::set<int>& jobs) {
                 m_from.getFile(path, spool.toWrite());
                 m_to.placeVersion(path, {0, file->size, file->time}, spool.toRead());
             } catch (const store::StoreFailure& failure) {
-                if (failure.fault != store::Fault::BadPath &&
-                    failure.fault != store::Fault::NoFile) {
+                if (failure.status != store::Fault::BadPath &&
+                    failure.status != store::Fault::NoFile) {
                     throw;
                 }
             }

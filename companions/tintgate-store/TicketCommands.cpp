@@ -113,7 +113,7 @@ void importAll(const Invocation& invocation, const ImportOptions& options) {
             try {
                 import(*store, ticket, options.merge);
             } catch (const store::StoreFailure& failure) {
-                throw Failure(statusOf(failure.fault),
+                throw Failure(statusOf(failure.status),
                               std::string(failure.what()) + " (at " + textOf(ticket.name) + "; " +
                                   std::to_string(count) + " of " + std::to_string(tickets.size()) +
                                   " tickets are in)");

@@ -99,7 +99,7 @@ int run(admin::Invocation& invocation, std::string& error) {
     } catch (const admin::Failure& failure) {
         return fail(failure.status, failure.what(), error);
     } catch (const store::StoreFailure& failure) {
-        return fail(admin::statusOf(failure.fault), failure.what(), error);
+        return fail(admin::statusOf(failure.status), failure.what(), error);
     } catch (const std::bad_alloc&) {
         return fail(Status::Full, "there is not enough memory", error);
     } catch (const std::filesystem::filesystem_error& failure) {

@@ -1,8 +1,10 @@
 // SPDX-License-Identifier: Apache-2.0
 // Shows a verified job: creates a page of its result and opens it. The tool looks for this program
 // at "/Applications/Nerova/Nerova Verify.app/Contents/MacOS/Nerova Verify" below the system root.
+#include <cerrno>
 #include <csignal>
 #include <cstdio>
+#include <cstring>
 #include <new>
 #include <optional>
 #include <string>
@@ -130,11 +132,9 @@ int showIndex() {
     const std::string working = temporary + "/Tintgate";
     const std::string folder = access(working.c_str(), W_OK | X_OK) == 0 ? working : temporary;
     const std::string path = folder + "/reports.html";
-    std::string problem;
     const languages::Texts say(languages::languageOfUser());
-    if (!report::replacePage(path, report::indexOf(report::reportsBelow(folder), folder, say),
-                             problem)) {
-        return fail(Status::PageNotWritten, "can't write " + path + ": " + problem);
+    if (!base::replaceWholeFile(path, report::indexOf(report::reportsBelow(folder), folder, say))) {
+        return fail(Status::PageNotWritten, "can't write " + path + ": " + std::strerror(errno));
     }
     return show(path);
 }

@@ -346,7 +346,7 @@ void Connection::connectAnew(Clock::time_point end) {
             return;
         } catch (const StoreFailure& failure) {
             why = failure.what();
-            if (failure.fault == Fault::Newer || failure.fault == Fault::Older) {
+            if (failure.status == Fault::Newer || failure.status == Fault::Older) {
                 break; // It is another store now.
             }
         }

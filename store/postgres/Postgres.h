@@ -213,7 +213,7 @@ class Connection {
             try {
                 return work();
             } catch (const StoreFailure& failure) {
-                if (failure.fault != Fault::Lost) {
+                if (failure.status != Fault::Lost) {
                     throw;
                 }
                 call.noteLoss();

@@ -5,7 +5,7 @@
 // ticket's row, fetches what it needs, writes, and commits. That is one round trip if no old value
 // is needed, otherwise two.
 #include <algorithm>
-#include <ctime>
+#include <chrono>
 #include <map>
 #include <utility>
 
@@ -151,24 +151,6 @@ User userIn(const Result& rows, int row) {
     return {rows.text(row, 0), rows.text(row, 1), rows.number(row, 2) != 0};
 }
 
-/// For ages. It is looked at for each read of a listing, of which the exact clock would be a third.
-struct CoarseClock {
-    using duration = std::chrono::nanoseconds;
-    using rep = duration::rep;
-    using period = duration::period;
-    using time_point = std::chrono::time_point<CoarseClock>;
-    [[maybe_unused]] static constexpr bool is_steady = true;
-
-    /// A tick of the system, by which it is late at most.
-    static constexpr std::chrono::milliseconds coarseness{10};
-
-    static time_point now() {
-        timespec now{};
-        clock_gettime(CLOCK_MONOTONIC_COARSE, &now);
-        return time_point(std::chrono::seconds(now.tv_sec) + duration(now.tv_nsec));
-    }
-};
-
 class PostgresEngine : public StoreEngine {
   public:
     explicit PostgresEngine(Connection connection) : m_connection(std::move(connection)) {}
@@ -181,8 +163,8 @@ class PostgresEngine : public StoreEngine {
     }
 
     std::uint64_t commits(std::chrono::milliseconds age) override {
-        const auto now = CoarseClock::now();
-        const bool asks = now - m_asked > age - CoarseClock::coarseness;
+        const auto now = std::chrono::steady_clock::now();
+        const bool asks = now - m_asked >= age;
         if (m_snapshot.empty() || (asks && !isStillCurrent())) {
             noteChange();
         } else if (asks) {
@@ -317,7 +299,7 @@ class PostgresEngine : public StoreEngine {
         m_connection.repeating([&] {
             forgetFormerServer();
             // The snapshot first: what is committed between the two only has it all fetched again.
-            m_asked = CoarseClock::now();
+            m_asked = std::chrono::steady_clock::now();
             m_connection.send(snapshot);
             m_connection.send(allBlocks);
             const auto results = m_connection.finish();
@@ -701,7 +683,7 @@ class PostgresEngine : public StoreEngine {
     unsigned m_generation = 0;
     std::uint64_t m_commits = 0;
     std::string m_snapshot; ///< Of the last overview; empty once somebody has committed since.
-    CoarseClock::time_point m_asked; ///< When that was still the server's.
+    std::chrono::steady_clock::time_point m_asked; ///< When that was still the server's.
     Ids m_ids;
     std::vector<LogEntry> m_toLog;
     bool m_logs = true;

@@ -158,7 +158,7 @@ State stateOf(Connection& connection) {
         }
     } catch (const StoreFailure& failure) {
         // No such schema or table, or none that this user may read.
-        if (failure.fault != Fault::Damaged && failure.fault != Fault::ReadOnly) {
+        if (failure.status != Fault::Damaged && failure.status != Fault::ReadOnly) {
             throw;
         }
     }

@@ -120,7 +120,7 @@ Descriptor walk(const Descriptor& from, const std::vector<std::string>& folders,
 }
 
 bool isMissing(const StoreFailure& failure) {
-    return failure.fault == Fault::NoFile;
+    return failure.status == Fault::NoFile;
 }
 
 /// Names in a folder, in byte order.

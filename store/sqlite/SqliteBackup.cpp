@@ -111,7 +111,7 @@ void backUp(Database& database, ServerFiles& files, const std::string& storeFold
                 writers.emplace(storeFolder + "/tickets.db", Opening::Existing);
                 keptOut.emplace(*writers);
             } catch (const StoreFailure& failure) {
-                if (failure.fault != Fault::ReadOnly) {
+                if (failure.status != Fault::ReadOnly) {
                     throw;
                 }
                 keptOut.reset(); // Nobody can write.

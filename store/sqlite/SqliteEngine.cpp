@@ -144,7 +144,7 @@ OpenedDatabase openDatabase(const std::string& folder, Access access, std::int64
         if (access != Access::Read) {
             throw;
         }
-        if (failure.fault == Fault::Full) {
+        if (failure.status == Fault::Full) {
             Database database(path, Opening::Existing);
             database.run("PRAGMA locking_mode = EXCLUSIVE"); // The index is then in memory.
             checkKind(database, folder, kind);
@@ -585,7 +585,7 @@ class SqliteEngine : public StoreEngine {
             const ReadTransaction transaction(m_database);
             found.tickets = verifyTickets(m_database, show);
         } catch (const StoreFailure& failure) {
-            if (failure.fault != Fault::Damaged) {
+            if (failure.status != Fault::Damaged) {
                 throw;
             }
             show(databaseName, failure.what());
@@ -893,7 +893,7 @@ std::unique_ptr<StoreEngine> openSqliteCopy(const std::string& address) {
     try {
         return std::make_unique<SqliteCopy>(realPath(address));
     } catch (const StoreFailure& failure) {
-        if (failure.fault != Fault::Missing) {
+        if (failure.status != Fault::Missing) {
             throw;
         }
     }

@@ -17,12 +17,6 @@ bool startsWith(std::string_view text, std::string_view prefix) {
     return text.substr(0, prefix.size()) == prefix;
 }
 
-void clearResults(SETMULTIPAR* table) {
-    for (; table->key != nullptr; ++table) {
-        table->result = 0;
-    }
-}
-
 /// Whether a record and the next one begin an array of numbers.
 bool beginsArray(const SETMULTIPAR* record) {
     return numberSize(record->type) != 0 && record->position == 0 && record[1].position == 1 &&
@@ -48,6 +42,12 @@ std::shared_ptr<Elements> takeArray(SETMULTIPAR*& record) {
 }
 
 } // namespace
+
+void clearResults(SETMULTIPAR* table) {
+    for (; table->key != nullptr; ++table) {
+        table->result = 0;
+    }
+}
 
 KeyFilter::KeyFilter(const char* const* table) : m_all(table == nullptr || *table == nullptr) {
     if (m_all) {

@@ -13,6 +13,9 @@
 
 namespace store {
 
+/// Marks all records of a table as not carried out.
+void clearResults(SETMULTIPAR* table);
+
 /// Which keys a transfer takes.
 class KeyFilter {
   public:

@@ -92,9 +92,7 @@ bool setMultiple(SETMULTIPAR* table, Apply apply) {
     if (table == nullptr) {
         return false;
     }
-    for (auto* record = table; record->key != nullptr; ++record) {
-        record->result = 0;
-    }
+    clearResults(table);
     return apply(table);
 }
 

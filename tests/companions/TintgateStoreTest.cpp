@@ -516,7 +516,7 @@ TEST_F(StoreCopy, OneThatWasBrokenOffIsNoStoreAndIsFinishedByTheNext) {
             try {
                 store::openCopy(to)->create(3, 5);
             } catch (const store::StoreFailure& failure) {
-                ASSERT_EQ(failure.fault, store::Fault::Busy) << failure.what();
+                ASSERT_EQ(failure.status, store::Fault::Busy) << failure.what();
             }
         }
         EXPECT_GT(brokenOff, 0) << from;

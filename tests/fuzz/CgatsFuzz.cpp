@@ -4,24 +4,15 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
-#include <cstdio>
-#include <cstdlib>
 #include <string>
 #include <string_view>
 
+#include "Require.h"
 #include "colour/CgatsText.h"
 
 using namespace colour;
 
 namespace {
-
-void require(bool condition, const char* what) {
-    if (condition) {
-        return;
-    }
-    std::fprintf(stderr, "broken: %s\n", what);
-    std::abort();
-}
 
 void checkWhole(const DataSet& set) {
     const std::size_t count = set.patchCount;

@@ -4,23 +4,14 @@
 #include <cmath>
 #include <cstddef>
 #include <cstdint>
-#include <cstdio>
-#include <cstdlib>
 #include <string_view>
 
+#include "Require.h"
 #include "colour/Cxf.h"
 
 using namespace colour;
 
 namespace {
-
-void require(bool condition, const char* what) {
-    if (condition) {
-        return;
-    }
-    std::fprintf(stderr, "broken: %s\n", what);
-    std::abort();
-}
 
 bool allFinite(const std::vector<double>& values) {
     return std::all_of(values.begin(), values.end(),

@@ -173,7 +173,7 @@ TEST_F(FilesInFolder, AFolderThatCannotBeReadIsNamed) {
         try {
             engine->files();
         } catch (const store::StoreFailure& failure) {
-            EXPECT_EQ(failure.fault, Fault::ReadOnly);
+            EXPECT_EQ(failure.status, Fault::ReadOnly);
             EXPECT_STREQ(failure.what(), "server path \"a/closed\": Permission denied");
             return HasFailure() ? 1 : 0;
         }

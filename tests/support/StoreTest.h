@@ -116,7 +116,7 @@ class StoreTest : public testing::TestWithParam<Engine> {
         try {
             work();
         } catch (const store::StoreFailure& failure) {
-            return failure.fault;
+            return failure.status;
         }
         return std::nullopt;
     }

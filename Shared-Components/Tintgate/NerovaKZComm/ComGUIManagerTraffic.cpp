@@ -9,8 +9,8 @@
 
 #include "Shared-Components/Tintgate/NerovaKZComm/TicketSearch.h"
 #include "base/Malloc.h"
+#include "base/Utf8.h"
 #include "jobkeys/Tickets.h"
-#include "platform/CoreFoundationStrings.h"
 #include "text/CharSetsWx.h"
 #include "ticket/ParameterTables.h"
 #include "ticket/TicketUpdateCallback.h"
@@ -25,29 +25,9 @@ int codeOf(bool found) {
     return found ? 1 : 0;
 }
 
-// wx would also accept surrogates and code points above U+10FFFF.
-bool isUtf8(const std::string& text) {
-    return platform::Owned<CFStringRef>(CFStringCreateWithCString(
-               kCFAllocatorDefault, text.c_str(), kCFStringEncodingUTF8)) != nullptr;
-}
-
+// Empty if the text is not UTF-8 (C103). wx alone would also accept surrogates.
 wxString fromUtf8(const std::string& text) {
-    return isUtf8(text) ? wxString(text.c_str(), wxConvUTF8) : wxString();
-}
-
-// If UTF-8 gives nothing, two more decodings are tried, but the UTF-8 result is returned anyway
-// (C103): text that is not UTF-8 comes back empty.
-wxString decoded(const std::string& text) {
-    wxString result = fromUtf8(text);
-    if (result.empty()) {
-        wxString local(text.c_str(), wxConvLocal);
-        if (local.empty()) {
-            local = wxString(text.c_str(), wxConvISO8859_1);
-        }
-        result = local;
-    }
-    result = fromUtf8(text);
-    return result;
+    return base::isUtf8(text.c_str()) ? wxString(text.c_str(), wxConvUTF8) : wxString();
 }
 
 // Adds a deletion of the key, then its new elements. False if a record was refused.
@@ -106,7 +86,7 @@ std::wstring ComGUIManager::GetStringParameter(int type, int id, const char* key
     const MTICKET_READ* const container = GetClientContainer();
     const std::string text =
         container == nullptr ? "" : container->GetStringParameter(type, id, key, "");
-    return decoded(text).ToStdWstring();
+    return fromUtf8(text).ToStdWstring();
 }
 
 template<class Array, class Value>
