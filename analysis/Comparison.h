@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Target against measurement: which files, which patches, which differences.
+// Compares a target with a measurement: the files, their patches and the differences.
 #pragma once
 
 #include <cstddef>
@@ -19,16 +19,16 @@ namespace analysis {
 struct Input {
     std::wstring path;
     SharedFile file;
-    Pairing pairing;                 ///< Of the rows of `Comparison::selection` with this file's.
-    std::vector<std::uint32_t> rows; ///< Of each patch its row. Empty for a profile.
+    Pairing pairing;                     ///< Of the rows of `Comparison::selection` to this file's.
+    std::vector<std::uint32_t> rows;     ///< The row of each patch. Empty for a profile.
     std::vector<std::uint32_t> unpaired; ///< Rows of this file without a counterpart.
 };
 
-/// Something that a person should know about a result and that is no failure.
+/// Information about a result that people should have, but not a failure.
 struct Warning {
     const char* code;       ///< Never changes.
     std::string text;       ///< English, UTF-8.
-    bool keepsOpen = false; ///< Because of this the verdict is at best "incomplete".
+    bool keepsOpen = false; ///< The verdict can't be "passed".
 };
 
 /// A further reading of a patch: a row of the measurement other than the patch's own.
@@ -37,9 +37,9 @@ struct FurtherReading {
     std::uint32_t patch;
 };
 
-/// What is compared of patches that were measured more than once.
+/// What is compared if patches were measured more than once.
 enum class RepeatMode {
-    Each, ///< Every reading by itself.
+    Each, ///< Each reading separately.
     Mean, ///< The mean of the readings, taken in XYZ.
 };
 
@@ -99,7 +99,7 @@ struct Readings {
     std::vector<std::uint32_t> patch; ///< The patch of the comparison that it is part of.
 };
 
-/// Immovable, since it points into itself.
+/// Immovable, because it contains pointers to itself.
 struct Comparison {
     Comparison() = default;
     Comparison(const Comparison&) = delete;
@@ -112,23 +112,23 @@ struct Comparison {
     Input patchSet;
     std::vector<Warning> warnings;
 
-    /// The file whose rows are compared, in their order, and whose ids the patches bear: the patch
-    /// set, else the target, else (where the target is a profile) the measurement.
+    /// The file whose rows are compared in their order, and whose ids identify the patches: the
+    /// patch set, otherwise the target, or the measurement if the target is a profile.
     Input* selection = nullptr;
 
-    /// The file whose device values tell solids, greys and so on apart: the selection, or where
-    /// only the other file has process colours, that one. Null where no file has device values.
+    /// The file whose device values identify solids, greys and so on: the selection, or the other
+    /// file if only that has process colours. Null if no file has device values.
     const Input* devices = nullptr;
 
     colour::Formula formula = colour::Formula::Cie76;
 
-    // One entry a patch: in the order of the selection's rows, with repeats at the end.
+    // One entry per patch, in the order of the selection's rows, with repeats at the end.
     std::vector<std::uint32_t> selectedRow; ///< Row of the selection's set.
     std::vector<colour::Lab> targetLab;
     std::vector<colour::Lab> measuredLab;
     std::vector<double> difference;
 
-    /// Of each patch a number that patches of equal device values share, from 0 without gaps.
+    /// A number for each patch, equal for patches with equal device values, from 0 without gaps.
     std::vector<std::uint32_t> groupOf;
 
     RepeatMode repeatMode = RepeatMode::Each;
@@ -153,7 +153,7 @@ struct ComparisonPaths {
     std::wstring target;
     std::wstring measurement;
     std::wstring patchSet; ///< May be empty.
-    std::string condition; ///< "M1": read from files with several; empty: CgatsWants decides.
+    std::string condition; ///< "M1": read from files with several. Empty: see CgatsWants.
 };
 
 struct ComparisonWants {
@@ -172,11 +172,11 @@ colour::CgatsWants measurementWants(const ComparisonWants& wants, const std::str
 
 /// Loads, pairs and compares.
 ///
-/// Gives 0 or a code of docs/exit-codes.csv; `comparison` is good for nothing after a failure.
+/// Returns 0 or a code of docs/exit-codes.csv. After a failure `comparison` must not be used.
 int compare(const ComparisonPaths& paths, const ComparisonWants& wants, Comparison& comparison);
 
-/// The same with files that are already loaded. The references are only read, so threads may share
-/// them. `path` is that of the measurement.
+/// The same with files that are already loaded. The references are only read, so threads can share
+/// them. `path` is the measurement's.
 int compare(const References& references, const std::wstring& path, SharedFile measurement,
             const ComparisonWants& wants, Comparison& comparison);
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a comparison is judged by: one table, from which presets, results and docs take their words.
+// The criteria of a judgement, in one table. Presets, results and docs use its names.
 #pragma once
 
 #include <cstddef>
@@ -10,7 +10,7 @@
 
 namespace analysis {
 
-/// The patches that a criterion looks at, told by their device values and never by their row.
+/// The patches that a criterion evaluates. Device values identify them, never their rows.
 enum class Patches {
     All,
     Paper,     ///< No ink.
@@ -70,21 +70,20 @@ enum class Quantity {
     SpotTone, ///< Spot colour tone value (ISO 20654) less its aim, as a magnitude.
 };
 
-/// How the patches of a criterion become one figure.
+/// How a criterion combines its patches into one value.
 enum class Statistic {
     Mean,
     Maximum,
     Percentile95, ///< Nearest rank: the ceil(0.95 n)-th smallest.
 };
 
-/// Of a criterion that the records at the boundary have no entry for: it is known by its name
-/// alone, in presets and in results.
+/// A criterion without an entry in the library's records. Presets and results know it by name only.
 inline constexpr int noEntry = -1;
 
 struct Criterion {
     int index;        ///< Entry of presetValues, usedForResult, decimalPlaces, approvals, decimals.
-    const char* name; ///< In presets and results; never changes.
-    const char* title; ///< For a person.
+    const char* name; ///< In presets and results. Never changes.
+    const char* title; ///< For people.
     int value;         ///< Entry of analyseResultsRecord::values.
     int psdEntry;      ///< Entry of psdPresetValues and usedForPSDResult.
     Patches patches;
@@ -95,15 +94,15 @@ struct Criterion {
     Tints tints = {};
 };
 
-/// All criteria, by rising index. After them come those without an entry; PresetOptions::named has
-/// their settings. The indices that are absent have no meaning: their tolerances are ignored
-/// and their approvals are false.
+/// All criteria, in ascending order of index, then those without an entry; PresetOptions::named has
+/// their settings. Absent indices have no meaning: their tolerances are ignored and their approvals
+/// are false.
 ///
-/// The server's table of results fixes which of its entries take which value: values 0 to 7 go with
-/// criteria 6 to 9, 4, 0, 1 and 5; 12, 13, 14, 19 and 20 with 10, 11, 12, 13 and 3; 26 to 30 with
-/// 18 to 22. It has no place for the value of criterion 2. Criteria 14 to 16 never reach it; their
-/// largest one does, as 13. Of PSD presets it shows criteria 0 to 9 alone, and the value of
-/// criterion 19 in place of 18's where PSD entry 21 takes part: hence those entries.
+/// The server's table of results determines which of its entries have which value: values 0 to 7
+/// belong to criteria 6 to 9, 4, 0, 1 and 5; 12, 13, 14, 19 and 20 to 10, 11, 12, 13 and 3; 26 to
+/// 30 to 18 to 22. It has no entry for the values of criteria 2 and 14 to 16; the largest of the
+/// last three is 13's value. For PSD presets it shows only criteria 0 to 9, and it shows the value
+/// of criterion 19 instead of 18's if PSD entry 21 is used. Hence the entries below.
 inline constexpr Criterion criteria[] = {
     {0, "average", "All patches, average", 5, 0, Patches::All, Quantity::DeltaE, Statistic::Mean},
     {1, "maximum", "All patches, largest", 6, 1, Patches::All, Quantity::DeltaE,
@@ -362,7 +361,7 @@ inline constexpr Criterion criteria[] = {
 
 inline constexpr std::size_t criterionCount = std::size(criteria);
 
-/// Place of a criterion in the table.
+/// Position of a criterion in the table.
 inline std::size_t placeOf(const Criterion& criterion) {
     return static_cast<std::size_t>(&criterion - criteria);
 }
@@ -387,7 +386,7 @@ constexpr const char* unit(Quantity quantity) {
     return "dE";
 }
 
-/// The criterion of a name, else null.
+/// Finds a criterion by name. Null if there is none.
 constexpr const Criterion* criterionOfName(std::string_view name) {
     for (const Criterion& criterion : criteria) {
         if (name == criterion.name) {

@@ -39,7 +39,7 @@ double meanOf(const std::vector<double>& figures) {
     return sum / static_cast<double>(figures.size());
 }
 
-/// Nearest rank, ceil(0.95 n), in whole numbers since 0.95 is none of the binary fractions.
+/// Nearest rank, ceil(0.95 n), in integers because 0.95 is not a binary fraction.
 std::size_t rank95(std::size_t count) {
     return (count * 95 + 99) / 100;
 }
@@ -70,7 +70,7 @@ Statistics statisticsOf(const Comparison& c, std::size_t& worst) {
     return s;
 }
 
-/// How many of the patches differ in their device values.
+/// Counts patches that differ in their device values.
 std::size_t differentPatches(const Comparison& c, const std::vector<std::size_t>& patches) {
     std::vector<std::uint32_t> groups;
     groups.reserve(patches.size());
@@ -240,7 +240,7 @@ void answerFromMeasures(const Comparison& c, const Measures& measures, Finding& 
     }
 }
 
-/// What all criteria are answered from.
+/// The data that criteria are answered from.
 struct Evidence {
     const Comparison& comparison;
     const Selections selections;
@@ -249,7 +249,7 @@ struct Evidence {
     const Measures& measures;
 };
 
-/// Answers a criterion as its patches and its quantity ask.
+/// Answers a criterion according to its patches and its quantity.
 void answer(const Evidence& evidence, const PresetOptions& options, Finding& finding) {
     const Patches patches = finding.criterion->patches;
     if (patches == Patches::Greys || patches == Patches::BalancedGreys) {
@@ -285,7 +285,7 @@ void holdAgainst(const Setting& setting, Finding& finding) {
     finding.passed = finding.rounded <= finding.tolerance;
 }
 
-/// Never passed by silence, and never less than failed by silence either.
+/// "Passed" needs an answer for each used criterion. A failed one outweighs unanswered ones.
 Verdict verdictOf(const std::vector<Finding>& findings, bool keptOpen) {
     bool isAnyUsed = false;
     bool isAnyOpen = keptOpen;
@@ -302,7 +302,7 @@ Verdict verdictOf(const std::vector<Finding>& findings, bool keptOpen) {
     return isAnyUsed && !isAnyOpen ? Verdict::Passed : Verdict::Incomplete;
 }
 
-/// Criteria that are answered, but from less than they are meant for.
+/// Warns of criteria that are answered from fewer data than intended.
 void warnOfFindings(const Comparison& c, Judgement& judgement) {
     bool isListSaid = false;
     for (const Finding& finding : judgement.findings) {

@@ -8,8 +8,8 @@
 namespace analysis {
 namespace {
 
-/// CMY triplets in use as greys, in percent: ISO 12647-7 and the control strips that go with it,
-/// the older strips, and the ones after the near-neutral formula.
+/// CMY triplets in use as greys, in percent: those of ISO 12647-7 and its control strips, those of
+/// older strips, and those of the near-neutral formula.
 constexpr double greyTriplets[][3] = {
     {10, 6, 6},       {20, 12, 12},       {40, 27, 27},       {60, 45, 45},
     {80, 65, 65},     {100, 85, 85},      {3.1, 2.2, 2.2},    {10.2, 7.4, 7.4},
@@ -38,7 +38,7 @@ bool isGrey(const double* cmyk, std::size_t first) {
     });
 }
 
-/// Kinds of a patch by process inks alone, most of them by the inks that are 0 or 100.
+/// Kinds of a patch with process inks only. Most kinds depend on which inks are 0 or 100.
 KindSet kindsOfProcess(const double* cmyk, std::bitset<outerGamutCount>& outerGamut) {
     constexpr unsigned c = 1, m = 2, y = 4, k = 8;
     unsigned none = 0;
@@ -69,7 +69,7 @@ KindSet kindsOfProcess(const double* cmyk, std::bitset<outerGamutCount>& outerGa
         }
     }
     const bool isPaper = kinds == kind(Patches::Paper);
-    if ((none & (c | m | y)) != 0) { // never a grey, which has all three
+    if ((none & (c | m | y)) != 0) { // greys have all three
         if ((none & k) != 0 && !isPaper) {
             kinds |= kind(Patches::SurfaceGamut);
         }
@@ -83,7 +83,7 @@ KindSet kindsOfProcess(const double* cmyk, std::bitset<outerGamutCount>& outerGa
     return kinds;
 }
 
-/// All kinds that a patch is of. `channels` are process inks followed by spot colours.
+/// All kinds of a patch. `channels` are process inks followed by spot colours.
 KindSet kindsOf(const double* device, std::size_t channels,
                 std::bitset<outerGamutCount>& outerGamut) {
     const auto off = [](double value) { return near(value, 0); };

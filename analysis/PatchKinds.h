@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a patch is by its device values: paper, a solid, a grey and so on.
+// Classifies patches by their device values: paper, a solid, a grey and so on.
 #pragma once
 
 #include <array>
@@ -14,12 +14,12 @@
 
 namespace analysis {
 
-/// How far a device value may be off and still count, in percent: eight-bit values miss by 0.2,
-/// whole percents by 0.5.
+/// Allowed deviation of a device value in percent: eight-bit values deviate by 0.2, whole percents
+/// by 0.5.
 inline constexpr double deviceTolerance = 0.5;
 
-/// True if a patch has no ink beside C, M, Y and K. A CMYK profile has colours for no other patch.
-/// REQUIRES: set.hasCmyk().
+/// True if a patch has no inks other than C, M, Y and K. A CMYK profile has no colours for other
+/// patches. REQUIRES: set.hasCmyk().
 bool isProcessOnly(const colour::DataSet& set, std::size_t row);
 
 /// True if no ink is printed at all.
@@ -34,18 +34,18 @@ bool isBalancedGrey(const double* device, std::size_t channels);
 
 inline constexpr std::size_t patchKinds = static_cast<std::size_t>(Patches::Repeated) + 1;
 
-/// The patches of a comparison by kind, each list by rising index. Those of All and Repeated are
-/// not listed.
+/// The patches of a comparison by kind, each list in ascending order. All and Repeated have no
+/// lists.
 struct Selections {
     std::array<std::vector<std::size_t>, patchKinds> lists;
-    std::bitset<outerGamutCount> outerGamut; ///< Entries of the list that are there.
+    std::bitset<outerGamutCount> outerGamut; ///< Entries of the list in the data.
 
     const std::vector<std::size_t>& of(Patches patches) const {
         return lists[static_cast<std::size_t>(patches)];
     }
 };
 
-/// Sorts the patches of a comparison. All lists are empty if no file has process colours.
+/// Classifies the patches of a comparison. All lists are empty if no file has process colours.
 Selections selectionsOf(const Comparison& comparison);
 
 } // namespace analysis

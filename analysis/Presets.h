@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tolerance presets as XML files. docs/presets.md states the format for whoever writes one.
+// Tolerance presets as XML files. docs/presets.md describes the format.
 #pragma once
 
 #include <array>
@@ -16,8 +16,8 @@
 
 namespace analysis {
 
-/// illuminationCondition 0 to 3 is M0 to M3 of ISO 13655, -1 is any. Higher numbers are allowed,
-/// for the sake of older presets, and mean nothing.
+/// illuminationCondition 0 to 3 is M0 to M3 of ISO 13655, -1 is any. Higher numbers are allowed for
+/// older presets, and mean nothing.
 inline constexpr int largestMeasuringCondition = 3;
 
 /// How one criterion is judged.
@@ -45,11 +45,11 @@ const char* greyWeightsName(GreyWeights weights);
 /// What a preset's file states beyond the record, which has no room for it.
 struct PresetOptions {
     RepeatMode repeats = RepeatMode::Each;
-    bool conditionRequired = false; ///< The measuring condition decides, and does not only warn.
-    int minimumGreys = 5;           ///< Fewer CMY greys give no answer.
+    bool conditionRequired = false; ///< The verdict requires the measuring condition.
+    int minimumGreys = 5;           ///< With fewer CMY greys there is no answer.
 
-    /// Names of the inks after C, M, Y and K, in the order of the channels. UTF-8, different, none
-    /// empty. For data that do not name them; they may be more or fewer than the data have inks.
+    /// Names of the inks after C, M, Y and K, in channel order. UTF-8, distinct, not empty. For
+    /// data without ink names. There may be more or fewer names than inks.
     std::vector<std::string> inks;
 
     PaperAims paperAims = PaperAims::Absolute;
@@ -73,42 +73,42 @@ struct PresetOptions {
     bool asksMeasures() const;
 };
 
-/// A longer file is no preset.
+/// Longer files are rejected.
 inline constexpr std::size_t maxPresetBytes = std::size_t{1} << 20;
 
-/// Where a file's first fault is, for a person who mends it.
+/// The first fault in a file, for people who have to correct it.
 struct PresetFault {
-    std::size_t line = 0;    ///< From 1; 0 if the fault is not in a place of the file.
-    std::string description; ///< Such as "tolerance of <average> is not a number: 2,5"; UTF-8.
+    std::size_t line = 0;    ///< From 1; 0 if the fault has no position in the file.
+    std::string description; ///< For example "tolerance of <average> is not a number: 2,5"; UTF-8.
 };
 
-/// Reads the preset file at `path` (bytes as the file system has them) into `preset`.
+/// Reads the preset file at `path` (bytes of the file system) into `preset`.
 ///
-/// With keepJobChoice presetID and deltaEMode of the record stay, and all else comes from the file;
-/// an entry that the file does not name is 0. A filePath that the caller has given stays, an empty
-/// one becomes `path`. Gives exitDone or one of the codes exitPresetMissing to
-/// exitPresetUnknownEntry, or exitOutOfMemory; on failure `preset` is left as it was, and *fault
-/// (if not null) describes the fault.
+/// With keepJobChoice, presetID and deltaEMode of the record stay. Everything else comes from the
+/// file; an entry that the file does not name is 0. A filePath set by the caller stays, an empty
+/// one becomes `path`. Returns exitDone, exitOutOfMemory or one of the codes from exitPresetMissing
+/// to exitPresetUnknownEntry. On failure `preset` is unchanged, and *fault (if not null) describes
+/// the fault.
 int readPreset(const std::string& path, bool keepJobChoice, tolerancePresetParameterRecord& preset,
                PresetFault* fault = nullptr);
 
-/// The same from the contents of a file; filePath stays.
+/// The same for the contents of a file. filePath stays.
 int parsePreset(std::string_view bytes, bool keepJobChoice, tolerancePresetParameterRecord& preset,
                 PresetFault* fault = nullptr);
 
-/// What the file of a record states beyond the record. filePath leads to it; a file that readPreset
-/// has just read for this filePath is not read again. Without a filePath the options are the usual
-/// ones. Gives the codes of readPreset; `options` is left as it was on failure.
+/// Reads the settings of a record's file that the record lacks. filePath is the file; if readPreset
+/// has just read it for this filePath, it is not read again. Without a filePath, the options are
+/// the defaults. Returns the codes of readPreset. On failure `options` is unchanged.
 int readPresetOptions(const tolerancePresetParameterRecord& preset, PresetOptions& options);
 
-/// Which of several conditions of a file a preset asks for: "M0" to "M3"; empty leaves the choice
-/// to the reader.
+/// The condition that a preset selects from several in a file: "M0" to "M3". Empty leaves the
+/// choice to the reader.
 std::string conditionOf(const tolerancePresetParameterRecord& preset);
 
 /// What a preset asks of a comparison. Spectra are wanted only if tone values are.
 ComparisonWants wantsOf(const tolerancePresetParameterRecord& preset, const PresetOptions& options);
 
-/// How a criterion is judged. With fograPSDPreset above 0 the PSD values of the record decide.
+/// How a criterion is judged. If fograPSDPreset is above 0, the PSD values of the record are used.
 Setting settingOf(const Criterion& criterion, const tolerancePresetParameterRecord& preset,
                   const PresetOptions& options);
 

@@ -21,7 +21,7 @@ class FirstPatches {
           m_slots(std::bit_ceil(std::max<std::size_t>(c.patchCount(), 8) * 2), noRow),
           m_shift(64 - std::countr_zero(m_slots.size())) {}
 
-    /// The first of the patches given so far that is alike, which may be the patch itself.
+    /// The first equal patch of those passed so far. This may be the patch itself.
     std::uint32_t of(std::uint32_t patch) {
         for (std::size_t at = slotOf(patch);; at = (at + 1) & (m_slots.size() - 1)) {
             if (m_slots[at] == noRow) {
@@ -34,7 +34,7 @@ class FirstPatches {
     }
 
   private:
-    /// Of a product the highest bits depend on all others; whole percents have no low ones.
+    /// The highest bits of a product depend on all others. The low bits of whole percents are 0.
     std::size_t slotOf(std::uint32_t patch) const {
         constexpr std::uint64_t factor = 0x9E3779B97F4A7C15;
         std::uint64_t h = 0;
@@ -64,10 +64,10 @@ class FirstPatches {
     const Comparison& m_c;
     std::size_t m_channels;
     std::vector<std::uint32_t> m_slots;
-    int m_shift; ///< Leaves as many bits of a hash as a place in m_slots has.
+    int m_shift; ///< Leaves as many bits of a hash as an index of m_slots has.
 };
 
-/// Numbers the groups in the order of their first patches. Gives their count.
+/// Numbers the groups in the order of their first patches. Returns their count.
 std::size_t numberGroups(Comparison& c) {
     FirstPatches first(c);
     c.groupOf.resize(c.patchCount());
@@ -79,7 +79,7 @@ std::size_t numberGroups(Comparison& c) {
     return groups;
 }
 
-/// The patches of each group that has several, by rising index.
+/// The patches of each group with more than one, in ascending order.
 std::vector<std::vector<std::uint32_t>> severalOf(const Comparison& c, std::size_t groups) {
     std::vector<std::uint32_t> counts(groups);
     for (const std::uint32_t group : c.groupOf) {
@@ -101,8 +101,8 @@ std::vector<std::vector<std::uint32_t>> severalOf(const Comparison& c, std::size
     return several;
 }
 
-/// The patches that are of different rows of a file, the first of each row. A profile gives equal
-/// values for all of them, so one is enough.
+/// The patches from different rows of a file, the first of each row. For a profile one patch is
+/// enough, because it returns equal values for all.
 std::vector<std::uint32_t> differentRows(const Input& side,
                                          const std::vector<std::uint32_t>& patches) {
     if (!side.file.set) {

@@ -21,7 +21,7 @@ std::int64_t integer(const Json& value) {
     return value.get<std::int64_t>();
 }
 
-/// The stamp becomes a part of a file name, so nothing but its own form is taken.
+/// The stamp becomes part of a file name, so only its exact form is accepted.
 std::string stamp(const std::string& value) {
     constexpr std::string_view form = "0000-00-00T00:00:00+00:00";
     bool fits = value.size() == form.size();

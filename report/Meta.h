@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What is known of a job beside its colours, read back from its JSON (docs/meta.schema.json).
+// Data of a job other than its colours, read from its JSON (docs/meta.schema.json).
 #pragma once
 
 #include <cstdint>
@@ -9,7 +9,7 @@
 
 namespace report {
 
-/// Texts are empty where nothing is known.
+/// Texts are empty if unknown.
 struct Meta {
     std::string created; ///< Local time: 2024-05-01T12:34:56+02:00.
     std::int64_t jobId = 0;
@@ -24,8 +24,7 @@ struct Meta {
     std::string language; ///< As the job's client named it, such as "de_DE".
 };
 
-/// Nothing where the text is no meta file of a format that this version knows; `problem` then says
-/// why.
+/// Nothing if the text is not a meta file in a known format; `problem` then describes why.
 std::optional<Meta> readMeta(std::string_view json, std::string& problem);
 
 } // namespace report

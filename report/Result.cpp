@@ -19,7 +19,7 @@ double number(const Json& value) {
     return value.is_null() ? std::numeric_limits<double>::quiet_NaN() : value.get<double>();
 }
 
-/// A whole number. A real one is not turned into it, for it may have no room there.
+/// Reads an integer. Real numbers are refused, because they may not fit.
 std::int64_t whole(const Json& value) {
     if (!value.is_number_integer()) {
         throw std::runtime_error("a number that is not whole");
@@ -113,7 +113,7 @@ Statistics statistics(const Json& json) {
             number(json.at("maximum")), number(json.at("standardDeviation"))};
 }
 
-/// Takes the rows of the long arrays as the parser meets them, and has them thrown away.
+/// Consumes the rows of the long arrays during parsing, so that the parser drops them.
 class Rows {
   public:
     explicit Rows(Result& result) : m_result(result) {}
@@ -135,7 +135,7 @@ class Rows {
         return false;
     }
 
-    /// Throws where patches have different numbers of device values.
+    /// Throws if patches have different numbers of device values.
     void check() const {
         if (m_result.device.size() != m_result.channels.size() * m_result.patches.size() ||
             m_uneven) {
@@ -148,7 +148,7 @@ class Rows {
 
   private:
     void takePatch(const Json& row) {
-        const bool isRelabelled = row.size() > 7; // else the sheet has the same labels
+        const bool isRelabelled = row.size() > 7; // otherwise, the sheet has the same labels
         m_result.patches.push_back({row.at(0), row.at(1), lab(row.at(3)), lab(row.at(4)),
                                     number(row.at(5)), row.at(isRelabelled ? 6 : 0),
                                     row.at(isRelabelled ? 7 : 1)});
@@ -259,7 +259,7 @@ void fill(Result& result, const Json& json) {
     result.targetBy = pairing.at("target");
     result.measurementBy = pairing.at("measurement");
     if (const auto listed = pairing.find("unpairedTarget"); listed != pairing.end()) {
-        result.unpairedTarget.count = count(*listed); // which are not listed
+        result.unpairedTarget.count = count(*listed); // these are not listed
     }
     result.statistics = statistics(json.at("statistics"));
     if (const auto repeats = json.find("repeats"); repeats != json.end()) {

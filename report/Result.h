@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The result of a comparison, read back from its JSON (docs/result.md).
+// The result of a comparison, read from its JSON (docs/result.md).
 #pragma once
 
 #include <cstddef>
@@ -18,7 +18,7 @@ enum class Verdict { Passed, Failed, Incomplete };
 enum class Outcome { Pass, Fail, Unanswered, Unjudged };
 
 struct Criterion {
-    std::string name; ///< Such as "average"; docs/criteria.md lists them.
+    std::string name; ///< For example "average"; docs/criteria.md lists them.
     std::string title;
     std::string unit; ///< "dE", "dH", "dCh", "dL" or "dTV".
     bool used = false;
@@ -29,12 +29,12 @@ struct Criterion {
     int decimals = 2;              ///< 0 to 6.
     std::size_t patches = 0;
     std::optional<std::size_t> worstPatch; ///< Index into `patches`.
-    std::size_t needed = 1;                ///< Different patches that an answer takes.
-    std::size_t found = 0;                 ///< Different patches that there are.
-    std::size_t listed = 0; ///< Length of the list that they are chosen by; 0 without one.
+    std::size_t needed = 1;                ///< Distinct patches needed for an answer.
+    std::size_t found = 0;                 ///< Distinct patches found.
+    std::size_t listed = 0; ///< Length of the list from which they are selected; 0 without one.
 };
 
-/// Numbers are NaN where the result has null.
+/// Numbers are NaN if the result has null.
 struct Patch {
     std::string id;
     std::string name;
@@ -45,7 +45,7 @@ struct Patch {
     std::string measuredName = {};
 };
 
-/// One side of the comparison, with what its file says of itself. Empty where it says nothing.
+/// One side of the comparison with its file's own statements. Empty if not stated.
 struct Input {
     std::string path;
     std::string kind;     ///< "text" or "profile".
@@ -112,9 +112,9 @@ struct RepeatedPatch {
 /// Patches that were measured more than once. Distances are of a reading from the mean of its
 /// patch's readings.
 struct Repeats {
-    bool averaged = false; ///< Their means were compared, not each reading by itself.
+    bool averaged = false; ///< Their means were compared, instead of each reading.
     std::size_t patches = 0;
-    std::size_t readings = 0; ///< Of these patches.
+    std::size_t readings = 0; ///< Number of readings of these patches.
     std::optional<double> largestDistance;
     std::optional<std::size_t> worstPatch; ///< Index into `patches` of the result.
     std::vector<RepeatedPatch> each;       ///< Empty unless the preset asks for it.
@@ -139,15 +139,15 @@ struct Result {
     std::string toolVersion;
     std::string libraryVersion;
     Verdict verdict = Verdict::Incomplete;
-    std::string formula; ///< Such as "CIE2000".
+    std::string formula; ///< For example "CIE2000".
     std::string presetName;
     std::int64_t presetId = 0;
-    std::int64_t presetCondition = -1; ///< 0 to 3 are M0 to M3; others ask for none.
+    std::int64_t presetCondition = -1; ///< 0 to 3 are M0 to M3; others mean none.
     bool conditionRequired = false;
     Input target;
     Input measurement;
     std::optional<Input> patchSet;
-    std::string selection;     ///< Whose patches: "target", "measurement" or "patchSet".
+    std::string selection;     ///< Source of the patches: "target", "measurement" or "patchSet".
     std::string measurementBy; ///< How the measured patches were found (docs/result.md).
     std::string targetBy;
     Statistics statistics;
@@ -163,12 +163,12 @@ struct Result {
     Unpaired unpairedPatchSet;
     std::vector<std::string> channels; ///< Names of the device values.
     std::vector<Patch> patches;        ///< In the result's order.
-    std::vector<double> device;        ///< Percent; channels.size() for each patch.
+    std::vector<double> device;        ///< In percent; channels.size() per patch.
 };
 
-/// Reads a whole result, patches row by row without a tree of them. Members that older versions of
-/// the library did not write have their initial values. Nothing if the text is no
-/// result of a format that this version knows; `problem` then says why.
+/// Reads a whole result, with patches row by row instead of in a tree. Members that older versions
+/// of the library did not write keep their initial values. Nothing if the text is not a result in a
+/// known format; `problem` then describes why.
 std::optional<Result> readResult(std::string_view json, std::string& problem);
 
 } // namespace report

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// One result as a point in time: what a trend is made of.
+// One result as a point of a trend.
 #pragma once
 
 #include <array>
@@ -15,7 +15,7 @@
 
 namespace report {
 
-/// The patches whose colours tell where a printer stands.
+/// The patches whose colours show the state of a printer.
 enum class Ink { Paper, Cyan, Magenta, Yellow, Black };
 inline constexpr std::size_t inkCount = 5;
 inline constexpr Ink allInks[inkCount] = {Ink::Paper, Ink::Cyan, Ink::Magenta, Ink::Yellow,
@@ -24,14 +24,14 @@ inline constexpr Ink allInks[inkCount] = {Ink::Paper, Ink::Cyan, Ink::Magenta, I
 /// The criterion that holds the ink against its target, such as "solidCyan".
 const char* inkCriterion(Ink ink);
 
-/// What a patch is by its device values in percent, of which the first four are C, M, Y, K: paper
-/// or one solid alone, each within 0.5 as criteria count them (docs/criteria.md); else nothing.
+/// Classifies a patch by its device values in percent, starting with C, M, Y, K: paper, or one
+/// solid, each within 0.5 as for criteria (docs/criteria.md); otherwise nothing.
 std::optional<Ink> inkOf(const double* device, std::size_t channels);
 
-/// The mean colour of each ink's patches; nothing where there are none.
+/// The mean colour of each ink's patches; nothing if there are none.
 using InkColours = std::array<std::optional<colour::Lab>, inkCount>;
 
-/// Gathers colours patch by patch. Colours that are not finite are passed over.
+/// Collects colours patch by patch. Skips colours that are not finite.
 class InkMeans {
   public:
     void add(Ink ink, const colour::Lab& lab);
@@ -45,7 +45,7 @@ class InkMeans {
     std::array<Sum, inkCount> m_sums;
 };
 
-/// One strip of one job, or one file's comparison. Texts are empty where nothing is known.
+/// One strip of one job, or one file's comparison. Texts are empty if unknown.
 struct Sample {
     std::int64_t time = 0; ///< Seconds since 1970 on the room's own clock, whatever its zone.
     std::string title;     ///< Empty for a job without one.
@@ -56,17 +56,17 @@ struct Sample {
     std::string workflow;
     std::string preset;
     std::int64_t presetId = 0;
-    std::string formula; ///< Such as "CIE2000".
+    std::string formula; ///< For example "CIE2000".
     std::string target;  ///< Name of its file.
-    /// Equal for the same target: its identity; without one, its name and what it says of itself.
+    /// Equal for the same target: its identity or, without one, its name and its own statements.
     std::string targetKey;
-    std::string printer; ///< Or printing conditions, as the measurement states them.
-    std::string folder;  ///< Of one printer's results, where folders tell printers apart.
+    std::string printer; ///< Or printing conditions, as stated by the measurement.
+    std::string folder;  ///< Folder of one printer's results, if folders distinguish printers.
     Verdict verdict = Verdict::Incomplete;
-    std::vector<Criterion> criteria; ///< Their worstPatch says nothing here.
+    std::vector<Criterion> criteria; ///< worstPatch is not used.
     InkColours inks;                 ///< As measured.
-    InkColours aims;                 ///< Of the same patches in the target.
-    std::string page;                ///< Bytes: where the job's page is, relative to the trend's.
+    InkColours aims;                 ///< The target's colours of the same patches.
+    std::string page; ///< Bytes: path of the job's page relative to the trend's page.
 };
 
 /// What the names of the tone values at 50 percent begin with, which sampleOf adds to the criteria:

@@ -46,7 +46,7 @@ const Criterion* criterionOf(const Sample& sample, const std::string& name) {
     return found == sample.criteria.end() ? nullptr : &*found;
 }
 
-/// The value that was held against the tolerance.
+/// The value that was compared with the tolerance.
 double judgedValue(const Criterion& criterion) {
     return criterion.rounded.value_or(criterion.value.value_or(none));
 }
@@ -279,7 +279,7 @@ std::vector<CriterionTrend> criterionTrends(const std::vector<const Sample*>& sa
 
 // ---- Series
 
-/// Results with equal keys may be compared with each other.
+/// Results with equal keys can be compared with each other.
 auto keyOf(const Sample& s) {
     return std::tie(s.paper, s.preset, s.presetId, s.formula, s.instrument, s.workflow, s.strip,
                     s.targetKey, s.printer, s.folder);
@@ -346,7 +346,7 @@ std::string recentText(const Series& series, const std::vector<const Sample*>& s
         const auto from = criterion.outcomes.end() - static_cast<std::ptrdiff_t>(recent);
         const auto count =
             static_cast<std::size_t>(std::count(from, criterion.outcomes.end(), Outcome::Fail));
-        if (criterion.used && count != 0 && count >= most) { // Solids before the largest of them.
+        if (criterion.used && count != 0 && count >= most) { // Solids before the largest solid.
             most = count;
             worst = &criterion;
         }

@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Everything that the page of a trend says, worked out of many results. The page itself
-// (trend.html, trend.js) places and draws, and works nothing out.
+// The content of a trend's page, derived from many results. The page (trend.html, trend.js) only
+// arranges and draws.
 #pragma once
 
 #include <array>
@@ -23,26 +23,26 @@ struct InkTrend {
     Ink ink = Ink::Paper;
     Movement movement = Movement::Unknown;
     std::string word; ///< "Drifting", "Steady", "Too few jobs", "No data".
-    /// What the moving average has done: "moving average 1.84 from the mean of the first jobs:
+    /// The change of the moving average: "moving average 1.84 from the mean of the first jobs:
     /// lighter (L* +1.20)".
     std::string sentence;
     colour::Lab began; ///< Mean of the first jobs; NaN without colours, as is `now`.
     colour::Lab now;   ///< Moving average at the latest job.
-    colour::Lab aim;   ///< The target's; NaN where it is not known.
+    colour::Lab aim;   ///< The target's colour; NaN if unknown.
     Swatch beganSwatch;
     Swatch nowSwatch;
     Swatch aimSwatch;
-    /// How far `now` is from `aim`, which is what a person would correct by: "3.10 ΔE00" and "L*
-    /// +1.20, a* -0.40, b* +0.00" (`now` less `aim`). Empty if either is not known; `correction`
-    /// also if only differences are known, as their moving average.
+    /// Distance from `now` to `aim`, for corrections: "3.10 ΔE00" and "L* +1.20, a* -0.40, b*
+    /// +0.00" (`now` minus `aim`). Empty if either is unknown. If only differences are known,
+    /// averageOff is their moving average and `correction` is empty.
     std::string averageOff;
     std::string correction;
-    double shift = 0; ///< Distance of the two in CIELAB; without colours, change of the difference.
-    /// L*, a*, b* of each job less `began`: as measured, and averaged. NaN where nothing is known;
-    /// empty without any colours.
+    double shift = 0; ///< CIELAB distance of `began` and `now`, or change of the difference.
+    /// L*, a*, b* of each job minus `began`: measured and averaged. NaN if unknown; empty without
+    /// any colours.
     std::array<std::vector<double>, 3> changes;
     std::array<std::vector<double>, 3> averages;
-    /// The latest job's difference from the target with its tolerance; empty where not judged.
+    /// The latest job's difference from the target with its tolerance; empty if not judged.
     std::string value;
     std::string tolerance;
     double fill = 0;    ///< Value as a share of twice the tolerance, 0 to 1.
@@ -56,20 +56,20 @@ struct CriterionTrend {
     bool used = false;     ///< By at least one job.
     bool followed = false; ///< Shown with the used ones: tone values at 50 %, mid-tone spread.
     int decimals = 2;
-    std::vector<double> values;    ///< One a job, as judged; NaN for none.
-    std::vector<Outcome> outcomes; ///< One a job.
-    /// The tolerance and the index of the job from which it holds; NaN for none.
+    std::vector<double> values;    ///< One per job, as judged; NaN if missing.
+    std::vector<Outcome> outcomes; ///< One per job.
+    /// Each tolerance with the index of the first job that used it; NaN for none.
     std::vector<std::pair<std::size_t, double>> tolerances;
     std::size_t failed = 0;
     std::size_t answered = 0;
-    std::string latest;    ///< The last value that there is.
-    std::string tolerance; ///< The last one.
+    std::string latest;    ///< The latest existing value.
+    std::string tolerance; ///< The latest one.
 };
 
-/// Results that may be compared with each other: aimed at the same colours, and of one paper,
-/// preset, formula, instrument, printer, folder, workflow and strip.
+/// Results that can be compared with each other: the same target colours, paper, preset, formula,
+/// instrument, printer, folder, workflow and strip.
 struct Series {
-    std::string name; ///< These in words, as many as tell the series of a trend apart.
+    std::string name; ///< As many of these, in words, as are needed to distinguish the series.
     std::string preset;
     std::string paper;
     Movement movement = Movement::Unknown;
@@ -82,16 +82,16 @@ struct Series {
     std::size_t failed = 0;
     std::size_t incomplete = 0;
     std::vector<InkTrend> inks;           ///< All five, in the order of Ink.
-    std::vector<CriterionTrend> criteria; ///< Used ones first, else in the results' order.
+    std::vector<CriterionTrend> criteria; ///< Used ones first, otherwise in the results' order.
     std::vector<std::size_t> samples;     ///< Indices into TrendModel::samples, by time.
-    std::size_t beginning = 0;            ///< How many jobs make the beginning.
+    std::size_t beginning = 0;            ///< Number of jobs in the beginning.
 };
 
 struct TrendModel {
     std::string subtitle;
-    std::vector<std::string> notes; ///< What a person should know of the data as a whole.
+    std::vector<std::string> notes; ///< Remarks on the data as a whole.
     std::vector<Sample> samples;    ///< By time.
-    std::vector<Series> series;     ///< Drifting ones first, then those of the most jobs.
+    std::vector<Series> series;     ///< Drifting ones first, then those with the most jobs.
 };
 
 /// `store` is the address of the store that the samples come from; empty if they are from files.

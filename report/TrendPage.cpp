@@ -37,7 +37,7 @@ std::string labText(const colour::Lab& lab, const Texts& say) {
     return tenths(lab.L) + " " + tenths(lab.a) + " " + tenths(lab.b);
 }
 
-/// A part of the page's data: a tree for what there is little of, then lists of numbers as text.
+/// A part of the page's data: a tree for small data, then lists of numbers as text.
 class Part {
   public:
     explicit Part(const PageJson& head) : m_text(inScript(head)) { m_text.pop_back(); }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The page of a trend: HTML in one piece that fetches nothing.
+// The page of a trend: self-contained HTML.
 #pragma once
 
 #include <string>

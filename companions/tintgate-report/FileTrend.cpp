@@ -43,8 +43,8 @@ std::string pageFor(const LoadedResult& loaded, const PagePlace& place,
     return place.name + page.substr(folder.size());
 }
 
-/// The folder that the results of one printer share, as seen from here: that of the result, or of
-/// a job's result that of the job's own folder (JobID_7).
+/// The folder that one printer's results share: the result's folder, or for a job's result the
+/// parent of the job's folder (JobID_7).
 std::string printersFolder(const LoadedResult& loaded) {
     std::error_code failure;
     fs::path folder = fs::canonical(loaded.folder(), failure);

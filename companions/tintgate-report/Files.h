@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Results in files, with the meta file that belongs to each, and where the output goes.
+// Results in files with their meta files, and the output.
 #pragma once
 
 #include <cstdint>
@@ -21,15 +21,15 @@ struct LoadedResult {
     std::string hash; ///< SHA-256 of the result's bytes, if it is wanted.
 
     const Meta* metaOrNull() const { return meta ? &*meta : nullptr; }
-    std::string folder() const; ///< "." where the path has none.
+    std::string folder() const; ///< "." if the path has none.
     std::string stem() const;   ///< Name without folder and ".json".
 };
 
 enum class Hash { Unwanted, Wanted };
 
-/// Reads a result; "-" is standard input. An empty metaPath means "meta.json" beside a result named
-/// "output.json", as a job's run leaves them; where that one can't be used, `note` says so and the
-/// result goes without. Throws Failure (Unreadable, Broken), for a meta file only if it is named.
+/// Reads a result; "-" is standard input. If metaPath is empty, "meta.json" next to a result named
+/// "output.json" is used, as written by a job's run. If it can't be used, `note` says so and there
+/// is no meta data. Throws Failure (Unreadable, Broken); for a meta file only if it is named.
 LoadedResult loadResult(const std::string& path, const std::string& metaPath, std::string& note,
                         Hash hash = Hash::Unwanted);
 
@@ -48,10 +48,10 @@ std::string pageOf(const LoadedResult& loaded, std::optional<languages::Language
 /// are not followed. Throws Failure (Unreadable) for a folder that can't be read.
 std::vector<std::string> filesOf(const std::vector<std::string>& arguments);
 
-/// The path as seen from a folder.
+/// The path relative to a folder.
 std::string relativeTo(const std::string& folder, const std::string& path);
 
-/// Writes to a file whole or not at all, or to standard output for "-". Devices and pipes are
+/// Writes to a file, completely or not at all, or to standard output for "-". Devices and pipes are
 /// written in place. Throws Failure (NotWritten).
 void writeOutput(const std::string& path, std::string_view text);
 

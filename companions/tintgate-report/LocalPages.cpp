@@ -22,7 +22,7 @@ std::string LocalPages::of(const report::Sample& sample) const {
     }
     const std::string start = folder + "/report-strip" + std::to_string(sample.strip) + "-";
     std::string earliest;
-    for (const report::Listed& page : found->second) { // The latest first.
+    for (const report::Listed& page : found->second) { // Latest first.
         const auto made = timeOf(page.summary.created);
         if (page.path.starts_with(start) &&
             (sample.title.empty() || page.summary.title == sample.title) && made &&

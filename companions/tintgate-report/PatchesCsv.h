@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The patches of a result for a spreadsheet or a script.
+// Exports the patches of a result for a spreadsheet or a script.
 #pragma once
 
 #include <string>
@@ -9,14 +9,13 @@
 
 namespace report {
 
-/// A line for the names of the columns and one for each patch, in the result's order: id, name, the
+/// A line with the column names and one line for each patch, in the result's order: id, name, the
 /// device values under their channels' names, target_L, target_a, target_b, measured_L, measured_a,
-/// measured_b, difference, and the id and name on the sheet,
-/// measured_id and measured_name. These are the columns of the page's own export.
+/// measured_b, difference, and the id and name on the sheet, measured_id and measured_name. The
+/// page's own export has the same columns.
 ///
-/// UTF-8, lines end with a line feed, cells are quoted where they need to be (RFC 4180). A text
-/// that a spreadsheet would run as a formula gets an apostrophe in front. No number is an empty
-/// cell.
+/// UTF-8 with line feeds; cells are quoted if necessary (RFC 4180). An apostrophe precedes text
+/// that a spreadsheet would interpret as a formula. Missing numbers are empty cells.
 std::string patchesCsv(const Result& result);
 
 /// A cell of text, as above. Commas and line ends are the caller's.

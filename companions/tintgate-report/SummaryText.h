@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// A result, or the trend of many, in a few lines for a terminal.
+// Summarises a result, or a trend of many, in a few lines for a terminal.
 #pragma once
 
 #include <string>
@@ -16,7 +16,7 @@ namespace report {
 std::string summaryText(const Result& result, const Meta* meta, const Painter& paint,
                         const languages::Texts& say);
 
-/// Of each series: whether it drifts and which ink, where the inks stand, the criteria, and the
+/// For each series: whether it drifts and which ink, the state of the inks, the criteria, and the
 /// latest jobs.
 std::string trendText(const TrendModel& trend, const Painter& paint, const languages::Texts& say);
 

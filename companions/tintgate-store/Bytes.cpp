@@ -52,7 +52,7 @@ std::optional<std::string> fromBase64(std::string_view text) {
             bytes += static_cast<char>(group >> (6 - 2 * ((count - 1) % 4)));
         }
     }
-    // Whatever has a second spelling is refused: wrong padding, and bits behind the last byte.
+    // Refuses alternative encodings: wrong padding, and bits after the last byte.
     if (toBase64(bytes) != text) {
         return std::nullopt;
     }

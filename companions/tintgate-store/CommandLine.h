@@ -1,7 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Commands and their options, as the command line knows them. The parser behind them is a library
-// of headers that takes longer to compile than any command, so only CommandLine.cpp and main see
-// it.
+// Commands and their options on the command line. The parser is a header-only library that takes
+// longer to compile than any command, so only CommandLine.cpp and main include it.
 #pragma once
 
 #include <functional>
@@ -15,38 +14,38 @@ class Option;
 
 namespace admin {
 
-/// An option, or an argument known by its place. A handle: copies are the same option.
+/// An option or a positional argument. A handle: copies refer to the same option.
 class Option {
   public:
     explicit Option(CLI::Option* option) : m_option(option) {}
     void required();
-    /// Refuses the command line where both stand.
+    /// Rejects command lines with both options.
     void excludes(const std::string& name);
-    /// The value that is there already is the default, and shown by --help.
+    /// Makes the current value the default, which --help shows.
     void showDefault();
 
   private:
     CLI::Option* m_option;
 };
 
-/// A command, or the program itself. A handle: copies are the same command. Values that options
-/// fill must live until the command line has been read and its command run.
+/// A command, or the program itself. A handle: copies refer to the same command. Values set by
+/// options must live until the command line has been parsed and its command has run.
 class Command {
   public:
     explicit Command(CLI::App* command) : m_command(command) {}
 
-    /// A command that needs one of its own below it.
+    /// A command that requires a subcommand.
     Command group(const std::string& name, const std::string& text);
-    /// A command below this one; `chosen` is called when it stands on the command line.
+    /// Adds a subcommand; `chosen` is called if it is on the command line.
     Command command(const std::string& name, const std::string& text, std::function<void()> chosen);
 
-    /// Names without a dash are arguments known by their place.
+    /// Names without a dash are positional arguments.
     Option option(const std::string& names, std::string& value, const std::string& text);
     Option option(const std::string& names, std::vector<std::string>& values,
                   const std::string& text);
     Option flag(const std::string& names, bool& value, const std::string& text);
 
-    /// What --help says behind all else.
+    /// Text at the end of --help.
     void footer(const std::string& text);
 
   private:

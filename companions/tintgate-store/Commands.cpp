@@ -26,9 +26,8 @@ std::int64_t milliseconds() {
 
 const std::string& Invocation::givenAddress() const {
     if (address.empty()) {
-        throw Failure(
-            Status::BadCommand,
-            "which store? Say --store FOLDER or --store SERVICE, or set TINTGATE_STORE to it");
+        throw Failure(Status::BadCommand,
+                      "no store: use --store FOLDER or --store SERVICE, or set TINTGATE_STORE");
     }
     return address;
 }
@@ -38,7 +37,7 @@ std::unique_ptr<store::StoreEngine> Invocation::open() const {
 }
 
 std::string completeAddress(const std::string& typed) {
-    constexpr std::size_t longestAddress = 127; // What a job can name.
+    constexpr std::size_t longestAddress = 127; // Limit of a job's argument.
     std::error_code none;
     const std::string address =
         typed.find('/') == std::string::npos
@@ -46,17 +45,17 @@ std::string completeAddress(const std::string& typed) {
             : std::filesystem::absolute(typed, none).lexically_normal().string();
     if (address.size() > longestAddress) {
         std::fprintf(stderr,
-                     "tintgate-store: warning: the store's address has %zu bytes; a job can name "
+                     "tintgate-store: warning: the store's address has %zu bytes; a job can use "
                      "at most %zu\n",
                      address.size(), longestAddress);
     }
-    // A login carries one byte for each character. Lead bytes from C4 on are those of others.
+    // A login passes one byte per character. Lead bytes from C4 up start characters above U+00FF.
     const bool isLatin1 =
         base::isUtf8(address) &&
         std::all_of(address.begin(), address.end(), [](unsigned char byte) { return byte < 0xC4; });
     if (!isLatin1) {
         std::fprintf(stderr, "tintgate-store: warning: the store's address has characters that a "
-                             "job can't name; its run ends with 150\n");
+                             "job can't use; its run ends with 150\n");
     }
     return address;
 }

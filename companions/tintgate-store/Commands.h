@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The commands of tintgate-store. Each group of them is one source file.
+// The commands of tintgate-store. Each group has its own source file.
 #pragma once
 
 #include <functional>
@@ -12,21 +12,21 @@
 
 namespace admin {
 
-/// What the options in front of a command say, and what the command then is to do.
+/// The options that precede a command, and the action of the command.
 struct Invocation {
     std::string address;
     bool json = false;
     std::function<void()> action;
 
-    /// The store. Throws Failure (BadCommand) where none is named.
+    /// Opens the store. Throws Failure (BadCommand) if none is named.
     std::unique_ptr<store::StoreEngine> open() const;
 
-    /// The address as it was given; the same failure.
+    /// The address as given. Same failure.
     const std::string& givenAddress() const;
 };
 
-/// An address as it was typed, as clients give it. People may name a folder as a shell does, by a
-/// path with a slash; what has none is a connection service.
+/// Completes a typed address to the form that clients use. As in a shell, a path with a slash is a
+/// folder; anything else is a connection service.
 std::string completeAddress(const std::string& typed);
 
 void addStoreCommands(Command program, Invocation& invocation);  ///< make, upgrade, info
@@ -46,7 +46,7 @@ void addLogCommand(Command program, Invocation& invocation);   ///< log
 /// diagnose
 void addDiagnoseCommand(Command program, Invocation& invocation);
 
-/// A command with its options' values, which it is given when it is run.
+/// Adds a command with its own options; `run` is called with their values.
 template<class Options>
 Command addCommand(Command group, Invocation& invocation, const std::string& name,
                    const std::string& text, std::shared_ptr<Options> options,
@@ -55,8 +55,8 @@ Command addCommand(Command group, Invocation& invocation, const std::string& nam
         name, text, [&invocation, options, run] { invocation.action = [=] { run(*options); }; });
 }
 
-/// A line on standard error for whoever waits: only on a terminal, and at most ten times a second.
-/// It is gone when this goes.
+/// Shows a progress line on standard error for waiting people: only on a terminal, and at most ten
+/// times a second. Removes the line when destroyed.
 class Progress {
   public:
     Progress(std::size_t total, std::string what);

@@ -31,12 +31,12 @@ void addCopyCommand(Command program, Invocation& invocation) {
     command.option("from", options->from, "Store to copy: folder or connection service").required();
     command
         .option("to", options->to,
-                "Where the new one is to be: a folder that is empty or not there, or a "
-                "connection service whose\ndatabase holds no store")
+                "Place of the new store: an empty or missing folder, or a connection service "
+                "whose\ndatabase contains no store")
         .required();
-    command.footer("Everything is copied as it is: tickets, users, and files with their versions, "
-                   "times and numbers. Nobody\ncan log in to the new store before it is complete; "
-                   "a copy that was broken off is run again. Nobody\nshould work on the old store "
+    command.footer("Copies everything unchanged: tickets, users, and files with their versions, "
+                   "times and numbers. Nobody\ncan log in to the new store until it is complete; "
+                   "repeat an interrupted copy. Nobody should\nwork on the old store "
                    "meanwhile.");
 }
 

@@ -18,8 +18,8 @@ namespace admin {
 
 namespace {
 
-/// UTF-8 to one byte a character. `what` names the thing in messages, which never show it: it may
-/// be a password.
+/// Converts UTF-8 to one byte per character. `what` names the text in messages, which never show
+/// it, because it may be a password.
 std::string narrowed(const std::string& typed, const std::string& what) {
     if (typed.empty()) {
         throw Failure(Status::BadInput, what + " is empty");
@@ -56,14 +56,14 @@ void noteSignal(int signal) {
     caughtSignal = signal;
 }
 
-/// The terminal without echo. Signals that end or stop the program are let through once the echo is
-/// back.
+/// Turns the terminal's echo off. Signals that terminate or stop the program are delivered after
+/// the echo is restored.
 class SilentTerminal {
   public:
     explicit SilentTerminal(int terminal) : m_terminal(terminal) {
         caughtSignal = 0;
         struct sigaction note = {};
-        note.sa_handler = noteSignal; // No SA_RESTART: a signal is to end the reading.
+        note.sa_handler = noteSignal; // No SA_RESTART, because a signal must interrupt read.
         for (std::size_t i = 0; i < std::size(signals); ++i) {
             sigaction(signals[i], &note, &m_former[i]);
         }
@@ -98,7 +98,7 @@ std::string readHidden(int terminal, const std::string& question) {
     {
         const SilentTerminal silent(terminal);
         if (write(terminal, question.data(), question.size()) < 0) {
-            throw Failure(Status::LocalFile, "the terminal can't be written");
+            throw Failure(Status::LocalFile, "can't write to the terminal");
         }
         char byte = 0;
         while (caughtSignal == 0) {
@@ -109,13 +109,13 @@ std::string readHidden(int terminal, const std::string& question) {
             line += byte;
         }
     }
-    if (caughtSignal != 0) { // It was one that stopped the program, and it goes on now.
+    if (caughtSignal != 0) { // The program was stopped and now continues.
         throw Failure(Status::BadInput, "no password was typed");
     }
     return line;
 }
 
-/// -1 where there is none.
+/// -1 if there is no terminal.
 int openTerminal() {
     return isatty(STDIN_FILENO) != 0 ? open("/dev/tty", O_RDWR | O_CLOEXEC | O_NOCTTY) : -1;
 }
@@ -148,8 +148,9 @@ std::string userName(const std::string& typed) {
 
 void refuseColon(const std::string& text, const std::string& what) {
     if (text.find(':') != std::string::npos) {
-        throw Failure(Status::BadInput, what + " has a \":\", so no job could use it: a job's "
-                                               "arguments keep only what follows the last \":\"");
+        throw Failure(Status::BadInput, what +
+                                            " has a \":\", so no job could use it: of a job's "
+                                            "arguments, only the text after the last \":\" counts");
     }
 }
 

@@ -1,20 +1,20 @@
 // SPDX-License-Identifier: Apache-2.0
-// Names and passwords of users, in the bytes in which a login brings them: one for each character.
+// Names and passwords of users as the bytes of a login: one byte per character.
 #pragma once
 
 #include <string>
 
 namespace admin {
 
-/// The name's bytes. Throws Failure (BadInput) for a name that no login could bring: empty, of more
-/// than 127 characters, with control characters or any above U+00FF.
+/// The name's bytes. Throws Failure (BadInput) for a name that a login can't contain: empty, more
+/// than 127 characters, control characters, or characters above U+00FF.
 std::string userName(const std::string& typed);
 
-/// The same for a user that is to be made. Also refuses a name with a ":", with which nobody could
-/// log in: of each of a job's arguments only what follows the last ":" counts.
+/// Same for a new user. Also rejects a name with a ":", which could not log in: of each job
+/// argument, only the text after the last ":" counts.
 std::string newUserName(const std::string& typed);
 
-/// Throws Failure (BadInput) if a name, a password or an address has a ":"; `what` names it.
+/// Throws Failure (BadInput) if a name, a password or an address contains a ":"; `what` names it.
 void refuseColon(const std::string& text, const std::string& what);
 
 /// The password's bytes: the first line of a file ("-" is standard input), or with an empty path

@@ -137,15 +137,15 @@ void addDiagnoseCommand(Command program, Invocation& invocation) {
     command.option("--strip", options->strip, "1 (the default) or 2");
     command
         .option("--selector", options->selector,
-                "The strip selector as the client passes it, 0 for the first strip")
+                "Strip selector as passed by the client; 0 is the first strip")
         .excludes("--strip");
-    command.flag("--remeasure", options->remeasure, "As the client asks for a new measurement");
+    command.flag("--remeasure", options->remeasure, "As if the client requested a new measurement");
     command.option("--user", options->user, "Name of the user who logs in");
     command.flag("--all", options->all, "Show every key and file that the run reads");
     command.footer(
-        "Runs the tool on the job up to where a measurement would start, with nothing written to "
-        "the store\nor to the job's folder. Names the key, file or setting that makes the run fail "
-        "or its result wrong,\nand the exit code that the run would end with.");
+        "Runs the tool on the job up to the start of a measurement, without writing to the store "
+        "or to the\njob's folder. Names the key, file or setting that makes the run fail or its "
+        "result wrong, and the\nexit code of the run.");
 }
 
 } // namespace admin

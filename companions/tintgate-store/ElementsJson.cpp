@@ -21,7 +21,7 @@ namespace {
 constexpr std::array<const char*, 10> words = {"",       "pointer", "int",   "double", "string",
                                                "binary", "",        "int64", "uint",   "uint64"};
 
-/// Whole numbers up to here are exact in every JSON reader.
+/// Integers up to here are exact in every JSON reader.
 constexpr std::int64_t largestExact = std::int64_t{1} << 53;
 
 constexpr std::uint64_t plainNan = 0x7FF8000000000000;
@@ -34,7 +34,7 @@ constexpr std::size_t nanDigits = 16;
     if (text.size() > 60) {
         text = text.substr(0, 60) + "...";
     }
-    throw Failure(Status::BadInput, text + " is no " + typeWord(type));
+    throw Failure(Status::BadInput, text + " is not of type " + typeWord(type));
 }
 
 template<class T>
@@ -72,7 +72,7 @@ std::optional<double> doubleFromWord(const std::string& text) {
     return text.rfind(wayToNan, 0) == 0 ? nanFromText(text) : std::nullopt;
 }
 
-/// Empty for a finite number.
+/// Empty for finite numbers.
 std::string wordOfDouble(double number) {
     if (std::isinf(number)) {
         return number < 0 ? "-Infinity" : "Infinity";
@@ -89,7 +89,7 @@ std::string wordOfDouble(double number) {
     return wayToNan + std::string(text);
 }
 
-/// The number in its own type; `quoted` says whether its digits may stand in a string.
+/// The number in its own type. `quoted` permits its digits in a string.
 template<class T>
 T wholeFromJson(const Json& json, PARAM_TYPE type, bool quoted) {
     std::optional<T> number;
@@ -117,14 +117,14 @@ double doubleFromJson(const Json& json) {
     return *number;
 }
 
-/// The bytes behind a member "base64", or nothing.
+/// The bytes of a "base64" member, or nothing.
 std::optional<std::string> bytesFromJson(const Json& json) {
     return json.is_string() ? fromBase64(json.get_ref<const std::string&>()) : std::nullopt;
 }
 
 store::Value textValue(std::string bytes) {
     if (bytes.find('\0') != std::string::npos) {
-        throw Failure(Status::BadInput, "a string holds no zero byte; a binary may");
+        throw Failure(Status::BadInput, "a string can't contain a zero byte; a binary can");
     }
     return store::Text{std::make_shared<store::Bytes>(std::move(bytes))};
 }
@@ -174,7 +174,7 @@ class JsonOfValue {
     }
 };
 
-/// The run's type and its values; everything else about it is refused.
+/// The run's type and values. Any other member is refused.
 std::pair<PARAM_TYPE, const Json*> typeAndValues(const Json& run) {
     PARAM_TYPE type = PARAM_DELETE;
     const Json* values = nullptr;
@@ -183,7 +183,7 @@ std::pair<PARAM_TYPE, const Json*> typeAndValues(const Json& run) {
             continue;
         }
         if (values != nullptr || typeOfWord(name) == PARAM_DELETE) {
-            throw Failure(Status::BadInput, "\"" + name + "\" is no type, or a second one");
+            throw Failure(Status::BadInput, "\"" + name + "\" is not a type, or a second one");
         }
         type = typeOfWord(name);
         values = &member;
@@ -194,7 +194,7 @@ std::pair<PARAM_TYPE, const Json*> typeAndValues(const Json& run) {
     return {type, values};
 }
 
-/// Where the run starts: at the next position at the earliest.
+/// The start of the run: the next position or a later one.
 std::int64_t startOf(const Json& run, std::int64_t next) {
     if (!run.contains("at")) {
         return next;
@@ -202,23 +202,23 @@ std::int64_t startOf(const Json& run, std::int64_t next) {
     const Json& at = run["at"];
     if (!at.is_number_integer() || at.get<std::int64_t>() < next ||
         at.get<std::int64_t>() > store::highestPosition) {
-        throw Failure(Status::BadInput, "\"at\" is " + at.dump(-1, ' ', true) +
-                                            ", and not a position from " + std::to_string(next) +
-                                            " to " + std::to_string(store::highestPosition));
+        throw Failure(Status::BadInput,
+                      "\"at\" is " + at.dump(-1, ' ', true) + ", but must be a position from " +
+                          std::to_string(next) + " to " + std::to_string(store::highestPosition));
     }
     return at.get<std::int64_t>();
 }
 
-/// Puts a run's elements in place. The position behind them.
+/// Stores a run's elements. Returns the position after them.
 std::int64_t putRun(const Json& run, std::int64_t next, store::Elements& elements) {
     if (!run.is_object()) {
-        throw Failure(Status::BadInput, "elements are {\"TYPE\": VALUE} or a list of such");
+        throw Failure(Status::BadInput, "elements must be {\"TYPE\": VALUE} or a list of these");
     }
     const auto [type, values] = typeAndValues(run);
     std::int64_t position = startOf(run, next);
     const auto put = [&, type = type](const Json& value) {
         if (position > store::highestPosition) {
-            throw Failure(Status::BadInput, "there are more elements than a key can hold");
+            throw Failure(Status::BadInput, "there are more elements than a key can have");
         }
         elements.put(static_cast<int>(position++), valueFromJson(type, value));
     };
@@ -268,7 +268,7 @@ store::Value valueFromJson(PARAM_TYPE type, const Json& json) {
         }
         refuse(json, type);
     default:
-        throw Failure(Status::BadInput, "that is no type");
+        throw Failure(Status::BadInput, "this is not a type");
     }
 }
 

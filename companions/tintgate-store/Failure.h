@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// How a command of tintgate-store ends.
+// Failures of commands of tintgate-store.
 #pragma once
 
 #include "CompanionStatuses.h"

@@ -45,7 +45,7 @@ void judge(Row& row, bool named, Write write) {
     row["fault"] = isXml && !fault.empty() ? Row(fault) : Row();
 }
 
-/// For people: "well-formed", or the fault.
+/// Adds the result for people: "well-formed", or the error.
 void tellXml(Row& row) {
     row["xml"] = row["wellFormed"].is_null() ? Row()
                  : row["fault"].is_null()
@@ -57,7 +57,7 @@ Row versionRow(const Row& number, std::uint64_t size, std::int64_t time) {
     return {{"version", number}, {"size", size}, {"time", time}, {"written", shownTime(time)}};
 }
 
-/// A JDF that can't be prepared is delivered as it is: it's still the job's.
+/// A JDF that can't be prepared is delivered unchanged, because it is still the job's.
 void deliver(store::StoreEngine& store, const std::string& local, const std::string& path,
              int updates) {
     LocalInput input(local);
@@ -68,7 +68,7 @@ void deliver(store::StoreEngine& store, const std::string& local, const std::str
     try {
         readyJdf(store, path, updates);
     } catch (const Failure& failure) {
-        std::cerr << "tintgate-store: warning: delivered as it is, " << failure.what() << '\n';
+        std::cerr << "tintgate-store: warning: delivered unchanged, " << failure.what() << '\n';
     }
 }
 
@@ -172,7 +172,7 @@ void restore(const Invocation& invocation, const FileOptions& options) {
 
 void prune(const Invocation& invocation, const FileOptions& options) {
     if (options.all != options.path.empty()) {
-        throw Failure(Status::BadCommand, "say a path, or --all");
+        throw Failure(Status::BadCommand, "give a path, or --all");
     }
     if (options.keep.empty() && options.older.empty()) {
         throw Failure(Status::BadCommand, "say --keep, --older or both");
@@ -224,7 +224,7 @@ void clean(const Invocation& invocation) {
 } // namespace
 
 void addFileCommands(Command program, Invocation& invocation) {
-    auto group = program.group("file", "Files of the server, and what they were before");
+    auto group = program.group("file", "Files of the server and their old versions");
     const auto options = std::make_shared<FileOptions>();
     const auto command = [&](const char* word, const char* text, auto run) -> Command {
         return addCommand<FileOptions>(
@@ -239,28 +239,28 @@ void addFileCommands(Command program, Invocation& invocation) {
     putting.option("local", options->local, "File or folder; - for standard input").required();
     withPath(putting);
     putting.footer(
-        "A file that is replaced is kept as a version. A name that ends in .jdf is a JDF, "
-        "which is made ready for\nits updates where the store says so: see jdf --help.");
+        "A replaced file is kept as a version. A name that ends in .jdf is a JDF, which is "
+        "prepared for\nits updates if the store requires it: see jdf --help.");
 
-    auto getting = command("get", "Fetch a file", get);
+    auto getting = command("get", "Download a file", get);
     withPath(getting);
-    getting.option("local", options->local, "Where to; - for standard output").required();
+    getting.option("local", options->local, "Target; - for standard output").required();
     getting.option("--version", options->version, "An older version, by its number");
 
     command("list", "List files, and whether each XML file is well-formed", list)
-        .option("prefix", options->path, "Only paths that start so");
+        .option("prefix", options->path, "Only paths with this prefix");
     withPath(command("versions", "List versions of a file, and whether each is well-formed XML",
                      versions));
 
-    auto restoring = command("restore", "Put an older version in place again", restore);
+    auto restoring = command("restore", "Restore an older version", restore);
     withPath(restoring);
     restoring.option("version", options->version, "Its number").required();
-    restoring.footer("What it replaces is kept as a version in turn.");
+    restoring.footer("The replaced file is kept as a version too.");
 
     auto pruning = command("prune", "Remove older versions", prune);
     pruning.option("path", options->path, "Server path");
-    pruning.flag("--all", options->all, "Of all files");
-    pruning.option("--keep", options->keep, "How many of the newest versions stay");
+    pruning.flag("--all", options->all, "Versions of all files");
+    pruning.option("--keep", options->keep, "Number of newest versions to keep");
     pruning.option("--older", options->older,
                    "Only those that were written so long ago, such as 90d for 90 days");
     pruning.flag("--dry-run", options->dryRun, "Remove nothing, and say what would be freed");
@@ -273,7 +273,7 @@ void addFileCommands(Command program, Invocation& invocation) {
     removing.footer("There is no way back. Whether a job names the file is not looked at: "
                     "\"job delete\" removes the files\nof a job.");
 
-    command("clean", "Remove what interrupted deliveries left behind",
+    command("clean", "Remove leftovers of interrupted deliveries",
             [](const auto& invoked, const auto&) { clean(invoked); });
 }
 

@@ -16,10 +16,10 @@ namespace {
 struct JdfOptions {
     std::string job;
     std::string updates;
-    std::string from; ///< Empty: all versions, if they are of one delivery.
+    std::string from; ///< Empty: all versions, if they are of the same delivery.
 };
 
-/// As given, else as the store has it for deliveries, else the usual number.
+/// The given number, or else the store's number for deliveries, or else the default.
 int updatesOf(store::StoreEngine& store, const JdfOptions& options) {
     if (!options.updates.empty()) {
         return wholeNumber(options.updates, 1, std::numeric_limits<int>::max(),
@@ -80,10 +80,10 @@ void rebuild(const Invocation& invocation, const JdfOptions& options) {
 } // namespace
 
 void addJdfCommands(Command program, Invocation& invocation) {
-    auto group = program.group("jdf", "Keep the JDF of a job whole through its updates");
-    group.footer("The update of a JDF may cut its end off; docs/jdf.md tells when. The integer "
-                 "System/Jdf/Updates of the\nsystem ticket has each JDF made ready for so many "
-                 "updates when \"file put\" delivers it:\n"
+    auto group = program.group("jdf", "Keep the JDF of a job intact during its updates");
+    group.footer("The update of a JDF may cut its end off; docs/jdf.md explains when. The integer "
+                 "System/Jdf/Updates of\nthe system ticket is the number of updates for which "
+                 "\"file put\" prepares each JDF:\n"
                  "  tintgate-store key set system System/Jdf/Updates int 8");
     const auto options = std::make_shared<JdfOptions>();
     const auto command = [&](const char* word, const char* text, auto run) -> Command {
@@ -92,19 +92,20 @@ void addJdfCommands(Command program, Invocation& invocation) {
             [&invocation, run](const JdfOptions& given) { run(invocation, given); });
         added.option("job", options->job, "Number of the job").required();
         added.option("--updates", options->updates,
-                     "For how many, 1 to 16; else as the store says, else 8");
+                     "Number of updates, 1 to 16; default: the store's number, or 8");
         return added;
     };
-    command("ready", "Prepare the JDF so that updates lose nothing of it", ready)
-        .footer("Empties the print dates, sees to the element that holds measurements, and puts "
-                "blanks behind the end\nfor the updates to lose. What the file was is kept as a "
+    command("ready", "Prepare the JDF so that updates lose nothing", ready)
+        .footer("Empties the print dates, ensures the element for measurements, and adds blanks "
+                "at the end\nfor the updates to lose. The old file is kept as a "
                 "version.");
     auto rebuilding = command(
-        "rebuild", "Put the measurements of all versions into the oldest sound one", rebuild);
-    rebuilding.option("--from", options->from, "Leave out versions below this one");
-    rebuilding.footer("For a JDF that updates have damaged. The result is made ready, and what it "
-                      "replaces is kept as a\nversion. If several JDFs were delivered under one "
-                      "name, --from is the number of the first version of\nthe one that counts.");
+        "rebuild", "Put the measurements of all versions into the oldest intact one", rebuild);
+    rebuilding.option("--from", options->from, "Ignore versions below this one");
+    rebuilding.footer(
+        "For a JDF damaged by updates. The result is prepared for updates, and the file "
+        "that it replaces is\nkept as a version. If several JDFs were delivered under one "
+        "name, --from is the number of the first\nversion of the valid one.");
 }
 
 } // namespace admin

@@ -13,7 +13,7 @@ namespace admin {
 
 namespace {
 
-// What the update searches for.
+// Texts that the update searches for.
 constexpr std::string_view fullTag =
     "<tazo:MeasurementData ID=\"BJDFLink0000006\" Class=\"Parameter\" Status=\"Available\">";
 constexpr std::string_view holderEnd = "</tazo:MeasurementData>";
@@ -24,21 +24,21 @@ constexpr std::string_view holderName = "tazo:MeasurementData";
 constexpr std::string_view linkName = "tazo:MeasurementDataLink";
 constexpr const char* parties[] = {"Sender", "Receiver"};
 
-// The same tag, and what stands in for the name of a namespace where the JDF gives none.
+// The same tag reordered, and a namespace declaration for JDFs that have none.
 constexpr const char* reorderedAttributes =
     " Class=\"Parameter\" ID=\"BJDFLink0000006\" Status=\"Available\">";
 constexpr const char* namespaceDeclaration = " xmlns:tazo=\"urn:tazo\"";
 
-constexpr std::size_t smallestJdf = 5000; // Below it nothing is updated.
+constexpr std::size_t smallestJdf = 5000; // A smaller file is never updated.
 
-/// Of the dates, which n updates of one party make 10(2^n - 1) and 8(2^n - 1) bytes long.
+/// Bytes lost by the dates: n updates of one party make them 10(2^n - 1) and 8(2^n - 1) bytes long.
 std::size_t bytesLostIn(int updates) {
     const auto n = static_cast<std::size_t>(updates);
     return 36 * ((std::size_t{1} << n) - n - 1);
 }
 
-/// For XML's judge alone: gives the missing blank between two spectral values the place of a letter
-/// of the second one's name, so that nothing moves.
+/// Only for the XML check: puts the missing blank between two spectral values in place of a letter
+/// of the second one's name, so that no position changes.
 std::string judged(std::string_view jdf) {
     constexpr std::string_view missing = "\"dvalue";
     std::string text(jdf);
@@ -62,10 +62,10 @@ std::size_t backOverBlanks(std::string_view text, std::size_t at) {
                   "line " + std::to_string(lines + 1) + " would mislead the update: " + why);
 }
 
-/// Changes to a text, whose places are those before any of them.
+/// Changes to a text, at positions in the original.
 class Edits {
   public:
-    /// Of two at one place the one that was told first comes first.
+    /// Of two changes at one position, the one added first comes first.
     void replace(std::size_t at, std::size_t count, std::string text) {
         m_edits.push_back({at, count, std::move(text)});
     }
@@ -93,7 +93,7 @@ class Edits {
 
 class Preparation {
   public:
-    /// With declares, our elements bring the declaration of their prefix.
+    /// With `declares`, our elements declare their prefix.
     Preparation(std::string_view text, const XmlMap& map, bool declares)
         : m_text(text), m_map(map), m_declaration(declares ? namespaceDeclaration : "") {}
 
@@ -115,8 +115,8 @@ class Preparation {
     }
 
   private:
-    /// The date and then the time, in the form that is searched for, in front of all that looks
-    /// like them.
+    /// Puts the date and then the time, in the searched form, before everything that resembles
+    /// them.
     void emptyDates(const XmlElement& party) {
         const auto attributes = m_map.attributesOf(party);
         const auto named = [&](std::string_view name) {
@@ -152,8 +152,8 @@ class Preparation {
     }
 
     /// The update starts at the first text of this kind, which may be in another element's name
-    /// (<SenderInfo>) or in a comment, and takes the next date. A blank hides other elements' dates
-    /// from it.
+    /// (<SenderInfo>) or in a comment, and uses the next date. A blank hides the dates of other
+    /// elements from it.
     void hideDatesOfOthers(const std::string& party, const XmlElement* element) {
         const std::size_t from = m_text.find("<" + party);
         const std::size_t end = element == nullptr ? m_text.size() : element->tag;
@@ -224,10 +224,10 @@ class Preparation {
         }
     }
 
-    /// Appends to a pool of the root element, which is made where there is none.
+    /// Appends to a pool of the root element, and adds the pool if it is missing.
     void addTo(const std::string& poolName, const std::string& text) {
         const XmlElement& root = m_map.elements().front();
-        const std::size_t prefix = root.name.find(':') + 1; // 0 without one.
+        const std::size_t prefix = root.name.find(':') + 1; // 0 without a prefix.
         const std::string name = std::string(root.name.substr(0, prefix)) + poolName;
         const auto* const pool = m_map.first(name, &root);
         if (pool != nullptr && pool->hasEmptyTag()) {
@@ -242,13 +242,13 @@ class Preparation {
         }
     }
 
-    /// Gives an element with an empty tag an end tag.
+    /// Replaces an empty tag by a start tag and an end tag.
     void open(const XmlElement& element, const std::string& inside) {
         m_edits.replace(element.tagEnd - 2, 2,
                         ">" + inside + "</" + std::string(element.name) + ">");
     }
 
-    /// The update's own tag is reordered, since its search must not find that.
+    /// The update's own tag is reordered, because its search must not find it.
     void openHolder(const XmlElement& holder) {
         const auto tag = m_text.substr(holder.tag, holder.tagEnd - holder.tag - 2);
         if (tag == fullTag.substr(0, fullTag.size() - 1)) {
@@ -264,20 +264,20 @@ class Preparation {
     const XmlMap& m_map;
     const std::string m_declaration;
     const XmlElement* const m_parties[2] = {m_map.first(parties[0]), m_map.first(parties[1])};
-    std::set<std::size_t> m_hidden; ///< Ends of attributes' names.
+    std::set<std::size_t> m_hidden; ///< Ends of attribute names.
     Edits m_edits;
     std::vector<std::string> m_changes;
 };
 
-/// Searches as the update does, and throws where it would go astray: its tokens may also stand in a
-/// comment, say, or in the name of another element.
+/// Searches like the update and throws if it would fail: its tokens may also occur in a comment,
+/// for example, or in the name of another element.
 void checkSearches(std::string_view text, const XmlMap& map) {
     const std::size_t end = text.find(holderEnd);
     if (end != map.first(holderName)->endTag) {
         failMisled(text, end, "</tazo:MeasurementData> is no tag there");
     }
     if (const auto tag = text.find(fullTag); tag != std::string_view::npos) {
-        failMisled(text, tag, "the text of its own opening tag stands there");
+        failMisled(text, tag, "the text contains the update's own opening tag");
     }
     for (const std::string party : parties) {
         const auto* const element = map.first(party);
@@ -295,21 +295,21 @@ void checkSearches(std::string_view text, const XmlMap& map) {
                            attribute.name == token.substr(0, token.find('='));
                 });
             if (!isOwn) {
-                failMisled(text, at, "a date is there that is not the " + party + "'s");
+                failMisled(text, at, "there is a date that is not the " + party + "'s");
             }
             from = at;
         }
     }
 }
 
-/// Puts so many blanks behind the text as the updates take, and 5,000 bytes in front of them.
+/// Adds as many blanks after the text as the updates take. 5,000 bytes must precede the blanks.
 void addBlanks(PreparedJdf& jdf, int updates) {
     const std::size_t size = jdf.text.find_last_not_of(' ') + 1;
     const std::size_t wanted = bytesLostIn(updates) + smallestJdf - std::min(size, smallestJdf);
     const std::size_t there = jdf.text.size() - size;
     if (there < wanted) {
         jdf.text.append(wanted - there, ' ');
-        jdf.changes.push_back("added " + std::to_string(wanted - there) + " blanks behind the end");
+        jdf.changes.push_back("added " + std::to_string(wanted - there) + " blanks at the end");
     }
 }
 
@@ -331,7 +331,7 @@ void checkCount(const XmlMap& map) {
     }
 }
 
-/// A text of more than one byte a sign.
+/// Whether the text uses more than one byte per character.
 bool isWide(std::string_view text) {
     return text.find('\0') != std::string_view::npos;
 }
@@ -349,8 +349,9 @@ bool isSound(std::string_view jdf) {
 PreparedJdf prepared(const std::string& jdf, int updates) {
     checkLimits(jdf.size(), updates);
     if (isWide(jdf)) {
-        throw Failure(Status::JdfNotSound,
-                      "it is UTF-16, and the update finds its tokens in UTF-8 and its like only");
+        throw Failure(
+            Status::JdfNotSound,
+            "it is UTF-16, but the update finds its tokens only in UTF-8 and similar encodings");
     }
     const std::string text = judged(jdf);
     const XmlMap map(text);

@@ -1,16 +1,16 @@
 // SPDX-License-Identifier: Apache-2.0
-// A JDF's text, made such that updates leave it whole.
+// Prepares a JDF's text so that updates leave it intact.
 //
-// The update of a JDF works on text, and its delete is none: it doubles what it was to take away
-// and takes twice as much from the end of the file. It deletes
+// The update of a JDF works on text, and its deletion is faulty: it duplicates the text to delete
+// and removes twice as much from the end of the file. It deletes
 //
-//   <Sender printdate="2024-05-31"        a date that is there, to put another in its place
+//   <Sender printdate="2024-05-31"        an existing date, to replace it
 //   <tazo:MeasurementData ID="BJDFLink0000006" Class="Parameter" Status="Available">
-//                                         its own element, with all that is in it
+//                                         its own element with all its content
 //
-// and where it misses "</ResourceLinkPool>" or "</ResourcePool>" it writes in front of all. A text
-// that is prepared gives it nothing to delete but the dates of its own earlier updates, and blanks
-// at the end to lose:
+// and if "</ResourceLinkPool>" or "</ResourcePool>" is missing, it writes at the very beginning. In
+// a prepared text it deletes only the dates of its own earlier updates, and loses only blanks at
+// the end:
 //
 //   <Sender printdate="" printtime=""/>
 //   <ResourcePool> ...
@@ -19,7 +19,7 @@
 //   </ResourcePool>
 //   <ResourceLinkPool> ... <tazo:MeasurementDataLink rRef="BJDFLink0000006" Usage="Input"/>
 //
-// The same element for an XML reader, while the search for the tag as it was no longer finds it.
+// For an XML reader this is the same element, but the search for the original tag does not find it.
 #pragma once
 
 #include <cstddef>
@@ -29,40 +29,38 @@
 
 namespace admin {
 
-/// Each update makes a date longer than twice what it was, and the next one loses twice that. So
-/// the blanks double with every update: 2,052 for six, 2.4 million for sixteen.
+/// Each update makes a date longer than twice its former length, and the next one loses twice that.
+/// So each update needs twice the blanks: 2,052 for six, 2.4 million for sixteen.
 inline constexpr int mostUpdates = 16;
 inline constexpr int usualUpdates = 8;
 
-/// A JDF beyond this is not worked on, since the whole of it is in memory several times.
+/// A larger JDF is not processed, because all of it is in memory several times.
 inline constexpr std::size_t largestJdf = std::size_t{256} << 20;
 
-/// Whether the text is well-formed XML and can be worked on. Here and below, spectral values count
-/// as if the blanks that they are always written without were there.
+/// Whether the text is well-formed XML and can be processed. Here and below, spectral values count
+/// as if the blanks between them, which are never written, were there.
 bool isSound(std::string_view jdf);
 
 struct PreparedJdf {
     std::string text;
-    std::vector<std::string> changes; ///< For people, in the past tense; none if it was prepared.
+    std::vector<std::string> changes; ///< For people, past tense. Empty if it was prepared already.
 };
 
-/// Prepares a text for so many updates, of which each may be that of any strip or job. The rest of
-/// it stays byte for byte, except for one blank: an attribute of another element that the update
-/// would take for a date of the Sender or Receiver is written as `printdate =""`. Throws Failure:
-/// JdfNotSound for a text that is not well-formed, or in which the update would find its tokens in
-/// the wrong place all the same; JdfTooLarge beyond the limits above and for more than
-/// mostXmlElements.
+/// Prepares a text for `updates` updates of any strip or job. The rest of the text is unchanged
+/// except for one blank: another element's attribute that the update would mistake for a date of
+/// the Sender or Receiver is written as `printdate =""`. Throws Failure: JdfNotSound if the text is
+/// not well-formed or the update would still find its tokens in the wrong place; JdfTooLarge beyond
+/// the limits above and for more than mostXmlElements.
 PreparedJdf prepared(const std::string& jdf, int updates);
 
-/// The part of a prepared text that no update changes: without measurements, the elements that
-/// contain them and link to them, dates, and all blanks. Two texts of one delivery have the same.
+/// The part of a prepared text that updates don't change: without measurements, their elements and
+/// the links to these, dates, and all blanks. It is equal for all texts of one delivery.
 std::string unchangedPart(std::string_view prepared);
 
-/// The measurements in a text, well-formed or not, as they were written; those that are cut off
-/// are left out.
+/// The measurements in a text, well-formed or not, as written. Truncated ones are left out.
 std::vector<std::string> measurementsIn(std::string_view jdf);
 
-/// Appends measurements to the element that holds them in a prepared text.
+/// Appends measurements to their element in a prepared text.
 std::string withMeasurements(std::string jdf, const std::vector<std::string>& measurements);
 
 } // namespace admin

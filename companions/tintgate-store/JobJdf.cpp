@@ -21,8 +21,8 @@ namespace admin {
 
 namespace {
 
-/// Collects what is written to it, up to the largest JDF that is worked on. Throws Failure
-/// (JdfTooLarge) at more.
+/// Collects what is written to it, up to the size limit of a JDF. Throws Failure (JdfTooLarge)
+/// above that.
 class JdfContent : private std::streambuf {
   public:
     JdfContent() : m_stream(this) { m_stream.exceptions(std::ios::badbit); }
@@ -67,13 +67,13 @@ bool isThere(store::StoreEngine& store, const std::string& path) {
             throw;
         }
         return false;
-    } catch (const Failure&) { // Too large, which is told where it is worked on.
+    } catch (const Failure&) { // Too large; reported when it is processed.
     }
     return true;
 }
 
-/// Throws Failure (Busy), with the file as others wrote it, where it was not `before` any more.
-/// Then what was kept last is neither that nor, where others wrote since, `after`.
+/// Replaces content `before` by `after`. If another process changed the file (the version just kept
+/// is neither of these), restores that version and throws Failure (Busy).
 void exchange(store::StoreEngine& store, const std::string& path, const std::string& before,
               const std::string& after) {
     std::istringstream from(after);
@@ -86,11 +86,11 @@ void exchange(store::StoreEngine& store, const std::string& path, const std::str
     const std::string kept = versionOf(store, path, last);
     if (kept != before && kept != after) {
         store.restoreVersion(path, last);
-        throw Failure(Status::Busy, "somebody else wrote the file meanwhile: try again");
+        throw Failure(Status::Busy, "another process wrote the file meanwhile: try again");
     }
 }
 
-/// Has a failure's text start with the file that it is about.
+/// Prefixes failures with the name of the file.
 template<class Work>
 auto about(const std::string& path, Work work) {
     try {
@@ -102,7 +102,7 @@ auto about(const std::string& path, Work work) {
 
 using Versions = std::vector<std::pair<int, std::string>>;
 
-/// By number, and then the file as it is, with the number 0.
+/// By number, with the current file last, as number 0.
 Versions allVersions(store::StoreEngine& store, const std::string& path, int from) {
     Versions versions;
     for (const auto& version : store.versions(path)) {
@@ -115,10 +115,10 @@ Versions allVersions(store::StoreEngine& store, const std::string& path, int fro
 }
 
 std::string shownVersion(int number) {
-    return number == 0 ? "the file as it is" : "version " + std::to_string(number);
+    return number == 0 ? "the current file" : "version " + std::to_string(number);
 }
 
-/// Whether a version is the delivery of this unchanged part, before or after updates.
+/// Whether a version belongs to the delivery with this unchanged part, before or after updates.
 bool isOfDelivery(const std::string& text, const std::string& unchanged, int updates) {
     try {
         return unchangedPart(prepared(text, updates).text) == unchanged;
@@ -130,8 +130,8 @@ bool isOfDelivery(const std::string& text, const std::string& unchanged, int upd
     }
 }
 
-/// Throws Failure (JdfAmbiguous) if sound versions after the base are not of its delivery: whether
-/// they or what is damaged were delivered last can't be known.
+/// Throws Failure (JdfAmbiguous) if intact versions after the base belong to another delivery: it
+/// is unknown whether they or the damaged ones were delivered last.
 void checkDelivery(const Versions& versions, Versions::const_iterator base,
                    const std::string& sound, int updates) {
     const std::string unchanged = unchangedPart(sound);
@@ -179,7 +179,7 @@ std::vector<std::string> jdfPathsOf(store::StoreEngine& store, int job) {
     };
     paths.erase(std::remove_if(paths.begin(), paths.end(), gone), paths.end());
     if (paths.empty()) {
-        throw Failure(Status::NotThere, "the JDF of " + name + " is not there:" + missing);
+        throw Failure(Status::NotThere, "the JDF of " + name + " does not exist:" + missing);
     }
     return paths;
 }

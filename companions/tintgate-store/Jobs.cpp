@@ -30,7 +30,7 @@ std::string approvalKey(int strip) {
     return measured(strip, "Approval");
 }
 
-/// The last key of a result, and that of a result under a PSD preset.
+/// The last key of a result, with and without a PSD preset.
 constexpr const char* lastKeys[] = {"Values/Decimal", "Values/PSDDecimal"};
 
 using Elements = std::shared_ptr<const store::Elements>;
@@ -108,8 +108,8 @@ void removeKey(store::TicketContent& content, const std::string& key, ResetResul
     result.removed.push_back(key);
 }
 
-/// Writing results ends with a 0 for the verifier. Where that was not there before, the job had
-/// another way to be found, and keeps it.
+/// Writing results ends with a 0 for the verifier. If there was no value before, the job was listed
+/// for another reason, which still applies.
 void reopen(store::TicketContent& content, ResetResult& result) {
     const Job job = jobOf(0, [&](const std::string& key) { return content.find(key); });
     if (job.waits() || !job.hasShowInVerifier) {
@@ -121,7 +121,7 @@ void reopen(store::TicketContent& content, ResetResult& result) {
     result.reopened = true;
 }
 
-/// Why a run that measures this strip would fail.
+/// Reasons why a run that measures this strip would fail.
 std::vector<std::string> obstaclesOf(store::StoreEngine& store, int id, jobkeys::Strip strip) {
     const auto number = [&](const std::string& key) {
         return integerOf(store.key(jobType, id, key)).value_or(0);

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Jobs, as their verification goes.
+// Jobs and the state of their verification.
 #pragma once
 
 #include <map>
@@ -15,12 +15,12 @@ namespace admin {
 /// One strip, as a job's ticket describes it.
 struct Strip {
     int measurements = 0;
-    std::optional<int> approval; ///< 0 failed, above passed; there is no result below 0.
-    bool hasLastKey = false;     ///< The last key of a result.
+    std::optional<int> approval; ///< 0 failed, above 0 passed; below 0 there is no result.
+    bool hasLastKey = false;     ///< The last key of a result exists.
 
     bool isJudged() const { return approval.value_or(-1) >= 0; }
-    /// The run that wrote the result was cut off before its last key. Of a strip that was measured
-    /// before, the last key is that of the former result, so that this is not noticed.
+    /// The run that wrote the result was interrupted before its last key. If the strip was measured
+    /// before, the last key is from the former result, so this is not detected.
     bool isCutOff() const { return isJudged() && !hasLastKey; }
 };
 
@@ -38,7 +38,7 @@ struct Job {
 
     /// Whether a run that does not remeasure finds the job.
     bool waits() const;
-    /// "passed", "failed" or "waiting"; else "-".
+    /// "passed", "failed" or "waiting"; otherwise "-".
     std::string state() const;
 };
 
@@ -51,21 +51,21 @@ std::set<int> familyOf(store::StoreEngine& store, int id);
 
 struct ResetResult {
     int id = 0;
-    bool there = true; ///< False for a ticket that is missing.
+    bool there = true; ///< False if the ticket is missing.
     std::vector<std::string> removed;
     bool reopened = false;
-    std::vector<std::string> obstacles; ///< Why the next run can't succeed; each a sentence.
+    std::vector<std::string> obstacles; ///< Why the next run can't succeed; one sentence each.
 };
 
-/// Takes the results of strips away, so that a job whose write-back was cut off can run again: the
-/// count of measurements, without which the job is measured anew, and the approval, which would
-/// close a job of two strips too early. A job that the run had closed, and that nobody would find
-/// any more, is offered to the verifier again. One step for each ticket. Then looks for what is in
-/// the way of the next run, which measures: it has to find the job, its references, and its strip.
-/// Whether the files are there is not looked at.
+/// Removes the results of strips, so that a job with an interrupted write-back can run again: the
+/// count of measurements, without which the job is measured again, and the approval, which would
+/// close a job of two strips too early. If the run had closed the job and nothing else lists it,
+/// the job is offered to the verifier again. Each ticket is changed in one transaction. Then checks
+/// for obstacles to the next run, which measures: it must find the job, its references and its
+/// strip. Does not check whether the files exist.
 ///
-/// Strips are 0 and 1. With family: also for all jobs of the same parent, for the parent, and for
-/// all jobs whose parent this one is. The job itself comes first.
+/// Strips are 0 and 1. With `family`, also resets all jobs of the same parent, the parent, and all
+/// jobs that have this job as their parent. The job itself comes first.
 std::vector<ResetResult> resetJob(store::StoreEngine& store, int id, const std::vector<int>& strips,
                                   bool family);
 

@@ -22,7 +22,7 @@ struct KeyOptions {
     std::string type;
     std::vector<std::string> values;
     std::string from;
-    std::string position; ///< Empty: the whole key.
+    std::string position; ///< Empty means the whole key.
     bool append = false;
     bool raw = false;
 
@@ -40,7 +40,7 @@ struct KeyOptions {
     throw Failure(Status::NotThere, textOf(name) + " has no key " + printable(key));
 }
 
-/// Types in order, without repeats next to each other: "int", "int string".
+/// Types in order, without adjacent repeats: "int", "int string".
 std::string typesOf(const store::Elements& elements) {
     std::string words;
     PARAM_TYPE last = PARAM_DELETE;
@@ -94,7 +94,7 @@ void list(const Invocation& invocation, const KeyOptions& options) {
              invocation.json);
 }
 
-/// The elements that are asked for: one, or all.
+/// The requested elements: one, or all.
 std::shared_ptr<const store::Elements> wanted(const Invocation& invocation,
                                               const KeyOptions& options) {
     const TicketName name = ticketNamed(options.ticket);
@@ -130,7 +130,7 @@ void get(const Invocation& invocation, const KeyOptions& options) {
         std::cout << elementsJson(*elements).dump(-1, ' ', true) << '\n';
         return;
     }
-    // What is stored must not act on a terminal; scripts read the bytes.
+    // Stored data must not control a terminal, but scripts need the bytes.
     const bool escapes = isatty(STDOUT_FILENO) != 0;
     int next = 0;
     elements->visit([&](int position, const store::Value& value) {
@@ -147,7 +147,7 @@ void get(const Invocation& invocation, const KeyOptions& options) {
 
 std::vector<store::Value> givenValues(const KeyOptions& options, PARAM_TYPE type) {
     if (options.from.empty() == options.values.empty()) {
-        throw Failure(Status::BadCommand, "say the values, or --from with a file");
+        throw Failure(Status::BadCommand, "give the values, or --from with a file");
     }
     std::vector<store::Value> values;
     if (options.from.empty()) {
@@ -162,7 +162,7 @@ std::vector<store::Value> givenValues(const KeyOptions& options, PARAM_TYPE type
     return values;
 }
 
-/// Puts values at the end, at a position, or in place of all that was there.
+/// Appends values, sets them at a position, or replaces all values.
 void putValues(store::TicketContent& content, const KeyOptions& options,
                std::vector<store::Value>& values, int position) {
     auto elements = std::make_shared<store::Elements>();
@@ -172,7 +172,7 @@ void putValues(store::TicketContent& content, const KeyOptions& options,
     }
     std::int64_t next = options.append ? elements->count() : std::max(position, 0);
     if (next + static_cast<std::int64_t>(values.size()) > store::highestPosition + 1LL) {
-        throw Failure(Status::BadInput, "there are more elements than a key can hold");
+        throw Failure(Status::BadInput, "there are more elements than a key can have");
     }
     for (auto& value : values) {
         elements->put(static_cast<int>(next++), std::move(value));
@@ -186,11 +186,11 @@ void set(const Invocation& invocation, const KeyOptions& options) {
     const PARAM_TYPE type = typeOfWord(options.type);
     if (type == PARAM_DELETE) {
         throw Failure(Status::BadInput, "\"" + printable(options.type) +
-                                            "\" is no type: int, uint, int64, uint64, double, "
+                                            "\" is not a type: int, uint, int64, uint64, double, "
                                             "string, binary or pointer");
     }
     if (options.key.empty() || options.key.back() == '*') {
-        throw Failure(Status::BadInput, "a key is not empty and does not end in *");
+        throw Failure(Status::BadInput, "a key must not be empty or end in *");
     }
     auto values = givenValues(options, type);
     store::Scope scope;
@@ -237,16 +237,16 @@ void addKeyCommands(Command program, Invocation& invocation) {
     };
     const auto withPosition = [&](Command added) {
         added.option("key", options->key, "Key, such as Input/Title").required();
-        added.option("--position", options->position, "This element alone, from 0");
+        added.option("--position", options->position, "Only this element, from 0");
     };
 
-    command("list", "List keys", list).option("prefix", options->key, "Only keys that start so");
+    command("list", "List keys", list).option("prefix", options->key, "Only keys with this prefix");
 
-    auto getting = command("get", "Print what a key holds, an element a line", get);
+    auto getting = command("get", "Print the values of a key, one element per line", get);
     withPosition(getting);
-    getting.flag("--raw", options->raw, "The bytes of one element, and nothing else");
+    getting.flag("--raw", options->raw, "Only the bytes of one element");
     getting.footer(
-        "Binaries are printed as base64. With --json, types and holes show. On a terminal, "
+        "Binaries are printed as base64. --json includes types and holes. On a terminal, "
         "control characters\nare printed as \\xNN.");
 
     auto setting = command("set", "Set a key", set);
@@ -258,15 +258,16 @@ void addKeyCommands(Command program, Invocation& invocation) {
     setting.option("values", options->values, "One value, or several for a vector");
     setting.option("--from", options->from,
                    "The value is the content of this file; - for standard input");
-    setting.flag("--append", options->append, "Behind what is there").excludes("--position");
-    setting.footer("Without --position and --append the values take the place of the whole key.\n"
-                   "Doubles may be NaN, Infinity and -Infinity. Texts that start with a dash stand "
-                   "behind --.\n"
+    setting.flag("--append", options->append, "Append to the existing values")
+        .excludes("--position");
+    setting.footer("Without --position and --append, the values replace the whole key.\n"
+                   "Doubles may be NaN, Infinity and -Infinity. Write texts that start with a dash "
+                   "after --.\n"
                    "Example: tintgate-store key set job/7 Workflow/Verify/Active int 1");
 
     auto deleting = command("delete", "Delete a key, or one element of it", remove);
     withPosition(deleting);
-    deleting.footer("Elements behind a deleted one move up.");
+    deleting.footer("Elements after a deleted one move up.");
 }
 
 } // namespace admin

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What the reader of one value finds in a key: its first element, where that has the wanted type.
+// The value that a reader of one value gets: a key's first element, if it has the requested type.
 #pragma once
 
 #include <memory>

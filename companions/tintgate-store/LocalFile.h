@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Files of the machine that the program runs on.
+// Local files.
 #pragma once
 
 #include <fstream>
@@ -20,13 +20,12 @@ class LocalInput {
     bool m_standardInput;
 };
 
-/// Has a file written; "-" is standard output. A file appears whole, under another name in its
-/// folder first, so that a failure leaves what was there; devices and pipes are written in place.
-/// Throws Failure (LocalFile), and what write throws.
+/// Writes a file; "-" is standard output. A file is first written under another name in its folder
+/// and appears complete, so a failure keeps the old file. Devices and pipes are written in place.
+/// Throws Failure (LocalFile), and what `write` throws.
 void writeLocalFile(const std::string& path, const std::function<void(std::ostream&)>& write);
 
-/// Sends what was printed on its way; throws Failure (LocalFile) where standard output took less
-/// than all.
+/// Flushes standard output. Throws Failure (LocalFile) if not everything could be written.
 void finishStandardOutput();
 
 } // namespace admin

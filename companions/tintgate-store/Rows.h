@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// What a command shows: a table for people, or JSON for scripts.
+// Output of a command: a table for people, or JSON for scripts.
 #pragma once
 
 #include <cstdint>
@@ -10,22 +10,22 @@
 
 namespace admin {
 
-/// In the order in which it is shown.
+/// Members are in display order.
 using Row = nlohmann::ordered_json;
 
 struct Column {
-    const char* name;    ///< Of the member in JSON.
-    const char* heading; ///< In the table.
+    const char* name;    ///< Name of the JSON member.
+    const char* heading; ///< Heading in the table.
 };
 
-/// Prints objects on standard output. In JSON as one list with all their members; as a table the
-/// given columns, where null is shown as "-", and true and false as yes and no.
+/// Prints objects on standard output: in JSON, one list with all their members; as a table, the
+/// given columns, with null as "-", and true and false as yes and no.
 void showRows(const std::vector<Column>& columns, const std::vector<Row>& rows, bool asJson);
 
-/// One object: as JSON, or with a line for each member.
+/// Prints one object as JSON, or one line per member.
 void showObject(const Row& object, bool asJson);
 
-/// As in "1 file" and "2 files".
+/// "1 file", "2 files".
 std::string counted(std::int64_t count, const std::string& one);
 
 } // namespace admin

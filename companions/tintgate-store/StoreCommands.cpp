@@ -36,7 +36,7 @@ gid_t numberOfGroup(const std::string& name) {
     return known->gr_gid;
 }
 
-/// Makes the store's folder for a group. All that a store makes in it follows its permissions.
+/// Creates the store's folder for a group. Whatever a store creates in it inherits its permissions.
 void makeFolder(const std::string& folder, const std::string& group) {
     if (folder[0] != '/') {
         throw Failure(Status::BadCommand, "--group is for a store in a folder");
@@ -130,11 +130,10 @@ void addStoreCommands(Command program, Invocation& invocation) {
     auto command =
         addCommand<MakeOptions>(program, invocation, "make", "Make a new store", options,
                                 [&](const MakeOptions& given) { make(invocation, given); });
-    command.option("--name", options->serverName, "Name that the server gives itself")
-        .showDefault();
+    command.option("--name", options->serverName, "Name of the server").showDefault();
     command.option(
         "--group", options->group,
-        "Group whose members can all use the store, whatever their umasks; for a folder");
+        "Group whose members can use the store, whatever their umasks; only for a folder");
     command.footer(
         "The folder must not be there yet, or be empty; a server's database must hold no store. "
         "The\n"

@@ -77,7 +77,7 @@ struct ImportOptions {
     bool merge = false;
 };
 
-/// One ticket, in one transaction, so that nobody sees it without its keys.
+/// Imports one ticket in one transaction, so that nobody sees it without its keys.
 void import(store::StoreEngine& store, const NamedTicket& ticket, bool merge) {
     const auto& [name, content] = ticket;
     store::Scope scope;
@@ -94,7 +94,7 @@ void import(store::StoreEngine& store, const NamedTicket& ticket, bool merge) {
 }
 
 void importAll(const Invocation& invocation, const ImportOptions& options) {
-    // All are read and checked before the first is written.
+    // Reads and checks all before writing the first.
     std::vector<NamedTicket> tickets;
     for (const auto& path : options.files) {
         LocalInput input(path);
@@ -157,7 +157,7 @@ void exportAll(const Invocation& invocation, const ExportOptions& options) {
         Progress progress(names.size(), "tickets");
         std::size_t count = 0;
         for (const auto& name : names) {
-            // One that has gone since the list was made is not missed.
+            // Skips tickets deleted since the list was made.
             if (const auto content = store->content(name.type, name.id, store::KeyFilter())) {
                 writer.add(name, *content);
             }
@@ -172,13 +172,13 @@ void addTicketGroup(Command program, Invocation& invocation) {
     const auto type = std::make_shared<TypeOption>();
     addCommand<TypeOption>(group, invocation, "list", "List tickets", type,
                            [&](const TypeOption& given) { list(invocation, given); })
-        .option("--type", type->type, "Of this type only: job, preset, system or 0 to 49");
+        .option("--type", type->type, "Only this type: job, preset, system or 0 to 49");
 
     const auto ticket = std::make_shared<TicketOption>();
     auto created = addCommand<TicketOption>(
-        group, invocation, "create", "Make an empty ticket, and say its name", ticket,
+        group, invocation, "create", "Create an empty ticket and print its name", ticket,
         [&](const TicketOption& given) { create(invocation, given); });
-    created.option("ticket", ticket->ticket, "Ticket, or a type alone for the next free id")
+    created.option("ticket", ticket->ticket, "Ticket, or only a type for the next free id")
         .required();
     auto removed = addCommand<TicketOption>(
         group, invocation, "delete", "Delete a ticket with all its keys", ticket,
@@ -194,21 +194,20 @@ void addTicketCommands(Command program, Invocation& invocation) {
 
     const auto imported = std::make_shared<ImportOptions>();
     auto import = addCommand<ImportOptions>(
-        program, invocation, "import", "Put tickets from JSON files in place", imported,
+        program, invocation, "import", "Import tickets from JSON files", imported,
         [&](const ImportOptions& given) { importAll(invocation, given); });
     import.option("files", imported->files, "JSON files; - for standard input").required();
     import.flag("--merge", imported->merge,
-                "Keep keys that the file does not name; else each ticket becomes as in the file");
-    import.footer(
-        "All files are checked to their end before anything is written. Each ticket is one "
-        "step, and an\nimport that was cut off can be repeated. docs/stores.md tells the "
-        "format.");
+                "Keep keys that are not in the file; default: replace each ticket");
+    import.footer("All files are checked completely before anything is written. Each ticket is one "
+                  "step, and an\ninterrupted import can be repeated. docs/stores.md describes the "
+                  "format.");
 
     const auto exported = std::make_shared<ExportOptions>();
     auto command = addCommand<ExportOptions>(
         program, invocation, "export", "Write tickets as JSON", exported,
         [&](const ExportOptions& given) { exportAll(invocation, given); });
-    command.option("tickets", exported->tickets, "Tickets such as job/7; all where none is named");
+    command.option("tickets", exported->tickets, "Tickets such as job/7; all if none is named");
     command
         .option("--type", exported->type.type, "All of this type: job, preset, system or 0 to 49")
         .excludes("tickets");

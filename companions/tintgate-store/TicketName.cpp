@@ -64,7 +64,7 @@ int jobNumber(const std::string& text) {
     const TicketName name =
         text.find('/') != std::string::npos ? ticketNamed(text) : ticketNamed("job/" + text);
     if (name.type != jobType) {
-        throw Failure(Status::BadInput, textOf(name) + " is no job");
+        throw Failure(Status::BadInput, textOf(name) + " is not a job");
     }
     return name.id;
 }

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Tickets by the names that people give them.
+// Tickets by their names for people.
 #pragma once
 
 #include <string>
@@ -18,7 +18,7 @@ struct TicketName {
     auto operator<=>(const TicketName&) const = default;
 };
 
-/// From "job/7", "preset/1", "system" or, for any type, "TYPE/ID" such as "12/3". Throws Failure
+/// Parses "job/7", "preset/1", "system" or, for any type, "TYPE/ID" such as "12/3". Throws Failure
 /// for anything else, and for types above 49 and ids above 16,777,215.
 TicketName ticketNamed(const std::string& text);
 
@@ -30,8 +30,8 @@ int typeNamed(const std::string& text);
 
 std::string textOf(const TicketName& name);
 
-/// A whole number in decimal digits and nothing else. Throws Failure, which calls it `what`, where
-/// it is none or lies outside.
+/// An integer in decimal digits, without anything else. Throws Failure, which calls it `what`, if
+/// it is invalid or out of range.
 int wholeNumber(const std::string& text, int lowest, int highest, const std::string& what);
 
 } // namespace admin

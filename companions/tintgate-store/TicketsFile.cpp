@@ -23,8 +23,8 @@ constexpr int formatVersion = 1;
     throw Failure(Status::BadInput, text);
 }
 
-/// Refuses an object that has a member twice: readers of JSON differ in which one counts. (The
-/// parser's own callback would do, but takes a time that grows with the square of an object.)
+/// Rejects an object with a repeated member: JSON readers differ in which one they use. (The
+/// parser's own callback could do this, but its time grows with the square of an object's size.)
 class MemberCheck : public nlohmann::json_sax<Json> {
   public:
     bool null() override { return true; }
@@ -46,13 +46,13 @@ class MemberCheck : public nlohmann::json_sax<Json> {
     }
     bool key(string_t& name) override {
         if (!m_members.back().insert(name).second) {
-            refuse("\"" + printable(name) + "\" stands there twice");
+            refuse("\"" + printable(name) + "\" is repeated");
         }
         return true;
     }
     bool parse_error(std::size_t, const std::string&, const Json::exception& failure) override {
         const std::string text = failure.what();
-        refuse("no JSON: " + printable(text.substr(std::min(text.size(), text.find("] ") + 2))));
+        refuse("not JSON: " + printable(text.substr(std::min(text.size(), text.find("] ") + 2))));
     }
 
   private:
@@ -66,10 +66,10 @@ Json parse(std::istream& from) {
     return Json::parse(text);
 }
 
-/// Refuses members that are not in the list.
+/// Rejects members that are not in the list.
 void allow(const Json& object, const std::set<std::string>& names, const std::string& what) {
     if (!object.is_object()) {
-        refuse(what + " is no object");
+        refuse(what + " is not an object");
     }
     for (const auto& [name, member] : object.items()) {
         if (names.count(name) == 0) {
@@ -78,7 +78,7 @@ void allow(const Json& object, const std::set<std::string>& names, const std::st
     }
 }
 
-/// A whole number in its limits, else -1.
+/// An integer within its limits, or -1.
 int numberAt(const Json& object, const char* name, int highest) {
     if (!object.contains(name) || !object[name].is_number_integer()) {
         return -1;
@@ -90,10 +90,10 @@ int numberAt(const Json& object, const char* name, int highest) {
 void putKey(NamedTicket& ticket, const std::string& key, const Json& elements) {
     const std::string where = textOf(ticket.name) + ", key \"" + printable(key) + "\": ";
     if (key.empty() || key.back() == '*' || key.find('\0') != std::string::npos) {
-        refuse(where + "a key is not empty, does not end in * and holds no zero byte");
+        refuse(where + "a key must not be empty, end in * or contain a zero byte");
     }
     if (ticket.content.find(key)) {
-        refuse(where + "it stands there twice");
+        refuse(where + "it is repeated");
     }
     try {
         ticket.content.put(key, elementsFromJson(elements));
@@ -107,14 +107,14 @@ NamedTicket ticketFrom(const Json& json) {
     NamedTicket ticket;
     ticket.name = {numberAt(json, "type", 0xFFFF), numberAt(json, "id", 0xFFFFFFF)};
     if (!TICKET_Valid(ticket.name.type, ticket.name.id)) {
-        refuse("a ticket's type is 0 to 49 and its id 0 to 16777215");
+        refuse("a ticket's type must be 0 to 49 and its id 0 to 16777215");
     }
     if (!json.contains("keys")) {
         refuse(textOf(ticket.name) + " has no \"keys\"");
     }
     for (const char* const name : {"keys", "byteKeys"}) {
         if (json.contains(name) && !json[name].is_object()) {
-            refuse(textOf(ticket.name) + ": \"" + name + "\" is no object");
+            refuse(textOf(ticket.name) + ": \"" + name + "\" is not an object");
         }
     }
     for (const auto& [key, elements] : json["keys"].items()) {
@@ -124,7 +124,7 @@ NamedTicket ticketFrom(const Json& json) {
         for (const auto& [text, elements] : json["byteKeys"].items()) {
             const auto key = fromBase64(text);
             if (!key) {
-                refuse(textOf(ticket.name) + ": \"" + printable(text) + "\" is no base64");
+                refuse(textOf(ticket.name) + ": \"" + printable(text) + "\" is not base64");
             }
             putKey(ticket, *key, elements);
         }
@@ -148,14 +148,14 @@ std::vector<NamedTicket> readTickets(std::istream& from) {
     }
     allow(file, {"format", "version", "tickets"}, "the file");
     if (!file.contains("tickets") || !file["tickets"].is_array()) {
-        refuse("\"tickets\" is no list");
+        refuse("\"tickets\" is not a list");
     }
     std::vector<NamedTicket> tickets;
     std::set<TicketName> seen;
     for (const auto& json : file["tickets"]) {
         tickets.push_back(ticketFrom(json));
         if (!seen.insert(tickets.back().name).second) {
-            refuse(textOf(tickets.back().name) + " stands there twice");
+            refuse(textOf(tickets.back().name) + " is repeated");
         }
     }
     return tickets;

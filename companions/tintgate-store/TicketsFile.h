@@ -19,8 +19,8 @@
 //     ]
 //   }
 //
-// "byteKeys", which is seldom there, has keys that are no UTF-8, as base64. ElementsJson.h tells
-// what stands behind a key.
+// "byteKeys", which is rare, contains keys that are not UTF-8, as base64. ElementsJson.h describes
+// the values.
 #pragma once
 
 #include <functional>
@@ -38,12 +38,12 @@ struct NamedTicket {
     store::TicketContent content;
 };
 
-/// Reads and checks a file to its end. Throws Failure (BadInput) for all that is not exactly of the
-/// format: unknown or repeated members, a ticket that stands there twice, values outside their
-/// type. The text says where.
+/// Reads and checks a whole file. Throws Failure (BadInput) for any deviation from the format:
+/// unknown or repeated members, repeated tickets, values outside their type. The text describes the
+/// place.
 std::vector<NamedTicket> readTickets(std::istream& from);
 
-/// Writes a file, ticket by ticket. It is whole once finish has been called.
+/// Writes a file, ticket by ticket. The file is complete after finish.
 class TicketsWriter {
   public:
     explicit TicketsWriter(std::ostream& to);

@@ -36,10 +36,10 @@ void add(const Invocation& invocation, const UserOptions& options) {
     const auto store = invocation.open();
     refuseKnown(*store, options);
     const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
-    // A person may take minutes to type a password, and another one may be faster.
+    // While one person types a password, another one may add the user.
     if (!store->addUser({name, hash, false})) {
         refuseKnown(*store, options);
-        throw Failure(Status::Exists, "there was a user " + options.name);
+        throw Failure(Status::Exists, "there is a user " + options.name);
     }
 }
 
@@ -47,7 +47,7 @@ void changePassword(const Invocation& invocation, const UserOptions& options) {
     const auto store = invocation.open();
     userNamed(*store, options.name);
     const std::string hash = store::passwordHash(askPassword(options.passwordFile, options.name));
-    // Fetched again, as above.
+    // Read again, for the same reason.
     store::User user = userNamed(*store, options.name);
     user.passwordHash = hash;
     store->putUser(user);
@@ -79,7 +79,7 @@ void list(const Invocation& invocation) {
 } // namespace
 
 void addUserCommands(Command program, Invocation& invocation) {
-    auto group = program.group("user", "Users, who can log in and see all of the store");
+    auto group = program.group("user", "Users; each can log in and see the whole store");
     const auto options = std::make_shared<UserOptions>();
     const auto command = [&](const char* word, const char* text, auto run) -> Command {
         auto added = addCommand<UserOptions>(
@@ -91,12 +91,12 @@ void addUserCommands(Command program, Invocation& invocation) {
     const auto withPassword = [&](Command added) {
         added.option("--password-file", options->passwordFile,
                      "File whose first line is the password; - for standard input");
-        added.footer("Without --password-file the password is asked for, without echo. It never "
-                     "stands on the\ncommand line, where everybody could see it.");
+        added.footer("Without --password-file, the program asks for the password, without echo. It "
+                     "is never on the\ncommand line, where everybody could see it.");
     };
     withPassword(command("add", "Add a user", add));
     withPassword(command("password", "Set a user's password", changePassword));
-    command("disable", "Let a user log in no more",
+    command("disable", "Prevent a user from logging in",
             [](const auto& invoked, const auto& given) { setDisabled(invoked, given, true); });
     command("enable", "Let a user log in again",
             [](const auto& invoked, const auto& given) { setDisabled(invoked, given, false); });

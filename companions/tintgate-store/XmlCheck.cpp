@@ -30,7 +30,7 @@ XmlCheck::int_type XmlCheck::overflow(int_type byte) {
 }
 
 std::streamsize XmlCheck::xsputn(const char* bytes, std::streamsize count) {
-    // FE and FF lead UTF-16, EF BB BF leads UTF-8, and a UTF-16 text has zeros between its signs.
+    // FE and FF start UTF-16, EF BB BF starts UTF-8, and UTF-16 has zeros between characters.
     for (std::streamsize i = 0; i < count && m_firstByte == '\0'; ++i) {
         if (std::strchr(" \t\r\n\xFE\xFF\xEF\xBB\xBF", bytes[i]) == nullptr) {
             m_firstByte = bytes[i];

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Whether a file is well-formed XML.
+// Checks whether a file is well-formed XML.
 #pragma once
 
 #include <optional>
@@ -11,8 +11,8 @@
 
 namespace admin {
 
-/// A stream that judges what is written to it, of any size. Namespaces count: a prefix that stands
-/// for none is a fault, since few readers take such a file. Nothing outside the file is read.
+/// A stream that checks what is written to it, of any size. An undeclared namespace prefix is an
+/// error, because few readers accept it. Reads nothing outside the file.
 class XmlCheck : private std::streambuf {
   public:
     XmlCheck();
@@ -22,11 +22,11 @@ class XmlCheck : private std::streambuf {
 
     std::ostream& stream() { return m_stream; }
 
-    /// Whether the content starts as XML does.
+    /// Whether the content starts like XML.
     bool looksLikeXml() const { return m_firstByte == '<'; }
 
-    /// Once all is written, and once only: empty where it is well-formed, else the fault and its
-    /// line.
+    /// Call once, after everything is written. Empty if the content is well-formed, otherwise the
+    /// error and its line.
     std::string fault();
 
   private:
@@ -37,7 +37,7 @@ class XmlCheck : private std::streambuf {
     XML_Parser m_parser;
     std::ostream m_stream;
     std::string m_fault;
-    char m_firstByte = '\0'; ///< That is neither blank nor part of a byte order mark.
+    char m_firstByte = '\0'; ///< The first byte other than blanks and byte order marks.
 };
 
 /// Whether the name is that of an XML file, such as a JDF.

@@ -59,7 +59,7 @@ class XmlMap::Parser {
             element.tag + static_cast<std::size_t>(XML_GetCurrentByteCount(m_parser.get()));
         element.parent = m_open.empty() ? -1 : m_open.back();
         const std::string_view text = m_map.m_text;
-        if (text[element.tag] == '<') { // An entity's elements have the place of its reference.
+        if (text[element.tag] == '<') { // An entity's elements are at its reference.
             const std::size_t name = element.tag + 1;
             element.name = text.substr(name, text.find_first_of(" \t\r\n/>", name) - name);
         }

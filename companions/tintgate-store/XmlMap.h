@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// The places of an XML document's elements in its text, for changes that leave all else as it is.
+// The positions of an XML document's elements in its text, for changes that keep everything else.
 #pragma once
 
 #include <cstddef>
@@ -9,51 +9,51 @@
 
 namespace admin {
 
-/// Places are offsets into the text.
+/// Positions are offsets into the text.
 struct XmlElement {
-    std::string_view name; ///< As it is written, with its prefix; empty for what an entity brings.
-    std::size_t tag = 0;   ///< Of the start tag.
+    std::string_view name; ///< As written, with its prefix; empty if from an entity.
+    std::size_t tag = 0;   ///< Start of the start tag.
     std::size_t tagEnd = 0;
-    std::size_t endTag = 0; ///< 0 where the start tag is an empty one (<a/>).
-    int parent = -1;        ///< Index of the element that it is in.
+    std::size_t endTag = 0; ///< 0 if the start tag is an empty tag (<a/>).
+    int parent = -1;        ///< Index of the parent element.
 
     bool hasEmptyTag() const { return endTag == 0; }
 };
 
 struct XmlAttribute {
     std::string_view name;
-    std::size_t begin = 0; ///< Of the blanks in front of it.
+    std::size_t begin = 0; ///< Start of the preceding blanks.
     std::size_t nameBegin = 0;
-    std::size_t value = 0; ///< Behind the opening quote.
+    std::size_t value = 0; ///< After the opening quote.
     std::size_t valueEnd = 0;
-    std::size_t end = 0; ///< Behind the closing quote.
+    std::size_t end = 0; ///< After the closing quote.
 };
 
-/// Of a document that is worked on. A map of so many takes about 200 MB.
+/// Limit of a document. Its map takes about 200 MB.
 inline constexpr std::size_t mostXmlElements = 2'000'000;
 
 class XmlMap {
   public:
-    /// The text must outlive this, and have less than 2 GiB. Namespaces count, as in XmlCheck.
+    /// The text must outlive this and be below 2 GiB. Namespaces are checked, as in XmlCheck.
     explicit XmlMap(std::string_view text);
 
-    /// Empty where the text is well-formed; else the fault and its line, and the elements before it
-    /// are there.
+    /// Empty if the text is well-formed. Otherwise the error and its line; the elements before it
+    /// are available.
     const std::string& fault() const { return m_fault; }
 
-    /// The text has more than mostXmlElements, which is a fault too.
+    /// The text has more than mostXmlElements elements, which is an error too.
     bool hasTooManyElements() const { return m_elements.size() > mostXmlElements; }
 
     /// In the order of their start tags.
     const std::vector<XmlElement>& elements() const { return m_elements; }
 
-    /// Null where there is none. With a parent: only a child of this element.
+    /// Null if there is none. With a parent, only its children.
     const XmlElement* first(std::string_view name, const XmlElement* parent = nullptr) const;
 
-    /// The element whose start tag contains this place; null if there is none.
+    /// The element whose start tag contains this position, or null.
     const XmlElement* withTagAround(std::size_t place) const;
 
-    /// Of an element with a name.
+    /// For an element with a name.
     std::vector<XmlAttribute> attributesOf(const XmlElement& element) const;
 
   private:

@@ -251,7 +251,7 @@ TEST_F(JdfUpdates, FindTheirWayInJdfsOfOtherShapes) {
 
     const std::pair<std::string, const char*> refused[] = {
         {"<JDF>\n<!-- <Sender printdate=\"2020\"/> --><Sender/></JDF>",
-         "line 2 would mislead the update: a date"},
+         "line 2 would mislead the update: there is a date"},
         {"<JDF><![CDATA[<Sender printdate=\"\"]]><Sender/></JDF>", "not the Sender's"},
         {"<JDF><SenderId/><Receiver printdate=\"\"/></JDF>", "not the Sender's"},
         {"<JDF><!-- </tazo:MeasurementData> --><x/></JDF>", "no tag"},
@@ -384,7 +384,7 @@ TEST_F(JdfUpdates, RefuseTextsThatTakeMoreThanTheirShare) {
 }
 
 TEST_F(JdfUpdates, AreOfTheJdfsThatAJobNames) {
-    expectRefusal({"jdf", "ready", "7"}, 1, "not there: " + jdfPath);
+    expectRefusal({"jdf", "ready", "7"}, 1, "does not exist: " + jdfPath);
     put(delivered);
     expectRefusal({"jdf", "ready", "7", "--updates", "17"}, 16, "too many");
 
@@ -418,7 +418,7 @@ TEST_F(JdfUpdates, ArePreparedForAtDeliveryWhereTheStoreSaysSo) {
     };
     putTree(delivered, "");
     answer({"key", "set", "system", "System/Jdf/Updates", "int", "6"});
-    putTree(prepared, "delivered as it is, /tree/broken.jdf: it is not well-formed");
+    putTree(prepared, "delivered unchanged, /tree/broken.jdf: it is not well-formed");
     EXPECT_EQ(m_store->versions("/tree/a.JDF").size(), 2U); // Stored as delivered both times.
 }
 

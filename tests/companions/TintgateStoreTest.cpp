@@ -121,13 +121,14 @@ TEST_F(TintgateStore, BrokenFilesChangeNothing) {
         return ticket(R"("type": 3, "id": 2, "keys": {"k": )" + elements + "}");
     };
     const std::pair<std::string, const char*> cases[] = {
-        {key(R"({"int": 1})").substr(0, 150), "no JSON"},
+        {key(R"({"int": 1})").substr(0, 150), "not JSON"},
         {R"({"format": "tintgate tickets", "version": 2, "tickets": []})", "\"version\""},
-        {R"({"format": "tintgate tickets", "version": 1, "tickets": {}})", "is no list"},
+        {R"({"format": "tintgate tickets", "version": 1, "tickets": {}})", "is not a list"},
         {ticket(R"("type": 3, "id": 18446744073709551617, "keys": {})"), "16777215"},
-        {ticket(R"("type": 3, "id": 1, "keys": {})"), "job/1 stands there twice"},
-        {ticket(R"("type": 3, "id": 2, "keys": {"a": {"int": 1}, "a": {"int": 1}})"), "twice"},
-        {key(R"({"int": 2147483648})"), "job/2, key \"k\": 2147483648 is no int"},
+        {ticket(R"("type": 3, "id": 1, "keys": {})"), "job/1 is repeated"},
+        {ticket(R"("type": 3, "id": 2, "keys": {"a": {"int": 1}, "a": {"int": 1}})"),
+         "is repeated"},
+        {key(R"({"int": 2147483648})"), "job/2, key \"k\": 2147483648 is not of type int"},
         {key(R"({"string": "a\u0000b"})"), "zero byte"},
         {key(R"({"at": 16777215, "int": [3, 4]})"), "more elements than"},
     };
@@ -375,8 +376,8 @@ TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
     expectRefusal({"make"}, 2);
     expectRefusal({"-s", m_folder.path("none"), "jobs"}, 4, "none");
     const std::string colon = m_folder.path("press:room");
-    expectRefusal({"-s", colon, "make"}, 3, "follows the last \":\"");
-    expectRefusal({"copy", m_folder.path("store"), colon}, 3, "follows the last \":\"");
+    expectRefusal({"-s", colon, "make"}, 3, "after the last \":\"");
+    expectRefusal({"copy", m_folder.path("store"), colon}, 3, "after the last \":\"");
     EXPECT_FALSE(std::filesystem::exists(colon));
     support::RunOptions full;
     full.outputPath = "/dev/full";
@@ -384,7 +385,7 @@ TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
 
     const auto warned = run({"-s", m_folder.makeFolder(std::string(128, 'd')) + "/store", "make"});
     EXPECT_EQ(warned.exitCode, 0);
-    EXPECT_THAT(warned.error, HasSubstr("a job can name at most 127"));
+    EXPECT_THAT(warned.error, HasSubstr("a job can use at most 127"));
     for (const char* command : {"make", "info"}) {
         EXPECT_EQ(run({"-s", m_folder.path("K\xC3\xB6ln"), command}).error, "");
         EXPECT_THAT(run({"-s",
@@ -392,7 +393,7 @@ TEST_F(TintgateStore, SaysWhyItCannotGoOn) {
                                        "d\xC5\xBA"),
                          command})
                         .error,
-                    HasSubstr("characters that a job can't name"));
+                    HasSubstr("characters that a job can't use"));
     }
 }
 
