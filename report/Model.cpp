@@ -431,7 +431,7 @@ constexpr const char* processInks[] = {"Cyan", "Magenta", "Yellow", "Black"};
 /// "Cyan", or the name that a channel after the process inks has.
 std::string inkTitle(const Result& result, std::size_t channel, const Texts& say) {
     if (channel < std::size(processInks)) {
-        return say.find(std::string("measure.ink") + processInks[channel]).value_or("");
+        return say.find(std::string("measure.ink.") + processInks[channel]).value_or("");
     }
     const std::string& name = result.channels[channel];
     return name.starts_with("SPOT_") ? name.substr(5) : name;

@@ -2,6 +2,7 @@
 #include "report/Sample.h"
 
 #include <cmath>
+#include <iterator>
 
 namespace report {
 namespace {
@@ -37,12 +38,13 @@ void addInks(Sample& sample, const Result& result) {
 /// The tone value at 50 percent of each process ink that has this tint.
 void addToneValues(Sample& sample, const Tones& tones) {
     constexpr double half = 50;
+    constexpr const char* names[] = {"Cyan", "Magenta", "Yellow", "Black"};
     for (const InkTones& ink : tones.inks) {
         for (const ToneStep& step : ink.steps) {
-            if (ink.channel + 1 >= inkCount || !near(step.nominal, half)) {
+            if (ink.channel >= std::size(names) || !near(step.nominal, half)) {
                 continue;
             }
-            const std::string name = inkName(allInks[ink.channel + 1]);
+            const std::string name = names[ink.channel];
             Criterion figure;
             figure.name = toneAtHalf + name;
             figure.title = "Tone value at 50 %, " + name;
