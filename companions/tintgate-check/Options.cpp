@@ -8,6 +8,7 @@
 #include "companions/tintgate-check/Batch.h"
 #include "companions/tintgate-check/Problem.h"
 #include "companions/tintgate-check/Words.h"
+#include "report/label/Label.h"
 
 namespace check {
 namespace {
@@ -104,6 +105,7 @@ void chooseLanguage(const Options& options) {
     const auto named = languages::languageNamed(options.language);
     const languages::Language language = named ? *named : languages::languageOfUser();
     useLanguages(options.json ? languages::Language::English : language, language);
+    label::useLanguage(language);
     if (!options.language.empty() && !named) {
         throw CLI::ValidationError("--language", say(Say::NoSuchLanguage, {options.language}));
     }

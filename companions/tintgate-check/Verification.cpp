@@ -282,8 +282,8 @@ class Verifier {
                                                       const std::string& json) {
         std::vector<std::pair<Output, std::string>> made;
         if (m_outputs.wantsPage()) {
-            made.emplace_back(Output::Page, report::pageOf(result, nullptr, languages::english(),
-                                                           factsOf(m_aim)));
+            made.emplace_back(Output::Page,
+                              report::pageOf(result, nullptr, texts(), factsOf(m_aim)));
         }
         try {
             const LabelWanted& labels = m_outputs.labels();
