@@ -159,6 +159,11 @@ std::string_view signOf(Verdict verdict) {
                                                : Outcome::Unanswered);
 }
 
+Html badge(Verdict verdict, const std::string& word) {
+    return element("span", {{"class", "badge " + std::string(keyOf(verdict))}},
+                   Html(std::string(signOf(verdict)) + " " + word));
+}
+
 Html bodyPart(std::string_view hole, const Model& model, const Texts& say) {
     if (hole == "documentTitle") {
         return Html(model.word + " – " + model.title);

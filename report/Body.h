@@ -16,4 +16,7 @@ Html bodyPart(std::string_view hole, const Model& model, const languages::Texts&
 /// ✓, ✕ or ?
 std::string_view signOf(Verdict verdict);
 
+/// The sign with its word.
+Html badge(Verdict verdict, const std::string& word);
+
 } // namespace report

@@ -621,8 +621,9 @@ void addBasis(Model& model, const Result& result, const Meta* meta, const std::s
 /// target".
 void addRole(languages::Recognised& sentence, const std::string& name, const std::string& english,
              const Texts& say) {
+    const std::string role = english == "patch set" ? "patchSet" : english;
     for (const char* form : {"", "Of", "In"}) {
-        if (const auto text = say.find("role." + english + form)) {
+        if (const auto text = say.find("role." + role + form)) {
             sentence.values.emplace_back(name + form, *text);
         }
     }

@@ -214,16 +214,29 @@ std::optional<Summary> summaryIn(std::string_view page) {
 
 std::string indexOf(const std::vector<Listed>& reports, const std::string& folder,
                     const Texts& say) {
-    Json list = Json::array();
-    for (const Listed& report : reports) {
-        list.push_back(summaryJson(report.summary));
-        list.back()["word"] = wordOf(report.summary.verdict, say);
-        list.back()["link"] = linkTo(report.path);
+    Html rows;
+    for (const auto& [path, summary] : reports) {
+        const Html title = element("a", {{"href", linkTo(path)}}, Html(summary.title));
+        const Html what = element("div", {{"class", "name"}}, Html(summary.subtitle)) +
+                          element("div", summary.sentence);
+        rows += element("tr", {{"class", keyOf(summary.verdict)}},
+                        element("td", {}, badge(summary.verdict, wordOf(summary.verdict, say))) +
+                            element("td", {{"lang", summary.language}}, title + what));
     }
-    return assembled(indexTemplate, say, [&](std::string_view, std::string& page) {
-        page += inScript({{"folder", folder}, {"reports", list}});
-        page.back() = ',';
-        page += "\"texts\":" + scriptTexts(say, "index") + "}";
+    const Html heads = element("th", {{"scope", "col"}}, Html(say("html.page.verdict"))) +
+                       element("th", {{"scope", "col"}}, Html(say("html.index.report")));
+    const Html table =
+        element("table", {{"id", "reports"}},
+                element("thead", {}, element("tr", {}, heads)) + element("tbody", {}, rows));
+    return assembled(indexTemplate, say, [&](std::string_view hole, std::string& page) {
+        if (hole == "found") {
+            page += Html(reports.empty()
+                             ? say("index.none", {{"folder", folder}})
+                             : say("index.found", {{"count", reports.size()}, {"folder", folder}}))
+                        .markup();
+        } else if (!reports.empty()) {
+            page += element("section", {}, table).markup();
+        }
     });
 }
 

@@ -3,6 +3,7 @@
 
 #include <cmath>
 
+#include "report/Html.h"
 #include "report/InPage.h"
 #include "report/Model.h"
 #include "report/Template.h"
@@ -149,6 +150,45 @@ std::string seriesData(const TrendModel& model, const Series& series, const Text
     return std::move(part).text();
 }
 
+/// A series as it is read where scripts do not run: its state, and how its criteria stand.
+Html seriesWithoutScript(const Series& series, const Texts& say) {
+    Html reasons;
+    for (const std::string& reason : series.reasons) {
+        reasons += element("li", reason);
+    }
+    Html rows;
+    for (const CriterionTrend& criterion : series.criteria) {
+        if (criterion.used) {
+            const std::string failures = say(
+                "text.failures", {{"failed", criterion.failed}, {"answered", criterion.answered}});
+            rows += element("tr", {},
+                            element("th", {{"scope", "row"}}, Html(criterion.title)) +
+                                element("td", criterion.latest + " " + criterion.unit) +
+                                element("td", criterion.tolerance) + element("td", failures));
+        }
+    }
+    const Html heads =
+        element("th", say("html.page.criterion")) + element("th", say("html.page.value")) +
+        element("th", say("html.page.tolerance")) + element("th", say("html.trend.failed"));
+    return element(
+        "section", {},
+        element("h2", series.name) + element("p", series.span) +
+            element("p", {}, element("strong", series.word)) + element("p", series.sentence) +
+            element("ul", {}, reasons) +
+            element("table", {},
+                    element("thead", {}, element("tr", {}, heads)) + element("tbody", {}, rows)));
+}
+
+Html withoutScript(const TrendModel& model, const Texts& say) {
+    Html html = element("header", {},
+                        element("h1", say("html.trend.title")) + element("p", model.subtitle)) +
+                element("p", say("html.trend.noScript"));
+    for (const Series& series : model.series) {
+        html += seriesWithoutScript(series, say);
+    }
+    return html;
+}
+
 } // namespace
 
 std::string trendPageOf(const TrendModel& model, const Texts& say) {
@@ -160,8 +200,9 @@ std::string trendPageOf(const TrendModel& model, const Texts& say) {
     }
     data.list("series", parts);
     const std::string text = std::move(data).text();
-    return assembled(trendTemplate, say,
-                     [&](std::string_view, std::string& page) { page += text; });
+    return assembled(trendTemplate, say, [&](std::string_view hole, std::string& page) {
+        page += hole == "data" ? text : withoutScript(model, say).markup();
+    });
 }
 
 } // namespace report

@@ -29,9 +29,10 @@ def content_hash(text):
 
 
 def policy(scripts, styles):
+    allowed = " ".join(map(content_hash, scripts)) or "'none'"
     return "; ".join([
         "default-src 'none'",
-        f"script-src {' '.join(map(content_hash, scripts))}",
+        f"script-src {allowed}",
         f"style-src {' '.join(map(content_hash, styles))}",
         "base-uri 'none'",
         "form-action 'none'",

@@ -8,6 +8,7 @@
 #include "companions/tintgate-check/Batch.h"
 #include "companions/tintgate-check/Problem.h"
 #include "companions/tintgate-check/Words.h"
+#include "report/label/Label.h"
 
 namespace check {
 namespace {
@@ -52,6 +53,11 @@ void addFiles(CLI::App& program, Options& options) {
                     "/etc/tintgate/conditions.toml")
         ->type_name("FILE");
     program.add_flag("--list", options.list, "Show conditions, presets and data sets");
+    program
+        .add_option("--language", options.language,
+                    "Of screens and pages: en, de, fr, es, it, ja or\n"
+                    "zh; without it, that of your locale")
+        ->type_name("LANGUAGE");
 }
 
 void addOutputs(CLI::App& program, Options& options) {
@@ -95,8 +101,19 @@ void addWatch(CLI::App& program, Options& options) {
         ->group(watching);
 }
 
+void chooseLanguage(const Options& options) {
+    const auto named = languages::languageNamed(options.language);
+    const languages::Language language = named ? *named : languages::languageOfUser();
+    useLanguages(options.json ? languages::Language::English : language, language);
+    label::useLanguage(language);
+    if (!options.language.empty() && !named) {
+        throw CLI::ValidationError("--language", say(Say::NoSuchLanguage, {options.language}));
+    }
+}
+
 /// What does not go together.
 void settle(const CLI::App& program, const Options& options) {
+    chooseLanguage(options);
     if (options.measurements.empty() && options.watch.empty() && !options.list) {
         throw CLI::ValidationError(say(Say::NothingToVerify));
     }

@@ -21,6 +21,7 @@ struct Options {
     bool json = false;
     bool quiet = false;
     bool list = false;
+    std::string language; ///< As named; empty for the user's.
     unsigned threads = 1;
     std::string watch; ///< The folder; empty if nothing is watched.
     bool poll = false;

@@ -142,7 +142,7 @@ std::string criteriaText(const report::Model& model, const Painter& paint, std::
 }
 
 std::string signedText(double value) {
-    return (value > 0 ? "+" : "") + report::fixedText(value, 2);
+    return (value > 0 ? "+" : "") + texts().number(value, 2);
 }
 
 std::string patchesText(const report::Model& model, const report::Result& result,
@@ -156,8 +156,8 @@ std::string patchesText(const report::Model& model, const report::Result& result
             break;
         }
         lines.push_back(
-            {{report::fixedText(patch.difference, 2), Tone::Bold, true},
-             {fitted(report::labelOf(result, index), width - ofNumbers)},
+            {{texts().number(patch.difference, 2), Tone::Bold, true},
+             {fitted(report::labelOf(result, index, texts()), width - ofNumbers)},
              {"ΔL* " + signedText(patch.measured.L - patch.target.L), Tone::Soft, true},
              {"Δa* " + signedText(patch.measured.a - patch.target.a), Tone::Soft, true},
              {"Δb* " + signedText(patch.measured.b - patch.target.b), Tone::Soft, true}});
@@ -260,7 +260,7 @@ std::string headText(Fate fate, const std::string& name, const Painter& paint) {
 
 std::string resultText(const Outcome& outcome, const Aim& aim, bool isReferenceData,
                        const Painter& paint, std::size_t width) {
-    const report::Model model = report::makeModel(*outcome.result, nullptr);
+    const report::Model model = report::makeModel(*outcome.result, nullptr, texts());
     std::string text = headText(outcome.fate, outcome.measurement.path, paint);
     text += wrapped("", 0, aimText(aim, outcome.result->presetName), paint, width, Tone::Soft);
     text += wrapped("", 0, model.sentence, paint, width);

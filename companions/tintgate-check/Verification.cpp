@@ -55,7 +55,10 @@ void describe(const analysis::Comparison& comparison, const analysis::Judgement&
     if (finding == nullptr) {
         return;
     }
-    outcome.criterion = finding->criterion->title;
+    report::Criterion named;
+    named.name = finding->criterion->name;
+    named.title = finding->criterion->title;
+    outcome.criterion = report::titleOf(named, texts());
     if (!finding->answered) {
         outcome.figures = finding->found == 0
                               ? say(Say::NoSuchPatches)
@@ -65,8 +68,8 @@ void describe(const analysis::Comparison& comparison, const analysis::Judgement&
     }
     report::Criterion criterion;
     criterion.unit = analysis::unit(finding->criterion->quantity);
-    outcome.figures = report::fixedText(finding->rounded, finding->decimals) + " " + say(Say::Of) +
-                      " " + report::fixedText(finding->tolerance, finding->decimals) + " " +
+    outcome.figures = texts().number(finding->rounded, finding->decimals) + " " + say(Say::Of) +
+                      " " + texts().number(finding->tolerance, finding->decimals) + " " +
                       report::unitOf(criterion, colour::formulaName(comparison.formula));
 }
 
@@ -150,7 +153,7 @@ report::Facts factsOf(const Aim& aim) {
          {std::pair(Say::FactCondition, aim.condition), std::pair(Say::FactPrinter, aim.printer),
           std::pair(Say::FactPaper, aim.paper)}) {
         if (!text.empty()) {
-            facts.emplace_back(say(label), text);
+            facts.emplace_back(sayOnPage(label), text);
         }
     }
     return facts;
@@ -279,8 +282,8 @@ class Verifier {
                                                       const std::string& json) {
         std::vector<std::pair<Output, std::string>> made;
         if (m_outputs.wantsPage()) {
-            made.emplace_back(Output::Page, report::pageOf(result, nullptr, languages::english(),
-                                                           factsOf(m_aim)));
+            made.emplace_back(Output::Page,
+                              report::pageOf(result, nullptr, texts(), factsOf(m_aim)));
         }
         try {
             const LabelWanted& labels = m_outputs.labels();

@@ -1,10 +1,13 @@
 // SPDX-License-Identifier: Apache-2.0
-// Every sentence that this program says to people. A further language is a further table.
+// Every sentence that this program says to people. The sentences are in the tables of
+// report/languages, below "check."; their keys are these names.
 #pragma once
 
 #include <initializer_list>
 #include <string>
 #include <string_view>
+
+#include "report/languages/Texts.h"
 
 namespace check {
 
@@ -170,11 +173,22 @@ enum class Say {
     OnlyWithWatch,
     QuietOrJson,
     OutIsFile,
+    NoSuchLanguage,
 
     Count
 };
 
-/// The sentence in the language of the user, with {1}, {2} ... replaced by `values`.
+/// Chooses the languages of this program's sentences and of what it shows of results (pages among
+/// it); both are English at first. They differ for JSON, whose sentences stay English.
+void useLanguages(languages::Language ofSentences, languages::Language ofResults);
+
+/// The texts of results: criteria, verdicts, numbers.
+const languages::Texts& texts();
+
+/// A sentence that becomes part of a page.
+std::string sayOnPage(Say what);
+
+/// The sentence with {1}, {2} ... replaced by `values`.
 std::string say(Say what, std::initializer_list<std::string_view> values = {});
 
 } // namespace check

@@ -5,6 +5,7 @@
 #include <ctime>
 
 #include "companions/tintgate-report/Files.h"
+#include "report/Page.h"
 
 namespace report {
 namespace {
@@ -162,12 +163,14 @@ void settle(LabelOptions& options) {
 }
 
 void writeLabels(const LabelOptions& options, const std::string& result, const std::string& meta,
+                 std::optional<languages::Language> language,
                  const std::function<void(const std::string&)>& say) {
     std::string note;
     const LoadedResult loaded = loadWithHash(result, meta, note);
     if (!note.empty()) {
         say(note);
     }
+    label::useLanguage(language ? *language : languageOf(loaded.metaOrNull()));
     const label::Subject subject = subjectOf(loaded, options.details);
     if (!options.label.empty()) {
         write(options.label, label::drawLabel(subject, options.size, options.format, options.dpi),

@@ -3,6 +3,7 @@
 #pragma once
 
 #include <functional>
+#include <optional>
 #include <string>
 #include <vector>
 
@@ -39,6 +40,7 @@ void settle(LabelOptions& options);
 
 /// Writes what is asked for; `say` is told what had no room. Throws Failure.
 void writeLabels(const LabelOptions& options, const std::string& result, const std::string& meta,
+                 std::optional<languages::Language> language,
                  const std::function<void(const std::string&)>& say);
 
 /// Prints whether the label's text and the result belong together. Done, OtherResult or NoLabel.

@@ -245,7 +245,8 @@ int run(const Options& options) {
         } else if (options.tidyDays) {
             return static_cast<int>(tidyFolders(options));
         } else if (options.labels.areDrawn()) {
-            report::writeLabels(options.labels, options.results[0], options.meta, complain);
+            report::writeLabels(options.labels, options.results[0], options.meta, options.language,
+                                complain);
         } else if (!options.labels.match.empty()) {
             return static_cast<int>(
                 report::matchLabel(options.labels, options.results[0], options.meta));

@@ -349,7 +349,7 @@ class Certificate {
         const report::Patch& patch = m_result.patches[index];
         const Style number = right(lines(plain, 1));
         return {{"", plain},
-                {printable(report::labelOf(m_result, index)), plain},
+                {printable(report::labelOf(m_result, index, say())), plain},
                 {labText(patch.target), number},
                 {labText(patch.measured), number},
                 {numberText(patch.difference, 2), right(bold)},
@@ -371,7 +371,7 @@ class Certificate {
     }
 
     std::string patchesHeading(std::size_t count) const {
-        return filled(texts().worstPatches, {{"count", std::to_string(count)},
+        return filled(texts().worstPatches, {{"worst", std::to_string(count)},
                                              {"all", std::to_string(m_result.patches.size())}});
     }
 

@@ -145,7 +145,7 @@ DateKind Subject::dateKind() const {
 
 Content contentOf(const Subject& subject) {
     Content content;
-    content.model = report::makeModel(subject.result, subject.meta);
+    content.model = report::makeModel(subject.result, subject.meta, say());
     content.title = printable(content.model.title);
     if (content.title.empty()) {
         content.title = texts().untitled;

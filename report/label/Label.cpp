@@ -14,7 +14,7 @@ namespace {
 constexpr double millimetresPerInch = 25.4;
 
 Properties propertiesOf(const Content& content) {
-    return {std::string(verdictText(content.model.verdict)) + ": " + content.title,
+    return {verdictText(content.model.verdict) + ": " + content.title,
             filled(texts().madeBy, {{"version", content.toolVersion}}), content.code.stamp};
 }
 

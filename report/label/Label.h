@@ -23,8 +23,13 @@
 #include "report/label/CodeText.h"
 #include "report/label/Details.h"
 #include "report/label/Page.h"
+#include "report/languages/Language.h"
 
 namespace label {
+
+/// Chooses the language of what is drawn next; it is English at first. Labels of different
+/// languages can't be drawn at the same time.
+void useLanguage(languages::Language language);
 
 enum class Format { Pdf, Svg, Png };
 

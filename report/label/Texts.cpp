@@ -3,56 +3,73 @@
 
 #include "base/Utf8.h"
 #include "report/Model.h"
+#include "report/label/Label.h"
 
 namespace label {
 namespace {
 
-constexpr Texts english = {
-    .passed = "PASSED",
-    .failed = "FAILED",
-    .incomplete = "INCOMPLETE",
-    .untitled = "–",
-    .fields = {"Condition", "Preset", "Date", "Printer", "Paper", "Instrument", "Operator",
-               "Software", "Colourants", "Profile", "Intent", "Calibrated", "Job", "Workflow",
-               "Not stated"},
-    .dates = {"Verified", "Measured", "File dated"},
-    .target = "Target",
-    .notStated = "not stated",
-    .job = "{job}, strip {strip}",
-    .jobOfSheet = "{job} of {parent}, strip {strip}",
-    .labelled = "{label}: ",
-    .criteria = "Criteria",
-    .criterion = "Criterion",
-    .value = "Value",
-    .tolerance = "Tolerance",
-    .valueOfTolerance = "{value} / {tolerance}",
-    .headOfValues = "value / tolerance, {unit}",
-    .more = "and {count} more: {outcomes}",
-    .countedAll = "{count} criteria: {outcomes}",
-    .countFailed = "{count} failed",
-    .countOpen = "{count} without data",
-    .countPassed = "{count} passed",
-    .noCriterion = "The preset judges no criterion.",
-    .hash = "SHA-256 of the result: {hash}",
-    .madeBy = "Tintgate {version}",
-    .signature = "Signature",
-    .certificate = "Certificate of colour verification",
-    .conditions = "Conditions",
-    .differences = "Colour differences",
-    .differencesAxis = "Number of patches by {unit}",
-    .worstPatches = "Largest differences: {count} of {all} patches",
-    .patch = "Patch",
-    .targetColour = "Target L* a* b*",
-    .measuredColour = "Measured L* a* b*",
-    .swatches = "Target, measured",
-    .colours = "Colours: lines lead from the target to what was measured",
-    .warnings = "Warnings",
-    .moreWarnings = "and {count} more",
-    .viewing =
-        "Compare under D50 (ISO 3664): P1, 2000 lx, for comparison with a print; P2, 500 lx, "
-        "for practical appraisal. Swatches help to recognise a patch and are no measurement.",
-    .page = "Page {page} of {pages}",
+constexpr const char* fieldKeys[fieldCount] = {
+    "condition",  "preset",  "date",   "printer",    "paper", "instrument", "operator", "software",
+    "colourants", "profile", "intent", "calibrated", "job",   "workflow",   "notStated"};
+
+Texts textsIn(const languages::Texts& say) {
+    Texts texts = {
+        .passed = say("label.passed"),
+        .failed = say("label.failed"),
+        .incomplete = say("label.incomplete"),
+        .untitled = "–",
+        .fields = {},
+        .dates = {say("label.date.verified"), say("label.date.measured"), say("label.date.file")},
+        .target = say("label.target"),
+        .notStated = say("label.notStated"),
+        .job = say("label.job"),
+        .jobOfSheet = say("label.jobOfSheet"),
+        .labelled = say("label.labelled"),
+        .criteria = say("label.criteria"),
+        .criterion = say("label.criterion"),
+        .value = say("label.value"),
+        .tolerance = say("label.tolerance"),
+        .valueOfTolerance = say("label.valueOfTolerance"),
+        .headOfValues = say("label.headOfValues"),
+        .more = say("label.more"),
+        .countedAll = say("label.countedAll"),
+        .countFailed = say("label.countFailed"),
+        .countOpen = say("label.countOpen"),
+        .countPassed = say("label.countPassed"),
+        .noCriterion = say("label.noCriterion"),
+        .hash = say("label.hash"),
+        .madeBy = "Tintgate {version}",
+        .signature = say("label.signature"),
+        .certificate = say("label.certificate"),
+        .conditions = say("label.conditions"),
+        .differences = say("label.differences"),
+        .differencesAxis = say("label.differencesAxis"),
+        .worstPatches = say("label.worstPatches"),
+        .patch = say("label.patch"),
+        .targetColour = say("label.targetColour"),
+        .measuredColour = say("label.measuredColour"),
+        .swatches = say("label.swatches"),
+        .colours = say("label.colours"),
+        .warnings = say("label.warnings"),
+        .moreWarnings = say("label.moreWarnings"),
+        .viewing = say("label.viewing"),
+        .page = say("label.page"),
+    };
+    for (std::size_t i = 0; i < fieldCount; ++i) {
+        texts.fields[i] = say.find(std::string("label.field.") + fieldKeys[i]).value_or("");
+    }
+    return texts;
+}
+
+struct Speech {
+    languages::Texts say;
+    Texts texts;
 };
+
+Speech& speech() {
+    static Speech current{languages::english(), textsIn(languages::english())};
+    return current;
+}
 
 /// Characters that change the direction of the text after them: a job's name could use them to
 /// make another text of what the label prints.
@@ -67,11 +84,20 @@ bool isBlank(char32_t c) {
 
 } // namespace
 
-const Texts& texts() {
-    return english;
+void useLanguage(languages::Language language) {
+    const languages::Texts say(language);
+    speech() = {say, textsIn(say)};
 }
 
-const char* verdictText(report::Verdict verdict) {
+const languages::Texts& say() {
+    return speech().say;
+}
+
+const Texts& texts() {
+    return speech().texts;
+}
+
+const std::string& verdictText(report::Verdict verdict) {
     return verdict == report::Verdict::Passed   ? texts().passed
            : verdict == report::Verdict::Failed ? texts().failed
                                                 : texts().incomplete;
@@ -99,7 +125,7 @@ std::string filled(std::string_view text,
 }
 
 std::string numberText(double value, int decimals) {
-    return report::fixedText(value, decimals);
+    return say().number(value, decimals);
 }
 
 std::string dateText(const std::string& stamp) {
@@ -113,7 +139,7 @@ std::string dateText(const std::string& stamp) {
         languages::english().day(std::stoi(stamp.substr(8, 2)), std::stoi(stamp.substr(5, 2)),
                                  std::stoi(stamp.substr(0, 4)));
     if (stamp.size() >= minute) {
-        text += ", " + stamp.substr(11, 5);
+        text = say().time(text, stamp.substr(11, 5));
     }
     if (stamp.size() > second) {
         text += " (UTC" + stamp.substr(second) + ")";

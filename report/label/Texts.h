@@ -1,6 +1,6 @@
 // SPDX-License-Identifier: Apache-2.0
-// Every word that labels and certificates print, and how they write numbers and dates. The words of
-// criteria and warnings are the result's.
+// Every word that labels and certificates print, and how they write numbers and dates. The texts
+// are those of report/languages, in the language that was chosen last.
 #pragma once
 
 #include <cstddef>
@@ -11,61 +11,65 @@
 
 #include "report/Result.h"
 #include "report/label/Details.h"
+#include "report/languages/Texts.h"
 
 namespace label {
 
 /// The texts of one language. Names in braces are filled in.
 struct Texts {
-    const char* passed;
-    const char* failed;
-    const char* incomplete;
+    std::string passed;
+    std::string failed;
+    std::string incomplete;
 
-    const char* untitled;
-    const char* fields[fieldCount]; ///< In the order of Field.
-    const char* dates[3];           ///< In the order of DateKind: in place of the field's own.
-    const char* target;             ///< In place of Field::Profile if the target is no profile.
-    const char* notStated;          ///< What a certificate prints for a field that it must have.
-    const char* job;
-    const char* jobOfSheet;
-    const char* labelled; ///< A field with its label.
+    std::string untitled;
+    std::string fields[fieldCount]; ///< In the order of Field.
+    std::string dates[3];           ///< In the order of DateKind: in place of the field's own.
+    std::string target;             ///< In place of Field::Profile if the target is no profile.
+    std::string notStated;          ///< What a certificate prints for a field that it must have.
+    std::string job;
+    std::string jobOfSheet;
+    std::string labelled; ///< A field with its label.
 
-    const char* criteria;
-    const char* criterion;
-    const char* value;
-    const char* tolerance;
-    const char* valueOfTolerance;
-    const char* headOfValues;
-    const char* more;       ///< Criteria that are not listed, by their outcomes:
-    const char* countedAll; ///< The same if none is listed.
-    const char* countFailed;
-    const char* countOpen;
-    const char* countPassed;
-    const char* noCriterion;
+    std::string criteria;
+    std::string criterion;
+    std::string value;
+    std::string tolerance;
+    std::string valueOfTolerance;
+    std::string headOfValues;
+    std::string more;       ///< Criteria that are not listed, by their outcomes:
+    std::string countedAll; ///< The same if none is listed.
+    std::string countFailed;
+    std::string countOpen;
+    std::string countPassed;
+    std::string noCriterion;
 
-    const char* hash;
-    const char* madeBy;
-    const char* signature;
+    std::string hash;
+    std::string madeBy;
+    std::string signature;
 
-    const char* certificate;
-    const char* conditions;
-    const char* differences;
-    const char* differencesAxis;
-    const char* worstPatches;
-    const char* patch;
-    const char* targetColour;
-    const char* measuredColour;
-    const char* swatches;
-    const char* colours;
-    const char* warnings;
-    const char* moreWarnings;
-    const char* viewing;
-    const char* page;
+    std::string certificate;
+    std::string conditions;
+    std::string differences;
+    std::string differencesAxis;
+    std::string worstPatches;
+    std::string patch;
+    std::string targetColour;
+    std::string measuredColour;
+    std::string swatches;
+    std::string colours;
+    std::string warnings;
+    std::string moreWarnings;
+    std::string viewing;
+    std::string page;
 };
+
+/// The texts of pages in the chosen language (useLanguage), for criteria, warnings and patches.
+const languages::Texts& say();
 
 const Texts& texts();
 
 /// "PASSED", "FAILED", "INCOMPLETE".
-const char* verdictText(report::Verdict verdict);
+const std::string& verdictText(report::Verdict verdict);
 
 /// A text with "{name}" replaced by the value of that name.
 std::string filled(std::string_view text,

@@ -120,6 +120,10 @@ std::string Texts::filled(std::size_t index, const std::vector<Value>& values) c
 }
 
 std::string Texts::operator()(Key key, std::initializer_list<Value> values) const {
+    return filled(key.index(), std::vector<Value>(values));
+}
+
+std::string Texts::operator()(Key key, const std::vector<Value>& values) const {
     return filled(key.index(), values);
 }
 

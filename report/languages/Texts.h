@@ -79,6 +79,8 @@ class Texts {
     /// for one and for many.
     std::string operator()(Key key, std::initializer_list<Value> values = {}) const;
 
+    std::string operator()(Key key, const std::vector<Value>& values) const;
+
     /// The same for a key that is known only when the program runs. Nothing if it is not in the
     /// tables.
     std::optional<std::string> find(std::string_view key,

@@ -47,27 +47,35 @@ def literal(text):
     return json.dumps(text, ensure_ascii=False)
 
 
+def write_if_changed(path, text):
+    """Whoever includes an unchanged header is not compiled again."""
+    if not path.is_file() or path.read_text(encoding="utf-8") != text:
+        path.write_text(text, encoding="utf-8")
+
+
 def main(folder, header, source, *languages):
     tables = {language: read(Path(folder) / f"{language}.json") for language in languages}
     keys = sorted(tables["en"], key=str.encode)
-    Path(header).write_text(
+    write_if_changed(
+        Path(header),
         "// Made from report/languages/en.json; change that file instead.\n#pragma once\n\n"
         "#include <string_view>\n\nnamespace languages {\n\n"
         "/// In the order of their bytes.\n"
         f"inline constexpr std::string_view textKeys[] = {{\n"
         + "".join(f"    {literal(key)},\n" for key in keys)
-        + "};\n\n} // namespace languages\n", encoding="utf-8")
+        + "};\n\n} // namespace languages\n")
     rows = []
     for language in languages:
         texts = [tables[language].get(key, tables["en"][key]) for key in keys]
         rows.append(f"const Forms table_{language}[] = {{\n" + "".join(
             f"    {{{literal(one)}, {literal(other)}}},\n" for one, other in texts) + "};\n")
-    Path(source).write_text(
+    write_if_changed(
+        Path(source),
         '#include "report/languages/Tables.h"\n\nnamespace languages {\nnamespace {\n\n'
         + "\n".join(rows)
         + "\n} // namespace\n\nconst Forms* const tables[] = {"
         + ", ".join(f"table_{language}" for language in languages)
-        + "};\n\n} // namespace languages\n", encoding="utf-8")
+        + "};\n\n} // namespace languages\n")
 
 
 if __name__ == "__main__":

@@ -1,11 +1,15 @@
 // SPDX-License-Identifier: Apache-2.0
 // The tables of texts: complete, with the same placeholders everywhere, and what is made of them.
 #include <filesystem>
+#include <fstream>
+#include <map>
 #include <regex>
+#include <set>
 #include <string>
 
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
+#include <nlohmann/json.hpp>
 
 #include "ScratchFolder.h"
 #include "analysis/Criteria.h"
@@ -16,7 +20,71 @@ namespace {
 using languages::Language;
 using languages::languageNamed;
 using languages::Texts;
+using Json = nlohmann::json;
+using Forms = std::vector<std::string>;
+
 namespace fs = std::filesystem;
+
+void flatten(const Json& table, const std::string& prefix, std::map<std::string, Forms>& texts) {
+    for (const auto& [name, value] : table.items()) {
+        const std::string key = prefix + name;
+        if (value.is_string()) {
+            texts[key] = {value};
+        } else if (value.size() == 2 && value.contains("one") && value.contains("other")) {
+            texts[key] = {value["one"], value["other"]};
+        } else {
+            flatten(value, key + ".", texts);
+        }
+    }
+}
+
+std::map<std::string, Forms> tableOf(const std::string& language) {
+    std::map<std::string, Forms> texts;
+    const std::string path = TINTGATE_SOURCE_DIR "/report/languages/" + language + ".json";
+    flatten(Json::parse(support::contentsOf(path)), "", texts);
+    return texts;
+}
+
+/// A role's case is the language's business: {roleOf} stands for {role} in another table.
+std::set<std::string> placeholdersOf(const std::string& text) {
+    static const std::regex placeholder(R"(\{(\w+?)(Of|In)?\})");
+    std::set<std::string> names;
+    for (std::sregex_iterator at(text.begin(), text.end(), placeholder), end; at != end; ++at) {
+        names.insert((*at)[1]);
+    }
+    return names;
+}
+
+TEST(LanguageTables, HaveTheSameTextsWithTheSamePlaceholders) {
+    const auto english = tableOf("en");
+    ASSERT_EQ(english.size(), std::size(languages::textKeys));
+    for (const char* language : {"de", "fr", "es", "it", "ja", "zh"}) {
+        SCOPED_TRACE(language);
+        const auto texts = tableOf(language);
+        for (const auto& [key, forms] : english) {
+            const auto found = texts.find(key);
+            if (found == texts.end()) {
+                ADD_FAILURE() << key << " is missing";
+                continue;
+            }
+            // The form for one may write its number out.
+            EXPECT_EQ(placeholdersOf(found->second.back()), placeholdersOf(forms.back())) << key;
+            auto most = placeholdersOf(forms.back());
+            for (const std::string& name : placeholdersOf(found->second.front())) {
+                EXPECT_TRUE(most.contains(name)) << key << " has no {" << name << "} in English";
+            }
+            auto least = placeholdersOf(forms.front());
+            least.erase("count");
+            for (const std::string& name : least) {
+                EXPECT_TRUE(placeholdersOf(found->second.front()).contains(name)) << key << name;
+            }
+            EXPECT_EQ(found->second.back().empty() && !forms.back().empty(), false) << key;
+        }
+        for (const auto& [key, forms] : texts) {
+            EXPECT_TRUE(english.contains(key)) << key << " is not in en.json";
+        }
+    }
+}
 
 /// Texts that nobody shows are a burden for six translators.
 TEST(LanguageTables, HaveNoTextThatIsNotUsed) {
