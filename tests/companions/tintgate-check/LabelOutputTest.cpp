@@ -43,9 +43,9 @@ printer = "Proofer 2"
         }
     }
 
-    EXPECT_THAT(check({"in/proof0.txt", "--label"}).output,
-                testing::AllOf(HasSubstr("Label: in/proof0.label.pdf"),
-                               testing::Not(HasSubstr("Page:"))));
+    EXPECT_THAT(
+        check({"in/proof0.txt", "--label"}).output,
+        testing::AllOf(HasSubstr("Label: in/proof0.label.pdf"), testing::Not(HasSubstr("Page:"))));
     m_scratch.write("in/proof1.label.pdf", "mine");
     EXPECT_EQ(check({"in/proof1.txt", "--label"}).exitCode, 3);
     EXPECT_EQ(support::contentsOf(m_scratch.path("in/proof1.label.pdf")), "mine");
