@@ -152,17 +152,7 @@ TEST(LabelFile, StatesVerdictTitleConditionsAndSize) {
     const support::ScratchFolder scratch;
     LabelSample sample = LabelSamples(3).next(0);
     sample.hasMeta = true;
-    sample.meta = {"2024-05-01T12:34:56+02:00",
-                   4711,
-                   std::nullopt,
-                   "校正刷り Größe \"7\"",
-                   2,
-                   "Spectro",
-                   "プルーフ用紙",
-                   "Workflow",
-                   "",
-                   "anna",
-                   ""};
+    sample.meta = jobOf("校正刷り Größe \"7\"", "Spectro", "プルーフ用紙", "Workflow", "anna");
     sample.result.verdict = report::Verdict::Incomplete;
     sample.result.presetName = "Contract proof";
     sample.result.target.statements = {{"description", "FOGRA51"}};

@@ -196,17 +196,7 @@ TEST(LabelLayout, ShrinksBeforeItDropsAndDropsInTheDocumentedOrder) {
     LabelSample sample = LabelSamples(1).next(0);
     sample.details.clear();
     sample.hasMeta = true;
-    sample.meta = {"2024-05-01T12:34:56+02:00",
-                   7,
-                   std::nullopt,
-                   "Title",
-                   1,
-                   "Instrument",
-                   "Paper",
-                   "Workflow",
-                   "",
-                   "anna",
-                   ""};
+    sample.meta = jobOf("Title", "Instrument", "Paper", "Workflow", "anna");
     sample.result.presetName = "Preset";
     sample.result.target.statements = {{"description", "Condition"}};
     sample.result.measurement.statements = {{"printing", "Printer"}};

@@ -32,6 +32,21 @@ inline const std::vector<std::string>& hostileTexts() {
     return texts;
 }
 
+inline report::Meta jobOf(const std::string& title, const std::string& instrument,
+                          const std::string& paper, const std::string& workflow,
+                          const std::string& user) {
+    report::Meta meta;
+    meta.created = "2024-05-01T12:34:56+02:00";
+    meta.jobId = 4711;
+    meta.strip = 2;
+    meta.title = title;
+    meta.instrument = instrument;
+    meta.paper = paper;
+    meta.workflow = workflow;
+    meta.user = user;
+    return meta;
+}
+
 struct LabelSample {
     report::Result result;
     report::Meta meta;
@@ -72,17 +87,7 @@ class LabelSamples {
             result.warnings.push_back({text(), upTo(1) == 1});
         }
         sample.hasMeta = upTo(1) == 1;
-        sample.meta = {"2024-05-01T12:34:56+02:00",
-                       4711,
-                       std::nullopt,
-                       text(),
-                       2,
-                       text(),
-                       text(),
-                       text(),
-                       "server",
-                       text(),
-                       ""};
+        sample.meta = jobOf(text(), text(), text(), text(), text());
         for (std::size_t i = 0; i < label::fieldCount; ++i) {
             if (upTo(2) == 0) {
                 sample.details[static_cast<label::Field>(i)] = text();
