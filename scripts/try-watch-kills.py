@@ -96,8 +96,8 @@ class Watch:
     def __init__(self, arguments):
         self.command = arguments
 
-    def start(self):
-        return subprocess.Popen(self.command, stdout=subprocess.DEVNULL, stderr=subprocess.PIPE)
+    def start(self, output=subprocess.DEVNULL):
+        return subprocess.Popen(self.command, stdout=output, stderr=subprocess.PIPE)
 
 
 def sha_of(path):
@@ -180,11 +180,15 @@ def main():
         after_kills = len(results_below(results))
         writer.join()
 
-        watch = Watch(command).start()
+        screen = Path(scratch) / "screen"
+        with screen.open("wb") as output:
+            watch = Watch(command).start(output)
         deadline = time.monotonic() + 120
         expected = {sha_of(path) for path in Path(exports).rglob("*.txt")
                     if not path.name.startswith(".")}
-        while time.monotonic() < deadline and not expected <= set(results_below(results)):
+        # Before its first line, a signal still ends the watch in the ordinary way.
+        while time.monotonic() < deadline and (not screen.stat().st_size or
+                                               not expected <= set(results_below(results))):
             time.sleep(0.1)
         watch.send_signal(signal.SIGTERM)
         words = watch.communicate()[1].decode()
