@@ -45,6 +45,9 @@ TEST(WriteWholeFile, KeepsLinksAndPermissionsAndLeavesNothingBeside) {
     EXPECT_TRUE(fs::is_symlink(link));
     EXPECT_EQ(contentsOf(folder.path("a")), "new");
     EXPECT_EQ(modeOf(file), 0640u);
+    ASSERT_TRUE(base::replaceWholeFile(link, "own"));
+    EXPECT_FALSE(fs::is_symlink(link));
+    EXPECT_EQ(contentsOf(file), "new");
 
     const mode_t mask = umask(027);
     ASSERT_TRUE(base::writeWholeFile(folder.path("fresh"), ""));
