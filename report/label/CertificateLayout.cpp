@@ -9,6 +9,7 @@
 #include "report/label/HistogramChart.h"
 #include "report/label/Parts.h"
 #include "report/label/Texts.h"
+#include "report/label/ToneCharts.h"
 
 namespace label {
 namespace {
@@ -90,6 +91,7 @@ class Certificate {
         placeHistogram();
         placeWorstPatches();
         placeWarnings();
+        placeToneCharts();
         placeColourCharts();
         placeEnd();
         placeFeet();
@@ -459,6 +461,20 @@ class Certificate {
             m_y += rowGap;
         }
         m_y += blockGap;
+    }
+
+    void placeToneCharts() {
+        constexpr double height = 38;
+        const std::size_t count = m_content.model.tones.size();
+        if (count == 0 || headingHeight(texts().tones) + height > room() - endHeight() - blockGap) {
+            return;
+        }
+        addHeading(
+            filled(texts().tones, {{"count", std::to_string(std::min(count, mostToneCharts))},
+                                   {"all", std::to_string(count)}}));
+        const Rect area = {margin, m_y, m_width, height};
+        addToneCharts(page(), m_typesetter, area, m_content.model);
+        m_y = area.bottom() + blockGap;
     }
 
     /// As large as there is room left, on the last sheet.

@@ -10,7 +10,9 @@ namespace label {
 Rect addText(Page& page, const Typesetter& typesetter, const Point& at, double width,
              const std::string& words, const Style& style, std::size_t lead) {
     const Rect place = {at.x, at.y, width, typesetter.measure(words, style, width, lead).height};
-    page.texts.push_back({place, words, style, lead});
+    if (!words.empty()) {
+        page.texts.push_back({place, words, style, lead});
+    }
     return place;
 }
 

@@ -15,7 +15,8 @@ struct Point {
     double y = 0;
 };
 
-/// Adds a text as high as it needs to be, and returns its place.
+/// Adds a text as high as it needs to be, and returns its place. An empty text takes a line, and
+/// nothing is added.
 Rect addText(Page& page, const Typesetter& typesetter, const Point& at, double width,
              const std::string& words, const Style& style, std::size_t lead = 0);
 

@@ -50,6 +50,7 @@ Texts textsIn(const languages::Texts& say) {
         .measuredColour = say("label.measuredColour"),
         .swatches = say("label.swatches"),
         .colours = say("label.colours"),
+        .tones = say("label.tones"),
         .warnings = say("label.warnings"),
         .moreWarnings = say("label.moreWarnings"),
         .viewing = say("label.viewing"),

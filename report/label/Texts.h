@@ -57,6 +57,7 @@ struct Texts {
     std::string measuredColour;
     std::string swatches;
     std::string colours;
+    std::string tones;
     std::string warnings;
     std::string moreWarnings;
     std::string viewing;

@@ -83,6 +83,9 @@ class LabelSamples {
         result.channels = {"CMYK_C", "CMYK_M", "CMYK_Y", "CMYK_K"};
         addPatches(result, 1 + upTo(mostPatches - 1));
         addCriteria(result, upTo(mostCriteria));
+        if (upTo(1) == 1) {
+            addTones(result);
+        }
         for (std::size_t i = upTo(3); i > 0; --i) {
             result.warnings.push_back({text(), upTo(1) == 1});
         }
@@ -118,6 +121,20 @@ class LabelSamples {
             }
         }
         result.statistics = {2.5, 2, 5, 6, 1};
+    }
+
+    void addTones(report::Result& result) {
+        report::Tones& tones = result.tones.emplace();
+        tones.method = "density";
+        for (std::size_t channel = 0; channel < 1 + upTo(3); ++channel) {
+            report::InkTones& ink = tones.inks.emplace_back();
+            ink.channel = channel;
+            ink.aims = "target";
+            for (double nominal = 10; nominal < 100; nominal += 10) {
+                ink.steps.push_back({nominal, nominal + number(40) - 10, nominal + 12,
+                                     upTo(result.patches.size() - 1)});
+            }
+        }
     }
 
     void addCriteria(report::Result& result, std::size_t count) {
