@@ -13,6 +13,7 @@
 
 #include "ScratchFolder.h"
 #include "analysis/Criteria.h"
+#include "report/Model.h"
 #include "report/languages/Texts.h"
 
 namespace {
@@ -144,6 +145,72 @@ TEST(Language, IsFoundByTheNamesThatLocalesAndJobsUse) {
     };
     for (const auto& [name, language] : cases) {
         EXPECT_EQ(languageNamed(name), language) << name;
+    }
+}
+
+// Expected as CLDR 42 has it, except that numbers below 10,000 stay whole and French has "1er".
+TEST(Texts, WriteNumbersAndDatesByTheHabitsOfTheLanguage) {
+    const struct {
+        Language language;
+        const char* number;
+        const char* time;
+    } cases[] = {
+        {Language::English, "-12,345.50", "1 May 2024, 12:34"},
+        {Language::German, "-12.345,50", "1. Mai 2024, 12:34"},
+        {Language::French, "-12\u202f345,50", "1er mai 2024, 12:34"},
+        {Language::Spanish, "-12.345,50", "1 de mayo de 2024, 12:34"},
+        {Language::Italian, "-12.345,50", "1 maggio 2024, 12:34"},
+        {Language::Japanese, "-12,345.50", "2024年5月1日 12:34"},
+        {Language::Chinese, "-12,345.50", "2024年5月1日 12:34"},
+    };
+    for (const auto& [language, number, time] : cases) {
+        const Texts say(language);
+        EXPECT_EQ(say.number(-12345.5, 2), number);
+        EXPECT_EQ(say.time(say.day(1, 5, 2024), "12:34"), time);
+        EXPECT_EQ(say.count(1617), "1617");
+    }
+    const Texts german(Language::German);
+    EXPECT_EQ(german("count.patches", {{"count", 1u}}), "1 Messfeld");
+    EXPECT_EQ(german("count.patches", {{"count", 12345u}}), "12.345 Messfelder");
+    EXPECT_EQ(Texts(Language::French)("count.patches", {{"count", 0u}}), "0 plage");
+}
+
+// Sentences as libTintgate writes them.
+TEST(Warnings, AreTranslatedByTheirEnglishSentences) {
+    const struct {
+        const char* code;
+        const char* english;
+        const char* german;
+    } cases[] = {
+        {"patchesUnpaired", "1 patch of the patch set had no counterpart.",
+         "1 Messfeld der Messfeldliste hat kein Gegenstück."},
+        {"patchesUnpaired", "12 patches of the measurement had no counterpart.",
+         "12 Messfelder der Messung haben kein Gegenstück."},
+        {"deviceSpacesDiffer",
+         "The device values of the target and of the measurement are of different kinds, so "
+         "nothing "
+         "proves that equal labels or places mean equal patches.",
+         "Die Gerätewerte der Referenz und der Messung sind verschiedener Art; nichts belegt, dass "
+         "gleiche Kennungen oder Plätze gleiche Messfelder bedeuten."},
+        {"calculatedFromSpectra",
+         "The target states D65, 10 degrees; its colours were calculated from its spectra for D50, "
+         "2 degrees instead.",
+         "Angabe der Referenz: D65, 10°; die Farben wurden stattdessen aus den Spektren für D50, "
+         "2° "
+         "berechnet."},
+        {"readerNote",
+         "In the measurement: NUMBER_OF_SETS is 4, but there are 5 rows, which are used.",
+         "Hinweis zu der Messung: NUMBER_OF_SETS ist 4, vorhanden sind 5 Zeilen; diese werden "
+         "verwendet."},
+        {"readerNote", "In the target: A remark of another version.",
+         "Hinweis zu der Referenz: A remark of another version."},
+        {"ofAnotherVersion", "A warning that nobody knows.", "A warning that nobody knows."},
+    };
+    const Texts german(Language::German);
+    for (const auto& [code, english, translated] : cases) {
+        const report::Warning warning{english, false, code};
+        EXPECT_EQ(report::warningText(warning, german), translated);
+        EXPECT_EQ(report::warningText(warning, Texts(Language::English)), english);
     }
 }
 

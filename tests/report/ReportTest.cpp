@@ -203,6 +203,29 @@ TEST(Measures, BecomeChartsAndATrend) {
     }
 }
 
+TEST(Model, HasTheWorstPatchesOfManyAndChartsOfAll) {
+    for (const std::size_t count : {mostRows, mostRows + 1}) {
+        const bool isCut = count > mostRows;
+        const Model model = makeModel(resultOf(count), nullptr);
+        EXPECT_EQ(model.shown, isCut ? worstRows : count);
+        EXPECT_EQ(model.shownText.empty(), !isCut);
+        std::vector<std::size_t> patches;
+        for (std::size_t i = 0; i < model.rows.size(); ++i) {
+            patches.push_back(model.rows[i].patch);
+            EXPECT_TRUE(i >= model.shown || model.rows[i].patch == count - 1 - i) << i;
+        }
+        std::sort(patches.begin(), patches.end());
+        EXPECT_EQ(std::adjacent_find(patches.begin(), patches.end()), patches.end());
+        // The charts reach from the worst patch to the best ones.
+        ASSERT_EQ(model.drawn.size(), mostDrawn);
+        std::size_t best = count;
+        for (const std::size_t row : model.drawn) {
+            best = std::min(best, model.rows.at(row).patch);
+        }
+        EXPECT_LT(best, count / 100);
+    }
+}
+
 TEST(Readers, RefuseWhatIsNoResultAndNoTime) {
     const std::string whole = support::contentsOf(data + "output.json");
     std::string problem;

@@ -182,4 +182,39 @@ TEST_F(ReportProgram, EndsEachFaultInItsOwnStatus) {
     EXPECT_EQ(std::distance(fs::directory_iterator(m_scratch.path("pages")), {}), 1);
 }
 
+TEST_F(ReportProgram, WritesInTheLanguageOfTheJobTheLocaleOrTheOption) {
+    std::string meta = support::contentsOf(m_meta);
+    const std::string english = "\"language\": \"en\"";
+    ASSERT_NE(meta.find(english), meta.npos);
+    meta.replace(meta.find(english), english.size(), "\"language\": \"de_DE\"");
+    m_scratch.write("meta.json", meta);
+    const std::string alone = m_scratch.path("alone.json");
+    fs::copy_file(m_result, alone);
+    support::RunOptions french;
+    french.environment = {{"LANGUAGE", std::nullopt}, {"LC_ALL", "fr_FR.UTF-8"}};
+    const struct {
+        std::vector<std::string> words;
+        const char* language;
+        const char* word;
+    } cases[] = {
+        {{m_result, "-o", "-"}, "<html lang=\"de\"", ">Nicht bestanden<"},
+        {{m_result, "-o", "-", "--language", "ja"}, "<html lang=\"ja\"", ">不合格<"},
+        {{alone, "-o", "-"}, "<html lang=\"fr\"", ">Non conforme<"},
+        {{m_result, "--text"}, "", "✕ Non conforme"},
+        {{m_result, "--text", "--language", "es"}, "", "✕ No conforme"},
+        {{m_result, "--trend", "-o", "-"}, "<html lang=\"fr\"", "1 résultat de fichiers"},
+    };
+    for (const auto& [words, language, word] : cases) {
+        const std::string text = report(words, french).output;
+        EXPECT_THAT(text, HasSubstr(language)) << testing::PrintToString(words);
+        EXPECT_THAT(text, HasSubstr(word)) << testing::PrintToString(words);
+    }
+    french.environment["LC_ALL"] = "C";
+    EXPECT_THAT(report({alone, "--text"}, french).output, HasSubstr("Failed"));
+    EXPECT_EQ(report({alone, "--language", "tlh"}).exitCode, 64);
+    // Data stay as they are.
+    EXPECT_EQ(report({m_result, "--csv", "--language", "de"}).output,
+              report({m_result, "--csv"}).output);
+}
+
 } // namespace
