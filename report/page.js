@@ -80,6 +80,8 @@
       if (sign) heading.setAttribute("aria-sort", falling ? "descending" : "ascending");
       const button = heading.appendChild(make("button", "", column.title + sign));
       button.type = "button";
+      const onPaper = heading.appendChild(make("span", "onPaper", column.title + sign));
+      onPaper.setAttribute("aria-hidden", "true");
       button.addEventListener("click", () => {
         falling = column === sorted ? !falling : Boolean(column.falls);
         sorted = column;

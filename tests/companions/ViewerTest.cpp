@@ -2,6 +2,7 @@
 #include <algorithm>
 #include <filesystem>
 #include <fstream>
+#include <sstream>
 #include <string>
 #include <unistd.h>
 #include <utime.h>
@@ -157,6 +158,26 @@ TEST_F(Viewer, SortsFindsAndSavesPatches) {
           "\n,,0,0,100,0,89,-5,93,88,-4,90,1.5", "\nA4,,0,0,0,100,16,0,0,,0,0,,A4,\r\n"}) {
         EXPECT_THAT(seen.output, HasSubstr(part));
     }
+}
+
+TEST_F(Viewer, PrintsTheHeadingOfPatchesOnEachSheet) {
+    std::string result = support::contentsOf(data + "output.json");
+    const std::string row = "[\"A1\",\"paper\",[0,0,0,0],[95,0,-2],[95,0.5,-3],1.25],\n";
+    ASSERT_NE(result.find(row), result.npos);
+    for (int i = 0; i < 90; ++i) {
+        result.insert(result.find(row), row);
+    }
+    std::ofstream(m_folder + "/output.json") << result;
+    ASSERT_EQ(show().exitCode, 0);
+    std::istringstream sheets(support::printed(m_scratch, m_page));
+    int withPatches = 0;
+    for (std::string sheet; std::getline(sheets, sheet, '\f');) {
+        if (sheet.find("95.00 0.50 -3.00") != sheet.npos) {
+            ++withPatches;
+            EXPECT_THAT(sheet, HasSubstr("Measured L*a*b*"));
+        }
+    }
+    EXPECT_GE(withPatches, 2);
 }
 
 // Results in the current format: patches with other labels on the sheet, and warnings.

@@ -8,18 +8,33 @@
 
 namespace support {
 
-Outcome browse(const ScratchFolder& scratch, const std::string& page) {
+namespace {
+
+Outcome runBrowser(const ScratchFolder& scratch, const std::string& page,
+                   const std::string& action) {
     std::istringstream words("chromium --headless --disable-gpu --disable-quic --no-first-run "
                              "--disable-background-networking --disable-component-update "
-                             "--disable-sync --enable-logging=stderr --virtual-time-budget=5000 "
-                             "--dump-dom");
+                             "--disable-sync --enable-logging=stderr --virtual-time-budget=5000");
     std::vector<std::string> command(std::istream_iterator<std::string>(words), {});
     if (geteuid() == 0) {
         command.emplace_back("--no-sandbox");
     }
+    command.push_back(action);
     command.push_back("--user-data-dir=" + scratch.path("browser"));
     command.push_back("file://" + page);
     return run(command);
+}
+
+} // namespace
+
+Outcome browse(const ScratchFolder& scratch, const std::string& page) {
+    return runBrowser(scratch, page, "--dump-dom");
+}
+
+std::string printed(const ScratchFolder& scratch, const std::string& page) {
+    const std::string sheets = scratch.path("sheets.pdf");
+    runBrowser(scratch, page, "--print-to-pdf=" + sheets);
+    return run({"pdftotext", "-layout", sheets, "-"}).output;
 }
 
 Outcome browseHandled(const ScratchFolder& scratch, const std::string& page,

@@ -13,6 +13,9 @@ namespace support {
 /// `error` the console's output. The profile is in the scratch folder.
 Outcome browse(const ScratchFolder& scratch, const std::string& page);
 
+/// What a local page is on paper, as `pdftotext -layout` reads it: a form feed ends each sheet.
+std::string printed(const ScratchFolder& scratch, const std::string& page);
+
 /// Shows a page with an additional script that acts like a person; the page's policy is changed to
 /// allow it. In the script, seen("name", "text") adds "[name: text]" to the page.
 Outcome browseHandled(const ScratchFolder& scratch, const std::string& page,
