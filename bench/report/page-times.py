@@ -91,11 +91,10 @@ def compare(arguments, folder):
     subprocess.run([arguments.tintgate_report, last, "-o", one], check=True)
 
     cyan = next(c for c in json.loads(last.read_text())["criteria"] if c["name"] == "solidCyan")
-    value = f"{cyan['rounded']:.2f} of 3.00 ΔE00"
     expected = {
-        trend: (f"{arguments.results} jobs", f"<b>Solid cyan</b><span>latest {value}",
+        trend: (f"{arguments.results} jobs", f"latest job {cyan['rounded']:.2f} of 3.00 ΔE00",
                 "Drifting: cyan"),
-        one: (f"<td>Solid cyan</td><td class=\"number\">{cyan['rounded']:.2f} ",),
+        one: (f"Solid cyan</th><td class=\"number\">{cyan['rounded']:.2f} ",),
     }
     probes = {page: with_probe(page) for page in expected}
     runs = {page: [] for page in expected}
