@@ -22,7 +22,7 @@ using colour::Xyz;
 using Indices = std::vector<std::uint32_t>; ///< Into Readings.
 
 constexpr std::ptrdiff_t processInks = 4;
-constexpr double perPercent = 100; ///< Tints are told apart at 0.01 percent, as pairing does.
+constexpr double perPercent = 100; ///< Tints differ from 0.01 percent on, as in pairing.
 
 // ---- Which readings are which tint
 

@@ -44,8 +44,8 @@ struct TableHeader {
 /// Reads the rows of one table, up to END_DATA or the end of the text.
 class RowReader {
   public:
-    /// `text` is the whole text; `ascii` tells whether all of it is ASCII. All arguments must
-    /// outlive the reader.
+    /// `text` is the whole text. `ascii` is true if all of it is ASCII. All arguments must outlive
+    /// the reader.
     RowReader(std::string_view text, bool ascii, const TableHeader& header, const CgatsWants& wants,
               Notes& notes);
 

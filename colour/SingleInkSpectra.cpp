@@ -31,7 +31,7 @@ bool takeLine(std::string_view bytes, std::string_view word, std::size_t& at) {
     return true;
 }
 
-/// Where the rows begin, behind the first line BEGIN_DATA from `at` on; npos without one.
+/// The position after the first line BEGIN_DATA at or after `at`, or npos if there is none.
 std::size_t rowsBehind(std::string_view bytes, std::size_t at) {
     constexpr std::string_view start = "\nBEGIN_DATA";
     for (at = bytes.find(start, at); at != bytes.npos; at = bytes.find(start, at)) {

@@ -15,8 +15,8 @@ enum class ProcessInk { Cyan, Magenta, Yellow, Black };
 /// (1 - 10^-(Dt - Dp)) / (1 - 10^-(Ds - Dp)).
 std::optional<double> toneValue(double paper, double solid, double tint);
 
-/// What stands in for the light of the ink's filter if only colours are known: X - 0.55 Z for cyan,
-/// Y for magenta and black, Z for yellow (the practice of ISO/TS 10128). Tone values of these
+/// Replaces the reflectance through the ink's filter if only colours are known: X - 0.55 Z for
+/// cyan, Y for magenta and black, Z for yellow (the practice of ISO/TS 10128). Tone values of these
 /// differ from those of densities by up to 0.8.
 double colorimetricReflectance(ProcessInk ink, const Xyz& xyz);
 

@@ -1,5 +1,5 @@
 // SPDX-License-Identifier: Apache-2.0
-// Implements Desktop Notifications Specification 1.2.
+// Implements version 1.2 of freedesktop.org's desktop notifications.
 #include "companions/measure-tool/Notification.h"
 
 #include <chrono>

@@ -184,7 +184,7 @@ std::string valueOf(const char* variable) {
     return value == nullptr ? std::string() : std::string(value);
 }
 
-/// By the XDG specification, a relative path is ignored.
+/// A relative path is ignored, as the XDG base directory rules require.
 std::string configurationFolder() {
     const std::string folder = valueOf("XDG_CONFIG_HOME");
     return folder.starts_with('/') ? folder : valueOf("HOME") + "/.config";

@@ -18,7 +18,7 @@ namespace {
 
 namespace fs = std::filesystem;
 
-/// Other kinds of files, told from their first bytes.
+/// Other kinds of files, recognised by their first bytes.
 struct OtherKind {
     std::string_view start;
     Say what;

@@ -10,8 +10,8 @@
 
 namespace check {
 
-/// Folders of data sets, the nearest first: "references" beside the conditions in use, beside those
-/// of the user and of the system, then Debian's data sets.
+/// Folders of data sets in the order of search: "references" next to the conditions in use, next to
+/// the user's, and next to the system's, then Debian's data sets.
 std::vector<std::string> dataSetFolders(const Conditions& conditions);
 
 struct DataSetEntry {
