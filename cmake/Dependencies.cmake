@@ -34,6 +34,8 @@ add_library(xxhash INTERFACE)
 target_include_directories(xxhash SYSTEM INTERFACE ${libxxhash_INCLUDE_DIRS})
 pkg_check_modules(tomlplusplus REQUIRED IMPORTED_TARGET tomlplusplus)
 pkg_check_modules(libsystemd REQUIRED IMPORTED_TARGET libsystemd)
+# Widths of characters on a terminal.
+pkg_check_modules(glib REQUIRED IMPORTED_TARGET glib-2.0)
 # Labels and certificates; pangocairo brings cairo with its PDF and SVG surfaces.
 pkg_check_modules(pangocairo REQUIRED IMPORTED_TARGET pangocairo cairo-pdf cairo-svg)
 pkg_check_modules(libqrencode REQUIRED IMPORTED_TARGET libqrencode)

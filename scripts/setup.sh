@@ -8,7 +8,7 @@ packages=(
   g++ cmake ninja-build pkg-config python3 libwxgtk3.2-dev liblcms2-dev libpugixml-dev
   nlohmann-json3-dev libicu-dev libplist-dev libmd-dev libsqlite3-dev libsodium-dev libcli11-dev
   libexpat1-dev libpq-dev libjs-chart.js libsystemd-dev libtomlplusplus-dev libxxhash-dev
-  libcairo2-dev libpango1.0-dev libqrencode-dev zlib1g-dev
+  libcairo2-dev libglib2.0-dev libpango1.0-dev libqrencode-dev zlib1g-dev
   # To test and to measure
   libgtest-dev libgmock-dev libbenchmark-dev python3-jsonschema argyll liblcms2-utils chromium
   postgresql pgbouncer dbus clang-format-16 clang-tidy-16 poppler-utils zbar-tools

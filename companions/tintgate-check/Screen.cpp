@@ -45,22 +45,28 @@ Mark markOf(Fate fate) {
 }
 
 std::string padded(std::string text, std::size_t width) {
-    const std::size_t has = base::charactersIn(text);
+    const std::size_t has = report::columnsOf(text);
     return text.append(has < width ? width - has : 0, ' ');
 }
 
-/// Cut to so many characters, with "…" as the last one.
+/// Cut to so many columns of the terminal, with "…" as the last one.
 std::string fitted(const std::string& text, std::size_t width) {
-    if (base::charactersIn(text) <= width || width == 0) {
+    if (report::columnsOf(text) <= width || width == 0) {
         return text;
     }
-    std::size_t at = 0;
-    for (std::size_t characters = 0; at < text.size(); ++at) {
-        if ((text[at] & 0xC0) != 0x80 && ++characters == width) {
-            break;
+    std::size_t end = 0;
+    std::size_t used = 0;
+    while (true) {
+        std::size_t next = end + 1;
+        while (next < text.size() && (text[next] & 0xC0) == 0x80) {
+            ++next;
         }
+        used += report::columnsOf(text.substr(end, next - end));
+        if (used >= width) {
+            return text.substr(0, end) + "…";
+        }
+        end = next;
     }
-    return text.substr(0, at) + "…";
 }
 
 /// The text in lines of `width`, each after `indent` blanks but for the first, which follows
@@ -80,7 +86,7 @@ std::string wrapped(const std::string& label, std::size_t indent, const std::str
         const std::size_t end = std::min(text.find(' ', start), text.size());
         const std::string word = text.substr(start, end - start);
         if (!line.empty() &&
-            indent + base::charactersIn(line) + 1 + base::charactersIn(word) > width) {
+            indent + report::columnsOf(line) + 1 + report::columnsOf(word) > width) {
             flush(false);
         }
         line += (line.empty() ? "" : " ") + word;
@@ -127,7 +133,7 @@ std::string criteriaText(const report::Model& model, const Painter& paint, std::
     for (std::size_t column = 0; column < 5; ++column) {
         std::size_t widest = 0;
         for (const auto& cells : lines) {
-            widest = std::max(widest, base::charactersIn(cells[column].text));
+            widest = std::max(widest, report::columnsOf(cells[column].text));
         }
         used += widest + 2;
     }
@@ -297,8 +303,8 @@ std::string resultText(const Outcome& outcome, const Aim& aim, bool isReferenceD
 std::string reasonsText(const Problem& problem, const Painter& paint, std::size_t width,
                         std::size_t indent) {
     const std::size_t column =
-        indent +
-        std::max(base::charactersIn(say(Say::Cause)), base::charactersIn(say(Say::Remedy))) + 2;
+        indent + std::max(report::columnsOf(say(Say::Cause)), report::columnsOf(say(Say::Remedy))) +
+        2;
     std::string text;
     for (const auto& [label, words] :
          {std::pair(Say::Cause, problem.cause), std::pair(Say::Remedy, problem.remedy)}) {
@@ -353,10 +359,10 @@ std::string lineText(const Outcome& outcome, const Painter& paint, std::size_t w
     const std::string name = padded(outcome.measurement.path, ofName);
     std::string reason = outcome.fate == Fate::NotDone ? outcome.problem->what : outcome.criterion;
     if (width != 0) {
-        const std::size_t used = 2 + ofWord + 2 + ofFigures + 2 + base::charactersIn(name) + 2;
+        const std::size_t used = 2 + ofWord + 2 + ofFigures + 2 + report::columnsOf(name) + 2;
         reason = used + shortestReason <= width ? fitted(reason, width - used) : "";
     }
-    const std::size_t ofText = base::charactersIn(outcome.figures);
+    const std::size_t ofText = report::columnsOf(outcome.figures);
     const std::string line =
         "  " + paint(mark.tone, padded(std::string(mark.sign) + ' ' + say(mark.word), ofWord)) +
         "  " + std::string(ofText < ofFigures ? ofFigures - ofText : 0, ' ') +

@@ -4,9 +4,9 @@
 #include <algorithm>
 #include <cstdlib>
 
+#include <glib.h>
 #include <unistd.h>
 
-#include "base/Utf8.h"
 #include "companions/tintgate-store/Bytes.h"
 
 namespace report {
@@ -47,12 +47,22 @@ bool terminalTakesColours() {
            std::string_view(kind) != "dumb" && *kind != '\0';
 }
 
+std::size_t columnsOf(std::string_view text) {
+    std::size_t columns = 0;
+    const char* const end = text.data() + text.size();
+    for (const char* at = text.data(); at < end; at = g_utf8_next_char(at)) {
+        const gunichar c = g_utf8_get_char(at);
+        columns += g_unichar_iszerowidth(c) != 0 ? 0 : g_unichar_iswide(c) != 0 ? 2 : 1;
+    }
+    return columns;
+}
+
 std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter& paint) {
     std::vector<std::size_t> widths;
     for (const auto& cells : lines) {
         widths.resize(std::max(widths.size(), cells.size()));
         for (std::size_t i = 0; i < cells.size(); ++i) {
-            widths[i] = std::max(widths[i], base::charactersIn(admin::printable(cells[i].text)));
+            widths[i] = std::max(widths[i], columnsOf(admin::printable(cells[i].text)));
         }
     }
     std::string text;
@@ -60,7 +70,7 @@ std::string tableText(const std::vector<std::vector<Cell>>& lines, const Painter
         std::string line;
         for (std::size_t i = 0; i < cells.size(); ++i) {
             const Cell& cell = cells[i];
-            const std::size_t gap = widths[i] - base::charactersIn(admin::printable(cell.text));
+            const std::size_t gap = widths[i] - columnsOf(admin::printable(cell.text));
             line +=
                 "  " + std::string(cell.toTheRight ? gap : 0, ' ') + paint(cell.tone, cell.text);
             if (!cell.toTheRight && i + 1 < cells.size()) {

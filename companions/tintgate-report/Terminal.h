@@ -2,6 +2,7 @@
 // Formats text for a terminal.
 #pragma once
 
+#include <cstddef>
 #include <string>
 #include <string_view>
 #include <vector>
@@ -25,6 +26,10 @@ class Painter {
 /// Whether standard output is a terminal with colours. False if NO_COLOR is set, and if TERM is
 /// "dumb" or unset.
 bool terminalTakesColours();
+
+/// The columns that a terminal needs for a line of valid UTF-8: two for each wide character
+/// (Chinese, Japanese, Korean), none for a combining one.
+std::size_t columnsOf(std::string_view text);
 
 struct Cell {
     std::string text;

@@ -136,8 +136,7 @@ std::string dateText(const std::string& stamp) {
     if (stamp.size() < day || stamp[4] != '-') {
         return stamp;
     }
-    std::string text =
-        languages::english().day(std::stoi(stamp.substr(8, 2)), std::stoi(stamp.substr(5, 2)),
+    std::string text = say().day(std::stoi(stamp.substr(8, 2)), std::stoi(stamp.substr(5, 2)),
                                  std::stoi(stamp.substr(0, 4)));
     if (stamp.size() >= minute) {
         text = say().time(text, stamp.substr(11, 5));
