@@ -1,7 +1,7 @@
 #!/usr/bin/env bash
 # SPDX-License-Identifier: Apache-2.0
 # Builds everything and runs all tests, first as delivered, then under the address and
-# undefined-behaviour sanitizers, and lints what differs from main. Arguments select other presets
+# undefined-behaviour sanitizers, and lints what is not committed yet. Arguments select other presets
 # by name.
 set -euo pipefail
 cd "$(dirname "$0")/.."
@@ -17,4 +17,4 @@ for preset in "${presets[@]}"; do
   cmake --build --preset "$preset"
   ctest --preset "$preset" --parallel "$(nproc)"
 done
-scripts/lint.sh
+scripts/lint.sh HEAD
