@@ -157,18 +157,18 @@ bool RowReader::takeEndOfData() {
     if (*m_at != 'E' && *m_at != 'e' && *m_at != '"') {
         return false;
     }
-    const char* behind = m_at;
-    const Word word = takeWord(behind, m_end, *m_chars);
+    const char* after = m_at;
+    const Word word = takeWord(after, m_end, *m_chars);
     if (!sameWord(word.text, "END_DATA")) {
         return false;
     }
     if (word.quoted) { // alone in its line; otherwise it is an id
-        behind = skipBlanks(behind, m_end, *m_chars);
-        if (behind != m_end && !m_chars->isLineEnd(*behind)) {
+        after = skipBlanks(after, m_end, *m_chars);
+        if (after != m_end && !m_chars->isLineEnd(*after)) {
             return false;
         }
     }
-    m_at = lineEndOf(behind, m_end);
+    m_at = lineEndOf(after, m_end);
     m_ended = true;
     return true;
 }

@@ -34,8 +34,8 @@ struct PresetEntry {
     std::string path;
 };
 
-/// Folders of presets, the nearest first: "presets" beside the conditions in use, beside those of
-/// the user and of the system, then the one that came with this program.
+/// Folders of presets in the order of search: "presets" next to the conditions in use, next to the
+/// user's, and next to the system's, then the one that came with this program.
 std::vector<std::string> presetFolders(const Conditions& conditions);
 
 /// The presets of a folder by their files' names. The short name is that of short-names.toml in the

@@ -184,7 +184,8 @@ class Watch {
         m_again[path] = Clock::now() + m_beforeRetry;
     }
 
-    /// Whether a problem of a file is news. `state` tells versions of the file apart.
+    /// True if this problem of the file was not reported yet. `state` identifies the file's
+    /// version.
     bool isNews(const std::string& path, const std::string& state) {
         const std::lock_guard lock(m_mutex);
         return std::exchange(m_reported[path], state) != state;

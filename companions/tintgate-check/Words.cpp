@@ -158,7 +158,7 @@ constexpr Sentence sentences[] = {
     {Say::OutIsFile, "check.outIsFile"},
     {Say::NoSuchLanguage, "check.noSuchLanguage"}};
 
-/// Fails to compile if a sentence is missing or stands in another place than its name.
+/// True if the sentences are complete and in the order of their names.
 constexpr bool isComplete() {
     std::size_t place = 0;
     for (const Sentence& sentence : sentences) {

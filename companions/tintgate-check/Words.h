@@ -63,7 +63,7 @@ enum class Say {
     AdviceSameFile,
     AdviceShowPage,
 
-    // What else is wrong with a file than its exit code tells
+    // Problems of a file that have no exit code of their own
     EmptyFile,
     EmptyFileRemedy,
     IsPreset,

@@ -38,7 +38,8 @@ void addLabelOptions(CLI::App& program, LabelOptions& options);
 /// Turns words into sizes and the like. Throws CLI::ParseError.
 void settle(LabelOptions& options);
 
-/// Writes what is asked for; `say` is told what had no room. Throws Failure.
+/// Writes the label and the certificate that `options` ask for. Passes each field that had no room
+/// to `say`. Throws Failure.
 void writeLabels(const LabelOptions& options, const std::string& result, const std::string& meta,
                  std::optional<languages::Language> language,
                  const std::function<void(const std::string&)>& say);

@@ -31,7 +31,7 @@ enum class SeriesBy { Statements, Folders };
 
 /// Reads result files, or all below folders, and makes the page of each job where the viewer has
 /// not made it already, in `language` or, without one, in that of the job. What can't be read is
-/// told through `complain` and left out. Throws Failure (Unreadable for a folder, NotWritten).
+/// reported to `complain` and left out. Throws Failure (Unreadable for a folder, NotWritten).
 Gathered gatherFiles(const std::vector<std::string>& arguments, const Filter& filter,
                      SeriesBy seriesBy, const PagePlace& place,
                      std::optional<languages::Language> language, const languages::Texts& say,

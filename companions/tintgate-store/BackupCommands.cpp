@@ -65,7 +65,7 @@ bool isEmptyFolder(const std::string& path) {
     return fs::is_directory(path, failure) && fs::is_empty(path, failure);
 }
 
-/// A name beside the store's for what was there before, with the time of now.
+/// The name for the former store: the store's own name followed by the current time.
 std::string nameForFormer(const std::string& address) {
     const std::time_t now = std::time(nullptr);
     std::tm parts{};

@@ -21,12 +21,12 @@ namespace {
 
 const std::string core = "http://colorexchangeformat.com/CxF3-core";
 
-/// Objects in a file with the specifications "s" (D50, 2 degrees, 380 nm by 10, M1), "m0", "d65",
-/// "ten" (10 degrees) and "lamp" (a special illuminant).
+/// Objects in a file with the ColorSpecifications "s" (D50, 2 degrees, 380 nm by 10, M1), "m0",
+/// "d65", "ten" (10 degrees) and "lamp" (a special illuminant).
 std::string file(const std::string& objects,
                  const std::string& start = "<CxF xmlns='" + core + "'>",
                  const std::string& end = "</CxF>") {
-    const auto specification = [](const char* id, const char* light, const char* condition,
+    const auto measuredUnder = [](const char* id, const char* light, const char* condition,
                                   const char* observer = "2_Degree") {
         return std::string("<ColorSpecification Id='") + id + "'><TristimulusSpec>" +
                (*light != '\0' ? "<Illuminant>" + std::string(light) + "</Illuminant>"
@@ -39,11 +39,11 @@ std::string file(const std::string& objects,
     };
     return start + "<Resources><ObjectCollection>" + objects +
            "</ObjectCollection><ColorSpecificationCollection>" +
-           specification("s", "D50", "M1_Daylight") +
-           specification("m0", "D50", "M0_Incandescent") +
-           specification("d65", "D65", "M1_Daylight") +
-           specification("ten", "D50", "M1_Daylight", "10_Degree") +
-           specification("lamp", "", "M1_Daylight") +
+           measuredUnder("s", "D50", "M1_Daylight") +
+           measuredUnder("m0", "D50", "M0_Incandescent") +
+           measuredUnder("d65", "D65", "M1_Daylight") +
+           measuredUnder("ten", "D50", "M1_Daylight", "10_Degree") +
+           measuredUnder("lamp", "", "M1_Daylight") +
            "</ColorSpecificationCollection></Resources>" + end;
 }
 
@@ -51,8 +51,8 @@ std::string object(const std::string& content, const std::string& attributes = "
     return "<Object ObjectType='Color' " + attributes + ">" + content + "</Object>";
 }
 
-std::string lab(const std::string& L, const std::string& specification = "s") {
-    return "<ColorValues><ColorCIELab ColorSpecification='" + specification + "'><L>" + L +
+std::string lab(const std::string& L, const std::string& conditions = "s") {
+    return "<ColorValues><ColorCIELab ColorSpecification='" + conditions + "'><L>" + L +
            "</L><A>1</A><B>-2.5</B></ColorCIELab></ColorValues>";
 }
 

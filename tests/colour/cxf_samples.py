@@ -66,24 +66,24 @@ def device(row, spots):
     return element("DeviceColorValues", element(kind, amounts, ColorSpecification="press"))
 
 
-def colours(row, columns, specification):
+def colours(row, columns, conditions):
     values = ""
     if LAB[0] in columns:
         values += element("ColorCIELab",
                           "".join(element(part, row[name]) for part, name in zip("LAB", LAB)),
-                          ColorSpecification=specification)
+                          ColorSpecification=conditions)
     if XYZ[0] in columns:
         values += element("ColorCIEXYZ",
                           "".join(element(part, row[name]) for part, name in zip("XYZ", XYZ)),
-                          ColorSpecification=specification)
+                          ColorSpecification=conditions)
     spectrum = [row[name] for name in columns if name.startswith("SPEC_")]
     if spectrum:
         values += element("ReflectanceSpectrum", " ".join(spectrum), StartWL="380",
-                          ColorSpecification=specification)
+                          ColorSpecification=conditions)
     return element("ColorValues", values)
 
 
-def specification(name, condition, illumination):
+def measured_under(name, condition, illumination):
     measurement = (element("MeasurementType", "Spectrum_Reflectance") +
                    '<cc:WavelengthRange StartWL="380" Increment="10"/>' +
                    element("Device", element("Model", "Bench 3") +
@@ -96,12 +96,12 @@ def specification(name, condition, illumination):
 
 
 def write_cxf(path, objects, prefix="cc"):
-    specifications = (specification("m1", True, "M1_Daylight") +
-                      specification("m2", True, "M2_UVExcluded") +
-                      specification("press", False, ""))
+    all_conditions = (measured_under("m1", True, "M1_Daylight") +
+                      measured_under("m2", True, "M2_UVExcluded") +
+                      measured_under("press", False, ""))
     body = element("FileInformation", element("Creator", "cxf_samples")) + \
         element("Resources", element("ObjectCollection", "\n".join(objects)) +
-                element("ColorSpecificationCollection", specifications))
+                element("ColorSpecificationCollection", all_conditions))
     text = f'<?xml version="1.0" encoding="UTF-8"?>\n<cc:CxF xmlns:cc="{NAMESPACE}">{body}</cc:CxF>\n'
     if prefix != "cc":
         text = text.replace("xmlns:cc", f"xmlns:{prefix}" if prefix else "xmlns")

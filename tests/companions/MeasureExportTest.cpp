@@ -103,7 +103,7 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
                condition + "'><L>" + L +
                "</L><A>1</A><B>2</B></ColorCIELab></ColorValues></Object>";
     };
-    const auto specification = [](const char* id, const char* light) {
+    const auto measuredUnder = [](const char* id, const char* light) {
         return std::string("<ColorSpecification Id='") + id +
                "'><MeasurementSpec><Device><DeviceIllumination>" + light +
                "</DeviceIllumination></Device></MeasurementSpec></ColorSpecification>";
@@ -112,8 +112,8 @@ TEST_F(MeasureTool, HandsOverAnExportOfThesePatches) {
                                  "<ObjectCollection>" +
                                      object("100", "m0", "55") + object("100", "m2", "56") +
                                      "</ObjectCollection><ColorSpecificationCollection>" +
-                                     specification("m0", "M0_Incandescent") +
-                                     specification("m2", "M2_UVExcluded") +
+                                     measuredUnder("m0", "M0_Incandescent") +
+                                     measuredUnder("m2", "M2_UVExcluded") +
                                      "</ColorSpecificationCollection></Resources></CxF>");
     for (const auto& [number, L] : {std::pair{"2", 56}, std::pair{"0", 55}}) {
         const std::string one = crlf(head + format(cmyk) + "DEVICE 33\nILLUMINATION_CONDITION " +

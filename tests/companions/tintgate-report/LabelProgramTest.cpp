@@ -7,8 +7,7 @@
 #include <gmock/gmock.h>
 #include <gtest/gtest.h>
 
-#include "RunProgram.h"
-#include "ScratchFolder.h"
+#include "ReportProgram.h"
 
 namespace {
 
@@ -16,29 +15,11 @@ using testing::HasSubstr;
 
 namespace fs = std::filesystem;
 
-const std::string data = TINTGATE_SOURCE_DIR "/tests/data/report/";
-
-/// A folder with both files of a job's run.
-class LabelProgram : public testing::Test {
+class LabelProgram : public ReportProgram {
   protected:
-    LabelProgram() {
-        for (const char* name : {"meta.json", "output.json"}) {
-            fs::copy_file(data + name, m_scratch.path(name));
-        }
-    }
-
-    static support::Outcome report(std::vector<std::string> words,
-                                   const support::RunOptions& options = {}) {
-        words.insert(words.begin(), TINTGATE_REPORT);
-        return support::run(words, options);
-    }
-
     static std::string read(const std::vector<std::string>& command) {
         return support::run(command).output;
     }
-
-    const support::ScratchFolder m_scratch;
-    const std::string m_result = m_scratch.path("output.json");
 };
 
 TEST_F(LabelProgram, MakesLabelAndCertificateWithWhatTheCommandLineStates) {

@@ -8,8 +8,7 @@
 #include <gtest/gtest.h>
 
 #include "ExitCodes.h"
-#include "RunProgram.h"
-#include "ScratchFolder.h"
+#include "ReportProgram.h"
 
 namespace {
 
@@ -17,28 +16,6 @@ using testing::HasSubstr;
 using testing::Not;
 
 namespace fs = std::filesystem;
-
-const std::string data = TINTGATE_SOURCE_DIR "/tests/data/report/";
-
-/// A folder with both result files of a job.
-class ReportProgram : public testing::Test {
-  protected:
-    ReportProgram() {
-        for (const char* name : {"meta.json", "output.json"}) {
-            fs::copy_file(data + name, m_scratch.path(name));
-        }
-    }
-
-    static support::Outcome report(std::vector<std::string> words,
-                                   const support::RunOptions& options = {}) {
-        words.insert(words.begin(), TINTGATE_REPORT);
-        return support::run(words, options);
-    }
-
-    const support::ScratchFolder m_scratch;
-    const std::string m_meta = m_scratch.path("meta.json");
-    const std::string m_result = m_scratch.path("output.json");
-};
 
 TEST_F(ReportProgram, MakesTheVeryPageOfTheViewer) {
     const std::string page = m_scratch.path("report-strip2-2024-05-01-123456.html");
